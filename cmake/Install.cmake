@@ -1,0 +1,19 @@
+# What a host developer gets: headers, both libraries, a CMake package and a pkg-config file.
+include(CMakePackageConfigHelpers)
+
+set_target_properties(VexaCommon VexaCommonFilter PROPERTIES INSTALL_RPATH "$ORIGIN")
+install(TARGETS VexaCommon VexaCommonFilter EXPORT VexaCommonTargets
+  LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/vexa DESTINATION ${CMAKE_INSTALL_INCLUDEDIR} FILES_MATCHING PATTERN "*.h")
+install(EXPORT VexaCommonTargets NAMESPACE Vexa:: DESTINATION ${CMAKE_INSTALL_LIBDIR}/cmake/VexaCommon)
+
+configure_package_config_file(cmake/VexaCommonConfig.cmake.in ${CMAKE_BINARY_DIR}/VexaCommonConfig.cmake
+  INSTALL_DESTINATION ${CMAKE_INSTALL_LIBDIR}/cmake/VexaCommon)
+write_basic_package_version_file(${CMAKE_BINARY_DIR}/VexaCommonConfigVersion.cmake COMPATIBILITY SameMajorVersion)
+install(FILES ${CMAKE_BINARY_DIR}/VexaCommonConfig.cmake ${CMAKE_BINARY_DIR}/VexaCommonConfigVersion.cmake
+  DESTINATION ${CMAKE_INSTALL_LIBDIR}/cmake/VexaCommon)
+
+file(RELATIVE_PATH vexa_prefix_from_pkgconfig /${CMAKE_INSTALL_LIBDIR}/pkgconfig /)
+string(REGEX REPLACE "/$" "" vexa_prefix_from_pkgconfig ${vexa_prefix_from_pkgconfig})
+configure_file(cmake/vexa-common.pc.in ${CMAKE_BINARY_DIR}/vexa-common.pc @ONLY)
+install(FILES ${CMAKE_BINARY_DIR}/vexa-common.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)

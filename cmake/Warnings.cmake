@@ -1,0 +1,8 @@
+# One place for the warnings every target of ours compiles with.
+add_library(vexa_warnings INTERFACE)
+target_compile_options(vexa_warnings INTERFACE
+  -Wall -Wextra -Wpedantic -Wconversion -Wshadow -Wformat=2 -Wformat-nonliteral -Werror)
+# GCC 12 sees overruns inside std::string for 32 bits that are not there (its bugs 105329 and 105651).
+if(CMAKE_CXX_COMPILER_ID STREQUAL GNU AND CMAKE_CXX_COMPILER_VERSION VERSION_LESS 13 AND CMAKE_SIZEOF_VOID_P EQUAL 4)
+  target_compile_options(vexa_warnings INTERFACE -Wno-array-bounds -Wno-restrict -Wno-stringop-overflow)
+endif()
