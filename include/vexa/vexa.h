@@ -1,0 +1,20 @@
+// Everything a host needs.
+#pragma once
+
+#include "vexa/audio_info.h"
+#include "vexa/common_types.h"
+#include "vexa/edge_storage_info.h"
+#include "vexa/file_logger.h"
+#include "vexa/image_info.h"
+#include "vexa/io_info.h"
+#include "vexa/library_device.h"
+#include "vexa/ptz_info.h"
+#include "vexa/real_time.h"
+#include "vexa/resolution_filter.h"
+#include "vexa/return_codes.h"
+#include "vexa/runtime.h"
+#include "vexa/simple_lock.h"
+#include "vexa/system_info.h"
+#include "vexa/vexa_common.h"
+#include "vexa/vexa_variants.h"
+#include "vexa/video_info.h"

@@ -1,0 +1,342 @@
+// The driver of this camera family.
+#pragma once
+
+#include <atomic>
+#include <cstdarg>
+#include <cstddef>
+#include <cstdint>
+#include <ctime>
+#include <deque>
+#include <map>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "vexa/export.h"
+#include "vexa/file_logger.h"
+#include "vexa/library_device.h"
+#include "vexa/resolution_filter.h"
+#include "vexa/simple_lock.h"
+
+struct sockaddr_in;
+struct typedHandle;
+
+namespace vexa {
+struct DriverState;
+struct PacketRunPlace;
+struct Failure;
+struct Formatted;
+}  // namespace vexa
+
+/// Drives one camera over HTTP CGI, RTSP/RTP and HTTP streams.
+///
+/// Construction contacts no camera. Operations may be called from any of the host's threads; one streaming thread runs
+/// while video plays. The connection is changed only while no stream and no command is in flight. Destruction stops
+/// video, audio and the alarm stream; the motion-metadata stream is the host's to stop. One thread at a time starts
+/// video or destroys the driver; a stop may come from another while one is in progress.
+///
+/// Everything that is not an operation of CLibraryDevice is protected: model classes outside the library derive from
+/// this class and fill the capability records. Each block below names the file with its bodies.
+class VEXA_API CVexaCommon : public CLibraryDevice {
+ public:
+  /// One assembled video frame. The frame queue owns the data of the frames in it.
+  struct VideoFrameInfo {
+    unsigned char* data = nullptr;  ///< allocated with array new
+    unsigned int capacity = 0;      ///< bytes allocated: 1200000, or 2000000 once a frame has not fitted
+    unsigned int length = 0;        ///< bytes of frame
+    std::int32_t frameType = VIDEO_FRAME_INVALID;
+    std::int32_t seconds = 0;
+    std::int32_t microseconds = 0;
+  };
+
+  CVexaCommon();
+  CVexaCommon(const CVexaCommon&) = delete;
+  CVexaCommon& operator=(const CVexaCommon&) = delete;
+  ~CVexaCommon() override;
+
+  // device/vexa_common.cpp
+  ELibDReturnCode GetLatestErrorText(std::string& text) override;
+  ELibDReturnCode GetCameraType(ELibCameraType type) override;
+  ELibDReturnCode SetCameraInfoFromID(unsigned int id) override;
+
+  // device/system_info.cpp
+  ELibDReturnCode GetFixedSystemInfo(SLibDFixedSystemInfo& info) override;
+  ELibDReturnCode GetFixedConnectionInfo(SLibDFixedConnectionInfo& info) override;
+  ELibDReturnCode GetCurrentSystemInfo(SLibDSystemInfo& info) override;
+
+  // device/video_settings.cpp
+  ELibDReturnCode GetFixedCameraInfo(SLibDFixedCameraInfo& info) override;
+  ELibDReturnCode SetVideoStandard(ELibDVideoStandard standard) override;
+  ELibDReturnCode SetVidCapSize(int width, int height) override;
+  ELibDReturnCode SetSolidPTZState(bool on) override;
+  ELibDReturnCode SetImageMaxSize(int width, int height, ELibDVideoStandard standard) override;
+  ELibDReturnCode GetCameraInfo(SLibDCameraInfo& info) override;
+  ELibDReturnCode SetCameraInfo(SLibDCameraInfo& info) override;
+
+  // device/image_controls.cpp
+  ELibDReturnCode SetBrightMode(std::string& mode) override;
+  ELibDReturnCode SetBackLightCompMode(bool on) override;
+  ELibDReturnCode Bright(int step) override;
+  ELibDReturnCode BrightAbsolute(int level) override;
+  ELibDReturnCode GetDayNightMode(ELibDDayNightType& mode) override;
+  ELibDReturnCode SetDayNightMode(ELibDDayNightType mode) override;
+  ELibDReturnCode GetVisibilityEnhancerMode(ELibDVisibilityEnhancerType& mode) override;
+  ELibDReturnCode SetVisibilityEnhancerMode(ELibDVisibilityEnhancerType mode) override;
+  ELibDReturnCode GetXdnrMode(ELibDXdnrType& mode) override;
+  ELibDReturnCode SetXdnrMode(ELibDXdnrType mode) override;
+  ELibDReturnCode GetViewDR(ELibDViewDRMode& mode) override;
+  ELibDReturnCode SetViewDR(ELibDViewDRMode mode) override;
+  ELibDReturnCode GetIRIlluminator(ELibIRIlluminatorMode& mode, int& strength) override;
+  ELibDReturnCode SetIRIlluminator(ELibIRIlluminatorMode mode, int strength) override;
+
+  // device/connection.cpp
+  ELibDReturnCode GetCurrentConnectionInfo(SLibDConnectionInfo& info) override;
+  ELibDReturnCode SetCurrentConnectionInfo(SLibDConnectionInfo& info) override;
+
+  // device/cgi_log.cpp
+  ELibDReturnCode SetCGILogLevel(bool on) override;
+  ELibDReturnCode SetCGILogPath(const char* path) override;
+
+  // media/streaming_thread.cpp, media/frame_queue.cpp
+  ELibDReturnCode StartVideoStreaming() override;
+  ELibDReturnCode StopVideoStreaming() override;
+  ELibDReturnCode GetCurrentVideoFrame(SLibDVideoFrameInfo& frame) override;
+
+  // media/audio.cpp
+  ELibDReturnCode StopAudioStreaming() override;
+
+  // device/alarm_io.cpp
+  ELibDReturnCode StopIoStreaming() override;
+
+  /// Hook of model classes, called when standard or capture size change (-1: no size is given). LIBD_OK.
+  virtual ELibDReturnCode InitializeFixedVideoParams(ELibDVideoStandard standard, int width, int height);
+
+ protected:
+  // The HTTP CGI client: transport/http_client.cpp
+  int http_open(const char* format, ...) __attribute__((format(printf, 2, 3)));
+  int http_header_recv(int socket, char* buffer, int length, int timeout);
+  int http_recv(int socket, char* buffer, int length, int timeout);
+  int http_recvn(int socket, char* buffer, int length, int timeout);
+  int http_recvn(int socket, std::string& text, int length, int timeout);
+  void http_close(int socket);
+  std::string AddUrlEncoding(const std::string& text, bool encodeAll);
+  bool GetUrlParameter(const std::string& answer, std::string key, std::string& value);
+  bool GetUrlParameter(const std::string& answer, std::string key, int& value);
+  ELibDReturnCode SendInqCommand(const std::string& name, std::string& answer);
+  /// One request whose answer body is not read: LIBD_OK, or the latest error's code.
+  ELibDReturnCode SendCommand(const char* format, ...) __attribute__((format(printf, 2, 3)));
+  void base64Encode(const char* text, char* output);
+  // Its steps: a socket or -1; false with the latest error set.
+  int ConnectHttp(const SLibDConnectionInfo& info);
+  bool RequestHttp(int socket, const SLibDConnectionInfo& info, const std::string& path);
+  bool ReadHttpStatus(int socket, int timeout);
+
+  // The RTSP session: transport/rtsp_session.cpp, transport/keep_alive.cpp
+  int rtp_over_udp_open(const char* format, ...) __attribute__((format(printf, 2, 3)));
+  int rtp_over_tcp_header_recv(int socket, char* buffer, int size, int timeout);
+  bool parse_clock(const char* text);
+  void rtp_over_udp_close();
+  void rtp_over_tcp_close(int socket);
+  void rtp_stream_socket_close_all();
+  unsigned char* base64Decode(const char* text, unsigned int& size, bool trim);
+  void KeepAlive();
+  // Its steps: a port or -1; false with the latest error set (SendRtsp: with errno).
+  int RtspPort();
+  int BindMediaSocket();
+  bool ConnectRtsp(int socket, const sockaddr_in& address, const SLibDConnectionInfo& info);
+  bool SendRtsp(int socket, const std::string& request);
+  bool ReceiveRtsp(int socket, int timeout, std::string& answer);
+  bool ExchangeRtsp(int socket, const vexa::Formatted& request, std::string& answer);
+  bool SetUpRtsp(int socket, const vexa::Formatted& request, int& session);
+  bool PlayRtsp(int socket, const std::string& url, int session);
+  void TearDown();
+  bool TakeRangeClock(const std::string& answer);
+  bool TakeClockRate(const std::string& answer);
+
+  // RTP over UDP: transport/rtp_over_udp.cpp
+  int rtp_over_udp_recvn(int socket, char* buffer, int length, int timeout);
+  int rtp_over_udp_payload_recv(int socket, char* buffer, int size, int timeout, SPacketInfo& packet);
+  int rtp_over_udp_payload_recv_h264(int socket, char* buffer, int size, int timeout, SPacketInfo& packet);
+  int rtp_over_udp_payload_recv(int socket, char* buffer, int size, bool* marker, unsigned char* payloadType,
+                                int timeout, unsigned int* timestamp, unsigned short* sequence);
+
+  // The streaming thread and the frame queue: media/streaming_thread.cpp, media/frame_queue.cpp
+  static unsigned int StreamingThread(void* driver);
+  static void ProcessCurrentFrameData(CVexaCommon* driver, VideoFrameInfo& frame, bool& waitKey,
+                                      ELibDReturnCode result);
+  static void PropulateFrameInfoList(CVexaCommon* driver, VideoFrameInfo& frame, bool& waitKey);
+  ELibDReturnCode GetCurrentFrameData(VideoFrameInfo& frame);
+  ELibDReturnCode GetRtpCurrentVideoFrame(const std::string& codec, VideoFrameInfo& frame);
+  ELibDReturnCode StopRtpVideoStreaming();
+  void ReleaseRtpPacketsPtr();
+  SLibDCameraInfo PrepareCamera();
+  void OpenLiveHttp(int stream);
+  bool OpenLiveRtp(int stream);
+  bool AllocateRtpPackets();
+  ELibDReturnCode StartStreamingThread(const std::string& codec);
+  bool NextReadWaits(ELibDReturnCode result) const;
+  void TakeFrame(VideoFrameInfo& frame);
+  ELibDReturnCode ReadFrame(VideoFrameInfo& frame);
+  std::string StreamCodec();
+  bool IsStopRequested();
+  void EndStreamingThread();
+  void FreeFrame(VideoFrameInfo& frame) VEXA_REQUIRES(m_FrameQueueLock);
+  void ClearFrameQueue();
+
+  // Pictures from RTP: media/rtp_pictures.cpp, media/rtp_frames.cpp
+  ELibDReturnCode GetRtpCurrentVideoFrameH264(VideoFrameInfo& frame);
+
+  ELibDReturnCode CollectPicture(vexa::PacketRunPlace& run);
+  int ReceivePacket(int timeout);
+  ELibDReturnCode NothingYet();
+  void StampPicture(VideoFrameInfo& frame, std::uint32_t timestamp);
+
+  // Shared with model classes: device/system_info.cpp, device/edge_storage.cpp
+  ELibDReturnCode GetCommonSystemInfo(SLibDSystemInfo& info, const std::string& answer);
+  ELibDReturnCode GetCommonNetworkInfo(SLibDSystemInfo& info, const std::string& answer);
+  bool InitEdgeStorageKeepAlivePeriod();
+  std::int64_t _ld_mkgmtime(std::tm* time);
+  bool _ld_is_leap_year(int year);
+
+  // Video settings, read with m_ConnectionLock held: device/video_settings.cpp
+  // `pos` is in the place of the key in the answer, out the end of its value; `changed` is set, never cleared.
+  void ParseVideoStandardFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed);
+  void ParseVideoCapSizeFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed);
+  void ParseSolidPTZFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed);
+  void ParseImageMaxSizeFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed);
+  void SetCurrentStreamMode(const std::string& answer, std::size_t& pos, std::int32_t& codecType,
+                            const std::string& key);
+  void SetCurrentResolution(const std::string& answer, std::size_t& pos, const std::string& key);
+  void SetCurrentFrameRate(const std::string& answer, std::size_t& pos, const std::string& key);
+  void SetCurrentQualityBitrate(const std::string& answer, std::size_t& pos, std::int32_t codecType,
+                                const std::string& key);
+  void ReadCameraProperties(const std::string& answer);
+  void ReadStreamSettings(const std::string& answer, int stream);
+  void ReadVideoPorts(const std::string& answer);
+  void StoreCameraInquiry(const std::string& answer);
+  bool TakesElectronicFlip();
+  ELibDVideoStandard StoredVideoStandard();
+  void FilterBy(const char* item, const std::string& value);
+
+  // Exposure and image controls: device/image_controls.cpp
+  ELibDReturnCode CheckAmountOfBrightness(int step);
+  ELibDReturnCode CheckCurrentBrightMode();
+  /// Places of both modes in the exposure lists; -1 for a mode without an entry.
+  void GetShutterAndIrisMode(int& shutterEntry, int& irisEntry);
+  // False when the answer lacks the value, there is no entry, or no step is left that way.
+  bool GetShutterSpeedFromCameraData(const std::string& answer, int& value, unsigned& entry);
+  bool GetIrisPositionFromCameraData(std::string& answer, int& value, unsigned& entry);
+  bool GetShutterSpeedFromShutterSpeedList(int step, int& value, unsigned entry);
+  bool GetIrisPositionFromIrisList(int step, int& value, unsigned entry);
+  std::string StoredBrightMode();
+  bool CameraInquiry(std::string& answer);
+  ELibDReturnCode AfterImageChange(ELibDReturnCode sent);
+
+  // Shared by model variants: device/model_variants.cpp
+  /// Sends the picture to the network when the answer of the "system" inquiry names another output.
+  ELibDReturnCode BringVideoToNetwork(const std::string& systemAnswer);
+  ELibDReturnCode ReadSystemBringingVideo(SLibDSystemInfo& info);
+  ELibDReturnCode AskVideoOutMode(ELibVideoOutMode& mode);
+
+  // The CGI log: device/cgi_log.cpp
+  void Log(const char* direction, const char* message);
+
+  // Identity, capabilities and current settings
+  SLibDFixedSystemInfo m_FixedSystemInfo;
+  SLibDFixedConnectionInfo m_FixedConnectionInfo;
+  SLibDFixedCameraInfo m_FixedCameraInfo;
+  SLibDFixedAudioInfo m_FixedAudioInfo;
+  SLibDFixedPTZControlInfo m_FixedPTZControlInfo;
+  SLibDCameraInfo m_CameraInfo;  ///< guarded by m_ConnectionLock
+  CResolutionFilterFacade m_ResolutionFilter;
+  SLibDAudioInfo m_AudioInfo;
+  SLibDPTZControlInfo m_PTZControlInfo;  ///< guarded by m_ConnectionLock
+  SLibDIoBoxInfo m_IoBoxInfo;
+  std::string m_LatestErrorText;         ///< written and read through Fail, ClearLatestError and LatestErrorCode
+  bool m_ContinuousPTZ = false;          ///< the camera takes signed continuous speeds; guarded by m_ConnectionLock
+  int m_ChannelId = 0;                   ///< guarded by m_ConnectionLock
+  SLibDConnectionInfo m_ConnectionInfo;  ///< guarded by m_ConnectionLock
+  ELibDReturnCode m_LatestErrorCode = LIBD_FAILED;
+
+  // What the model class says of the camera
+  bool m_FixedCameraInfoAvailable = false;
+  bool m_FixedPTZControlInfoAvailable = false;
+  bool m_FixedIoBoxInfoAvailable = false;
+  bool m_UseMotionDetection = false;            ///< detection windows report as "MdWin"
+  bool m_LodDetection = false;                  ///< the camera has LOD detection
+  bool m_EdgeStorageSupported = false;          ///< the camera has a card
+  std::uint32_t m_CameraType = 0;               ///< bit set asked by GetCameraType
+  std::vector<SLibDZoomRatioInt> m_ZoomRatios;  ///< ascending by position
+  SLibDFixedIoBoxInfo m_FixedIoBoxInfo;
+
+  // The RTSP session
+  int m_SavedTimeout = 0;  ///< milliseconds; what the connection's time-out is put back to
+  int m_RtspSocket = -1;
+  int m_StreamSocket = -1;  ///< the media socket: RTP over UDP, or the HTTP image stream
+  std::string m_RtspUrl;
+  int m_RtspSession = 0;
+  int m_RtspCSeq = 0;
+  char m_BasicCredentials[345] = {};     ///< Base64 of at most 255 characters
+  std::int64_t m_RangeClockSeconds = 0;  ///< start of the range clock, seconds since 1970-01-01 UTC
+  int m_RangeClockMicros = 0;
+  int m_RtpClockRate = 0;  ///< ticks a second
+  bool m_EdgeStoragePlayback = false;
+  int m_PlaybackScale = 1;
+  bool m_NoTearDown = false;
+  int m_KeepAlivePeriod = 1;  ///< seconds
+  std::time_t m_LastKeepAliveTime = 0;
+  bool m_FirstPlaybackFrame = false;
+  std::uint32_t m_PlaybackBaseTimestamp = 0;
+  std::string m_EdgeStorageCodec;
+
+  // RTP packets: the streaming thread's
+  std::vector<SPacketInfo> m_RtpPackets;       ///< sorted; the data lie in m_RtpPacketBuffer
+  unsigned char* m_RtpPacketBuffer = nullptr;  ///< 2097152 bytes from malloc while RTP streams
+
+  // The streaming thread and the frame queue
+  CSimpleLock m_VideoStateLock;
+  bool m_StopVideoRequested VEXA_GUARDED_BY(m_VideoStateLock) = false;
+  CSimpleLock m_FrameQueueLock;
+  std::deque<VideoFrameInfo> m_FrameQueue VEXA_GUARDED_BY(m_FrameQueueLock);
+  bool m_VideoTimedOut VEXA_GUARDED_BY(m_FrameQueueLock) = false;
+  bool m_LargeFrameBuffers = false;  ///< guarded by m_FrameQueueLock while a thread runs
+  unsigned char* m_StagingBuffer = nullptr;
+  std::size_t m_StagingBufferSize = 0;
+  std::time_t m_LastFrameTime = 0;
+  typedHandle* m_StreamingThread = nullptr;
+  typedHandle* m_StopVideoEvent = nullptr;
+  int m_StreamWaitMs = 1;  ///< wait for the stop event after a read that did not wait for it itself
+  bool m_RtpLiveMode = false;
+  CSimpleLock m_CamPosLock;
+  std::string m_CamPosText VEXA_GUARDED_BY(m_CamPosLock);
+
+  // The polled streams and the cached camera inquiry
+  CSimpleLock m_CameraInquiryLock;
+  std::string m_CameraInquiryCache VEXA_GUARDED_BY(m_CameraInquiryLock);
+  CSimpleLock m_AudioLock;
+  int m_AudioSocket VEXA_GUARDED_BY(m_AudioLock) = -1;
+  CSimpleLock m_IoStreamLock;
+  int m_IoStreamSocket VEXA_GUARDED_BY(m_IoStreamLock) = -1;
+  std::vector<SLibDPinInfo> m_PendingPins VEXA_GUARDED_BY(m_IoStreamLock);
+  CSimpleLock m_MdStreamLock;
+
+  std::map<std::string, int> m_InquirySizes;  ///< answer buffer in bytes by inquiry name
+  CFileLogger m_CGILogger;
+  char m_CGILogPath[1024] = {};  ///< guarded by m_ConnectionLock
+  CSimpleLock m_ConnectionLock;
+  std::atomic<bool> m_CGILogEnabled{false};
+
+  // device/vexa_common.cpp
+  int Fail(const vexa::Failure& failure);
+  int FailSystem();
+  int FailSystem(int error);
+  /// Records a wait that did not answer 1; -1.
+  int FailWait(int answer, const vexa::Failure& expired);
+  void ClearLatestError();
+  ELibDReturnCode LatestErrorCode();
+  std::string LatestErrorText();
+  SLibDConnectionInfo ConnectionInfo();
+  int ConnectionTimeout();
+
+  std::unique_ptr<vexa::DriverState> m_State;  ///< the rest of its state
+};
