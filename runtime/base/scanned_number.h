@@ -1,0 +1,19 @@
+// Decimal numbers at the front of a text, with scanf's leniency and without its overflow.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <optional>
+#include <string_view>
+
+namespace vexa {
+
+struct ScannedNumber {
+  std::uint32_t value;  ///< the largest value stands for any larger one and for every negative one
+  std::size_t length;   ///< characters read, spaces and sign among them
+};
+
+/// Reads spaces, a sign and digits; sign and digits are `width` characters at most. Nothing when there is no digit.
+std::optional<ScannedNumber> scan_number(std::string_view text, std::size_t width);
+
+}  // namespace vexa

@@ -1,0 +1,41 @@
+// Small readings of text: what follows a key, what stands before a mark, decimal numbers, bounded formatting.
+#pragma once
+
+#include <cstdarg>
+#include <cstddef>
+#include <optional>
+#include <string>
+#include <string_view>
+
+namespace vexa {
+
+/// What follows the first occurrence of `key`, to the end; nothing when there is none.
+std::optional<std::string_view> text_after(std::string_view text, std::string_view key);
+
+/// What stands before the first `mark`; the whole text when there is none.
+std::string_view text_before(std::string_view text, char mark);
+
+/// What stands before the first NUL: the text as a C function sees it.
+inline std::string_view before_nul(std::string_view text) { return text_before(text, '\0'); }
+
+/// The value held to what an int can say.
+int clamp_to_int(long long value);
+
+/// The number that a text begins with, as strtol reads it in base 10: blanks and a sign may stand in front, what
+/// follows is passed over, no digit is 0. Values beyond int become its limits.
+int leading_int(const std::string& text);
+
+/// ASCII letters and digits, whatever the host's locale.
+bool is_ascii_alphanumeric(char c);
+
+/// A text made as snprintf makes it.
+struct Formatted {
+  std::string text;
+  bool cut;  ///< more was wanted than there was room for
+};
+
+/// Formats into `room` bytes, the terminator among them; `room` is at least 1.
+Formatted format_within(std::size_t room, const char* format, ...) __attribute__((format(printf, 2, 3)));
+Formatted vformat_within(std::size_t room, const char* format, va_list arguments) __attribute__((format(printf, 2, 0)));
+
+}  // namespace vexa
