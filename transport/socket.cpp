@@ -1,0 +1,41 @@
+#include "transport/socket.h"
+
+#include <fcntl.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+namespace vexa {
+
+Socket& Socket::operator=(Socket&& other) noexcept {
+  if (this != &other) {
+    if (valid()) close(descriptor_);
+    descriptor_ = other.release();
+  }
+  return *this;
+}
+
+Socket::~Socket() {
+  if (valid()) close(descriptor_);
+}
+
+bool send_once(int socket, const char* bytes, std::size_t length) {
+  return send(socket, bytes, length, MSG_NOSIGNAL) == static_cast<ssize_t>(length);
+}
+
+void shutdown_and_close(int socket) {
+  if (socket < 0) return;
+  shutdown(socket, SHUT_RDWR);
+  close(socket);
+}
+
+bool make_nonblocking(int socket) {
+  const int flags = fcntl(socket, F_GETFL);
+  return flags >= 0 && fcntl(socket, F_SETFL, flags | O_NONBLOCK) == 0;
+}
+
+bool make_blocking(int socket) {
+  const int flags = fcntl(socket, F_GETFL);
+  return flags >= 0 && fcntl(socket, F_SETFL, flags & ~O_NONBLOCK) == 0;
+}
+
+}  // namespace vexa

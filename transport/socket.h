@@ -1,0 +1,38 @@
+// Descriptors that close themselves, and sends that never raise SIGPIPE.
+#pragma once
+
+#include <cstddef>
+#include <utility>
+
+namespace vexa {
+
+/// Owns a socket: closes it on every early exit, is released on success.
+class Socket {
+ public:
+  Socket() = default;
+  explicit Socket(int descriptor) : descriptor_(descriptor) {}
+  Socket(Socket&& other) noexcept : descriptor_(other.release()) {}
+  Socket& operator=(Socket&& other) noexcept;
+  Socket(const Socket&) = delete;
+  Socket& operator=(const Socket&) = delete;
+  ~Socket();
+
+  bool valid() const { return descriptor_ >= 0; }
+  int get() const { return descriptor_; }
+  int release() { return std::exchange(descriptor_, -1); }
+
+ private:
+  int descriptor_ = -1;
+};
+
+/// One send; true when all bytes went. A peer that has closed gives EPIPE, never a signal.
+bool send_once(int socket, const char* bytes, std::size_t length);
+
+/// Shuts the socket down both ways and closes it; errors and -1 are passed over.
+void shutdown_and_close(int socket);
+
+/// Set and clear O_NONBLOCK; false with errno on failure.
+bool make_nonblocking(int socket);
+bool make_blocking(int socket);
+
+}  // namespace vexa

@@ -1,0 +1,49 @@
+#include "transport/wait_budget.h"
+
+#include <poll.h>
+
+#include <algorithm>
+#include <cerrno>
+
+namespace vexa {
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+int remaining_milliseconds(Clock::time_point deadline) {
+  const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - Clock::now()).count();
+  return static_cast<int>(std::max<std::int64_t>(left, 0));
+}
+
+}  // namespace
+
+WaitBudget::WaitBudget(int milliseconds)
+    : deadline_(Clock::now() + std::chrono::milliseconds(std::max(milliseconds, 0))) {}
+
+int WaitBudget::wait_readable(int descriptor) const { return wait(descriptor, POLLIN, -1); }
+
+int WaitBudget::wait_writable(int descriptor) const { return wait(descriptor, POLLOUT, -1); }
+
+int WaitBudget::wait_readable_unless(int descriptor, int stop) const { return wait(descriptor, POLLIN, stop); }
+
+int WaitBudget::wait(int descriptor, short events, int stop) const {
+  // Safe: poll would pass over -1 and wait in vain; a closed socket is an error at once.
+  if (descriptor < 0) {
+    errno = EBADF;
+    return -1;
+  }
+  pollfd entries[] = {{descriptor, events, 0}, {stop, POLLIN, 0}};
+  for (;;) {
+    const int count = poll(entries, 2, remaining_milliseconds(deadline_));
+    if (count < 0 && errno == EINTR) continue;
+    if (count <= 0) return count;
+    if ((entries[1].revents & POLLIN) != 0) return 0;
+    if ((entries[0].revents & POLLNVAL) != 0) {
+      errno = EBADF;
+      return -1;
+    }
+    return 1;
+  }
+}
+
+}  // namespace vexa

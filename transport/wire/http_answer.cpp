@@ -1,0 +1,52 @@
+#include "transport/wire/http_answer.h"
+
+#include <locale.h>
+
+#include <cstdio>
+
+#include "runtime/base/text.h"
+
+namespace vexa {
+namespace {
+
+/// While it lives, this thread reads numbers with a decimal point, whatever locale the host has chosen.
+class PlainNumbers {
+ public:
+  PlainNumbers() : before_(uselocale(plain())) {}
+  ~PlainNumbers() { uselocale(before_); }
+  PlainNumbers(const PlainNumbers&) = delete;
+  PlainNumbers& operator=(const PlainNumbers&) = delete;
+
+ private:
+  static locale_t plain() {
+    static const locale_t locale = newlocale(LC_ALL_MASK, "C", nullptr);
+    return locale;
+  }
+
+  locale_t before_;
+};
+
+}  // namespace
+
+std::size_t header_length(std::string_view received) {
+  const std::string_view text = before_nul(received);
+  for (const std::string_view end : {"\r\n\r\n", "\n\n"}) {
+    const std::size_t at = text.find(end);
+    if (at != std::string_view::npos) return at + end.size();
+  }
+  return 0;
+}
+
+std::optional<StatusLine> parse_status_line(std::string_view text, std::string_view protocol) {
+  if (!text.starts_with(protocol)) return std::nullopt;
+  const std::string rest(before_nul(text.substr(protocol.size())));
+  const PlainNumbers plain;
+  long long status = 0;
+  char reason[1024];
+  // Kept: a "^" ends the reason phrase as a line end does; hosts compare the phrases they have always been shown.
+  // NOLINTNEXTLINE(cert-err34-c): what is no number is told by the count; a number too large becomes the largest.
+  if (std::sscanf(rest.c_str(), "%*f %lld %1023[^\r^\n]", &status, reason) != 2) return std::nullopt;
+  return StatusLine{clamp_to_int(status), reason};
+}
+
+}  // namespace vexa

@@ -1,0 +1,33 @@
+#include "transport/wire/http_request.h"
+
+namespace vexa {
+namespace {
+
+constexpr std::size_t kCredentialsRoom = 256;
+
+}  // namespace
+
+std::string joined_credentials(const std::string& user, const std::string& password) {
+  return format_within(kCredentialsRoom, "%s:%s", user.c_str(), password.c_str()).text;
+}
+
+Formatted http_get_request(const HttpTarget& target) {
+  return format_within(kRequestRoom, "GET http://%s:%d%s HTTP/1.0\r\nAuthorization: Basic %s\r\n\r\n",
+                       target.host.c_str(), target.port, target.path.c_str(), target.credentials.c_str());
+}
+
+std::string percent_encoded(std::string_view text, std::string_view spared) {
+  constexpr std::string_view kDigits = "0123456789ABCDEF";
+  std::string encoded;
+  for (const char c : text) {
+    if (is_ascii_alphanumeric(c) || spared.find(c) != std::string_view::npos) {
+      encoded += c;
+      continue;
+    }
+    const auto byte = static_cast<unsigned char>(c);
+    encoded += {'%', kDigits[byte >> 4], kDigits[byte & 0xf]};
+  }
+  return encoded;
+}
+
+}  // namespace vexa
