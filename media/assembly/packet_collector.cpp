@@ -1,0 +1,249 @@
+#include "media/assembly/packet_collector.h"
+
+#include <algorithm>
+
+#include "transport/wire/packet_order.h"
+
+namespace vexa {
+namespace {
+
+/// How long a complete key picture waits for what is missing before it.
+constexpr std::chrono::milliseconds kKeyPicturePatience{200};
+
+/// Consecutive packets behind the last one used that prove a restarted sequence.
+constexpr std::size_t kRestartProof = 3;
+
+/// 1.2 s in ticks.
+std::int64_t most_age(int clock_rate) { return static_cast<std::int64_t>(clock_rate) * 12 / 10; }
+
+}  // namespace
+
+bool PacketCollector::add(const SPacketInfo& packet, int clock_rate, Instant now) {
+  remove_too_old(packet, clock_rate);
+  if (is_listed(packet)) return false;
+  const bool ahead = last_used_ && sequence_is_ahead(packet.sequence, *last_used_);
+  if (!ahead && recent_.holds(packet.timestamp, packet.sequence)) return false;
+  if (last_used_ && !ahead) {
+    if (is_latecomer(packet, clock_rate)) return false;
+    take_stray(packet, now);
+    return true;
+  }
+  strays_.clear();
+  insert(packet, now);
+  return true;
+}
+
+// A rate that is no rate sets no age.
+void PacketCollector::remove_too_old(const SPacketInfo& newest, int clock_rate) {
+  if (packets_.empty() || clock_rate <= 0) return;
+  const std::int64_t limit = order_timestamp(newest.timestamp) - most_age(clock_rate);
+  const auto within = [limit](const SPacketInfo& packet) { return order_timestamp(packet.timestamp) <= limit; };
+  if (!within(packets_.front())) return;
+  const auto end = std::partition_point(packets_.begin(), packets_.end(), within);
+  // Where the order of timestamps turns (at 2^32 and at the lift), newer packets stand first: they are not old.
+  const auto old = std::remove_if(packets_.begin(), end, [&](const SPacketInfo& packet) {
+    return timestamp_is_after(newest.timestamp, packet.timestamp);
+  });
+  if (old == end) return;
+  packets_.erase(old, end);
+  forget_sequence();
+}
+
+bool PacketCollector::is_listed(const SPacketInfo& packet) const {
+  const auto place = place_of(packets_, packet);
+  if (place == packets_.begin()) return false;
+  const SPacketInfo& before = *(place - 1);
+  return before.timestamp == packet.timestamp && before.sequence == packet.sequence;
+}
+
+bool PacketCollector::follows_last_used(std::uint16_t sequence) const {
+  return last_used_ && sequence == static_cast<std::uint16_t>(*last_used_ + 1);
+}
+
+// A packet of a picture that was given up: a camera that restarts is not that close to its former timestamps.
+bool PacketCollector::is_latecomer(const SPacketInfo& packet, int clock_rate) const {
+  const std::uint32_t age = last_used_timestamp_ - packet.timestamp;
+  return age != 0 && age <= most_age(clock_rate);
+}
+
+// Packets that go on behind the last one used are a camera that began its sequence again.
+void PacketCollector::take_stray(const SPacketInfo& packet, Instant now) {
+  const bool goes_on = !strays_.empty() && packet.sequence == static_cast<std::uint16_t>(strays_.back().sequence + 1);
+  if (!goes_on) strays_.clear();
+  strays_.push_back(packet);
+  if (strays_.size() < kRestartProof) return;
+  packets_.clear();
+  forget_sequence();
+  recent_ = RecentPictures{};
+  for (const SPacketInfo& stray : strays_) insert(stray, now);
+  strays_.clear();
+}
+
+void PacketCollector::insert(const SPacketInfo& packet, Instant now) {
+  preamble_seen_ = preamble_seen_ || rules_.is_preamble(packet);
+  const auto place = place_of(packets_, packet);
+  const bool at_end = place == packets_.end();
+  const auto inserted = packets_.insert(place, packet);
+  // In order and without the marker, a packet completes nothing.
+  if (at_end && !packet.marker) return;
+  changed_ = true;
+  note_key_picture(static_cast<std::size_t>(inserted - packets_.begin()), now);
+}
+
+void PacketCollector::note_key_picture(std::size_t index, Instant now) {
+  const Run run = run_around(index);
+  if (!is_complete(run) || !rules_.is_key(packets(run))) return;
+  if (front_is_proven(run)) key_opening_ = rules_.opening(packets_[run.first]);
+  if (!is_trusted_key(run)) return;
+  const std::uint32_t timestamp = packets_[index].timestamp;
+  const auto same = [timestamp](const KeyPicture& key) { return key.timestamp == timestamp; };
+  if (std::none_of(standing_keys_.begin(), standing_keys_.end(), same)) standing_keys_.push_back({timestamp, now});
+}
+
+PacketCollector::Run PacketCollector::run_around(std::size_t index) const {
+  const std::uint32_t timestamp = packets_[index].timestamp;
+  std::size_t first = index;
+  while (first > 0 && packets_[first - 1].timestamp == timestamp) --first;
+  std::size_t end = index + 1;
+  while (end < packets_.size() && packets_[end].timestamp == timestamp) ++end;
+  return {first, end - first};
+}
+
+bool PacketCollector::is_complete(Run run) const {
+  const SPacketInfo& first = packets_[run.first];
+  const SPacketInfo& last = packets_[run.first + run.count - 1];
+  return last.marker && static_cast<std::uint16_t>(last.sequence - first.sequence) == run.count - 1;
+}
+
+// The packet before the run's first is known, and belongs to another picture.
+bool PacketCollector::front_is_proven(Run run) const {
+  const std::uint16_t first = packets_[run.first].sequence;
+  if (follows_last_used(first)) return true;
+  return run.first > 0 && static_cast<std::uint16_t>(packets_[run.first - 1].sequence + 1) == first;
+}
+
+// Behind a gap nothing says that the picture's first packet is there, but the packet itself.
+bool PacketCollector::is_trusted_key(Run run) const {
+  const PacketRun packets = this->packets(run);
+  if (!rules_.is_key(packets)) return false;
+  if (front_is_proven(run)) return true;
+  if (key_opening_ != 0) return rules_.opening(packets.front()) == key_opening_;
+  return rules_.opens_whole(packets, preamble_seen_);
+}
+
+// The picture whose turn it is: the one that follows the last packet used, or, when none is tracked, the oldest.
+std::optional<PacketCollector::Run> PacketCollector::expected_run() const {
+  if (packets_.empty()) return std::nullopt;
+  if (!last_used_ || follows_last_used(packets_.front().sequence)) return run_around(0);
+  // Where the order of timestamps turns, the next picture need not stand first.
+  const auto next = std::find_if(packets_.begin(), packets_.end(),
+                                 [this](const SPacketInfo& packet) { return follows_last_used(packet.sequence); });
+  if (next == packets_.end()) return std::nullopt;
+  const Run run = run_around(static_cast<std::size_t>(next - packets_.begin()));
+  if (!follows_last_used(packets_[run.first].sequence)) return std::nullopt;
+  return run;
+}
+
+std::optional<PacketCollector::Run> PacketCollector::next_picture(Instant now) {
+  while (changed_) {
+    const std::optional<Run> run = expected_run();
+    if (!run || !is_complete(*run)) break;
+    const bool key = rules_.is_key(packets(*run));
+    if (last_used_ && (key || !waiting_for_key_)) return run;
+    if (key && is_trusted_key(*run)) return run;
+    if (key) break;
+    mark_used(*run);
+  }
+  changed_ = false;
+  return first_standing_key(now);
+}
+
+// The wait for what is missing before a key picture ends: the earliest that stands complete begins afresh.
+std::optional<PacketCollector::Run> PacketCollector::first_standing_key(Instant now) {
+  const std::optional<Instant> end_of_wait = deadline();
+  if (!end_of_wait || now < *end_of_wait) return std::nullopt;
+  last_used_.reset();
+  waiting_for_key_ = true;
+  while (!standing_keys_.empty()) {
+    const auto earliest = std::min_element(
+        standing_keys_.begin(), standing_keys_.end(),
+        [](const KeyPicture& a, const KeyPicture& b) { return timestamp_is_after(b.timestamp, a.timestamp); });
+    const std::uint32_t timestamp = earliest->timestamp;
+    std::erase_if(packets_,
+                  [timestamp](const SPacketInfo& packet) { return timestamp_is_after(timestamp, packet.timestamp); });
+    const std::optional<Run> run = run_of(timestamp);
+    if (run && is_complete(*run) && is_trusted_key(*run)) return run;
+    standing_keys_.erase(earliest);  // a part of it has been overwritten
+  }
+  changed_ = true;
+  return std::nullopt;
+}
+
+std::optional<PacketCollector::Run> PacketCollector::run_of(std::uint32_t timestamp) const {
+  const auto found = std::find_if(packets_.begin(), packets_.end(),
+                                  [timestamp](const SPacketInfo& packet) { return packet.timestamp == timestamp; });
+  if (found == packets_.end()) return std::nullopt;
+  return run_around(static_cast<std::size_t>(found - packets_.begin()));
+}
+
+void PacketCollector::use(Run run) {
+  if (rules_.is_key(packets(run))) waiting_for_key_ = false;
+  mark_used(run);
+}
+
+void PacketCollector::abandon(Run run) {
+  mark_used(run);
+  waiting_for_key_ = true;
+}
+
+void PacketCollector::mark_used(Run run) {
+  const auto first = packets_.begin() + static_cast<std::ptrdiff_t>(run.first);
+  const auto end = first + static_cast<std::ptrdiff_t>(run.count);
+  const std::uint32_t timestamp = first->timestamp;
+  last_used_ = (end - 1)->sequence;
+  last_used_timestamp_ = timestamp;
+  recent_.add(timestamp, first->sequence, *last_used_);
+  packets_.erase(first, end);
+  std::erase_if(standing_keys_, [timestamp](const KeyPicture& key) { return key.timestamp == timestamp; });
+  changed_ = true;
+  remove_passed_by();
+}
+
+// What is listed but no longer ahead will never be used. In order, both ends of the list tell that there is nothing.
+void PacketCollector::remove_passed_by() {
+  if (packets_.empty()) return;
+  const auto passed = [this](const SPacketInfo& packet) { return !sequence_is_ahead(packet.sequence, *last_used_); };
+  if (!passed(packets_.front()) && !passed(packets_.back())) return;
+  std::erase_if(packets_, passed);
+}
+
+void PacketCollector::drop_overwritten(const std::vector<PacketRing::Slot>& slots) {
+  bool lost = false;
+  for (const PacketRing::Slot& slot : slots) {
+    SPacketInfo key;
+    key.timestamp = slot.timestamp;
+    key.sequence = slot.sequence;
+    std::erase_if(strays_, [&key](const SPacketInfo& stray) { return stray.sequence == key.sequence; });
+    if (!is_listed(key)) continue;
+    packets_.erase(place_of(packets_, key) - 1);
+    lost = true;
+  }
+  if (lost) forget_sequence();
+}
+
+std::optional<PacketCollector::Instant> PacketCollector::deadline() const {
+  if (standing_keys_.empty()) return std::nullopt;
+  const auto earlier = [](const KeyPicture& a, const KeyPicture& b) { return a.complete_since < b.complete_since; };
+  return std::min_element(standing_keys_.begin(), standing_keys_.end(), earlier)->complete_since + kKeyPicturePatience;
+}
+
+// The next key picture starts afresh. Without a sequence there is nothing to forget.
+void PacketCollector::forget_sequence() {
+  std::erase_if(standing_keys_, [this](const KeyPicture& key) { return !run_of(key.timestamp); });
+  changed_ = true;
+  if (!last_used_) return;
+  last_used_.reset();
+  waiting_for_key_ = true;
+}
+
+}  // namespace vexa

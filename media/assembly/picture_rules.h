@@ -1,0 +1,26 @@
+// What the collection of pictures must know of a codec.
+#pragma once
+
+#include <cstdint>
+#include <span>
+
+#include "vexa/video_info.h"
+
+namespace vexa {
+
+/// The packets of one picture, in sequence order; each holds at least an RTP header.
+using PacketRun = std::span<const SPacketInfo>;
+
+struct PictureRules {
+  /// The picture can be shown without those before it.
+  bool (*is_key)(PacketRun run);
+  /// How the picture's first packet begins it: a code of the codec's own, 0 when it can only continue one.
+  std::uint8_t (*opening)(const SPacketInfo& first);
+  /// The packet holds what key pictures of this camera open with (parameter sets).
+  bool (*is_preamble)(const SPacketInfo& packet);
+  /// Whether a key picture that opens this way is whole at its front, as far as it tells by itself; `preamble_seen`
+  /// says that the camera sends preambles.
+  bool (*opens_whole)(PacketRun run, bool preamble_seen);
+};
+
+}  // namespace vexa

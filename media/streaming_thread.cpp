@@ -1,0 +1,182 @@
+// CVexaCommon: starting and stopping video, and the thread between.
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdlib>
+#include <new>
+
+#include "device/driver_state.h"
+#include "device/raised_timeout.h"
+#include "media/assembly/h264_units.h"
+#include "runtime/base/sync.h"
+#include "transport/failure.h"
+#include "vexa/runtime.h"
+#include "vexa/vexa_common.h"
+
+namespace {
+
+constexpr unsigned int kFrameCapacity = 1200000;
+constexpr unsigned int kLargeFrameCapacity = 2000000;
+constexpr int kRtspPort = 554;
+constexpr int kRtspTransport = 1;
+constexpr int kOpenTimeout = 40000;       // milliseconds
+constexpr useconds_t kExitPoll = 100000;  // microseconds
+
+}  // namespace
+
+ELibDReturnCode CVexaCommon::StartVideoStreaming() {
+  if (IsStopRequested()) return LIBD_FAILED;
+  StopVideoStreaming();
+  const SLibDCameraInfo camera = PrepareCamera();
+  const bool rtp = ConnectionInfo().streamTransport == kRtspTransport;
+  if (rtp && !OpenLiveRtp(camera.streamNumber)) return LIBD_FAILED;
+  if (!rtp) OpenLiveHttp(camera.streamNumber);
+  if (m_StreamSocket == -1) {
+    ReleaseRtpPacketsPtr();
+    return LatestErrorCode();
+  }
+  return StartStreamingThread(camera.codecName);
+}
+
+SLibDCameraInfo CVexaCommon::PrepareCamera() {
+  const vexa::Guard guard(m_ConnectionLock);
+  m_CameraInfo.rtspPort = kRtspPort;
+  return m_CameraInfo;
+}
+
+void CVexaCommon::OpenLiveHttp(int stream) {
+  m_RtpLiveMode = false;
+  m_EdgeStoragePlayback = false;
+  m_StreamSocket = http_open("/image%d", stream);
+}
+
+bool CVexaCommon::OpenLiveRtp(int stream) {
+  if (!InitEdgeStorageKeepAlivePeriod()) return false;
+  m_RtpLiveMode = true;
+  m_EdgeStoragePlayback = false;
+  if (!AllocateRtpPackets()) return false;
+  const SLibDConnectionInfo connection = ConnectionInfo();
+  const vexa::RaisedTimeout slow(m_ConnectionInfo.timeout, m_ConnectionLock, {kOpenTimeout, m_SavedTimeout});
+  m_RtspSocket = rtp_over_udp_open("rtsp://%s:%d/media/video%d", connection.host.c_str(), kRtspPort, stream);
+  if (m_RtspSocket == -1 && m_StreamSocket != -1) {
+    rtp_over_tcp_close(m_StreamSocket);
+    m_StreamSocket = -1;
+    Fail({LIBD_STREAM_OPEN_FAILED, LatestErrorText().c_str()});
+  }
+  return true;
+}
+
+bool CVexaCommon::AllocateRtpPackets() {
+  ReleaseRtpPacketsPtr();
+  m_RtpPacketBuffer = static_cast<unsigned char*>(std::malloc(vexa::PacketRing::kSize));
+  if (m_RtpPacketBuffer == nullptr) return false;
+  m_RtpPackets.clear();
+  m_State->rtp = std::make_unique<vexa::RtpReception>(m_RtpPackets, vexa::kH264Rules);
+  return true;
+}
+
+ELibDReturnCode CVexaCommon::StartStreamingThread(const std::string& codec) {
+  m_LastFrameTime = m_State->now();
+  {
+    const vexa::Guard guard(m_FrameQueueLock);
+    if (codec != "JPEG") m_LargeFrameBuffers = false;
+    delete[] m_StagingBuffer;
+    m_StagingBufferSize = m_LargeFrameBuffers ? kLargeFrameCapacity : kFrameCapacity;
+    m_StagingBuffer = new unsigned char[m_StagingBufferSize]();
+  }
+  m_StreamingThread = _beginthreadex(nullptr, 0, StreamingThread, this, 0, nullptr);
+  if (m_StreamingThread != nullptr) return LIBD_OK;
+  FailSystem(EAGAIN);
+  StopVideoStreaming();
+  return LIBD_FAILED;
+}
+
+unsigned int CVexaCommon::StreamingThread(void* driver) {
+  auto* self = static_cast<CVexaCommon*>(driver);
+  if (self == nullptr || self->IsStopRequested()) return 0;
+  bool wait_key = false;
+  do {
+    VideoFrameInfo frame;
+    ELibDReturnCode result = LIBD_TIMEOUT;
+    try {
+      self->TakeFrame(frame);
+      result = self->ReadFrame(frame);
+    } catch (const std::bad_alloc&) {
+      result = LIBD_TIMEOUT;
+    }
+    ProcessCurrentFrameData(self, frame, wait_key, result);
+    if (!self->NextReadWaits(result)) {
+      WaitForSingleObject(self->m_StopVideoEvent, static_cast<unsigned long>(self->m_StreamWaitMs));
+    }
+  } while (!self->IsStopRequested());
+  return 0;
+}
+
+// After a picture from RTP the next read waits for a datagram and for the stop event in one: a wait of its own would
+// cost a wake-up a picture, which is most of what a slow stream costs.
+bool CVexaCommon::NextReadWaits(ELibDReturnCode result) const {
+  return result == LIBD_OK && (m_EdgeStoragePlayback || m_RtpLiveMode);
+}
+
+void CVexaCommon::TakeFrame(VideoFrameInfo& frame) {
+  const vexa::Guard guard(m_FrameQueueLock);
+  frame.capacity = m_LargeFrameBuffers ? kLargeFrameCapacity : kFrameCapacity;
+  frame.data = m_State->spare_frames.take(frame.capacity);
+}
+
+ELibDReturnCode CVexaCommon::ReadFrame(VideoFrameInfo& frame) {
+  if (!m_EdgeStoragePlayback && !m_RtpLiveMode) return GetCurrentFrameData(frame);
+  const ELibDReturnCode result = GetRtpCurrentVideoFrame(StreamCodec(), frame);
+  KeepAlive();
+  return result;
+}
+
+std::string CVexaCommon::StreamCodec() {
+  if (m_EdgeStoragePlayback) return m_EdgeStorageCodec;
+  const vexa::Guard guard(m_ConnectionLock);
+  return m_CameraInfo.codecName;
+}
+
+ELibDReturnCode CVexaCommon::StopVideoStreaming() {
+  {
+    const vexa::Guard guard(m_VideoStateLock);
+    if (m_StreamSocket == -1) return LIBD_OK;
+    if (m_StopVideoRequested) return LIBD_FAILED;
+    m_StopVideoRequested = true;
+  }
+  EndStreamingThread();
+  if (m_EdgeStoragePlayback || m_RtpLiveMode) {
+    StopRtpVideoStreaming();
+  } else {
+    http_close(m_StreamSocket);
+    const vexa::Guard guard(m_VideoStateLock);
+    m_StreamSocket = -1;
+  }
+  ClearFrameQueue();
+  const vexa::Guard guard(m_VideoStateLock);
+  m_StopVideoRequested = false;
+  return LIBD_OK;
+}
+
+void CVexaCommon::EndStreamingThread() {
+  SetEvent(m_StopVideoEvent);
+  unsigned long code = 0;
+  while (GetExitCodeThread(m_StreamingThread, &code) != 0 && code == STILL_ACTIVE) usleep(kExitPoll);
+  ResetEvent(m_StopVideoEvent);
+  if (m_StreamingThread != nullptr) CloseHandle(m_StreamingThread);
+  m_StreamingThread = nullptr;
+}
+
+ELibDReturnCode CVexaCommon::StopRtpVideoStreaming() {
+  if (m_RtspSocket != -1 || m_StreamSocket != -1) rtp_over_udp_close();
+  const vexa::Guard guard(m_FrameQueueLock);
+  ReleaseRtpPacketsPtr();
+  return LIBD_OK;
+}
+
+void CVexaCommon::ReleaseRtpPacketsPtr() {
+  m_State->rtp.reset();
+  m_RtpPackets.clear();
+  std::free(m_RtpPacketBuffer);
+  m_RtpPacketBuffer = nullptr;
+}
