@@ -1,0 +1,58 @@
+// The camera's texts of video settings: codec words, sizes, keys of one stream.
+#pragma once
+
+#include <cstddef>
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "vexa/video_info.h"
+
+namespace vexa {
+
+/// A value inside an answer and the place where it ends.
+struct PlacedValue {
+  std::string_view text;
+  std::size_t end;
+};
+
+/// The value of the key that stands at `key_at` and is `key_length` long, up to the next "&" or the end. Empty when the
+/// key does not lie in the answer.
+PlacedValue value_behind(std::string_view answer, std::size_t key_at, std::size_t key_length);
+
+/// The key of one stream's setting: ("ImageCodec", 1) is "ImageCodec1=".
+std::string stream_key(const char* name, int stream);
+
+/// A video codec as the host knows it.
+struct VideoCodec {
+  const char* name;        ///< "JPEG", "MPEG4" or "H.264"
+  std::int32_t codecType;  ///< 0, 1 or 2
+};
+
+/// The codec a stream sends in a camera's mode `word`; null for an unknown word.
+const VideoCodec* video_codec_of(std::string_view word);
+
+/// The video standard that the value names; PAL when it names none.
+ELibDVideoStandard video_standard_of(std::string_view value);
+
+/// The size of a stream's pictures as the camera gives it.
+struct StreamSize {
+  int width;
+  int height;
+  std::optional<std::string> text;  ///< nothing for a size that has no name
+};
+
+/// Reads "width,height". A height of 0 stands for the classic height of the width.
+StreamSize read_stream_size(std::string_view value);
+
+/// How a request names a codec and what bounds its data.
+struct CodecRequest {
+  const char* word;     ///< the camera's word of the codec
+  const char* rateKey;  ///< "BitRate" or "Quality"
+  int rate;             ///< kbit/s or JPEG quality level
+};
+
+/// The request's part for the codec named in `info`; any name that is not known asks for JPEG.
+CodecRequest codec_request(const SLibDCameraInfo& info);
+
+}  // namespace vexa

@@ -1,0 +1,220 @@
+// Exposure and image controls. Setters send one request; getters read the cached answer of the camera inquiry.
+#include "device/cgi/image_text.h"
+#include "runtime/base/sync.h"
+#include "runtime/base/text.h"
+#include "transport/wire/cgi_answer.h"
+#include "vexa/vexa_common.h"
+
+namespace {
+
+constexpr unsigned kLargestLevel = 10000;
+constexpr int kLargestStep = 10000;
+
+/// Reads the word of `key`; the value stays when the answer lacks the key or the word is not known.
+template <typename Value, std::size_t kRows>
+ELibDReturnCode read_word(const std::string& answer, const char* key, const vexa::Word<Value> (&table)[kRows],
+                          Value& value) {
+  const auto word = vexa::cgi_value(answer, key);
+  if (!word) return LIBD_FAILED;
+  const std::optional<Value> read = vexa::value_of(table, *word);
+  if (!read) return LIBD_FAILED;
+  value = *read;
+  return LIBD_OK;
+}
+
+bool read_number(const std::string& answer, const char* key, int& value) {
+  const auto text = vexa::cgi_value(answer, key);
+  if (!text) return false;
+  value = vexa::leading_int(std::string(*text));
+  return true;
+}
+
+/// Takes an entry's place for a caller that counts without a sign; false when there is no such entry.
+bool take_entry(int found, unsigned& entry) {
+  if (found < 0) return false;
+  entry = static_cast<unsigned>(found);
+  return true;
+}
+
+bool step_along(const vexa::ExposureSteps& steps, int step, int& value) {
+  const std::optional<int> next = vexa::next_exposure_value(steps, value, step);
+  if (!next) return false;
+  value = *next;
+  return true;
+}
+
+}  // namespace
+
+ELibDReturnCode CVexaCommon::SetBrightMode(std::string& mode) {
+  if (mode.empty()) return LIBD_INVALID_ARGUMENT;
+  const char* word = vexa::exposure_word_of(mode);
+  if (word == nullptr) return LIBD_FAILED;
+  // Kept: the stored mode stays; the host stores it with SetPTZControlInfo once the camera has taken it.
+  return SendCommand("/command/camera.cgi?ExpMode=%s", word);
+}
+
+ELibDReturnCode CVexaCommon::SetBackLightCompMode(bool on) {
+  return SendCommand("/command/camera.cgi?BLComp=%s", on ? "on" : "off");
+}
+
+ELibDReturnCode CVexaCommon::Bright(int step) {
+  const ELibDReturnCode amount = CheckAmountOfBrightness(step);
+  if (amount != LIBD_OK) return amount;
+  const ELibDReturnCode mode = CheckCurrentBrightMode();
+  if (mode != LIBD_OK) return mode;
+  std::string answer;
+  // Kept: what the camera says here does not enter the cache; the getters' values stay those of one moment.
+  if (SendInqCommand("camera", answer) != LIBD_OK) return LatestErrorCode();
+  int value = 0;
+  unsigned entry = 0;
+  if (StoredBrightMode() == vexa::kShutterPriority) {
+    const bool moves =
+        GetShutterSpeedFromCameraData(answer, value, entry) && GetShutterSpeedFromShutterSpeedList(step, value, entry);
+    return moves ? SendCommand("/command/camera.cgi?Shutter=%d", value) : LIBD_OK;
+  }
+  const bool moves =
+      GetIrisPositionFromCameraData(answer, value, entry) && GetIrisPositionFromIrisList(step, value, entry);
+  return moves ? SendCommand("/command/camera.cgi?Iris=%d", value) : LIBD_OK;
+}
+
+ELibDReturnCode CVexaCommon::CheckAmountOfBrightness(int step) {
+  return step == 0 || step < -kLargestStep || step > kLargestStep ? LIBD_INVALID_ARGUMENT : LIBD_OK;
+}
+
+ELibDReturnCode CVexaCommon::CheckCurrentBrightMode() {
+  return vexa::exposure_control_of(StoredBrightMode()) ? LIBD_OK : LIBD_INVALID_MODE;
+}
+
+std::string CVexaCommon::StoredBrightMode() {
+  const vexa::Guard guard(m_ConnectionLock);
+  return m_PTZControlInfo.brightMode;
+}
+
+void CVexaCommon::GetShutterAndIrisMode(int& shutterEntry, int& irisEntry) {
+  shutterEntry = vexa::exposure_entry(m_FixedPTZControlInfo.brightModes, vexa::kShutterPriority);
+  irisEntry = vexa::exposure_entry(m_FixedPTZControlInfo.brightModes, vexa::kIrisPriority);
+}
+
+bool CVexaCommon::GetShutterSpeedFromCameraData(const std::string& answer, int& value, unsigned& entry) {
+  int shutter_entry = -1;
+  int iris_entry = -1;
+  GetShutterAndIrisMode(shutter_entry, iris_entry);
+  return read_number(answer, "&Shutter=", value) && take_entry(shutter_entry, entry);
+}
+
+bool CVexaCommon::GetIrisPositionFromCameraData(std::string& answer, int& value, unsigned& entry) {
+  int shutter_entry = -1;
+  int iris_entry = -1;
+  GetShutterAndIrisMode(shutter_entry, iris_entry);
+  return read_number(answer, "&Iris=", value) && take_entry(iris_entry, entry);
+}
+
+bool CVexaCommon::GetShutterSpeedFromShutterSpeedList(int step, int& value, unsigned entry) {
+  const vexa::ExposureModes& modes = m_FixedPTZControlInfo.brightModes;
+  return entry < modes.size() && step_along(modes[entry].shutterSpeeds, step, value);
+}
+
+bool CVexaCommon::GetIrisPositionFromIrisList(int step, int& value, unsigned entry) {
+  const vexa::ExposureModes& modes = m_FixedPTZControlInfo.brightModes;
+  return entry < modes.size() && step_along(modes[entry].irisPositions, step, value);
+}
+
+ELibDReturnCode CVexaCommon::BrightAbsolute(int level) {
+  if (static_cast<unsigned>(level) > kLargestLevel) return LIBD_INVALID_ARGUMENT;
+  const std::string mode = StoredBrightMode();
+  const auto control = vexa::exposure_control_of(mode);
+  if (!control) return LIBD_INVALID_MODE;
+  const vexa::ExposureModes& modes = m_FixedPTZControlInfo.brightModes;
+  unsigned entry = 0;
+  if (!take_entry(vexa::exposure_entry(modes, mode), entry)) return LIBD_OK;
+  const bool shutter = *control == vexa::ExposureControl::kShutter;
+  const vexa::ExposureSteps& steps = shutter ? modes[entry].shutterSpeeds : modes[entry].irisPositions;
+  // Safe: a list without steps has no largest value to read.
+  if (steps.empty()) return LIBD_OK;
+  const int value = vexa::exposure_value(level, steps.back().value);
+  return shutter ? SendCommand("/command/camera.cgi?Shutter=%d", value)
+                 : SendCommand("/command/camera.cgi?Iris=%d", value);
+}
+
+bool CVexaCommon::CameraInquiry(std::string& answer) {
+  {
+    const vexa::Guard guard(m_CameraInquiryLock);
+    answer = m_CameraInquiryCache;
+  }
+  if (!answer.empty()) return true;
+  if (SendInqCommand("camera", answer) != LIBD_OK) return false;
+  StoreCameraInquiry(answer);
+  return true;
+}
+
+// Kept: the cached answer outlives the change, so getters tell the value before it until GetCameraInfo asks anew. A
+// getter that is storing an answer finishes first.
+ELibDReturnCode CVexaCommon::AfterImageChange(ELibDReturnCode sent) {
+  if (sent != LIBD_OK) return sent;
+  const vexa::Guard guard(m_CameraInquiryLock);
+  return LIBD_OK;
+}
+
+ELibDReturnCode CVexaCommon::GetDayNightMode(ELibDDayNightType& mode) {
+  std::string answer;
+  if (!CameraInquiry(answer)) return LatestErrorCode();
+  const auto read = vexa::day_night_of(answer);
+  if (!read) return LIBD_FAILED;
+  mode = *read;
+  return mode == LIBD_DAYNIGHT_UNKNOWN ? LIBD_FAILED : LIBD_OK;
+}
+
+ELibDReturnCode CVexaCommon::SetDayNightMode(ELibDDayNightType mode) {
+  const char* request = vexa::word_of(vexa::kDayNightRequests, mode);
+  if (request == nullptr) return LIBD_INVALID_ARGUMENT;
+  return SendCommand("/command/camera.cgi?DayNightMode=%s", request);
+}
+
+ELibDReturnCode CVexaCommon::GetVisibilityEnhancerMode(ELibDVisibilityEnhancerType& mode) {
+  std::string answer;
+  if (!CameraInquiry(answer)) return LatestErrorCode();
+  return read_word(answer, "&VisibilityEnhancer=", vexa::kVisibilityWords, mode);
+}
+
+ELibDReturnCode CVexaCommon::SetVisibilityEnhancerMode(ELibDVisibilityEnhancerType mode) {
+  const char* word = vexa::word_of(vexa::kVisibilityWords, mode);
+  if (word == nullptr) return LIBD_INVALID_ARGUMENT;
+  return AfterImageChange(SendCommand("/command/camera.cgi?VisibilityEnhancer=%s", word));
+}
+
+ELibDReturnCode CVexaCommon::GetXdnrMode(ELibDXdnrType& mode) {
+  std::string answer;
+  if (!CameraInquiry(answer)) return LatestErrorCode();
+  return read_word(answer, "&XDNR=", vexa::kXdnrWords, mode);
+}
+
+ELibDReturnCode CVexaCommon::SetXdnrMode(ELibDXdnrType mode) {
+  const char* word = vexa::word_of(vexa::kXdnrWords, mode);
+  if (word == nullptr) return LIBD_INVALID_ARGUMENT;
+  return AfterImageChange(SendCommand("/command/camera.cgi?XDNR=%s", word));
+}
+
+ELibDReturnCode CVexaCommon::GetViewDR(ELibDViewDRMode& mode) {
+  std::string answer;
+  if (!CameraInquiry(answer)) return LatestErrorCode();
+  return read_word(answer, "&ViewDR=", vexa::kViewDrWords, mode);
+}
+
+ELibDReturnCode CVexaCommon::SetViewDR(ELibDViewDRMode mode) {
+  const char* word = vexa::word_of(vexa::kViewDrWords, mode);
+  if (word == nullptr) return LIBD_INVALID_ARGUMENT;
+  return AfterImageChange(SendCommand("/command/camera.cgi?ViewDR=%s", word));
+}
+
+ELibDReturnCode CVexaCommon::GetIRIlluminator(ELibIRIlluminatorMode& mode, int& strength) {
+  std::string answer;
+  if (!CameraInquiry(answer)) return LatestErrorCode();
+  if (read_word(answer, "&IRLed=", vexa::kIlluminatorWords, mode) != LIBD_OK) return LIBD_FAILED;
+  return read_number(answer, "&IRLedMaxStrength=", strength) ? LIBD_OK : LIBD_FAILED;
+}
+
+// Kept: any mode that is not day/night switches the illuminator off; there is no wrong mode.
+ELibDReturnCode CVexaCommon::SetIRIlluminator(ELibIRIlluminatorMode mode, int strength) {
+  const char* word = mode == LIB_IR_DAYNIGHT ? "daynight" : "off";
+  return AfterImageChange(SendCommand("/command/camera.cgi?IRLed=%s&IRLedMaxStrength=%d", word, strength));
+}
