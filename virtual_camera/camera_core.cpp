@@ -1,0 +1,101 @@
+#include "virtual_camera/camera_core.h"
+
+#include <fmt/format.h>
+
+#include <utility>
+
+#include "virtual_camera/http_connection.h"
+#include "virtual_camera/rtp_packetiser.h"
+#include "virtual_camera/rtsp_connection.h"
+
+namespace vexa::camera {
+namespace {
+
+template <typename Kind>
+std::shared_ptr<Listener> listener_of(const std::shared_ptr<CameraState>& state) {
+  return std::make_shared<Listener>(
+      state, [state](asio::ip::tcp::socket socket) { return std::make_shared<Kind>(std::move(socket), state); });
+}
+
+std::string bind_failure(const std::string& address, std::uint16_t port, const asio::error_code& error) {
+  std::string text = fmt::format("cannot listen on {}:{}: {}", address, port, error.message());
+  if (error == asio::error::access_denied) {
+    text +=
+        "; ports below 1024 need root: run as root, or in a namespace of your own (unshare -rn, then "
+        "\"ip link set lo up\"), or choose other ports (--http-port, --rtsp-port)";
+  }
+  return text;
+}
+
+}  // namespace
+
+CameraCore::CameraCore(std::shared_ptr<CameraState> state)
+    : state_(std::move(state)),
+      http_(listener_of<HttpConnection>(state_)),
+      rtsp_(listener_of<RtspConnection>(state_)),
+      back_(state_->context) {}
+
+std::string CameraCore::open_ports() {
+  const CameraOptions& options = state_->options;
+  if (const asio::error_code error = http_->open(options.http_port)) {
+    return bind_failure(options.address, options.http_port, error);
+  }
+  if (const asio::error_code error = rtsp_->open(options.rtsp_port)) {
+    http_->close();
+    return bind_failure(options.address, options.rtsp_port, error);
+  }
+  return {};
+}
+
+std::string CameraCore::prepare() {
+  CameraOptions& options = state_->options;
+  const bool rates_stand = options.frames_per_second > 0 && options.speed > 0 && options.clock_rate > 0;
+  if (!rates_stand) return "frames per second, speed and clock rate must be above 0";
+  if (options.max_payload < 3 || options.burst_packets == 0) return "too small a packet or burst";
+  if (options.clip || options.clip_path.empty()) return {};
+  options.clip = PacketisedClip::load(options.clip_path, options.max_payload);
+  return options.clip ? "" : fmt::format("no H.264 pictures in {}", options.clip_path);
+}
+
+std::string CameraCore::start() {
+  if (running_) return {};
+  std::string failure = prepare();
+  if (failure.empty()) failure = open_ports();
+  if (!failure.empty()) return failure;
+  running_ = true;
+  state_->reboot = [weak = weak_from_this()](std::chrono::milliseconds away) {
+    if (const std::shared_ptr<CameraCore> core = weak.lock()) core->reboot(away);
+  };
+  return {};
+}
+
+void CameraCore::vanish() {
+  http_->close();
+  rtsp_->close();
+  for (const std::weak_ptr<Connection>& weak : std::exchange(state_->connections, {})) {
+    if (const std::shared_ptr<Connection> connection = weak.lock()) connection->reset();
+  }
+}
+
+void CameraCore::stop() {
+  running_ = false;
+  state_->reboot = nullptr;
+  back_.cancel();
+  vanish();
+}
+
+void CameraCore::reboot(std::chrono::milliseconds away) {
+  if (!running_) return;
+  vanish();
+  back_.expires_after(away);
+  back_.async_wait([self = shared_from_this()](asio::error_code error) {
+    if (!error && self->running_) self->come_back();
+  });
+}
+
+void CameraCore::come_back() {
+  constexpr std::chrono::milliseconds kRetry{50};
+  if (!open_ports().empty()) reboot(kRetry);
+}
+
+}  // namespace vexa::camera

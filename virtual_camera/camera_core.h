@@ -1,0 +1,44 @@
+// A running camera: its two ports, its sessions, its life cycle. Lives on the loop's thread.
+#ifndef VIRTUAL_CAMERA_CAMERA_CORE_H_
+#define VIRTUAL_CAMERA_CAMERA_CORE_H_
+
+#include <asio.hpp>
+#include <chrono>
+#include <cstdint>
+#include <memory>
+#include <string>
+
+#include "virtual_camera/camera_state.h"
+#include "virtual_camera/listener.h"
+
+namespace vexa::camera {
+
+class CameraCore : public std::enable_shared_from_this<CameraCore> {
+ public:
+  explicit CameraCore(std::shared_ptr<CameraState> state);
+
+  // Empty text on success, else what went wrong and what to do about it.
+  [[nodiscard]] std::string start();
+  void stop();
+  void reboot(std::chrono::milliseconds away);
+
+  [[nodiscard]] const std::shared_ptr<CameraState>& state() const { return state_; }
+  [[nodiscard]] std::uint16_t http_port() const { return http_->port(); }
+  [[nodiscard]] std::uint16_t rtsp_port() const { return rtsp_->port(); }
+
+ private:
+  [[nodiscard]] std::string prepare();
+  [[nodiscard]] std::string open_ports();
+  void vanish();
+  void come_back();
+
+  std::shared_ptr<CameraState> state_;
+  std::shared_ptr<Listener> http_;
+  std::shared_ptr<Listener> rtsp_;
+  asio::steady_timer back_;
+  bool running_ = false;
+};
+
+}  // namespace vexa::camera
+
+#endif  // VIRTUAL_CAMERA_CAMERA_CORE_H_

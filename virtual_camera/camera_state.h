@@ -1,0 +1,56 @@
+// What the parts of one running camera share.
+#ifndef VIRTUAL_CAMERA_CAMERA_STATE_H_
+#define VIRTUAL_CAMERA_CAMERA_STATE_H_
+
+#include <chrono>
+#include <cstdint>
+#include <functional>
+#include <map>
+#include <memory>
+#include <mutex>
+#include <utility>
+#include <vector>
+
+#include "virtual_camera/event_loop.h"
+#include "virtual_camera/journal.h"
+#include "virtual_camera/options.h"
+#include "virtual_camera/request_faults.h"
+#include "virtual_camera/sent_log.h"
+#include "virtual_camera/settings_store.h"
+
+namespace vexa::camera {
+
+class Connection;
+class RtspSession;
+
+// Held by every connection, so it outlives the last of them. Members without a lock of their own belong to the loop's
+// thread, once the camera has started.
+struct CameraState {
+  CameraState(CameraOptions camera_options, asio::io_context& loop_context)
+      : options(std::move(camera_options)),
+        context(loop_context),
+        journal(options.journal_limit),
+        sent(options.sent_log_limit),
+        packet_faults(options.packet_faults),
+        next_session(options.first_session) {
+    for (const RequestFault& fault : options.request_faults) request_faults.add(fault);
+  }
+
+  CameraOptions options;  // unchanged once the camera runs
+  asio::io_context& context;
+  SettingsStore settings;
+  Journal journal;
+  SentLog sent;
+  RequestFaultList request_faults;
+  std::mutex packet_faults_mutex;
+  PacketFaults packet_faults;  // under packet_faults_mutex; options hold those given at the start
+  std::vector<std::weak_ptr<Connection>> connections;
+  std::map<std::uint32_t, std::shared_ptr<RtspSession>> sessions;
+  std::uint32_t next_session;
+  std::uint64_t plays = 0;                                // streams begun
+  std::function<void(std::chrono::milliseconds)> reboot;  // empty while the camera is stopped
+};
+
+}  // namespace vexa::camera
+
+#endif  // VIRTUAL_CAMERA_CAMERA_STATE_H_

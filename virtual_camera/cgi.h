@@ -1,0 +1,26 @@
+// The camera's HTTP commands: one request head in, one answer out.
+#ifndef VIRTUAL_CAMERA_CGI_H_
+#define VIRTUAL_CAMERA_CGI_H_
+
+#include <string>
+#include <string_view>
+
+#include "virtual_camera/message.h"
+#include "virtual_camera/settings_store.h"
+
+namespace vexa::camera {
+
+struct Answer {
+  int status = 0;
+  std::string bytes;
+};
+
+// `status` as in "404 Not Found".
+[[nodiscard]] Answer http_answer(std::string_view status, std::string_view body);
+
+// "/command/inquiry.cgi?inq=NAME" reads a section, "/command/NAME.cgi?KEY=VALUE&..." changes one.
+[[nodiscard]] Answer answer_command(const RequestHead& request, SettingsStore& settings);
+
+}  // namespace vexa::camera
+
+#endif  // VIRTUAL_CAMERA_CGI_H_

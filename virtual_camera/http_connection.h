@@ -1,0 +1,27 @@
+// The camera's HTTP side: one request, one answer, then the connection ends.
+#ifndef VIRTUAL_CAMERA_HTTP_CONNECTION_H_
+#define VIRTUAL_CAMERA_HTTP_CONNECTION_H_
+
+#include <string>
+#include <string_view>
+
+#include "virtual_camera/connection.h"
+
+namespace vexa::camera {
+
+class HttpConnection : public Connection {
+ public:
+  using Connection::Connection;
+
+ private:
+  RequestKind kind() const override { return RequestKind::kHttp; }
+  std::size_t request_size(std::string_view received) const override;
+  Answer answer(const std::string& request) override;
+  Answer refuse(const std::string& request, std::string_view status) const override;
+  Next answered() override { return Next::kCloseConnection; }
+  bool may_idle() const override { return false; }
+};
+
+}  // namespace vexa::camera
+
+#endif  // VIRTUAL_CAMERA_HTTP_CONNECTION_H_

@@ -1,0 +1,62 @@
+// Everything one virtual camera can be told at its start.
+#ifndef VIRTUAL_CAMERA_OPTIONS_H_
+#define VIRTUAL_CAMERA_OPTIONS_H_
+
+#include <chrono>
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "virtual_camera/faults.h"
+
+namespace vexa::camera {
+
+class PacketisedClip;
+
+enum class SessionExpiry { kNever, kWhenSilent };
+
+struct CameraOptions {
+  std::string address = "127.0.0.2";
+  std::uint16_t http_port = 0;    // 0: any free port
+  std::uint16_t rtsp_port = 554;  // 0: any free port
+  std::string user = "admin";     // user and password both empty: everyone is let in
+  std::string password = "admin";
+
+  // The clip to stream: a file in Annex-B byte stream format, or one already loaded, which wins and can be shared by
+  // many cameras. With neither, sessions open but carry no picture.
+  std::string clip_path;
+  std::shared_ptr<const PacketisedClip> clip;
+  bool loop = true;            // start the clip over at its end
+  std::uint64_t pictures = 0;  // end the stream after this many pictures; 0: no such end
+
+  double frames_per_second = 25;
+  double speed = 1;  // pace: 4 sends four times faster, with timestamps advancing by picture as at 1
+  std::uint32_t clock_rate = 90000;
+  std::uint16_t start_sequence = 1;
+  std::uint32_t start_timestamp = 100000000;
+  std::uint8_t payload_type = 96;
+  std::size_t max_payload = 1400;  // RTP payload bytes of one datagram, at least 3
+  // A picture goes out in bursts of at most this many packets, spread over half the picture's time.
+  std::size_t burst_packets = 16;
+  std::chrono::microseconds burst_gap{200};  // least pause between two bursts of one session, also when late
+
+  std::string range_clock;  // for instance "20240131T235959.250Z": adds the range line to the session description
+  std::uint32_t first_session = 12345678;    // numbers of later sessions count up from it
+  std::chrono::seconds session_timeout{60};  // as advertised
+  SessionExpiry session_expiry = SessionExpiry::kNever;
+  std::chrono::milliseconds request_time_limit{10000};  // for a request begun; then the connection is closed
+
+  std::uint64_t seed = 1;
+  PacketFaults packet_faults;
+  std::vector<RequestFault> request_faults;
+
+  std::size_t journal_limit = 100000;    // requests kept
+  std::size_t sent_log_limit = 1000000;  // packets kept; 0 keeps none
+  bool hash_packets = true;              // fill SentPacket::hash
+};
+
+}  // namespace vexa::camera
+
+#endif  // VIRTUAL_CAMERA_OPTIONS_H_

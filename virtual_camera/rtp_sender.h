@@ -1,0 +1,63 @@
+// Sends one session's RTP stream over UDP at the pace of the pictures, by an absolute schedule.
+#ifndef VIRTUAL_CAMERA_RTP_SENDER_H_
+#define VIRTUAL_CAMERA_RTP_SENDER_H_
+
+#include <asio.hpp>
+#include <chrono>
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <vector>
+
+#include "virtual_camera/camera_state.h"
+#include "virtual_camera/datagram_batch.h"
+#include "virtual_camera/fault_lane.h"
+#include "virtual_camera/rtp_stream.h"
+
+namespace vexa::camera {
+
+class RtpSender : public std::enable_shared_from_this<RtpSender> {
+ public:
+  RtpSender(std::shared_ptr<CameraState> state, std::uint32_t session);
+
+  // Opens the socket towards the client.
+  [[nodiscard]] asio::error_code open(const asio::ip::udp::endpoint& client);
+  [[nodiscard]] std::uint16_t port() const { return port_; }
+  // Starts with the first picture, now. Nothing happens without a clip or when already playing.
+  void play();
+  void stop();
+
+ private:
+  using Clock = std::chrono::steady_clock;
+  using Time = FaultLane::Time;
+
+  [[nodiscard]] Time picture_time(std::uint64_t picture) const;
+  [[nodiscard]] std::optional<Time> next_burst() const;
+  [[nodiscard]] std::optional<Time> next_event() const;
+  void load_picture();
+  void wait_for_next();
+  void run_event();
+  void offer_burst(Time now);
+  void slip_if_far_behind(Time event);
+
+  std::shared_ptr<CameraState> state_;
+  const std::uint32_t session_;
+  asio::ip::udp::socket socket_;
+  asio::steady_timer timer_;
+  DatagramBatch batch_;
+  std::uint16_t port_ = 0;
+  std::optional<RtpStream> stream_;
+  std::optional<FaultLane> lane_;
+  Clock::time_point started_;
+  Clock::time_point not_before_;   // the pause after a burst
+  std::vector<Outgoing> picture_;  // the picture under way
+  std::size_t offered_ = 0;        // packets of it already offered
+  std::uint64_t picture_index_ = 0;
+  std::vector<Outgoing> leaving_;
+  bool stopped_ = false;
+};
+
+}  // namespace vexa::camera
+
+#endif  // VIRTUAL_CAMERA_RTP_SENDER_H_

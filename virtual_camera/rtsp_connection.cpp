@@ -1,0 +1,133 @@
+#include "virtual_camera/rtsp_connection.h"
+
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <optional>
+#include <utility>
+
+#include "virtual_camera/credentials.h"
+#include "virtual_camera/rtsp_message.h"
+#include "virtual_camera/session_description.h"
+
+namespace vexa::camera {
+namespace {
+
+constexpr std::size_t kMaxSessions = 256;
+constexpr std::string_view kMethods = "Public: OPTIONS, DESCRIBE, SETUP, PLAY, GET_PARAMETER, TEARDOWN\r\n";
+// Status line and fields of DESCRIBE's answer, with the longest CSeq and Content-Length.
+constexpr std::size_t kDescribeHead = 120;
+
+Answer status_only(std::string_view status, std::optional<std::uint32_t> sequence) {
+  const std::string_view challenge = status.starts_with("401") ? "WWW-Authenticate: Basic realm=\"camera\"\r\n" : "";
+  return rtsp_answer({status, sequence, challenge, {}});
+}
+
+bool needs_credentials(std::string_view method) { return method != "OPTIONS" && method != "TEARDOWN"; }
+
+}  // namespace
+
+std::size_t RtspConnection::request_size(std::string_view received) const { return rtsp_request_size(received); }
+
+Answer RtspConnection::answer(const std::string& request) {
+  to_play_ = nullptr;
+  const std::optional<RequestHead> head = parse_head(request);
+  if (!head || !head->version.starts_with("RTSP/")) return status_only("400 Bad Request", std::nullopt);
+  const std::optional<std::uint32_t> sequence = sequence_of(*head);
+  if (!sequence) return status_only("400 Bad Request", std::nullopt);
+  const CameraOptions& options = state().options;
+  const bool let_in = credentials_match(head->field("Authorization"), options.user, options.password);
+  if (needs_credentials(head->method) && !let_in) return status_only("401 Unauthorized", sequence);
+  return dispatch(*head, *sequence);
+}
+
+Answer RtspConnection::refuse(const std::string& request, std::string_view status) const {
+  const std::optional<RequestHead> head = parse_head(request);
+  return status_only(status, head ? sequence_of(*head) : std::nullopt);
+}
+
+Answer RtspConnection::dispatch(const RequestHead& request, std::uint32_t sequence) {
+  if (request.method == "OPTIONS") return rtsp_answer({"200 OK", sequence, kMethods, {}});
+  if (request.method == "DESCRIBE") return describe(request, sequence);
+  if (request.method == "SETUP") return setup(request, sequence);
+  if (request.method == "PLAY") return play(request, sequence);
+  if (request.method == "GET_PARAMETER") return get_parameter(request, sequence);
+  if (request.method == "TEARDOWN") return teardown(request, sequence);
+  return rtsp_answer({"501 Not Implemented", sequence, kMethods, {}});
+}
+
+Answer RtspConnection::describe(const RequestHead& request, std::uint32_t sequence) {
+  if (classify_url(request.path) != VideoUrl::kStream) return status_only("404 Not Found", sequence);
+  const std::string description = describe_session(state().options, kMaxRtspAnswer - kDescribeHead);
+  return rtsp_answer({"200 OK", sequence, {}, description});
+}
+
+Answer RtspConnection::setup(const RequestHead& request, std::uint32_t sequence) {
+  if (classify_url(request.path) != VideoUrl::kTrack) return status_only("404 Not Found", sequence);
+  const std::string_view transport = request.field("Transport");
+  const std::uint16_t port = client_port_of(transport);
+  if (port == 0) return status_only("461 Unsupported Transport", sequence);
+  if (state().sessions.size() >= kMaxSessions) return status_only("453 Not Enough Bandwidth", sequence);
+  asio::error_code error;
+  const asio::ip::tcp::endpoint peer = socket().remote_endpoint(error);
+  const auto session = std::make_shared<RtspSession>(shared_state(), state().next_session);
+  if (!error) error = session->open({peer.address(), port});
+  if (error) return status_only("500 Internal Server Error", sequence);
+  ++state().next_session;
+  state().sessions[session->number()] = session;
+  own_sessions_.push_back(session);
+  session->touch();
+  const std::string fields =
+      fmt::format("Session: {};timeout={}\r\nTransport: RTP/AVP;unicast;client_port={}-{};server_port={}-{}\r\n",
+                  session->number(), state().options.session_timeout.count(), port, second_client_port_of(transport),
+                  session->server_port(), session->server_port() + 1);
+  return rtsp_answer({"200 OK", sequence, fields, {}});
+}
+
+std::shared_ptr<RtspSession> RtspConnection::find_session(const RequestHead& request) {
+  const auto found = state().sessions.find(session_of(request));
+  if (found == state().sessions.end()) return nullptr;
+  found->second->touch();
+  return found->second;
+}
+
+Answer RtspConnection::play(const RequestHead& request, std::uint32_t sequence) {
+  const std::shared_ptr<RtspSession> session = find_session(request);
+  if (!session) return status_only("454 Session Not Found", sequence);
+  if (classify_url(request.path) == VideoUrl::kNone) return status_only("404 Not Found", sequence);
+  to_play_ = session;
+  const std::string fields = fmt::format("Session: {}\r\nRange: npt=0.000-\r\n", session->number());
+  return rtsp_answer({"200 OK", sequence, fields, {}});
+}
+
+Answer RtspConnection::get_parameter(const RequestHead& request, std::uint32_t sequence) {
+  const std::shared_ptr<RtspSession> session = find_session(request);
+  if (!session) return status_only("454 Session Not Found", sequence);
+  return rtsp_answer({"200 OK", sequence, fmt::format("Session: {}\r\n", session->number()), {}});
+}
+
+Answer RtspConnection::teardown(const RequestHead& request, std::uint32_t sequence) {
+  const std::shared_ptr<RtspSession> session = find_session(request);
+  if (!session) return status_only("454 Session Not Found", sequence);
+  session->end();
+  return status_only("200 OK", sequence);
+}
+
+Connection::Next RtspConnection::answered() {
+  if (const std::shared_ptr<RtspSession> session = std::exchange(to_play_, nullptr)) session->play();
+  return Next::kReadOn;
+}
+
+bool RtspConnection::may_idle() const {
+  return std::any_of(own_sessions_.begin(), own_sessions_.end(),
+                     [](const std::weak_ptr<RtspSession>& session) { return !session.expired(); });
+}
+
+void RtspConnection::ended() {
+  to_play_ = nullptr;
+  for (const std::weak_ptr<RtspSession>& own : std::exchange(own_sessions_, {})) {
+    if (const std::shared_ptr<RtspSession> session = own.lock()) session->end();
+  }
+}
+
+}  // namespace vexa::camera

@@ -1,0 +1,44 @@
+// The camera's RTSP side. Sessions belong to the connection that set them up and end with it.
+#ifndef VIRTUAL_CAMERA_RTSP_CONNECTION_H_
+#define VIRTUAL_CAMERA_RTSP_CONNECTION_H_
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "virtual_camera/connection.h"
+#include "virtual_camera/message.h"
+#include "virtual_camera/rtsp_session.h"
+
+namespace vexa::camera {
+
+class RtspConnection : public Connection {
+ public:
+  using Connection::Connection;
+
+ private:
+  RequestKind kind() const override { return RequestKind::kRtsp; }
+  std::size_t request_size(std::string_view received) const override;
+  Answer answer(const std::string& request) override;
+  Answer refuse(const std::string& request, std::string_view status) const override;
+  Next answered() override;
+  bool may_idle() const override;
+  void ended() override;
+
+  Answer dispatch(const RequestHead& request, std::uint32_t sequence);
+  Answer describe(const RequestHead& request, std::uint32_t sequence);
+  Answer setup(const RequestHead& request, std::uint32_t sequence);
+  Answer play(const RequestHead& request, std::uint32_t sequence);
+  Answer get_parameter(const RequestHead& request, std::uint32_t sequence);
+  Answer teardown(const RequestHead& request, std::uint32_t sequence);
+  std::shared_ptr<RtspSession> find_session(const RequestHead& request);
+
+  std::vector<std::weak_ptr<RtspSession>> own_sessions_;
+  std::shared_ptr<RtspSession> to_play_;  // starts when the answer to PLAY has left
+};
+
+}  // namespace vexa::camera
+
+#endif  // VIRTUAL_CAMERA_RTSP_CONNECTION_H_

@@ -1,0 +1,46 @@
+// RTSP (RFC 2326) texts: what the camera reads from requests and how its answers look.
+#ifndef VIRTUAL_CAMERA_RTSP_MESSAGE_H_
+#define VIRTUAL_CAMERA_RTSP_MESSAGE_H_
+
+#include <cstddef>
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "virtual_camera/cgi.h"
+#include "virtual_camera/message.h"
+
+namespace vexa::camera {
+
+// Hosts read an answer in one piece of at most 1023 bytes, some in half of that; so no answer is longer than this.
+constexpr std::size_t kMaxRtspAnswer = 500;
+
+// Bytes of the first request: its head, its body, and empty lines right behind it; 0 when more must come.
+[[nodiscard]] std::size_t rtsp_request_size(std::string_view received);
+
+// The CSeq of a request, when it is a plain number.
+[[nodiscard]] std::optional<std::uint32_t> sequence_of(const RequestHead& request);
+// The session a request names; 0 when it names none or no number.
+[[nodiscard]] std::uint32_t session_of(const RequestHead& request);
+// The first client port of a Transport that asks for RTP over UDP, unicast; 0 when there is none.
+[[nodiscard]] std::uint16_t client_port_of(std::string_view transport);
+// The second port of the pair, the one after the first unless named.
+[[nodiscard]] std::uint16_t second_client_port_of(std::string_view transport);
+
+enum class VideoUrl { kNone, kStream, kTrack };
+// What "/media/video1" and "/media/video1/video" name.
+[[nodiscard]] VideoUrl classify_url(std::string_view path);
+
+// `status` as in "454 Session Not Found"; `fields` are whole lines; no CSeq line for a request without one.
+struct RtspAnswer {
+  std::string_view status;
+  std::optional<std::uint32_t> sequence;
+  std::string_view fields;
+  std::string_view body;
+};
+[[nodiscard]] Answer rtsp_answer(const RtspAnswer& answer);
+
+}  // namespace vexa::camera
+
+#endif  // VIRTUAL_CAMERA_RTSP_MESSAGE_H_

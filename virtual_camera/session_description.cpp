@@ -1,0 +1,61 @@
+#include "virtual_camera/session_description.h"
+
+#include <fmt/format.h>
+
+#include <span>
+#include <string_view>
+
+#include "virtual_camera/credentials.h"
+#include "virtual_camera/rtp_packetiser.h"
+
+namespace vexa::camera {
+namespace {
+
+constexpr std::uint8_t kSequenceParameters = 7;
+constexpr std::uint8_t kPictureParameters = 8;
+
+std::string unit_text(const AccessUnit& picture, std::uint8_t type) {
+  for (const NalUnit& nal : picture.units) {
+    if (nal.type != type) continue;
+    const std::span<const std::uint8_t> unit = picture.unit(nal);
+    return {unit.begin(), unit.end()};
+  }
+  return {};
+}
+
+// ";profile-level-id=...;sprop-parameter-sets=..." of the clip's first picture (RFC 6184, 8.1).
+std::string parameter_sets(const CameraOptions& options) {
+  if (!options.clip || options.clip->clip().access_units().empty()) return {};
+  const AccessUnit& first = options.clip->clip().access_units().front();
+  const std::string sequence = unit_text(first, kSequenceParameters);
+  const std::string picture = unit_text(first, kPictureParameters);
+  if (sequence.size() < 4 || picture.empty()) return {};
+  std::string level;
+  for (std::size_t i = 1; i < 4; ++i) level += fmt::format("{:02x}", static_cast<unsigned char>(sequence[i]));
+  return fmt::format(";profile-level-id={};sprop-parameter-sets={},{}", level, base64_text(sequence),
+                     base64_text(picture));
+}
+
+std::string description(const CameraOptions& options, std::string_view sets) {
+  const std::string range = options.range_clock.empty() ? "" : fmt::format("a=range:clock={}\r\n", options.range_clock);
+  return fmt::format(
+      "v=0\r\n"
+      "o=- 1 1 IN IP4 {0}\r\n"
+      "s=video\r\n"
+      "t=0 0\r\n"
+      "{1}"
+      "m=video 0 RTP/AVP {2}\r\n"
+      "a=rtpmap:{2} H264/{3}\r\n"
+      "a=fmtp:{2} packetization-mode=1{4}\r\n"
+      "a=control:video\r\n",
+      options.address, range, options.payload_type, options.clock_rate, sets);
+}
+
+}  // namespace
+
+std::string describe_session(const CameraOptions& options, std::size_t limit) {
+  std::string text = description(options, parameter_sets(options));
+  return text.size() <= limit ? text : description(options, "");
+}
+
+}  // namespace vexa::camera

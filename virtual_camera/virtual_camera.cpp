@@ -1,0 +1,60 @@
+#include "virtual_camera/virtual_camera.h"
+
+#include <utility>
+
+#include "virtual_camera/camera_core.h"
+#include "virtual_camera/event_loop.h"
+
+namespace vexa::camera {
+
+VirtualCamera::VirtualCamera(CameraOptions options)
+    : VirtualCamera(std::move(options), std::make_shared<EventLoop>()) {}
+
+VirtualCamera::VirtualCamera(CameraOptions options, std::shared_ptr<EventLoop> loop)
+    : loop_(std::move(loop)),
+      core_(std::make_shared<CameraCore>(std::make_shared<CameraState>(std::move(options), loop_->context()))) {}
+
+VirtualCamera::~VirtualCamera() { stop(); }
+
+bool VirtualCamera::start() {
+  error_ = loop_->run([this] { return core_->start(); });
+  return error_.empty();
+}
+
+void VirtualCamera::stop() {
+  loop_->run([this] { core_->stop(); });
+}
+
+void VirtualCamera::reboot(std::chrono::milliseconds away) {
+  loop_->run([this, away] { core_->reboot(away); });
+}
+
+const std::string& VirtualCamera::address() const { return core_->state()->options.address; }
+
+std::uint16_t VirtualCamera::http_port() const { return core_->http_port(); }
+
+std::uint16_t VirtualCamera::rtsp_port() const { return core_->rtsp_port(); }
+
+std::size_t VirtualCamera::sessions() const {
+  return loop_->run([this] { return core_->state()->sessions.size(); });
+}
+
+SettingsStore& VirtualCamera::settings() { return core_->state()->settings; }
+
+Journal& VirtualCamera::journal() { return core_->state()->journal; }
+
+SentLog& VirtualCamera::sent() { return core_->state()->sent; }
+
+const PacketisedClip* VirtualCamera::clip() const { return core_->state()->options.clip.get(); }
+
+void VirtualCamera::add_request_fault(RequestFault fault) { core_->state()->request_faults.add(std::move(fault)); }
+
+void VirtualCamera::clear_request_faults() { core_->state()->request_faults.clear(); }
+
+void VirtualCamera::set_packet_faults(PacketFaults faults) {
+  CameraState& state = *core_->state();
+  const std::lock_guard<std::mutex> lock(state.packet_faults_mutex);
+  state.packet_faults = std::move(faults);
+}
+
+}  // namespace vexa::camera

@@ -1,0 +1,61 @@
+// A network camera in software: HTTP commands and RTSP/RTP video, with a journal of what it was asked and faults on
+// demand. It shares no code with the driver library, so that each checks the other.
+#ifndef VIRTUAL_CAMERA_VIRTUAL_CAMERA_H_
+#define VIRTUAL_CAMERA_VIRTUAL_CAMERA_H_
+
+#include <chrono>
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <string>
+
+#include "virtual_camera/journal.h"
+#include "virtual_camera/options.h"
+#include "virtual_camera/sent_log.h"
+#include "virtual_camera/settings_store.h"
+
+namespace vexa::camera {
+
+class CameraCore;
+class EventLoop;
+
+// All operations may be called from any thread but the camera's own (the journal's observer runs on that one).
+class VirtualCamera {
+ public:
+  explicit VirtualCamera(CameraOptions options);                          // on a thread of its own
+  VirtualCamera(CameraOptions options, std::shared_ptr<EventLoop> loop);  // on a loop shared with other cameras
+  ~VirtualCamera();                                                       // stops it
+  VirtualCamera(const VirtualCamera&) = delete;
+  VirtualCamera& operator=(const VirtualCamera&) = delete;
+
+  // Opens both ports. On failure returns false, and error() says why.
+  [[nodiscard]] bool start();
+  // Closes every connection and session. The journal and the sent log stay readable. Harmless when not running.
+  void stop();
+  // Vanishes: every connection is reset, connecting is refused; back on the same ports after `away`, without sessions.
+  void reboot(std::chrono::milliseconds away);
+
+  [[nodiscard]] const std::string& error() const { return error_; }
+  [[nodiscard]] const std::string& address() const;
+  [[nodiscard]] std::uint16_t http_port() const;  // valid after start()
+  [[nodiscard]] std::uint16_t rtsp_port() const;
+  [[nodiscard]] std::size_t sessions() const;  // open RTSP sessions
+
+  [[nodiscard]] SettingsStore& settings();
+  [[nodiscard]] Journal& journal();
+  [[nodiscard]] SentLog& sent();
+  [[nodiscard]] const PacketisedClip* clip() const;  // the clip streamed; valid after start(), null when none
+
+  void add_request_fault(RequestFault fault);
+  void clear_request_faults();
+  void set_packet_faults(PacketFaults faults);  // for sessions that start playing afterwards
+
+ private:
+  std::shared_ptr<EventLoop> loop_;
+  std::shared_ptr<CameraCore> core_;
+  std::string error_;
+};
+
+}  // namespace vexa::camera
+
+#endif  // VIRTUAL_CAMERA_VIRTUAL_CAMERA_H_
