@@ -1,0 +1,119 @@
+#include "host/command_line.h"
+
+#include <fmt/format.h>
+
+#include <CLI/CLI.hpp>
+#include <string>
+#include <vector>
+
+#include "host/commands/command.h"
+#include "host/result_output.h"
+
+namespace vexa::host {
+namespace {
+
+constexpr char kDescription[] = "vexactl: drives a network camera from the command line.";
+
+constexpr char kFooter[] = R"(
+Start here:
+  vexactl info 192.168.0.100 --credentials camera.cred
+  vexactl record 192.168.0.100 --credentials camera.cred --seconds 10 --out live.h264
+  vexactl info 192.168.0.100 --credentials camera.cred --cgi-log cgi.log
+  vexactl log cgi.log
+  where the first line of camera.cred is USER:PASSWORD.
+  vexactl COMMAND --help lists the options of a command.
+
+Environment:
+  VEXACTL_USER, VEXACTL_PASSWORD    used where no option gives user name or password
+
+Exit codes:
+    0  done
+    1  the command line, or a file that it names, cannot be used
+    2  the camera cannot be reached, does not answer, or refuses the request
+    3  the camera refuses user name and password
+    4  the camera sends no picture, or has stopped sending
+    5  a result cannot be written
+  130  interrupted by Ctrl-C or a signal; what was recorded until then is kept)";
+
+struct KnownCommand {
+  std::unique_ptr<Command> command;
+  CLI::App* options;
+};
+
+std::vector<std::unique_ptr<Command>> all_commands() {
+  std::vector<std::unique_ptr<Command>> commands;
+  commands.push_back(make_info_command());
+  commands.push_back(make_record_command());
+  commands.push_back(make_log_command());
+  return commands;
+}
+
+// What may be shown of an argument that is not understood: an option's name. Anything else may be a password.
+std::string showable(const std::string& argument) {
+  if (argument.starts_with("--")) return argument.substr(0, argument.find('='));
+  return argument.starts_with('-') ? argument.substr(0, 2) : "";
+}
+
+Problem not_understood(const std::vector<std::string>& extras, const std::string& help) {
+  for (const std::string& extra : extras) {
+    if (!showable(extra).empty()) {
+      return {ExitCode::kUsage, fmt::format("there is no option {}", showable(extra)), help};
+    }
+  }
+  return {ExitCode::kUsage, "there is an argument too many", help};
+}
+
+bool is(const CLI::ParseError& error, CLI::ExitCodes kind) { return error.get_exit_code() == static_cast<int>(kind); }
+
+// The parser's own text, where it holds no value that was given.
+std::string text_of(const CLI::ParseError& error) {
+  std::string text = error.what();
+  const bool names_options_only = is(error, CLI::ExitCodes::RequiredError) ||
+                                  is(error, CLI::ExitCodes::ArgumentMismatch) ||
+                                  is(error, CLI::ExitCodes::ExcludesError);
+  if (names_options_only) return text;
+  const std::string_view kConversion = "Could not convert: ";
+  if (!text.starts_with(kConversion)) return "an option's value cannot be used";
+  return fmt::format("the value of {} cannot be used",
+                     text.substr(kConversion.size(), text.find(" = ") - kConversion.size()));
+}
+
+ExitCode on_parse_error(const CLI::ParseError& error, const CLI::App& program, Terminal& terminal) {
+  if (is(error, CLI::ExitCodes::Success)) {
+    const bool version = error.get_name() == "CallForVersion";
+    return write_result(terminal, version ? fmt::format("{}\n", error.what()) : program.help());
+  }
+  const auto chosen = program.get_subcommands();
+  if (chosen.empty()) {
+    return terminal.report(
+        {ExitCode::kUsage, "the first argument is not a command", "See vexactl --help for the commands."});
+  }
+  const std::string help = fmt::format("See vexactl {} --help.", chosen.front()->get_name());
+  if (is(error, CLI::ExitCodes::ExtrasError)) return terminal.report(not_understood(program.remaining(true), help));
+  return terminal.report({ExitCode::kUsage, text_of(error), help});
+}
+
+}  // namespace
+
+ExitCode run_command_line(const Invocation& invocation, Terminal& terminal) {
+  CLI::App program{kDescription, "vexactl"};
+  program.footer(kFooter);
+  program.set_version_flag("--version", "vexactl " VEXA_VERSION);
+  program.require_subcommand(1);
+  std::vector<KnownCommand> commands;
+  for (auto& command : all_commands()) {
+    CLI::App* options = command->declare(program, invocation.environment);
+    commands.push_back({std::move(command), options});
+  }
+  try {
+    program.parse(invocation.argc, invocation.argv);
+  } catch (const CLI::ParseError& error) {
+    return on_parse_error(error, program, terminal);
+  }
+  for (const KnownCommand& known : commands) {
+    if (known.options->parsed()) return known.command->run(terminal);
+  }
+  return ExitCode::kUsage;
+}
+
+}  // namespace vexa::host

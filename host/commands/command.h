@@ -1,0 +1,32 @@
+// One command of vexactl. A family of commands has a file of its own here; command_line.cpp lists them.
+#ifndef HOST_COMMANDS_COMMAND_H_
+#define HOST_COMMANDS_COMMAND_H_
+
+#include <CLI/CLI.hpp>
+#include <memory>
+
+#include "host/exit_code.h"
+#include "host/terminal.h"
+
+namespace vexa::host {
+
+class Command {
+ public:
+  Command() = default;
+  Command(const Command&) = delete;
+  Command& operator=(const Command&) = delete;
+  virtual ~Command() = default;
+
+  // Adds the command with its options; returns what was added. `environment` as main() received it.
+  virtual CLI::App* declare(CLI::App& program, const char* const* environment) = 0;
+  // Runs it, after its options have been read.
+  virtual ExitCode run(Terminal& terminal) = 0;
+};
+
+std::unique_ptr<Command> make_info_command();
+std::unique_ptr<Command> make_record_command();
+std::unique_ptr<Command> make_log_command();
+
+}  // namespace vexa::host
+
+#endif  // HOST_COMMANDS_COMMAND_H_

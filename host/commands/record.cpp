@@ -1,0 +1,245 @@
+// vexactl record: live video into a file.
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <chrono>
+#include <nlohmann/json.hpp>
+
+#include "host/camera_options.h"
+#include "host/commands/command.h"
+#include "host/interrupt.h"
+#include "host/printable.h"
+#include "host/recorder.h"
+#include "host/result_output.h"
+
+namespace vexa::host {
+namespace {
+
+using Json = nlohmann::ordered_json;
+using Clock = RecordingMeter::Clock;
+
+constexpr double kLongestRecording = 366.0 * 24 * 3600;
+constexpr char kCodec[] = "H.264";
+constexpr int kMostStreams = 16;
+constexpr std::chrono::milliseconds kProgressInterval{250};
+constexpr std::chrono::milliseconds kShortestSilence{2000};
+
+struct RecordOptions {
+  CameraOptions camera;
+  std::optional<double> seconds;
+  std::optional<std::int64_t> frames;
+  std::string out;
+  int stream = 1;
+  bool quiet = false;
+};
+
+// What the summary says, as text and as JSON.
+struct Recording {
+  std::string camera;
+  std::string model;
+  std::string file;
+  RecordingEnd end;
+  RecordingMeter meter;
+  Clock::time_point ended;
+
+  [[nodiscard]] double seconds() const { return meter.elapsed(ended).count(); }
+};
+
+std::optional<Problem> check(const RecordOptions& options) {
+  if (options.seconds && !(*options.seconds > 0 && *options.seconds <= kLongestRecording)) {
+    return Problem{ExitCode::kUsage, "--seconds is not a number above 0", "For instance: --seconds 10."};
+  }
+  if (options.frames && *options.frames < 1) {
+    return Problem{ExitCode::kUsage, "--frames is not a number above 0", "For instance: --frames 250."};
+  }
+  if (options.stream < 1 || options.stream > kMostStreams) {
+    return Problem{ExitCode::kUsage, fmt::format("--stream is not a number from 1 to {}", kMostStreams),
+                   "1 is the camera's first stream."};
+  }
+  if (options.out.empty()) return Problem{ExitCode::kUsage, "--out names no file", "For instance: --out live.h264."};
+  return std::nullopt;
+}
+
+std::string missing_text(const RecordingMeter& meter, Clock::time_point now) {
+  const auto missing = meter.missing_frames(now);
+  if (!missing) return "drops unknown";
+  return fmt::format("drops ~{}", *missing);
+}
+
+std::string progress_line(const RecordingMeter& meter, Clock::time_point now) {
+  if (meter.frames() == 0) return "waiting for a key picture";
+  return fmt::format("{:8.1f} s  {:7} frames  {:7.2f} Mbit/s  {}", meter.elapsed(now).count(), meter.frames(),
+                     meter.recent_bit_rate(now) / 1e6, missing_text(meter, now));
+}
+
+const char* name_of(RecordingEnd end) {
+  switch (end) {
+    case RecordingEnd::kComplete:
+      return "complete";
+    case RecordingEnd::kInterrupted:
+      return "interrupted";
+    case RecordingEnd::kSilent:
+      return "silent";
+    case RecordingEnd::kNoKeyPicture:
+      return "noKeyPicture";
+    case RecordingEnd::kCannotWrite:
+      return "cannotWrite";
+  }
+  return "";
+}
+
+std::string summary_line(const Recording& recording) {
+  const RecordingMeter& meter = recording.meter;
+  std::string line =
+      fmt::format("{}: {} frames in {:.2f} s, {} key frames, {} bytes, {:.2f} Mbit/s", recording.file, meter.frames(),
+                  recording.seconds(), meter.key_frames(), meter.bytes(), meter.mean_bit_rate() / 1e6);
+  if (meter.stream()) line += fmt::format(", {}x{}", meter.stream()->width, meter.stream()->height);
+  if (const auto expected = meter.expected_frames(recording.ended)) {
+    line += fmt::format(", about {} of {} frames missing at {:.4g} fps", *meter.missing_frames(recording.ended),
+                        *expected, meter.stated_rate());
+  }
+  return line + "\n";
+}
+
+template <typename Value>
+Json or_null(const std::optional<Value>& value) {
+  return value ? Json(*value) : Json(nullptr);
+}
+
+Json to_json(const Recording& recording) {
+  const RecordingMeter& meter = recording.meter;
+  Json json = {{"camera", recording.camera},
+               {"modelName", recording.model},
+               {"file", recording.file},
+               {"end", name_of(recording.end)},
+               {"seconds", recording.seconds()},
+               {"frames", meter.frames()},
+               {"keyFrames", meter.key_frames()},
+               {"bytes", meter.bytes()},
+               {"bitsPerSecond", static_cast<std::uint64_t>(meter.mean_bit_rate())}};
+  const auto& stream = meter.stream();
+  json["width"] = stream ? Json(stream->width) : Json(nullptr);
+  json["height"] = stream ? Json(stream->height) : Json(nullptr);
+  json["statedFramesPerSecond"] = meter.stated_rate() > 0 ? Json(meter.stated_rate()) : Json(nullptr);
+  json["expectedFrames"] = or_null(meter.expected_frames(recording.ended));
+  json["missingFramesEstimate"] = or_null(meter.missing_frames(recording.ended));
+  return json;
+}
+
+class RecordCommand final : public Command {
+ public:
+  CLI::App* declare(CLI::App& program, const char* const* environment) override {
+    CLI::App* command = program.add_subcommand("record", "Record live H.264 video into a file");
+    read_environment(options_.camera.credentials, environment);
+    add_camera_options(*command, options_.camera);
+    command->add_option("--out", options_.out, "file to write, in Annex B byte stream format; - is standard output")
+        ->required()
+        ->type_name("FILE");
+    command->add_option("--seconds", options_.seconds, "end after this many seconds of video")->type_name("N");
+    command->add_option("--frames", options_.frames, "end after this many frames")->type_name("N");
+    command->add_option("--stream", options_.stream, "which of the camera's video streams")
+        ->type_name("N")
+        ->capture_default_str();
+    command->add_flag("--quiet", options_.quiet, "show no progress");
+    command->footer(
+        "A recording begins with the first key frame and, without --seconds and --frames, ends with Ctrl-C.\n"
+        "Drops are an estimate: frames expected at the rate that stream or camera state, less those received.");
+    return command;
+  }
+
+  ExitCode run(Terminal& terminal) override {
+    if (const auto problem = check(options_)) return terminal.report(*problem);
+    if (options_.quiet) terminal.silence_progress();
+    FrameFile file = to_standard_output() ? FrameFile("standard output", terminal.results()) : FrameFile(options_.out);
+    if (const auto problem = file.check()) return terminal.report(*problem);
+    Result<OpenCamera> opened = open_camera(options_.camera, terminal);
+    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
+    return record(std::get<OpenCamera>(opened), file, terminal);
+  }
+
+ private:
+  // Cameras that send a picture a second are no silent ones.
+  [[nodiscard]] std::chrono::milliseconds silence() const {
+    return std::max(kShortestSilence, std::chrono::milliseconds(options_.camera.timeout_ms));
+  }
+  [[nodiscard]] bool to_standard_output() const { return options_.out == "-"; }
+
+  ExitCode record(OpenCamera& camera, FrameFile& file, Terminal& terminal) {
+    terminal.progress("connecting");
+    // Asked first: it finds a wrong address or password within the time-out, which opening a stream may exceed.
+    const Result<LiveCamera::Identity> identified = camera.driver->identify(options_.stream);
+    if (const auto* problem = std::get_if<Problem>(&identified)) return terminal.report(*problem);
+    const auto& identity = std::get<LiveCamera::Identity>(identified);
+    if (identity.video.codecName != kCodec) return terminal.report(other_codec(identity.video));
+    Interrupt::finish_orderly();
+    const ELibDReturnCode result = camera.driver->StartVideoStreaming();
+    if (result != LIBD_OK) return terminal.report(camera.driver->explain(result));
+    Recorder recorder(*camera.driver, file,
+                      {.seconds = options_.seconds,
+                       .frames = options_.frames,
+                       .camera_rate = static_cast<double>(identity.video.frameRate),
+                       .silence = silence()});
+    const RecordingEnd end = recorder.run(progress_on(terminal));
+    const Clock::time_point ended = Clock::now();
+    terminal.progress("closing the session");
+    camera.driver->StopVideoStreaming();
+    std::optional<Problem> problem = recorder.problem();
+    if (const auto at_close = file.close(); at_close && !problem) problem = at_close;
+    const ExitCode written = summarise(
+        {to_string(camera.address), identity.system.modelName, file.path(), end, recorder.meter(), ended}, terminal);
+    if (problem) return terminal.report(*problem);
+    const ExitCode code = judge(end, terminal);
+    return code == ExitCode::kOk ? written : code;
+  }
+
+  [[nodiscard]] Problem other_codec(const SLibDCameraInfo& video) const {
+    return {ExitCode::kNoVideo,
+            fmt::format("video stream {} of the camera is set to {}", options_.stream, printable(video.codecName)),
+            "Set it to H.264 on the camera, or choose another with --stream."};
+  }
+
+  static Recorder::Progress progress_on(Terminal& terminal) {
+    return [&terminal, next = Clock::time_point{}](const RecordingMeter& meter, Clock::time_point now) mutable {
+      if (now < next) return;
+      next = now + kProgressInterval;
+      if (terminal.shows_progress()) terminal.progress(progress_line(meter, now));
+    };
+  }
+
+  // Where the pictures themselves went to standard output, the summary goes to standard error.
+  ExitCode summarise(const Recording& recording, Terminal& terminal) const {
+    std::string text = options_.camera.json ? to_text(to_json(recording)) : summary_line(recording);
+    if (!to_standard_output()) return write_result(terminal, text);
+    text.pop_back();
+    terminal.say(text);
+    return ExitCode::kOk;
+  }
+
+  [[nodiscard]] ExitCode judge(RecordingEnd end, Terminal& terminal) const {
+    switch (end) {
+      case RecordingEnd::kComplete:
+        return ExitCode::kOk;
+      case RecordingEnd::kInterrupted:
+        terminal.say("vexactl: interrupted; what was recorded is complete up to here");
+        return ExitCode::kInterrupted;
+      case RecordingEnd::kSilent:
+        return terminal.report({ExitCode::kNoVideo,
+                                fmt::format("the camera has sent no picture for {} ms", silence().count()),
+                                "Check its network and encoder settings; --timeout makes the wait longer."});
+      case RecordingEnd::kNoKeyPicture:
+        return terminal.report({ExitCode::kNoVideo, "the camera has sent no key picture to begin with",
+                                "Check that the stream is H.264, and shorten its key-frame interval."});
+      case RecordingEnd::kCannotWrite:
+        break;
+    }
+    return ExitCode::kCannotWrite;
+  }
+
+  RecordOptions options_;
+};
+
+}  // namespace
+
+std::unique_ptr<Command> make_record_command() { return std::make_unique<RecordCommand>(); }
+
+}  // namespace vexa::host

@@ -1,0 +1,38 @@
+// The file that a recording goes to.
+#ifndef HOST_FRAME_FILE_H_
+#define HOST_FRAME_FILE_H_
+
+#include <cstddef>
+#include <optional>
+#include <string>
+
+#include "host/problem.h"
+#include "host/unique_fd.h"
+
+namespace vexa::host {
+
+// Opened with the first picture, so that a recording that never begins leaves no empty file, nor a former recording
+// emptied.
+class FrameFile {
+ public:
+  explicit FrameFile(std::string path) : path_(std::move(path)) {}
+  // Writes to a descriptor that is already open, and leaves it open.
+  FrameFile(std::string name, int open_fd) : path_(std::move(name)), given_fd_(open_fd) {}
+
+  // Says early what opening would most likely say later; nothing is created.
+  [[nodiscard]] std::optional<Problem> check() const;
+  [[nodiscard]] std::optional<Problem> write(const unsigned char* data, std::size_t length);
+  [[nodiscard]] std::optional<Problem> close();
+  [[nodiscard]] const std::string& path() const { return path_; }
+
+ private:
+  [[nodiscard]] Problem problem(int error) const;
+
+  std::string path_;
+  int given_fd_ = -1;
+  UniqueFd file_;
+};
+
+}  // namespace vexa::host
+
+#endif  // HOST_FRAME_FILE_H_

@@ -1,0 +1,84 @@
+#include "host/live_camera.h"
+
+#include <fmt/format.h>
+#include <sys/mman.h>
+
+#include <cstring>
+
+#include "host/printable.h"
+#include "host/unique_fd.h"
+
+namespace vexa::host {
+namespace {
+
+constexpr int kOverRtsp = 1;
+constexpr int kCodecH264 = 2;
+
+// The driver opens its CGI log with every connection; unnamed, it would be a file in the working folder. This one is in
+// memory and gone with the driver. /dev/null would not do: the log is flushed to its disk, and says when it has none.
+class PrivateLog {
+ public:
+  [[nodiscard]] std::string path() const { return fmt::format("/proc/self/fd/{}", memory_.get()); }
+
+ private:
+  UniqueFd memory_{memfd_create("vexactl-cgi-log", MFD_CLOEXEC)};
+};
+
+bool mentions_unauthorized(const std::string& text) { return strcasestr(text.c_str(), "unauthorized") != nullptr; }
+
+}  // namespace
+
+LiveCamera::LiveCamera(const CameraConnection& connection)
+    : connection_(connection), redactor_(connection.credentials) {
+  m_CameraInfo.codecType = kCodecH264;
+  m_CameraInfo.codecName = "H.264";
+  const PrivateLog unshown;
+  SetCGILogPath(connection.cgi_log.value_or(unshown.path()).c_str());
+  SetCGILogLevel(connection.cgi_log.has_value());
+  SLibDConnectionInfo info;
+  info.streamTransport = kOverRtsp;
+  info.host = connection.address.host;
+  info.port = connection.address.port;
+  info.timeout = connection.timeout_ms;
+  info.userName = connection.credentials.user;
+  info.password = connection.credentials.password;
+  SetCurrentConnectionInfo(info);
+}
+
+Result<LiveCamera::Identity> LiveCamera::identify(int stream) {
+  Identity identity;
+  ELibDReturnCode result = GetCurrentSystemInfo(identity.system);
+  if (result != LIBD_OK) return explain(result);
+  m_CameraInfo.streamNumber = stream;
+  identity.video.streamNumber = stream;
+  result = GetCameraInfo(identity.video);
+  if (result != LIBD_OK) return explain(result);
+  return identity;
+}
+
+Problem LiveCamera::explain(ELibDReturnCode result) {
+  std::string text;
+  GetLatestErrorText(text);
+  const std::string why = text.empty() ? "no answer" : printable(redactor_(text));
+  const std::string camera = to_string(connection_.address);
+  // A refused RTSP session answers LIBD_STREAM_OPEN_FAILED whatever the reason; only the text tells.
+  if (result == LIBD_UNAUTHORIZED || mentions_unauthorized(text)) {
+    return {ExitCode::kUnauthorized, fmt::format("the camera {} refuses user name and password: {}", camera, why),
+            fmt::format("Give them with --user and --password-file, --credentials FILE, or {} and {}.", kUserVariable,
+                        kPasswordVariable)};
+  }
+  // An answer that never begins leaves no text.
+  if (result == LIBD_TIMEOUT || text.empty()) {
+    return {ExitCode::kUnreachable,
+            fmt::format("the camera {} did not answer within {} ms: {}", camera, connection_.timeout_ms, why),
+            "Check address, power and network; a slow camera needs a longer --timeout."};
+  }
+  if (result == LIBD_STREAM_OPEN_FAILED) {
+    return {ExitCode::kUnreachable, fmt::format("the camera {} does not open its video: {}", camera, why),
+            "Check that its RTSP port 554 can be reached and that it streams H.264."};
+  }
+  return {ExitCode::kUnreachable, fmt::format("the camera {} cannot be used: {}", camera, why),
+          "Check that address and HTTP port are the camera's."};
+}
+
+}  // namespace vexa::host

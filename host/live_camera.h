@@ -1,0 +1,46 @@
+// The driver as vexactl uses it, and its failures in words.
+#ifndef HOST_LIVE_CAMERA_H_
+#define HOST_LIVE_CAMERA_H_
+
+#include <optional>
+#include <string>
+
+#include "host/camera_address.h"
+#include "host/credentials.h"
+#include "host/problem.h"
+#include "host/redactor.h"
+#include "vexa/vexa_common.h"
+
+namespace vexa::host {
+
+struct CameraConnection {
+  CameraAddress address;
+  Credentials credentials;
+  int timeout_ms = 0;
+  std::optional<std::string> cgi_log = {};  // the file that requests and statuses are appended to
+};
+
+// A model class for a camera that streams H.264 over RTSP/RTP.
+class LiveCamera final : public CVexaCommon {
+ public:
+  // Tells the driver where the camera is; contacts none.
+  explicit LiveCamera(const CameraConnection& connection);
+
+  // Puts the latest failure into words; `result` is what the failed operation answered.
+  [[nodiscard]] Problem explain(ELibDReturnCode result);
+
+  struct Identity {
+    SLibDSystemInfo system;
+    SLibDCameraInfo video;  // of the stream asked for
+  };
+  // Asks the camera what it is and what the stream is set to, and selects the stream.
+  [[nodiscard]] Result<Identity> identify(int stream);
+
+ private:
+  const CameraConnection connection_;
+  const Redactor redactor_;
+};
+
+}  // namespace vexa::host
+
+#endif  // HOST_LIVE_CAMERA_H_

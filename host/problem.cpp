@@ -1,0 +1,14 @@
+#include "host/problem.h"
+
+#include <fmt/format.h>
+
+#include <system_error>
+
+namespace vexa::host {
+
+Problem unreadable(const std::string& path, int error) {
+  return {ExitCode::kUsage, fmt::format("cannot read {}: {}", path, std::generic_category().message(error)),
+          "Check the file's name and that you may read it."};
+}
+
+}  // namespace vexa::host

@@ -1,0 +1,62 @@
+#include "host/recorder.h"
+
+#include <utility>
+
+#include "host/interrupt.h"
+
+namespace vexa::host {
+namespace {
+
+// How long to leave the driver alone when no picture waits: short beside a picture's time, long beside a call.
+constexpr std::chrono::milliseconds kPollPause{3};
+
+}  // namespace
+
+Recorder::Recorder(CLibraryDevice& camera, FrameFile& file, RecordingLimits limits)
+    : camera_(camera), file_(file), limits_(std::move(limits)), start_(limits_.now()), last_picture_(start_) {
+  meter_.set_camera_rate(limits_.camera_rate);
+}
+
+RecordingEnd Recorder::run(const Progress& progress) {
+  for (;;) {
+    if (Interrupt::requested()) return RecordingEnd::kInterrupted;
+    if (const auto end = limit_reached(limits_.now())) return *end;
+    SLibDVideoFrameInfo frame;
+    frame.sink = &picture_;
+    const ELibDReturnCode result = camera_.GetCurrentVideoFrame(frame);
+    const Clock::time_point now = limits_.now();
+    if (result == LIBD_OK && !keep(frame.frameType, now)) return RecordingEnd::kCannotWrite;
+    if (result == LIBD_NO_FRAME) Interrupt::wait(kPollPause);
+    if (result != LIBD_OK && result != LIBD_NO_FRAME) return RecordingEnd::kSilent;
+    progress(meter_, now);
+  }
+}
+
+std::optional<RecordingEnd> Recorder::limit_reached(Clock::time_point now) const {
+  if (meter_.frames() == 0) {
+    if (now - start_ < limits_.first_picture) return std::nullopt;
+    return RecordingEnd::kNoKeyPicture;
+  }
+  const bool enough_frames = limits_.frames && meter_.frames() >= *limits_.frames;
+  const bool enough_time = limits_.seconds && meter_.elapsed(now).count() >= *limits_.seconds;
+  if (enough_frames || enough_time) return RecordingEnd::kComplete;
+  if (now - last_picture_ > limits_.silence) return RecordingEnd::kSilent;
+  return std::nullopt;
+}
+
+bool Recorder::keep(std::int32_t frame_type, Clock::time_point now) {
+  const bool key_picture = frame_type == VIDEO_FRAME_H264_KEY;
+  if (!key_picture && meter_.frames() == 0) return true;  // nothing could be decoded from here on
+  problem_ = file_.write(picture_.bytes.data(), picture_.bytes.size());
+  if (problem_) return false;
+  if (key_picture && !meter_.stream()) {
+    if (const auto stream = read_stream_parameters(picture_.bytes.data(), picture_.bytes.size())) {
+      meter_.set_stream(*stream);
+    }
+  }
+  meter_.add(picture_.bytes.size(), key_picture, now);
+  last_picture_ = now;
+  return true;
+}
+
+}  // namespace vexa::host

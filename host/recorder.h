@@ -1,0 +1,66 @@
+// Moves live pictures from a driver into a file.
+#ifndef HOST_RECORDER_H_
+#define HOST_RECORDER_H_
+
+#include <chrono>
+#include <cstdint>
+#include <functional>
+#include <optional>
+#include <vector>
+
+#include "host/frame_file.h"
+#include "host/recording_meter.h"
+#include "vexa/library_device.h"
+
+namespace vexa::host {
+
+struct RecordingLimits {
+  std::optional<double> seconds = {};        // from the first picture on
+  std::optional<std::uint64_t> frames = {};  // with neither, a recording goes on until it is interrupted
+  double camera_rate = 0;                    // pictures a second, as the camera's settings say; 0: unknown
+  // Longest wait for the next picture. The driver's own word for silence may take twice the connection's time-out.
+  std::chrono::milliseconds silence{5000};
+  std::chrono::seconds first_picture{30};  // longest wait for the key picture that a recording begins with
+  std::function<RecordingMeter::Clock::time_point()> now = RecordingMeter::Clock::now;
+};
+
+enum class RecordingEnd { kComplete, kInterrupted, kSilent, kNoKeyPicture, kCannotWrite };
+
+class Recorder {
+ public:
+  using Clock = RecordingMeter::Clock;
+  using Progress = std::function<void(const RecordingMeter&, Clock::time_point)>;
+
+  Recorder(CLibraryDevice& camera, FrameFile& file, RecordingLimits limits);
+
+  // Polls a camera that streams already until the limits, an interruption or a failure end the recording. The camera
+  // goes on streaming; the file stays open.
+  RecordingEnd run(const Progress& progress);
+
+  [[nodiscard]] const RecordingMeter& meter() const { return meter_; }
+  [[nodiscard]] const std::optional<Problem>& problem() const { return problem_; }  // of kCannotWrite
+
+ private:
+  // Copies and returns, as the driver asks: it holds its queue meanwhile.
+  class Picture final : public CDataSink {
+   public:
+    void Write(const unsigned char* data, unsigned int length) override { bytes.assign(data, data + length); }
+    std::vector<unsigned char> bytes;
+  };
+
+  [[nodiscard]] std::optional<RecordingEnd> limit_reached(Clock::time_point now) const;
+  [[nodiscard]] bool keep(std::int32_t frame_type, Clock::time_point now);
+
+  CLibraryDevice& camera_;
+  FrameFile& file_;
+  const RecordingLimits limits_;
+  Clock::time_point start_;
+  Clock::time_point last_picture_;
+  Picture picture_;
+  RecordingMeter meter_;
+  std::optional<Problem> problem_;
+};
+
+}  // namespace vexa::host
+
+#endif  // HOST_RECORDER_H_

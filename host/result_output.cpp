@@ -1,0 +1,24 @@
+#include "host/result_output.h"
+
+#include <fmt/format.h>
+
+#include <nlohmann/json.hpp>
+#include <system_error>
+
+namespace vexa::host {
+
+std::string to_text(const nlohmann::ordered_json& json) {
+  constexpr int kIndent = 2;
+  return json.dump(kIndent, ' ', false, nlohmann::ordered_json::error_handler_t::replace) + "\n";
+}
+
+ExitCode write_result(Terminal& terminal, std::string_view text) {
+  terminal.clear_progress();
+  const int error = terminal.write_result(text);
+  if (error == 0) return ExitCode::kOk;
+  return terminal.report({ExitCode::kCannotWrite,
+                          fmt::format("cannot write standard output: {}", std::generic_category().message(error)),
+                          "Check where it is redirected to."});
+}
+
+}  // namespace vexa::host
