@@ -1,0 +1,318 @@
+// What a stream costs from the socket to the host: the driver beside a bare poll and recvfrom loop on the same stream.
+//   streaming_e2e [SECONDS]     each measurement takes SECONDS (10)
+// Needs port 554 on 127.0.1.x: run as root, or in `unshare -rn` with the loopback up.
+#include <arpa/inet.h>
+#include <fcntl.h>
+#include <netinet/in.h>
+#include <poll.h>
+#include <sys/resource.h>
+#include <sys/socket.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <chrono>
+#include <csignal>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <functional>
+#include <memory>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "vexa/vexa_common.h"
+#include "virtual_camera/rtp_packetiser.h"
+#include "virtual_camera/virtual_camera.h"
+
+namespace {
+
+using std::chrono::steady_clock;
+using vexa::camera::CameraOptions;
+using vexa::camera::PacketisedClip;
+using vexa::camera::VirtualCamera;
+
+constexpr int kHttpPort = 8080;
+constexpr std::size_t kSessionsACamera = 8;
+
+FILE* report = nullptr;
+
+struct Load {
+  const char* name;
+  std::size_t streams;
+  double frames_per_second;
+  std::shared_ptr<const PacketisedClip> clip;
+};
+
+/// Access units of one size, each a key picture: what a camera of that bit rate would send.
+std::shared_ptr<const PacketisedClip> made_clip(std::size_t picture_size) {
+  std::vector<std::uint8_t> bytes;
+  for (int picture = 0; picture < 4; ++picture) {
+    const std::uint8_t sets[] = {0, 0, 0, 1, 0x67, 0x42, 0, 0x1e, 0, 0, 0, 1, 0x68, 0xce, 0, 0, 0, 1, 0x65, 0x88};
+    bytes.insert(bytes.end(), std::begin(sets), std::end(sets));
+    bytes.insert(bytes.end(), picture_size, static_cast<std::uint8_t>(0x51 + picture));
+  }
+  return std::make_shared<const PacketisedClip>(vexa::camera::Clip::from_annex_b(bytes), 1400);
+}
+
+std::string camera_address(std::size_t camera) { return "127.0.1." + std::to_string(camera + 1); }
+std::string address_of(std::size_t stream) { return camera_address(stream / kSessionsACamera); }
+
+/// The cameras, in a process of their own so that their work is not counted.
+class Cameras {
+ public:
+  Cameras(const Load& load, std::uint64_t pictures) {
+    int ready[2];
+    if (pipe(ready) != 0) std::exit(1);
+    child_ = fork();
+    if (child_ == 0) serve(load, pictures, ready[1]);
+    close(ready[1]);
+    char byte = 0;
+    if (read(ready[0], &byte, 1) != 1) {
+      std::fprintf(stderr, "streaming_e2e: the cameras did not start: is port 554 free, and are you root?\n");
+      std::exit(1);
+    }
+    close(ready[0]);
+  }
+  ~Cameras() {
+    kill(child_, SIGKILL);
+    waitpid(child_, nullptr, 0);
+  }
+  Cameras(const Cameras&) = delete;
+  Cameras& operator=(const Cameras&) = delete;
+
+ private:
+  [[noreturn]] static void serve(const Load& load, std::uint64_t pictures, int ready) {
+    std::vector<std::unique_ptr<VirtualCamera>> cameras;
+    for (std::size_t i = 0; i * kSessionsACamera < load.streams; ++i) {
+      CameraOptions options;
+      options.address = camera_address(i);
+      options.http_port = kHttpPort;
+      options.clip = load.clip;
+      options.frames_per_second = load.frames_per_second;
+      options.pictures = pictures;
+      options.sent_log_limit = 0;
+      options.hash_packets = false;
+      cameras.push_back(std::make_unique<VirtualCamera>(options));
+      if (!cameras.back()->start()) _exit(1);
+    }
+    if (write(ready, "r", 1) != 1) _exit(1);
+    for (;;) pause();
+  }
+
+  pid_t child_ = -1;
+};
+
+struct Usage {
+  double cpu = 0;
+  long wakeups = 0;
+};
+
+Usage usage_now() {
+  rusage usage = {};
+  getrusage(RUSAGE_SELF, &usage);
+  const auto seconds = [](timeval time) {
+    return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_usec) / 1e6;
+  };
+  return {seconds(usage.ru_utime) + seconds(usage.ru_stime), usage.ru_nvcsw};
+}
+
+struct Result {
+  double cpu = 0;
+  long wakeups = 0;
+  double gigabytes = 0;
+  std::uint64_t lost = 0;
+  double per_gigabyte() const { return cpu / gigabytes; }
+};
+
+/// Counts what the driver hands over; the bytes are dropped.
+class CountingSink : public CDataSink {
+ public:
+  void Write(const unsigned char*, unsigned int length) override { bytes += length; }
+  std::uint64_t bytes = 0;
+};
+
+std::unique_ptr<CVexaCommon> streaming_driver(const std::string& address) {
+  auto driver = std::make_unique<CVexaCommon>();
+  driver->SetCGILogPath("/dev/null");
+  SLibDConnectionInfo connection;
+  connection.streamTransport = 1;
+  connection.host = address;
+  connection.port = kHttpPort;
+  connection.timeout = 5000;
+  connection.userName = "admin";
+  connection.password = "admin";
+  driver->SetCurrentConnectionInfo(connection);
+  SLibDCameraInfo camera;
+  camera.codecName = "H.264";
+  driver->SetCameraInfo(camera);
+  if (driver->StartVideoStreaming() != LIBD_OK) {
+    std::fprintf(stderr, "streaming_e2e: no stream from %s\n", address.c_str());
+    std::exit(1);
+  }
+  return driver;
+}
+
+/// Takes what waits at the drivers, every 10 ms, until all `wanted` frames have come or none do any more.
+std::uint64_t take_frames(std::vector<std::unique_ptr<CVexaCommon>>& drivers, CountingSink& sink,
+                          std::uint64_t wanted) {
+  std::uint64_t frames = 0;
+  auto last = steady_clock::now();
+  while (frames < wanted && steady_clock::now() - last < std::chrono::seconds(2)) {
+    const std::uint64_t seen = frames;
+    for (auto& driver : drivers) {
+      SLibDVideoFrameInfo frame;
+      frame.sink = &sink;
+      while (driver->GetCurrentVideoFrame(frame) == LIBD_OK) ++frames;
+    }
+    if (frames != seen) last = steady_clock::now();
+    std::this_thread::sleep_for(std::chrono::milliseconds(10));
+  }
+  return frames;
+}
+
+// Measured from when all streams play: opening them is not the matter here.
+Result run_driver(const Load& load, std::uint64_t pictures) {
+  const Cameras cameras(load, pictures);
+  std::vector<std::unique_ptr<CVexaCommon>> drivers;
+  for (std::size_t i = 0; i < load.streams; ++i) drivers.push_back(streaming_driver(address_of(i)));
+  CountingSink warm_up;
+  const std::uint64_t early = take_frames(drivers, warm_up, load.streams);
+  const Usage before = usage_now();
+  CountingSink sink;
+  const std::uint64_t wanted = pictures * load.streams - early;
+  const std::uint64_t frames = take_frames(drivers, sink, wanted);
+  const Usage after = usage_now();
+  Result result;
+  result.cpu = after.cpu - before.cpu;
+  result.wakeups = after.wakeups - before.wakeups;
+  result.gigabytes = static_cast<double>(sink.bytes) / 1e9;
+  result.lost = wanted - frames;
+  return result;
+}
+
+/// The least that a client must say to a camera to get a stream; answers the media socket.
+int open_bare_stream(const std::string& address) {
+  const int control = socket(AF_INET, SOCK_STREAM, 0);
+  const int media = socket(AF_INET, SOCK_DGRAM, 0);
+  const int room = 524288;
+  setsockopt(media, SOL_SOCKET, SO_RCVBUF, &room, sizeof room);
+  sockaddr_in place = {};
+  place.sin_family = AF_INET;
+  bind(media, reinterpret_cast<sockaddr*>(&place), sizeof place);
+  socklen_t size = sizeof place;
+  getsockname(media, reinterpret_cast<sockaddr*>(&place), &size);
+  const int port = ntohs(place.sin_port);
+  inet_pton(AF_INET, address.c_str(), &place.sin_addr);
+  place.sin_port = htons(554);
+  if (connect(control, reinterpret_cast<sockaddr*>(&place), sizeof place) != 0) std::exit(1);
+  const std::string url = "rtsp://" + address + ":554/media/video1";
+  const std::string credentials = "Authorization: Basic YWRtaW46YWRtaW4=\r\n";
+  std::string session;
+  const auto exchange = [&](const std::string& request) {
+    if (send(control, request.data(), request.size(), MSG_NOSIGNAL) < 0) std::exit(1);
+    char answer[1024];
+    const ssize_t length = recv(control, answer, sizeof answer, 0);
+    const std::string text(answer, length > 0 ? static_cast<std::size_t>(length) : 0);
+    if (const auto at = text.find("Session: "); at != std::string::npos) {
+      session = text.substr(at + 9, text.find_first_of(";\r", at) - at - 9);
+    }
+  };
+  exchange("DESCRIBE " + url + " RTSP/1.0\r\nCSeq: 1\r\n" + credentials + "\r\n");
+  exchange("SETUP " + url + "/video RTSP/1.0\r\nCSeq: 2\r\nTransport: RTP/AVP;unicast;client_port=" +
+           std::to_string(port) + "-" + std::to_string(port + 1) + "\r\n" + credentials + "\r\n");
+  exchange("PLAY " + url + " RTSP/1.0\r\nCSeq: 3\r\nSession: " + session + "\r\n" + credentials + "\r\n");
+  return media;
+}
+
+void bare_loop(int media, std::uint64_t* bytes) {
+  std::vector<char> buffer(65536);
+  pollfd entry = {media, POLLIN, 0};
+  while (poll(&entry, 1, 2000) > 0) {
+    const ssize_t length = recvfrom(media, buffer.data(), buffer.size(), 0, nullptr, nullptr);
+    if (length > 12) *bytes += static_cast<std::uint64_t>(length - 12);
+  }
+}
+
+Result run_bare(const Load& load, std::uint64_t pictures) {
+  const Cameras cameras(load, pictures);
+  std::vector<int> media;
+  for (std::size_t i = 0; i < load.streams; ++i) media.push_back(open_bare_stream(address_of(i)));
+  const Usage before = usage_now();
+  std::vector<std::uint64_t> bytes(load.streams, 0);
+  std::vector<std::thread> threads;
+  for (std::size_t i = 0; i < load.streams; ++i) threads.emplace_back(bare_loop, media[i], &bytes[i]);
+  for (std::thread& thread : threads) thread.join();
+  const Usage after = usage_now();
+  Result result;
+  result.cpu = after.cpu - before.cpu;
+  result.wakeups = after.wakeups - before.wakeups;
+  for (const std::uint64_t count : bytes) result.gigabytes += static_cast<double>(count) / 1e9;
+  return result;
+}
+
+void measure(const Load& load, double seconds) {
+  const auto pictures = static_cast<std::uint64_t>(seconds * load.frames_per_second);
+  const Result bare = run_bare(load, pictures);
+  const Result driver = run_driver(load, pictures);
+  std::fprintf(report, "%-28s %8.2f %8.2f %7.2f %10ld %10ld %8llu\n", load.name, bare.per_gigabyte(),
+               driver.per_gigabyte(), driver.per_gigabyte() / bare.per_gigabyte(), bare.wakeups, driver.wakeups,
+               static_cast<unsigned long long>(driver.lost));
+  std::fflush(report);
+}
+
+/// From PLAY's answer to the first frame, beside what the camera took to send it.
+void measure_first_frame() {
+  CameraOptions options;
+  options.address = camera_address(0);
+  options.http_port = kHttpPort;
+  options.clip_path = VEXA_CLIPS "/hd.h264";
+  VirtualCamera camera(options);
+  if (!camera.start()) std::exit(1);
+  std::vector<double> extra;
+  for (int i = 0; i < 10; ++i) {
+    camera.sent().clear();
+    const auto driver = streaming_driver(camera_address(0));
+    const auto played = steady_clock::now();
+    CountingSink sink;
+    SLibDVideoFrameInfo frame;
+    frame.sink = &sink;
+    while (driver->GetCurrentVideoFrame(frame) != LIBD_OK) std::this_thread::sleep_for(std::chrono::microseconds(200));
+    const auto shown = steady_clock::now();
+    auto sent = played;
+    for (const auto& packet : camera.sent().snapshot()) {
+      if (packet.picture == 0) sent = packet.time;
+    }
+    extra.push_back(std::chrono::duration<double, std::milli>(shown - sent).count());
+  }
+  std::sort(extra.begin(), extra.end());
+  std::fprintf(report, "first frame after its last packet: median %.1f ms, worst %.1f ms (a frame interval: 40 ms)\n",
+               extra[extra.size() / 2], extra.back());
+}
+
+/// The driver's trace of its requests goes to standard output; the report keeps it to itself.
+void keep_standard_output() {
+  report = fdopen(dup(STDOUT_FILENO), "w");
+  const int nowhere = open("/dev/null", O_WRONLY);
+  dup2(nowhere, STDOUT_FILENO);
+  close(nowhere);
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  const double seconds = argc > 1 ? std::strtod(argv[1], nullptr) : 10;
+  keep_standard_output();
+  std::fprintf(report, "%-28s %8s %8s %7s %10s %10s %8s\n", "CPU seconds per GB", "bare", "driver", "ratio", "wake-ups",
+               "wake-ups", "lost");
+  const auto eight = PacketisedClip::load(VEXA_CLIPS "/hd.h264", 1400);
+  const auto two = PacketisedClip::load(VEXA_CLIPS "/low2m.h264", 1400);
+  if (!eight || !two) return 1;
+  measure({"8 Mbit/s", 1, 25, eight}, seconds);
+  measure({"400 Mbit/s", 1, 60, made_clip(833333)}, seconds);
+  measure({"32 streams of 2 Mbit/s", 32, 25, two}, seconds);
+  measure({"64 streams of 2 Mbit/s", 64, 25, two}, seconds);
+  measure_first_frame();
+  return 0;
+}

@@ -1,0 +1,139 @@
+// Settings on the wire: scripts of commands and inquiries, and a driver whose settings are in reach.
+#pragma once
+
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "tests/support/scripted_camera.h"
+#include "tests/support/test_driver.h"
+
+namespace vexa_test {
+
+constexpr int kPatientTimeout = 20000;  // milliseconds; far more than any answer needs
+
+/// Everything that a request for `path` sends.
+inline std::string request_for(const std::string& path) {
+  return "GET http://{host}:{port}" + path + " HTTP/1.0\r\nAuthorization: Basic YWRtaW46c2VjcmV0\r\n\r\n";
+}
+
+inline ScriptStep answered(const std::string& path, const std::string& answer) {
+  ScriptStep step;
+  step.new_connection = true;
+  step.expected = request_for(path);
+  step.answer = answer;
+  return step;
+}
+
+/// A command that the camera takes.
+inline ScriptStep command(const std::string& path) { return answered(path, "HTTP/1.0 204 No Content\r\n\r\n"); }
+
+/// A request that the camera refuses.
+inline ScriptStep refusal(const std::string& path) { return answered(path, "HTTP/1.0 401 Unauthorized\r\n\r\n"); }
+
+inline ScriptStep inquiry(const std::string& name, const std::string& body) {
+  return answered("/command/inquiry.cgi?inq=" + name, "HTTP/1.0 200 OK\r\n\r\n" + body);
+}
+
+inline std::string text_of_latest_error(CLibraryDevice& driver) {
+  std::string text;
+  driver.GetLatestErrorText(text);
+  return text;
+}
+
+/// A driver class, its settings in reach, that speaks to `host` as "admin" with the password "secret".
+template <typename Driver>
+class Settings : public Driver {
+ public:
+  /// What an operation tells the model class about the video it will offer.
+  struct VideoParams {
+    int standard;
+    int width;
+    int height;
+    bool operator==(const VideoParams&) const = default;
+  };
+
+  void use(const std::string& host, int port) {
+    this->m_ConnectionInfo.host = host;
+    this->m_ConnectionInfo.port = port;
+    this->m_ConnectionInfo.timeout = kPatientTimeout;
+    this->m_ConnectionInfo.userName = "admin";
+    this->m_ConnectionInfo.password = "secret";
+  }
+
+  /// Points to where nobody listens and leaves an error that any exchange would clear.
+  void expect_no_exchange() {
+    use(own_loopback_address(), refusing_port());
+    this->Fail({LIBD_BUFFER_TOO_SMALL, "from before"});
+  }
+
+  /// True when no exchange began since expect_no_exchange.
+  bool had_no_exchange() {
+    return this->LatestErrorCode() == LIBD_BUFFER_TOO_SMALL && this->LatestErrorText() == "from before";
+  }
+
+  std::string cached_inquiry() {
+    const vexa::Guard guard(this->m_CameraInquiryLock);
+    return this->m_CameraInquiryCache;
+  }
+
+  void cache_inquiry(const std::string& answer) {
+    const vexa::Guard guard(this->m_CameraInquiryLock);
+    this->m_CameraInquiryCache = answer;
+  }
+
+  ELibDReturnCode InitializeFixedVideoParams(ELibDVideoStandard standard, int width, int height) override {
+    told.push_back({standard, width, height});
+    return LIBD_OK;
+  }
+
+  using Driver::m_CameraInfo;
+  using Driver::m_CameraInquiryLock;
+  using Driver::m_ConnectionLock;
+  using Driver::m_FixedCameraInfo;
+  using Driver::m_FixedCameraInfoAvailable;
+  using Driver::m_FixedPTZControlInfo;
+  using Driver::m_FixedSystemInfo;
+  using Driver::m_PTZControlInfo;
+  using Driver::m_ResolutionFilter;
+
+  using Driver::LatestErrorCode;
+  using Driver::LatestErrorText;
+  using Driver::ParseImageMaxSizeFromCameraProperty;
+  using Driver::ParseSolidPTZFromCameraProperty;
+  using Driver::ParseVideoCapSizeFromCameraProperty;
+  using Driver::ParseVideoStandardFromCameraProperty;
+  using Driver::SetCurrentFrameRate;
+  using Driver::SetCurrentQualityBitrate;
+  using Driver::SetCurrentResolution;
+  using Driver::SetCurrentStreamMode;
+
+  using Driver::CheckAmountOfBrightness;
+  using Driver::CheckCurrentBrightMode;
+  using Driver::GetIrisPositionFromCameraData;
+  using Driver::GetIrisPositionFromIrisList;
+  using Driver::GetShutterAndIrisMode;
+  using Driver::GetShutterSpeedFromCameraData;
+  using Driver::GetShutterSpeedFromShutterSpeedList;
+
+  std::vector<VideoParams> told;
+};
+
+using SettingsDriver = Settings<CVexaCommon>;
+
+/// A camera that plays a script for a driver. Ends the play with the test.
+template <typename Driver>
+class Played {
+ public:
+  explicit Played(Script script) : camera_(std::move(script)) { driver.use(camera_.host(), camera_.port()); }
+
+  /// What was not as written; ends the play.
+  std::string complaints() { return camera_.finish(); }
+
+  Settings<Driver> driver;
+
+ private:
+  ScriptedCamera camera_;
+};
+
+}  // namespace vexa_test

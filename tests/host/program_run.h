@@ -1,0 +1,133 @@
+// Runs a program of the build as a user would, in a folder of its own.
+#pragma once
+
+#include <fcntl.h>
+#include <poll.h>
+#include <pty.h>
+#include <spawn.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <csignal>
+#include <functional>
+#include <string>
+#include <thread>
+#include <utility>
+#include <vector>
+
+#include "tests/support/temporary_folder.h"
+
+namespace vexa_test {
+
+// Asks until the condition holds; false when it does not within half a minute.
+inline bool eventually(const std::function<bool()>& condition) {
+  const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(30);
+  while (!condition()) {
+    if (std::chrono::steady_clock::now() > deadline) return false;
+    poll(nullptr, 0, 5);
+  }
+  return true;
+}
+
+struct ProgramResult {
+  int exit_code = -1;  // 128 + N when signal N ended it
+  std::string out;
+  std::string err;
+};
+
+class ProgramRun {
+ public:
+  enum class StandardError { kFile, kTerminal };
+
+  // The program's folder is `folder`, and its environment just `environment`.
+  ProgramRun(const TemporaryFolder& folder, std::vector<std::string> arguments,
+             std::vector<std::string> environment = {}, StandardError standard_error = StandardError::kFile)
+      : out_(folder / ".out"), err_(folder / ".err") {
+    posix_spawn_file_actions_t actions;
+    posix_spawn_file_actions_init(&actions);
+    const int create = O_WRONLY | O_CREAT | O_TRUNC;
+    posix_spawn_file_actions_addopen(&actions, STDIN_FILENO, "/dev/null", O_RDONLY, 0);
+    posix_spawn_file_actions_addopen(&actions, STDOUT_FILENO, out_.c_str(), create, 0600);
+    if (standard_error == StandardError::kFile) {
+      posix_spawn_file_actions_addopen(&actions, STDERR_FILENO, err_.c_str(), create, 0600);
+    } else {
+      posix_spawn_file_actions_adddup2(&actions, open_terminal(), STDERR_FILENO);
+    }
+    posix_spawn_file_actions_addchdir_np(&actions, folder.path().c_str());
+    spawn(actions, pointers_to(arguments), pointers_to(environment));
+    posix_spawn_file_actions_destroy(&actions);
+  }
+
+  ~ProgramRun() {
+    if (pid_ > 0) {
+      kill(pid_, SIGKILL);
+      wait();
+    }
+  }
+  ProgramRun(const ProgramRun&) = delete;
+  ProgramRun& operator=(const ProgramRun&) = delete;
+
+  void signal(int number) const { kill(pid_, number); }
+
+  ProgramResult wait() {
+    ProgramResult result;
+    int status = 0;
+    if (pid_ > 0 && waitpid(std::exchange(pid_, -1), &status, 0) > 0) {
+      result.exit_code = WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status);
+    }
+    result.out = contents_of(out_);
+    if (reader_.joinable()) reader_.join();
+    result.err = terminal_text_.empty() ? contents_of(err_) : terminal_text_;
+    return result;
+  }
+
+ private:
+  static std::vector<char*> pointers_to(std::vector<std::string>& texts) {
+    std::vector<char*> pointers;
+    for (std::string& text : texts) pointers.push_back(text.data());
+    pointers.push_back(nullptr);
+    return pointers;
+  }
+
+  void spawn(const posix_spawn_file_actions_t& actions, std::vector<char*> arguments, std::vector<char*> environment) {
+    // Signals as a terminal gives them, whatever a test run in the background has inherited.
+    sigset_t all;
+    sigset_t none;
+    sigfillset(&all);
+    sigemptyset(&none);
+    posix_spawnattr_t attributes;
+    posix_spawnattr_init(&attributes);
+    posix_spawnattr_setsigdefault(&attributes, &all);
+    posix_spawnattr_setsigmask(&attributes, &none);
+    posix_spawnattr_setflags(&attributes, POSIX_SPAWN_SETSIGDEF | POSIX_SPAWN_SETSIGMASK);
+    if (posix_spawn(&pid_, arguments[0], &actions, &attributes, arguments.data(), environment.data()) != 0) pid_ = -1;
+    posix_spawnattr_destroy(&attributes);
+    if (slave_ >= 0) close(slave_);
+  }
+
+  // Reads on until the program, the last to hold the terminal's other end, has gone.
+  int open_terminal() {
+    int master = -1;
+    if (openpty(&master, &slave_, nullptr, nullptr, nullptr) != 0) return STDERR_FILENO;
+    fcntl(master, F_SETFD, FD_CLOEXEC);
+    fcntl(slave_, F_SETFD, FD_CLOEXEC);
+    reader_ = std::thread([this, master] {
+      char piece[512];
+      for (ssize_t got = 0; (got = read(master, piece, sizeof piece)) > 0;) {
+        terminal_text_.append(piece, static_cast<std::size_t>(got));
+      }
+      close(master);
+    });
+    return slave_;
+  }
+
+  const std::string out_;
+  const std::string err_;
+  pid_t pid_ = -1;
+  int slave_ = -1;
+  std::thread reader_;
+  std::string terminal_text_;
+};
+
+}  // namespace vexa_test

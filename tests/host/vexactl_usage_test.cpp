@@ -1,0 +1,127 @@
+// The command line of vexactl: help, refusals, and what they must not repeat.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "tests/host/program_run.h"
+
+namespace vexa_test {
+namespace {
+
+ProgramResult run(std::vector<std::string> arguments) {
+  const TemporaryFolder folder;
+  folder.make_file("password", "x\n");
+  folder.make_file("no-colon", "operator\n");
+  folder.make_file("long", std::string(200, 'u') + ":" + std::string(55, 'p') + "\n");
+  arguments.insert(arguments.begin(), VEXA_BINARY_DIR "/bin/vexactl");
+  return ProgramRun(folder, std::move(arguments)).wait();
+}
+
+TEST(CommandLine, HelpNamesCommandsEnvironmentAndExitCodes) {
+  const ProgramResult result = run({"--help"});
+  EXPECT_EQ(result.exit_code, 0);
+  EXPECT_EQ(result.err, "");
+  for (const char* part : {"info", "record", "log", "VEXACTL_USER", "VEXACTL_PASSWORD", "Exit codes:", "    0  done",
+                           "    1  the command line", "    2  the camera cannot be reached",
+                           "    3  the camera refuses user name and password", "    4  the camera sends no picture",
+                           "    5  a result cannot be written", "  130  interrupted"}) {
+    EXPECT_THAT(result.out, testing::HasSubstr(part));
+  }
+}
+
+TEST(CommandLine, HelpOfACommandListsItsOptions) {
+  const ProgramResult result = run({"record", "--help"});
+  EXPECT_EQ(result.exit_code, 0);
+  for (const char* part : {"--out", "--seconds", "--frames", "--stream", "--credentials", "--password-file", "--user",
+                           "--timeout", "--json", "--trace", "--cgi-log", "--quiet", "camera"}) {
+    EXPECT_THAT(result.out, testing::HasSubstr(part));
+  }
+}
+
+TEST(CommandLine, ShowsItsVersion) {
+  const ProgramResult result = run({"--version"});
+  EXPECT_EQ(result.exit_code, 0);
+  EXPECT_EQ(result.out, "vexactl 1.0.0\n");
+}
+
+struct Refusal {
+  std::vector<std::string> arguments;
+  const char* err;
+};
+
+TEST(CommandLine, EachMistakeEndsWithOneAndSaysWhatToDo) {
+  const Refusal refusals[] = {
+      {{}, "vexactl: the first argument is not a command\n  See vexactl --help for the commands.\n"},
+      {{"inof", "cam"}, "vexactl: the first argument is not a command\n  See vexactl --help for the commands.\n"},
+      {{"info"}, "vexactl: --camera is required\n  See vexactl info --help.\n"},
+      {{"info", "cam", "extra"}, "vexactl: there is an argument too many\n  See vexactl info --help.\n"},
+      {{"info", "cam", "--password=hunter2"}, "vexactl: there is no option --password\n  See vexactl info --help.\n"},
+      {{"info", "cam", "--password", "hunter2"},
+       "vexactl: there is no option --password\n  See vexactl info --help.\n"},
+      {{"info", "cam", "-phunter2"}, "vexactl: there is no option -p\n  See vexactl info --help.\n"},
+      {{"info", "cam", "--user"}, "vexactl: --user: 1 required NAME missing\n  See vexactl info --help.\n"},
+      {{"info", "cam", "--timeout", "hunter2"},
+       "vexactl: the value of --timeout cannot be used\n  See vexactl info --help.\n"},
+      {{"info", "cam", "--json=hunter2"}, "vexactl: the value of --json cannot be used\n  See vexactl info --help.\n"},
+      {{"info", "cam", "--camera", "hunter2"},
+       "vexactl: --camera: At Most 1 required but received 2\n  See vexactl info --help.\n"},
+      {{"record", "cam", "--out", "f", "--frames", "-1"},
+       "vexactl: --frames is not a number above 0\n  For instance: --frames 250.\n"},
+      {{"info", "cam", "--timeout", "0"},
+       "vexactl: --timeout is not a number from 1 to 600000\n  It is in milliseconds; 5000 when not given.\n"},
+      {{"info", "cam", "--timeout", "600001"},
+       "vexactl: --timeout is not a number from 1 to 600000\n  It is in milliseconds; 5000 when not given.\n"},
+      {{"info", "cam", "--user", "a", "--credentials", "b"},
+       "vexactl: --user excludes --credentials\n  See vexactl info --help.\n"},
+      {{"info", "admin:hunter2@cam"},
+       "vexactl: the camera's address is HOST or HOST:PORT, not a URL\n"
+       "  User name and password have options of their own: --user, --password-file, --credentials.\n"},
+      {{"info", "cam:0"},
+       "vexactl: the port in the camera's address is not a number from 1 to 65535\n  For instance: cam1:80.\n"},
+      {{"info", "cam", "--user", "admin:hunter2"},
+       "vexactl: a user name cannot hold a colon\n  A password belongs into --password-file or --credentials.\n"},
+      {{"info", "cam", "--password-file", "missing"},
+       "vexactl: cannot read missing: No such file or directory\n"
+       "  Check the file's name and that you may read it.\n"},
+      {{"info", "cam", "--credentials", "no-colon"},
+       "vexactl: the first line of no-colon is not USER:PASSWORD\n"
+       "  Write both on one line, with a colon between them.\n"},
+      {{"info", "cam", "--credentials", "long"},
+       "vexactl: user name and password are longer than 254 characters together\n"
+       "  Choose shorter ones on the camera.\n"},
+      {{"info", "127.0.0.1", "--cgi-log", ""},
+       "vexactl: --cgi-log names no file\n  For instance: --cgi-log cgi.log.\n"},
+      {{"info", "127.0.0.1", "--cgi-log", std::string(1024, 'f')},
+       "vexactl: the name of --cgi-log is longer than 1023 characters\n  Choose a shorter one.\n"},
+      {{"log"}, "vexactl: file is required\n  See vexactl log --help.\n"},
+      {{"log", "missing"},
+       "vexactl: cannot read missing: No such file or directory\n"
+       "  Check the file's name and that you may read it.\n"},
+      {{"log", "."}, "vexactl: cannot read .: Is a directory\n  Check the file's name and that you may read it.\n"},
+      {{"log", "/dev/null", "--follow"},
+       "vexactl: /dev/null is not a regular file\n  --follow needs one; leave it out to read this once.\n"},
+      {{"record", "cam"}, "vexactl: --out is required\n  See vexactl record --help.\n"},
+      {{"record", "cam", "--out", ""}, "vexactl: --out names no file\n  For instance: --out live.h264.\n"},
+      {{"record", "cam", "--out", "f", "--seconds", "0"},
+       "vexactl: --seconds is not a number above 0\n  For instance: --seconds 10.\n"},
+      {{"record", "cam", "--out", "f", "--seconds", "-1"},
+       "vexactl: --seconds is not a number above 0\n  For instance: --seconds 10.\n"},
+      {{"record", "cam", "--out", "f", "--seconds", "nan"},
+       "vexactl: --seconds is not a number above 0\n  For instance: --seconds 10.\n"},
+      {{"record", "cam", "--out", "f", "--frames", "0"},
+       "vexactl: --frames is not a number above 0\n  For instance: --frames 250.\n"},
+      {{"record", "cam", "--out", "f", "--stream", "0"},
+       "vexactl: --stream is not a number from 1 to 16\n  1 is the camera's first stream.\n"},
+      {{"record", "cam", "--out", "f", "--stream", "17"},
+       "vexactl: --stream is not a number from 1 to 16\n  1 is the camera's first stream.\n"},
+  };
+  for (const Refusal& refusal : refusals) {
+    SCOPED_TRACE(testing::PrintToString(refusal.arguments));
+    const ProgramResult result = run(refusal.arguments);
+    EXPECT_EQ(result.exit_code, 1);
+    EXPECT_EQ(result.out, "");
+    EXPECT_EQ(result.err, refusal.err);
+  }
+}
+
+}  // namespace
+}  // namespace vexa_test

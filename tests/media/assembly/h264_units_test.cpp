@@ -1,0 +1,158 @@
+#include "media/assembly/h264_units.h"
+
+#include <gtest/gtest.h>
+
+#include <deque>
+#include <vector>
+
+namespace vexa::test {
+namespace {
+
+using Payload = std::vector<unsigned char>;
+
+/// Packets over bytes of their own, each allocated to its exact length.
+class Packets {
+ public:
+  explicit Packets(const std::vector<Payload>& payloads) {
+    for (const Payload& payload : payloads) {
+      Payload datagram(12);
+      datagram.insert(datagram.end(), payload.begin(), payload.end());
+      datagram.shrink_to_fit();
+      datagrams_.push_back(std::move(datagram));
+      SPacketInfo packet;
+      packet.data = datagrams_.back().data();
+      packet.length = static_cast<std::uint32_t>(datagrams_.back().size());
+      packets_.push_back(packet);
+    }
+  }
+  operator PacketRun() const { return packets_; }
+  const SPacketInfo& front() const { return packets_.front(); }
+
+ private:
+  std::deque<Payload> datagrams_;
+  std::vector<SPacketInfo> packets_;
+};
+
+struct PictureCase {
+  const char* what;
+  std::vector<Payload> payloads;
+  Payload frame;
+  std::int32_t type;
+};
+
+const PictureCase kPictures[] = {
+    {"a single slice", {{0x41, 1, 2}}, {0, 0, 0, 1, 0x41, 1, 2}, 22},
+    {"a single IDR slice", {{0x65, 9}}, {0, 0, 0, 1, 0x65, 9}, 20},
+    {"SPS and IDR slice", {{0x67, 1}, {0x65, 2}}, {0, 0, 0, 1, 0x67, 1, 0, 0, 0, 1, 0x65, 2}, 20},
+    {"SPS and PPS alone", {{0x67, 1}, {0x68, 2}}, {0, 0, 0, 1, 0x67, 1, 0, 0, 0, 1, 0x68, 2}, -1},
+    {"a last SEI hides the type", {{0x65, 2}, {0x06, 5}}, {0, 0, 0, 1, 0x65, 2, 0, 0, 0, 1, 0x06, 5}, -1},
+    {"type 23 is the last single unit", {{0x77, 1}}, {0, 0, 0, 1, 0x77, 1}, -1},
+    {"an IDR slice in three fragments",
+     {{0x7c, 0x85, 1, 2}, {0x7c, 0x05, 3}, {0x7c, 0x45, 4, 5}},
+     {0, 0, 0, 1, 0x65, 1, 2, 3, 4, 5},
+     20},
+    {"the reference bits come from the indicator", {{0x3c, 0x81, 7}}, {0, 0, 0, 1, 0x21, 7}, 22},
+    {"the forbidden bit is left out", {{0xfc, 0x81, 7}}, {0, 0, 0, 1, 0x61, 7}, 22},
+    {"a fragmented SEI tells no type",
+     {{0x7c, 0x81, 7}, {0x7c, 0x86, 7}},
+     {0, 0, 0, 1, 0x61, 7, 0, 0, 0, 1, 0x66, 7},
+     -1},
+    {"type 29 keeps its decoding order number", {{0x7d, 0x85, 0, 1, 7}}, {0, 0, 0, 1, 0x65, 0, 1, 7}, 20},
+    {"fragments without a start are joined all the same", {{0x7c, 0x05, 3}, {0x7c, 0x45, 4}}, {3, 4}, -1},
+    {"a packet without a payload adds nothing", {{}, {0x41, 1}, {}}, {0, 0, 0, 1, 0x41, 1}, 22},
+    {"a fragment without a body begins the unit", {{0x7c, 0x85}}, {0, 0, 0, 1, 0x65}, 20},
+    {"no payload at all", {{}}, {}, -1},
+};
+
+TEST(H264Units, RebuildsEachPictureByteForByte) {
+  for (const PictureCase& picture : kPictures) {
+    Payload frame(picture.frame.size());
+    const AssembledPicture made = assemble_h264(Packets(picture.payloads), frame);
+    EXPECT_EQ(made.outcome, Assembly::kWhole) << picture.what;
+    EXPECT_EQ(made.length, picture.frame.size()) << picture.what;
+    EXPECT_EQ(frame, picture.frame) << picture.what;
+    EXPECT_EQ(made.frame_type, picture.type) << picture.what;
+  }
+}
+
+TEST(H264Units, AFragmentOfType29IsReadLikeOneOfType28) {
+  Payload frame(100);
+  const AssembledPicture made = assemble_h264(Packets(std::vector<Payload>{{0x7d, 0x81, 0xaa, 0xbb, 1}}), frame);
+  frame.resize(made.length);
+  EXPECT_EQ(frame, (Payload{0, 0, 0, 1, 0x61, 0xaa, 0xbb, 1}));
+}
+
+TEST(H264Units, AFrameOneByteTooSmallIsTooSmallForEachPicture) {
+  for (const PictureCase& picture : kPictures) {
+    if (picture.frame.empty()) continue;
+    Payload frame(picture.frame.size() - 1);
+    EXPECT_EQ(assemble_h264(Packets(picture.payloads), frame).outcome, Assembly::kTooLarge) << picture.what;
+  }
+}
+
+TEST(H264Units, OtherPacketKindsAreNotOffered) {
+  for (const int type : {0, 24, 25, 26, 27, 30, 31}) {
+    Payload frame(100);
+    const Packets packets({{0x41, 1}, {static_cast<unsigned char>(0x60 | type), 1, 2, 3}});
+    EXPECT_EQ(assemble_h264(packets, frame).outcome, Assembly::kUnsupported) << type;
+  }
+}
+
+TEST(H264Units, AFragmentCutBeforeItsHeaderIsNotTaken) {
+  Payload frame(100);
+  EXPECT_EQ(assemble_h264(Packets(std::vector<Payload>{{0x7c}}), frame).outcome, Assembly::kUnsupported);
+}
+
+struct KeyCase {
+  const char* what;
+  std::vector<Payload> payloads;
+  bool key;
+};
+
+TEST(H264Units, AnIdrSliceInAnyPacketMakesAKeyPicture) {
+  const KeyCase cases[] = {
+      {"one packet", {{0x65, 0x88}}, true},
+      {"many packets", {{0x7c, 0x85, 0x88}, {0x7c, 0x45, 1}}, true},
+      {"behind parameter sets", {{0x67, 1}, {0x68, 1}, {0x65, 0x88}}, true},
+      {"before an SEI", {{0x65, 0x88}, {0x06, 1}}, true},
+      {"a slice that refers to others", {{0x41, 0x9a}}, false},
+      {"parameter sets alone", {{0x67, 1}, {0x68, 1}}, false},
+      {"fragments of an IDR slice without its start", {{0x7c, 0x05, 1}, {0x7c, 0x45, 1}}, false},
+      {"nothing", {{}}, false},
+  };
+  for (const KeyCase& c : cases) EXPECT_EQ(kH264Rules.is_key(Packets(c.payloads)), c.key) << c.what;
+}
+
+struct OpeningCase {
+  const char* what;
+  Payload first;
+  std::uint8_t opening;
+  bool whole;        // for a camera that sends parameter sets
+  bool whole_alone;  // for one that does not
+};
+
+TEST(H264Units, TheFirstPacketTellsHowAPictureOpens) {
+  const OpeningCase cases[] = {
+      {"delimiter", {0x09, 0x10}, 9, true, true},
+      {"sequence parameter set", {0x67, 1}, 7, true, true},
+      {"picture parameter set", {0x68, 1}, 8, false, true},
+      {"SEI", {0x06, 1}, 6, false, true},
+      {"first slice", {0x65, 0x88}, 5, false, true},
+      {"later slice", {0x65, 0x08}, 0, false, true},
+      {"slice without a header", {0x65}, 0, false, true},
+      {"first slice, fragmented", {0x7c, 0x85, 0x88}, 5, false, true},
+      {"later slice, fragmented", {0x7c, 0x85, 0x08}, 0, false, true},
+      {"middle of a fragmented unit", {0x7c, 0x05, 0x88}, 0, false, false},
+      {"fragment without a body", {0x7c, 0x85}, 0, false, true},
+      {"nothing", {}, 0, false, false},
+  };
+  for (const OpeningCase& c : cases) {
+    const Packets packets(std::vector<Payload>{c.first});
+    EXPECT_EQ(kH264Rules.opening(packets.front()), c.opening) << c.what;
+    EXPECT_EQ(kH264Rules.opens_whole(packets, true), c.whole) << c.what;
+    EXPECT_EQ(kH264Rules.opens_whole(packets, false), c.whole_alone) << c.what;
+  }
+}
+
+}  // namespace
+}  // namespace vexa::test

@@ -1,0 +1,248 @@
+#include <gtest/gtest.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+#include <atomic>
+#include <thread>
+#include <utility>
+
+#include "tests/media/media_driver.h"
+
+namespace vexa_test {
+namespace {
+
+using Payload = std::vector<unsigned char>;
+
+std::time_t frames_clock_now = 1000;
+
+/// A driver whose media socket is one end of a pair.
+class RtpFrames : public testing::Test {
+ protected:
+  RtpFrames() : buffer_(1200000) {
+    int ends[2];
+    EXPECT_EQ(socketpair(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0, ends), 0);
+    camera_ = ends[0];
+    driver_.m_StreamSocket = ends[1];
+    driver_.m_RtpClockRate = 90000;
+    driver_.use("127.0.0.1", 1, 50);
+    driver_.state().now = [] { return frames_clock_now; };
+    driver_.m_LastFrameTime = frames_clock_now = 1000;
+    EXPECT_TRUE(driver_.AllocateRtpPackets());
+    frame_.data = buffer_.data();
+    frame_.capacity = static_cast<unsigned int>(buffer_.size());
+  }
+  ~RtpFrames() override {
+    driver_.ReleaseRtpPacketsPtr();
+    close(driver_.m_StreamSocket);
+    driver_.m_StreamSocket = -1;
+    close(camera_);
+  }
+
+  enum class Marker { kUnset, kSet };
+
+  void send_packet(const Payload& payload, Marker marker) {
+    Payload datagram = {0x80, static_cast<unsigned char>(marker == Marker::kSet ? 0xe0 : 0x60)};
+    for (const unsigned value : {sequence_ >> 8 & 255u, sequence_ & 255u, timestamp_ >> 24, timestamp_ >> 16 & 255u,
+                                 timestamp_ >> 8 & 255u, timestamp_ & 255u, 0u, 0u, 0u, 0u}) {
+      datagram.push_back(static_cast<unsigned char>(value));
+    }
+    datagram.insert(datagram.end(), payload.begin(), payload.end());
+    EXPECT_EQ(send(camera_, datagram.data(), datagram.size(), 0), static_cast<ssize_t>(datagram.size()));
+    ++sequence_;
+  }
+
+  /// A picture of one packet a payload.
+  void send_picture(const std::vector<Payload>& payloads) {
+    for (std::size_t i = 0; i < payloads.size(); ++i) {
+      send_packet(payloads[i], i + 1 == payloads.size() ? Marker::kSet : Marker::kUnset);
+    }
+    timestamp_ += 3600;
+  }
+
+  /// An IDR slice of `size` payload bytes in fragments of 60000.
+  void send_large_picture(std::size_t size) {
+    for (std::size_t sent = 0; sent < size; sent += 60000) {
+      Payload fragment(std::min<std::size_t>(60000, size - sent) + 2, 7);
+      fragment[0] = 0x7c;
+      fragment[1] = sent == 0 ? 0x85 : 0x05;
+      send_packet(fragment, sent + 60000 >= size ? Marker::kSet : Marker::kUnset);
+    }
+    timestamp_ += 3600;
+  }
+
+  ELibDReturnCode read() { return driver_.GetRtpCurrentVideoFrame("H.264", frame_); }
+
+  MediaDriver driver_;
+  CVexaCommon::VideoFrameInfo frame_;
+  Payload buffer_;
+  int camera_ = -1;
+  unsigned sequence_ = 1;
+  unsigned timestamp_ = 50000000;
+};
+
+const std::vector<Payload> kKey = {{0x67, 1}, {0x68, 2}, {0x65, 0x88}};
+const std::vector<Payload> kDelta = {{0x41, 0x9a}};
+
+TEST_F(RtpFrames, APictureArrivesWithItsTypeAndMovesTheLastFrameTime) {
+  frames_clock_now = 1003;
+  send_picture(kKey);
+  EXPECT_EQ(read(), LIBD_OK);
+  EXPECT_EQ(frame_.frameType, VIDEO_FRAME_H264_KEY);
+  EXPECT_EQ(frame_.length, 18u);
+  EXPECT_EQ(frame_.seconds, 0);
+  EXPECT_EQ(frame_.microseconds, 0);
+  EXPECT_EQ(driver_.m_LastFrameTime, 1003);
+}
+
+TEST_F(RtpFrames, AnIdrSliceAloneIsAFirstPictureInOnePacketAndInMany) {
+  const std::vector<Payload> pictures[] = {{{0x65, 0x88}}, {{0x7c, 0x85, 1}, {0x7c, 0x05, 2}, {0x7c, 0x45, 3}}};
+  for (const std::vector<Payload>& picture : pictures) {
+    ASSERT_TRUE(driver_.AllocateRtpPackets());
+    send_picture(picture);
+    EXPECT_EQ(read(), LIBD_OK);
+    EXPECT_EQ(frame_.frameType, VIDEO_FRAME_H264_KEY);
+  }
+}
+
+TEST_F(RtpFrames, WithoutASocketOrForAnUnknownCodecNothingIsRead) {
+  EXPECT_EQ(driver_.GetRtpCurrentVideoFrame("H.265", frame_), LIBD_FAILED);
+  EXPECT_EQ(driver_.GetRtpCurrentVideoFrame("", frame_), LIBD_FAILED);
+  const int socket = std::exchange(driver_.m_StreamSocket, -1);
+  EXPECT_EQ(read(), LIBD_FAILED);
+  driver_.m_StreamSocket = socket;
+}
+
+TEST_F(RtpFrames, WithoutAPacketBufferThereIsNoFrameAndWithACapacityBelow4Nothing) {
+  frame_.capacity = 3;
+  EXPECT_EQ(read(), LIBD_FAILED);
+  driver_.ReleaseRtpPacketsPtr();
+  EXPECT_EQ(read(), LIBD_NO_FRAME);
+}
+
+TEST_F(RtpFrames, NoDatagramInTimeIsNoFrameUntilTheTimeOutSinceTheLastFrame) {
+  frames_clock_now = 1003;
+  driver_.m_ConnectionInfo.timeout = 20;  // whole seconds count: 0 of them
+  driver_.m_LastFrameTime = 1003;
+  EXPECT_EQ(read(), LIBD_NO_FRAME);
+  driver_.m_LastFrameTime = 1002;
+  EXPECT_EQ(read(), LIBD_TIMEOUT);
+}
+
+TEST_F(RtpFrames, AnotherReceiveFailureGivesItsCode) {
+  const int socket = std::exchange(driver_.m_StreamSocket, camera_ + 1000);
+  EXPECT_EQ(read(), LIBD_FAILED);
+  EXPECT_EQ(driver_.LatestErrorText(), "Bad file descriptor");
+  driver_.m_StreamSocket = socket;
+}
+
+TEST_F(RtpFrames, AnAggregationPacketAbandonsItsPictureAndAKeyPictureMustFollow) {
+  send_picture(kKey);
+  send_picture({{0x78, 0, 2, 0x41, 1}});
+  send_picture(kDelta);
+  send_picture(kKey);
+  EXPECT_EQ(read(), LIBD_OK);
+  EXPECT_EQ(read(), LIBD_FAILED);
+  EXPECT_EQ(read(), LIBD_OK);
+  EXPECT_EQ(frame_.frameType, VIDEO_FRAME_H264_KEY);
+  EXPECT_TRUE(driver_.m_RtpPackets.empty());
+}
+
+TEST_F(RtpFrames, APictureLargerThanItsBufferIsDroppedAndALargerBufferTakesTheNext) {
+  std::thread camera([this] {
+    send_picture(kKey);
+    send_large_picture(1300000);
+    send_picture(kKey);
+    send_large_picture(1300000);
+  });
+  EXPECT_EQ(read(), LIBD_OK);
+  EXPECT_EQ(read(), LIBD_BUFFER_TOO_SMALL);
+  EXPECT_EQ(frame_.length, 0u);
+  EXPECT_EQ(read(), LIBD_OK);
+  buffer_.resize(2000000);
+  frame_.data = buffer_.data();
+  frame_.capacity = 2000000;
+  EXPECT_EQ(read(), LIBD_OK);
+  EXPECT_EQ(frame_.length, 1300005u);
+  camera.join();
+}
+
+TEST_F(RtpFrames, ShortDatagramsAndEmptyPayloadsAreNoPictures) {
+  for (std::size_t length = 0; length < 12; ++length) {
+    const Payload datagram(length, 0xff);
+    EXPECT_EQ(send(camera_, datagram.data(), datagram.size(), 0), static_cast<ssize_t>(length));
+  }
+  send_picture({{}});
+  send_picture(kKey);
+  EXPECT_EQ(read(), LIBD_OK);
+  EXPECT_EQ(frame_.frameType, VIDEO_FRAME_H264_KEY);
+}
+
+TEST_F(RtpFrames, AStreamThatNeverMakesAPictureLetsTheReaderGoAfterTheTimeOut) {
+  std::atomic<bool> done{false};
+  std::thread camera([&] {
+    while (!done) send_packet({0x7c, 0x01, 1}, Marker::kUnset);
+  });
+  EXPECT_EQ(read(), LIBD_NO_FRAME);
+  done = true;
+  Payload drained(65536);
+  while (recv(driver_.m_StreamSocket, drained.data(), drained.size(), MSG_DONTWAIT) >= 0) {
+  }
+  camera.join();
+}
+
+struct StampCase {
+  const char* what;
+  std::uint32_t timestamp;
+  std::int32_t seconds;
+  std::int32_t microseconds;
+  std::uint32_t base_after;
+  std::int64_t clock_after;
+};
+
+TEST_F(RtpFrames, PlayedBackPicturesCarryTheRecordingsClock) {
+  driver_.m_EdgeStoragePlayback = true;
+  driver_.m_FirstPlaybackFrame = true;
+  driver_.m_RangeClockSeconds = 1706745599;
+  driver_.m_RangeClockMicros = 250000;
+  const StampCase cases[] = {
+      {"the first is the clock itself", 4294960000, 1706745599, 250000, 4294960000, 1706745599},
+      {"one picture later", 4294963600, 1706745599, 290000, 4294960000, 1706745599},
+      {"a second later, across the wrap, the base moves", 82704, 1706745600, 250000, 82704, 1706745600},
+      {"then it counts from there", 86304, 1706745600, 290000, 82704, 1706745600},
+  };
+  for (const StampCase& c : cases) {
+    driver_.StampPicture(frame_, c.timestamp);
+    EXPECT_EQ(frame_.seconds, c.seconds) << c.what;
+    EXPECT_EQ(frame_.microseconds, c.microseconds) << c.what;
+    EXPECT_EQ(driver_.m_PlaybackBaseTimestamp, c.base_after) << c.what;
+    EXPECT_EQ(driver_.m_RangeClockSeconds, c.clock_after) << c.what;
+  }
+}
+
+TEST_F(RtpFrames, APictureBeforeTheBaseMovesItAfterItsOwnStamp) {
+  driver_.m_EdgeStoragePlayback = true;
+  driver_.m_PlaybackBaseTimestamp = 90000;
+  driver_.m_RangeClockSeconds = 1000;
+  driver_.StampPicture(frame_, 86400);
+  // 86400 - 90000 is 4294963696 modulo 2^32: 47721 seconds and 73696 ticks.
+  EXPECT_EQ(frame_.seconds, 48721);
+  EXPECT_EQ(frame_.microseconds, 818844);
+  EXPECT_EQ(driver_.m_PlaybackBaseTimestamp, 86400u);
+  EXPECT_EQ(driver_.m_RangeClockSeconds, 48721);
+  EXPECT_EQ(driver_.m_RangeClockMicros, 818844);
+}
+
+TEST_F(RtpFrames, LivePicturesAndClocksWithoutARateAreStampedZero) {
+  driver_.m_RangeClockSeconds = 1000;
+  driver_.m_PlaybackBaseTimestamp = 5;
+  driver_.StampPicture(frame_, 86400);
+  EXPECT_EQ(frame_.seconds, 0);
+  driver_.m_EdgeStoragePlayback = true;
+  driver_.m_RtpClockRate = 0;
+  driver_.StampPicture(frame_, 86400);
+  EXPECT_EQ(frame_.seconds, 0);
+  EXPECT_EQ(frame_.microseconds, 0);
+}
+
+}  // namespace
+}  // namespace vexa_test

@@ -1,0 +1,233 @@
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <thread>
+
+#include "tests/media/live_camera.h"
+#include "tests/support/process_state.h"
+#include "transport/wait_budget.h"
+#include "vexa/runtime.h"
+
+namespace vexa_test {
+namespace {
+
+using std::chrono::milliseconds;
+using vexa::camera::RequestFault;
+
+TEST(StreamingThread, EndsAtOnceForNoDriverAndForOneThatIsStopping) {
+  EXPECT_EQ(MediaDriver::StreamingThread(nullptr), 0u);
+  MediaDriver driver;
+  driver.m_StopVideoRequested = true;
+  EXPECT_EQ(MediaDriver::StreamingThread(static_cast<CVexaCommon*>(&driver)), 0u);
+}
+
+TEST(VideoStreaming, StopOfADriverThatNeverStartedIsOkAndDoesNothing) {
+  MediaDriver driver;
+  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+  EXPECT_EQ(driver.LatestErrorText(), "");
+}
+
+TEST(VideoStreaming, StartIsRefusedWhileAStopIsInProgress) {
+  MediaDriver driver;
+  driver.m_StopVideoRequested = true;
+  EXPECT_EQ(driver.StartVideoStreaming(), LIBD_FAILED);
+}
+
+TEST(VideoStreaming, OpensTheSessionByItsTextsAndEndsItWithTearDown) {
+  LiveCamera camera(camera_options());
+  MediaDriver driver;
+  camera.introduce(driver);
+  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  EXPECT_NE(driver.m_StagingBuffer, nullptr);
+  EXPECT_EQ(driver.m_RtpClockRate, 90000);
+  ASSERT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+  EXPECT_EQ(driver.m_StreamSocket, -1);
+  EXPECT_EQ(driver.m_RtspSocket, -1);
+  EXPECT_EQ(driver.m_StagingBuffer, nullptr);
+  EXPECT_EQ(driver.m_RtpPacketBuffer, nullptr);
+  EXPECT_EQ(driver.m_StreamingThread, nullptr);
+  EXPECT_EQ(driver.m_ConnectionInfo.timeout, 5000);
+  std::string lines;
+  for (const auto& request : camera->journal().snapshot())
+    lines += request.bytes.substr(0, request.bytes.find('\r')) + "\n";
+  const std::string url = "rtsp://" + camera->address() + ":554/media/video1";
+  const std::string http = "http://" + camera->address() + ":" + std::to_string(camera->http_port());
+  const std::string opening = "GET " + http + "/command/camera.cgi?RTSPTimeout=60 HTTP/1.0\n" +  //
+                              "GET " + http + "/command/edgestorage.cgi?EsRTSPRec1Timeout=60 HTTP/1.0\n" + "GET " +
+                              http + "/command/inquiry.cgi?inq=edgestorage HTTP/1.0\n" +  //
+                              "DESCRIBE " + url + " RTSP/1.0\nSETUP " + url + "/video RTSP/1.0\nPLAY " + url +
+                              " RTSP/1.0\n";
+  EXPECT_EQ(lines.substr(0, opening.size()), opening);
+  EXPECT_EQ(lines.substr(lines.rfind("TEARDOWN")), "TEARDOWN " + url + " RTSP/1.0\n");
+  EXPECT_EQ(camera->sessions(), 0u);
+}
+
+TEST(VideoStreaming, WithoutTearDownNothingIsSentAtTheEnd) {
+  LiveCamera camera(camera_options());
+  MediaDriver driver;
+  camera.introduce(driver);
+  driver.m_NoTearDown = true;
+  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  ASSERT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+  for (const auto& request : camera->journal().snapshot()) EXPECT_EQ(request.bytes.find("TEARDOWN"), std::string::npos);
+  EXPECT_EQ(driver.m_RtspSocket, -1);
+}
+
+struct RefusalCase {
+  const char* what;
+  RequestFault fault;
+  int timeout;
+  ELibDReturnCode code;
+  const char* text;
+};
+
+TEST(VideoStreaming, AFailedStartGivesItsCodeAndClosesEverything) {
+  const RefusalCase cases[] = {
+      {"keep-alive set-up refused", RequestFault::status("RTSPTimeout", "500 No"), 1000, LIBD_FAILED, "No"},
+      {"keep-alive inquiry refused", RequestFault::status("inq=edgestorage", "401 Who"), 1000, LIBD_FAILED, "Who"},
+      {"session refused", RequestFault::status("DESCRIBE", "404 Gone"), 1000, LIBD_STREAM_OPEN_FAILED, "Gone"},
+      {"session unauthorized", RequestFault::status("SETUP", "401 Who"), 1000, LIBD_STREAM_OPEN_FAILED, "Who"},
+      {"play refused", RequestFault::status("PLAY", "453 Full"), 1000, LIBD_STREAM_OPEN_FAILED, "Full"},
+  };
+  LiveCamera camera(camera_options());
+  for (const RefusalCase& c : cases) {
+    camera->clear_request_faults();
+    camera->add_request_fault(c.fault);
+    const auto descriptors = open_descriptors();
+    {
+      MediaDriver driver;
+      camera.introduce(driver, c.timeout);
+      EXPECT_EQ(driver.StartVideoStreaming(), c.code) << c.what;
+      EXPECT_EQ(driver.LatestErrorText(), c.text) << c.what;
+      EXPECT_EQ(driver.m_StreamSocket, -1) << c.what;
+      EXPECT_EQ(driver.m_RtpPacketBuffer, nullptr) << c.what;
+      EXPECT_EQ(driver.m_ConnectionInfo.timeout, c.timeout) << c.what;
+      EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK) << c.what;
+    }
+    EXPECT_TRUE(eventually([&] { return open_descriptors() == descriptors; })) << c.what;
+  }
+}
+
+TEST(VideoStreaming, AnUnreachableRtspServiceGivesStreamOpenFailed) {
+  auto options = camera_options();
+  options.rtsp_port = 0;  // any port but the one that drivers ask for
+  LiveCamera camera(options);
+  MediaDriver driver;
+  camera.introduce(driver);
+  EXPECT_EQ(driver.StartVideoStreaming(), LIBD_STREAM_OPEN_FAILED);
+  EXPECT_EQ(driver.m_StreamSocket, -1);
+  EXPECT_EQ(driver.m_RtspSocket, -1);
+}
+
+TEST(VideoStreaming, OnHttpARefusedImageStreamGivesTheExchangesCode) {
+  LiveCamera camera(camera_options());
+  camera->add_request_fault(RequestFault::wrong_credentials("/image"));
+  MediaDriver driver;
+  camera.introduce(driver);
+  driver.m_ConnectionInfo.streamTransport = 0;
+  EXPECT_EQ(driver.StartVideoStreaming(), LIBD_UNAUTHORIZED);
+  EXPECT_EQ(driver.m_StreamSocket, -1);
+}
+
+TEST(VideoStreaming, ASecondStopWhileTheFirstStillWaitsGivesFailed) {
+  LiveCamera camera(camera_options());
+  camera->add_request_fault(RequestFault::no_answer("GET_PARAMETER"));  // keeps the thread for a second
+  MediaDriver driver;
+  camera.introduce(driver);
+  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  ASSERT_TRUE(camera->journal().wait_for(
+      [](const auto& requests) { return !requests.empty() && requests.back().bytes.rfind("GET_PARAMETER", 0) == 0; },
+      std::chrono::seconds(10)));
+  std::thread first([&] { EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK); });
+  int stop_event = -1;
+  ASSERT_TRUE(eventFd(driver.m_StopVideoEvent, stop_event));
+  ASSERT_EQ(vexa::WaitBudget(5000).wait_readable(stop_event), 1);
+  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_FAILED);
+  EXPECT_EQ(driver.StartVideoStreaming(), LIBD_FAILED);
+  first.join();
+  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+}
+
+TEST(VideoStreaming, AStartWhileStreamingEndsTheRunningStreamFirst) {
+  LiveCamera camera(camera_options());
+  MediaDriver driver;
+  camera.introduce(driver);
+  FrameTaker host;
+  for (int i = 0; i < 3; ++i) {
+    ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+    const auto frames = host.take_all(driver, 3);
+    ASSERT_EQ(frames.size(), 3u);
+    EXPECT_EQ(frames[0].bytes, camera.picture(0));
+  }
+  EXPECT_EQ(camera->sessions(), 1u);
+  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+}
+
+TEST(VideoStreaming, ADriverDestroyedWhileStreamingLeavesNothingBehind) {
+  LiveCamera camera(camera_options());
+  const std::size_t descriptors = open_descriptors();
+  const std::size_t threads = running_threads();
+  {
+    MediaDriver driver;
+    camera.introduce(driver);
+    ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+    ASSERT_EQ(FrameTaker().take_all(driver, 2).size(), 2u);
+  }
+  EXPECT_TRUE(eventually([&] { return running_threads() == threads; })) << running_threads() << " of " << threads;
+  EXPECT_TRUE(eventually([&] { return open_descriptors() == descriptors; }));
+  EXPECT_EQ(camera->sessions(), 0u);
+}
+
+TEST(VideoStreaming, FiveHundredStartsAndStopsLeakNoDescriptorAndNoThread) {
+  LiveCamera camera(camera_options());
+  const std::size_t descriptors = open_descriptors();
+  const std::size_t threads = running_threads();
+  std::atomic<int> failures{0};
+  std::vector<std::thread> hosts;
+  for (int h = 0; h < 10; ++h) {
+    hosts.emplace_back([&] {
+      MediaDriver driver;
+      camera.introduce(driver);
+      for (int i = 0; i < 50; ++i) {
+        if (driver.StartVideoStreaming() != LIBD_OK) ++failures;
+        if (i % 5 == 0 && FrameTaker().take_all(driver, 1).size() != 1) ++failures;
+        if (driver.StopVideoStreaming() != LIBD_OK) ++failures;
+      }
+    });
+  }
+  for (std::thread& host : hosts) host.join();
+  EXPECT_EQ(failures, 0);
+  EXPECT_TRUE(eventually([&] { return running_threads() == threads; })) << running_threads() << " of " << threads;
+  EXPECT_TRUE(eventually([&] { return open_descriptors() == descriptors; }));
+  EXPECT_EQ(camera->sessions(), 0u);
+}
+
+TEST(VideoStreaming, ACameraThatFallsSilentGivesOneTimeOut) {
+  static std::atomic<std::time_t> now;
+  now = 5000;
+  auto options = camera_options();
+  options.pictures = 3;
+  LiveCamera camera(options);
+  MediaDriver driver;
+  camera.introduce(driver, 1000);
+  driver.state().now = [] { return now.load(); };
+  driver.m_KeepAlivePeriod = 60;
+  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  FrameTaker host;
+  ASSERT_EQ(host.take_all(driver, 3).size(), 3u);
+  TakenFrame frame;
+  EXPECT_EQ(host.take(driver, frame), LIBD_NO_FRAME);
+  now += 2;  // more than the time-out
+  const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(10);
+  ELibDReturnCode code = LIBD_NO_FRAME;
+  while (code == LIBD_NO_FRAME && std::chrono::steady_clock::now() < end) {
+    code = host.take(driver, frame);
+    std::this_thread::sleep_for(milliseconds(1));
+  }
+  EXPECT_EQ(code, LIBD_TIMEOUT);
+  EXPECT_EQ(host.take(driver, frame), LIBD_NO_FRAME);
+  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+}
+
+}  // namespace
+}  // namespace vexa_test

@@ -1,0 +1,235 @@
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <string>
+#include <vector>
+
+#include "tests/support/in_child.h"
+#include "tests/support/log_text.h"
+#include "tests/support/temporary_folder.h"
+#include "vexa/file_logger.h"
+
+namespace {
+
+using vexa_test::closing_banner;
+using vexa_test::contents_of;
+using vexa_test::in_child;
+using vexa_test::opening_banner;
+using vexa_test::stderr_of;
+using vexa_test::TemporaryFolder;
+using vexa_test::without_times;
+
+class RotatingLogger : public CFileLogger {
+ public:
+  RotatingLogger(const std::string& name, int kilobytes, int copies) {
+    m_MaxSize = kilobytes;
+    m_CopyCount = copies;
+    SetFileName(name.c_str());
+    OpenFile();
+  }
+
+  using CFileLogger::CycleCloseFile;
+  using CFileLogger::CycleOpenFile;
+  using CFileLogger::m_FileId;
+  using CFileLogger::m_FileInfoList;
+
+  const FileInfo& entry() const { return m_FileInfoList.at(m_FileId); }
+};
+
+std::string log_text(const std::string& path) { return without_times(contents_of(path)); }
+
+bool is_there(const std::string& path) { return access(path.c_str(), F_OK) == 0; }
+
+/// A file that was rotated away after one text.
+std::string ended(const std::string& text) { return opening_banner() + text + closing_banner(); }
+
+/// Text that makes a new file `size` bytes large, together with the opening banner before it.
+std::string text_up_to(std::size_t size) { return std::string(size - opening_banner().size(), 'x'); }
+
+TEST(FileLoggerRotation, ComesAtExactlyTheLimit) {
+  const struct {
+    int kilobytes;
+    std::size_t size;
+    bool rotated;
+  } cases[] = {{1, 1023, false},           {1, 1024, true},       {1, 1025, true},
+               {64, 64 * 1024 - 1, false}, {64, 64 * 1024, true}, {1024, 1024 * 1024 - 1, false},
+               {1024, 1024 * 1024, true},  {-1, 200, true},       {0x7FFFFFFF, 100000, false}};
+  for (const auto& c : cases) {
+    const TemporaryFolder folder;
+    RotatingLogger logger(folder / "Log.txt", c.kilobytes, 1);
+    logger.Log(text_up_to(c.size).c_str());
+    EXPECT_EQ(is_there(folder / "Log1.txt"), c.rotated) << c.kilobytes << " " << c.size;
+    EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + (c.rotated ? "" : text_up_to(c.size)));
+  }
+}
+
+TEST(FileLoggerRotation, CountsWhatTheFileHeldBefore) {
+  const TemporaryFolder folder;
+  const std::string old(1023 - opening_banner().size(), 'o');
+  folder.make_file("Log.txt", old);
+  RotatingLogger logger(folder / "Log.txt", 1, 1);
+  EXPECT_FALSE(is_there(folder / "Log1.txt"));
+  logger.Log("1");
+  EXPECT_EQ(log_text(folder / "Log1.txt"), old + ended("1"));
+}
+
+TEST(FileLoggerRotation, MovesEachCopyUpAndDropsTheLast) {
+  const TemporaryFolder folder;
+  RotatingLogger logger(folder / "Log.txt", 0, 3);
+  for (const char* text : {"1", "2", "3", "4", "5"}) logger.Log(text);
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner());
+  EXPECT_EQ(log_text(folder / "Log1.txt"), ended("5"));
+  EXPECT_EQ(log_text(folder / "Log2.txt"), ended("4"));
+  EXPECT_EQ(log_text(folder / "Log3.txt"), ended("3"));
+  EXPECT_FALSE(is_there(folder / "Log4.txt"));
+}
+
+TEST(FileLoggerRotation, ALimitOfZeroRotatesAfterEveryWrite) {
+  const TemporaryFolder folder;
+  RotatingLogger logger(folder / "Log.txt", 0, 1);
+  logger.Log("1");
+  EXPECT_EQ(log_text(folder / "Log1.txt"), ended("1"));
+  logger.Log("");
+  EXPECT_EQ(log_text(folder / "Log1.txt"), ended(""));
+}
+
+TEST(FileLoggerRotation, ALimitAndACopyCountOfZeroMeanNoLimit) {
+  const TemporaryFolder folder;
+  RotatingLogger logger(folder / "Log.txt", 0, 0);
+  logger.Log("1");
+  logger.Log("2");
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "12");
+}
+
+TEST(FileLoggerRotation, WithoutCopiesTheSameFileGrowsAndEveryLineRotatesAgain) {
+  for (const int copies : {0, -1}) {
+    const TemporaryFolder folder;
+    RotatingLogger logger(folder / "Log.txt", 1, copies);
+    const std::string full = text_up_to(1024);
+    logger.Log(full.c_str());
+    EXPECT_EQ(log_text(folder / "Log.txt"), ended(full) + opening_banner());
+    logger.Log("2");
+    logger.Log("3");
+    EXPECT_EQ(log_text(folder / "Log.txt"), ended(full) + ended("2") + ended("3") + opening_banner());
+    EXPECT_FALSE(is_there(folder / "Log1.txt"));
+  }
+}
+
+TEST(FileLoggerRotation, TheNumberStandsBeforeTheExtension) {
+  const struct {
+    const char* name;
+    const char* copy;
+  } cases[] = {{"Log", "Log1"},         {"a.b/Log", "a.b/Log1"},     {"a.b/Log.tar.gz", "a.b/Log.tar1.gz"},
+               {".hidden", "1.hidden"}, {"a.b//Log.", "a.b//Log1."}, {"%n%s.txt", "%n%s1.txt"}};
+  for (const auto& c : cases) {
+    const TemporaryFolder folder;
+    folder.make_folder("a.b");
+    RotatingLogger logger(folder / c.name, 0, 1);
+    logger.Log("1");
+    EXPECT_EQ(log_text(folder / c.copy), ended("1")) << c.name;
+    EXPECT_EQ(log_text(folder / c.name), opening_banner()) << c.name;
+  }
+}
+
+TEST(FileLoggerRotation, NamesTheFilesOfTheWorkingFolder) {
+  const TemporaryFolder folder;
+  EXPECT_EQ(in_child([&] {
+              if (chdir(folder.path().c_str()) != 0) return std::string("no folder");
+              RotatingLogger logger("Log.txt", 0, 2);
+              logger.Log("1");
+              logger.Log("2");
+              return log_text("Log2.txt") + log_text("Log1.txt") + log_text("Log.txt");
+            }),
+            ended("1") + ended("2") + opening_banner());
+}
+
+TEST(FileLoggerRotation, IsThatOfTheFileNotOfTheNameSetSince) {
+  const TemporaryFolder folder;
+  RotatingLogger logger(folder / "Log.txt", 0, 1);
+  logger.SetFileName((folder / "Other.txt").c_str());
+  logger.Log("1");
+  EXPECT_EQ(log_text(folder / "Log1.txt"), ended("1"));
+  EXPECT_FALSE(is_there(folder / "Other.txt"));
+  EXPECT_FALSE(is_there(folder / "Other1.txt"));
+}
+
+TEST(FileLoggerRotation, SharersGoOnInTheNewFile) {
+  const TemporaryFolder folder;
+  RotatingLogger small(folder / "Log.txt", 0, 1);
+  RotatingLogger large(folder / "Log.txt", 1024, 1);
+  large.Log("a");
+  small.Log("b");
+  large.Log("c");
+  EXPECT_EQ(small.m_FileId, large.m_FileId);
+  EXPECT_EQ(small.entry().referenceCount, 2);
+  EXPECT_EQ(log_text(folder / "Log1.txt"), ended("ab"));
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "c");
+}
+
+TEST(FileLoggerRotation, ACopyThatCannotBeMovedEndsItAndNothingIsLost) {
+  const TemporaryFolder folder;
+  folder.make_folder("Log2.txt/in the way");
+  folder.make_file("Log1.txt", "older");
+  RotatingLogger logger(folder / "Log.txt", 0, 2);
+  const std::string one = folder / "Log1.txt";
+  const std::string two = folder / "Log2.txt";
+  EXPECT_EQ(stderr_of([&] { logger.Log("1"); }), "DeleteFile unlink " + two + ": Is a directory\nMoveFile rename " +
+                                                     one + " to " + two + ": Is a directory\n");
+  EXPECT_EQ(contents_of(one), "older");
+  EXPECT_EQ(log_text(folder / "Log.txt"), ended("1") + opening_banner());
+}
+
+TEST(FileLoggerRotation, ANameWithoutRoomForTheNumberIsNotDeleted) {
+  const TemporaryFolder folder;
+  const std::string name(255, 'n');
+  RotatingLogger logger(folder / name, 0, 2);
+  logger.Log("1");
+  logger.Log("2");
+  EXPECT_EQ(log_text(folder / name), ended("1") + ended("2") + opening_banner());
+}
+
+TEST(FileLoggerRotation, ACopysNameIsCutAt255Characters) {
+  const TemporaryFolder folder;
+  const std::string name(254, 'n');
+  RotatingLogger logger(folder / name, 0, 1);
+  logger.Log("1");
+  EXPECT_EQ(log_text(folder / (name + "1")), ended("1"));
+}
+
+TEST(FileLoggerRotation, AfterAFailedReopeningNothingIsWrittenUntilAllHaveLeft) {
+  const TemporaryFolder folder;
+  const std::string path = folder.make_folder("sub") + "/Log.txt";
+  RotatingLogger first(path, 0, 1);
+  RotatingLogger second(path, 0, 1);
+  ASSERT_EQ(unlink(path.c_str()), 0);
+  ASSERT_EQ(rmdir((folder / "sub").c_str()), 0);
+  EXPECT_EQ(stderr_of([&] { first.Log("1"); }), "CreateFile fopen " + path + ": No such file or directory\n");
+  EXPECT_EQ(first.entry().fileHandle, nullptr);
+  EXPECT_EQ(first.entry().referenceCount, 2);
+  folder.make_folder("sub");
+  EXPECT_EQ(stderr_of([&] {
+              first.Log("2");
+              second.Log("3");
+              first.OpenFile();
+              first.Log("4");
+            }),
+            "");
+  EXPECT_FALSE(is_there(path));
+  first.CloseFile();
+  second.CloseFile();
+  first.OpenFile();
+  EXPECT_EQ(log_text(path), opening_banner());
+}
+
+TEST(FileLoggerRotation, OpeningAFileThatIsOpenKeepsIt) {
+  const TemporaryFolder folder;
+  RotatingLogger logger(folder / "Log.txt", 1, 1);
+  logger.CycleOpenFile();
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner());
+  logger.CycleCloseFile();
+  logger.CycleCloseFile();
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + closing_banner());
+}
+
+}  // namespace

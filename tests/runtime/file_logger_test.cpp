@@ -1,0 +1,303 @@
+#include "vexa/file_logger.h"
+
+#include <gtest/gtest.h>
+#include <sys/resource.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <csignal>
+#include <cstdlib>
+#include <map>
+#include <string>
+#include <type_traits>
+
+#include "runtime/base/sync.h"
+#include "tests/support/in_child.h"
+#include "tests/support/log_text.h"
+#include "tests/support/process_state.h"
+#include "tests/support/temporary_folder.h"
+#include "vexa/real_time.h"
+
+namespace {
+
+using vexa_test::become_unprivileged;
+using vexa_test::closing_banner;
+using vexa_test::contents_of;
+using vexa_test::in_child;
+using vexa_test::opening_banner;
+using vexa_test::stderr_of;
+using vexa_test::TemporaryFolder;
+using vexa_test::without_times;
+
+/// A logger whose inside is open.
+class OpenLogger : public CFileLogger {
+ public:
+  OpenLogger() = default;
+  explicit OpenLogger(const std::string& name) {
+    SetFileName(name.c_str());
+    OpenFile();
+  }
+
+  using CFileLogger::CycleCloseFile;
+  using CFileLogger::CycleFiles;
+  using CFileLogger::CycleOpenFile;
+  using CFileLogger::m_CopyCount;
+  using CFileLogger::m_FileHandleSeed;
+  using CFileLogger::m_FileId;
+  using CFileLogger::m_FileInfoList;
+  using CFileLogger::m_FileListLock;
+  using CFileLogger::m_FileName;
+  using CFileLogger::m_MaxSize;
+
+  void limit(int kilobytes, int copies) {
+    m_MaxSize = kilobytes;
+    m_CopyCount = copies;
+  }
+
+  int references() const { return m_FileInfoList.at(m_FileId).referenceCount; }
+};
+
+// Its destructor runs after those of nearly all other statics.
+OpenLogger early_logger __attribute__((init_priority(102)));
+
+std::string log_text(const std::string& path) { return without_times(contents_of(path)); }
+
+bool is_there(const std::string& path) { return access(path.c_str(), F_OK) == 0; }
+
+/// Text that makes a new file `size` bytes large, together with the opening banner before it.
+std::string text_up_to(std::size_t size) { return std::string(size - opening_banner().size(), 'x'); }
+
+TEST(FileLogger, BeginsClosedWithItsDefaults) {
+  const OpenLogger logger;
+  EXPECT_EQ(logger.m_FileName, "Log.txt");
+  EXPECT_EQ(logger.m_MaxSize, 1024);
+  EXPECT_EQ(logger.m_CopyCount, 1);
+  EXPECT_EQ(logger.m_FileId, 0);
+}
+
+TEST(FileLogger, HasItsStaticsUnderTheirNamesAndTypes) {
+  static_assert(std::is_same<decltype(OpenLogger::m_FileHandleSeed), std::int64_t>::value, "seed");
+  static_assert(std::is_same<std::remove_reference_t<decltype(OpenLogger::m_FileInfoList)>,
+                             std::map<long long, CFileLogger::FileInfo>>::value,
+                "list");
+  static_assert(std::is_same<std::remove_reference_t<decltype(OpenLogger::m_FileListLock)>, CSimpleLock>::value,
+                "lock");
+}
+
+TEST(FileLogger, AnEmptyOrNullNameKeepsThePreviousOne) {
+  OpenLogger logger;
+  logger.SetFileName("");
+  logger.SetFileName(nullptr);
+  EXPECT_EQ(logger.m_FileName, "Log.txt");
+  logger.SetFileName("Other.txt");
+  logger.SetFileName("");
+  EXPECT_EQ(logger.m_FileName, "Other.txt");
+}
+
+TEST(FileLogger, WritesItsBannersAroundTheTextAsItIs) {
+  const TemporaryFolder folder;
+  OpenLogger logger(folder / "Log.txt");
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner());
+  logger.Log("first");
+  logger.Log("\r\n%n%s%d\t");
+  logger.Log("");
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "first\r\n%n%s%d\t");
+  logger.CloseFile();
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "first\r\n%n%s%d\t" + closing_banner());
+}
+
+TEST(FileLogger, BannersTellTheLocalTime) {
+  const TemporaryFolder folder;
+  const CRealTime before = CRealTime::GetTheCurrentTime();
+  { const OpenLogger logger(folder / "Log.txt"); }
+  const std::string text = contents_of(folder / "Log.txt");
+  for (const std::size_t at : {std::size_t{105}, text.find("\tLogFile Closed") - 23}) {
+    CRealTime told;
+    EXPECT_EQ(told.Scan(text.substr(at, 23).c_str(), "%D-%O-%Y %H:%M:%S.%L", false), 7);
+    EXPECT_GE(told.Format("%Y%O%D%H%M%S%03L", true), before.Format("%Y%O%D%H%M%S%03L", true));
+    EXPECT_LE(told.Format("%Y%O%D%H%M%S%03L", true), CRealTime::GetTheCurrentTime().Format("%Y%O%D%H%M%S%03L", true));
+  }
+}
+
+TEST(FileLogger, ContinuesAFileThatIsThere) {
+  const TemporaryFolder folder;
+  folder.make_file("Log.txt", "old");
+  const OpenLogger logger(folder / "Log.txt");
+  EXPECT_EQ(log_text(folder / "Log.txt"), "old" + opening_banner());
+}
+
+TEST(FileLogger, LoggersOfOneNameShareOneFile) {
+  const TemporaryFolder folder;
+  OpenLogger first(folder / "Log.txt");
+  OpenLogger second(folder / "Log.txt");
+  EXPECT_EQ(first.m_FileId, second.m_FileId);
+  EXPECT_EQ(first.references(), 2);
+  first.Log("1");
+  second.Log("2");
+  first.CloseFile();
+  EXPECT_EQ(first.m_FileId, 0);
+  first.Log("lost");
+  second.Log("3");
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "123");
+  second.CloseFile();
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "123" + closing_banner());
+  second.CloseFile();
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "123" + closing_banner());
+}
+
+TEST(FileLogger, NamesAreSharedByTheirBytesAlone) {
+  const TemporaryFolder folder;
+  const OpenLogger first(folder / "Log.txt");
+  const OpenLogger second(folder / "./Log.txt");
+  const OpenLogger third(folder / "log.txt");
+  EXPECT_NE(first.m_FileId, second.m_FileId);
+  EXPECT_NE(first.m_FileId, third.m_FileId);
+  EXPECT_EQ(first.references(), 1);
+}
+
+TEST(FileLogger, IdsCountUpAndAreNotUsedAgain) {
+  const TemporaryFolder folder;
+  const std::int64_t seed = OpenLogger::m_FileHandleSeed;
+  OpenLogger first(folder / "1");
+  EXPECT_EQ(first.m_FileId, seed + 1);
+  EXPECT_EQ(OpenLogger(folder / "1").m_FileId, seed + 1);
+  EXPECT_EQ(OpenLogger(folder / "2").m_FileId, seed + 2);
+  EXPECT_EQ(OpenLogger(folder / "gone/3").m_FileId, 0);
+  first.OpenFile();
+  EXPECT_EQ(first.m_FileId, seed + 3);
+  EXPECT_EQ(OpenLogger::m_FileHandleSeed, seed + 3);
+}
+
+TEST(FileLogger, OpeningLeavesTheFormerFile) {
+  const TemporaryFolder folder;
+  OpenLogger logger(folder / "1");
+  logger.SetFileName((folder / "2").c_str());
+  logger.Log("still the first");
+  logger.OpenFile();
+  logger.Log("the second");
+  EXPECT_EQ(log_text(folder / "1"), opening_banner() + "still the first" + closing_banner());
+  EXPECT_EQ(log_text(folder / "2"), opening_banner() + "the second");
+  EXPECT_EQ(OpenLogger::m_FileInfoList.size(), 1U);
+}
+
+TEST(FileLogger, DestructionClosesItsShare) {
+  const TemporaryFolder folder;
+  const std::size_t before = vexa_test::open_descriptors();
+  { const OpenLogger logger(folder / "Log.txt"); }
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + closing_banner());
+  EXPECT_TRUE(OpenLogger::m_FileInfoList.empty());
+  EXPECT_EQ(vexa_test::open_descriptors(), before);
+}
+
+TEST(FileLogger, ALoggerInAStaticMayOutliveAllElse) {
+  const TemporaryFolder folder;
+  const pid_t child = fork();
+  if (child == 0) {
+    early_logger.SetFileName((folder / "Log.txt").c_str());
+    early_logger.OpenFile();
+    std::exit(0);  // NOLINT(concurrency-mt-unsafe): the child has one thread
+  }
+  int status = -1;
+  ASSERT_EQ(waitpid(child, &status, 0), child);
+  EXPECT_EQ(status, 0);
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + closing_banner());
+}
+
+TEST(FileLogger, AFileThatCannotBeOpenedLeavesTheLoggerSilent) {
+  const TemporaryFolder folder;
+  for (const std::string& name : {folder / "gone/Log.txt", folder.path(), folder / std::string(4096, 'n')}) {
+    OpenLogger logger;
+    stderr_of([&] {
+      logger.SetFileName(name.c_str());
+      logger.OpenFile();
+    });
+    EXPECT_EQ(logger.m_FileId, 0);
+    EXPECT_EQ(stderr_of([&] {
+                logger.Log("nowhere");
+                logger.CycleFiles();
+                logger.CycleCloseFile();
+                logger.CycleOpenFile();
+                logger.CloseFile();
+              }),
+              "");
+  }
+}
+
+TEST(FileLogger, AReadOnlyFileIsNotWritten) {
+  const TemporaryFolder folder;
+  ASSERT_EQ(chmod(folder.path().c_str(), 0755), 0);
+  const std::string path = folder.make_file("Log.txt", "old");
+  ASSERT_EQ(chmod(path.c_str(), 0444), 0);
+  EXPECT_EQ(in_child([&] {
+              if (!become_unprivileged()) return std::string("still privileged");
+              OpenLogger logger(path);
+              logger.Log("lost");
+              return std::to_string(logger.m_FileId);
+            }),
+            "0");
+  EXPECT_EQ(contents_of(path), "old");
+}
+
+TEST(FileLogger, IgnoresNullText) {
+  const TemporaryFolder folder;
+  OpenLogger logger(folder / "Log.txt");
+  logger.Log(nullptr);
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner());
+}
+
+TEST(FileLogger, AFullDeviceIsNoFailure) {
+  OpenLogger logger("/dev/full");
+  EXPECT_EQ(stderr_of([&] {
+              logger.Log("lost");
+              logger.Log("lost");
+            }),
+            "");
+}
+
+TEST(FileLogger, AShortWriteSkipsTheRotation) {
+  const TemporaryFolder folder;
+  const std::string report = in_child([&] {
+    std::signal(SIGXFSZ, SIG_IGN);
+    OpenLogger logger(folder / "Log.txt");
+    logger.limit(1, 1);
+    const rlimit limit = {1024, 1024};
+    if (setrlimit(RLIMIT_FSIZE, &limit) != 0) return std::string("no limit");
+    const std::string told = stderr_of([&] {
+      logger.Log(text_up_to(1025).c_str());
+      logger.Log("lost");
+    });
+    return told + std::to_string(contents_of(folder / "Log.txt").size());
+  });
+  EXPECT_EQ(report, "1024");
+  EXPECT_FALSE(is_there(folder / "Log1.txt"));
+}
+
+TEST(FileLogger, GoesOnWhenTheDiskHasRoomAgain) {
+  const TemporaryFolder folder;
+  const std::string report = in_child([&] {
+    std::signal(SIGXFSZ, SIG_IGN);
+    OpenLogger logger(folder / "Log.txt");
+    rlimit limit = {};
+    getrlimit(RLIMIT_FSIZE, &limit);
+    const rlim_t former = limit.rlim_cur;
+    limit.rlim_cur = opening_banner().size() + 3;
+    if (setrlimit(RLIMIT_FSIZE, &limit) != 0) return std::string("no limit");
+    logger.Log("cut off");
+    logger.Log("lost");
+    limit.rlim_cur = former;
+    if (setrlimit(RLIMIT_FSIZE, &limit) != 0) return std::string("no limit");
+    logger.Log(" again");
+    return log_text(folder / "Log.txt");
+  });
+  EXPECT_EQ(report, opening_banner() + "cut again");
+}
+
+TEST(FileLogger, IsDestroyedThroughItsBase) {
+  const TemporaryFolder folder;
+  CFileLogger* logger = new OpenLogger(folder / "Log.txt");
+  delete logger;
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + closing_banner());
+}
+
+}  // namespace

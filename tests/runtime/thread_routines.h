@@ -1,0 +1,54 @@
+// Start routines, and watching the threads that run them.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+
+#include "tests/support/process_state.h"
+#include "vexa/runtime.h"
+
+namespace vexa_test {
+
+using Routine = unsigned int (*)(void*);
+
+inline typedHandle* start(Routine routine, void* argument = nullptr) {
+  return _beginthreadex(nullptr, 0, routine, argument, 0, nullptr);
+}
+
+inline unsigned long exit_code(typedHandle* thread) {
+  unsigned long code = 12345;
+  EXPECT_EQ(GetExitCodeThread(thread, &code), 1);
+  return code;
+}
+
+inline bool finishes(typedHandle* thread) {
+  return eventually([thread] { return exit_code(thread) != STILL_ACTIVE; });
+}
+
+inline unsigned int return_argument(void* argument) { return *static_cast<unsigned int*>(argument); }
+
+inline unsigned int return_nothing(void*) { return 0; }
+
+// Ends once `release` is set.
+struct Gate {
+  std::atomic<long> entered{0};  // the thread behind it
+  std::atomic<bool> release{false};
+  std::atomic<bool> left{false};  // the thread's last touch
+};
+
+inline unsigned int wait_at_gate(void* argument) {
+  auto* gate = static_cast<Gate*>(argument);
+  gate->entered = vexa_test::kernel_thread_id();
+  eventually([gate] { return gate->release.load(); });
+  gate->left = true;
+  return 42;
+}
+
+// Opens the gate and sees the thread behind it end.
+inline bool goes_through(Gate& gate) {
+  gate.release = true;
+  return eventually([&gate] { return gate.left && !is_running(gate.entered); });
+}
+
+}  // namespace vexa_test

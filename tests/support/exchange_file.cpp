@@ -1,0 +1,131 @@
+#include "tests/support/exchange_file.h"
+
+#include <algorithm>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+#include <stdexcept>
+#include <string_view>
+
+namespace vexa_test {
+namespace {
+
+std::string unescaped(std::string_view line) {
+  std::string bytes;
+  for (std::size_t at = 0; at < line.size(); ++at) {
+    if (line[at] != '\\') {
+      bytes += line[at];
+      continue;
+    }
+    const char letter = ++at < line.size() ? line[at] : '\0';
+    if (letter == 'r') {
+      bytes += '\r';
+    } else if (letter == 'n') {
+      bytes += '\n';
+    } else if (letter == '\\') {
+      bytes += '\\';
+    } else if (letter == 'x' && at + 2 < line.size()) {
+      bytes += static_cast<char>(std::stoi(std::string(line.substr(at + 1, 2)), nullptr, 16));
+      at += 2;
+    } else {
+      throw std::runtime_error("unknown escape in <" + std::string(line) + ">");
+    }
+  }
+  return bytes;
+}
+
+Then then_of(const std::string& word) {
+  if (word == "close") return Then::kClose;
+  if (word == "stay") return Then::kStay;
+  if (word == "reset") return Then::kReset;
+  throw std::runtime_error("unknown end <" + word + ">");
+}
+
+void take_options(const std::string& options, ScriptStep& step) {
+  std::istringstream words(options);
+  for (std::string word; words >> word;) {
+    const std::string value = word.substr(word.find('=') + 1);
+    if (word.starts_with("piece=")) {
+      step.piece = static_cast<std::size_t>(std::stoul(value));
+    } else if (word.starts_with("pause=")) {
+      step.pause = std::stoi(value);
+    } else if (word.starts_with("then=")) {
+      step.then = then_of(value);
+    } else {
+      throw std::runtime_error("unknown option <" + word + ">");
+    }
+  }
+}
+
+std::pair<std::string, std::string> key_and_value(const std::string& line) {
+  const std::size_t blank = line.find(' ');
+  if (blank == std::string::npos) return {line, ""};
+  return {line.substr(0, blank), unescaped(std::string_view(line).substr(blank + 1))};
+}
+
+class Reader {
+ public:
+  ExchangeFile read(std::istream& file) {
+    for (std::string line; std::getline(file, line);) {
+      if (!line.starts_with('#')) take(line);
+    }
+    if (section_ != Section::kResults) throw std::runtime_error("no results");
+    return std::move(exchange_);
+  }
+
+ private:
+  enum class Section { kBefore, kExpected, kAnswer, kResults };
+
+  void take(const std::string& line) {
+    if (line.starts_with(">>>")) {
+      section_ = Section::kExpected;
+      exchange_.script.emplace_back().new_connection = line == ">>> another";
+    } else if (line.starts_with("<<<")) {
+      section_ = Section::kAnswer;
+      take_options(line.substr(3), exchange_.script.at(exchange_.script.size() - 1));
+    } else if (line == "===") {
+      section_ = Section::kResults;
+    } else {
+      take_content(line);
+    }
+  }
+
+  void take_content(const std::string& line) {
+    switch (section_) {
+      case Section::kBefore:
+        if (!line.empty()) exchange_.before.insert(key_and_value(line));
+        return;
+      case Section::kExpected:
+        exchange_.script.back().expected += unescaped(line);
+        return;
+      case Section::kAnswer:
+        exchange_.script.back().answer += unescaped(line);
+        return;
+      case Section::kResults:
+        if (!line.empty()) exchange_.results.insert(key_and_value(line));
+        return;
+    }
+  }
+
+  Section section_ = Section::kBefore;
+  ExchangeFile exchange_;
+};
+
+}  // namespace
+
+ExchangeFile read_exchange(const std::string& path) {
+  std::ifstream file(path);
+  if (!file) throw std::runtime_error("cannot read " + path);
+  return Reader().read(file);
+}
+
+std::vector<std::string> exchange_names(const std::string& folder) {
+  std::vector<std::string> names;
+  for (const auto& entry : std::filesystem::directory_iterator(folder)) {
+    if (entry.path().extension() == ".txt") names.push_back(entry.path().stem());
+  }
+  std::sort(names.begin(), names.end());
+  return names;
+}
+
+}  // namespace vexa_test

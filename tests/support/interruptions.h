@@ -1,0 +1,51 @@
+// Signals without end for one thread, so that its waits are interrupted again and again.
+#pragma once
+
+#include <pthread.h>
+#include <signal.h>
+
+#include <atomic>
+#include <chrono>
+#include <thread>
+
+namespace vexa_test {
+
+/// While it lives, the thread that made it gets SIGUSR1 every millisecond, without SA_RESTART.
+class Interruptions {
+ public:
+  Interruptions() : target_(pthread_self()) {
+    taken().store(0);
+    struct sigaction action {};
+    action.sa_handler = [](int) { taken().fetch_add(1); };
+    sigaction(SIGUSR1, &action, &before_);
+    thread_ = std::thread([this] {
+      while (!done_) {
+        pthread_kill(target_, SIGUSR1);
+        std::this_thread::sleep_for(std::chrono::milliseconds(1));
+      }
+    });
+  }
+  ~Interruptions() {
+    done_ = true;
+    thread_.join();
+    sigaction(SIGUSR1, &before_, nullptr);
+  }
+  Interruptions(const Interruptions&) = delete;
+  Interruptions& operator=(const Interruptions&) = delete;
+
+  /// Signals taken so far.
+  int count() const { return taken(); }
+
+ private:
+  static std::atomic<int>& taken() {
+    static std::atomic<int> taken{0};
+    return taken;
+  }
+
+  pthread_t target_;
+  struct sigaction before_ {};
+  std::atomic<bool> done_{false};
+  std::thread thread_;
+};
+
+}  // namespace vexa_test

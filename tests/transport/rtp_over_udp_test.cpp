@@ -1,0 +1,210 @@
+#include <gtest/gtest.h>
+#include <poll.h>
+#include <sys/resource.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+#include <fcntl.h>
+#include <array>
+#include <csignal>
+#include <thread>
+#include <vector>
+
+#include "tests/media/media_driver.h"
+#include "vexa/runtime.h"
+
+namespace vexa_test {
+namespace {
+
+constexpr int kSize = 65536;
+
+/// A camera's end and the driver's end of a datagram connection.
+class RtpOverUdp : public testing::Test {
+ protected:
+  RtpOverUdp() {
+    int ends[2];
+    EXPECT_EQ(socketpair(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0, ends), 0);
+    camera_ = ends[0];
+    socket_ = ends[1];
+    driver_.soil_latest_error();
+  }
+  ~RtpOverUdp() override {
+    close(camera_);
+    close(socket_);
+  }
+
+  void send_datagram(const std::vector<unsigned char>& bytes) {
+    ASSERT_EQ(send(camera_, bytes.data(), bytes.size(), 0), static_cast<ssize_t>(bytes.size()));
+  }
+  int receive(SPacketInfo& packet, int timeout = 1000) {
+    return driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), kSize, timeout, packet);
+  }
+
+  MediaDriver driver_;
+  int camera_ = -1;
+  int socket_ = -1;
+  std::vector<char> buffer_ = std::vector<char>(kSize);
+};
+
+const std::vector<unsigned char> kPacket = {0x80, 0xe0, 0xff, 0xfe, 0, 0, 0, 5, 9, 9, 9, 9, 0x65, 0x88};
+
+TEST_F(RtpOverUdp, FillsThePacketFromTheHeaderInHostOrder) {
+  for (const bool twin : {false, true}) {
+    send_datagram(kPacket);
+    SPacketInfo packet;
+    const int length =
+        twin ? driver_.rtp_over_udp_payload_recv_h264(socket_, buffer_.data(), kSize, 1000, packet) : receive(packet);
+    EXPECT_EQ(length, 14);
+    EXPECT_TRUE(packet.received);
+    EXPECT_TRUE(packet.marker);
+    EXPECT_EQ(packet.payloadType, 96);
+    EXPECT_EQ(packet.sequence, 65534);
+    EXPECT_EQ(packet.length, 14u);
+    EXPECT_EQ(packet.timestamp, 5u);
+    EXPECT_EQ(packet.data, reinterpret_cast<unsigned char*>(buffer_.data()));
+    EXPECT_EQ(driver_.LatestErrorCode(), LIBD_FAILED);
+  }
+}
+
+TEST_F(RtpOverUdp, ADatagramOf11BytesSetsTheReceivedFlagAlone) {
+  send_datagram(std::vector<unsigned char>(11, 0xff));
+  unsigned char byte = 0;
+  SPacketInfo packet;
+  packet.data = &byte;
+  packet.marker = true;
+  packet.payloadType = 7;
+  packet.sequence = 8;
+  packet.length = 9;
+  packet.timestamp = 10;
+  EXPECT_EQ(receive(packet), 11);
+  EXPECT_TRUE(packet.received);
+  EXPECT_EQ(packet.data, &byte);
+  EXPECT_TRUE(packet.marker);
+  EXPECT_EQ(packet.payloadType, 7);
+  EXPECT_EQ(packet.sequence, 8);
+  EXPECT_EQ(packet.length, 9u);
+  EXPECT_EQ(packet.timestamp, 10u);
+}
+
+TEST_F(RtpOverUdp, ABufferOf65534BytesIsRefusedAndOneMoreIsTaken) {
+  SPacketInfo packet;
+  send_datagram(kPacket);
+  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), 65534, 0, packet), -1);
+  EXPECT_EQ(driver_.LatestErrorText(), "Invalid argument");
+  EXPECT_EQ(driver_.LatestErrorCode(), LIBD_FAILED);
+  EXPECT_FALSE(packet.received);
+  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), 65534, nullptr, nullptr, 0, nullptr, nullptr),
+            -1);
+  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), 65535, 0, packet), 14);
+}
+
+TEST_F(RtpOverUdp, NoDatagramInTimeGivesReceiveTimedOut) {
+  SPacketInfo packet;
+  for (const int timeout : {20, 0, -1}) {
+    driver_.soil_latest_error();
+    EXPECT_EQ(receive(packet, timeout), -1);
+    EXPECT_EQ(driver_.LatestErrorText(), "Receive timed out");
+    EXPECT_EQ(driver_.LatestErrorCode(), LIBD_TIMEOUT);
+    EXPECT_FALSE(packet.received);
+  }
+}
+
+TEST_F(RtpOverUdp, AFailingReadGivesTheSystemText) {
+  SPacketInfo packet;
+  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(-1, buffer_.data(), kSize, 20, packet), -1);
+  EXPECT_EQ(driver_.LatestErrorText(), "Bad file descriptor");
+  EXPECT_EQ(driver_.LatestErrorCode(), LIBD_FAILED);
+}
+
+TEST_F(RtpOverUdp, ThePointerFormMovesThePayloadToTheStart) {
+  send_datagram(kPacket);
+  bool marker = false;
+  unsigned char type = 0;
+  unsigned int timestamp = 0;
+  unsigned short sequence = 0;
+  EXPECT_EQ(
+      driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), kSize, &marker, &type, 1000, &timestamp, &sequence),
+      2);
+  EXPECT_TRUE(marker);
+  EXPECT_EQ(type, 96);
+  EXPECT_EQ(timestamp, 5u);
+  EXPECT_EQ(sequence, 65534);
+  EXPECT_EQ(std::string(buffer_.data(), 2), "\x65\x88");
+}
+
+TEST_F(RtpOverUdp, ThePointerFormTakesNullPointersAndShortDatagrams) {
+  send_datagram(kPacket);
+  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), kSize, nullptr, nullptr, 1000, nullptr, nullptr),
+            2);
+  send_datagram({1, 2, 3});
+  unsigned short sequence = 77;
+  EXPECT_EQ(
+      driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), kSize, nullptr, nullptr, 1000, nullptr, &sequence), 3);
+  EXPECT_EQ(sequence, 77);
+  EXPECT_EQ(std::string(buffer_.data(), 3), "\x01\x02\x03");
+}
+
+TEST_F(RtpOverUdp, DatagramsOfEveryLengthAreTaken) {
+  SPacketInfo packet;
+  for (int length = 0; length <= 64; ++length) {
+    send_datagram(std::vector<unsigned char>(static_cast<std::size_t>(length), 0x80));
+    EXPECT_EQ(receive(packet), length);
+  }
+  send_datagram(std::vector<unsigned char>(65535, 0x80));
+  EXPECT_EQ(receive(packet), 65535);
+}
+
+TEST_F(RtpOverUdp, ADatagramThatComesDuringTheWaitIsTaken) {
+  std::thread late([this] {
+    pollfd none = {-1, 0, 0};
+    poll(&none, 1, 30);
+    send_datagram(kPacket);
+  });
+  SPacketInfo packet;
+  EXPECT_EQ(receive(packet, 5000), 14);
+  late.join();
+}
+
+TEST_F(RtpOverUdp, AStopEndsTheWaitAtOnce) {
+  SetEvent(driver_.m_StopVideoEvent);
+  SPacketInfo packet;
+  EXPECT_EQ(receive(packet, 600000), -1);
+}
+
+void ignore_signal(int) {}
+
+TEST_F(RtpOverUdp, ASignalDoesNotEndTheWait) {
+  struct sigaction action = {};
+  action.sa_handler = ignore_signal;
+  sigaction(SIGUSR1, &action, nullptr);
+  const pthread_t reader = pthread_self();
+  std::thread disturber([&] {
+    for (int i = 0; i < 5; ++i) {
+      pollfd none = {-1, 0, 0};
+      poll(&none, 1, 10);
+      pthread_kill(reader, SIGUSR1);
+    }
+    send_datagram(kPacket);
+  });
+  SPacketInfo packet;
+  EXPECT_EQ(receive(packet, 5000), 14);
+  disturber.join();
+}
+
+TEST_F(RtpOverUdp, ADescriptorAbove1023IsAsGoodAsAny) {
+  rlimit limit = {};
+  ASSERT_EQ(getrlimit(RLIMIT_NOFILE, &limit), 0);
+  limit.rlim_cur = std::max<rlim_t>(limit.rlim_cur, 2048);
+  ASSERT_EQ(setrlimit(RLIMIT_NOFILE, &limit), 0);
+  const int high = fcntl(socket_, F_DUPFD_CLOEXEC, 1500);
+  ASSERT_GE(high, 1500);
+  send_datagram(kPacket);
+  SPacketInfo packet;
+  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(high, buffer_.data(), kSize, 1000, packet), 14);
+  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(high, buffer_.data(), kSize, 10, packet), -1);
+  EXPECT_EQ(driver_.LatestErrorText(), "Receive timed out");
+  close(high);
+}
+
+}  // namespace
+}  // namespace vexa_test

@@ -1,0 +1,117 @@
+#include "transport/wire/http_answer.h"
+
+#include <gtest/gtest.h>
+#include <stdlib.h>
+
+#include <climits>
+#include <clocale>
+#include <cstdlib>
+
+#include "tests/support/temporary_folder.h"
+
+namespace vexa {
+namespace {
+
+TEST(HeaderLength, CountsUpToTheFirstBlankLine) {
+  const struct {
+    std::string_view received;
+    std::size_t length;
+  } cases[] = {{"", 0},
+               {"HTTP/1.0 200 OK\r\n", 0},
+               {"HTTP/1.0 200 OK\r\n\r\n", 19},
+               {"HTTP/1.0 200 OK\r\n\r\nbody\r\n\r\n", 19},
+               {"HTTP/1.0 200 OK\n\nbody", 17},
+               {"\r\n\r\n", 4},
+               {"\n\n", 2},
+               {"\n\r\n", 0},
+               {"\r\n\r", 0}};
+  for (const auto& c : cases) EXPECT_EQ(header_length(c.received), c.length) << c.received;
+}
+
+TEST(HeaderLength, LooksForCarriageReturnsFirst) { EXPECT_EQ(header_length("a\n\nb\r\n\r\nc"), 8U); }
+
+TEST(HeaderLength, EndsItsLookAtANul) {
+  EXPECT_EQ(header_length(std::string_view("HTTP\0\r\n\r\n", 9)), 0U);
+  EXPECT_EQ(header_length(std::string_view("a\r\n\r\n\0b", 7)), 5U);
+}
+
+TEST(ParseStatusLine, ReadsNumberAndReason) {
+  const struct {
+    const char* text;
+    int status;
+    const char* reason;
+  } cases[] = {{"HTTP/1.0 200 OK\r\n\r\n", 200, "OK"},
+               {"HTTP/1.1 204 No Content\r\nServer: x", 204, "No Content"},
+               {"HTTP/1.0 401 Unauthorized", 401, "Unauthorized"},
+               {"HTTP/1.0   503    Try later\n", 503, "Try later"},
+               {"HTTP/9 7 x", 7, "x"},
+               {"HTTP/ 1.0 200 OK", 200, "OK"},
+               {"HTTP/1.0 -5 x", -5, "x"},
+               {"HTTP/1.0 +200 x", 200, "x"},
+               {"HTTP/1.0 200OK", 200, "OK"},
+               {"HTTP/1.0\r\n200\r\nOK", 200, "OK"},
+               {"HTTP/1.0 99999999999 big", INT_MAX, "big"},
+               {"HTTP/1.0 -99999999999999999999999 small", INT_MIN, "small"}};
+  for (const auto& c : cases) {
+    const auto line = parse_status_line(c.text, "HTTP/");
+    ASSERT_TRUE(line) << c.text;
+    EXPECT_EQ(line->status, c.status) << c.text;
+    EXPECT_EQ(line->reason, c.reason) << c.text;
+  }
+}
+
+TEST(ParseStatusLine, NeedsBothNumberAndReason) {
+  for (const char* text :
+       {"", "HTTP/", "HTTP/1.0", "HTTP/1.0 ", "HTTP/1.0 OK", "HTTP/1.0 200", "HTTP/1.0 200 ", "HTTP/1.0 200\r\n\r\n",
+        "HTTP/x 200 OK", "http/1.0 200 OK", " HTTP/1.0 200 OK", "RTSP/1.0 200 OK", "200 OK", "HTTP/1.0 200 ^"}) {
+    EXPECT_FALSE(parse_status_line(text, "HTTP/")) << text;
+  }
+}
+
+TEST(ParseStatusLine, EndsTheReasonAtACaret) {
+  EXPECT_EQ(parse_status_line("HTTP/1.0 404 Not^Found\r\n", "HTTP/")->reason, "Not");
+}
+
+TEST(ParseStatusLine, ReadsNothingBehindANul) {
+  EXPECT_FALSE(parse_status_line(std::string_view("HTTP/1.0 200\0 OK", 16), "HTTP/"));
+  EXPECT_EQ(parse_status_line(std::string_view("HTTP/1.0 200 O\0K", 16), "HTTP/")->reason, "O");
+}
+
+TEST(ParseStatusLine, KeepsALongReasonTo1023Characters) {
+  for (const std::size_t length : {1022U, 1023U, 1024U, 9000U}) {
+    const auto line = parse_status_line("HTTP/1.0 500 " + std::string(length, 'r'), "HTTP/");
+    ASSERT_TRUE(line);
+    EXPECT_EQ(line->reason, std::string(std::min<std::size_t>(length, 1023), 'r'));
+  }
+}
+
+TEST(ParseStatusLine, ReadsRtspTheSameWay) {
+  EXPECT_EQ(parse_status_line("RTSP/1.0 454 Session Not Found\r\n", "RTSP/")->status, 454);
+  EXPECT_FALSE(parse_status_line("HTTP/1.0 200 OK", "RTSP/"));
+}
+
+/// Has a locale made whose decimal point is a comma, from definitions that stand here, and switches the process to it.
+bool switch_to_commas(const vexa_test::TemporaryFolder& folder) {
+  const std::string source = folder.make_file("source",
+                                              "comment_char %\nescape_char /\nLC_NUMERIC\n"
+                                              "decimal_point \"<U002C>\"\nthousands_sep \"\"\ngrouping -1\n"
+                                              "END LC_NUMERIC\n");
+  const std::string command = "localedef --no-archive -c -i " + source + " " + folder / "xx_XX" + " 2>/dev/null";
+  static_cast<void>(std::system(command.c_str()));
+  setenv("LOCPATH", folder.path().c_str(), 1);
+  return std::setlocale(LC_NUMERIC, "xx_XX") != nullptr && *std::localeconv()->decimal_point == ',';
+}
+
+TEST(ParseStatusLine, ReadsTheVersionWhateverTheHostsDecimalPoint) {
+  const vexa_test::TemporaryFolder folder;
+  if (!switch_to_commas(folder)) GTEST_SKIP() << "no locale could be made";
+  const auto line = parse_status_line("HTTP/1.0 200 OK\r\n", "HTTP/");
+  std::setlocale(LC_NUMERIC, "C");
+  unsetenv("LOCPATH");
+  ASSERT_TRUE(line);
+  EXPECT_EQ(line->status, 200);
+  EXPECT_EQ(line->reason, "OK");
+}
+
+}  // namespace
+}  // namespace vexa

@@ -1,0 +1,125 @@
+#include "virtual_camera/rtsp_message.h"
+
+#include <gtest/gtest.h>
+
+#include <string>
+
+#include "virtual_camera/rtp_packetiser.h"
+#include "virtual_camera/session_description.h"
+
+namespace vexa::camera {
+namespace {
+
+TEST(RtspMessage, ARequestEndsBehindItsBodyAndTheEmptyLinesThatFollow) {
+  const std::string head = "TEARDOWN rtsp://h/a RTSP/1.0\r\nCSeq: 5\r\n";
+  const struct {
+    std::string received;
+    std::size_t size;
+  } cases[] = {{head, 0},
+               {head + "\r\n", head.size() + 2},
+               {head + "\r\n\r\n", head.size() + 4},
+               {head + "\r\n\r", head.size() + 2},
+               {head + "\r\nPLAY", head.size() + 2},
+               {head + "Content-Length: 3\r\n\r\nab", 0},
+               {head + "Content-Length: 3\r\n\r\nabcd", head.size() + 24},
+               {head + "Content-Length: x\r\n\r\nabcd", 0},
+               {head + "Content-Length: 99999999999\r\n\r\nabcd", 0},
+               {"garbage\r\n\r\nmore", 11}};
+  for (const auto& c : cases) EXPECT_EQ(rtsp_request_size(c.received), c.size) << c.received;
+}
+
+TEST(RtspMessage, SequenceAndSessionAreDecimalNumbers) {
+  const struct {
+    std::string text;
+    std::optional<std::uint32_t> sequence;
+    std::uint32_t session;
+  } cases[] = {{"1", 1U, 1},
+               {"12345678;timeout=60", std::nullopt, 12345678},
+               {"", std::nullopt, 0},
+               {"-1", std::nullopt, 0},
+               {"ABC", std::nullopt, 0},
+               {"4294967296", std::nullopt, 0},
+               {"4294967295", 4294967295U, 4294967295U}};
+  for (const auto& c : cases) {
+    RequestHead head;
+    head.fields = {{"CSeq", c.text}, {"Session", c.text}};
+    EXPECT_EQ(sequence_of(head), c.sequence) << c.text;
+    EXPECT_EQ(session_of(head), c.session) << c.text;
+  }
+}
+
+TEST(RtspMessage, TransportMustOfferUdpUnicastWithAPort) {
+  const struct {
+    std::string transport;
+    int first, second;
+  } cases[] = {{"RTP/AVP;unicast;client_port=5000-5001", 5000, 5001},
+               {"RTP/AVP/UDP;unicast;client_port=5000-5003", 5000, 5003},
+               {"RTP/AVP;client_port=5000", 5000, 5001},
+               {"RTP/AVP;client_port=5000;mode=play-1", 5000, 5001},
+               {"RTP/AVP/TCP;unicast;interleaved=0-1,RTP/AVP;unicast;client_port=7000-7001", 7000, 7001},
+               {"RTP/AVP/TCP;unicast;interleaved=0-1;", 0, 1},
+               {"RTP/AVP;multicast;client_port=5000-5001", 0, 1},
+               {"RTP/AVP;unicast;client_port=0-1", 0, 1},
+               {"RTP/AVP;unicast;client_port=70000-70001", 0, 1},
+               {"RTP/AVP;unicast;client_port=x", 0, 1},
+               {"RTP/AVP;unicast", 0, 1},
+               {"client_port=5000", 0, 1},
+               {"", 0, 1}};
+  for (const auto& c : cases) {
+    EXPECT_EQ(client_port_of(c.transport), c.first) << c.transport;
+    EXPECT_EQ(second_client_port_of(c.transport), c.second) << c.transport;
+  }
+}
+
+TEST(RtspMessage, UrlsNameAStreamOrItsTrack) {
+  const struct {
+    std::string path;
+    VideoUrl url;
+  } cases[] = {{"/media/video1", VideoUrl::kStream},
+               {"/media/video12/", VideoUrl::kStream},
+               {"/media/video1/video", VideoUrl::kTrack},
+               {"/media/video", VideoUrl::kNone},
+               {"/media/videoX", VideoUrl::kNone},
+               {"/media/video1/audio", VideoUrl::kNone},
+               {"/media/video1/video/x", VideoUrl::kNone},
+               {"", VideoUrl::kNone},
+               {"/video1", VideoUrl::kNone}};
+  for (const auto& c : cases) EXPECT_EQ(classify_url(c.path), c.url) << c.path;
+}
+
+TEST(RtspMessage, AnswersHoldStatusSequenceFieldsAndBody) {
+  EXPECT_EQ(rtsp_answer({"200 OK", 3, "Session: 1\r\n", {}}).bytes, "RTSP/1.0 200 OK\r\nCSeq: 3\r\nSession: 1\r\n\r\n");
+  EXPECT_EQ(rtsp_answer({"400 Bad Request", std::nullopt, {}, {}}).bytes, "RTSP/1.0 400 Bad Request\r\n\r\n");
+  const Answer answer = rtsp_answer({"200 OK", 1, {}, "v=0\r\n"});
+  EXPECT_EQ(answer.bytes,
+            "RTSP/1.0 200 OK\r\nCSeq: 1\r\nContent-Type: application/sdp\r\nContent-Length: 5\r\n\r\nv=0\r\n");
+  EXPECT_EQ(answer.status, 200);
+}
+
+TEST(SessionDescription, NamesThePayloadTheClockAndTheTrack) {
+  CameraOptions options;
+  EXPECT_EQ(describe_session(options, 500),
+            "v=0\r\no=- 1 1 IN IP4 127.0.0.2\r\ns=video\r\nt=0 0\r\nm=video 0 RTP/AVP 96\r\n"
+            "a=rtpmap:96 H264/90000\r\na=fmtp:96 packetization-mode=1\r\na=control:video\r\n");
+  options.range_clock = "20240131T235959.250Z";
+  options.payload_type = 97;
+  options.clock_rate = 48000;
+  EXPECT_EQ(describe_session(options, 500),
+            "v=0\r\no=- 1 1 IN IP4 127.0.0.2\r\ns=video\r\nt=0 0\r\na=range:clock=20240131T235959.250Z\r\n"
+            "m=video 0 RTP/AVP 97\r\na=rtpmap:97 H264/48000\r\na=fmtp:97 packetization-mode=1\r\na=control:video\r\n");
+}
+
+TEST(SessionDescription, ParameterSetsAreNamedWhereTheyFit) {
+  const std::vector<std::uint8_t> bytes{0, 0, 1,    0x67, 0x42, 0xC0, 0x1E, 0x55, 0,
+                                        0, 1, 0x68, 0xCE, 0,    0,    1,    0x65, 0x88};
+  CameraOptions options;
+  options.clip = std::make_shared<const PacketisedClip>(Clip::from_annex_b(bytes), 1400);
+  const std::string sets = ";profile-level-id=42c01e;sprop-parameter-sets=Z0LAHlU=,aM4=\r\n";
+  const std::string whole = describe_session(options, 500);
+  EXPECT_NE(whole.find(sets), std::string::npos);
+  EXPECT_EQ(describe_session(options, whole.size()), whole);
+  EXPECT_EQ(describe_session(options, whole.size() - 1).find("sprop"), std::string::npos);
+}
+
+}  // namespace
+}  // namespace vexa::camera
