@@ -183,6 +183,12 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   void FreeFrame(VideoFrameInfo& frame) VEXA_REQUIRES(m_FrameQueueLock);
   void ClearFrameQueue();
 
+  // The camera-position text in user data: media/user_data.cpp
+  /// Looks for it in the first 256 bytes; true when it is there and stored.
+  bool GetUserDataFromStream(const unsigned char* data, unsigned int length);
+  /// The same over the whole data.
+  bool TakeCameraPosition(const unsigned char* data, unsigned int length);
+
   // Pictures from RTP: media/rtp_pictures.cpp, media/rtp_frames.cpp
   ELibDReturnCode GetRtpCurrentVideoFrameH264(VideoFrameInfo& frame);
 

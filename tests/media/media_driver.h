@@ -23,6 +23,9 @@ class MediaDriver : public TestDriver {
   using CVexaCommon::ClearFrameQueue;
   using CVexaCommon::GetRtpCurrentVideoFrame;
   using CVexaCommon::GetRtpCurrentVideoFrameH264;
+  using CVexaCommon::GetUserDataFromStream;
+  using CVexaCommon::m_CamPosLock;
+  using CVexaCommon::m_CamPosText;
   using CVexaCommon::m_FirstPlaybackFrame;
   using CVexaCommon::m_FrameQueue;
   using CVexaCommon::m_FrameQueueLock;
@@ -45,6 +48,7 @@ class MediaDriver : public TestDriver {
   using CVexaCommon::rtp_over_udp_recvn;
   using CVexaCommon::StampPicture;
   using CVexaCommon::StreamingThread;
+  using CVexaCommon::TakeCameraPosition;
 };
 
 /// A frame as the host got it.
