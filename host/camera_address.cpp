@@ -27,8 +27,6 @@ std::optional<int> parse_port(std::string_view text) {
   return port;
 }
 
-Problem usage(std::string text, std::string advice) { return {ExitCode::kUsage, std::move(text), std::move(advice)}; }
-
 }  // namespace
 
 Result<CameraAddress> parse_camera_address(std::string_view text) {

@@ -18,8 +18,6 @@ namespace {
 constexpr std::size_t kLongestCredentials = 255;
 constexpr std::size_t kLargestFile = 4096;
 
-Problem usage(std::string text, std::string advice) { return {ExitCode::kUsage, std::move(text), std::move(advice)}; }
-
 Result<std::string> read_first_line(const std::string& path) {
   const UniqueFd file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
   if (!file.valid()) return unreadable(path, errno);

@@ -3,8 +3,11 @@
 #include <fmt/format.h>
 
 #include <system_error>
+#include <utility>
 
 namespace vexa::host {
+
+Problem usage(std::string text, std::string advice) { return {ExitCode::kUsage, std::move(text), std::move(advice)}; }
 
 Problem unreadable(const std::string& path, int error) {
   return {ExitCode::kUsage, fmt::format("cannot read {}: {}", path, std::generic_category().message(error)),

@@ -15,6 +15,9 @@ struct Problem {
   std::string advice;  // what to do next, a sentence
 };
 
+// A mistake in what was typed.
+[[nodiscard]] Problem usage(std::string text, std::string advice);
+
 template <typename Value>
 using Result = std::variant<Value, Problem>;
 

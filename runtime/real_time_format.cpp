@@ -14,7 +14,7 @@ namespace {
 using MonthNames = std::array<std::string_view, kMonthsPerYear>;
 using DayNames = std::array<std::string_view, kDaysPerWeek>;
 
-constexpr DayNames kDays = {"Sunday", "Monday", "Tuesday", "Wednesday", "Thursday", "Friday", "Saturday"};
+constexpr DayNames kDayNames = {"Sunday", "Monday", "Tuesday", "Wednesday", "Thursday", "Friday", "Saturday"};
 constexpr DayNames kShortDays = {"Sun", "Mon", "Tue", "Wed", "Thu", "Fri", "Sat"};
 constexpr MonthNames kMonths = {"January", "February", "March",     "April",   "May",      "June",
                                 "July",    "August",   "September", "October", "November", "December"};
@@ -37,7 +37,7 @@ std::string_view month_name(const MonthNames& names, int month, std::string_view
 std::optional<std::string_view> name_of(char letter, const _SYSTEMTIME& fields) {
   switch (letter) {
     case 'A':
-      return day_name(kDays, fields.wDayOfWeek, "Unknown");
+      return day_name(kDayNames, fields.wDayOfWeek, "Unknown");
     case 'a':
       return day_name(kShortDays, fields.wDayOfWeek, kUnknownShort);
     case 'B':

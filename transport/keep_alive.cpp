@@ -9,7 +9,7 @@
 
 namespace {
 
-constexpr int kAnswerRoom = 1023;
+constexpr int kKeepAliveAnswerRoom = 1023;
 constexpr int kAnswerTimeout = 1000;  // milliseconds
 
 }  // namespace
@@ -26,8 +26,8 @@ void CVexaCommon::KeepAlive() {
   if (request.cut) Fail(vexa::kKeepAliveTooLong);
   const bool sent = SendRtsp(m_RtspSocket, request.text);
   std::puts(sent ? "successfully sending getparameter" : "error sending getparameter");
-  char answer[kAnswerRoom + 1];
-  if (rtp_over_tcp_header_recv(m_RtspSocket, answer, kAnswerRoom, kAnswerTimeout) < 0) {
+  char answer[kKeepAliveAnswerRoom + 1];
+  if (rtp_over_tcp_header_recv(m_RtspSocket, answer, kKeepAliveAnswerRoom, kAnswerTimeout) < 0) {
     std::puts("error receiving getparameter");
   }
 }

@@ -9,7 +9,7 @@
 
 namespace {
 
-struct Row {
+struct EnumeratorRow {
   const char* name;
   std::int64_t actual;
   std::int64_t expected;
@@ -18,7 +18,7 @@ struct Row {
 #define ROW(name, expected) \
   { #name, name, expected }
 
-constexpr Row kRows[] = {
+constexpr EnumeratorRow kEnumerators[] = {
     ROW(LIBD_OK, 1),
     ROW(LIBD_FAILED, 0),
     ROW(LIBD_NOT_SUPPORTED, -100),
@@ -82,7 +82,7 @@ constexpr Row kRows[] = {
 #undef ROW
 
 TEST(Enumerators, HaveTheNumbersHostsWereBuiltWith) {
-  for (const Row& row : kRows) EXPECT_EQ(row.actual, row.expected) << row.name;
+  for (const EnumeratorRow& row : kEnumerators) EXPECT_EQ(row.actual, row.expected) << row.name;
 }
 
 template <typename Enumeration>

@@ -47,12 +47,12 @@ class Recorder : public Device {
   std::string reached_;
 };
 
-struct Row {
+struct SlotRow {
   int slot;
   const char* operation;
 };
 
-constexpr Row kRows[] = {
+constexpr SlotRow kSlots[] = {
 #define OPERATION(slot, result, name, parameters, answer) {slot, #name #parameters},
 #include "operations.inc"
 #undef OPERATION
@@ -91,7 +91,7 @@ TYPED_TEST_SUITE(Slots, Devices);
 
 TYPED_TEST(Slots, EveryOperationIsReachedThroughItsPlace) {
   Recorder<TypeParam> device;
-  for (const Row& row : kRows) {
+  for (const SlotRow& row : kSlots) {
     call_slot(&device, row.slot);
     EXPECT_EQ(device.take_reached(), row.operation) << "slot " << row.slot;
   }
@@ -114,8 +114,8 @@ TYPED_TEST(Slots, TheFirstDestructorLeavesTheMemoryAndTheSecondReleasesIt) {
 }
 
 TEST(SlotTable, ListsEveryPlaceOnceAndInOrder) {
-  ASSERT_EQ(std::size(kRows), static_cast<std::size_t>(kOperations));
-  for (int i = 0; i < kOperations; ++i) EXPECT_EQ(kRows[i].slot, kFirstOperation + i);
+  ASSERT_EQ(std::size(kSlots), static_cast<std::size_t>(kOperations));
+  for (int i = 0; i < kOperations; ++i) EXPECT_EQ(kSlots[i].slot, kFirstOperation + i);
 }
 
 TEST(SlotTable, PointersToOperationsNameTheSamePlaces) {

@@ -35,13 +35,13 @@ void give_lists(SettingsDriver& driver, const char* mode) {
   driver.m_PTZControlInfo.brightMode = mode;
 }
 
-struct LevelRow {
+struct BrightRow {
   const char* mode;
   int level;
   const char* sent;
 };
 
-class BrightLevel : public testing::TestWithParam<LevelRow> {};
+class BrightLevel : public testing::TestWithParam<BrightRow> {};
 
 TEST_P(BrightLevel, IsSentAsItsShareOfTheListsLastValue) {
   Driver play({command(std::string("/command/camera.cgi?") + GetParam().sent)});
@@ -52,10 +52,10 @@ TEST_P(BrightLevel, IsSentAsItsShareOfTheListsLastValue) {
 
 INSTANTIATE_TEST_SUITE_P(
     Rows, BrightLevel,
-    testing::Values(LevelRow{"Shutter Priority", 5000, "Shutter=17"}, LevelRow{"Shutter Priority", 0, "Shutter=0"},
-                    LevelRow{"Shutter Priority", 10000, "Shutter=33"}, LevelRow{"Iris Priority", 5000, "Iris=3"},
-                    LevelRow{"Iris Priority", 0, "Iris=0"}, LevelRow{"Iris Priority", 4999, "Iris=2"},
-                    LevelRow{"Iris Priority", 10000, "Iris=5"}));
+    testing::Values(BrightRow{"Shutter Priority", 5000, "Shutter=17"}, BrightRow{"Shutter Priority", 0, "Shutter=0"},
+                    BrightRow{"Shutter Priority", 10000, "Shutter=33"}, BrightRow{"Iris Priority", 5000, "Iris=3"},
+                    BrightRow{"Iris Priority", 0, "Iris=0"}, BrightRow{"Iris Priority", 4999, "Iris=2"},
+                    BrightRow{"Iris Priority", 10000, "Iris=5"}));
 
 TEST(BrightAbsolute, TellsTheLatestErrorWhenItsRequestIsRefused) {
   Driver play({refusal("/command/camera.cgi?Iris=5")});

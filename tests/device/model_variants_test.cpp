@@ -194,7 +194,7 @@ TEST(SimpleHdAndSimplePtz, EndWithTheLatestErrorWhenTheOutputIsRefused) {
 
 // ---- GetVideoOutMode ----
 
-constexpr auto kUntouched = static_cast<ELibVideoOutMode>(77);
+constexpr auto kUntouchedMode = static_cast<ELibVideoOutMode>(77);
 
 struct Asked {
   int result;
@@ -204,7 +204,7 @@ struct Asked {
 
 template <typename Variant>
 Asked asked(Settings<Variant>& driver) {
-  ELibVideoOutMode mode = kUntouched;
+  ELibVideoOutMode mode = kUntouchedMode;
   const ELibDReturnCode result = driver.GetVideoOutMode(mode);
   return {result, mode};
 }

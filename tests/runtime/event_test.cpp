@@ -13,17 +13,14 @@
 #include <vector>
 
 #include "runtime/handle.h"
+#include "tests/runtime/event_owner.h"
 #include "tests/support/failing_new.h"
 #include "tests/support/process_state.h"
 
 namespace {
 
-struct CloseEvent {
-  void operator()(typedHandle* h) const { CloseEventHandle(h); }
-};
-using Event = std::unique_ptr<typedHandle, CloseEvent>;
-
-Event make_event() { return Event(CreateEvent(nullptr, 1, 0, nullptr)); }
+using vexa_test::Event;
+using vexa_test::make_event;
 
 vexa::EventHandle& record(const Event& event) { return *vexa::record_of<vexa::EventHandle>(event.get()); }
 

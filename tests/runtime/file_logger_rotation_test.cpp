@@ -3,8 +3,10 @@
 #include <unistd.h>
 
 #include <string>
+#include <utility>
 #include <vector>
 
+#include "runtime/handle.h"
 #include "tests/support/in_child.h"
 #include "tests/support/log_text.h"
 #include "tests/support/temporary_folder.h"
@@ -15,9 +17,12 @@ namespace {
 using vexa_test::closing_banner;
 using vexa_test::contents_of;
 using vexa_test::in_child;
+using vexa_test::is_there;
+using vexa_test::log_text;
 using vexa_test::opening_banner;
 using vexa_test::stderr_of;
 using vexa_test::TemporaryFolder;
+using vexa_test::text_up_to;
 using vexa_test::without_times;
 
 class RotatingLogger : public CFileLogger {
@@ -30,6 +35,7 @@ class RotatingLogger : public CFileLogger {
   }
 
   using CFileLogger::CycleCloseFile;
+  using CFileLogger::CycleFiles;
   using CFileLogger::CycleOpenFile;
   using CFileLogger::m_FileId;
   using CFileLogger::m_FileInfoList;
@@ -37,15 +43,8 @@ class RotatingLogger : public CFileLogger {
   const FileInfo& entry() const { return m_FileInfoList.at(m_FileId); }
 };
 
-std::string log_text(const std::string& path) { return without_times(contents_of(path)); }
-
-bool is_there(const std::string& path) { return access(path.c_str(), F_OK) == 0; }
-
 /// A file that was rotated away after one text.
 std::string ended(const std::string& text) { return opening_banner() + text + closing_banner(); }
-
-/// Text that makes a new file `size` bytes large, together with the opening banner before it.
-std::string text_up_to(std::size_t size) { return std::string(size - opening_banner().size(), 'x'); }
 
 TEST(FileLoggerRotation, ComesAtExactlyTheLimit) {
   const struct {
@@ -220,6 +219,17 @@ TEST(FileLoggerRotation, AfterAFailedReopeningNothingIsWrittenUntilAllHaveLeft) 
   second.CloseFile();
   first.OpenFile();
   EXPECT_EQ(log_text(path), opening_banner());
+}
+
+TEST(FileLoggerRotation, AFailedSizeQuerySkipsIt) {
+  const TemporaryFolder folder;
+  RotatingLogger logger(folder / "Log.txt", 0, 1);
+  auto* file = vexa::record_of<vexa::FileHandle>(logger.entry().fileHandle);
+  const int descriptor = std::exchange(file->fd, -1);
+  EXPECT_EQ(stderr_of([&] { logger.CycleFiles(); }), "GetFileSize fstat: Bad file descriptor\n");
+  file->fd = descriptor;
+  EXPECT_FALSE(is_there(folder / "Log1.txt"));
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner());
 }
 
 TEST(FileLoggerRotation, OpeningAFileThatIsOpenKeepsIt) {

@@ -7,6 +7,7 @@
 #include <unistd.h>
 
 #include <csignal>
+#include <cstddef>
 #include <cstdlib>
 #include <map>
 #include <string>
@@ -25,9 +26,12 @@ using vexa_test::become_unprivileged;
 using vexa_test::closing_banner;
 using vexa_test::contents_of;
 using vexa_test::in_child;
+using vexa_test::is_there;
+using vexa_test::log_text;
 using vexa_test::opening_banner;
 using vexa_test::stderr_of;
 using vexa_test::TemporaryFolder;
+using vexa_test::text_up_to;
 using vexa_test::without_times;
 
 /// A logger whose inside is open.
@@ -61,13 +65,6 @@ class OpenLogger : public CFileLogger {
 // Its destructor runs after those of nearly all other statics.
 OpenLogger early_logger __attribute__((init_priority(102)));
 
-std::string log_text(const std::string& path) { return without_times(contents_of(path)); }
-
-bool is_there(const std::string& path) { return access(path.c_str(), F_OK) == 0; }
-
-/// Text that makes a new file `size` bytes large, together with the opening banner before it.
-std::string text_up_to(std::size_t size) { return std::string(size - opening_banner().size(), 'x'); }
-
 TEST(FileLogger, BeginsClosedWithItsDefaults) {
   const OpenLogger logger;
   EXPECT_EQ(logger.m_FileName, "Log.txt");
@@ -83,6 +80,33 @@ TEST(FileLogger, HasItsStaticsUnderTheirNamesAndTypes) {
                 "list");
   static_assert(std::is_same<std::remove_reference_t<decltype(OpenLogger::m_FileListLock)>, CSimpleLock>::value,
                 "lock");
+}
+
+TEST(FileLogger, HasItsMembersFirstAndInOrder) {
+  const OpenLogger logger;
+  const auto* begin = reinterpret_cast<const char*>(static_cast<const CFileLogger*>(&logger));
+  const auto place = [begin](const void* member) {
+    return static_cast<std::size_t>(static_cast<const char*>(member) - begin);
+  };
+  const std::size_t after_name = sizeof(void*) + sizeof(std::string);
+  EXPECT_EQ(place(&logger.m_FileName), sizeof(void*));
+  EXPECT_EQ(place(&logger.m_MaxSize), after_name);
+  EXPECT_EQ(place(&logger.m_CopyCount), after_name + sizeof(int));
+  EXPECT_EQ(place(&logger.m_FileId), after_name + 2 * sizeof(int));
+  EXPECT_LT(offsetof(CFileLogger::FileInfo, fileName), offsetof(CFileLogger::FileInfo, fileHandle));
+  EXPECT_LT(offsetof(CFileLogger::FileInfo, fileHandle), offsetof(CFileLogger::FileInfo, referenceCount));
+}
+
+TEST(FileLogger, SetFileNameIsTheSlotBehindTheDestructors) {
+  struct Renamed : CFileLogger {
+    void SetFileName(const char* name) override { given = name; }
+    std::string given;
+  };
+  Renamed logger;
+  CFileLogger* base = &logger;
+  void* const* slots = *reinterpret_cast<void***>(base);
+  reinterpret_cast<void (*)(CFileLogger*, const char*)>(slots[2])(base, "the third slot");
+  EXPECT_EQ(logger.given, "the third slot");
 }
 
 TEST(FileLogger, AnEmptyOrNullNameKeepsThePreviousOne) {

@@ -14,10 +14,9 @@ namespace {
 using vexa_test::become_unprivileged;
 using vexa_test::contents_of;
 using vexa_test::in_child;
+using vexa_test::is_there;
 using vexa_test::stderr_of;
 using vexa_test::TemporaryFolder;
-
-bool is_there(const std::string& path) { return access(path.c_str(), F_OK) == 0; }
 
 TEST(CreateDirectory, MakesADirectoryOfMode0755) {
   const TemporaryFolder folder;

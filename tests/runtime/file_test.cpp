@@ -25,7 +25,7 @@ using vexa_test::stderr_of;
 using vexa_test::TemporaryFolder;
 
 constexpr char kInvalidHandle[] = "checkFileHandle : called with invalid handle\n";
-constexpr std::uint32_t kFailed = 0xFFFFFFFF;
+constexpr std::uint32_t kNoSize = 0xFFFFFFFF;
 
 typedHandle* open_file(const std::string& path, unsigned long access, unsigned long creation) {
   return CreateFile(path.c_str(), access, 0, nullptr, creation, 0, nullptr);
@@ -191,8 +191,8 @@ TEST(File, HandlesThatAreNoFilesAreRefusedBeforeAnythingIsSet) {
     unsigned long count = 42;
     long high = 42;
     char byte = '#';
-    EXPECT_EQ(stderr_of([&] { EXPECT_EQ(GetFileSize(h, &count), kFailed); }), kInvalidHandle);
-    EXPECT_EQ(stderr_of([&] { EXPECT_EQ(SetFilePointer(h, 0, &high, 0), kFailed); }), kInvalidHandle);
+    EXPECT_EQ(stderr_of([&] { EXPECT_EQ(GetFileSize(h, &count), kNoSize); }), kInvalidHandle);
+    EXPECT_EQ(stderr_of([&] { EXPECT_EQ(SetFilePointer(h, 0, &high, 0), kNoSize); }), kInvalidHandle);
     EXPECT_EQ(stderr_of([&] { EXPECT_EQ(FlushFileBuffers(h), 0); }), kInvalidHandle);
     EXPECT_EQ(stderr_of([&] { EXPECT_EQ(WriteFile(h, &byte, 1, &count, &overlapped), 0); }), kInvalidHandle);
     EXPECT_EQ(stderr_of([&] { EXPECT_EQ(ReadFile(h, &byte, 1, &count, &overlapped), 0); }), kInvalidHandle);
@@ -229,7 +229,7 @@ TEST(GetFileSize, CutsALargeSizeToItsLowHalf) {
 TEST(GetFileSize, TellsItsFailure) {
   const BrokenFile broken;
   unsigned long high = 42;
-  EXPECT_EQ(stderr_of([&] { EXPECT_EQ(GetFileSize(broken.handle(), &high), kFailed); }),
+  EXPECT_EQ(stderr_of([&] { EXPECT_EQ(GetFileSize(broken.handle(), &high), kNoSize); }),
             "GetFileSize fstat: Bad file descriptor\n");
   EXPECT_EQ(high, 42UL);
 }
@@ -252,7 +252,7 @@ TEST(SetFilePointer, CountsFromWhereItIsTold) {
 TEST(SetFilePointer, RefusesAHighHalf) {
   typedHandle* file = open_file("/dev/null", 1, OPEN_EXISTING);
   long high = 0;
-  EXPECT_EQ(stderr_of([&] { EXPECT_EQ(SetFilePointer(file, 0, &high, FILE_BEGIN), kFailed); }),
+  EXPECT_EQ(stderr_of([&] { EXPECT_EQ(SetFilePointer(file, 0, &high, FILE_BEGIN), kNoSize); }),
             "SetFilePointer : no support for 64 bit positions\n");
   EXPECT_EQ(CloseHandle(file), 1);
 }
@@ -260,9 +260,9 @@ TEST(SetFilePointer, RefusesAHighHalf) {
 TEST(SetFilePointer, TellsItsFailure) {
   const TemporaryFolder folder;
   typedHandle* file = open_file(folder.make_file("file"), 1, OPEN_EXISTING);
-  EXPECT_EQ(stderr_of([&] { EXPECT_EQ(SetFilePointer(file, -1, nullptr, FILE_BEGIN), kFailed); }),
+  EXPECT_EQ(stderr_of([&] { EXPECT_EQ(SetFilePointer(file, -1, nullptr, FILE_BEGIN), kNoSize); }),
             "SetFilePointer fseek: Invalid argument\n");
-  EXPECT_EQ(stderr_of([&] { EXPECT_EQ(SetFilePointer(file, 0, nullptr, 99), kFailed); }),
+  EXPECT_EQ(stderr_of([&] { EXPECT_EQ(SetFilePointer(file, 0, nullptr, 99), kNoSize); }),
             "SetFilePointer fseek: Invalid argument\n");
   EXPECT_EQ(CloseHandle(file), 1);
 }

@@ -6,20 +6,15 @@
 #include <array>
 
 #include "tests/runtime/in_zone.h"
+#include "tests/runtime/ticks.h"
 
 namespace vexa {
 namespace {
 
 using test::InZone;
 using test::kWideTime;
-
-std::uint64_t ticks_at(std::int64_t unix_seconds, std::uint64_t more = 0) {
-  return static_cast<std::uint64_t>(unix_seconds + 11644473600) * 10000000 + more;
-}
-
-std::array<int, 8> listed(const _SYSTEMTIME& f) {
-  return {f.wYear, f.wMonth, f.wDayOfWeek, f.wDay, f.wHour, f.wMinute, f.wSecond, f.wMilliseconds};
-}
+using test::listed;
+using test::ticks_at;
 
 std::uint64_t to_local(std::uint64_t ticks) {
   const _FILETIME utc = file_time_of(ticks);

@@ -4,6 +4,7 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <cstddef>
 #include <cstring>
 #include <string>
 #include <vector>
@@ -22,7 +23,7 @@ using vexa_test::in_child;
 using vexa_test::stderr_of;
 using vexa_test::TemporaryFolder;
 
-constexpr char kInvalidHandle[] = "checkFindFirstFileHandle : called with invalid handle\n";
+constexpr char kInvalidFindHandle[] = "checkFindFirstFileHandle : called with invalid handle\n";
 
 _WIN32_FIND_DATA marked_data() {
   _WIN32_FIND_DATA data;
@@ -57,6 +58,20 @@ TEST(FindFirstFile, DescribesAFile) {
   EXPECT_STREQ(data.cFileName, "picture.jpg");
   EXPECT_STREQ(data.cAlternateFileName, "xxxxxxxx.xxx");
   EXPECT_EQ(FindClose(search), 1);
+}
+
+TEST(FindFile, DataIsLaidOutAsHostsReadIt) {
+  EXPECT_EQ(offsetof(_WIN32_FIND_DATA, dwFileAttributes), 0U);
+  EXPECT_EQ(offsetof(_WIN32_FIND_DATA, ftCreationTime), 4U);
+  EXPECT_EQ(offsetof(_WIN32_FIND_DATA, ftLastAccessTime), 12U);
+  EXPECT_EQ(offsetof(_WIN32_FIND_DATA, ftLastWriteTime), 20U);
+  EXPECT_EQ(offsetof(_WIN32_FIND_DATA, nFileSizeHigh), 28U);
+  EXPECT_EQ(offsetof(_WIN32_FIND_DATA, nFileSizeLow), 32U);
+  EXPECT_EQ(offsetof(_WIN32_FIND_DATA, dwReserved0), 36U);
+  EXPECT_EQ(offsetof(_WIN32_FIND_DATA, dwReserved1), 40U);
+  EXPECT_EQ(offsetof(_WIN32_FIND_DATA, cFileName), 44U);
+  EXPECT_EQ(offsetof(_WIN32_FIND_DATA, cAlternateFileName), 4140U);
+  EXPECT_EQ(sizeof(_WIN32_FIND_DATA::cAlternateFileName), 14U);
 }
 
 TEST(FindFirstFile, LeavesTheReservedWords) {
@@ -213,9 +228,9 @@ TEST(FindFile, RefusesNullAndOtherKinds) {
   typedHandle* file = CreateFile("/dev/null", GENERIC_READ, 0, nullptr, OPEN_EXISTING, 0, nullptr);
   for (typedHandle* handle : {static_cast<typedHandle*>(nullptr), event, file}) {
     _WIN32_FIND_DATA data = marked_data();
-    EXPECT_EQ(stderr_of([&] { EXPECT_EQ(FindNextFile(handle, &data), 0); }), kInvalidHandle);
+    EXPECT_EQ(stderr_of([&] { EXPECT_EQ(FindNextFile(handle, &data), 0); }), kInvalidFindHandle);
     EXPECT_TRUE(untouched(data));
-    EXPECT_EQ(stderr_of([&] { EXPECT_EQ(FindClose(handle), 0); }), kInvalidHandle);
+    EXPECT_EQ(stderr_of([&] { EXPECT_EQ(FindClose(handle), 0); }), kInvalidFindHandle);
   }
   EXPECT_EQ(CloseHandle(event), 1);
   EXPECT_EQ(CloseHandle(file), 1);

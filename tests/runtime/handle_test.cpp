@@ -10,6 +10,7 @@
 #include <type_traits>
 
 #include "runtime/debug_output.h"
+#include "tests/runtime/thread_routines.h"
 #include "tests/support/process_state.h"
 
 namespace {
@@ -17,17 +18,12 @@ namespace {
 using testing::internal::CaptureStderr;
 using testing::internal::GetCapturedStderr;
 
-constexpr char kInvalidHandle[] = "checkFileHandle : called with invalid handle\n";
+constexpr char kInvalidFileHandle[] = "checkFileHandle : called with invalid handle\n";
 
 vexa::FileHandle* open_null_device() {
   auto* file = vexa::new_record<vexa::FileHandle>();
   file->fd = open("/dev/null", O_RDWR | O_CLOEXEC);
   return file;
-}
-
-unsigned int store_identifier(void* argument) {
-  *static_cast<std::atomic<long>*>(argument) = vexa_test::kernel_thread_id();
-  return 0;
 }
 
 TEST(Handle, KindsHaveTheirNumbers) {
@@ -87,7 +83,7 @@ TEST(CloseHandle, ClosesAFile) {
 
 TEST(CloseHandle, ClosesAThread) {
   std::atomic<long> id{0};
-  typedHandle* thread = _beginthreadex(nullptr, 0, store_identifier, &id, 0, nullptr);
+  typedHandle* thread = _beginthreadex(nullptr, 0, vexa_test::store_identifier, &id, 0, nullptr);
   ASSERT_NE(thread, nullptr);
   EXPECT_EQ(CloseHandle(thread), 1);
   EXPECT_TRUE(vexa_test::eventually([&id] { return id != 0 && !vexa_test::is_running(id); }));
@@ -96,7 +92,7 @@ TEST(CloseHandle, ClosesAThread) {
 TEST(CloseFileHandle, RefusesNullWithALine) {
   CaptureStderr();
   EXPECT_EQ(CloseFileHandle(nullptr), 0);
-  EXPECT_EQ(GetCapturedStderr(), kInvalidHandle);
+  EXPECT_EQ(GetCapturedStderr(), kInvalidFileHandle);
 }
 
 TEST(CloseFileHandle, RefusesAnotherKindWithALineAndLeavesItOpen) {
@@ -104,7 +100,7 @@ TEST(CloseFileHandle, RefusesAnotherKindWithALineAndLeavesItOpen) {
   ASSERT_NE(event, nullptr);
   CaptureStderr();
   EXPECT_EQ(CloseFileHandle(event), 0);
-  EXPECT_EQ(GetCapturedStderr(), kInvalidHandle);
+  EXPECT_EQ(GetCapturedStderr(), kInvalidFileHandle);
   EXPECT_EQ(SetEvent(event), 1);
   EXPECT_EQ(CloseEventHandle(event), 1);
 }

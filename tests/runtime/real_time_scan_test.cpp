@@ -5,14 +5,14 @@
 
 #include "runtime/file_time.h"
 #include "tests/runtime/in_zone.h"
+#include "tests/runtime/ticks.h"
 #include "vexa/real_time.h"
 
 namespace vexa {
 namespace {
 
 using test::InZone;
-
-std::uint64_t ticks_in(const CRealTime& time) { return ticks_of(time.GetUtcFileTime()); }
+using test::ticks_in;
 
 const CRealTime kBefore(2001, 2, 3, 4, 5, 6, 7, 0, true);
 

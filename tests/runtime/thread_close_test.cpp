@@ -208,11 +208,6 @@ TEST(CleanupThread, AnotherMakersThreadLeavesAnEntryThatTheNextOwnerReplaces) {
   }
 }
 
-unsigned int store_identifier(void* argument) {
-  *static_cast<std::atomic<long>*>(argument) = vexa_test::kernel_thread_id();
-  return 0;
-}
-
 // Starts and closes threads in both ways; returns the number of things that went wrong.
 int start_and_close_many(unsigned int seed) {
   int wrong = 0;
@@ -220,7 +215,7 @@ int start_and_close_many(unsigned int seed) {
     unsigned int result = seed * 1000 + i;
     std::atomic<long> id{0};
     typedHandle* finished = start(return_argument, &result);
-    typedHandle* running = start(store_identifier, &id);
+    typedHandle* running = start(vexa_test::store_identifier, &id);
     if (finished == nullptr || running == nullptr) return wrong + 1;
     wrong += CloseThreadHandle(running) == 1 ? 0 : 1;
     wrong += finishes(finished) && exit_code(finished) == result ? 0 : 1;

@@ -30,6 +30,11 @@ inline unsigned int return_argument(void* argument) { return *static_cast<unsign
 
 inline unsigned int return_nothing(void*) { return 0; }
 
+inline unsigned int store_identifier(void* argument) {
+  *static_cast<std::atomic<long>*>(argument) = kernel_thread_id();
+  return 0;
+}
+
 // Ends once `release` is set.
 struct Gate {
   std::atomic<long> entered{0};  // the thread behind it

@@ -11,6 +11,7 @@
 #include <vector>
 
 #include "runtime/handle.h"
+#include "tests/runtime/event_owner.h"
 #include "tests/support/failing_new.h"
 #include "tests/support/process_state.h"
 
@@ -19,12 +20,8 @@ namespace {
 using Clock = std::chrono::steady_clock;
 using vexa_test::eventually;
 
-struct CloseEvent {
-  void operator()(typedHandle* h) const { CloseEventHandle(h); }
-};
-using Event = std::unique_ptr<typedHandle, CloseEvent>;
-
-Event make_event() { return Event(CreateEvent(nullptr, 1, 0, nullptr)); }
+using vexa_test::Event;
+using vexa_test::make_event;
 
 Event make_signalled_event() {
   Event event = make_event();

@@ -4,6 +4,8 @@
 #include <cstddef>
 #include <string>
 
+#include "tests/support/temporary_folder.h"
+
 namespace vexa_test {
 
 inline std::string banner_rule() { return std::string(103, '-'); }
@@ -24,5 +26,11 @@ inline std::string without_times(std::string text) {
   }
   return text;
 }
+
+/// What the log file at `path` holds, without its times.
+inline std::string log_text(const std::string& path) { return without_times(contents_of(path)); }
+
+/// Text that makes a new file `size` bytes large, together with the opening banner before it.
+inline std::string text_up_to(std::size_t size) { return std::string(size - opening_banner().size(), 'x'); }
 
 }  // namespace vexa_test

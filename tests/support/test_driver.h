@@ -26,6 +26,9 @@ class TestDriver : public CVexaCommon {
     m_CameraInfo.rtspPort = port;
   }
 
+  /// The latest error as tests compare it: "CODE TEXT".
+  std::string latest_error() { return std::to_string(LatestErrorCode()) + " " + LatestErrorText(); }
+
   /// The latest error as it stands from a failure long before, so that a test sees what a call sets.
   void soil_latest_error() { Fail({LIBD_INVALID_MODE, "from before"}); }
 

@@ -33,10 +33,6 @@ ScriptStep step(const std::string& path, const std::string& answer, Then then = 
 }
 
 /// What the latest error says, as "code text".
-std::string latest_error(TestDriver& driver) {
-  return std::to_string(driver.LatestErrorCode()) + " " + driver.LatestErrorText();
-}
-
 class HttpOpen : public testing::Test {
  protected:
   HttpOpen() { driver_.soil_latest_error(); }
@@ -140,7 +136,7 @@ TEST_F(HttpOpen, RefusesALongerRequestAfterConnectingWithNothingSent) {
     ScriptedCamera proxy({nothing});
     driver_.soil_latest_error();
     EXPECT_EQ(open_through(proxy, std::string(length - get_request("camera.example:8080", "").size(), 'p')), -1);
-    EXPECT_EQ(latest_error(driver_), "0 URL too long");
+    EXPECT_EQ(driver_.latest_error(), "0 URL too long");
     EXPECT_TRUE(eventually([&] { return proxy.played(); }));
     EXPECT_EQ(proxy.finish(), "");
     EXPECT_EQ(open_descriptors(), descriptors_);
@@ -150,7 +146,7 @@ TEST_F(HttpOpen, RefusesALongerRequestAfterConnectingWithNothingSent) {
 TEST_F(HttpOpen, TellsThatTheConnectionWasRefused) {
   driver_.use(own_loopback_address(), refusing_port(), 5000);
   EXPECT_EQ(driver_.http_open("/x"), -1);
-  EXPECT_EQ(latest_error(driver_), "0 Connection refused");
+  EXPECT_EQ(driver_.latest_error(), "0 Connection refused");
   EXPECT_EQ(open_descriptors(), descriptors_);
 }
 
@@ -159,17 +155,17 @@ TEST_F(HttpOpen, TellsThatTheConnectionTimedOut) {
   const std::size_t descriptors = open_descriptors();
   driver_.use(camera.host(), camera.port(), 30);
   EXPECT_EQ(driver_.http_open("/x"), -1);
-  EXPECT_EQ(latest_error(driver_), "-200 Connection timed out");
+  EXPECT_EQ(driver_.latest_error(), "-200 Connection timed out");
   EXPECT_EQ(open_descriptors(), descriptors);
 }
 
 TEST_F(HttpOpen, ShowsTheResolversNumberAsASystemError) {
   driver_.use("256.256.256.256", 80, 5000);
   EXPECT_EQ(driver_.http_open("/x"), -1);
-  EXPECT_EQ(latest_error(driver_), "0 Operation not permitted");
+  EXPECT_EQ(driver_.latest_error(), "0 Operation not permitted");
   driver_.use(std::string(1100, '0') + "177.1", 80, 5000);
   EXPECT_EQ(driver_.http_open("/x"), -1);
-  EXPECT_EQ(latest_error(driver_), "0 Unknown error -1");
+  EXPECT_EQ(driver_.latest_error(), "0 Unknown error -1");
   EXPECT_EQ(open_descriptors(), descriptors_);
 }
 
@@ -180,7 +176,7 @@ TEST_F(HttpOpen, TellsThatThereIsNoDescriptorLeft) {
               const rlimit none{0, 0};
               if (setrlimit(RLIMIT_NOFILE, &none) != 0) return std::string("no limit");
               const int socket = driver.http_open("/x");
-              return std::to_string(socket) + " " + latest_error(driver);
+              return std::to_string(socket) + " " + driver.latest_error();
             }),
             "-1 0 Too many open files");
 }
@@ -231,7 +227,7 @@ TEST_F(HttpOpen, FailsOnEveryCutHeaderWithoutALeak) {
     ScriptedCamera camera({step("/x", answer.substr(0, length))});
     driver_.soil_latest_error();
     EXPECT_EQ(open(camera, "/x", 10), -1) << length;
-    EXPECT_EQ(latest_error(driver_), "0 from before") << length;
+    EXPECT_EQ(driver_.latest_error(), "0 from before") << length;
     EXPECT_EQ(camera.finish(), "");
   }
   EXPECT_EQ(open_descriptors(), descriptors_);
@@ -245,7 +241,7 @@ TEST_F(HttpOpen, ReadsAnAnswerSplitAnywhere) {
     split.pause = 1;
     ScriptedCamera camera({split});
     EXPECT_EQ(open(camera, "/x"), -1);
-    EXPECT_EQ(latest_error(driver_), "-201 No") << piece;
+    EXPECT_EQ(driver_.latest_error(), "-201 No") << piece;
     EXPECT_EQ(camera.finish(), "");
   }
 }
@@ -312,7 +308,7 @@ TEST(SendCommand, GivesTheLatestErrorsCode) {
   driver.soil_latest_error();
   driver.use(own_loopback_address(), refusing_port(), 5000);
   EXPECT_EQ(driver.SendCommand("/command/x.cgi?a=%d", 1), LIBD_FAILED);
-  EXPECT_EQ(latest_error(driver), "0 Connection refused");
+  EXPECT_EQ(driver.latest_error(), "0 Connection refused");
 }
 
 }  // namespace

@@ -20,10 +20,6 @@ namespace {
 /// The requests and answers of a session that opens.
 Script live_session() { return read_exchange(VEXA_TEST_DATA "/exchanges/rtsp/live_session.txt").script; }
 
-std::string latest_error(TestDriver& driver) {
-  return std::to_string(driver.LatestErrorCode()) + " " + driver.LatestErrorText();
-}
-
 class RtspSession : public testing::Test {
  protected:
   RtspSession() { driver_.soil_latest_error(); }
@@ -158,7 +154,7 @@ TEST_F(RtspSession, LeavesTheMediaSocketOpenWhenTheOpenFails) {
   driver_.use(own_loopback_address(), refusing_port(), 1000);
   open("rtsp://camera/");
   EXPECT_EQ(driver_.m_RtspSocket, -1);
-  EXPECT_EQ(latest_error(driver_), "0 Connection refused");
+  EXPECT_EQ(driver_.latest_error(), "0 Connection refused");
   EXPECT_NE(driver_.m_StreamSocket, -1);
   EXPECT_EQ(open_descriptors(), descriptors_ + 1);
 }
@@ -169,7 +165,7 @@ TEST_F(RtspSession, TellsThatTheConnectionTimedOut) {
   driver_.use(camera.host(), camera.port(), 30);
   EXPECT_EQ(open("rtsp://camera/"), "");
   EXPECT_EQ(driver_.m_RtspSocket, -1);
-  EXPECT_EQ(latest_error(driver_), "-200 Connection timed out");
+  EXPECT_EQ(driver_.latest_error(), "-200 Connection timed out");
   EXPECT_EQ(open_descriptors(), descriptors + 1);
 }
 
@@ -178,7 +174,7 @@ TEST_F(RtspSession, OpensNoSocketForAHostThatIsNotFound) {
   open("rtsp://camera/");
   EXPECT_EQ(driver_.m_RtspSocket, -1);
   EXPECT_EQ(driver_.m_StreamSocket, -1);
-  EXPECT_EQ(latest_error(driver_), "0 Operation not permitted");
+  EXPECT_EQ(driver_.latest_error(), "0 Operation not permitted");
 }
 
 TEST_F(RtspSession, TellsThatThereIsNoDescriptorLeft) {
@@ -193,7 +189,7 @@ TEST_F(RtspSession, TellsThatThereIsNoDescriptorLeft) {
                 if (setrlimit(RLIMIT_NOFILE, &limit) != 0) return std::string("no limit");
                 const int socket = driver.rtp_over_udp_open("rtsp://camera/");
                 return std::to_string(socket) + " " + std::to_string(driver.m_StreamSocket) + " " +
-                       latest_error(driver);
+                       driver.latest_error();
               }),
               "-1 -1 0 Too many open files")
         << spare;
@@ -248,7 +244,7 @@ TEST_F(RtspSession, RefusesEachRequestAbove1023Characters) {
     driver_.soil_latest_error();
     open(url);
     EXPECT_EQ(driver_.m_RtspSocket != -1, c.requests == 3) << c.url;
-    EXPECT_EQ(latest_error(driver_), c.requests == 3 ? "0 from before" : "0 URL too long") << c.url;
+    EXPECT_EQ(driver_.latest_error(), c.requests == 3 ? "0 from before" : "0 URL too long") << c.url;
     EXPECT_EQ(driver_.m_RtspCSeq, std::min<int>(static_cast<int>(c.requests) + 1, 3));
     driver_.rtp_stream_socket_close_all();
     EXPECT_TRUE(eventually([&] { return camera.played(); }));
@@ -292,7 +288,7 @@ TEST_F(RtspClose, SendsATooLongTeardownCut) {
   const std::string cut = ("TEARDOWN " + driver_.m_RtspUrl).substr(0, 1023);
   EXPECT_EQ(close(), "send <" + cut + ">\n");
   EXPECT_EQ(heard(), cut);
-  EXPECT_EQ(latest_error(driver_), "0 URL too long");
+  EXPECT_EQ(driver_.latest_error(), "0 URL too long");
   EXPECT_EQ(driver_.m_RtspSocket, -1);
 }
 
@@ -317,7 +313,7 @@ TEST_F(RtspClose, WithoutAControlSocketFailsAtOnceAndClosesTheMediaSocket) {
   driver_.rtp_stream_socket_close_all();
   ASSERT_NE(driver_.BindMediaSocket(), -1);
   EXPECT_EQ(close(), "send <TEARDOWN rtsp://camera/ RTSP/1.0\r\nCSeq: 4\r\nSession: 7\r\n\r\n\r\n>\n");
-  EXPECT_EQ(latest_error(driver_), "0 Bad file descriptor");
+  EXPECT_EQ(driver_.latest_error(), "0 Bad file descriptor");
   EXPECT_EQ(driver_.m_StreamSocket, -1);
 }
 

@@ -131,6 +131,7 @@ struct RtspRequests {
     return fmt::format("TEARDOWN {} RTSP/1.0\r\nCSeq: {}\r\nSession: {}\r\n\r\n\r\n", url, sequence, session);
   }
 };
+inline const RtspRequests kAsk;
 
 }  // namespace vexa::camera
 

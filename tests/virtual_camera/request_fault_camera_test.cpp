@@ -14,7 +14,6 @@ namespace {
 
 using std::chrono::milliseconds;
 
-const RtspRequests kAsk;
 const std::string kInquiry = http_get("/command/inquiry.cgi?inq=own");
 const std::string kInquiryAnswer = "HTTP/1.0 200 OK\r\nContent-Type: text/plain\r\nContent-Length: 3\r\n\r\nA=1";
 const std::string kOptions = "OPTIONS * RTSP/1.0\r\nCSeq: 1\r\n\r\n";

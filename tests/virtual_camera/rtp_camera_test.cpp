@@ -19,8 +19,6 @@ namespace {
 using Buffer = std::vector<std::uint8_t>;
 using std::chrono::milliseconds;
 
-const RtspRequests kAsk;
-
 CameraOptions streaming_options(const std::string& clip) {
   CameraOptions options = test_options();
   options.clip_path = std::string(VEXA_CLIPS) + "/" + clip + ".h264";

@@ -13,8 +13,6 @@ namespace {
 
 using std::chrono::milliseconds;
 
-const RtspRequests kAsk;
-
 // The number behind "server_port=".
 std::string server_ports(const std::string& answer) {
   const std::size_t begin = answer.find("server_port=") + 12;

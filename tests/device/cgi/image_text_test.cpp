@@ -107,29 +107,30 @@ TEST(ExposureEntry, IsTheFirstOfItsName) {
   EXPECT_EQ(vexa::exposure_entry({}, "Full auto"), -1);
 }
 
-struct LevelRow {
+struct ExposureRow {
   int level;
   int largest;
   int value;
 };
 
-class ExposureValue : public testing::TestWithParam<LevelRow> {};
+class ExposureValue : public testing::TestWithParam<ExposureRow> {};
 
 TEST_P(ExposureValue, IsTheLevelsShareOfTheLargest) {
   EXPECT_EQ(vexa::exposure_value(GetParam().level, GetParam().largest), GetParam().value);
 }
 
 INSTANTIATE_TEST_SUITE_P(Rounding, ExposureValue,
-                         testing::Values(LevelRow{5000, 33, 17}, LevelRow{0, 33, 0}, LevelRow{10000, 33, 33},
-                                         LevelRow{1, 33, 0}, LevelRow{9999, 33, 33}, LevelRow{5000, 1, 1},
-                                         LevelRow{4999, 1, 0}, LevelRow{1499, 10, 1}, LevelRow{1500, 10, 2},
-                                         LevelRow{3333, 3, 1}, LevelRow{10000, 10000, 10000}));
+                         testing::Values(ExposureRow{5000, 33, 17}, ExposureRow{0, 33, 0}, ExposureRow{10000, 33, 33},
+                                         ExposureRow{1, 33, 0}, ExposureRow{9999, 33, 33}, ExposureRow{5000, 1, 1},
+                                         ExposureRow{4999, 1, 0}, ExposureRow{1499, 10, 1}, ExposureRow{1500, 10, 2},
+                                         ExposureRow{3333, 3, 1}, ExposureRow{10000, 10000, 10000}));
 
 INSTANTIATE_TEST_SUITE_P(Limits, ExposureValue,
-                         testing::Values(LevelRow{10000, 10001, 10000}, LevelRow{10000, INT_MAX, 10000},
-                                         LevelRow{1, INT_MAX, 10000}, LevelRow{10000, 0, 0}, LevelRow{10000, -5, 0},
-                                         LevelRow{10000, INT_MIN, 0}, LevelRow{-1, 33, 0}, LevelRow{10001, 33, 33},
-                                         LevelRow{INT_MAX, 33, 33}, LevelRow{INT_MIN, 33, 0}));
+                         testing::Values(ExposureRow{10000, 10001, 10000}, ExposureRow{10000, INT_MAX, 10000},
+                                         ExposureRow{1, INT_MAX, 10000}, ExposureRow{10000, 0, 0},
+                                         ExposureRow{10000, -5, 0}, ExposureRow{10000, INT_MIN, 0},
+                                         ExposureRow{-1, 33, 0}, ExposureRow{10001, 33, 33},
+                                         ExposureRow{INT_MAX, 33, 33}, ExposureRow{INT_MIN, 33, 0}));
 
 TEST(ExposureStep, TakesTheNeighbourWhateverItsSize) {
   const vexa::ExposureSteps steps{{"1/50", 4}, {"1/100", 9}, {"1/250", 11}};
