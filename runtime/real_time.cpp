@@ -33,17 +33,13 @@ std::optional<std::uint64_t> utc_to_local(std::uint64_t ticks) {
   return ticks_of(local);
 }
 
-/// The UTC ticks of a reading of the clock, UTC or local; 0, unset, for none.
-std::uint64_t ticks_of_reading(std::optional<std::uint64_t> reading, bool utc) {
+/// The UTC ticks of a reading of the clock, UTC or local, with `more` added; 0, unset, when they cannot be counted.
+std::uint64_t ticks_of_reading(std::optional<std::uint64_t> reading, bool utc, std::int64_t more = 0) {
   if (reading && !utc) reading = local_to_utc(*reading);
-  return reading.value_or(0);
-}
-
-/// The sum; 0, unset, when it cannot be counted.
-std::uint64_t added(std::uint64_t ticks, std::int64_t more) {
-  const std::uint64_t sum = ticks + static_cast<std::uint64_t>(more);
+  if (!reading) return 0;
+  const std::uint64_t sum = *reading + static_cast<std::uint64_t>(more);
   // Safe: a count that leaves its 64 bits would come back at the other end.
-  const bool wrapped = more < 0 ? sum > ticks : sum < ticks;
+  const bool wrapped = more < 0 ? sum > *reading : sum < *reading;
   return wrapped ? 0 : sum;
 }
 
@@ -129,15 +125,12 @@ CRealTime::CRealTime(std::uint16_t year, std::uint16_t month, std::uint16_t day,
                      std::uint16_t minute, std::uint16_t second, std::uint16_t millisecond, std::uint16_t microsecond,
                      bool utc)
     : ticks_(vexa::ticks_of_reading(vexa::ticks_of_fields({year, month, 0, day, hour, minute, second, millisecond}),
-                                    utc)) {
-  const auto more = static_cast<std::int64_t>(microsecond * vexa::kTicksPerMicrosecond);
-  if (ticks_ != 0) ticks_ = vexa::added(ticks_, more);
-}
+                                    utc, static_cast<std::int64_t>(microsecond * vexa::kTicksPerMicrosecond))) {}
 
 CRealTime::CRealTime(std::time_t seconds, bool utc) : CRealTime(seconds, 0, utc) {}
 
 CRealTime::CRealTime(std::time_t seconds, std::int64_t ticks, bool utc)
-    : ticks_(vexa::added(vexa::ticks_of_reading(vexa::ticks_of_unix(seconds, 0), utc), ticks)) {}
+    : ticks_(vexa::ticks_of_reading(vexa::ticks_of_unix(seconds, 0), utc, ticks)) {}
 
 CRealTime CRealTime::GetTheCurrentTime() {
   _SYSTEMTIME now{};

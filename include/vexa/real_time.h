@@ -80,7 +80,7 @@ class VEXA_API CRealTime {
             std::uint16_t second, std::uint16_t millisecond, std::uint16_t microsecond, bool utc);
   /// From seconds since 1970-01-01 00:00:00 in UTC, or in local time when `utc` is false.
   CRealTime(std::time_t seconds, bool utc);
-  /// The same with `ticks` of 100 ns added; unset when the sum is before 1601.
+  /// The same with `ticks` of 100 ns added; unset when the seconds or the sum lie before 1601.
   CRealTime(std::time_t seconds, std::int64_t ticks, bool utc);
 
   /// The present time, to the millisecond.
@@ -211,8 +211,8 @@ class VEXA_API CRealTimeSpan {
   ///   %C             days to seconds in words, without those that are 0: "1 day 3 minutes"; "0 seconds" if all are 0
   ///   %F             days to milliseconds in words, all five:
   ///                  "1 day 0 hours 3 minutes 0 seconds 20 milliseconds"
-  ///   %c             the largest unit that is not 0 in words: "3 minutes"; "0 seconds" if all down to milliseconds are
-  ///   0 %i             milliseconds beyond whole seconds in words: "20 milliseconds"
+  ///   %c             the largest unit that is not 0, milliseconds among them, in words: "3 minutes"; else "0 seconds"
+  ///   %i             milliseconds beyond whole seconds in words: "20 milliseconds"
   ///
   /// Flags work as in printf for the single numbers ("%02h") and are dropped for the other letters. In a negative span
   /// each single number is negative, and %T and the words have one "-" before them. Letters that are not listed are
