@@ -74,15 +74,16 @@ int GetDiskFreeSpaceEx(const char* path, ULARGE_INTEGER* freeToCaller, ULARGE_IN
                        ULARGE_INTEGER* totalFree) {
   if (path == nullptr) path = ".";
   struct statvfs64 system {};
-  if (statvfs64(path, &system) != 0 || system.f_frsize == 0) {
+  const auto space = statvfs64(path, &system) == 0 ? vexa::space_of(system) : std::nullopt;
+  if (!space) {
     const int error = errno;
     debug_line("GetDiskFreeSpaceEx statfs %s: %s", path, ErrorText(error).c_str());
     errno = error;
     return 0;
   }
-  if (freeToCaller != nullptr) *freeToCaller = vexa::bytes_of(system, system.f_bavail);
-  if (total != nullptr) *total = vexa::bytes_of(system, system.f_blocks);
-  if (totalFree != nullptr) *totalFree = vexa::bytes_of(system, system.f_bfree);
+  if (freeToCaller != nullptr) *freeToCaller = space->available;
+  if (total != nullptr) *total = space->total;
+  if (totalFree != nullptr) *totalFree = space->free;
   return 1;
 }
 

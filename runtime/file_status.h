@@ -6,6 +6,7 @@
 #include <unistd.h>
 
 #include <cstdint>
+#include <optional>
 
 #include "runtime/file_time.h"
 #include "vexa/runtime.h"
@@ -44,6 +45,20 @@ inline ULARGE_INTEGER bytes_of(const struct statvfs64& system, std::uint64_t blo
   ULARGE_INTEGER bytes;
   bytes.QuadPart = blocks * system.f_frsize;
   return bytes;
+}
+
+/// What a file system has room for, in bytes.
+struct DiskSpace {
+  ULARGE_INTEGER available;  ///< to the calling user
+  ULARGE_INTEGER total;
+  ULARGE_INTEGER free;
+};
+
+/// Nothing when the system tells no block size.
+inline std::optional<DiskSpace> space_of(const struct statvfs64& system) {
+  if (system.f_frsize == 0) return std::nullopt;
+  return DiskSpace{bytes_of(system, system.f_bavail), bytes_of(system, system.f_blocks),
+                   bytes_of(system, system.f_bfree)};
 }
 
 }  // namespace vexa

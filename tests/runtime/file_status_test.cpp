@@ -211,6 +211,25 @@ TEST(GetDiskFreeSpaceEx, CountsIn64BitsAndInFragments) {
   EXPECT_EQ(bytes.HighPart, 0x1000U);
 }
 
+TEST(GetDiskFreeSpaceEx, TellsAvailableAllAndFreeBlocksApart) {
+  struct statvfs64 system {};
+  system.f_frsize = 512;
+  system.f_blocks = 5;
+  system.f_bfree = 3;
+  system.f_bavail = 2;
+  const auto space = vexa::space_of(system);
+  ASSERT_TRUE(space);
+  EXPECT_EQ(space->available.QuadPart, 1024U);
+  EXPECT_EQ(space->total.QuadPart, 2560U);
+  EXPECT_EQ(space->free.QuadPart, 1536U);
+}
+
+TEST(GetDiskFreeSpaceEx, ABlockSizeOf0IsAFailure) {
+  struct statvfs64 system {};
+  system.f_blocks = system.f_bfree = system.f_bavail = 5;
+  EXPECT_FALSE(vexa::space_of(system));
+}
+
 TEST(GetDiskFreeSpaceEx, SkipsNullOutputs) {
   ULARGE_INTEGER value;
   value.QuadPart = 0;
