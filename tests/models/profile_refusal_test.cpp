@@ -1,0 +1,192 @@
+// What is wrong with a profile is named with its file, line and key, and nothing of it is taken.
+#include <gtest/gtest.h>
+
+#include <initializer_list>
+#include <string>
+
+#include "tests/models/profile_text.h"
+#include "tests/support/temporary_folder.h"
+#include "vexa/models.h"
+
+namespace vexa_test {
+namespace {
+
+std::string refusal_of(const std::string& text) {
+  vexa::Profile profile;
+  profile.model = "as it was";
+  vexa::ProfileError error;
+  if (vexa::ParseProfile(text, "p.json", profile, error)) return "taken";
+  EXPECT_EQ(profile.model, "as it was");
+  EXPECT_TRUE(profile.camera.codecs.empty());
+  return error.Message();
+}
+
+struct ProfileChange {
+  const char* from;
+  const char* to;
+  const char* message;
+};
+
+void expect_refusals(std::initializer_list<ProfileChange> changes) {
+  for (const ProfileChange& change : changes) {
+    EXPECT_EQ(refusal_of(changed_profile(change.from, change.to)), change.message);
+  }
+}
+
+TEST(ProfileRefusal, TheSmallProfileItselfIsTaken) { EXPECT_EQ(refusal_of(kSmallProfile), "taken"); }
+
+TEST(ProfileRefusal, NamesWhatTheSchemaForbids) {
+  expect_refusals({
+      {"\"model\": \"T-1\"", "\"model\": 1", "p.json:4: model: must be a text"},
+      {"\"model\": \"T-1\"", "\"model\": null", "p.json:4: model: must be a text"},
+      {"\"T-1\"", "\"\"", "p.json:4: model: must have 1 to 64 characters"},
+      {"\"common\"", "\"Common\"",
+       "p.json:3: driver: must be one of \"common\", \"heron\", \"marlin\", \"simple-hd\", \"simple-ptz\""},
+      {"[\"fixed\"]", "[]", "p.json:5: cameraTypes: must have at least 1 items"},
+      {"[\"fixed\"]", "[\"fixed\", \"fixed\"]", "p.json:5: cameraTypes[1]: occurs twice in its list"},
+      {"[\"fixed\"]", "\"fixed\"", "p.json:5: cameraTypes: must be a list"},
+      {"\"frameRate\": 25,", "\"frameRate\": \"25\",", "p.json:7: video.streams[0].frameRate: must be a whole number"},
+      {"\"frameRate\": 25,", "\"frameRate\": 25.0,", "p.json:7: video.streams[0].frameRate: must be a whole number"},
+      {"\"frameRate\": 25,", "\"frameRate\": 0,", "p.json:7: video.streams[0].frameRate: must be from 1 to 60"},
+      {"\"frameRate\": 25,", "\"frameRate\": 61,", "p.json:7: video.streams[0].frameRate: must be from 1 to 60"},
+      {"\"frameRate\": 25,", "", "p.json:7: video.streams[0].frameRate: is missing"},
+      {"[1, 25], \"bitRates\"", "[], \"bitRates\"", "p.json:10: video.codecs[1].frameRates: must have 1 to 32 items"},
+      {"\"inputs\": 1", "\"inputs\": 17", "p.json:18: io.inputs: must be from 0 to 16"},
+      {"\"inputs\": 1,", "\"inputs\": 1, \"imputs\": 1,",
+       "p.json:18: io.imputs: is not known here; known are: inputs, outputs, videoDetection, tamperingDetection, "
+       "audioDetection"},
+      {"\"inputs\": 1, ", "", "p.json:18: io.inputs: is missing"},
+      {"\"io\": {\"inputs\": 1, \"outputs\": 0}", "\"edgeStorage\": \"no\"",
+       "p.json:18: edgeStorage: must be true or false"},
+      {"{\"inputs\": 1, \"outputs\": 0}", "[]", "p.json:18: io: must be an object"},
+  });
+}
+
+TEST(ProfileRefusal, NamesWhatTheSchemaCannotSay) {
+  expect_refusals({
+      {"\"640x480\", \"320x240\"", "\"640*480\"",
+       "p.json:10: video.codecs[1].sizes[0]: must be WIDTHxHEIGHT in pixels, for instance \"640x480\""},
+      {"\"name\": \"H.264\"", "\"name\": \"JPEG\"", "p.json:10: video.codecs[1].qualities: is missing: JPEG needs it"},
+      {"\"qualities\": [1, 5]", "\"bitRates\": [1, 5]",
+       "p.json:9: video.codecs[0].qualities: is missing: JPEG needs it"},
+      {"\"qualities\": [1, 5]", "\"qualities\": [1, 5], \"bitRates\": [1]",
+       "p.json:9: video.codecs[0].bitRates: is not for JPEG"},
+      {"\"bitRates\": [512, 2000]", "\"qualities\": [1]", "p.json:10: video.codecs[1].bitRates: is missing"},
+      {"\"bitRates\": [512, 2000]", "\"bitRates\": [512, 2000], \"qualities\": [1]",
+       "p.json:10: video.codecs[1].qualities: is for JPEG only"},
+      {"[512, 2000]", "[2000, 512]", "p.json:10: video.codecs[1].bitRates[1]: must be above the one before it"},
+      {"[512, 2000]", "[2000, 2000]", "p.json:10: video.codecs[1].bitRates[1]: must be above the one before it"},
+      {"\"codec\": \"H.264\"", "\"codec\": \"MPEG4\"",
+       "p.json:7: video.streams[0].codec: is not one of the camera's codecs"},
+      {"\"size\": \"640x480\"", "\"size\": \"800x600\"",
+       "p.json:7: video.streams[0].size: is not one of those that the codec offers"},
+      {"\"frameRate\": 25", "\"frameRate\": 24",
+       "p.json:7: video.streams[0].frameRate: is not one of those that the codec offers"},
+      {"\"bitRate\": 2000", "\"bitRate\": 1000",
+       "p.json:7: video.streams[0].bitRate: is not one of those that the codec offers"},
+      {"\"bitRate\": 2000", "\"quality\": 5", "p.json:7: video.streams[0].bitRate: is missing"},
+      {"\"codecs\": [", "\"captureSizes\": [\"x\"], \"codecs\": [",
+       "p.json:8: video.captureSizes[0]: must be WIDTHxHEIGHT in pixels, for instance \"640x480\""},
+      {"\"codecs\": [", "\"outputs\": [\"ip\", \"pal\"], \"codecs\": [",
+       "p.json:8: video.outputs: is for the drivers \"simple-hd\" and \"simple-ptz\" only"},
+      {"\"value\": 2", "\"value\": 1",
+       "p.json:15: image.exposure[0].shutter[1].value: must be above the one before it"},
+      {"\"Shutter Priority\"", "\"Full auto\"", "p.json:15: image.exposure[0].shutter: is not for this mode"},
+      {"\"Shutter Priority\"", "\"Iris Priority\"", "p.json:15: image.exposure[0].shutter: is not for this mode"},
+      {"\"exposure\": [", "\"exposure\": [{\"mode\": \"Iris Priority\"},",
+       "p.json:14: image.exposure[0].iris: is missing: the mode steps through it"},
+      {"\"exposure\": [", "\"exposure\": [{\"mode\": \"Full auto\"}, {\"mode\": \"Full auto\"},",
+       "p.json:14: image.exposure[1].mode: occurs twice among the exposure modes"},
+      {"[\"fixed\"]", "[\"ptz\"]",
+       "p.json:5: cameraTypes: must name \"ptz\" exactly when the profile has a part \"ptz\""},
+      {"[\"fixed\"]", "[\"audio\"]",
+       "p.json:5: cameraTypes: must name \"audio\" exactly when the profile has a part \"audio\""},
+      {"\"outputs\": 0", "\"outputs\": 0, \"videoDetection\": \"lod\"",
+       "p.json:5: cameraTypes: must name \"lod-detection\" exactly when \"io.videoDetection\" is \"lod\""},
+      {"\"io\"", "\"edgeStorage\": true, \"io\"",
+       "p.json:5: cameraTypes: must name \"edge-storage\" exactly when \"edgeStorage\" is true"},
+  });
+}
+
+TEST(ProfileRefusal, NamesAWrongSizeAtBothEdges) {
+  for (const char* size : {"", "x", "640", "640x", "x480", "0x480", "640x0", "0640x480", "640x480 ", " 640x480",
+                           "-1x480", "10000x480", "640x10000", "640X480", "640x480x"}) {
+    EXPECT_EQ(refusal_of(changed_profile("\"640x480\"], \"frameRates\": [1, 25], \"qualities\"",
+                                         "\"" + std::string(size) + "\"], \"frameRates\": [1, 25], \"qualities\"")),
+              "p.json:9: video.codecs[0].sizes[0]: must be WIDTHxHEIGHT in pixels, for instance \"640x480\"")
+        << size;
+  }
+  EXPECT_EQ(refusal_of(changed_profile("\"320x240\"", "\"9999x1\"")), "taken");
+}
+
+TEST(ProfileRefusal, ChecksTheLensAndItsCurve) {
+  const std::string ptz = R"("ptz": {"dialect": "move",
+    "pan": {"maxSpeed": 1, "span": 1, "angleRange": 1, "origin": 0, "wideAngle": 1},
+    "tilt": {"maxSpeed": 1, "span": 1, "angleRange": 1, "origin": 0, "wideAngle": 1, "offset": 0},
+    "zoom": {"minSpeed": 2, "maxSpeed": MAXSPEED, "minPosition": 5, "maxPosition": MAXPOSITION,
+      "ratios": [{"ratio": 1, "position": 0}, {"ratio": 2, "position": POSITION}]}}, "io")";
+  const struct {
+    const char* speed;
+    const char* position;
+    const char* ratio;
+    const char* message;
+  } cases[] = {{"2", "5", "1", "taken"},
+               {"1", "5", "1", "p.json:21: ptz.zoom.maxSpeed: must not be below minSpeed"},
+               {"2", "4", "1", "p.json:21: ptz.zoom.maxPosition: must not be below minPosition"},
+               {"2", "5", "0", "p.json:22: ptz.zoom.ratios[1].position: must be above the one before it"}};
+  for (const auto& c : cases) {
+    std::string text = changed_profile("[\"fixed\"]", "[\"ptz\"]");
+    const auto replace = [&text](const std::string& from, const std::string& to) {
+      text.replace(text.find(from), from.size(), to);
+    };
+    replace("\"io\"", ptz);
+    replace("MAXSPEED", c.speed);
+    replace("MAXPOSITION", c.position);
+    replace("POSITION", c.ratio);
+    EXPECT_EQ(refusal_of(text), c.message);
+  }
+}
+
+TEST(ProfileRefusal, NamesTheLineOfAMistakeInJson) {
+  EXPECT_EQ(refusal_of(changed_profile("\"model\": \"T-1\",", "\"model\": \"T-1\"")),
+            "p.json:5: not JSON: something is missing, too many or misspelt here");
+  EXPECT_EQ(refusal_of(changed_profile("\"model\"", "\"driver\"")), "p.json:4: driver: occurs twice");
+  EXPECT_EQ(refusal_of("[]"), "p.json:1: must be an object");
+}
+
+TEST(ProfileRefusal, CutAnywhereIsRefusedWhole) {
+  const std::string whole = kSmallProfile.substr(0, kSmallProfile.rfind('}') + 1);
+  for (std::size_t length = 0; length < whole.size(); ++length) {
+    EXPECT_NE(refusal_of(whole.substr(0, length)), "taken") << length;
+  }
+}
+
+TEST(ProfileRefusal, NamesAFileThatCannotBeRead) {
+  vexa::Profile profile;
+  vexa::ProfileError error;
+  const TemporaryFolder folder;
+  const std::string missing = folder / "missing.json";
+  EXPECT_FALSE(vexa::LoadProfile(missing, profile, error));
+  EXPECT_EQ(error.Message(), missing + ": cannot be read: No such file or directory");
+  EXPECT_FALSE(vexa::LoadProfile(folder.path() + "/", profile, error));
+  EXPECT_EQ(error.Message(), folder.path() + "/: cannot be read: Is a directory");
+  EXPECT_FALSE(vexa::LoadProfile("no-such-model", profile, error));
+  EXPECT_EQ(error.Message(), vexa::ProfileFolder() + "/no-such-model.json: cannot be read: No such file or directory");
+}
+
+TEST(ProfileRefusal, AFileAbove1MiBIsNotRead) {
+  const TemporaryFolder folder;
+  vexa::Profile profile;
+  vexa::ProfileError error;
+  const std::string padding(std::size_t{1} << 20, ' ');
+  const std::string fits =
+      folder.make_file("fits.json", kSmallProfile + padding.substr(0, padding.size() - kSmallProfile.size()));
+  EXPECT_TRUE(vexa::LoadProfile(fits, profile, error)) << error.Message();
+  EXPECT_EQ(profile.name, "fits");
+  const std::string large = folder.make_file("large.json", kSmallProfile + padding);
+  EXPECT_FALSE(vexa::LoadProfile(large, profile, error));
+  EXPECT_EQ(error.Message(), large + ": is larger than 1 MiB");
+}
+
+}  // namespace
+}  // namespace vexa_test
