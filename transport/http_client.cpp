@@ -31,6 +31,13 @@ constexpr int kStatusOk = 200;
 constexpr int kStatusNoContent = 204;
 constexpr int kStatusUnauthorized = 401;
 
+// Safe: a camera that sends the credentials back in its reason phrase does not put them into the log.
+std::string loggable(const std::string& reason, const SLibDConnectionInfo& info) {
+  if (info.password.empty()) return reason;
+  const std::string as_sent = vexa::base64_encode(vexa::joined_credentials(info.userName, info.password));
+  return vexa::masked(vexa::masked(reason, as_sent), info.password);
+}
+
 void pause_before_next_look() { std::this_thread::sleep_for(std::chrono::milliseconds(kHeaderPause)); }
 
 }  // namespace
@@ -85,8 +92,10 @@ bool CVexaCommon::ReadHttpStatus(int socket, int timeout) {
     Fail(vexa::kStatusNotFound);
     return false;
   }
-  if (m_CGILogEnabled)
-    Log("From", vexa::format_within(kHeaderRoom, "%d %s", line->status, line->reason.c_str()).text.c_str());
+  if (m_CGILogEnabled) {
+    const std::string reason = loggable(line->reason, ConnectionInfo());
+    Log("From", vexa::format_within(kHeaderRoom, "%d %s", line->status, reason.c_str()).text.c_str());
+  }
   if (line->status == kStatusOk || line->status == kStatusNoContent) return true;
   Fail({line->status == kStatusUnauthorized ? LIBD_UNAUTHORIZED : LIBD_FAILED, line->reason.c_str()});
   return false;

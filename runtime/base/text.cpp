@@ -26,6 +26,15 @@ bool is_ascii_alphanumeric(char c) {
   return (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || (c >= '0' && c <= '9');
 }
 
+std::string masked(std::string text, std::string_view secret) {
+  constexpr std::string_view kMask = "***";
+  if (secret.empty()) return text;
+  for (std::size_t at = text.find(secret); at != std::string::npos; at = text.find(secret, at + kMask.size())) {
+    text.replace(at, secret.size(), kMask);
+  }
+  return text;
+}
+
 Formatted format_within(std::size_t room, const char* format, ...) {
   va_list arguments;
   va_start(arguments, format);

@@ -1,4 +1,5 @@
-// Small readings of text: what follows a key, what stands before a mark, decimal numbers, bounded formatting.
+// Small work on text: what follows a key, what stands before a mark, decimal numbers, hidden secrets, bounded
+// formatting.
 #pragma once
 
 #include <cstdarg>
@@ -27,6 +28,9 @@ int leading_int(const std::string& text);
 
 /// ASCII letters and digits, whatever the host's locale.
 bool is_ascii_alphanumeric(char c);
+
+/// The text with "***" in the place of each `secret`; unchanged when that is empty.
+std::string masked(std::string text, std::string_view secret);
 
 /// A text made as snprintf makes it.
 struct Formatted {

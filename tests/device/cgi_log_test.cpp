@@ -6,6 +6,7 @@
 #include <thread>
 #include <vector>
 
+#include "tests/media/live_camera.h"
 #include "tests/support/in_child.h"
 #include "tests/support/log_text.h"
 #include "tests/support/scripted_camera.h"
@@ -221,6 +222,38 @@ TEST(CgiLog, HoldsNoPassword) {
   EXPECT_EQ(text.find("YWRtaW46c2VjcmV0"), std::string::npos);
 }
 
+TEST(CgiLog, HidesTheCredentialsThatACameraSendsBack) {
+  const struct {
+    const char* reason;
+    const char* logged;
+  } cases[] = {{"no secret, please", "no ***, please"},
+               {"YWRtaW46c2VjcmV0 is not admin:secret", "*** is not admin:***"},
+               {"Secrets of admin", "Secrets of admin"}};
+  for (const auto& c : cases) {
+    const TemporaryFolder folder;
+    ScriptedCamera camera({{.expected = request("/"), .answer = std::string("HTTP/1.0 500 ") + c.reason + "\r\n\r\n"}});
+    LoggingDriver driver(folder / "Log.txt");
+    driver.use(camera.host(), camera.port(), 5000);
+    EXPECT_EQ(driver.http_open("/"), -1);
+    EXPECT_EQ(camera.finish(), "");
+    EXPECT_EQ(log_text(folder / "Log.txt"),
+              opening_banner() + line("To", "/") + line("From", std::string("500 ") + c.logged));
+    EXPECT_EQ(driver.LatestErrorText(), c.reason);
+  }
+}
+
+TEST(CgiLog, HidesNothingForAnEmptyPassword) {
+  const TemporaryFolder folder;
+  const std::string expected = "GET http://{host}:{port}/ HTTP/1.0\r\nAuthorization: Basic YWRtaW46\r\n\r\n";
+  ScriptedCamera camera({{.expected = expected, .answer = "HTTP/1.0 500 YWRtaW46\r\n\r\n"}});
+  LoggingDriver driver(folder / "Log.txt");
+  driver.use(camera.host(), camera.port(), 5000);
+  driver.m_ConnectionInfo.password.clear();
+  EXPECT_EQ(driver.http_open("/"), -1);
+  EXPECT_EQ(camera.finish(), "");
+  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + line("To", "/") + line("From", "500 YWRtaW46"));
+}
+
 TEST(CgiLog, IsEmptyWhileItIsOff) {
   const TemporaryFolder folder;
   ScriptedCamera camera({{.expected = request("/"), .answer = "HTTP/1.0 200 OK\r\n\r\n"}});
@@ -248,6 +281,20 @@ TEST(CgiLog, TheDriverGoesOnWhenTheFileCannotBeOpenedOrWritten) {
     });
     EXPECT_EQ(camera.finish(), "");
   }
+}
+
+TEST(CgiLog, AStreamGoesOnWhenTheFileCannotBeWritten) {
+  vexa_test::LiveCamera camera(vexa_test::camera_options());
+  vexa_test::MediaDriver driver;
+  driver.SetCGILogPath("/dev/full");
+  SLibDConnectionInfo info;
+  driver.SetCurrentConnectionInfo(info);
+  driver.SetCGILogLevel(true);
+  camera.introduce(driver);
+  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  vexa_test::FrameTaker host;
+  EXPECT_EQ(host.take_all(driver, 10).size(), 10U);
+  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
 }
 
 TEST(CgiLog, LinesAndReopeningsOfSeveralThreadsDoNotRace) {

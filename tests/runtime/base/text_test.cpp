@@ -60,6 +60,22 @@ TEST(IsAsciiAlphanumeric, KnowsTheEdgesOfItsThreeRanges) {
   for (const char c : {'/', ':', '@', '[', '`', '{', '\0', '\xe4', '\xff'}) EXPECT_FALSE(is_ascii_alphanumeric(c));
 }
 
+TEST(Masked, HidesEachPlaceOfASecret) {
+  const struct {
+    const char* text;
+    const char* secret;
+    const char* shown;
+  } cases[] = {{"no swordfish", "swordfish", "no ***"},
+               {"swordfish, swordfishes", "swordfish", "***, ***es"},
+               {"aaa", "aa", "***a"},
+               {"a*a", "*", "a***a"},
+               {"Swordfish", "swordfish", "Swordfish"},
+               {"sword", "swordfish", "sword"},
+               {"swordfish", "", "swordfish"},
+               {"", "swordfish", ""}};
+  for (const auto& c : cases) EXPECT_EQ(masked(c.text, c.secret), c.shown) << c.text << " " << c.secret;
+}
+
 TEST(FormatWithin, KeepsWhatFitsAndSaysWhetherItWasCut) {
   const Formatted fitting = format_within(4, "%s", "abc");
   EXPECT_EQ(fitting.text, "abc");
