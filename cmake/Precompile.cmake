@@ -1,7 +1,7 @@
 # Headers that most files of a target read, compiled once for each. Left out under a compiler cache, which would find
 # nothing to keep, and for the library itself, which is to see every warning.
 option(VEXA_PRECOMPILE "Precompile the headers that most tests read" ON)
-if(NOT VEXA_PRECOMPILE OR VEXA_UNITY OR CMAKE_CXX_COMPILER_LAUNCHER)
+if(NOT VEXA_PRECOMPILE OR NOT VEXA_UNITY STREQUAL OFF OR CMAKE_CXX_COMPILER_LAUNCHER)
   return()
 endif()
 

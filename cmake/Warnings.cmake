@@ -7,7 +7,7 @@ if(VEXA_SANITIZE)
 endif()
 target_compile_options(vexa_warnings INTERFACE
   -Wall -Wextra -Wpedantic -Wconversion -Wshadow -Wformat=2 -Wformat-nonliteral -Werror)
-if(VEXA_UNITY)
+if(NOT VEXA_UNITY STREQUAL OFF)
   # A name of one file and a local one of another do not meet but here.
   target_compile_options(vexa_warnings INTERFACE -Wno-shadow)
 endif()

@@ -5,6 +5,7 @@
 #include <chrono>
 #include <csignal>
 #include <cstdio>
+#include <exception>
 #include <optional>
 
 #include "virtual_camera/camera_host.h"
@@ -74,6 +75,11 @@ int run(const ProgramOptions& options) {
 }  // namespace vexa::camera
 
 int main(int argc, char** argv) {
-  const vexa::camera::CommandLine line = vexa::camera::parse_command_line(argc, argv);
-  return line.exit_code ? *line.exit_code : vexa::camera::run(line.options);
+  try {
+    const vexa::camera::CommandLine line = vexa::camera::parse_command_line(argc, argv);
+    return line.exit_code ? *line.exit_code : vexa::camera::run(line.options);
+  } catch (const std::exception& error) {
+    std::fprintf(stderr, "vexa-camera: %s\n", error.what());
+    return vexa::camera::kFailed;
+  }
 }
