@@ -48,7 +48,8 @@ int CVexaCommon::ReceivePacket(int timeout) {
   rtp.overwritten.clear();
   rtp.ring.written(static_cast<std::uint32_t>(length), rtp.overwritten);
   if (!rtp.overwritten.empty()) rtp.collector.drop_overwritten(rtp.overwritten);
-  if (packet.length >= vexa::kRtpHeaderSize && rtp.collector.add(packet, m_RtpClockRate, Clock::now())) {
+  if (packet.length >= vexa::kRtpHeaderSize && rtp.takes(packet) &&
+      rtp.collector.add(packet, m_RtpClockRate, Clock::now())) {
     rtp.ring.keep(packet);
   }
   return length;

@@ -1,6 +1,8 @@
 // What a running RTP stream keeps between two pictures.
 #pragma once
 
+#include <cstdint>
+#include <optional>
 #include <vector>
 
 #include "media/assembly/packet_collector.h"
@@ -9,14 +11,29 @@
 
 namespace vexa {
 
+/// Tells a picture from every other by its first packet.
+struct PictureName {
+  std::uint32_t timestamp;
+  std::uint16_t sequence;
+  bool operator==(const PictureName&) const = default;
+};
+
 /// Made anew for every stream; the streaming thread's.
 struct RtpReception {
-  RtpReception(std::vector<SPacketInfo>& packets, const PictureRules& rules) : collector(packets, rules) {}
+  RtpReception(std::vector<SPacketInfo>& packets, const PictureRules& codec_rules)
+      : rules(codec_rules), collector(packets, codec_rules) {}
 
+  /// Packets of another payload type are not collected.
+  bool takes(const SPacketInfo& packet) const {
+    return rules.payload_type == kAnyPayloadType || packet.payloadType == rules.payload_type;
+  }
+
+  const PictureRules& rules;
   PacketRing ring;
   PacketCollector collector;
   BurstGather gather;
   std::vector<PacketRing::Slot> overwritten;  // room that is used again for every packet
+  std::optional<PictureName> refused;         // the picture that was told damaged and is still listed
 };
 
 }  // namespace vexa

@@ -3,7 +3,6 @@
 #include <algorithm>
 
 #include "media/assembly/frame_writer.h"
-#include "transport/wire/rtp_header.h"
 
 namespace vexa {
 namespace {
@@ -11,6 +10,7 @@ namespace {
 // NAL unit types of ITU-T H.264, table 7-1, and RFC 6184, table 1.
 constexpr std::uint8_t kSlice = 1;
 constexpr std::uint8_t kIdrSlice = 5;
+constexpr std::uint8_t kSupplementalInformation = 6;
 constexpr std::uint8_t kSequenceParameterSet = 7;
 constexpr std::uint8_t kPictureParameterSet = 8;
 constexpr std::uint8_t kAccessUnitDelimiter = 9;
@@ -22,10 +22,6 @@ constexpr std::uint8_t kTypeBits = 0x1f;
 constexpr std::uint8_t kReferenceBits = 0x60;
 constexpr std::uint8_t kFragmentStart = 0x80;
 constexpr unsigned char kStartCode[] = {0, 0, 0, 1};
-
-Bytes payload_of(const SPacketInfo& packet) {
-  return Bytes(packet.data, packet.length).subspan(std::min<std::size_t>(kRtpHeaderSize, packet.length));
-}
 
 constexpr bool is_fragment(std::uint8_t type) { return type == kFragmentA || type == kFragmentB; }
 
@@ -126,6 +122,11 @@ AssembledPicture assemble_h264(PacketRun packets, std::span<unsigned char> frame
   return writer.picture();
 }
 
-const PictureRules kH264Rules{is_key, opening, is_preamble, opens_whole};
+Bytes supplemental_information(const SPacketInfo& packet) {
+  const Bytes payload = payload_of(packet);
+  return !payload.empty() && (payload[0] & kTypeBits) == kSupplementalInformation ? payload : Bytes{};
+}
+
+const PictureRules kH264Rules{kAnyPayloadType, is_key, opening, is_preamble, opens_whole};
 
 }  // namespace vexa

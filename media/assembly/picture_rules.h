@@ -11,7 +11,11 @@ namespace vexa {
 /// The packets of one picture, in sequence order; each holds at least an RTP header.
 using PacketRun = std::span<const SPacketInfo>;
 
+constexpr int kAnyPayloadType = -1;
+
 struct PictureRules {
+  /// The RTP payload type of the packets that are collected, or kAnyPayloadType.
+  int payload_type;
   /// The picture can be shown without those before it.
   bool (*is_key)(PacketRun run);
   /// How the picture's first packet begins it: a code of the codec's own, 0 when it can only continue one.

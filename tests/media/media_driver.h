@@ -12,17 +12,20 @@ namespace vexa_test {
 
 class MediaDriver : public TestDriver {
  public:
-  /// Live H.264 over RTP from the camera that `use` named.
-  void use_live_h264() {
+  /// Live video over RTP from the camera that `use` named.
+  void use_live(const std::string& codec) {
     const vexa::Guard guard(m_ConnectionLock);
     m_ConnectionInfo.streamTransport = 1;
-    m_CameraInfo.codecName = "H.264";
+    m_CameraInfo.codecName = codec;
   }
+  void use_live_h264() { use_live("H.264"); }
 
   using CVexaCommon::AllocateRtpPackets;
   using CVexaCommon::ClearFrameQueue;
   using CVexaCommon::GetRtpCurrentVideoFrame;
   using CVexaCommon::GetRtpCurrentVideoFrameH264;
+  using CVexaCommon::GetRtpCurrentVideoFrameJPEG;
+  using CVexaCommon::GetRtpCurrentVideoFrameMPEG4;
   using CVexaCommon::GetUserDataFromStream;
   using CVexaCommon::m_CamPosLock;
   using CVexaCommon::m_CamPosText;
@@ -46,6 +49,7 @@ class MediaDriver : public TestDriver {
   using CVexaCommon::rtp_over_udp_payload_recv;
   using CVexaCommon::rtp_over_udp_payload_recv_h264;
   using CVexaCommon::rtp_over_udp_recvn;
+  using CVexaCommon::RTPJpegToJIF;
   using CVexaCommon::StampPicture;
   using CVexaCommon::StreamingThread;
   using CVexaCommon::TakeCameraPosition;

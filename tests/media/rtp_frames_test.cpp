@@ -1,64 +1,17 @@
 #include <gtest/gtest.h>
 #include <sys/socket.h>
-#include <unistd.h>
 
 #include <atomic>
 #include <thread>
 #include <utility>
 
-#include "tests/media/media_driver.h"
+#include "tests/media/rtp_feed.h"
 
 namespace vexa_test {
 namespace {
 
-using Payload = std::vector<unsigned char>;
-
-std::time_t frames_clock_now = 1000;
-
-/// A driver whose media socket is one end of a pair.
-class RtpFrames : public testing::Test {
+class RtpFrames : public RtpFeed {
  protected:
-  RtpFrames() : buffer_(1200000) {
-    int ends[2];
-    EXPECT_EQ(socketpair(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0, ends), 0);
-    camera_ = ends[0];
-    driver_.m_StreamSocket = ends[1];
-    driver_.m_RtpClockRate = 90000;
-    driver_.use("127.0.0.1", 1, 50);
-    driver_.state().now = [] { return frames_clock_now; };
-    driver_.m_LastFrameTime = frames_clock_now = 1000;
-    EXPECT_TRUE(driver_.AllocateRtpPackets());
-    frame_.data = buffer_.data();
-    frame_.capacity = static_cast<unsigned int>(buffer_.size());
-  }
-  ~RtpFrames() override {
-    driver_.ReleaseRtpPacketsPtr();
-    close(driver_.m_StreamSocket);
-    driver_.m_StreamSocket = -1;
-    close(camera_);
-  }
-
-  enum class Marker { kUnset, kSet };
-
-  void send_packet(const Payload& payload, Marker marker) {
-    Payload datagram = {0x80, static_cast<unsigned char>(marker == Marker::kSet ? 0xe0 : 0x60)};
-    for (const unsigned value : {sequence_ >> 8 & 255u, sequence_ & 255u, timestamp_ >> 24, timestamp_ >> 16 & 255u,
-                                 timestamp_ >> 8 & 255u, timestamp_ & 255u, 0u, 0u, 0u, 0u}) {
-      datagram.push_back(static_cast<unsigned char>(value));
-    }
-    datagram.insert(datagram.end(), payload.begin(), payload.end());
-    EXPECT_EQ(send(camera_, datagram.data(), datagram.size(), 0), static_cast<ssize_t>(datagram.size()));
-    ++sequence_;
-  }
-
-  /// A picture of one packet a payload.
-  void send_picture(const std::vector<Payload>& payloads) {
-    for (std::size_t i = 0; i < payloads.size(); ++i) {
-      send_packet(payloads[i], i + 1 == payloads.size() ? Marker::kSet : Marker::kUnset);
-    }
-    timestamp_ += 3600;
-  }
-
   /// An IDR slice of `size` payload bytes in fragments of 60000.
   void send_large_picture(std::size_t size) {
     for (std::size_t sent = 0; sent < size; sent += 60000) {
@@ -69,22 +22,13 @@ class RtpFrames : public testing::Test {
     }
     timestamp_ += 3600;
   }
-
-  ELibDReturnCode read() { return driver_.GetRtpCurrentVideoFrame("H.264", frame_); }
-
-  MediaDriver driver_;
-  CVexaCommon::VideoFrameInfo frame_;
-  Payload buffer_;
-  int camera_ = -1;
-  unsigned sequence_ = 1;
-  unsigned timestamp_ = 50000000;
 };
 
 const std::vector<Payload> kKey = {{0x67, 1}, {0x68, 2}, {0x65, 0x88}};
 const std::vector<Payload> kDelta = {{0x41, 0x9a}};
 
 TEST_F(RtpFrames, APictureArrivesWithItsTypeAndMovesTheLastFrameTime) {
-  frames_clock_now = 1003;
+  clock_now = 1003;
   send_picture(kKey);
   EXPECT_EQ(read(), LIBD_OK);
   EXPECT_EQ(frame_.frameType, VIDEO_FRAME_H264_KEY);
@@ -120,7 +64,7 @@ TEST_F(RtpFrames, WithoutAPacketBufferThereIsNoFrameAndWithACapacityBelow4Nothin
 }
 
 TEST_F(RtpFrames, NoDatagramInTimeIsNoFrameUntilTheTimeOutSinceTheLastFrame) {
-  frames_clock_now = 1003;
+  clock_now = 1003;
   driver_.m_ConnectionInfo.timeout = 20;  // whole seconds count: 0 of them
   driver_.m_LastFrameTime = 1003;
   EXPECT_EQ(read(), LIBD_NO_FRAME);
@@ -145,6 +89,30 @@ TEST_F(RtpFrames, AnAggregationPacketAbandonsItsPictureAndAKeyPictureMustFollow)
   EXPECT_EQ(read(), LIBD_OK);
   EXPECT_EQ(frame_.frameType, VIDEO_FRAME_H264_KEY);
   EXPECT_TRUE(driver_.m_RtpPackets.empty());
+}
+
+TEST_F(RtpFrames, ThePositionIsTakenFromEachSingleUnitOfType6) {
+  Payload sei = {0x06, 5, 40};
+  for (const char c : std::string("CamPos: 1/2/3")) sei.push_back(static_cast<unsigned char>(c));
+  Payload slice = sei;
+  slice[0] = 0x65;
+  send_picture({{0x67, 1}, slice});
+  EXPECT_EQ(read(), LIBD_OK);
+  EXPECT_EQ(stored_position(), "");
+  send_picture({sei, {0x41, 0x9a}});
+  EXPECT_EQ(read(), LIBD_OK);
+  EXPECT_EQ(stored_position(), "CamPos: 1/2/3");
+}
+
+TEST_F(RtpFrames, AnotherCodecBeginsWithAnEmptyListAndWaitsForAKeyPicture) {
+  send_picture(kKey);
+  send_picture(kDelta);
+  EXPECT_EQ(read(), LIBD_OK);
+  EXPECT_EQ(driver_.GetRtpCurrentVideoFrame("MPEG4", frame_), LIBD_NO_FRAME);
+  EXPECT_TRUE(driver_.m_RtpPackets.empty());
+  send_picture({{0, 0, 1, 0xb0, 1}});
+  EXPECT_EQ(driver_.GetRtpCurrentVideoFrame("MPEG4", frame_), LIBD_OK);
+  EXPECT_EQ(frame_.frameType, VIDEO_FRAME_MPEG4_KEY);
 }
 
 TEST_F(RtpFrames, APictureLargerThanItsBufferIsDroppedAndALargerBufferTakesTheNext) {

@@ -2,36 +2,12 @@
 
 #include <gtest/gtest.h>
 
-#include <deque>
 #include <vector>
+
+#include "tests/media/assembly/packet_bytes.h"
 
 namespace vexa::test {
 namespace {
-
-using Payload = std::vector<unsigned char>;
-
-/// Packets over bytes of their own, each allocated to its exact length.
-class Packets {
- public:
-  explicit Packets(const std::vector<Payload>& payloads) {
-    for (const Payload& payload : payloads) {
-      Payload datagram(12);
-      datagram.insert(datagram.end(), payload.begin(), payload.end());
-      datagram.shrink_to_fit();
-      datagrams_.push_back(std::move(datagram));
-      SPacketInfo packet;
-      packet.data = datagrams_.back().data();
-      packet.length = static_cast<std::uint32_t>(datagrams_.back().size());
-      packets_.push_back(packet);
-    }
-  }
-  operator PacketRun() const { return packets_; }
-  const SPacketInfo& front() const { return packets_.front(); }
-
- private:
-  std::deque<Payload> datagrams_;
-  std::vector<SPacketInfo> packets_;
-};
 
 struct PictureCase {
   const char* what;
@@ -151,6 +127,26 @@ TEST(H264Units, TheFirstPacketTellsHowAPictureOpens) {
     EXPECT_EQ(kH264Rules.opening(packets.front()), c.opening) << c.what;
     EXPECT_EQ(kH264Rules.opens_whole(packets, true), c.whole) << c.what;
     EXPECT_EQ(kH264Rules.opens_whole(packets, false), c.whole_alone) << c.what;
+  }
+}
+
+TEST(H264Units, SupplementalInformationIsASingleUnitOfType6) {
+  struct {
+    const char* what;
+    Payload payload;
+    bool is;
+  } const cases[] = {
+      {"a SEI unit", {0x06, 5, 16}, true},
+      {"one with reference bits", {0x66, 5}, true},
+      {"the header alone", {0x06}, true},
+      {"a slice", {0x41, 6}, false},
+      {"a fragment of a SEI unit", {0x7c, 0x86, 6}, false},
+      {"nothing", {}, false},
+  };
+  for (const auto& c : cases) {
+    const Packets packets({c.payload});
+    const Bytes found = supplemental_information(packets.front());
+    EXPECT_EQ(Payload(found.begin(), found.end()), c.is ? c.payload : Payload{}) << c.what;
   }
 }
 

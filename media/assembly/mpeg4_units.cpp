@@ -1,0 +1,73 @@
+#include "media/assembly/mpeg4_units.h"
+
+#include <algorithm>
+
+#include "media/assembly/frame_writer.h"
+
+namespace vexa {
+namespace {
+
+// Start codes of ISO/IEC 14496-2, table 6-3.
+constexpr std::uint8_t kSecondVideoObject = 0x01;
+constexpr std::uint8_t kVisualObjectSequence = 0xb0;
+constexpr std::uint8_t kGroupOfPictures = 0xb3;
+constexpr std::uint8_t kVideoObjectPlane = 0xb6;
+
+constexpr unsigned char kStartCodePrefix[] = {0, 0, 1};
+constexpr std::size_t kCodePlace = sizeof kStartCodePrefix;
+
+constexpr std::int32_t mpeg4_type(std::uint8_t code) {
+  switch (code) {
+    case kSecondVideoObject:
+    case kVideoObjectPlane:
+      return VIDEO_FRAME_MPEG4_DELTA;
+    case kVisualObjectSequence:
+    case kGroupOfPictures:
+      return VIDEO_FRAME_MPEG4_KEY;
+    default:
+      return VIDEO_FRAME_INVALID;
+  }
+}
+
+/// The type told by the picture's fourth byte, in whatever packet that is.
+std::int32_t mpeg4_type_of(PacketRun run) {
+  std::size_t before = 0;
+  for (const SPacketInfo& packet : run) {
+    const Bytes payload = payload_of(packet);
+    if (payload.size() > kCodePlace - before) return mpeg4_type(payload[kCodePlace - before]);
+    before += payload.size();
+  }
+  return VIDEO_FRAME_INVALID;
+}
+
+bool is_mpeg4_key(PacketRun run) { return mpeg4_type_of(run) == VIDEO_FRAME_MPEG4_KEY; }
+
+/// The start code that the payload begins with; 0 when it begins with none.
+std::uint8_t mpeg4_opening(const SPacketInfo& first) {
+  const Bytes payload = payload_of(first);
+  if (payload.size() <= kCodePlace ||
+      !std::equal(std::begin(kStartCodePrefix), std::end(kStartCodePrefix), payload.begin()))
+    return 0;
+  return payload[kCodePlace];
+}
+
+bool is_sequence_header(const SPacketInfo& packet) { return mpeg4_opening(packet) == kVisualObjectSequence; }
+
+/// A camera that sends sequence headers begins a key picture with one.
+bool opens_with_header(PacketRun run, bool preamble_seen) {
+  const std::uint8_t code = mpeg4_opening(run.front());
+  return code == kVisualObjectSequence || (!preamble_seen && code == kGroupOfPictures);
+}
+
+}  // namespace
+
+AssembledPicture assemble_mpeg4(PacketRun packets, std::span<unsigned char> frame) {
+  FrameWriter writer(frame);
+  for (const SPacketInfo& packet : packets) writer.append(payload_of(packet));
+  return {writer.fits() ? Assembly::kWhole : Assembly::kTooLarge, static_cast<std::uint32_t>(writer.length()),
+          mpeg4_type_of(packets)};
+}
+
+const PictureRules kMpeg4Rules{kAnyPayloadType, is_mpeg4_key, mpeg4_opening, is_sequence_header, opens_with_header};
+
+}  // namespace vexa
