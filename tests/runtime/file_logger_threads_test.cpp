@@ -22,7 +22,6 @@ using vexa_test::TemporaryFolder;
 constexpr int kThreads = 16;
 constexpr int kLoggers = 4;
 constexpr int kLines = 200000;
-constexpr int kLinesOfAThread = kLines / kThreads;
 constexpr int kRotationKilobytes = 64;
 
 class SharedLogger : public CFileLogger {
@@ -41,15 +40,15 @@ std::string line_of(int thread, int number) {
   return line;
 }
 
-/// Logs all lines through `kLoggers` loggers of one file.
-void log_all(const std::string& path, int copies) {
+/// Logs `lines` lines, as many from each thread, through `kLoggers` loggers of one file.
+void log_all(const std::string& path, int copies, int lines) {
   std::vector<std::unique_ptr<SharedLogger>> loggers;
   for (int i = 0; i < kLoggers; ++i)
     loggers.push_back(std::make_unique<SharedLogger>(path, kRotationKilobytes, copies));
   std::vector<std::thread> threads;
   for (int thread = 0; thread < kThreads; ++thread) {
-    threads.emplace_back([thread, logger = loggers[static_cast<std::size_t>(thread % kLoggers)].get()] {
-      for (int number = 0; number < kLinesOfAThread; ++number) logger->Log(line_of(thread, number).c_str());
+    threads.emplace_back([thread, lines, logger = loggers[static_cast<std::size_t>(thread % kLoggers)].get()] {
+      for (int number = 0; number < lines / kThreads; ++number) logger->Log(line_of(thread, number).c_str());
     });
   }
   for (std::thread& thread : threads) thread.join();
@@ -111,20 +110,20 @@ class LineCheck {
 TEST(FileLoggerThreads, NoLineIsLostTornOrDoubledOverRotations) {
   const TemporaryFolder folder(memory_folder());
   constexpr int kEnoughCopies = 200;
-  log_all(folder / "Log.txt", kEnoughCopies);
+  log_all(folder / "Log.txt", kEnoughCopies, kLines);
   const LineCheck check(kept_text(folder, kEnoughCopies));
   EXPECT_EQ(check.fault(), "");
   EXPECT_EQ(check.lines(), kLines);
   for (int thread = 0; thread < kThreads; ++thread) {
     EXPECT_EQ(check.first_of(thread), 0);
-    EXPECT_EQ(check.behind_last_of(thread), kLinesOfAThread);
+    EXPECT_EQ(check.behind_last_of(thread), kLines / kThreads);
   }
 }
 
 TEST(FileLoggerThreads, TheCopiesKeptHoldTheLatestLinesWithoutAGap) {
   const TemporaryFolder folder(memory_folder());
   constexpr int kFewCopies = 3;
-  log_all(folder / "Log.txt", kFewCopies);
+  log_all(folder / "Log.txt", kFewCopies, kLines / 4);
   const LineCheck check(kept_text(folder, kFewCopies));
   EXPECT_EQ(check.fault(), "");
   EXPECT_GE(check.lines(), kFewCopies * kRotationKilobytes * 1024 / 40);

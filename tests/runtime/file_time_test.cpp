@@ -218,10 +218,10 @@ constexpr Zone kZones[] = {{"UTC", utc_offset},
                            {"Australia/Sydney", sydney_offset},
                            {"Asia/Kolkata", kolkata_offset}};
 
-TEST(FileTime, LocalTimesFollowTheOffsetOfTheMomentEveryHalfHourOfThreeDecades) {
+TEST(FileTime, LocalTimesFollowTheOffsetOfTheMomentEveryHourOfThreeDecades) {
   for (const Zone& zone : kZones) {
     const InZone in_zone(zone.name);
-    for (std::int64_t seconds = 1230768000; seconds < 2145916800; seconds += 1800) {  // 2009 to 2037
+    for (std::int64_t seconds = 1230768000; seconds < 2145916800; seconds += 3600) {  // 2009 to 2037
       ASSERT_EQ(to_local(ticks_at(seconds)), ticks_at(seconds + zone.offset(seconds))) << zone.name << " " << seconds;
     }
   }

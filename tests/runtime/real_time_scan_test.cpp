@@ -182,11 +182,11 @@ TEST(RealTimeScan, ANumberIsLookedForInTheNext256Characters) {
 
 TEST(RealTimeScan, LongRunsOfSpacesAndZerosAreNotWalkedByEveryDirective) {
   std::string format;
-  for (int i = 0; i < 200000; ++i) format += " %d";
+  for (int i = 0; i < 50000; ++i) format += " %d";
   EXPECT_EQ(scan(std::string(1000000, ' ').c_str(), format.c_str()).count, 0);
   format.clear();
-  for (int i = 0; i < 200000; ++i) format += "0%h";
-  EXPECT_EQ(scan(std::string(1000000, '0').c_str(), format.c_str()).count, 200000);
+  for (int i = 0; i < 50000; ++i) format += "0%h";
+  EXPECT_EQ(scan(std::string(1000000, '0').c_str(), format.c_str()).count, 50000);
 }
 
 TEST(RealTimeScan, NullTextsReadNothing) {
@@ -207,7 +207,7 @@ TEST(RealTimeScan, ReadsBackEveryFormatThatNamesAllFields) {
                            "%d.%o.%y, %H u %M min %S s %L ms", "%L|%S|%M|%H|%D|%O|%Y",
                            "%8L:%-5s:%.3m:%5h;%05d;%.2o;%Y",   "%A! %D %n! %O %Y, %H:%M:%S;%L"};
   std::mt19937_64 random(19700101);
-  for (int round = 0; round < 30000; ++round) {
+  for (int round = 0; round < 4000; ++round) {
     const std::uint64_t milliseconds = random() % (std::uint64_t{1167609600} * 1000);  // 2000 to 2036
     const CRealTime time(file_time_of(ticks_of_unix(946684800, milliseconds * 10000).value()));
     for (const char* format : formats) {
@@ -223,7 +223,7 @@ TEST(RealTimeScan, ReadsBackLocalTextsOfFourZonesAsTheTextConstructorDoes) {
   std::mt19937_64 random(4);
   for (const char* name : {"UTC", "Europe/Amsterdam", "Australia/Sydney", "Asia/Kolkata"}) {
     const InZone zone(name);
-    for (int round = 0; round < 5000; ++round) {
+    for (int round = 0; round < 1500; ++round) {
       const std::uint64_t milliseconds = random() % (std::uint64_t{1167609600} * 1000);
       const CRealTime time(file_time_of(ticks_of_unix(946684800, milliseconds * 10000).value()));
       const std::string text = time.Format("%D-%O-%Y %H:%M:%S.%03L", false);

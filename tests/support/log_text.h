@@ -18,6 +18,7 @@ inline std::string closing_banner() { return "\n00-00-0000 00:00:00.000\tLogFile
 inline std::string without_times(std::string text) {
   const std::string forms[] = {"00-00-0000", "00:00:00.000"};
   for (std::size_t at = 0; at < text.size(); ++at) {
+    if (text[at] < '0' || text[at] > '9') continue;
     for (const std::string& form : forms) {
       std::string piece = text.substr(at, form.size());
       for (char& c : piece) c = c >= '0' && c <= '9' ? '0' : c;
