@@ -121,6 +121,15 @@ TEST_F(LogCommand, APasswordThatACameraSentBackIsHidden) {
   }
 }
 
+TEST_F(LogCommand, APasswordThatACameraSendsBackDoesNotEnterTheFile) {
+  start_camera();
+  camera().add_request_fault(RequestFault::status("inquiry", "500 no swordfish"));
+  run({"info", place(), "--cgi-log", "cgi.log"}, {"VEXACTL_USER=operator", "VEXACTL_PASSWORD=swordfish"});
+  const std::string text = contents_of(folder() / "cgi.log");
+  EXPECT_THAT(text, HasSubstr("\tCGI\tFrom\t500 no ***"));
+  EXPECT_EQ(text.find("swordfish"), std::string::npos);
+}
+
 TEST_F(LogCommand, WithoutTheOptionNoLogIsLeft) {
   start_camera();
   run({"info", place()});
