@@ -1,6 +1,7 @@
 // What a driver object keeps besides the fields of its class.
 #pragma once
 
+#include <atomic>
 #include <ctime>
 #include <memory>
 
@@ -15,9 +16,17 @@ using SecondsClock = std::time_t (*)();
 
 inline std::time_t system_seconds() { return std::time(nullptr); }
 
+/// A number that no other driver object of the process has had.
+inline unsigned next_driver_number() {
+  static std::atomic<unsigned> latest{0};
+  return ++latest;
+}
+
 struct DriverState {
-  CSimpleLock error_lock;   ///< guards m_LatestErrorCode and m_LatestErrorText; innermost
-  CSimpleLock filter_lock;  ///< guards m_ResolutionFilter and m_FixedCameraInfo; taken before m_ConnectionLock
+  const unsigned number = next_driver_number();
+  CSimpleLock start_stop_lock;  ///< held by a start or stop of video from begin to end; outermost
+  CSimpleLock error_lock;       ///< guards m_LatestErrorCode and m_LatestErrorText; innermost
+  CSimpleLock filter_lock;      ///< guards m_ResolutionFilter and m_FixedCameraInfo; taken before m_ConnectionLock
   SecondsClock now = system_seconds;
   std::unique_ptr<RtpReception> rtp;  ///< the streaming thread's; null while no RTP streams
   FrameStore spare_frames;            ///< guarded by m_FrameQueueLock

@@ -41,6 +41,7 @@ CVexaCommon::~CVexaCommon() {
   CVexaCommon::StopAudioStreaming();
   CVexaCommon::StopIoStreaming();
   ReleaseRtpPacketsPtr();
+  ReleaseStreamBuffer();
   delete[] m_StagingBuffer;
   CloseHandle(m_StopVideoEvent);
 }

@@ -26,11 +26,17 @@ constexpr useconds_t kExitPoll = 100000;  // microseconds
 
 ELibDReturnCode CVexaCommon::StartVideoStreaming() {
   if (IsStopRequested()) return LIBD_FAILED;
+  const vexa::Guard guard(m_State->start_stop_lock);
   StopVideoStreaming();
+  if (IsStopRequested()) return LIBD_FAILED;  // another thread's, which waits for the lock
+  return StartLiveVideo();
+}
+
+ELibDReturnCode CVexaCommon::StartLiveVideo() {
   const SLibDCameraInfo camera = PrepareCamera();
   const bool rtp = ConnectionInfo().streamTransport == kRtspTransport;
   if (rtp && !OpenLiveRtp(camera.streamNumber)) return LIBD_FAILED;
-  if (!rtp) OpenLiveHttp(camera.streamNumber);
+  if (!rtp && !OpenLiveHttp(camera.streamNumber)) return LIBD_FAILED;
   if (m_StreamSocket == -1) {
     ReleaseRtpPacketsPtr();
     return LatestErrorCode();
@@ -44,10 +50,12 @@ SLibDCameraInfo CVexaCommon::PrepareCamera() {
   return m_CameraInfo;
 }
 
-void CVexaCommon::OpenLiveHttp(int stream) {
+bool CVexaCommon::OpenLiveHttp(int stream) {
   m_RtpLiveMode = false;
   m_EdgeStoragePlayback = false;
-  m_StreamSocket = http_open("/image%d", stream);
+  if (!ResetStreamBuffer()) return false;
+  SetStreamSocket(http_open("/image%d", stream));
+  return true;
 }
 
 bool CVexaCommon::OpenLiveRtp(int stream) {
@@ -60,7 +68,7 @@ bool CVexaCommon::OpenLiveRtp(int stream) {
   m_RtspSocket = rtp_over_udp_open("rtsp://%s:%d/media/video%d", connection.host.c_str(), kRtspPort, stream);
   if (m_RtspSocket == -1 && m_StreamSocket != -1) {
     rtp_over_tcp_close(m_StreamSocket);
-    m_StreamSocket = -1;
+    SetStreamSocket(-1);
     Fail({LIBD_STREAM_OPEN_FAILED, LatestErrorText().c_str()});
   }
   return true;
@@ -85,9 +93,15 @@ ELibDReturnCode CVexaCommon::StartStreamingThread(const std::string& codec) {
     m_StagingBuffer = new unsigned char[m_StagingBufferSize]();
   }
   m_StreamingThread = _beginthreadex(nullptr, 0, StreamingThread, this, 0, nullptr);
-  if (m_StreamingThread != nullptr) return LIBD_OK;
-  FailSystem(EAGAIN);
-  StopVideoStreaming();
+  return m_StreamingThread != nullptr ? LIBD_OK : AbandonStart(EAGAIN);
+}
+
+ELibDReturnCode CVexaCommon::AbandonStart(int error) {
+  const bool rtp = m_EdgeStoragePlayback || m_RtpLiveMode;
+  if (rtp && m_RtspSocket == -1) rtp_stream_socket_close_all();  // no session stands that could be ended
+  CVexaCommon::StopVideoStreaming();
+  ReleaseRtpPacketsPtr();
+  FailSystem(error);
   return LIBD_FAILED;
 }
 
@@ -144,18 +158,26 @@ ELibDReturnCode CVexaCommon::StopVideoStreaming() {
     if (m_StopVideoRequested) return LIBD_FAILED;
     m_StopVideoRequested = true;
   }
+  // A start in another thread is let finish: what it opens is its own until then.
+  const vexa::Guard turn(m_State->start_stop_lock);
   EndStreamingThread();
   if (m_EdgeStoragePlayback || m_RtpLiveMode) {
     StopRtpVideoStreaming();
   } else {
     http_close(m_StreamSocket);
-    const vexa::Guard guard(m_VideoStateLock);
-    m_StreamSocket = -1;
+    ReleaseStreamBuffer();
+    SetStreamSocket(-1);
   }
   ClearFrameQueue();
   const vexa::Guard guard(m_VideoStateLock);
   m_StopVideoRequested = false;
   return LIBD_OK;
+}
+
+// Another thread's stop looks at it at any time.
+void CVexaCommon::SetStreamSocket(int socket) {
+  const vexa::Guard guard(m_VideoStateLock);
+  m_StreamSocket = socket;
 }
 
 void CVexaCommon::EndStreamingThread() {

@@ -17,11 +17,18 @@ inline constexpr Failure kStrangeStatus{LIBD_FAILED, "Strange status"};
 inline constexpr Failure kInvalidArgument{LIBD_FAILED, "Invalid argument"};
 inline constexpr Failure kUrlTooLong{LIBD_FAILED, "URL too long"};
 inline constexpr Failure kStatusNotFound{LIBD_FAILED, "Status not found"};
+inline constexpr Failure kClockNotFound{LIBD_FAILED, "clock= not found"};
 inline constexpr Failure kUnknownClock{LIBD_FAILED, "unknown clock format"};
 inline constexpr Failure kRtpmapNotFound{LIBD_FAILED, "rtpmap: not found"};
 inline constexpr Failure kRtpmapSlashNotFound{LIBD_FAILED, "rtpmap:'/' not found"};
 inline constexpr Failure kClockUnitNotFound{LIBD_FAILED, "clock_unit not found"};
 inline constexpr Failure kSessionNotFound{LIBD_FAILED, "Session not found"};
+inline constexpr Failure kConnectionClosed{LIBD_FAILED, "Connection closed"};
+inline constexpr Failure kNoDollar{LIBD_FAILED, "ASCII dollar not found"};
+inline constexpr Failure kRtpVersion{LIBD_FAILED, "Invalid RTP version"};
+inline constexpr Failure kPayloadLength{LIBD_FAILED, "Invalid payload length"};
+inline constexpr Failure kDataLenNotFound{LIBD_FAILED, "DataLen not found"};
+inline constexpr Failure kBufferTooSmall{LIBD_FAILED, "Buffer too small"};
 inline constexpr Failure kKeepAliveTooLong{LIBD_FAILED, "URL too long\n"};
 
 }  // namespace vexa

@@ -1,6 +1,4 @@
 // CVexaCommon: datagrams of an RTP session over UDP.
-#include <sys/socket.h>
-
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
@@ -8,6 +6,7 @@
 
 #include "device/driver_state.h"
 #include "transport/failure.h"
+#include "transport/socket.h"
 #include "transport/wait_budget.h"
 #include "transport/wire/rtp_header.h"
 #include "vexa/runtime.h"
@@ -28,21 +27,13 @@ void nap(std::chrono::microseconds length) {
   nanosleep(&duration, nullptr);  // a signal may cut it short: the datagrams are read all the same
 }
 
-/// One datagram, if one waits.
-ssize_t receive_waiting(int socket, char* buffer, int length) {
-  ssize_t count = 0;
-  do {
-    count = recv(socket, buffer, static_cast<std::size_t>(std::max(length, 0)), MSG_DONTWAIT);
-  } while (count < 0 && errno == EINTR);
-  return count;
-}
-
 }  // namespace
 
 // Reads first and waits only when nothing is there: one system call a datagram while data keep coming.
 int CVexaCommon::rtp_over_udp_recvn(int socket, char* buffer, int length, int timeout) {
   vexa::BurstGather* gather = m_State->rtp ? &m_State->rtp->gather : nullptr;
-  ssize_t count = receive_waiting(socket, buffer, length);
+  const std::size_t room = static_cast<std::size_t>(std::max(length, 0));
+  ssize_t count = vexa::receive_waiting(socket, buffer, room);
   if (count < 0 && (errno == EAGAIN || errno == EWOULDBLOCK)) {
     int stop = -1;
     eventFd(m_StopVideoEvent, stop);
@@ -50,7 +41,7 @@ int CVexaCommon::rtp_over_udp_recvn(int socket, char* buffer, int length, int ti
     if (ready == 0) return Fail(vexa::kReceiveTimedOut);
     if (ready < 0) return FailSystem();
     if (gather != nullptr) nap(gather->woken());
-    count = receive_waiting(socket, buffer, length);
+    count = vexa::receive_waiting(socket, buffer, room);
   }
   if (count < 0) return FailSystem();
   if (gather != nullptr) gather->received(static_cast<std::size_t>(count));

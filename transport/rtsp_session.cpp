@@ -31,8 +31,8 @@ constexpr int kAnswerRoom = 1023;
 constexpr int kTeardownTimeout = 15000;  // milliseconds
 constexpr int kMillisecondsPerSecond = 1000;
 
-constexpr int kStatusOk = 200;
-constexpr int kStatusUnauthorized = 401;
+constexpr int kRtspOk = 200;
+constexpr int kRtspUnauthorized = 401;
 
 /// A non-blocking socket whose single reads and sends end after whole seconds of the time-out; invalid with errno.
 vexa::Socket make_control_socket(int timeout) {
@@ -51,18 +51,14 @@ int CVexaCommon::rtp_over_udp_open(const char* format, ...) {
   va_start(arguments, format);
   const std::string url = vexa::vformat_within(vexa::kRequestRoom, format, arguments).text;
   va_end(arguments);
-  ClearLatestError();
-  m_RtspCSeq = 0;
   const SLibDConnectionInfo info = ConnectionInfo();
-  const vexa::ResolvedHost host = vexa::resolve_host(info.host, RtspPort());
-  if (!host.address) return FailSystem(host.error);
-  vexa::Socket control = make_control_socket(info.timeout);
-  if (!control.valid()) return FailSystem();
+  sockaddr_in address{};
+  vexa::Socket control(MakeRtspSocket(info, address));
+  if (!control.valid()) return -1;
   const int port = BindMediaSocket();
-  if (port == -1 || !ConnectRtsp(control.get(), *host.address, info)) return -1;
+  if (port == -1 || !ConnectRtsp(control.get(), address, info)) return -1;
   std::string description;
-  const vexa::RtspHead describe{url, ++m_RtspCSeq, m_BasicCredentials};
-  if (!ExchangeRtsp(control.get(), vexa::rtsp_describe(describe), description)) return -1;
+  if (!DescribeRtsp(control.get(), url, description)) return -1;
   if (!TakeRangeClock(description) || !TakeClockRate(description)) return -1;
   int session = 0;
   const vexa::RtspHead set_up{url, ++m_RtspCSeq, m_BasicCredentials};
@@ -74,6 +70,17 @@ int CVexaCommon::rtp_over_udp_open(const char* format, ...) {
   return control.release();
 }
 
+// What every open begins with: the camera's address, and a socket to connect.
+int CVexaCommon::MakeRtspSocket(const SLibDConnectionInfo& info, sockaddr_in& address) {
+  ClearLatestError();
+  m_RtspCSeq = 0;
+  const vexa::ResolvedHost host = vexa::resolve_host(info.host, RtspPort());
+  if (!host.address) return FailSystem(host.error);
+  address = *host.address;
+  const int socket = make_control_socket(info.timeout).release();
+  return socket == -1 ? FailSystem() : socket;
+}
+
 int CVexaCommon::RtspPort() {
   const vexa::Guard guard(m_ConnectionLock);
   return m_CameraInfo.rtspPort;
@@ -81,7 +88,7 @@ int CVexaCommon::RtspPort() {
 
 // Kept: the media socket stays open when the open fails later on; its caller tells by it how far the open came.
 int CVexaCommon::BindMediaSocket() {
-  m_StreamSocket = vexa::make_socket(SOCK_DGRAM).release();
+  SetStreamSocket(vexa::make_socket(SOCK_DGRAM).release());
   if (m_StreamSocket == -1) return FailSystem();
   vexa::set_receive_buffer(m_StreamSocket, kMediaReceiveBuffer);
   sockaddr_in address{};
@@ -125,8 +132,8 @@ bool CVexaCommon::ReceiveRtsp(int socket, int timeout, std::string& answer) {
     Fail(vexa::kStatusNotFound);
     return false;
   }
-  if (line->status == kStatusOk) return true;
-  Fail({line->status == kStatusUnauthorized ? LIBD_UNAUTHORIZED : LIBD_FAILED, line->reason.c_str()});
+  if (line->status == kRtspOk) return true;
+  Fail({line->status == kRtspUnauthorized ? LIBD_UNAUTHORIZED : LIBD_FAILED, line->reason.c_str()});
   return false;
 }
 
@@ -138,6 +145,11 @@ bool CVexaCommon::ExchangeRtsp(int socket, const vexa::Formatted& request, std::
   if (SendRtsp(socket, request.text)) return ReceiveRtsp(socket, ConnectionTimeout(), answer);
   FailSystem();
   return false;
+}
+
+bool CVexaCommon::DescribeRtsp(int socket, const std::string& url, std::string& description) {
+  const vexa::RtspHead head{url, ++m_RtspCSeq, m_BasicCredentials};
+  return ExchangeRtsp(socket, vexa::rtsp_describe(head), description);
 }
 
 // Kept: a description without a clock opens over UDP; live cameras send none.
@@ -238,16 +250,10 @@ void CVexaCommon::TearDown() {
   ReceiveRtsp(m_RtspSocket, kTeardownTimeout, answer);
 }
 
-void CVexaCommon::rtp_over_tcp_close(int socket) { vexa::shutdown_and_close(socket); }
-
 void CVexaCommon::rtp_stream_socket_close_all() {
   vexa::shutdown_and_close(std::exchange(m_RtspSocket, -1));
-  int media = -1;
-  {
-    const vexa::Guard guard(m_VideoStateLock);  // a second stop looks at it meanwhile
-    media = std::exchange(m_StreamSocket, -1);
-  }
-  vexa::shutdown_and_close(media);
+  vexa::shutdown_and_close(m_StreamSocket);
+  SetStreamSocket(-1);
 }
 
 unsigned char* CVexaCommon::base64Decode(const char* text, unsigned int& size, bool trim) {

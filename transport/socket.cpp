@@ -4,6 +4,8 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
+#include <cerrno>
+
 namespace vexa {
 
 Socket& Socket::operator=(Socket&& other) noexcept {
@@ -20,6 +22,14 @@ Socket::~Socket() {
 
 bool send_once(int socket, const char* bytes, std::size_t length) {
   return send(socket, bytes, length, MSG_NOSIGNAL) == static_cast<ssize_t>(length);
+}
+
+ssize_t receive_waiting(int socket, char* buffer, std::size_t length) {
+  ssize_t count = 0;
+  do {
+    count = recv(socket, buffer, length, MSG_DONTWAIT);
+  } while (count < 0 && errno == EINTR);
+  return count;
 }
 
 void shutdown_and_close(int socket) {

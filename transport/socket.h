@@ -1,6 +1,8 @@
 // Descriptors that close themselves, and sends that never raise SIGPIPE.
 #pragma once
 
+#include <sys/types.h>
+
 #include <cstddef>
 #include <utility>
 
@@ -27,6 +29,9 @@ class Socket {
 
 /// One send; true when all bytes went. A peer that has closed gives EPIPE, never a signal.
 bool send_once(int socket, const char* bytes, std::size_t length);
+
+/// What waits at the socket, one read; -1 with errno, EAGAIN when nothing does. A signal does not end it.
+ssize_t receive_waiting(int socket, char* buffer, std::size_t length);
 
 /// Shuts the socket down both ways and closes it; errors and -1 are passed over.
 void shutdown_and_close(int socket);

@@ -23,9 +23,9 @@ struct typedHandle;
 
 namespace vexa {
 struct DriverState;
-struct AssembledPicture;
+class StreamWindow;
+struct ElementaryCodec;
 struct PacketRunPlace;
-struct PictureRules;
 struct Failure;
 struct Formatted;
 }  // namespace vexa
@@ -34,8 +34,9 @@ struct Formatted;
 ///
 /// Construction contacts no camera. Operations may be called from any of the host's threads; one streaming thread runs
 /// while video plays. The connection is changed only while no stream and no command is in flight. Destruction stops
-/// video, audio and the alarm stream; the motion-metadata stream is the host's to stop. One thread at a time starts
-/// video or destroys the driver; a stop may come from another while one is in progress.
+/// video, audio and the alarm stream; the motion-metadata stream is the host's to stop. Starts and stops of video from
+/// several threads take turns, but a start or stop during a stop is refused. Only a driver that no other thread uses is
+/// destroyed.
 ///
 /// Everything that is not an operation of CLibraryDevice is protected: model classes outside the library derive from
 /// this class and fill the capability records. Each block below names the file with its bodies.
@@ -105,7 +106,12 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode GetCurrentVideoFrame(SLibDVideoFrameInfo& frame) override;
 
   // media/audio.cpp
+  ELibDReturnCode GetFixedAudioInfo(SLibDFixedAudioInfo& info) override;
+  ELibDReturnCode GetAudioInfo(SLibDAudioInfo& info) override;
+  ELibDReturnCode SetAudioInfo(SLibDAudioInfo& info) override;
+  ELibDReturnCode StartAudioStreaming() override;
   ELibDReturnCode StopAudioStreaming() override;
+  ELibDReturnCode GetCurrentAudioFrame(SLibDAudioFrameInfo& frame) override;
 
   // device/alarm_io.cpp
   ELibDReturnCode StopIoStreaming() override;
@@ -133,27 +139,44 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   bool RequestHttp(int socket, const SLibDConnectionInfo& info, const std::string& path);
   bool ReadHttpStatus(int socket, int timeout);
 
+  // HTTP streams: transport/http_streams.cpp
+  /// Where the next start code begins in `length` bytes; null when there is none.
+  using StartCodeFinder = const unsigned char* (*)(const unsigned char* data, unsigned int length);
+  int http_multipart_jpeg_recv(int socket, char* buffer, int capacity, int timeout);
+  int http_multipart_input_recv(int socket, unsigned int& mask, unsigned int& state);
+  int http_multipart_mddata_recv(int socket, char* buffer, int capacity, int timeout);
+  int http_stream_recv(int socket, char* buffer, int capacity, StartCodeFinder finder, int codeLength, int timeout);
+  bool ReceiveStream(int socket, vexa::StreamWindow& window);
+
   // The RTSP session: transport/rtsp_session.cpp, transport/keep_alive.cpp
   int rtp_over_udp_open(const char* format, ...) __attribute__((format(printf, 2, 3)));
   int rtp_over_tcp_header_recv(int socket, char* buffer, int size, int timeout);
   bool parse_clock(const char* text);
   void rtp_over_udp_close();
-  void rtp_over_tcp_close(int socket);
   void rtp_stream_socket_close_all();
   unsigned char* base64Decode(const char* text, unsigned int& size, bool trim);
   void KeepAlive();
-  // Its steps: a port or -1; false with the latest error set (SendRtsp: with errno).
+  // Its steps: a port, a socket or -1; false with the latest error set (SendRtsp: with errno).
   int RtspPort();
+  int MakeRtspSocket(const SLibDConnectionInfo& info, sockaddr_in& address);
   int BindMediaSocket();
   bool ConnectRtsp(int socket, const sockaddr_in& address, const SLibDConnectionInfo& info);
   bool SendRtsp(int socket, const std::string& request);
   bool ReceiveRtsp(int socket, int timeout, std::string& answer);
   bool ExchangeRtsp(int socket, const vexa::Formatted& request, std::string& answer);
+  bool DescribeRtsp(int socket, const std::string& url, std::string& description);
   bool SetUpRtsp(int socket, const vexa::Formatted& request, int& session);
   bool PlayRtsp(int socket, const std::string& url, int session);
   void TearDown();
   bool TakeRangeClock(const std::string& answer);
   bool TakeClockRate(const std::string& answer);
+
+  // RTP inside the RTSP connection: transport/rtp_over_tcp.cpp
+  int rtp_over_tcp_open(const char* format, ...) __attribute__((format(printf, 2, 3)));
+  void rtp_over_tcp_close(int socket);
+  int rtp_over_tcp_recvn(int socket, char* buffer, int length, int timeout);
+  int rtp_over_tcp_payload_recv(int socket, char* buffer, int size, bool* marker, unsigned char* payloadType,
+                                int timeout, unsigned int* timestamp);
 
   // RTP over UDP: transport/rtp_over_udp.cpp
   int rtp_over_udp_recvn(int socket, char* buffer, int length, int timeout);
@@ -166,13 +189,15 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   static unsigned int StreamingThread(void* driver);
   static void ProcessCurrentFrameData(CVexaCommon* driver, VideoFrameInfo& frame, bool& waitKey,
                                       ELibDReturnCode result);
-  static void PropulateFrameInfoList(CVexaCommon* driver, VideoFrameInfo& frame, bool& waitKey);
-  ELibDReturnCode GetCurrentFrameData(VideoFrameInfo& frame);
+  static void PropulateFrameInfoList(CVexaCommon* driver, VideoFrameInfo& frame, bool& waitKey)
+      VEXA_REQUIRES(driver->m_FrameQueueLock);
   ELibDReturnCode GetRtpCurrentVideoFrame(const std::string& codec, VideoFrameInfo& frame);
   ELibDReturnCode StopRtpVideoStreaming();
   void ReleaseRtpPacketsPtr();
+  ELibDReturnCode StartLiveVideo();
+  ELibDReturnCode AbandonStart(int error);
   SLibDCameraInfo PrepareCamera();
-  void OpenLiveHttp(int stream);
+  bool OpenLiveHttp(int stream);
   bool OpenLiveRtp(int stream);
   bool AllocateRtpPackets();
   ELibDReturnCode StartStreamingThread(const std::string& codec);
@@ -181,6 +206,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode ReadFrame(VideoFrameInfo& frame);
   std::string StreamCodec();
   bool IsStopRequested();
+  void SetStreamSocket(int socket);
   void EndStreamingThread();
   void FreeFrame(VideoFrameInfo& frame) VEXA_REQUIRES(m_FrameQueueLock);
   void ClearFrameQueue();
@@ -191,21 +217,27 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   /// The same over the whole data.
   bool TakeCameraPosition(const unsigned char* data, unsigned int length);
 
+  // Frames from the HTTP image stream: media/http_frames.cpp
+  ELibDReturnCode GetCurrentFrameData(VideoFrameInfo& frame);
+  ELibDReturnCode GetCurrentJPEGFrameData(VideoFrameInfo& frame, int& received);
+  ELibDReturnCode GetCurrentH264FrameData(VideoFrameInfo& frame, int& received);
+  ELibDReturnCode GetCurrentMPEGFrameData(VideoFrameInfo& frame, int& received);
+  bool ResetStreamBuffer();
+  void ReleaseStreamBuffer();
+  ELibDReturnCode GetElementaryFrame(VideoFrameInfo& frame, const vexa::ElementaryCodec& codec, int& received);
+  bool TakeUnit(VideoFrameInfo& frame, const vexa::ElementaryCodec& codec, unsigned int length);
+
   // Pictures from RTP: media/rtp_pictures.cpp, media/rtp_frames.cpp
   ELibDReturnCode GetRtpCurrentVideoFrameH264(VideoFrameInfo& frame);
-  ELibDReturnCode GetRtpCurrentVideoFrameMPEG4(VideoFrameInfo& frame);
-  ELibDReturnCode GetRtpCurrentVideoFrameJPEG(VideoFrameInfo& frame);
-  /// `out` has room for 4096 bytes: the JFIF header and the first payload's scan data. False leaves it undefined.
-  bool RTPJpegToJIF(unsigned char* out, unsigned int* outLength, unsigned char* payload, unsigned int length);
-  ELibDReturnCode BeginRtpFrame(VideoFrameInfo& frame, const vexa::PictureRules& rules);
-  ELibDReturnCode FinishRtpFrame(VideoFrameInfo& frame, vexa::PacketRunPlace run,
-                                 const vexa::AssembledPicture& picture);
-  ELibDReturnCode CollectJpegPicture(vexa::PacketRunPlace& run);
 
   ELibDReturnCode CollectPicture(vexa::PacketRunPlace& run);
   int ReceivePacket(int timeout);
+  bool PacketWaits(int timeout);
   ELibDReturnCode NothingYet();
   void StampPicture(VideoFrameInfo& frame, std::uint32_t timestamp);
+
+  // Sound: media/audio.cpp
+  SLibDAudioInfo AudioInfo();
 
   // Shared with model classes: device/system_info.cpp, device/edge_storage.cpp
   ELibDReturnCode GetCommonSystemInfo(SLibDSystemInfo& info, const std::string& answer);
@@ -265,7 +297,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   SLibDFixedPTZControlInfo m_FixedPTZControlInfo;
   SLibDCameraInfo m_CameraInfo;  ///< guarded by m_ConnectionLock
   CResolutionFilterFacade m_ResolutionFilter;
-  SLibDAudioInfo m_AudioInfo;
+  SLibDAudioInfo m_AudioInfo;            ///< guarded by m_ConnectionLock
   SLibDPTZControlInfo m_PTZControlInfo;  ///< guarded by m_ConnectionLock
   SLibDIoBoxInfo m_IoBoxInfo;
   std::string m_LatestErrorText;         ///< written and read through Fail, ClearLatestError and LatestErrorCode
@@ -309,6 +341,13 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   std::vector<SPacketInfo> m_RtpPackets;       ///< sorted; the data lie in m_RtpPacketBuffer
   unsigned char* m_RtpPacketBuffer = nullptr;  ///< 2097152 bytes from malloc while RTP streams
 
+  // The bytes of an elementary HTTP stream: the streaming thread's
+  unsigned char* m_StreamBuffer = nullptr;
+  std::size_t m_StreamBufferSize = 0;
+  unsigned char* m_StreamFrameStart = nullptr;  ///< first byte of the frame not handed out yet
+  unsigned char* m_StreamSearchPos = nullptr;   ///< where the next start code is looked for
+  unsigned char* m_StreamWriteEnd = nullptr;    ///< end of the bytes received
+
   // The streaming thread and the frame queue
   CSimpleLock m_VideoStateLock;
   bool m_StopVideoRequested VEXA_GUARDED_BY(m_VideoStateLock) = false;
@@ -331,6 +370,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   std::string m_CameraInquiryCache VEXA_GUARDED_BY(m_CameraInquiryLock);
   CSimpleLock m_AudioLock;
   int m_AudioSocket VEXA_GUARDED_BY(m_AudioLock) = -1;
+  std::time_t m_LastAudioTime VEXA_GUARDED_BY(m_AudioLock) = 0;  ///< of the last data, or of the opening
   CSimpleLock m_IoStreamLock;
   int m_IoStreamSocket VEXA_GUARDED_BY(m_IoStreamLock) = -1;
   std::vector<SLibDPinInfo> m_PendingPins VEXA_GUARDED_BY(m_IoStreamLock);

@@ -22,6 +22,17 @@ int clamp_to_int(long long value) {
 
 int leading_int(const std::string& text) { return clamp_to_int(std::strtoll(text.c_str(), nullptr, 10)); }
 
+std::optional<int> take_int(std::string_view& text) {
+  const std::size_t begin = std::min(text.find_first_not_of(" \t\n\v\f\r"), text.size());
+  const std::size_t sign = text.substr(begin).starts_with('-') || text.substr(begin).starts_with('+') ? 1 : 0;
+  const std::string_view digits = text.substr(begin + sign);
+  const std::size_t count = std::min(digits.find_first_not_of("0123456789"), digits.size());
+  if (count == 0) return std::nullopt;
+  const std::string number(text.substr(begin, sign + count));
+  text.remove_prefix(begin + number.size());
+  return leading_int(number);
+}
+
 bool is_ascii_alphanumeric(char c) {
   return (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || (c >= '0' && c <= '9');
 }

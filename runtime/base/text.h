@@ -26,6 +26,10 @@ int clamp_to_int(long long value);
 /// follows is passed over, no digit is 0. Values beyond int become its limits.
 int leading_int(const std::string& text);
 
+/// The number that `text` begins with behind blanks, as scanf's "%d" takes it: `text` begins behind it from then on.
+/// Nothing, and `text` stays, when there is no digit. Values beyond int become its limits.
+std::optional<int> take_int(std::string_view& text);
+
 /// ASCII letters and digits, whatever the host's locale.
 bool is_ascii_alphanumeric(char c);
 

@@ -1,23 +1,8 @@
 #include "transport/wire/rtsp_answer.h"
 
-#include <cstdio>
-#include <string>
-
 #include "runtime/base/text.h"
 
 namespace vexa {
-namespace {
-
-/// The number that a text begins with behind blanks, as scanf's "%d" reads it; numbers beyond int become its limits.
-std::optional<int> scanned_int(std::string_view text) {
-  long long value = 0;
-  // NOLINTNEXTLINE(cert-err34-c): what is no number is told by the count.
-  if (std::sscanf(std::string(text).c_str(), "%lld", &value) != 1) return std::nullopt;
-  return clamp_to_int(value);
-}
-
-}  // namespace
-
 bool rtsp_header_complete(std::string_view looked_at, std::size_t latest) {
   constexpr std::string_view kEnd = "\r\n\r\n";
   const std::size_t begin = latest < kEnd.size() ? latest : latest - kEnd.size();
@@ -30,9 +15,9 @@ RtpClock rtp_clock(std::string_view answer) {
   // Kept: the first rtpmap line counts, whatever its track; cameras describe their video first.
   const auto rtpmap = text_after(before_nul(answer), "rtpmap:");
   if (!rtpmap) return {Found::kNoRtpmap, 0};
-  const auto rate_text = text_after(*rtpmap, "/");
+  auto rate_text = text_after(*rtpmap, "/");
   if (!rate_text) return {Found::kNoSlash, 0};
-  const auto rate = scanned_int(*rate_text);
+  const auto rate = take_int(*rate_text);
   return rate ? RtpClock{Found::kRate, *rate} : RtpClock{Found::kNoNumber, 0};
 }
 
@@ -41,8 +26,8 @@ std::optional<std::string_view> range_clock_text(std::string_view answer) {
 }
 
 std::optional<int> session_number(std::string_view answer) {
-  const auto session = text_after(before_nul(answer), "Session:");
-  return session ? scanned_int(*session) : std::nullopt;
+  auto session = text_after(before_nul(answer), "Session:");
+  return session ? take_int(*session) : std::nullopt;
 }
 
 }  // namespace vexa

@@ -18,6 +18,13 @@ Formatted rtsp_setup_udp(const RtspHead& head, int port) {
                        head.url.c_str(), head.cseq, port, port + 1, head.credentials);
 }
 
+Formatted rtsp_setup_interleaved(const RtspHead& head) {
+  return format_within(kRequestRoom,
+                       "SETUP %s/video RTSP/1.0\r\nCSeq: %d\r\n"
+                       "Transport: RTP/AVP/TCP;unicast;interleaved=0-1;\r\nAuthorization: Basic %s\r\n\r\n",
+                       head.url.c_str(), head.cseq, head.credentials);
+}
+
 Formatted rtsp_play(const RtspHead& head, const RtspPlay& play) {
   return format_within(kRequestRoom,
                        "PLAY %s RTSP/1.0\r\nCSeq: %d\r\nSession: %d\r\nScale: %d\r\nRange: npt=0.000-\r\n"

@@ -24,6 +24,8 @@ struct RtspPlay {
 Formatted rtsp_describe(const RtspHead& head);
 /// Names `port` and the one behind it for RTP over UDP.
 Formatted rtsp_setup_udp(const RtspHead& head, int port);
+/// Takes RTP inside the RTSP connection.
+Formatted rtsp_setup_interleaved(const RtspHead& head);
 Formatted rtsp_play(const RtspHead& head, const RtspPlay& play);
 Formatted rtsp_get_parameter(const RtspHead& head, int session);
 Formatted rtsp_teardown(const RtspHead& head, int session);

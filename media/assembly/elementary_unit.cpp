@@ -1,0 +1,61 @@
+#include "media/assembly/elementary_unit.h"
+
+#include <algorithm>
+
+#include "media/assembly/camera_position.h"
+#include "media/assembly/start_code.h"
+#include "vexa/video_info.h"
+
+namespace vexa {
+namespace {
+
+UnitKind h264_kind(std::uint8_t code) {
+  switch (code & 0x1f) {
+    case 1:
+    case 5:
+      return UnitKind::kPicture;
+    case 6:
+      return UnitKind::kUserData;
+    case 7:
+      return UnitKind::kKeyHeader;
+    default:
+      return UnitKind::kOther;
+  }
+}
+
+UnitKind mpeg4_kind(std::uint8_t code) {
+  switch (code) {
+    case 0xb0:
+      return UnitKind::kKeyHeader;
+    case 0xb2:
+      return UnitKind::kUserData;
+    case 0xb6:
+      return UnitKind::kPicture;
+    default:
+      return UnitKind::kOther;
+  }
+}
+
+}  // namespace
+
+UnitKind ElementaryCodec::kind_of(Bytes unit) const {
+  // Safe: what stands before a stream's first start code can be shorter than one.
+  if (unit.size() <= start_code.length) return UnitKind::kOther;
+  return kind_of_code(unit[start_code.length]);
+}
+
+Bytes ElementaryCodec::text_of(Bytes unit) const { return unit.subspan(std::min(text_offset, unit.size())); }
+
+const ElementaryCodec kH264Elementary = {{find_start_code_h264, kStartCodeLengthH264},
+                                         h264_kind,
+                                         kSeiTextOffset,
+                                         VIDEO_FRAME_H264_KEY,
+                                         VIDEO_FRAME_H264_DELTA};
+
+const ElementaryCodec kMpeg4Elementary = {{find_start_code_mpeg4, kStartCodeLengthMpeg4},
+                                          mpeg4_kind,
+                                          kMpeg4UserDataTextOffset,
+                                          VIDEO_FRAME_MPEG4_KEY,
+                                          VIDEO_FRAME_MPEG4_DELTA};
+
+}  // namespace vexa

@@ -1,0 +1,35 @@
+// Elementary streams over HTTP: what each unit between two start codes is to a picture.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+
+#include "runtime/base/bytes.h"
+#include "transport/wire/stream_window.h"
+
+namespace vexa {
+
+enum class UnitKind {
+  kKeyHeader,  ///< what key pictures are led by
+  kUserData,   ///< may tell where the camera looks; no part of the picture
+  kPicture,    ///< ends the picture
+  kOther       ///< part of the picture, and so is a unit cut short
+};
+
+/// What a reader must know of a codec.
+struct ElementaryCodec {
+  StartCode start_code;
+  UnitKind (*kind_of_code)(std::uint8_t code);  ///< by the byte behind the start code
+  std::size_t text_offset;                      ///< of user data, from the start code
+  std::int32_t key_frame;                       ///< ELibDVideoFrameType values
+  std::int32_t delta_frame;
+
+  UnitKind kind_of(Bytes unit) const;
+  /// The part of a user-data unit that is text.
+  Bytes text_of(Bytes unit) const;
+};
+
+extern const ElementaryCodec kH264Elementary;
+extern const ElementaryCodec kMpeg4Elementary;
+
+}  // namespace vexa

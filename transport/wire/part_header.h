@@ -1,0 +1,12 @@
+// The small header before each picture of a multipart stream.
+#pragma once
+
+#include <optional>
+#include <string_view>
+
+namespace vexa {
+
+/// The bytes that follow, as "DataLen:" announces them; nothing when it does not, or announces less than none.
+std::optional<int> announced_length(std::string_view part_header);
+
+}  // namespace vexa

@@ -1,0 +1,50 @@
+// The bytes of an elementary stream between the socket and the frame cut out of them.
+#pragma once
+
+#include <cstddef>
+#include <span>
+
+#include "runtime/base/bytes.h"
+
+namespace vexa {
+
+/// Where the next start code begins in `length` bytes; null when there is none.
+using StartCodeFinder = const unsigned char* (*)(const unsigned char* data, unsigned int length);
+
+struct StartCode {
+  StartCodeFinder find;
+  std::size_t length;  ///< bytes of one start code
+};
+
+/// Cuts frames out of a buffer; a frame runs from one start code to the next. Holds no bytes: the buffer and the places
+/// in it are the caller's, and outlive the window.
+class StreamWindow {
+ public:
+  /// Places in the buffer. frame_start <= write_end always; search may be anywhere behind frame_start.
+  struct Places {
+    unsigned char*& frame_start;  ///< first byte of the frame that is not handed out yet
+    unsigned char*& search;       ///< where the next start code is looked for
+    unsigned char*& write_end;    ///< end of the bytes received
+  };
+
+  StreamWindow(std::span<unsigned char> buffer, Places places) : buffer_(buffer), places_(places) {}
+
+  enum class Cut { kFrame, kNoneYet, kTooLong };
+
+  /// Copies the next whole frame to `room` and steps behind it; `length` is the frame's then. A frame that is longer
+  /// than the room stays where it is, for ever.
+  Cut cut_frame(StartCode code, std::span<unsigned char> room, std::size_t& length);
+
+  /// Moves the frame under work to the buffer's start when little room is left behind it.
+  void make_room(StartCode code);
+
+  /// Where received bytes go; their count is told to `received`.
+  std::span<unsigned char> free_room() const;
+  void received(std::size_t count) { places_.write_end += count; }
+
+ private:
+  std::span<unsigned char> buffer_;
+  Places places_;
+};
+
+}  // namespace vexa
