@@ -25,7 +25,9 @@ namespace vexa {
 struct DriverState;
 class StreamWindow;
 struct ElementaryCodec;
+struct AssembledPicture;
 struct PacketRunPlace;
+struct PictureRules;
 struct Failure;
 struct Formatted;
 }  // namespace vexa
@@ -229,6 +231,14 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
 
   // Pictures from RTP: media/rtp_pictures.cpp, media/rtp_frames.cpp
   ELibDReturnCode GetRtpCurrentVideoFrameH264(VideoFrameInfo& frame);
+  ELibDReturnCode GetRtpCurrentVideoFrameMPEG4(VideoFrameInfo& frame);
+  ELibDReturnCode GetRtpCurrentVideoFrameJPEG(VideoFrameInfo& frame);
+  /// `out` has room for 4096 bytes: the JFIF header and the first payload's scan data. False leaves it undefined.
+  bool RTPJpegToJIF(unsigned char* out, unsigned int* outLength, unsigned char* payload, unsigned int length);
+  ELibDReturnCode BeginRtpFrame(VideoFrameInfo& frame, const vexa::PictureRules& rules);
+  ELibDReturnCode FinishRtpFrame(VideoFrameInfo& frame, vexa::PacketRunPlace run,
+                                 const vexa::AssembledPicture& picture);
+  ELibDReturnCode CollectJpegPicture(vexa::PacketRunPlace& run);
 
   ELibDReturnCode CollectPicture(vexa::PacketRunPlace& run);
   int ReceivePacket(int timeout);
