@@ -20,15 +20,16 @@ using test::InZone;
 
 constexpr std::int64_t kYear1900 = -2208988800;
 constexpr std::int64_t kLastDays = 253402128000;  // 9999-12-30
-constexpr std::int64_t kDay = 86400;
+constexpr std::int64_t kDayInSeconds = 86400;
 constexpr char kZoneNames[][17] = {"UTC", "Europe/Amsterdam", "Australia/Sydney", "Asia/Kolkata"};
 
 std::uint64_t count_of(const CRealTime& time) { return ticks_of(time.GetUtcFileTime()); }
 
 /// A time of whole milliseconds of the years 1900 to 9999, but none near the second before 1970, which no fields name.
 CRealTime any_time() {
-  const auto seconds = *rc::gen::suchThat(rc::gen::inRange(kYear1900, kLastDays),
-                                          [](std::int64_t second) { return second < -kDay || second > kDay; });
+  const auto seconds = *rc::gen::suchThat(rc::gen::inRange(kYear1900, kLastDays), [](std::int64_t second) {
+    return second < -kDayInSeconds || second > kDayInSeconds;
+  });
   const auto milliseconds = *rc::gen::inRange<std::uint64_t>(0, 1000);
   return CRealTime(file_time_of(ticks_of_unix(seconds, milliseconds * kTicksPerMillisecond).value()));
 }
