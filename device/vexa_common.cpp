@@ -12,6 +12,9 @@ namespace {
 /// Room for what a camera commonly lists, so that filling a record does not allocate again.
 constexpr std::size_t kListRoom = 32;
 
+/// Room for every text of an error, so that recording one does not allocate.
+constexpr std::size_t kErrorRoom = 1024;
+
 template <typename... Lists>
 void reserve_lists(Lists&... lists) {
   (lists.reserve(kListRoom), ...);
@@ -33,6 +36,7 @@ CVexaCommon::CVexaCommon() : m_InquirySizes(kInquirySizes), m_State(std::make_un
   reserve_lists(m_FixedPTZControlInfo.reserved1, m_FixedPTZControlInfo.zoomSteps, m_FixedPTZControlInfo.brightModes,
                 m_FixedPTZControlInfo.dayNightModes);
   reserve_lists(m_IoBoxInfo.pins, m_IoBoxInfo.detections1, m_IoBoxInfo.detections2);
+  m_LatestErrorText.reserve(kErrorRoom);
   m_StopVideoEvent = CreateEvent(nullptr, 1, 0, nullptr);
 }
 

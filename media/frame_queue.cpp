@@ -1,10 +1,25 @@
 // CVexaCommon: the frames that wait for the host.
+#include <new>
 #include <utility>
 
 #include "device/driver_state.h"
 #include "media/assembly/queue_policy.h"
 #include "runtime/base/sync.h"
 #include "vexa/vexa_common.h"
+
+namespace {
+
+/// False when memory is short; the frame stays the caller's.
+bool append_frame(std::deque<CVexaCommon::VideoFrameInfo>& queue, const CVexaCommon::VideoFrameInfo& frame) {
+  try {
+    queue.push_back(frame);
+    return true;
+  } catch (const std::bad_alloc&) {
+    return false;
+  }
+}
+
+}  // namespace
 
 // The caller holds m_FrameQueueLock.
 void CVexaCommon::FreeFrame(VideoFrameInfo& frame) {
@@ -53,12 +68,15 @@ void CVexaCommon::PropulateFrameInfoList(CVexaCommon* driver, VideoFrameInfo& fr
     driver->FreeFrame(queue.front());
     queue.pop_front();
   }
-  if (decision.append) {
-    queue.push_back(frame);
+  if (decision.append && append_frame(queue, frame)) {
     frame.data = nullptr;  // the queue's from here on
-  } else {
-    driver->FreeFrame(frame);
+    return;
   }
+  driver->FreeFrame(frame);
+  if (!decision.append) return;
+  // Memory was short, which counts as a time-out; no picture is shown that may refer to the lost one.
+  driver->m_VideoTimedOut = true;
+  if (frame.frameType != VIDEO_FRAME_JPEG) waitKey = true;
 }
 
 ELibDReturnCode CVexaCommon::GetCurrentVideoFrame(SLibDVideoFrameInfo& frame) {

@@ -4,6 +4,7 @@
 #include <cerrno>
 #include <cstdlib>
 #include <new>
+#include <utility>
 
 #include "device/driver_state.h"
 #include "device/raised_timeout.h"
@@ -29,7 +30,11 @@ ELibDReturnCode CVexaCommon::StartVideoStreaming() {
   const vexa::Guard guard(m_State->start_stop_lock);
   StopVideoStreaming();
   if (IsStopRequested()) return LIBD_FAILED;  // another thread's, which waits for the lock
-  return StartLiveVideo();
+  try {
+    return StartLiveVideo();
+  } catch (const std::bad_alloc&) {
+    return AbandonStart(ENOMEM);
+  }
 }
 
 ELibDReturnCode CVexaCommon::StartLiveVideo() {
@@ -88,7 +93,7 @@ ELibDReturnCode CVexaCommon::StartStreamingThread(const std::string& codec) {
   {
     const vexa::Guard guard(m_FrameQueueLock);
     if (codec != "JPEG") m_LargeFrameBuffers = false;
-    delete[] m_StagingBuffer;
+    delete[] std::exchange(m_StagingBuffer, nullptr);
     m_StagingBufferSize = m_LargeFrameBuffers ? kLargeFrameCapacity : kFrameCapacity;
     m_StagingBuffer = new unsigned char[m_StagingBufferSize]();
   }
@@ -141,7 +146,11 @@ void CVexaCommon::TakeFrame(VideoFrameInfo& frame) {
 ELibDReturnCode CVexaCommon::ReadFrame(VideoFrameInfo& frame) {
   if (!m_EdgeStoragePlayback && !m_RtpLiveMode) return GetCurrentFrameData(frame);
   const ELibDReturnCode result = GetRtpCurrentVideoFrame(StreamCodec(), frame);
-  KeepAlive();
+  try {
+    KeepAlive();
+  } catch (const std::bad_alloc&) {
+    // The next one is due soon; the picture must not be lost for it.
+  }
   return result;
 }
 

@@ -3,9 +3,11 @@
 #include <sys/socket.h>
 
 #include <algorithm>
+#include <cerrno>
 #include <chrono>
 #include <cstdarg>
 #include <cstdio>
+#include <new>
 #include <thread>
 #include <utility>
 #include <vector>
@@ -236,7 +238,13 @@ bool CVexaCommon::parse_clock(const char* text) {
 void CVexaCommon::rtp_over_udp_close() {
   if (m_RtspSocket == -1 && m_StreamSocket == -1) return;
   // Kept: the switch that recordings are played with holds for live sessions too.
-  if (!m_NoTearDown) TearDown();
+  if (!m_NoTearDown) {
+    try {
+      TearDown();
+    } catch (const std::bad_alloc&) {
+      FailSystem(ENOMEM);
+    }
+  }
   rtp_stream_socket_close_all();
 }
 

@@ -3,6 +3,7 @@
 #include <stdexcept>
 
 #include "tests/media/media_driver.h"
+#include "tests/support/failing_new.h"
 
 namespace vexa_test {
 namespace {
@@ -125,6 +126,36 @@ TEST_F(FrameQueue, AFrameForAHostWithoutASinkIsTakenAllTheSame) {
   SLibDVideoFrameInfo frame;
   EXPECT_EQ(driver_.GetCurrentVideoFrame(frame), LIBD_OK);
   EXPECT_EQ(driver_.GetCurrentVideoFrame(frame), LIBD_NO_FRAME);
+}
+
+struct ShortMemoryCase {
+  std::int32_t type;
+  bool waits_for_key;
+};
+
+TEST_F(FrameQueue, AFrameThatFindsNoMemoryInTheQueueIsFreedAsATimeOut) {
+  for (const ShortMemoryCase& c :
+       {ShortMemoryCase{VIDEO_FRAME_JPEG, false}, ShortMemoryCase{VIDEO_FRAME_H264_DELTA, true},
+        ShortMemoryCase{VIDEO_FRAME_MPEG4_KEY, true}}) {
+    wait_key_ = false;
+    bool failed = false;
+    for (int i = 0; i < 1000 && !failed; ++i) {  // the queue fetches memory for several frames at a time
+      CVexaCommon::VideoFrameInfo frame;
+      frame.capacity = 8;
+      frame.data = new unsigned char[frame.capacity];
+      frame.frameType = c.type;
+      const std::size_t waiting = driver_.m_FrameQueue.size();
+      const AllocationFailure failure(0);
+      MediaDriver::ProcessCurrentFrameData(&driver_, frame, wait_key_, LIBD_OK);
+      failed = failure.happened();
+      EXPECT_EQ(frame.data, nullptr);
+      if (failed) EXPECT_LE(driver_.m_FrameQueue.size(), waiting);
+      EXPECT_EQ(driver_.m_VideoTimedOut, failed);
+    }
+    EXPECT_TRUE(failed) << c.type;
+    EXPECT_EQ(wait_key_, c.waits_for_key) << c.type;
+    driver_.ClearFrameQueue();
+  }
 }
 
 class ThrowingSink : public CDataSink {

@@ -42,6 +42,8 @@ class MediaDriver : public TestDriver {
   using CVexaCommon::m_StopVideoEvent;
   using CVexaCommon::m_StopVideoRequested;
   using CVexaCommon::m_StreamingThread;
+  using CVexaCommon::m_StreamWaitMs;
+  using CVexaCommon::m_VideoStateLock;
   using CVexaCommon::m_VideoTimedOut;
   using CVexaCommon::ProcessCurrentFrameData;
   using CVexaCommon::PropulateFrameInfoList;

@@ -5,7 +5,9 @@
 #include <thread>
 
 #include "tests/media/live_camera.h"
+#include "tests/support/failing_new.h"
 #include "tests/support/process_state.h"
+#include "vexa/runtime.h"
 
 namespace vexa_test {
 namespace {
@@ -60,6 +62,66 @@ TEST(VideoStart, TakesTurnsWithStartsAndStopsOfOtherThreads) {
   EXPECT_TRUE(eventually([&] { return running_threads() == threads; })) << running_threads() << " of " << threads;
   EXPECT_TRUE(eventually([&] { return open_descriptors() == descriptors + 2; })) << "the stop event alone is open";
   EXPECT_EQ(camera->sessions(), 0u);
+}
+
+TEST(VideoStart, ThatRunsOutOfMemoryAnywhereFailsAndLeavesNothingBehind) {
+  LiveCamera camera(camera_options());
+  const std::size_t descriptors = open_descriptors();
+  bool failed = true;
+  int allocation = 0;
+  for (; failed && allocation < 2000; ++allocation) {
+    MediaDriver driver;
+    camera.introduce(driver);
+    driver.m_NoTearDown = true;  // only the start's own allocations are counted
+    ELibDReturnCode code = LIBD_NOT_SUPPORTED;
+    {
+      const AllocationFailure failure(allocation);
+      code = driver.StartVideoStreaming();
+      failed = failure.happened();
+    }
+    EXPECT_EQ(code, failed ? LIBD_FAILED : LIBD_OK) << "allocation " << allocation;
+    EXPECT_EQ(driver.m_ConnectionInfo.timeout, 5000) << "allocation " << allocation;
+    if (failed) expect_stopped(driver);
+  }
+  EXPECT_FALSE(failed);
+  EXPECT_GT(allocation, 20);
+  EXPECT_TRUE(eventually([&] { return open_descriptors() == descriptors; }));
+}
+
+TEST(VideoStop, ThatRunsOutOfMemoryClosesEverythingAllTheSame) {
+  LiveCamera camera(camera_options());
+  bool failed = true;
+  for (int allocation = 0; failed && allocation < 100; ++allocation) {
+    MediaDriver driver;
+    camera.introduce(driver);
+    ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+    {
+      const AllocationFailure failure(allocation);
+      EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+      failed = failure.happened();
+    }
+    expect_stopped(driver);
+  }
+  EXPECT_FALSE(failed);
+}
+
+TEST(StreamingThread, CountsAFrameWithoutMemoryAsATimeOut) {
+  MediaDriver driver;
+  driver.m_StreamWaitMs = 600000;  // it stays with its first frame until the stop
+  std::thread thread([&] {
+    const AllocationFailure failure(0);
+    MediaDriver::StreamingThread(static_cast<CVexaCommon*>(&driver));
+    EXPECT_TRUE(failure.happened());
+  });
+  SLibDVideoFrameInfo frame;
+  EXPECT_TRUE(eventually([&] { return driver.GetCurrentVideoFrame(frame) == LIBD_TIMEOUT; }));
+  EXPECT_EQ(driver.GetCurrentVideoFrame(frame), LIBD_NO_FRAME);
+  {
+    const vexa::Guard guard(driver.m_VideoStateLock);
+    driver.m_StopVideoRequested = true;
+  }
+  SetEvent(driver.m_StopVideoEvent);
+  thread.join();
 }
 
 }  // namespace
