@@ -1,10 +1,11 @@
 // CVexaCommon: collecting the packets of the next picture.
-#include <algorithm>
 #include <chrono>
 
 #include "device/driver_state.h"
 #include "runtime/base/sync.h"
+#include "transport/wait_budget.h"
 #include "transport/wire/rtp_header.h"
+#include "vexa/runtime.h"
 #include "vexa/vexa_common.h"
 
 namespace {
@@ -30,11 +31,20 @@ ELibDReturnCode CVexaCommon::CollectPicture(vexa::PacketRunPlace& run) {
     // Packets that never make a picture must not keep the thread from its keep-alive and its stop.
     if (now > give_up || IsStopRequested()) return NothingYet();
     const auto deadline = collector.deadline();
-    const int wait = deadline ? std::min(timeout, milliseconds_until(*deadline)) : timeout;
-    if (ReceivePacket(wait) >= 0) continue;
-    if (LatestErrorCode() != LIBD_TIMEOUT) return LatestErrorCode();
-    if (!deadline) return NothingYet();
+    const int until_look = deadline ? milliseconds_until(*deadline) : timeout;
+    // A look at what stands complete falls due before the read would time out: that is no silence of the camera's.
+    if (until_look < timeout && !PacketWaits(until_look)) continue;
+    if (ReceivePacket(timeout) >= 0) continue;
+    if (IsStopRequested() || LatestErrorCode() == LIBD_TIMEOUT) return NothingYet();
+    return LatestErrorCode();
   }
+}
+
+// Also true when the read would fail at once.
+bool CVexaCommon::PacketWaits(int timeout) {
+  int stop = -1;
+  eventFd(m_StopVideoEvent, stop);
+  return vexa::WaitBudget(timeout).wait_readable_unless(m_StreamSocket, stop) != 0;
 }
 
 int CVexaCommon::ReceivePacket(int timeout) {

@@ -21,6 +21,8 @@ vexa::Bytes bytes_of(const char* buffer, int length) {
   return {reinterpret_cast<const unsigned char*>(buffer), static_cast<std::size_t>(length)};
 }
 
+bool is_signalled(int event) { return event != -1 && vexa::WaitBudget(0).wait_readable(event) == 1; }
+
 void nap(std::chrono::microseconds length) {
   if (length.count() == 0) return;
   const timespec duration{0, static_cast<long>(std::chrono::nanoseconds(length).count())};
@@ -38,6 +40,7 @@ int CVexaCommon::rtp_over_udp_recvn(int socket, char* buffer, int length, int ti
     int stop = -1;
     eventFd(m_StopVideoEvent, stop);
     const int ready = vexa::WaitBudget(timeout).wait_readable_unless(socket, stop);
+    if (ready == 0 && is_signalled(stop)) return -1;  // ended from this side: nothing to record
     if (ready == 0) return Fail(vexa::kReceiveTimedOut);
     if (ready < 0) return FailSystem();
     if (gather != nullptr) nap(gather->woken());

@@ -6,6 +6,7 @@
 #include <utility>
 
 #include "tests/media/rtp_feed.h"
+#include "vexa/runtime.h"
 
 namespace vexa_test {
 namespace {
@@ -156,6 +157,27 @@ TEST_F(RtpFrames, AStreamThatNeverMakesAPictureLetsTheReaderGoAfterTheTimeOut) {
   while (recv(driver_.m_StreamSocket, drained.data(), drained.size(), MSG_DONTWAIT) >= 0) {
   }
   camera.join();
+}
+
+TEST_F(RtpFrames, TheLookAtAStandingKeyPictureIsNoTimeOutOfTheRead) {
+  driver_.m_ConnectionInfo.timeout = 600000;
+  driver_.soil_latest_error();
+  send_picture(kKey);
+  EXPECT_EQ(read(), LIBD_OK);
+  ++sequence_;  // a picture is lost
+  send_picture(kKey);
+  EXPECT_EQ(read(), LIBD_OK);
+  EXPECT_EQ(driver_.LatestErrorCode(), LIBD_FAILED);
+  EXPECT_EQ(driver_.LatestErrorText(), "from before");
+}
+
+TEST_F(RtpFrames, AReadThatAStopEndsIsNoFrameAndNoTimeOut) {
+  driver_.m_ConnectionInfo.timeout = 600000;
+  driver_.soil_latest_error();
+  driver_.m_StopVideoRequested = true;
+  SetEvent(driver_.m_StopVideoEvent);
+  EXPECT_EQ(read(), LIBD_NO_FRAME);
+  EXPECT_EQ(driver_.LatestErrorText(), "from before");
 }
 
 struct StampCase {

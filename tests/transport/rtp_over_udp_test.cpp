@@ -165,10 +165,12 @@ TEST_F(RtpOverUdp, ADatagramThatComesDuringTheWaitIsTaken) {
   late.join();
 }
 
-TEST_F(RtpOverUdp, AStopEndsTheWaitAtOnce) {
+TEST_F(RtpOverUdp, AStopEndsTheWaitAtOnceAndIsNoTimeOut) {
   SetEvent(driver_.m_StopVideoEvent);
   SPacketInfo packet;
   EXPECT_EQ(receive(packet, 600000), -1);
+  EXPECT_EQ(driver_.LatestErrorCode(), LIBD_FAILED);
+  EXPECT_EQ(driver_.LatestErrorText(), "from before");
 }
 
 void ignore_signal(int) {}
