@@ -23,7 +23,7 @@ inline unsigned next_driver_number() {
 }
 
 struct DriverState {
-  const unsigned number = next_driver_number();
+  const unsigned number = next_driver_number();  ///< tells the driver from all others, also from those gone
   CSimpleLock start_stop_lock;  ///< held by a start or stop of video from begin to end; outermost
   CSimpleLock error_lock;       ///< guards m_LatestErrorCode and m_LatestErrorText; innermost
   CSimpleLock filter_lock;      ///< guards m_ResolutionFilter and m_FixedCameraInfo; taken before m_ConnectionLock

@@ -12,6 +12,14 @@ namespace {
 /// Room for what a camera commonly lists, so that filling a record does not allocate again.
 constexpr std::size_t kListRoom = 32;
 
+/// The code of the exchange that this thread is in. What other threads do with the same driver meanwhile (the streaming
+/// thread always does something) must not change the result of this one's operation.
+struct OwnCode {
+  unsigned driver = 0;
+  ELibDReturnCode code = LIBD_FAILED;
+};
+thread_local OwnCode own_code;
+
 /// Room for every text of an error, so that recording one does not allocate.
 constexpr std::size_t kErrorRoom = 1024;
 
@@ -68,7 +76,10 @@ ELibDReturnCode CVexaCommon::InitializeFixedVideoParams(ELibDVideoStandard, int,
 
 int CVexaCommon::Fail(const vexa::Failure& failure) {
   const vexa::Guard guard(m_State->error_lock);
-  if (failure.code != LIBD_FAILED) m_LatestErrorCode = failure.code;
+  if (failure.code != LIBD_FAILED) {
+    m_LatestErrorCode = failure.code;
+    own_code = {m_State->number, failure.code};
+  }
   m_LatestErrorText = failure.text;
   return -1;
 }
@@ -90,9 +101,12 @@ int CVexaCommon::FailWait(int answer, const vexa::Failure& expired) {
 void CVexaCommon::ClearLatestError() {
   const vexa::Guard guard(m_State->error_lock);
   m_LatestErrorCode = LIBD_FAILED;
+  own_code = {m_State->number, LIBD_FAILED};
 }
 
+// The calling thread's own; the latest of all threads when it has had no exchange with this driver.
 ELibDReturnCode CVexaCommon::LatestErrorCode() {
+  if (own_code.driver == m_State->number) return own_code.code;
   const vexa::Guard guard(m_State->error_lock);
   return m_LatestErrorCode;
 }

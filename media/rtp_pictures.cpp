@@ -35,8 +35,8 @@ ELibDReturnCode CVexaCommon::CollectPicture(vexa::PacketRunPlace& run) {
     // A look at what stands complete falls due before the read would time out: that is no silence of the camera's.
     if (until_look < timeout && !PacketWaits(until_look)) continue;
     if (ReceivePacket(timeout) >= 0) continue;
-    if (IsStopRequested() || LatestErrorCode() == LIBD_TIMEOUT) return NothingYet();
-    return LatestErrorCode();
+    const ELibDReturnCode failure = LatestErrorCode();
+    return failure == LIBD_TIMEOUT || IsStopRequested() ? NothingYet() : failure;
   }
 }
 

@@ -100,5 +100,39 @@ TEST(SetCameraInfoFromId, GivesTheLatestErrorsCode) {
   EXPECT_EQ(camera.finish(), "");
 }
 
+TEST(LatestError, KeepsEachThreadsCodeOfItsOwnExchange) {
+  TestDriver driver;
+  driver.ClearLatestError();
+  driver.Fail({LIBD_UNAUTHORIZED, "refused"});
+  std::thread([&] {
+    EXPECT_EQ(driver.LatestErrorCode(), LIBD_UNAUTHORIZED) << "a thread without an exchange sees the latest of all";
+    driver.ClearLatestError();
+    EXPECT_EQ(driver.LatestErrorCode(), LIBD_FAILED);
+    driver.Fail({LIBD_TIMEOUT, "silent"});
+    EXPECT_EQ(driver.LatestErrorCode(), LIBD_TIMEOUT);
+  }).join();
+  EXPECT_EQ(driver.LatestErrorCode(), LIBD_UNAUTHORIZED);
+  EXPECT_EQ(driver.m_LatestErrorCode, LIBD_TIMEOUT);
+  EXPECT_EQ(driver.LatestErrorText(), "silent");
+}
+
+TEST(LatestError, OfOneDriverIsNotAnothers) {
+  TestDriver first;
+  first.Fail({LIBD_TIMEOUT, "silent"});
+  TestDriver second;
+  EXPECT_EQ(second.LatestErrorCode(), LIBD_FAILED);
+  second.Fail({LIBD_UNAUTHORIZED, "refused"});
+  EXPECT_EQ(first.LatestErrorCode(), LIBD_TIMEOUT);
+  EXPECT_EQ(second.LatestErrorCode(), LIBD_UNAUTHORIZED);
+}
+
+TEST(LatestError, OfADriverThatIsGoneIsNotThatOfTheNextInItsPlace) {
+  for (int i = 0; i < 3; ++i) {
+    TestDriver driver;
+    EXPECT_EQ(driver.LatestErrorCode(), LIBD_FAILED);
+    driver.Fail({LIBD_TIMEOUT, "silent"});
+  }
+}
+
 }  // namespace
 }  // namespace vexa_test

@@ -88,6 +88,7 @@ class TestDriver : public CVexaCommon {
   using CVexaCommon::m_IoStreamSocket;
   using CVexaCommon::m_KeepAlivePeriod;
   using CVexaCommon::m_LastKeepAliveTime;
+  using CVexaCommon::m_LatestErrorCode;
   using CVexaCommon::m_NoTearDown;
   using CVexaCommon::m_PendingPins;
   using CVexaCommon::m_PlaybackScale;
