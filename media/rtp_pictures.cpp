@@ -1,4 +1,5 @@
 // CVexaCommon: collecting the packets of the next picture.
+#include <algorithm>
 #include <chrono>
 
 #include "device/driver_state.h"
@@ -12,6 +13,9 @@ namespace {
 
 using Clock = std::chrono::steady_clock;
 
+/// What has arrived is read for at least as long, whatever the time-out.
+constexpr std::chrono::milliseconds kLeastReading{100};
+
 int milliseconds_until(Clock::time_point moment) {
   return static_cast<int>(std::chrono::ceil<std::chrono::milliseconds>(moment - Clock::now()).count());
 }
@@ -21,7 +25,7 @@ int milliseconds_until(Clock::time_point moment) {
 ELibDReturnCode CVexaCommon::CollectPicture(vexa::PacketRunPlace& run) {
   vexa::PacketCollector& collector = m_State->rtp->collector;
   const int timeout = ConnectionTimeout();
-  const auto give_up = Clock::now() + std::chrono::milliseconds(timeout);
+  const auto give_up = Clock::now() + std::max(std::chrono::milliseconds(timeout), kLeastReading);
   for (;;) {
     const auto now = Clock::now();
     if (const auto next = collector.next_picture(now)) {

@@ -159,6 +159,15 @@ TEST_F(RtpFrames, AStreamThatNeverMakesAPictureLetsTheReaderGoAfterTheTimeOut) {
   camera.join();
 }
 
+TEST_F(RtpFrames, WithATimeOutOfNothingOrLessWhatHasArrivedIsRead) {
+  for (const int timeout : {0, -1, -600000}) {
+    driver_.m_ConnectionInfo.timeout = timeout;
+    EXPECT_EQ(read(), LIBD_NO_FRAME);
+    send_picture(kKey);
+    EXPECT_EQ(read(), LIBD_OK) << timeout;
+  }
+}
+
 TEST_F(RtpFrames, TheLookAtAStandingKeyPictureIsNoTimeOutOfTheRead) {
   driver_.m_ConnectionInfo.timeout = 600000;
   driver_.soil_latest_error();
