@@ -69,6 +69,7 @@ bool CVexaCommon::OpenLiveRtp(int stream) {
   m_EdgeStoragePlayback = false;
   if (!AllocateRtpPackets()) return false;
   const SLibDConnectionInfo connection = ConnectionInfo();
+  PrepareCamera();  // once more: an inquiry of the host's may have stored another port meanwhile
   const vexa::RaisedTimeout slow(m_ConnectionInfo.timeout, m_ConnectionLock, {kOpenTimeout, m_SavedTimeout});
   m_RtspSocket = rtp_over_udp_open("rtsp://%s:%d/media/video%d", connection.host.c_str(), kRtspPort, stream);
   if (m_RtspSocket == -1 && m_StreamSocket != -1) {

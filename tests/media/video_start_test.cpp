@@ -64,6 +64,21 @@ TEST(VideoStart, TakesTurnsWithStartsAndStopsOfOtherThreads) {
   EXPECT_EQ(camera->sessions(), 0u);
 }
 
+TEST(VideoStart, AsksPort554AlsoWhenTheHostReadsAnotherFromTheCameraMeanwhile) {
+  LiveCamera camera(camera_options());
+  camera->add_request_fault(RequestFault::slow("RTSPTimeout=60", std::chrono::milliseconds(200)));
+  MediaDriver driver;
+  camera.introduce(driver);
+  std::thread starter([&] { EXPECT_EQ(driver.StartVideoStreaming(), LIBD_OK); });
+  EXPECT_TRUE(camera->journal().wait_for_count("RTSPTimeout=60", 1, std::chrono::seconds(10)));
+  {
+    const vexa::Guard guard(driver.m_ConnectionLock);
+    driver.m_CameraInfo.rtspPort = 8554;
+  }
+  starter.join();
+  EXPECT_EQ(driver.m_CameraInfo.rtspPort, 554);
+}
+
 TEST(VideoStart, ThatRunsOutOfMemoryAnywhereFailsAndLeavesNothingBehind) {
   LiveCamera camera(camera_options());
   const std::size_t descriptors = open_descriptors();
