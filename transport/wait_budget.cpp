@@ -38,6 +38,10 @@ int WaitBudget::wait(int descriptor, short events, int stop) const {
     if (count < 0 && errno == EINTR) continue;
     if (count <= 0) return count;
     if ((entries[1].revents & POLLIN) != 0) return 0;
+    if (entries[0].revents == 0) {
+      entries[1].fd = -1;  // closed or broken: it says nothing of stopping, now or later
+      continue;
+    }
     if ((entries[0].revents & POLLNVAL) != 0) {
       errno = EBADF;
       return -1;

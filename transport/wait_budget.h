@@ -14,7 +14,8 @@ class WaitBudget {
 
   int wait_readable(int descriptor) const;
   int wait_writable(int descriptor) const;
-  /// As wait_readable, and 0 at once when `stop` (which may be -1: none) becomes readable.
+  /// As wait_readable, and 0 at once when `stop` (which may be -1: none) becomes readable; its other
+  /// conditions are passed over.
   int wait_readable_unless(int descriptor, int stop) const;
 
  private:

@@ -1,5 +1,6 @@
 #include "transport/wait_budget.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/socket.h>
 #include <unistd.h>
@@ -62,6 +63,22 @@ TEST_F(WaitBudgetTest, EndsEarlyWhenTheStopDescriptorIsReady) {
   say();
   EXPECT_EQ(WaitBudget(600000).wait_readable_unless(ends_[1], ends_[0]), 0);
   EXPECT_EQ(WaitBudget(10000).wait_readable_unless(ends_[0], -1), 1);
+}
+
+TEST_F(WaitBudgetTest, PassesOverAStopDescriptorThatIsClosedOrHasNoWriter) {
+  int pipe_ends[2];
+  ASSERT_EQ(pipe2(pipe_ends, O_CLOEXEC), 0);
+  close(pipe_ends[1]);
+  const int closed = dup(ends_[0]);
+  close(closed);
+  for (const int stop : {pipe_ends[0], closed}) {
+    EXPECT_EQ(WaitBudget(30).wait_readable_unless(ends_[0], stop), 0);
+  }
+  say();
+  for (const int stop : {pipe_ends[0], closed}) {
+    EXPECT_EQ(WaitBudget(10000).wait_readable_unless(ends_[0], stop), 1);
+  }
+  close(pipe_ends[0]);
 }
 
 TEST_F(WaitBudgetTest, GoesOnAfterASignal) {
