@@ -62,10 +62,10 @@ int CVexaCommon::ReceivePacket(int timeout) {
   rtp.overwritten.clear();
   rtp.ring.written(static_cast<std::uint32_t>(length), rtp.overwritten);
   if (!rtp.overwritten.empty()) rtp.collector.drop_overwritten(rtp.overwritten);
-  if (packet.length >= vexa::kRtpHeaderSize && rtp.takes(packet) &&
-      rtp.collector.add(packet, m_RtpClockRate, Clock::now())) {
-    rtp.ring.keep(packet);
-  }
+  if (packet.length < vexa::kRtpHeaderSize || !rtp.takes(packet)) return length;
+  // Its bytes are its own before it is listed: should memory run out in between, it is lost like one on the wire.
+  rtp.ring.keep(packet);
+  if (!rtp.collector.add(packet, m_RtpClockRate, Clock::now())) rtp.ring.take_back();
   return length;
 }
 

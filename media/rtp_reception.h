@@ -21,7 +21,9 @@ struct PictureName {
 /// Made anew for every stream; the streaming thread's.
 struct RtpReception {
   RtpReception(std::vector<SPacketInfo>& packets, const PictureRules& codec_rules)
-      : rules(codec_rules), collector(packets, codec_rules) {}
+      : rules(codec_rules), collector(packets, codec_rules) {
+    overwritten.reserve(PacketRing::kMostOverwritten);
+  }
 
   /// Packets of another payload type are not collected.
   bool takes(const SPacketInfo& packet) const {
@@ -32,7 +34,7 @@ struct RtpReception {
   PacketRing ring;
   PacketCollector collector;
   BurstGather gather;
-  std::vector<PacketRing::Slot> overwritten;  // room that is used again for every packet
+  std::vector<PacketRing::Slot> overwritten;  // room for all that one packet can overwrite
   std::optional<PictureName> refused;         // the picture that was told damaged and is still listed
 };
 

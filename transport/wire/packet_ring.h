@@ -1,6 +1,7 @@
 // Where datagrams lie in the packet buffer, and which of them a new one overwrites.
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <vector>
 
@@ -15,6 +16,8 @@ class PacketRing {
  public:
   static constexpr std::uint32_t kSize = 2097152;
   static constexpr std::uint32_t kDatagramRoom = 65536;
+  /// What one datagram can overwrite at most, where a kept packet has 12 bytes or more.
+  static constexpr std::size_t kMostOverwritten = kDatagramRoom / 12 + 1;
 
   /// What is remembered of a kept packet.
   struct Slot {
@@ -29,8 +32,11 @@ class PacketRing {
   /// A datagram of `length` bytes was read to next_offset(): appends the slots that it overwrote to `overwritten`.
   void written(std::uint32_t length, std::vector<Slot>& overwritten);
 
-  /// The datagram written last is listed, as `packet`.
+  /// The datagram written last is to be listed, as `packet`.
   void keep(const SPacketInfo& packet);
+
+  /// The packet kept last is not listed after all.
+  void take_back() { this_round_.pop_back(); }
 
   /// No packet is kept any more: begins again at the start, whose memory is still at hand.
   void restart();

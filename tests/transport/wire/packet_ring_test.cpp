@@ -56,6 +56,40 @@ TEST(PacketRing, RestartedItBeginsAt0AndKnowsNoPacket) {
   EXPECT_TRUE(overwritten.empty());
 }
 
+TEST(PacketRing, APacketTakenBackIsNotNamed) {
+  PacketRing ring;
+  std::vector<PacketRing::Slot> overwritten;
+  for (const std::uint32_t number : {1u, 2u, 3u}) {
+    ring.next_offset();
+    ring.written(20, overwritten);
+    ring.keep(numbered(number));
+    if (number == 2) ring.take_back();
+  }
+  for (int i = 0; i < 32; ++i) {
+    ring.next_offset();
+    ring.written(65536, overwritten);
+  }
+  ASSERT_EQ(overwritten.size(), 2u);
+  EXPECT_EQ(overwritten[0].timestamp, 1u);
+  EXPECT_EQ(overwritten[1].timestamp, 3u);
+}
+
+TEST(PacketRing, OneDatagramOverwritesNoMoreThanItsOwnerMakesRoomFor) {
+  PacketRing ring;
+  std::vector<PacketRing::Slot> overwritten;
+  for (std::uint32_t number = 0, round = 0; round < 2; ++number) {
+    const std::uint32_t before = ring.next_offset();
+    ring.written(12, overwritten);
+    ring.keep(numbered(number));
+    if (ring.next_offset() < before) ++round;
+  }
+  overwritten.clear();
+  ring.next_offset();
+  ring.written(PacketRing::kDatagramRoom, overwritten);
+  EXPECT_GT(overwritten.size(), PacketRing::kMostOverwritten - 10);
+  EXPECT_LE(overwritten.size(), PacketRing::kMostOverwritten);
+}
+
 TEST(PacketRing, NamesExactlyTheKeptPacketsThatItOverwrites) {
   PacketRing ring;
   std::mt19937 random(3);
