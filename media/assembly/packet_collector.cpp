@@ -87,17 +87,30 @@ void PacketCollector::insert(const SPacketInfo& packet, Instant now) {
   // In order and without the marker, a packet completes nothing.
   if (at_end && !packet.marker) return;
   changed_ = true;
-  note_key_picture(static_cast<std::size_t>(inserted - packets_.begin()), now);
+  const auto index = static_cast<std::size_t>(inserted - packets_.begin());
+  note_key_picture(index, now);
+  note_proven_follower(index, now);
+}
+
+// A late packet may be the one right before a picture that stands complete already.
+void PacketCollector::note_proven_follower(std::size_t index, Instant now) {
+  const std::size_t next = index + 1;
+  if (next == packets_.size() || packets_[next].timestamp == packets_[index].timestamp) return;
+  if (packets_[next].sequence != static_cast<std::uint16_t>(packets_[index].sequence + 1)) return;
+  note_key_picture(next, now);
 }
 
 void PacketCollector::note_key_picture(std::size_t index, Instant now) {
   const Run run = run_around(index);
   if (!is_complete(run) || !rules_.is_key(packets(run))) return;
-  if (front_is_proven(run)) key_opening_ = rules_.opening(packets_[run.first]);
+  const SPacketInfo& first = packets_[run.first];
+  const bool proven = front_is_proven(run);
+  if (proven) key_opening_ = rules_.opening(first);
   if (!is_trusted_key(run)) return;
-  const std::uint32_t timestamp = packets_[index].timestamp;
-  const auto same = [timestamp](const KeyPicture& key) { return key.timestamp == timestamp; };
-  if (std::none_of(standing_keys_.begin(), standing_keys_.end(), same)) standing_keys_.push_back({timestamp, now});
+  const auto same = [&first](const KeyPicture& key) { return key.timestamp == first.timestamp; };
+  auto key = std::find_if(standing_keys_.begin(), standing_keys_.end(), same);
+  if (key == standing_keys_.end()) key = standing_keys_.insert(key, {first.timestamp, now, std::nullopt});
+  if (proven) key->proven_first = first.sequence;
 }
 
 PacketCollector::Run PacketCollector::run_around(std::size_t index) const {
@@ -129,6 +142,12 @@ bool PacketCollector::is_trusted_key(Run run) const {
   if (front_is_proven(run)) return true;
   if (key_opening_ != 0) return rules_.opening(packets.front()) == key_opening_;
   return rules_.opens_whole(packets, preamble_seen_);
+}
+
+// A part of it may have been overwritten since; what proved its front may be gone without harm.
+bool PacketCollector::still_stands(const KeyPicture& key, Run run) const {
+  if (!is_complete(run) || !rules_.is_key(packets(run))) return false;
+  return key.proven_first == packets_[run.first].sequence || is_trusted_key(run);
 }
 
 // The picture whose turn it is: the one that follows the last packet used, or, when none is tracked, the oldest.
@@ -172,8 +191,8 @@ std::optional<PacketCollector::Run> PacketCollector::first_standing_key(Instant 
     std::erase_if(packets_,
                   [timestamp](const SPacketInfo& packet) { return timestamp_is_after(timestamp, packet.timestamp); });
     const std::optional<Run> run = run_of(timestamp);
-    if (run && is_complete(*run) && is_trusted_key(*run)) return run;
-    standing_keys_.erase(earliest);  // a part of it has been overwritten
+    if (run && still_stands(*earliest, *run)) return run;
+    standing_keys_.erase(earliest);
   }
   changed_ = true;
   return std::nullopt;

@@ -59,6 +59,7 @@ class PacketCollector {
   struct KeyPicture {
     std::uint32_t timestamp;
     Instant complete_since;
+    std::optional<std::uint16_t> proven_first;  // its first packet, when the one before it was seen
   };
 
   void remove_too_old(const SPacketInfo& newest, int clock_rate);
@@ -68,11 +69,13 @@ class PacketCollector {
   void take_stray(const SPacketInfo& packet, Instant now);
   void insert(const SPacketInfo& packet, Instant now);
   void note_key_picture(std::size_t index, Instant now);
+  void note_proven_follower(std::size_t index, Instant now);
   Run run_around(std::size_t index) const;
   std::optional<Run> run_of(std::uint32_t timestamp) const;
   bool is_complete(Run run) const;
   bool front_is_proven(Run run) const;
   bool is_trusted_key(Run run) const;
+  bool still_stands(const KeyPicture& key, Run run) const;
   std::optional<Run> expected_run() const;
   std::optional<Run> first_standing_key(Instant now);
   void mark_used(Run run);

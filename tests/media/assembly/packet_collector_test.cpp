@@ -255,6 +255,53 @@ TEST(PacketCollector, AtTheStartAKeyPictureWithoutItsFirstPacketIsNotTaken) {
   EXPECT_TRUE(collection.shown().empty());
 }
 
+/// A stream whose key pictures are known to open with parameter sets, then lost pictures, then a bare key picture,
+/// which nothing proves to be whole but the packet before it.
+struct BareKeyBehindAGap {
+  ModelStream source;
+  ModelPicture key = source.key_picture(2);
+  ModelPicture lost = source.delta_picture(2);
+  ModelPicture late = source.delta_picture(2);
+  ModelPicture bare = source.bare_key_picture();
+};
+
+TEST(PacketCollector, ALatePacketProvesTheFrontOfAKeyPictureThatStandsBehindIt) {
+  BareKeyBehindAGap stream;
+  Collection collection;
+  collection.arrive(stream.key);
+  collection.arrive(stream.bare);
+  collection.pass(milliseconds(500));
+  EXPECT_EQ(collection.shown(), timestamps_of({stream.key})) << "nothing proves it yet";
+  collection.arrive(stream.late.packets[1]);
+  collection.pass(milliseconds(199));
+  EXPECT_EQ(collection.shown(), timestamps_of({stream.key}));
+  collection.pass(milliseconds(1));
+  EXPECT_EQ(collection.shown(), timestamps_of({stream.key, stream.bare}));
+}
+
+TEST(PacketCollector, AFrontOnceProvenStaysProvenWhenItsProofIsOverwritten) {
+  BareKeyBehindAGap stream;
+  Collection collection;
+  collection.arrive(stream.key);
+  collection.arrive(stream.late.packets[1]);
+  collection.arrive(stream.bare);
+  collection.collector().drop_overwritten({{0, timestamp_of(stream.late), stream.late.packets[1].sequence}});
+  collection.pass(milliseconds(200));
+  EXPECT_EQ(collection.shown(), timestamps_of({stream.key, stream.bare}));
+}
+
+TEST(PacketCollector, AProvenFrontDoesNotSpeakForAPictureWhoseFirstPacketIsOverwritten) {
+  BareKeyBehindAGap stream;
+  Collection collection;
+  collection.arrive(stream.key);
+  collection.arrive(stream.late.packets[1]);
+  collection.arrive(stream.bare);
+  collection.collector().drop_overwritten({{0, timestamp_of(stream.late), stream.late.packets[1].sequence},
+                                           {0, timestamp_of(stream.bare), stream.bare.packets[0].sequence}});
+  collection.pass(milliseconds(500));
+  EXPECT_EQ(collection.shown(), timestamps_of({stream.key}));
+}
+
 TEST(PacketCollector, AnAbandonedPictureIsUsedUpAndAKeyPictureMustCome) {
   ModelStream stream;
   const ModelPicture key = stream.key_picture(2);
