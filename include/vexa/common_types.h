@@ -65,10 +65,10 @@ struct SLibDCommonPosition {
   std::int32_t y = 0;
 };
 
-/// The host's receiver of frames. The driver calls Write from the thread that polls, with the frame queue locked and the
-/// frame still in it: copy and return. Write must not call the driver, nor wait for a thread that does: polled from here,
-/// the driver would hand out and free the same frame, and a stop would wait for ever for the streaming thread, which waits
-/// for the queue. An exception thrown here passes to the poller, and the frame stays queued.
+/// The host's receiver of frames. The driver calls Write from the thread that polls, with the frame queue locked and
+/// the frame still in it: copy and return. Write must not call the driver, nor wait for a thread that does: polled from
+/// here, the driver would hand out and free the same frame, and a stop would wait for ever for the streaming thread,
+/// which waits for the queue. An exception thrown here passes to the poller, and the frame stays queued.
 class CDataSink {
  public:
   /// Takes `length` bytes at `data`, which are the driver's and end with the call.
