@@ -24,10 +24,11 @@ inline unsigned next_driver_number() {
 
 struct DriverState {
   const unsigned number = next_driver_number();  ///< tells the driver from all others, also from those gone
-  CSimpleLock start_stop_lock;  ///< held by a start or stop of video from begin to end; outermost
-  CSimpleLock error_lock;       ///< guards m_LatestErrorCode and m_LatestErrorText; innermost
-  CSimpleLock filter_lock;      ///< guards m_ResolutionFilter and m_FixedCameraInfo; taken before m_ConnectionLock
+  CSimpleLock start_stop_lock;                   ///< held by a start or stop of video from begin to end; outermost
+  CSimpleLock error_lock;                        ///< guards m_LatestErrorCode and m_LatestErrorText; innermost
+  CSimpleLock filter_lock;  ///< guards m_ResolutionFilter and m_FixedCameraInfo; taken before m_ConnectionLock
   SecondsClock now = system_seconds;
+  int teardown_timeout = 15000;       ///< milliseconds for the answer to a TEARDOWN; tests put less in its place
   std::unique_ptr<RtpReception> rtp;  ///< the streaming thread's; null while no RTP streams
   FrameStore spare_frames;            ///< guarded by m_FrameQueueLock
 };

@@ -12,6 +12,7 @@
 #include <utility>
 #include <vector>
 
+#include "device/driver_state.h"
 #include "runtime/base/base64.h"
 #include "runtime/base/sync.h"
 #include "runtime/base/text.h"
@@ -30,7 +31,6 @@ namespace {
 
 constexpr int kMediaReceiveBuffer = 524288;
 constexpr int kAnswerRoom = 1023;
-constexpr int kTeardownTimeout = 15000;  // milliseconds
 constexpr int kMillisecondsPerSecond = 1000;
 
 constexpr int kRtspOk = 200;
@@ -255,7 +255,7 @@ void CVexaCommon::TearDown() {
   if (request.cut) Fail(vexa::kUrlTooLong);
   if (!SendRtsp(m_RtspSocket, request.text)) FailSystem();
   std::string answer;
-  ReceiveRtsp(m_RtspSocket, kTeardownTimeout, answer);
+  ReceiveRtsp(m_RtspSocket, m_State->teardown_timeout, answer);
 }
 
 void CVexaCommon::rtp_stream_socket_close_all() {

@@ -273,6 +273,13 @@ class RtspClose : public RtspSession {
   void say(const std::string& bytes) const {
     ASSERT_EQ(send(camera_, bytes.data(), bytes.size(), MSG_NOSIGNAL), static_cast<ssize_t>(bytes.size()));
   }
+  void leave_no_room_to_send() {
+    const int flags = fcntl(driver_.m_RtspSocket, F_GETFL);
+    ASSERT_EQ(fcntl(driver_.m_RtspSocket, F_SETFL, flags | O_NONBLOCK), 0);
+    const char filling[4096] = {};
+    while (send(driver_.m_RtspSocket, filling, sizeof filling, MSG_NOSIGNAL) > 0) {
+    }
+  }
   std::string heard() const {
     char bytes[4096];
     const ssize_t got = recv(camera_, bytes, sizeof bytes, MSG_DONTWAIT);
@@ -315,6 +322,34 @@ TEST_F(RtspClose, WithoutAControlSocketFailsAtOnceAndClosesTheMediaSocket) {
   EXPECT_EQ(close(), "send <TEARDOWN rtsp://camera/ RTSP/1.0\r\nCSeq: 4\r\nSession: 7\r\n\r\n\r\n>\n");
   EXPECT_EQ(driver_.latest_error(), "0 Bad file descriptor");
   EXPECT_EQ(driver_.m_StreamSocket, -1);
+}
+
+TEST_F(RtspClose, WaitsFifteenSecondsForTheAnswer) { EXPECT_EQ(driver_.state().teardown_timeout, 15000); }
+
+TEST_F(RtspClose, OfASilentCameraTimesOutAndClosesBothSockets) {
+  driver_.state().teardown_timeout = 1000;
+  ASSERT_NE(driver_.BindMediaSocket(), -1);
+  close();
+  EXPECT_EQ(latest_error(driver_), "-200 Receive timed out");
+  EXPECT_EQ(driver_.m_RtspSocket, -1);
+  EXPECT_EQ(driver_.m_StreamSocket, -1);
+}
+
+TEST_F(RtspClose, ThatCannotSendReadsTheAnswerAllTheSame) {
+  leave_no_room_to_send();
+  driver_.state().teardown_timeout = 1000;
+  say("RTSP/1.0 454 No such session\r\n\r\n");
+  driver_.ClearLatestError();
+  close();
+  EXPECT_EQ(latest_error(driver_), "0 No such session");
+  EXPECT_EQ(driver_.m_RtspSocket, -1);
+}
+
+TEST_F(RtspClose, ThatCannotSendTellsTheSystemsText) {
+  leave_no_room_to_send();
+  say("RTSP/1.0 200 OK\r\n\r\n");
+  close();
+  EXPECT_EQ(driver_.LatestErrorText(), "Resource temporarily unavailable");
 }
 
 TEST_F(RtspClose, ToldTwiceTearsDownOnce) {
