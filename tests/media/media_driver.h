@@ -39,6 +39,7 @@ class MediaDriver : public TestDriver {
   using CVexaCommon::m_RtpPacketBuffer;
   using CVexaCommon::m_RtpPackets;
   using CVexaCommon::m_StagingBuffer;
+  using CVexaCommon::m_StagingBufferSize;
   using CVexaCommon::m_StopVideoEvent;
   using CVexaCommon::m_StopVideoRequested;
   using CVexaCommon::m_StreamingThread;
@@ -53,6 +54,7 @@ class MediaDriver : public TestDriver {
   using CVexaCommon::rtp_over_udp_recvn;
   using CVexaCommon::RTPJpegToJIF;
   using CVexaCommon::StampPicture;
+  using CVexaCommon::StartStreamingThread;
   using CVexaCommon::StreamingThread;
   using CVexaCommon::TakeCameraPosition;
 };
