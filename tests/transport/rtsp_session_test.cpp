@@ -330,7 +330,7 @@ TEST_F(RtspClose, OfASilentCameraTimesOutAndClosesBothSockets) {
   driver_.state().teardown_timeout = 1000;
   ASSERT_NE(driver_.BindMediaSocket(), -1);
   close();
-  EXPECT_EQ(latest_error(driver_), "-200 Receive timed out");
+  EXPECT_EQ(driver_.latest_error(), "-200 Receive timed out");
   EXPECT_EQ(driver_.m_RtspSocket, -1);
   EXPECT_EQ(driver_.m_StreamSocket, -1);
 }
@@ -341,7 +341,7 @@ TEST_F(RtspClose, ThatCannotSendReadsTheAnswerAllTheSame) {
   say("RTSP/1.0 454 No such session\r\n\r\n");
   driver_.ClearLatestError();
   close();
-  EXPECT_EQ(latest_error(driver_), "0 No such session");
+  EXPECT_EQ(driver_.latest_error(), "0 No such session");
   EXPECT_EQ(driver_.m_RtspSocket, -1);
 }
 
