@@ -8,6 +8,7 @@
 #include <map>
 #include <memory>
 #include <mutex>
+#include <string>
 #include <utility>
 #include <vector>
 
@@ -34,9 +35,14 @@ struct CameraState {
         packet_faults(options.packet_faults),
         next_session(options.first_session) {
     for (const RequestFault& fault : options.request_faults) request_faults.add(fault);
+    take_profile();
   }
 
-  CameraOptions options;  // unchanged once the camera runs
+  // Loads the profile that the options name; `profile_error` says why it could not be.
+  void take_profile();
+
+  CameraOptions options;      // unchanged once the camera runs
+  std::string profile_error;  // empty: none
   asio::io_context& context;
   SettingsStore settings;
   Journal journal;

@@ -39,7 +39,7 @@ Answer answer_command(const RequestHead& request, SettingsStore& settings) {
   if (name.empty() || name.find('/') != std::string_view::npos) return http_answer("404 Not Found", "");
   if (name == "inquiry") return answer_inquiry(request.query, settings);
   if (request.query.find('=') == std::string::npos) return http_answer("400 Bad Request", "");
-  settings.apply(name, request.query);
+  if (!settings.apply(name, request.query)) return http_answer("400 Bad Request", "");
   return {204, "HTTP/1.0 204 No Content\r\n\r\n"};
 }
 

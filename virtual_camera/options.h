@@ -10,10 +10,12 @@
 #include <vector>
 
 #include "virtual_camera/faults.h"
+#include "virtual_camera/http_stream.h"
 
 namespace vexa::camera {
 
 class PacketisedClip;
+class SettingRules;
 
 enum class SessionExpiry { kNever, kWhenSilent };
 
@@ -24,12 +26,27 @@ struct CameraOptions {
   std::string user = "admin";     // user and password both empty: everyone is let in
   std::string password = "admin";
 
+  // The camera model: a profile file, or one already loaded, which wins. It decides which settings the camera has and
+  // takes, and what it streams where no clip is given. With neither, the camera takes every setting.
+  std::string profile_path;
+  std::shared_ptr<const SettingRules> profile;
+
   // The clip to stream: a file in Annex-B byte stream format, or one already loaded, which wins and can be shared by
   // many cameras. With neither, sessions open but carry no picture.
   std::string clip_path;
   std::shared_ptr<const PacketisedClip> clip;
   bool loop = true;            // start the clip over at its end
   std::uint64_t pictures = 0;  // end the stream after this many pictures; 0: no such end
+
+  // What "/image1", "/image2" ... stream over HTTP: a file of JPEG, H.264 or MPEG-4 pictures, or one already loaded,
+  // which wins. With neither, there is no such stream.
+  std::string image_path;
+  std::shared_ptr<const ImageClip> images;
+  std::string
+      sound_path;         // "/audio" streams this file with the codec's word behind it: "tone" means "tone.g711_64" ...
+  std::string user_data;  // in every picture over HTTP, such as "CamPos: ..."
+  std::size_t stream_piece = 0;  // bytes of an HTTP stream that leave at a time; 0: a picture at once
+  std::vector<HttpStreamFault> stream_faults;
 
   double frames_per_second = 25;
   double speed = 1;  // pace: 4 sends four times faster, with timestamps advancing by picture as at 1

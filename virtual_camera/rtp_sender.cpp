@@ -4,6 +4,8 @@
 #include <cmath>
 #include <utility>
 
+#include "virtual_camera/stream_plan.h"
+
 namespace vexa::camera {
 namespace {
 
@@ -15,8 +17,8 @@ constexpr std::uint64_t kSeedStep = 0x9E3779B97F4A7C15ULL;
 
 }  // namespace
 
-RtpSender::RtpSender(std::shared_ptr<CameraState> state, std::uint32_t session)
-    : state_(std::move(state)), session_(session), socket_(state_->context), timer_(state_->context) {}
+RtpSender::RtpSender(std::shared_ptr<CameraState> state, std::uint32_t session, int video)
+    : state_(std::move(state)), session_(session), video_(video), socket_(state_->context), timer_(state_->context) {}
 
 asio::error_code RtpSender::open(const asio::ip::udp::endpoint& client) {
   asio::error_code error;
@@ -32,14 +34,20 @@ asio::error_code RtpSender::open(const asio::ip::udp::endpoint& client) {
 }
 
 void RtpSender::play() {
-  if (!state_->options.clip || stream_ || stopped_) return;
+  if (stream_ || stopped_) return;
+  const auto plan = plan_stream(state_->options, state_->settings, video_);
+  if (!plan || !plan->clip) return;
+  CameraOptions options = state_->options;
+  options.clip = plan->clip;
+  options.frames_per_second = plan->frames_per_second;
+  frames_per_second_ = plan->frames_per_second;
   const std::uint64_t seed = state_->options.seed + kSeedStep * state_->plays++;
   PacketFaults faults;
   {
     const std::lock_guard<std::mutex> lock(state_->packet_faults_mutex);
     faults = state_->packet_faults;
   }
-  stream_.emplace(state_->options, faults, session_, seed);
+  stream_.emplace(options, faults, session_, seed);
   lane_.emplace(std::move(faults), seed);
   started_ = Clock::now();
   load_picture();
@@ -54,8 +62,7 @@ void RtpSender::stop() {
 }
 
 RtpSender::Time RtpSender::picture_time(std::uint64_t picture) const {
-  const CameraOptions& options = state_->options;
-  return Time(std::llround(static_cast<double>(picture) * 1e9 / (options.frames_per_second * options.speed)));
+  return Time(std::llround(static_cast<double>(picture) * 1e9 / (frames_per_second_ * state_->options.speed)));
 }
 
 void RtpSender::load_picture() {

@@ -19,12 +19,14 @@ namespace vexa::camera {
 
 class RtpSender : public std::enable_shared_from_this<RtpSender> {
  public:
-  RtpSender(std::shared_ptr<CameraState> state, std::uint32_t session);
+  // `video`: the number of the camera's video stream.
+  RtpSender(std::shared_ptr<CameraState> state, std::uint32_t session, int video);
 
   // Opens the socket towards the client.
   [[nodiscard]] asio::error_code open(const asio::ip::udp::endpoint& client);
   [[nodiscard]] std::uint16_t port() const { return port_; }
-  // Starts with the first picture, now. Nothing happens without a clip or when already playing.
+  // Starts with the first picture, now, as the video stream is set. Nothing happens without a clip or when already
+  // playing.
   void play();
   void stop();
 
@@ -43,6 +45,8 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
 
   std::shared_ptr<CameraState> state_;
   const std::uint32_t session_;
+  const int video_;
+  double frames_per_second_ = 0;  // of the stream as it was planned at its start
   asio::ip::udp::socket socket_;
   asio::steady_timer timer_;
   DatagramBatch batch_;

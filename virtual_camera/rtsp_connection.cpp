@@ -9,6 +9,7 @@
 #include "virtual_camera/credentials.h"
 #include "virtual_camera/rtsp_message.h"
 #include "virtual_camera/session_description.h"
+#include "virtual_camera/stream_plan.h"
 
 namespace vexa::camera {
 namespace {
@@ -58,7 +59,9 @@ Answer RtspConnection::dispatch(const RequestHead& request, std::uint32_t sequen
 
 Answer RtspConnection::describe(const RequestHead& request, std::uint32_t sequence) {
   if (classify_url(request.path) != VideoUrl::kStream) return status_only("404 Not Found", sequence);
-  const std::string description = describe_session(state().options, kMaxRtspAnswer - kDescribeHead);
+  const auto plan = plan_stream(state().options, state().settings, video_number(request.path));
+  if (!plan) return status_only("404 Not Found", sequence);
+  const std::string description = describe_session(state().options, plan->clip.get(), kMaxRtspAnswer - kDescribeHead);
   return rtsp_answer({"200 OK", sequence, {}, description});
 }
 
@@ -70,7 +73,7 @@ Answer RtspConnection::setup(const RequestHead& request, std::uint32_t sequence)
   if (state().sessions.size() >= kMaxSessions) return status_only("453 Not Enough Bandwidth", sequence);
   asio::error_code error;
   const asio::ip::tcp::endpoint peer = socket().remote_endpoint(error);
-  const auto session = std::make_shared<RtspSession>(shared_state(), state().next_session);
+  const auto session = std::make_shared<RtspSession>(shared_state(), state().next_session, video_number(request.path));
   if (!error) error = session->open({peer.address(), port});
   if (error) return status_only("500 Internal Server Error", sequence);
   ++state().next_session;

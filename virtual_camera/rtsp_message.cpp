@@ -9,6 +9,8 @@
 namespace vexa::camera {
 namespace {
 
+constexpr std::string_view kVideoStem = "/media/video";
+
 // The digits at the start of a text as a number; nothing when there are none or it is out of range.
 template <typename Number>
 std::optional<Number> leading_number(std::string_view text) {
@@ -88,14 +90,19 @@ std::uint16_t second_client_port_of(std::string_view transport) {
 }
 
 VideoUrl classify_url(std::string_view path) {
-  constexpr std::string_view kStem = "/media/video";
-  if (!path.starts_with(kStem)) return VideoUrl::kNone;
-  path.remove_prefix(kStem.size());
+  if (!path.starts_with(kVideoStem)) return VideoUrl::kNone;
+  path.remove_prefix(kVideoStem.size());
   const std::size_t slash = std::min(path.find('/'), path.size());
   if (!all_digits(path.substr(0, slash))) return VideoUrl::kNone;
   const std::string_view rest = path.substr(slash);
   if (rest.empty() || rest == "/") return VideoUrl::kStream;
   return rest == "/video" ? VideoUrl::kTrack : VideoUrl::kNone;
+}
+
+int video_number(std::string_view path) {
+  if (classify_url(path) == VideoUrl::kNone) return 0;
+  path.remove_prefix(kVideoStem.size());
+  return leading_number<int>(path).value_or(0);
 }
 
 Answer rtsp_answer(const RtspAnswer& answer) {

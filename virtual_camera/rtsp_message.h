@@ -31,6 +31,8 @@ constexpr std::size_t kMaxRtspAnswer = 500;
 enum class VideoUrl { kNone, kStream, kTrack };
 // What "/media/video1" and "/media/video1/video" name.
 [[nodiscard]] VideoUrl classify_url(std::string_view path);
+// The number of the video stream that such a path names; 0 when it names none.
+[[nodiscard]] int video_number(std::string_view path);
 
 // `status` as in "454 Session Not Found"; `fields` are whole lines; no CSeq line for a request without one.
 struct RtspAnswer {

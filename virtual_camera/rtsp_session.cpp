@@ -4,10 +4,10 @@
 
 namespace vexa::camera {
 
-RtspSession::RtspSession(std::shared_ptr<CameraState> state, std::uint32_t number)
+RtspSession::RtspSession(std::shared_ptr<CameraState> state, std::uint32_t number, int video)
     : state_(std::move(state)),
       number_(number),
-      sender_(std::make_shared<RtpSender>(state_, number)),
+      sender_(std::make_shared<RtpSender>(state_, number, video)),
       expiry_(state_->context) {}
 
 void RtspSession::touch() {

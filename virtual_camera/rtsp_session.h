@@ -13,7 +13,8 @@ namespace vexa::camera {
 
 class RtspSession : public std::enable_shared_from_this<RtspSession> {
  public:
-  RtspSession(std::shared_ptr<CameraState> state, std::uint32_t number);
+  // `video`: the number of the camera's video stream that it plays.
+  RtspSession(std::shared_ptr<CameraState> state, std::uint32_t number, int video);
 
   [[nodiscard]] std::uint32_t number() const { return number_; }
   [[nodiscard]] asio::error_code open(const asio::ip::udp::endpoint& client) { return sender_->open(client); }

@@ -24,9 +24,9 @@ std::string unit_text(const AccessUnit& picture, std::uint8_t type) {
 }
 
 // ";profile-level-id=...;sprop-parameter-sets=..." of the clip's first picture (RFC 6184, 8.1).
-std::string parameter_sets(const CameraOptions& options) {
-  if (!options.clip || options.clip->clip().access_units().empty()) return {};
-  const AccessUnit& first = options.clip->clip().access_units().front();
+std::string parameter_sets(const PacketisedClip* clip) {
+  if (clip == nullptr || clip->clip().access_units().empty()) return {};
+  const AccessUnit& first = clip->clip().access_units().front();
   const std::string sequence = unit_text(first, kSequenceParameters);
   const std::string picture = unit_text(first, kPictureParameters);
   if (sequence.size() < 4 || picture.empty()) return {};
@@ -53,8 +53,8 @@ std::string description(const CameraOptions& options, std::string_view sets) {
 
 }  // namespace
 
-std::string describe_session(const CameraOptions& options, std::size_t limit) {
-  std::string text = description(options, parameter_sets(options));
+std::string describe_session(const CameraOptions& options, const PacketisedClip* clip, std::size_t limit) {
+  std::string text = description(options, parameter_sets(clip));
   return text.size() <= limit ? text : description(options, "");
 }
 

@@ -9,8 +9,8 @@
 
 namespace vexa::camera {
 
-// At most `limit` characters: the parameter sets of a clip are left out where they would not fit.
-[[nodiscard]] std::string describe_session(const CameraOptions& options, std::size_t limit);
+// At most `limit` characters: the parameter sets of the clip, which may be null, are left out where they would not fit.
+[[nodiscard]] std::string describe_session(const CameraOptions& options, const PacketisedClip* clip, std::size_t limit);
 
 }  // namespace vexa::camera
 

@@ -1,6 +1,9 @@
 #include "virtual_camera/settings_store.h"
 
 #include <algorithm>
+#include <utility>
+
+#include "virtual_camera/setting_rules.h"
 
 namespace vexa::camera {
 namespace {
@@ -120,17 +123,34 @@ std::optional<std::string> SettingsStore::answer(std::string_view section) const
   return text;
 }
 
-void SettingsStore::apply(std::string_view section, std::string_view query) {
-  const std::lock_guard<std::mutex> lock(mutex_);
-  Section& target = sections_[std::string(section)];
+bool SettingsStore::apply(std::string_view section, std::string_view query) {
+  SettingRules::Pairs changes;
   while (!query.empty()) {
     const std::size_t end = std::min(query.find('&'), query.size());
     const std::string_view pair = query.substr(0, end);
     query.remove_prefix(std::min(end + 1, query.size()));
     const std::size_t equals = pair.find('=');
     if (equals == std::string_view::npos || equals == 0) continue;
-    set_locked(target, pair.substr(0, equals), pair.substr(equals + 1));
+    changes.emplace_back(pair.substr(0, equals), pair.substr(equals + 1));
   }
+  const std::lock_guard<std::mutex> lock(mutex_);
+  if (rules_) {
+    const Section* present = find_locked(section);
+    SettingRules::Pairs settings = present == nullptr ? SettingRules::Pairs() : present->pairs;
+    if (!rules_->change(section, changes, settings)) return false;
+    sections_[std::string(section)].pairs = std::move(settings);
+    return true;
+  }
+  Section& target = sections_[std::string(section)];
+  for (const auto& [key, value] : changes) set_locked(target, key, value);
+  return true;
+}
+
+void SettingsStore::obey(std::shared_ptr<const SettingRules> rules) {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  for (const char* section : {"camera", "system"}) sections_[section].pairs = rules->factory(section);
+  for (const std::string& section : rules->lacking()) sections_.erase(section);
+  rules_ = std::move(rules);
 }
 
 }  // namespace vexa::camera

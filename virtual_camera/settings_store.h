@@ -3,6 +3,7 @@
 #define VIRTUAL_CAMERA_SETTINGS_STORE_H_
 
 #include <map>
+#include <memory>
 #include <mutex>
 #include <optional>
 #include <string>
@@ -11,6 +12,8 @@
 #include <vector>
 
 namespace vexa::camera {
+
+class SettingRules;
 
 // Thread-safe. Values are kept as they came, without decoding; keys keep the order in which they were first set.
 class SettingsStore {
@@ -26,8 +29,11 @@ class SettingsStore {
 
   // "key=value&key=value" in order; nothing when there is no such section.
   [[nodiscard]] std::optional<std::string> answer(std::string_view section) const;
-  // Applies the pairs of a command's query ("K=V&K=V") to a section.
-  void apply(std::string_view section, std::string_view query);
+  // Applies the pairs of a command's query ("K=V&K=V") to a section. False, and nothing changed, where the rules that
+  // the store obeys forbid it.
+  [[nodiscard]] bool apply(std::string_view section, std::string_view query);
+  // Has, from now on, the settings and the rules of a camera model. Without rules every command is taken.
+  void obey(std::shared_ptr<const SettingRules> rules);
 
  private:
   struct Section {
@@ -40,6 +46,7 @@ class SettingsStore {
 
   mutable std::mutex mutex_;
   std::map<std::string, Section, std::less<>> sections_;
+  std::shared_ptr<const SettingRules> rules_;
 };
 
 }  // namespace vexa::camera
