@@ -153,7 +153,6 @@ class LiveStreamImpaired : public testing::TestWithParam<ImpairedCase> {
   static CameraOptions impaired_options(unsigned index) {
     auto options = camera_options(index);
     options.seed = 42 + index;
-    options.speed = 5;
     options.max_payload = 600;
     options.pictures = kPictures;
     options.start_sequence = 65000;
