@@ -10,7 +10,6 @@
 #include <vector>
 
 #include "virtual_camera/faults.h"
-#include "virtual_camera/http_stream.h"
 
 namespace vexa::camera {
 
@@ -37,16 +36,6 @@ struct CameraOptions {
   std::shared_ptr<const PacketisedClip> clip;
   bool loop = true;            // start the clip over at its end
   std::uint64_t pictures = 0;  // end the stream after this many pictures; 0: no such end
-
-  // What "/image1", "/image2" ... stream over HTTP: a file of JPEG, H.264 or MPEG-4 pictures, or one already loaded,
-  // which wins. With neither, there is no such stream.
-  std::string image_path;
-  std::shared_ptr<const ImageClip> images;
-  std::string
-      sound_path;         // "/audio" streams this file with the codec's word behind it: "tone" means "tone.g711_64" ...
-  std::string user_data;  // in every picture over HTTP, such as "CamPos: ..."
-  std::size_t stream_piece = 0;  // bytes of an HTTP stream that leave at a time; 0: a picture at once
-  std::vector<HttpStreamFault> stream_faults;
 
   double frames_per_second = 25;
   double speed = 1;  // pace: 4 sends four times faster, with timestamps advancing by picture as at 1
