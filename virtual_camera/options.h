@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "virtual_camera/faults.h"
+#include "virtual_camera/http_stream.h"
 
 namespace vexa::camera {
 
@@ -37,6 +38,16 @@ struct CameraOptions {
   bool loop = true;            // start the clip over at its end
   std::uint64_t pictures = 0;  // end the stream after this many pictures; 0: no such end
 
+  // What "/image1", "/image2" ... stream over HTTP: a file of JPEG, H.264 or MPEG-4 pictures, or one already loaded,
+  // which wins. With neither, there is no such stream.
+  std::string image_path;
+  std::shared_ptr<const ImageClip> images;
+  std::string
+      sound_path;         // "/audio" streams this file with the codec's word behind it: "tone" means "tone.g711_64" ...
+  std::string user_data;  // in every picture over HTTP, such as "CamPos: ..."
+  std::size_t stream_piece = 0;  // bytes of an HTTP stream that leave at a time; 0: a picture at once
+  std::vector<HttpStreamFault> stream_faults;
+
   double frames_per_second = 25;
   double speed = 1;  // pace: 4 sends four times faster, with timestamps advancing by picture as at 1
   std::uint32_t clock_rate = 90000;
@@ -47,6 +58,9 @@ struct CameraOptions {
   // A picture goes out in bursts of at most this many packets, spread over half the picture's time.
   std::size_t burst_packets = 16;
   std::chrono::microseconds burst_gap{200};  // least pause between two bursts of one session, also when late
+  // Mbit/s of the camera's network port: above 0, a picture's datagrams leave one by one at its rate instead of in
+  // bursts, as they reach a host from a camera behind a 100 Mbit/s port.
+  unsigned link_megabits = 0;
 
   std::string range_clock;  // for instance "20240131T235959.250Z": adds the range line to the session description
   std::uint32_t first_session = 12345678;    // numbers of later sessions count up from it

@@ -11,6 +11,8 @@ namespace {
 
 // A camera that was kept from running this long goes on from here instead of sending the backlog.
 constexpr std::chrono::seconds kFarBehind{1};
+// Of each datagram on an Ethernet: RTP, UDP and IPv4 headers; preamble, frame header, check sequence and gap.
+constexpr std::size_t kWireOverhead = 12 + 8 + 20 + 38;
 constexpr int kSendBuffer = 1 << 20;
 // Makes the seeds of a camera's sessions differ; the first session has the camera's own.
 constexpr std::uint64_t kSeedStep = 0x9E3779B97F4A7C15ULL;
@@ -68,15 +70,19 @@ RtpSender::Time RtpSender::picture_time(std::uint64_t picture) const {
 void RtpSender::load_picture() {
   picture_.clear();
   offered_ = 0;
+  offered_bytes_ = 0;
   if (stream_->ended()) return;
   picture_index_ = stream_->next_picture();
   stream_->take_picture(picture_);
 }
 
-// The bursts of a picture are spread over the first half of its time.
+// The bursts of a picture are spread over the first half of its time; a port sends one datagram behind the other.
 std::optional<RtpSender::Time> RtpSender::next_burst() const {
   if (picture_.empty()) return std::nullopt;
   const Time begin = picture_time(picture_index_);
+  if (const unsigned rate = state_->options.link_megabits; rate > 0) {
+    return begin + std::chrono::duration_cast<Time>(std::chrono::microseconds(offered_bytes_ * 8 / rate));
+  }
   const Time half = (picture_time(picture_index_ + 1) - begin) / 2;
   const auto share = static_cast<double>(offered_) / static_cast<double>(picture_.size());
   return begin + Time(std::llround(static_cast<double>(half.count()) * share));
@@ -108,8 +114,12 @@ void RtpSender::slip_if_far_behind(Time event) {
 }
 
 void RtpSender::offer_burst(Time now) {
-  const std::size_t end = std::min(picture_.size(), offered_ + state_->options.burst_packets);
-  while (offered_ < end) lane_->offer(std::move(picture_[offered_++]), now, leaving_);
+  const std::size_t burst = state_->options.link_megabits > 0 ? 1 : state_->options.burst_packets;
+  const std::size_t end = std::min(picture_.size(), offered_ + burst);
+  for (; offered_ < end; ++offered_) {
+    offered_bytes_ += picture_[offered_].payload_to_send().size() + kWireOverhead;
+    lane_->offer(std::move(picture_[offered_]), now, leaving_);
+  }
   if (offered_ < picture_.size()) return;
   load_picture();
   if (picture_.empty()) lane_->release_held(leaving_);
@@ -122,7 +132,7 @@ void RtpSender::run_event() {
     lane_->release_due(now, leaving_);
   } else {
     offer_burst(now);
-    not_before_ = Clock::now() + state_->options.burst_gap;
+    if (state_->options.link_megabits == 0) not_before_ = Clock::now() + state_->options.burst_gap;
   }
   const auto hashing = state_->options.hash_packets ? DatagramBatch::Hashing::kOn : DatagramBatch::Hashing::kOff;
   state_->sent.add(batch_.send(socket_.native_handle(), leaving_, hashing));

@@ -57,6 +57,7 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
   Clock::time_point not_before_;   // the pause after a burst
   std::vector<Outgoing> picture_;  // the picture under way
   std::size_t offered_ = 0;        // packets of it already offered
+  std::size_t offered_bytes_ = 0;  // what they take on the wire
   std::uint64_t picture_index_ = 0;
   std::vector<Outgoing> leaving_;
   bool stopped_ = false;
