@@ -53,6 +53,10 @@ std::string CameraCore::prepare() {
   const bool rates_stand = options.frames_per_second > 0 && options.speed > 0 && options.clock_rate > 0;
   if (!rates_stand) return "frames per second, speed and clock rate must be above 0";
   if (options.max_payload < 3 || options.burst_packets == 0) return "too small a packet or burst";
+  if (!options.images && !options.image_path.empty()) {
+    options.images = ImageClip::load(options.image_path);
+    if (!options.images) return fmt::format("no pictures in {}", options.image_path);
+  }
   if (options.clip || options.clip_path.empty()) return {};
   options.clip = PacketisedClip::load(options.clip_path, options.max_payload);
   return options.clip ? "" : fmt::format("no H.264 pictures in {}", options.clip_path);

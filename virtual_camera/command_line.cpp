@@ -51,6 +51,10 @@ void add_stream(CLI::App& app, CameraOptions& camera) {
                  "profile of the camera model; without --clip it streams what its settings say")
       ->check(CLI::ExistingFile);
   app.add_option("--clip", camera.clip_path, "H.264 file in Annex-B format to stream")->check(CLI::ExistingFile);
+  app.add_option("--images", camera.image_path, "file to stream over HTTP: JPEG (.mjpeg), .h264 or MPEG-4 (.m4v)")
+      ->check(CLI::ExistingFile);
+  app.add_option("--sound", camera.sound_path, "sound to stream over HTTP: this name and the codec, \"NAME.g711_64\"");
+  app.add_option("--user-data", camera.user_data, "text in every picture over HTTP, such as \"CamPos: 1/2/3\"");
   app.add_flag("--once{false}", camera.loop, "end the stream with the clip instead of starting it over");
   app.add_option("--pictures", camera.pictures, "end the stream after this many pictures");
   app.add_option("--fps", camera.frames_per_second, "pictures a second")

@@ -175,10 +175,38 @@ void Connection::delivered() {
       break;
   }
   const bool hold = delivery_.end == DeliveryEnd::kHold;
-  if (!hold && answered() == Next::kCloseConnection) return linger();
+  const Next next = hold ? Next::kReadOn : answered();
+  if (next == Next::kCloseConnection) return linger();
+  if (next == Next::kStream) return begin_stream();
   asio::post(socket_.get_executor(), [self = shared_from_this()] {
     if (self->open_) self->take_request();
   });
+}
+
+// Whatever the peer says from here on is passed over.
+void Connection::begin_stream() {
+  received_.clear();
+  deadline_.expires_at(std::chrono::steady_clock::time_point::max());
+  drain();
+  stream();
+}
+
+void Connection::send_at(std::chrono::steady_clock::time_point time, std::string bytes) {
+  delivery_.bytes = std::move(bytes);
+  pace_.expires_at(time);
+  pace_.async_wait([self = shared_from_this()](asio::error_code stopped) {
+    if (stopped || !self->open_) return;
+    asio::async_write(self->socket_, asio::buffer(self->delivery_.bytes), [self](asio::error_code error, std::size_t) {
+      if (!self->open_) return;
+      error ? self->close() : self->stream();
+    });
+  });
+}
+
+void Connection::finish_stream() {
+  asio::error_code ignored;
+  socket_.shutdown(asio::ip::tcp::socket::shutdown_send, ignored);
+  set_deadline(kLingerLimit);
 }
 
 // Sends the end of the stream and waits for the peer's: closing with bytes unread would reset the connection and could

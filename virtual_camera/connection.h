@@ -28,7 +28,7 @@ class Connection : public std::enable_shared_from_this<Connection> {
   void reset();  // ends the connection at once with a TCP reset
 
  protected:
-  enum class Next { kCloseConnection, kReadOn };
+  enum class Next { kCloseConnection, kReadOn, kStream };
 
   virtual RequestKind kind() const = 0;
   // Bytes of the first whole request received; 0 when more must come.
@@ -39,8 +39,13 @@ class Connection : public std::enable_shared_from_this<Connection> {
   virtual Next answered() = 0;        // the answer has left whole
   virtual bool may_idle() const = 0;  // whether the peer may stay silent between requests
   virtual void ended() {}             // the connection is gone; called once
+  // After Next::kStream: calls send_at, which calls it again once the bytes have left, or finish_stream.
+  virtual void stream() {}
 
-  CameraState& state() { return *state_; }
+  void send_at(std::chrono::steady_clock::time_point time, std::string bytes);
+  void finish_stream();  // ends the stream and waits for the peer to go
+
+  CameraState& state() const { return *state_; }
   const std::shared_ptr<CameraState>& shared_state() const { return state_; }
   const asio::ip::tcp::socket& socket() const { return socket_; }
 
@@ -54,6 +59,7 @@ class Connection : public std::enable_shared_from_this<Connection> {
   void deliver();
   void deliver_rest();
   void delivered();
+  void begin_stream();
   void linger();
   void drain();
   void set_deadline(std::chrono::milliseconds time);
