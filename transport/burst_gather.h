@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <chrono>
 #include <cstddef>
+#include <cstdint>
 
 namespace vexa {
 
@@ -15,6 +16,7 @@ class BurstGather {
  public:
   static constexpr std::chrono::microseconds kLongest{2000};
   static constexpr std::chrono::microseconds kShortest{125};
+  static constexpr std::chrono::microseconds kFirst{500};
 
   /// The thread was woken by a datagram: how long to nap before reading; 0 for not at all.
   std::chrono::microseconds woken() {
@@ -22,6 +24,14 @@ class BurstGather {
     const bool nap_is_better = taken_after_nap_ > kWakeupsOfANap * taken_at_once_;
     napped_ = nap_is_better != (++bursts_ % kTrialInterval == 0);
     return napped_ ? nap_ : std::chrono::microseconds{0};
+  }
+
+  /// The socket is empty in the middle of a picture: how long to nap again rather than wait for the rest; 0 for
+  /// waiting. Saves the wake-up by which a wait would only lead to the next nap.
+  std::chrono::microseconds goes_on() {
+    if (!napped_ || datagrams_ == 0) return std::chrono::microseconds{0};
+    finish_burst();
+    return nap_;
   }
 
   void received(std::size_t bytes) {
@@ -39,14 +49,23 @@ class BurstGather {
   void finish_burst() {
     double& taken = napped_ ? taken_after_nap_ : taken_at_once_;
     taken += (static_cast<double>(datagrams_) - taken) * kNews;
-    // The faster the stream, the shorter the nap: a socket's buffer must not fill meanwhile.
-    if (napped_ && bytes_ > kLargeBurst) nap_ = std::max(nap_ / 2, kShortest);
-    if (napped_ && bytes_ < kSmallBurst) nap_ = std::min(nap_ * 2, kLongest);
+    if (napped_) fit_nap();
     datagrams_ = 0;
     bytes_ = 0;
   }
 
-  std::chrono::microseconds nap_ = kLongest;
+  // The faster the stream, the shorter the nap: a socket's buffer must not fill meanwhile. So it shrinks at once, and
+  // grows slowly: the end of a picture is a small burst on the fastest stream.
+  void fit_nap() {
+    if (bytes_ > kLargeBurst) {
+      const auto fitting = static_cast<std::uint64_t>(nap_.count()) * kLargeBurst / bytes_;
+      nap_ = std::max(std::chrono::microseconds(static_cast<std::chrono::microseconds::rep>(fitting)), kShortest);
+    } else if (bytes_ < kSmallBurst) {
+      nap_ = std::min(nap_ + nap_ / 8, kLongest);
+    }
+  }
+
+  std::chrono::microseconds nap_ = kFirst;
   double taken_at_once_ = 1;
   double taken_after_nap_ = 4;
   unsigned bursts_ = 0;

@@ -21,6 +21,8 @@ vexa::Bytes bytes_of(const char* buffer, int length) {
   return {reinterpret_cast<const unsigned char*>(buffer), static_cast<std::size_t>(length)};
 }
 
+bool is_empty(int error) { return error == EAGAIN || error == EWOULDBLOCK; }
+
 bool is_signalled(int event) { return event != -1 && vexa::WaitBudget(0).wait_readable(event) == 1; }
 
 void nap(std::chrono::microseconds length) {
@@ -36,7 +38,14 @@ int CVexaCommon::rtp_over_udp_recvn(int socket, char* buffer, int length, int ti
   vexa::BurstGather* gather = m_State->rtp ? &m_State->rtp->gather : nullptr;
   const std::size_t room = static_cast<std::size_t>(std::max(length, 0));
   ssize_t count = vexa::receive_waiting(socket, buffer, room);
-  if (count < 0 && (errno == EAGAIN || errno == EWOULDBLOCK)) {
+  if (count < 0 && is_empty(errno) && gather != nullptr && !m_State->rtp->collector.is_empty()) {
+    const std::chrono::microseconds pause = gather->goes_on();
+    if (pause.count() > 0) {
+      nap(pause);
+      count = vexa::receive_waiting(socket, buffer, room);
+    }
+  }
+  if (count < 0 && is_empty(errno)) {
     int stop = -1;
     eventFd(m_StopVideoEvent, stop);
     const int ready = vexa::WaitBudget(timeout).wait_readable_unless(socket, stop);

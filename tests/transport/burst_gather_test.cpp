@@ -27,6 +27,7 @@ class Stream {
   /// Of the run's wake-ups, those with a nap.
   int naps() const { return naps_; }
   microseconds latest() const { return nap_; }
+  microseconds goes_on() { return gather_.goes_on(); }
 
  private:
   BurstGather gather_;
@@ -58,10 +59,15 @@ TEST(BurstGather, FollowsAStreamThatChangesItsWays) {
 TEST(BurstGather, NapsShorterTheMoreComesMeanwhileAndLongerAgainWhenLittleDoes) {
   Stream stream;
   stream.run(1, {1, 1000}, {1, 1000});
-  EXPECT_EQ(stream.latest(), BurstGather::kLongest);
-  stream.run(20, {1, 1000}, {10, 6554});  // 65540 bytes
+  EXPECT_EQ(stream.latest(), BurstGather::kFirst);
+  stream.run(1, {1, 1000}, {10, 13108});  // 131080 bytes, twice what a burst may be
+  stream.run(1, {1, 1000}, {10, 1638});
+  EXPECT_EQ(stream.latest(), microseconds(280));  // half of what one small burst had made of the first nap
+  stream.run(20, {1, 1000}, {100, 6554});
   EXPECT_EQ(stream.latest(), BurstGather::kShortest);
-  stream.run(20, {1, 1000}, {10, 1638});  // 16380 bytes
+  stream.run(2, {1, 1000}, {10, 1638});  // 16380 bytes
+  EXPECT_EQ(stream.latest(), BurstGather::kShortest * 9 / 8);
+  stream.run(38, {1, 1000}, {10, 1638});
   EXPECT_EQ(stream.latest(), BurstGather::kLongest);
 }
 
@@ -69,11 +75,29 @@ TEST(BurstGather, KeepsItsNapForWhatIsNeitherMuchNorLittle) {
   for (const std::size_t bytes : {16384u, 65536u}) {
     Stream stream;
     stream.run(1, {1, 1000}, {2, 40000});
-    stream.run(1, {1, 1000}, {4, bytes / 4});  // halved once
-    EXPECT_EQ(stream.latest(), BurstGather::kLongest / 2);
+    stream.run(1, {1, 1000}, {4, bytes / 4});
+    EXPECT_EQ(stream.latest(), microseconds(409));
     stream.run(10, {1, 1000}, {4, bytes / 4});
-    EXPECT_EQ(stream.latest(), BurstGather::kLongest / 2) << bytes;
+    EXPECT_EQ(stream.latest(), microseconds(409)) << bytes;
   }
+}
+
+TEST(BurstGather, NapsAgainInTheMiddleOfAPictureWhileTheLastNapBroughtSomething) {
+  BurstGather gather;
+  ASSERT_EQ(gather.woken(), BurstGather::kFirst);
+  EXPECT_EQ(gather.goes_on(), microseconds(0));
+  gather.received(20000);
+  EXPECT_EQ(gather.goes_on(), BurstGather::kFirst);
+  gather.received(131072);
+  EXPECT_EQ(gather.goes_on(), BurstGather::kFirst / 2);
+  EXPECT_EQ(gather.goes_on(), microseconds(0));
+}
+
+TEST(BurstGather, DoesNotNapInTheMiddleOfAPictureWhereItDidNotAtItsBeginning) {
+  Stream stream;
+  stream.run(641, {10, 1400}, {10, 1400});
+  ASSERT_EQ(stream.latest(), microseconds(0));
+  EXPECT_EQ(stream.goes_on(), microseconds(0));
 }
 
 }  // namespace
