@@ -105,8 +105,9 @@ TYPED_TEST(Slots, TheFirstDestructorLeavesTheMemoryAndTheSecondReleasesIt) {
   call_slot(first, 0);
   EXPECT_EQ(g_complete_destructions, 1);
   EXPECT_EQ(g_releases, 0);
-  ::operator delete(first);
+  Device::operator delete(first);
 
+  g_releases = 0;
   auto* second = new Device;
   call_slot(second, 1);
   EXPECT_EQ(g_complete_destructions, 2);
