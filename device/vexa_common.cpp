@@ -52,6 +52,7 @@ CVexaCommon::~CVexaCommon() {
   CVexaCommon::StopVideoStreaming();
   CVexaCommon::StopAudioStreaming();
   CVexaCommon::StopIoStreaming();
+  // Kept: the motion-metadata stream is the host's to stop; a driver's end leaves it open.
   ReleaseRtpPacketsPtr();
   ReleaseStreamBuffer();
   delete[] m_StagingBuffer;

@@ -65,7 +65,7 @@ int CVexaCommon::http_multipart_input_recv(int socket, unsigned int& mask, unsig
   char part[kPartHeaderRoom + 1];
   const int length = http_header_recv(socket, part, kPartHeaderRoom, ConnectionTimeout());
   if (length < 1) return length;
-  const vexa::MotionReport motion{m_IoBoxInfo.vmdType != LIBD_VMD_WINDOW, m_UseMotionDetection};
+  const vexa::MotionReport motion{StoredVmdType() != LIBD_VMD_WINDOW, m_UseMotionDetection};
   const vexa::InputBits bits = vexa::parse_input_part({part, static_cast<std::size_t>(length)}, motion);
   mask = bits.present;
   state = bits.state;

@@ -116,7 +116,26 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode GetCurrentAudioFrame(SLibDAudioFrameInfo& frame) override;
 
   // device/alarm_io.cpp
+  ELibDReturnCode GetFixedIoboxInfo(SLibDFixedIoBoxInfo& info) override;
+  ELibDReturnCode GetIoBoxInfo(SLibDIoBoxInfo& info) override;
+  ELibDReturnCode StartIoStreaming() override;
   ELibDReturnCode StopIoStreaming() override;
+  ELibDReturnCode GetCurrentIoStatus(std::vector<SLibDPinInfo>& pins) override;
+  ELibDReturnCode SetOutput(SLibDPinInfo& pin) override;
+
+  // device/detection.cpp
+  ELibDReturnCode GetObjectDetectionSetting(std::vector<SLibDDetectionParam>& params, ELibDPositionMode& mode) override;
+  ELibDReturnCode SetDetectionParam(SLibDDetectionParam& param) override;
+  ELibDReturnCode SetPositionMode(ELibDPositionMode mode) override;
+  ELibDReturnCode SetTamperingAlarm(bool on, ELibDTamperLevel level) override;
+  ELibDReturnCode SetAudioDetection(bool on) override;
+  ELibDReturnCode SetVMDtype(ELibDVMDType type) override;
+
+  // device/metadata_stream.cpp
+  using CLibraryDevice::GetCurrentPosition;
+  ELibDReturnCode StartModRawData() override;
+  ELibDReturnCode GetCurrentPosition(SLibDRawMDFrameInfo& frame) override;
+  ELibDReturnCode StopModRawData() override;
 
   /// Hook of model classes, called when standard or capture size change (-1: no size is given). LIBD_OK.
   virtual ELibDReturnCode InitializeFixedVideoParams(ELibDVideoStandard standard, int width, int height);
@@ -290,6 +309,24 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   bool CameraInquiry(std::string& answer);
   ELibDReturnCode AfterImageChange(ELibDReturnCode sent);
 
+  // Alarm pins: device/alarm_io.cpp
+  ELibDReturnCode GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>& pins);
+  ELibDReturnCode AskTampering(int number, SLibDIoBoxInfo& info);
+  ELibDReturnCode AskAudioDetection(int number, SLibDIoBoxInfo& info);
+  ELibDReturnCode OpenIoStream();
+  bool AskSensors(std::string& answer);
+  ELibDReturnCode WatchTampering(int state);
+  int StoredVmdType();
+
+  // Detection settings: device/detection.cpp
+  /// Sends what an object-detection camera keeps of a setting; `socket` is set to each request's, which is closed.
+  ELibDReturnCode SetObjectDetectionParameter(SLibDDetectionParam& param, int& socket);
+  ELibDReturnCode ConverObjectWidthValueToString(SLibDDetectionParam& param, std::string& text);
+  ELibDReturnCode CheckDetectionParamSensitivity(SLibDDetectionParam& param);
+  ELibDReturnCode CheckDetectionParamDetectionArea(SLibDDetectionParam& param);
+  ELibDReturnCode AskLodDetection(std::vector<SLibDDetectionParam>& params);
+  ELibDReturnCode AskObjectDetection(std::vector<SLibDDetectionParam>& params, ELibDPositionMode& mode);
+
   // Shared by model variants: device/model_variants.cpp
   /// Sends the picture to the network when the answer of the "system" inquiry names another output.
   ELibDReturnCode BringVideoToNetwork(const std::string& systemAnswer);
@@ -309,7 +346,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   CResolutionFilterFacade m_ResolutionFilter;
   SLibDAudioInfo m_AudioInfo;            ///< guarded by m_ConnectionLock
   SLibDPTZControlInfo m_PTZControlInfo;  ///< guarded by m_ConnectionLock
-  SLibDIoBoxInfo m_IoBoxInfo;
+  SLibDIoBoxInfo m_IoBoxInfo;            ///< guarded by m_ConnectionLock
   std::string m_LatestErrorText;         ///< written and read through Fail, ClearLatestError and LatestErrorCode
   bool m_ContinuousPTZ = false;          ///< the camera takes signed continuous speeds; guarded by m_ConnectionLock
   int m_ChannelId = 0;                   ///< guarded by m_ConnectionLock
@@ -384,7 +421,11 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   CSimpleLock m_IoStreamLock;
   int m_IoStreamSocket VEXA_GUARDED_BY(m_IoStreamLock) = -1;
   std::vector<SLibDPinInfo> m_PendingPins VEXA_GUARDED_BY(m_IoStreamLock);
+  std::time_t m_LastIoDataTime VEXA_GUARDED_BY(m_IoStreamLock) = 0;        ///< when pins were last handed out
+  std::time_t m_TamperingActiveSince VEXA_GUARDED_BY(m_IoStreamLock) = 0;  ///< 0 while no tampering is reported
   CSimpleLock m_MdStreamLock;
+  int m_MdStreamSocket VEXA_GUARDED_BY(m_MdStreamLock) = -1;
+  std::time_t m_LastMdDataTime VEXA_GUARDED_BY(m_MdStreamLock) = 0;  ///< of the last part, or of the opening
 
   std::map<std::string, int> m_InquirySizes;  ///< answer buffer in bytes by inquiry name
   CFileLogger m_CGILogger;

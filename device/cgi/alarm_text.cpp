@@ -1,0 +1,116 @@
+#include "device/cgi/alarm_text.h"
+
+#include "runtime/base/text.h"
+#include "transport/wire/cgi_answer.h"
+
+namespace vexa {
+namespace {
+
+constexpr std::int64_t kLongestTampering = 59;  // seconds
+constexpr std::int64_t kSilenceGrace = 15;      // seconds
+constexpr int kMaskBits = 32;
+
+constexpr Word<bool> kDetectorWords[] = {{true, "on"}, {false, "off"}};
+
+std::int64_t seconds_between(std::time_t earlier, std::time_t later) {
+  return std::int64_t{later} - std::int64_t{earlier};
+}
+
+/// Hands out the types of the pins behind the inputs, each the first time it is asked for.
+class DetectorTypes {
+ public:
+  explicit DetectorTypes(const SLibDFixedIoBoxInfo& fixed)
+      : video_(fixed.videoDetection), tampering_(fixed.tamperingDetection), audio_(fixed.audioDetection) {}
+
+  ELibDPinType next() {
+    if (take(video_)) return PIN_TYPE_DETECTION;
+    if (take(tampering_)) return PIN_TYPE_TAMPERING;
+    // Kept: all further pins are audio, or inputs of a camera without it.
+    return audio_ ? PIN_TYPE_AUDIO_DETECTION : PIN_TYPE_SENSOR_INPUT;
+  }
+
+ private:
+  static bool take(bool& left) {
+    const bool had = left;
+    left = false;
+    return had;
+  }
+
+  bool video_;
+  bool tampering_;
+  bool audio_;
+};
+
+}  // namespace
+
+SLibDPinInfo pin_of(std::int32_t number, ELibDPinType type, bool enabled) {
+  SLibDPinInfo pin;
+  pin.number = number;
+  pin.type = type;
+  pin.enabled = enabled;
+  return pin;
+}
+
+void append_pins(const SLibDFixedIoBoxInfo& fixed, std::vector<SLibDPinInfo>& pins) {
+  for (std::int32_t number = 1; number <= fixed.inputCount; ++number) {
+    pins.push_back(pin_of(number, PIN_TYPE_SENSOR_INPUT));
+  }
+  for (std::int32_t number = 1; number <= fixed.outputCount; ++number) {
+    pins.push_back(pin_of(number, PIN_TYPE_ALARM_OUTPUT));
+  }
+}
+
+std::int32_t first_detector_number(const SLibDFixedIoBoxInfo& fixed) {
+  return fixed.inputCount < 0 ? 1 : fixed.inputCount + 1;
+}
+
+bool detector_enabled(std::string_view answer, std::string_view key) {
+  return value_of(kDetectorWords, cgi_value(answer, key).value_or("")).value_or(true);
+}
+
+std::optional<std::int32_t> tamper_level_of(std::string_view answer) {
+  const auto word = cgi_value(answer, "TamperingLevel=");
+  if (!word) return std::nullopt;
+  const auto level = value_of(kTamperWords, *word);
+  return level ? static_cast<std::int32_t>(*level) : 0;
+}
+
+std::vector<SLibDPinInfo> sensor_pins(std::string_view answer) {
+  std::vector<SLibDPinInfo> pins;
+  while (auto text = text_after(answer, "Sensor")) {
+    answer = *text;
+    const auto number = take_int(*text);
+    if (!number || !text->starts_with('=')) continue;
+    text->remove_prefix(1);
+    const auto state = take_int(*text);
+    if (!state) continue;
+    pins.push_back(pin_of(*number, PIN_TYPE_SENSOR_INPUT));
+    pins.back().state = *state;
+  }
+  return pins;
+}
+
+std::vector<SLibDPinInfo> status_pins(PinMasks masks, const SLibDFixedIoBoxInfo& fixed) {
+  std::vector<SLibDPinInfo> pins;
+  DetectorTypes detectors(fixed);
+  for (int bit = 0; bit < kMaskBits; ++bit) {
+    if ((masks.present >> bit & 1) == 0) continue;
+    const std::int32_t number = bit + 1;
+    pins.push_back(pin_of(number, number > fixed.inputCount ? detectors.next() : PIN_TYPE_SENSOR_INPUT));
+    pins.back().state = static_cast<std::int32_t>(masks.state >> bit & 1);
+  }
+  return pins;
+}
+
+bool tampering_is_due(std::int32_t state, std::time_t now, std::time_t& since) {
+  if (state == 0) since = 0;
+  if (state != 1) return false;
+  if (since == 0) since = now;
+  return seconds_between(since, now) > kLongestTampering;
+}
+
+bool alarm_stream_is_silent(std::time_t now, std::time_t last, int timeout_ms) {
+  return seconds_between(last, now) > timeout_ms / 1000 + kSilenceGrace;
+}
+
+}  // namespace vexa

@@ -1,0 +1,53 @@
+// Alarm pins: the list a camera's inputs, outputs and detectors make, what answers and parts say of them, and when a
+// tampering alarm is cleared.
+#pragma once
+
+#include <cstdint>
+#include <ctime>
+#include <optional>
+#include <string_view>
+#include <vector>
+
+#include "device/cgi/words.h"
+#include "vexa/io_info.h"
+
+namespace vexa {
+
+inline constexpr Word<ELibDTamperLevel> kTamperWords[] = {
+    {LIBD_TAMPER_LOW, "low"}, {LIBD_TAMPER_MIDDLE, "middle"}, {LIBD_TAMPER_HIGH, "high"}};
+
+SLibDPinInfo pin_of(std::int32_t number, ELibDPinType type, bool enabled = true);
+
+/// Appends the inputs, then the outputs; both are counted from 1.
+void append_pins(const SLibDFixedIoBoxInfo& fixed, std::vector<SLibDPinInfo>& pins);
+
+/// The number of the first detector: the one behind the inputs.
+std::int32_t first_detector_number(const SLibDFixedIoBoxInfo& fixed);
+
+/// Whether the detector of `key` ("TamperingFunc=") is switched on; also true when the answer does not tell.
+bool detector_enabled(std::string_view answer, std::string_view key);
+
+/// The tamper level that an answer tells, 0 for a word that is not known; nothing when it does not speak of it.
+std::optional<std::int32_t> tamper_level_of(std::string_view answer);
+
+/// The inputs that the answer of the "sensor" inquiry names, in its order, with their states.
+std::vector<SLibDPinInfo> sensor_pins(std::string_view answer);
+
+/// Bit N - 1 stands for pin N.
+struct PinMasks {
+  std::uint32_t present;  ///< the camera spoke of the pin
+  std::uint32_t state;
+};
+
+/// The pins that the camera spoke of, in order. Behind the inputs stand the detectors it has: video detection,
+/// tampering, audio.
+std::vector<SLibDPinInfo> status_pins(PinMasks masks, const SLibDFixedIoBoxInfo& fixed);
+
+/// A tampering pin of `state` was reported at `now`. True when it has been active for a minute and is to be cleared on
+/// the camera. `since` is when it was first seen active, 0 when it is not.
+bool tampering_is_due(std::int32_t state, std::time_t now, std::time_t& since);
+
+/// Whether nothing for so long is a stream that has died: longer than the time-out and 15 seconds.
+bool alarm_stream_is_silent(std::time_t now, std::time_t last, int timeout_ms);
+
+}  // namespace vexa
