@@ -33,6 +33,7 @@ const HttpStreamFault* HttpStream::fault(Action action) const {
 
 // The unit as the clip has it; nothing behind its end.
 std::optional<std::string> HttpStream::content() const {
+  if (!clip_ && sound_unit_ == 0) return std::nullopt;  // another clip was to follow, and is not there
   const std::uint64_t place = index_ - clip_began_;
   const std::size_t count = clip_ ? clip_->pictures().size() : sound_.size() / sound_unit_;
   if (count == 0 || (place >= count && !options_.loop)) return std::nullopt;

@@ -1,5 +1,8 @@
 #include "virtual_camera/listener.h"
 
+#include <netinet/in.h>
+#include <netinet/tcp.h>
+
 #include <utility>
 #include <vector>
 
@@ -8,6 +11,9 @@ namespace {
 
 // Far above what honest hosts open at once; beyond it new connections are closed at once.
 constexpr std::size_t kMaxConnections = 512;
+
+using SegmentSize = asio::detail::socket_option::integer<IPPROTO_TCP, TCP_MAXSEG>;
+constexpr int kNetworkSegment = 1448;
 
 }  // namespace
 
@@ -21,6 +27,9 @@ asio::error_code Listener::open(std::uint16_t port) {
   const asio::ip::tcp::endpoint endpoint(address, port_ != 0 ? port_ : port);
   acceptor_.open(endpoint.protocol(), error);
   if (!error) acceptor_.set_option(asio::socket_base::reuse_address(true), error);
+  // As on a network: a receiver that has closed its window opens it again only for a whole segment, and loopback's own
+  // are as large as a driver's whole buffer.
+  if (!error) acceptor_.set_option(SegmentSize(kNetworkSegment), error);
   if (!error) acceptor_.bind(endpoint, error);
   if (!error) acceptor_.listen(asio::socket_base::max_listen_connections, error);
   if (error) {

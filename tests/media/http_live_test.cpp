@@ -159,6 +159,22 @@ TEST_F(HttpLive, TextBetweenThePartsIsPassedOver) {
   expect_frames(kJpegWay, 10);
 }
 
+TEST_F(HttpLive, PicturesOfAMegabyteKeepUp) {
+  const std::string path = testing::TempDir() + "megabyte_" + own_loopback(1) + ".mjpeg";
+  std::string large = picture(kJpegWay, 0);
+  for (int i = 0; i < 15; ++i) large.insert(2, "\xff\xfe\xff\xff" + std::string(65533, 'x'));
+  std::ofstream(path, std::ios::binary) << large;
+  options_.image_path = path;
+  options_.speed = 2;
+  run(kJpegWay);
+  ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+  const auto frames = taker_.take_all(driver_, 50);
+  EXPECT_EQ(frames.size(), 50U);
+  for (const TakenFrame& frame : frames) EXPECT_TRUE(frame.bytes == large);
+  driver_.StopVideoStreaming();
+  std::remove(path.c_str());
+}
+
 TEST_F(HttpLive, ALargePartIsDroppedAndTakenAfterARestart) {
   const std::string path = testing::TempDir() + "large_" + own_loopback(1) + ".mjpeg";
   std::string large = picture(kJpegWay, 0);

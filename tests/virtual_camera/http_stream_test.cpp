@@ -25,7 +25,8 @@ std::string sent(HttpStream& stream, int most = 100) {
 std::string elementary(HttpStreamOptions options) {
   options.loop = false;
   HttpStream stream(clip(ImageKind::kH264), std::move(options));
-  return sent(stream) + (stream.closes() ? "" : "|silent");
+  const std::string text = sent(stream);
+  return text + (stream.closes() ? "" : "|silent");
 }
 
 HttpStreamOptions with_fault(Action action, const std::string& text = "", std::size_t bytes = 0) {
