@@ -13,7 +13,7 @@ if(TARGET vexa_virtual_camera)
   target_precompile_headers(vexa_virtual_camera PRIVATE <asio.hpp> <fmt/format.h> <functional> ${vexa_precompiled})
   target_compile_options(vexa_virtual_camera PRIVATE ${vexa_false_alarms})
 endif()
-foreach(folder runtime transport media device filter virtual_camera host contract)
+foreach(folder runtime transport media device filter models virtual_camera host contract)
   if(TARGET ${folder}_tests)
     target_precompile_headers(${folder}_tests PRIVATE
       <gmock/gmock.h> <gtest/gtest.h> <fstream> <filesystem> <thread> ${vexa_precompiled})

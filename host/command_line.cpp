@@ -18,6 +18,8 @@ constexpr char kFooter[] = R"(
 Start here:
   vexactl info 192.168.0.100 --credentials camera.cred
   vexactl record 192.168.0.100 --credentials camera.cred --seconds 10 --out live.h264
+  vexactl settings 192.168.0.100 --credentials camera.cred
+  vexactl set 192.168.0.100 codec=H.264 size=1280x720 --credentials camera.cred
   vexactl info 192.168.0.100 --credentials camera.cred --cgi-log cgi.log
   vexactl log cgi.log
   where the first line of camera.cred is USER:PASSWORD.
@@ -44,6 +46,12 @@ std::vector<std::unique_ptr<Command>> all_commands() {
   std::vector<std::unique_ptr<Command>> commands;
   commands.push_back(make_info_command());
   commands.push_back(make_record_command());
+  commands.push_back(make_settings_command());
+  commands.push_back(make_set_command());
+  commands.push_back(make_codecs_command());
+  commands.push_back(make_exposure_command());
+  commands.push_back(make_daynight_command());
+  commands.push_back(make_profile_command());
   commands.push_back(make_log_command());
   return commands;
 }

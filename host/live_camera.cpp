@@ -6,6 +6,7 @@
 #include <cstring>
 
 #include "host/printable.h"
+#include "host/redactor.h"
 #include "host/unique_fd.h"
 
 namespace vexa::host {
@@ -28,13 +29,10 @@ bool mentions_unauthorized(const std::string& text) { return strcasestr(text.c_s
 
 }  // namespace
 
-LiveCamera::LiveCamera(const CameraConnection& connection)
-    : connection_(connection), redactor_(connection.credentials) {
-  m_CameraInfo.codecType = kCodecH264;
-  m_CameraInfo.codecName = "H.264";
+void introduce(CLibraryDevice& device, const CameraConnection& connection) {
   const PrivateLog unshown;
-  SetCGILogPath(connection.cgi_log.value_or(unshown.path()).c_str());
-  SetCGILogLevel(connection.cgi_log.has_value());
+  device.SetCGILogPath(connection.cgi_log.value_or(unshown.path()).c_str());
+  device.SetCGILogLevel(connection.cgi_log.has_value());
   SLibDConnectionInfo info;
   info.streamTransport = kOverRtsp;
   info.host = connection.address.host;
@@ -42,7 +40,13 @@ LiveCamera::LiveCamera(const CameraConnection& connection)
   info.timeout = connection.timeout_ms;
   info.userName = connection.credentials.user;
   info.password = connection.credentials.password;
-  SetCurrentConnectionInfo(info);
+  device.SetCurrentConnectionInfo(info);
+}
+
+LiveCamera::LiveCamera(const CameraConnection& connection) : connection_(connection) {
+  m_CameraInfo.codecType = kCodecH264;
+  m_CameraInfo.codecName = "H.264";
+  introduce(*this, connection);
 }
 
 Result<LiveCamera::Identity> LiveCamera::identify(int stream) {
@@ -56,11 +60,11 @@ Result<LiveCamera::Identity> LiveCamera::identify(int stream) {
   return identity;
 }
 
-Problem LiveCamera::explain(ELibDReturnCode result) {
+Problem explain_failure(CLibraryDevice& device, ELibDReturnCode result, const CameraConnection& connection) {
   std::string text;
-  GetLatestErrorText(text);
-  const std::string why = text.empty() ? "no answer" : printable(redactor_(text));
-  const std::string camera = to_string(connection_.address);
+  device.GetLatestErrorText(text);
+  const std::string why = text.empty() ? "no answer" : printable(Redactor(connection.credentials)(text));
+  const std::string camera = to_string(connection.address);
   // A refused RTSP session answers LIBD_STREAM_OPEN_FAILED whatever the reason; only the text tells.
   if (result == LIBD_UNAUTHORIZED || mentions_unauthorized(text)) {
     return {ExitCode::kUnauthorized, fmt::format("the camera {} refuses user name and password: {}", camera, why),
@@ -70,7 +74,7 @@ Problem LiveCamera::explain(ELibDReturnCode result) {
   // An answer that never begins leaves no text.
   if (result == LIBD_TIMEOUT || text.empty()) {
     return {ExitCode::kUnreachable,
-            fmt::format("the camera {} did not answer within {} ms: {}", camera, connection_.timeout_ms, why),
+            fmt::format("the camera {} did not answer within {} ms: {}", camera, connection.timeout_ms, why),
             "Check address, power and network; a slow camera needs a longer --timeout."};
   }
   if (result == LIBD_STREAM_OPEN_FAILED) {

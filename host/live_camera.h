@@ -8,7 +8,6 @@
 #include "host/camera_address.h"
 #include "host/credentials.h"
 #include "host/problem.h"
-#include "host/redactor.h"
 #include "vexa/vexa_common.h"
 
 namespace vexa::host {
@@ -20,14 +19,21 @@ struct CameraConnection {
   std::optional<std::string> cgi_log = {};  // the file that requests and statuses are appended to
 };
 
+// Tells a driver where its camera is, and where its CGI log goes; contacts no camera.
+void introduce(CLibraryDevice& device, const CameraConnection& connection);
+
+// Puts a driver's latest failure into words; `result` is what the failed operation answered.
+[[nodiscard]] Problem explain_failure(CLibraryDevice& device, ELibDReturnCode result,
+                                      const CameraConnection& connection);
+
 // A model class for a camera that streams H.264 over RTSP/RTP.
 class LiveCamera final : public CVexaCommon {
  public:
   // Tells the driver where the camera is; contacts none.
   explicit LiveCamera(const CameraConnection& connection);
 
-  // Puts the latest failure into words; `result` is what the failed operation answered.
-  [[nodiscard]] Problem explain(ELibDReturnCode result);
+  [[nodiscard]] Problem explain(ELibDReturnCode result) { return explain_failure(*this, result, connection_); }
+  [[nodiscard]] const CameraConnection& connection() const { return connection_; }
 
   struct Identity {
     SLibDSystemInfo system;
@@ -38,7 +44,6 @@ class LiveCamera final : public CVexaCommon {
 
  private:
   const CameraConnection connection_;
-  const Redactor redactor_;
 };
 
 }  // namespace vexa::host

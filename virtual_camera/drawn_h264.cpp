@@ -1,6 +1,5 @@
 #include "virtual_camera/drawn_h264.h"
 
-#include <cstddef>
 #include <utility>
 
 namespace vexa::camera {
@@ -14,7 +13,6 @@ constexpr std::uint8_t kSequenceParameterSet = 0x67;
 constexpr std::uint8_t kPictureParameterSet = 0x68;
 constexpr std::uint8_t kIdrSlice = 0x65;
 constexpr std::uint8_t kSlice = 0x41;
-constexpr std::uint8_t kFiller = 0x0C;
 
 constexpr std::uint32_t kSliceI = 7;  // all slices of the picture are of this kind
 constexpr std::uint32_t kSliceP = 5;
@@ -189,20 +187,11 @@ void append_unit(std::vector<std::uint8_t>& to, std::uint8_t header, const std::
   }
 }
 
-void fill_up(std::vector<std::uint8_t>& to, std::size_t size) {
-  constexpr std::size_t kFrame = 6;  // start code, header, stop bit
-  if (to.size() + kFrame >= size) return;
-  std::vector<std::uint8_t> filler(size - to.size() - kFrame, 0xFF);
-  filler.push_back(0x80);
-  append_unit(to, kFiller, filler);
-}
-
 }  // namespace
 
 std::vector<std::uint8_t> draw_h264(const DrawnVideo& video) {
   const Grid grid(video);
   const auto rate = static_cast<std::uint32_t>(video.frame_rate);
-  const std::size_t budget = static_cast<std::size_t>(video.bit_rate) * 1000 / 8 / rate;  // bytes a picture
   std::vector<std::uint8_t> bytes;
   for (std::uint32_t second = 0; second < kSeconds; ++second) {
     for (std::uint32_t picture = 0; picture < rate; ++picture) {
@@ -214,7 +203,6 @@ std::vector<std::uint8_t> draw_h264(const DrawnVideo& video) {
       } else {
         append_unit(access_unit, kSlice, changed_slice(grid, picture));
       }
-      fill_up(access_unit, budget);
       bytes.insert(bytes.end(), access_unit.begin(), access_unit.end());
     }
   }

@@ -11,7 +11,6 @@ struct DrawnVideo {
   int width = 0;       // pixels, from 2; an odd side is rounded up
   int height = 0;      // pixels, from 2
   int frame_rate = 1;  // pictures a second, as the parameter sets say
-  int bit_rate = 0;    // kbit/s that filler data makes up to; smaller than the pictures need: no filler
 };
 
 // Two seconds in Annex-B format, to be repeated: each begins with parameter sets and a key picture of grey squares, in

@@ -75,6 +75,7 @@ SettingRules::SettingRules(CameraProfile profile) : profile_(std::move(profile))
   add_image();
   add_exposure();
   add_system();
+  add_card();
   find_lacking();
 }
 
@@ -189,6 +190,12 @@ void SettingRules::add_system() {
   add_switch(system_, "AlarmData", profile_.io);
 }
 
+// Hosts set the time-out of sessions here, also where there is no card.
+void SettingRules::add_card() {
+  if (profile_.edge_storage) return;
+  add(bound_["edgestorage"], "EsRTSPRec1Timeout", "60", {.words = {}, .least = 0, .most = 600});
+}
+
 void SettingRules::find_lacking() {
   const bool windowed = profile_.video_detection == "motion" || profile_.video_detection == "object";
   const struct {
@@ -201,24 +208,25 @@ void SettingRules::find_lacking() {
                   {"lod", profile_.video_detection == "lod"},
                   {"objectdetection", windowed},
                   {"audiodetection", profile_.audio_detection},
-                  {"edgestorage", profile_.edge_storage},
                   {"a-slot", profile_.edge_storage}};
   for (const auto& entry : sections) {
     if (!entry.present) lacking_.emplace_back(entry.section);
   }
 }
 
-const SettingRules::Pairs& SettingRules::factory(std::string_view section) const {
-  return section == "system" ? system_.factory : camera_.factory;
+std::map<std::string, SettingRules::Pairs> SettingRules::factory() const {
+  std::map<std::string, Pairs> sections;
+  for (const auto& [name, section] : bound_) sections[name] = section.factory;
+  return sections;
 }
 
 bool SettingRules::allow(std::string_view section, std::string_view key, std::string_view value) const {
   if (std::find(lacking_.begin(), lacking_.end(), section) != lacking_.end()) return false;
   if (section == "ptzf") return profile_.continuous_ptz || key != "ContinuousPanTiltZoom";
-  if (section != "camera" && section != "system") return true;
-  const Section& known = section == "system" ? system_ : camera_;
-  const auto found = known.values.find(key);
-  if (found == known.values.end()) return false;
+  const auto bound = bound_.find(section);
+  if (bound == bound_.end()) return true;
+  const auto found = bound->second.values.find(key);
+  if (found == bound->second.values.end()) return false;
   const Values& values = found->second;
   if (!values.words.empty()) return std::find(values.words.begin(), values.words.end(), value) != values.words.end();
   if (key.starts_with("ImageSize")) return size_of(value).has_value();

@@ -18,10 +18,11 @@ class SettingRules {
   using Pairs = std::vector<std::pair<std::string, std::string>>;  // key and value
 
   explicit SettingRules(CameraProfile profile);
+  SettingRules(const SettingRules&) = delete;
+  SettingRules& operator=(const SettingRules&) = delete;
 
-  // The settings that a command or an inquiry of this name meets in the camera as it leaves the factory. Only for
-  // "camera" and "system".
-  [[nodiscard]] const Pairs& factory(std::string_view section) const;
+  // The sections whose keys and values are bound, with their settings as the camera leaves the factory.
+  [[nodiscard]] std::map<std::string, Pairs> factory() const;
   // Sections that other cameras have and this one lacks.
   [[nodiscard]] const std::vector<std::string>& lacking() const { return lacking_; }
   // Makes the changes of one command in a section's settings. The camera takes all of them or none: false. Where a
@@ -49,6 +50,7 @@ class SettingRules {
   void add_image();
   void add_exposure();
   void add_system();
+  void add_card();
   void find_lacking();
   [[nodiscard]] bool allow(std::string_view section, std::string_view key, std::string_view value) const;
   void shrink(const Pairs& changes, Pairs& settings, std::size_t number) const;
@@ -56,8 +58,9 @@ class SettingRules {
   [[nodiscard]] bool size_agrees(const Pairs& settings, const OfferedCodec& codec, PictureSize size) const;
 
   CameraProfile profile_;
-  Section camera_;
-  Section system_;
+  std::map<std::string, Section, std::less<>> bound_;
+  Section& camera_ = bound_["camera"];
+  Section& system_ = bound_["system"];
   std::vector<std::string> lacking_;
 };
 

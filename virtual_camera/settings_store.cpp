@@ -148,7 +148,7 @@ bool SettingsStore::apply(std::string_view section, std::string_view query) {
 
 void SettingsStore::obey(std::shared_ptr<const SettingRules> rules) {
   const std::lock_guard<std::mutex> lock(mutex_);
-  for (const char* section : {"camera", "system"}) sections_[section].pairs = rules->factory(section);
+  for (auto& [section, pairs] : rules->factory()) sections_[section].pairs = std::move(pairs);
   for (const std::string& section : rules->lacking()) sections_.erase(section);
   rules_ = std::move(rules);
 }

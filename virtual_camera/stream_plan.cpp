@@ -41,8 +41,7 @@ std::optional<StreamPlan> plan_stream(const CameraOptions& options, const Settin
   if (options.clip || !options.profile) return StreamPlan{options.clip, options.frames_per_second};
   const auto stream = stream_settings(settings, number);
   if (!stream || stream->codec != "h264") return std::nullopt;
-  const std::vector<std::uint8_t> drawn =
-      draw_h264({stream->width, stream->height, stream->frame_rate, stream->bit_rate});
+  const std::vector<std::uint8_t> drawn = draw_h264({stream->width, stream->height, stream->frame_rate});
   return StreamPlan{std::make_shared<const PacketisedClip>(Clip::from_annex_b(drawn), options.max_payload),
                     static_cast<double>(stream->frame_rate)};
 }

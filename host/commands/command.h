@@ -26,6 +26,12 @@ class Command {
 std::unique_ptr<Command> make_info_command();
 std::unique_ptr<Command> make_record_command();
 std::unique_ptr<Command> make_log_command();
+std::unique_ptr<Command> make_settings_command();
+std::unique_ptr<Command> make_set_command();
+std::unique_ptr<Command> make_daynight_command();
+std::unique_ptr<Command> make_codecs_command();
+std::unique_ptr<Command> make_exposure_command();
+std::unique_ptr<Command> make_profile_command();
 
 }  // namespace vexa::host
 

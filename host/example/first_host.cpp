@@ -1,7 +1,8 @@
 #include <poll.h>
-#include <vexa/vexa.h>
+#include <vexa/models.h>
 
 #include <fstream>
+#include <iostream>
 
 struct Recording : CDataSink {  // the host's receiver of frames
   void Write(const unsigned char* data, unsigned int length) override {
@@ -18,12 +19,20 @@ int main(int argc, char** argv) {
   SLibDCameraInfo video;
   Recording recording;
   SLibDVideoFrameInfo frame{&recording};
-  CVexaCommon camera;
-  camera.SetCurrentConnectionInfo(connection);
-  if (camera.GetCameraInfo(video) != LIBD_OK || camera.StartVideoStreaming() != LIBD_OK) return 1;
-  while (recording.frames < 250) {
-    if (camera.GetCurrentVideoFrame(frame) == LIBD_TIMEOUT) return 2;  // the camera has fallen silent
-    poll(nullptr, 0, 3);                                               // milliseconds
+  vexa::Profile profile;
+  vexa::ProfileError error;
+  if (!vexa::LoadProfile("VX-2000", profile, error)) {
+    std::cerr << error.Message() << "\n";
+    return 3;
   }
-  return camera.StopVideoStreaming() == LIBD_OK ? 0 : 1;
+  const auto camera = vexa::MakeDevice(profile);  // the driver of this model: it knows what the camera can do
+  camera->SetCurrentConnectionInfo(connection);
+  if (camera->GetCameraInfo(video) != LIBD_OK) return 1;
+  video.bitRate = 4000;  // kbit/s
+  if (camera->SetCameraInfo(video) != LIBD_OK || camera->StartVideoStreaming() != LIBD_OK) return 1;
+  while (recording.frames < 250) {
+    if (camera->GetCurrentVideoFrame(frame) == LIBD_TIMEOUT) return 2;  // the camera has fallen silent
+    poll(nullptr, 0, 3);                                                // milliseconds
+  }
+  return camera->StopVideoStreaming() == LIBD_OK ? 0 : 1;
 }

@@ -91,7 +91,7 @@ TEST(ProfiledCamera, AnswersWithTheSettingsOfItsModelOnly) {
   EXPECT_EQ(settings.answer("system"),
             "ModelName=LMX-A100&SoftVersion=1.02.00&Serial=100001&ChannelId=1&VideoOutMode=ip&TamperingFunc=off&"
             "TamperingLevel=middle&TamperingStatusClear=off&AlarmData=off");
-  EXPECT_EQ(settings.answer("edgestorage"), std::nullopt);
+  EXPECT_EQ(settings.answer("edgestorage"), "EsRTSPRec1Timeout=60");
   EXPECT_EQ(settings.answer("presetposition"), std::nullopt);
 }
 
@@ -175,6 +175,7 @@ TEST(ProfiledCamera, TakesWhatItsModelHasAndRefusesTheRest) {
       {"LMX-M300", "objectdetection", "PositionMode=preset", false},
       {"VX-2000", "edgestorage", "Edgestorage=on", true},
       {"LMX-H100", "edgestorage", "Edgestorage=on", false},
+      {"LMX-H100", "edgestorage", "EsRTSPRec1Timeout=60", true},
       {"LMX-M300", "audiodetection", "ADFunc=on", true},
       {"LMX-H100", "audiodetection", "ADFunc=on", false},
   };

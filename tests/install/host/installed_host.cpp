@@ -6,6 +6,7 @@
 #include <memory>
 #include <string>
 
+#include "vexa/models.h"
 #include "vexa/vexa.h"
 
 namespace {
@@ -41,6 +42,16 @@ void check_driver() {
   check(SLibDCameraInfo().reserved19 == 7, "records are constructed");
 }
 
+void check_models() {
+  check(vexa::ProfileNames().size() >= 5, "the installed profiles are found");
+  vexa::Profile profile;
+  vexa::ProfileError error;
+  check(vexa::LoadProfile("LMX-P200", profile, error), "an installed profile is right");
+  const std::unique_ptr<CLibraryDevice> device = vexa::MakeDevice(profile);
+  SLibDFixedCameraInfo video;
+  check(device && device->GetFixedCameraInfo(video) == LIBD_OK && !video.codecs.empty(), "a model knows its codecs");
+}
+
 void check_runtime_by_name() {
   void* const library = dlopen("libVexaCommon.so.1", RTLD_NOW | RTLD_NOLOAD);
   check(library != nullptr, "libVexaCommon.so.1 is the loaded library");
@@ -54,6 +65,7 @@ void check_runtime_by_name() {
 
 int main() {
   check_driver();
+  check_models();
   check_runtime_by_name();
   if (g_failures == 0) std::puts("the installed library works");
   return g_failures == 0 ? 0 : 1;

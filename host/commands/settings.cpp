@@ -1,0 +1,118 @@
+// vexactl settings, set and daynight: how a camera is set, and changing it.
+#include <fmt/format.h>
+
+#include <nlohmann/json.hpp>
+#include <utility>
+
+#include "host/camera_settings.h"
+#include "host/commands/command.h"
+#include "host/result_output.h"
+
+namespace vexa::host {
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+class SettingsCommand final : public Command {
+ public:
+  CLI::App* declare(CLI::App& program, const char* const* environment) override {
+    CLI::App* command = program.add_subcommand("settings", "Show how a camera is set");
+    read_environment(options_.camera.credentials, environment);
+    add_model_options(*command, options_);
+    command->footer("A setting that the camera does not report shows as \"-\", in JSON as null.");
+    return command;
+  }
+
+  ExitCode run(Terminal& terminal) override {
+    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
+    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
+    const Result<Json> settings = read_settings(std::get<ModelCamera>(opened));
+    if (const auto* problem = std::get_if<Problem>(&settings)) return terminal.report(*problem);
+    const auto& json = std::get<Json>(settings);
+    return write_result(terminal, options_.camera.json ? to_text(json) : settings_table(json));
+  }
+
+ private:
+  ModelOptions options_;
+};
+
+class SetCommand final : public Command {
+ public:
+  CLI::App* declare(CLI::App& program, const char* const* environment) override {
+    CLI::App* command = program.add_subcommand("set", "Change a camera's settings");
+    read_environment(options_.camera.credentials, environment);
+    add_model_options(*command, options_);
+    command->add_option("settings", changes_, "what to change, each as KEY=VALUE")->required()->type_name("");
+    command->footer("Settings:\n" + known_settings() +
+                    "\nFor instance:\n  vexactl set 192.168.0.100 codec=H.264 size=1280x720 frame-rate=25 "
+                    "bit-rate=4000\n\nIt shows the settings as they are afterwards.");
+    return command;
+  }
+
+  ExitCode run(Terminal& terminal) override {
+    const Result<SettingChanges> changes = parse_changes(changes_);
+    if (const auto* problem = std::get_if<Problem>(&changes)) return terminal.report(*problem);
+    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
+    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
+    const auto& camera = std::get<ModelCamera>(opened);
+    if (const auto problem = change_settings(camera, std::get<SettingChanges>(changes))) {
+      return terminal.report(*problem);
+    }
+    const Result<Json> settings = read_settings(camera);
+    if (const auto* problem = std::get_if<Problem>(&settings)) return terminal.report(*problem);
+    const auto& json = std::get<Json>(settings);
+    return write_result(terminal, options_.camera.json ? to_text(json) : settings_table(json));
+  }
+
+ private:
+  ModelOptions options_;
+  std::vector<std::string> changes_;
+};
+
+class DayNightCommand final : public Command {
+ public:
+  CLI::App* declare(CLI::App& program, const char* const* environment) override {
+    CLI::App* command = program.add_subcommand("daynight", "Show or set a camera's day/night mode");
+    read_environment(options_.camera.credentials, environment);
+    add_model_options(*command, options_);
+    command->add_option("mode", mode_, "auto, day or night; left out: show the present mode")->type_name("");
+    return command;
+  }
+
+  ExitCode run(Terminal& terminal) override {
+    SettingChanges changes;
+    if (mode_) changes.day_night = parse_day_night(*mode_);
+    if (mode_ && !changes.day_night) {
+      return terminal.report({ExitCode::kUsage, "there is no such day/night mode", "It is auto, day or night."});
+    }
+    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
+    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
+    const auto& camera = std::get<ModelCamera>(opened);
+    if (const auto problem = change_settings(camera, changes)) return terminal.report(*problem);
+    return show(camera, terminal);
+  }
+
+ private:
+  ExitCode show(const ModelCamera& camera, Terminal& terminal) const {
+    ELibDDayNightType mode = LIBD_DAYNIGHT_UNKNOWN;
+    const ELibDReturnCode result = camera.device().GetDayNightMode(mode);
+    const auto word = word_for(kDayNightWords, mode);
+    if (result == LIBD_FAILED || !word) {
+      return terminal.report({ExitCode::kUnreachable, "the camera reports no day/night mode",
+                              "vexactl settings shows what the camera has."});
+    }
+    if (result != LIBD_OK) return terminal.report(camera.explain(result));
+    return write_result(terminal, options_.camera.json ? to_text(Json{{"day-night", *word}}) : *word + "\n");
+  }
+
+  ModelOptions options_;
+  std::optional<std::string> mode_;
+};
+
+}  // namespace
+
+std::unique_ptr<Command> make_settings_command() { return std::make_unique<SettingsCommand>(); }
+std::unique_ptr<Command> make_set_command() { return std::make_unique<SetCommand>(); }
+std::unique_ptr<Command> make_daynight_command() { return std::make_unique<DayNightCommand>(); }
+
+}  // namespace vexa::host
