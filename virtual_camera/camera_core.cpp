@@ -58,8 +58,8 @@ std::string CameraCore::prepare() {
     if (!options.images) return fmt::format("no pictures in {}", options.image_path);
   }
   if (options.clip || options.clip_path.empty()) return {};
-  options.clip = PacketisedClip::load(options.clip_path, options.max_payload);
-  return options.clip ? "" : fmt::format("no H.264 pictures in {}", options.clip_path);
+  options.clip = PacketisedClip::load(options.clip_path, options.max_payload, options.user_data);
+  return options.clip ? "" : fmt::format("no pictures in {}", options.clip_path);
 }
 
 std::string CameraCore::start() {

@@ -23,7 +23,7 @@ CameraHost::CameraHost(const CameraOptions& options, std::size_t cameras, std::s
   for (std::size_t i = 0; i < loops; ++i) loops_.push_back(std::make_shared<EventLoop>());
   CameraOptions shared = options;
   if (!shared.clip && !shared.clip_path.empty()) {
-    shared.clip = PacketisedClip::load(shared.clip_path, shared.max_payload);
+    shared.clip = PacketisedClip::load(shared.clip_path, shared.max_payload, shared.user_data);
   }
   for (std::size_t i = 0; i < cameras; ++i) {
     CameraOptions own = shared;

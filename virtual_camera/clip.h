@@ -7,6 +7,7 @@
 #include <optional>
 #include <span>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace vexa::camera {
@@ -31,6 +32,8 @@ struct AccessUnit {
 
 class Clip {
  public:
+  Clip() = default;
+  explicit Clip(std::vector<AccessUnit> access_units) : access_units_(std::move(access_units)) {}
   // Nothing when the file cannot be read or holds no access unit.
   [[nodiscard]] static std::optional<Clip> load(const std::string& path);
   // Bytes before the first start code are left out.

@@ -14,7 +14,7 @@ namespace {
 constexpr int kUsageError = 2;
 
 constexpr const char* kAbout =
-    "A network camera in software: HTTP commands, RTSP, and H.264 over RTP/UDP from a clip.\n"
+    "A network camera in software: HTTP commands, RTSP, and video over RTP/UDP from a clip.\n"
     "Prints one line for each camera once all are ready, and runs until a signal or --duration.\n"
     "Example: vexa-camera --clip build/clips/hd.h264 --count 2 --loss 0.01";
 
@@ -50,11 +50,14 @@ void add_stream(CLI::App& app, CameraOptions& camera) {
   app.add_option("--profile", camera.profile_path,
                  "profile of the camera model; without --clip it streams what its settings say")
       ->check(CLI::ExistingFile);
-  app.add_option("--clip", camera.clip_path, "H.264 file in Annex-B format to stream")->check(CLI::ExistingFile);
+  app.add_option("--clip", camera.clip_path,
+                 "file to stream over RTP: H.264 (.h264, Annex B), MPEG-4 (.m4v) or JPEG (.mjpeg)")
+      ->check(CLI::ExistingFile);
   app.add_option("--images", camera.image_path, "file to stream over HTTP: JPEG (.mjpeg), .h264 or MPEG-4 (.m4v)")
       ->check(CLI::ExistingFile);
   app.add_option("--sound", camera.sound_path, "sound to stream over HTTP: this name and the codec, \"NAME.g711_64\"");
-  app.add_option("--user-data", camera.user_data, "text in every picture over HTTP, such as \"CamPos: 1/2/3\"");
+  app.add_option("--user-data", camera.user_data,
+                 "text in every picture over HTTP, and in key pictures over RTP, such as \"CamPos: 1/2/3\"");
   app.add_flag("--once{false}", camera.loop, "end the stream with the clip instead of starting it over");
   app.add_option("--pictures", camera.pictures, "end the stream after this many pictures");
   app.add_option("--fps", camera.frames_per_second, "pictures a second")

@@ -44,17 +44,6 @@ std::vector<std::string> cut_h264(std::string_view bytes) {
   return pictures;
 }
 
-std::string sei_unit(std::string_view text) {
-  constexpr std::size_t kUuidSize = 16;
-  constexpr std::size_t kLargestSizeByte = 255;
-  std::string unit("\0\0\0\1\6\5", 6);  // an SEI unit that holds unregistered user data
-  std::size_t size = kUuidSize + text.size();
-  for (; size >= kLargestSizeByte; size -= kLargestSizeByte) unit += '\xff';
-  unit += static_cast<char>(size);
-  unit.append(kUuidSize, 'u').append(text);
-  return unit + '\x80';
-}
-
 }  // namespace
 
 std::shared_ptr<const ImageClip> ImageClip::load(const std::string& path) {
@@ -102,6 +91,17 @@ std::vector<std::string> cut_mpeg4(std::string_view bytes) {
     begin = unit;
   }
   return pictures;
+}
+
+std::string sei_unit(std::string_view text) {
+  constexpr std::size_t kUuidSize = 16;
+  constexpr std::size_t kLargestSizeByte = 255;
+  std::string unit("\0\0\0\1\6\5", 6);  // an SEI unit that holds unregistered user data
+  std::size_t size = kUuidSize + text.size();
+  for (; size >= kLargestSizeByte; size -= kLargestSizeByte) unit += '\xff';
+  unit += static_cast<char>(size);
+  unit.append(kUuidSize, 'u').append(text);
+  return unit + '\x80';
 }
 
 std::string with_user_data(ImageKind kind, const std::string& picture, std::string_view text) {

@@ -33,6 +33,9 @@ class ImageClip {
 // in front of an H.264 picture, a user-data unit in front of the coded MPEG-4 picture. Unchanged without a text.
 [[nodiscard]] std::string with_user_data(ImageKind kind, const std::string& picture, std::string_view text);
 
+// A SEI unit of unregistered user data (ITU-T H.264, D.1.7) that holds the text, behind a start code of four bytes.
+[[nodiscard]] std::string sei_unit(std::string_view text);
+
 // The pictures of a file of each kind.
 [[nodiscard]] std::vector<std::string> cut_jpeg(std::string_view bytes);
 [[nodiscard]] std::vector<std::string> cut_mpeg4(std::string_view bytes);

@@ -31,8 +31,8 @@ struct CameraOptions {
   std::string profile_path;
   std::shared_ptr<const SettingRules> profile;
 
-  // The clip to stream: a file in Annex-B byte stream format, or one already loaded, which wins and can be shared by
-  // many cameras. With neither, sessions open but carry no picture.
+  // The clip to stream over RTP: a file (".h264", else ".m4v" or ".mjpeg", as ImageClip has it), or one already loaded,
+  // which wins and can be shared by many cameras. With neither, sessions open but carry no picture.
   std::string clip_path;
   std::shared_ptr<const PacketisedClip> clip;
   bool loop = true;            // start the clip over at its end
@@ -44,7 +44,7 @@ struct CameraOptions {
   std::shared_ptr<const ImageClip> images;
   std::string
       sound_path;         // "/audio" streams this file with the codec's word behind it: "tone" means "tone.g711_64" ...
-  std::string user_data;  // in every picture over HTTP, such as "CamPos: ..."
+  std::string user_data;  // in every picture over HTTP and in key pictures over RTP, such as "CamPos: ..."
   std::size_t stream_piece = 0;  // bytes of an HTTP stream that leave at a time; 0: a picture at once
   std::vector<HttpStreamFault> stream_faults;
 
@@ -53,7 +53,7 @@ struct CameraOptions {
   std::uint32_t clock_rate = 90000;
   std::uint16_t start_sequence = 1;
   std::uint32_t start_timestamp = 100000000;
-  std::uint8_t payload_type = 96;
+  std::uint8_t payload_type = 96;  // JPEG has 26 whatever stands here
   std::size_t max_payload = 1400;  // RTP payload bytes of one datagram, at least 3
   // A picture goes out in bursts of at most this many packets, spread over half the picture's time.
   std::size_t burst_packets = 16;

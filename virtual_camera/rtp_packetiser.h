@@ -1,4 +1,5 @@
-// H.264 access units as RTP payloads (RFC 6184): single NAL units, and fragmentation units (FU-A) for what is larger.
+// Pictures as RTP payloads: H.264 as single NAL units and fragmentation units FU-A (RFC 6184), MPEG-4 Visual in pieces
+// (RFC 3016), JPEG as scan data behind headers (RFC 2435).
 #ifndef VIRTUAL_CAMERA_RTP_PACKETISER_H_
 #define VIRTUAL_CAMERA_RTP_PACKETISER_H_
 
@@ -10,14 +11,19 @@
 #include <vector>
 
 #include "virtual_camera/clip.h"
+#include "virtual_camera/image_clip.h"
+#include "virtual_camera/jpeg_picture.h"
 
 namespace vexa::camera {
 
-// The payloads of one access unit, in order, packed into one block.
+// The payloads of one picture, in order, packed into one block.
 class PacketisedPicture {
  public:
+  PacketisedPicture() = default;
   // `max_payload` is at least 3.
   PacketisedPicture(const AccessUnit& access_unit, std::size_t max_payload);
+
+  void add_payload(std::span<const std::uint8_t> head, std::span<const std::uint8_t> body);
 
   [[nodiscard]] std::size_t packets() const { return ends_.size(); }
   [[nodiscard]] std::span<const std::uint8_t> payload(std::size_t packet) const {
@@ -26,25 +32,43 @@ class PacketisedPicture {
   }
 
  private:
-  void add_single(std::span<const std::uint8_t> unit);
   void add_fragments(std::span<const std::uint8_t> unit, std::size_t max_payload);
 
   std::vector<std::uint8_t> bytes_;
   std::vector<std::size_t> ends_;
 };
 
+[[nodiscard]] PacketisedPicture packetise_mpeg4(std::span<const std::uint8_t> picture, std::size_t max_payload);
+
+// The tables go in band, behind the first header. `user_data` may be empty; it stands before that header. A packet is
+// larger than `max_payload` where its headers leave no room for a byte.
+[[nodiscard]] PacketisedPicture packetise_jpeg(const JpegPicture& picture, std::span<const std::uint8_t> user_data,
+                                               std::size_t max_payload);
+
 // A clip cut into packets once, for any number of cameras and clients. Immutable.
 class PacketisedClip {
  public:
   PacketisedClip(Clip clip, std::size_t max_payload);
-  // Null when the file cannot be read or holds no access unit.
-  [[nodiscard]] static std::shared_ptr<const PacketisedClip> load(const std::string& path, std::size_t max_payload);
+  // Of an Annex-B file, whatever its name, or of a JPEG or MPEG-4 file as ImageClip reads it. Null when it cannot be
+  // read, holds no picture, or one that RTP cannot carry. The text, where there is one, goes into the user data of key
+  // pictures: a SEI unit before the first slice, a user-data unit before the plane, a block before the JPEG header.
+  [[nodiscard]] static std::shared_ptr<const PacketisedClip> load(const std::string& path, std::size_t max_payload,
+                                                                  const std::string& user_data = {});
 
-  [[nodiscard]] const Clip& clip() const { return clip_; }
+  [[nodiscard]] ImageKind codec() const { return codec_; }
+  [[nodiscard]] const Clip& clip() const { return clip_; }  // H.264; empty for other codecs
   [[nodiscard]] const std::vector<PacketisedPicture>& pictures() const { return pictures_; }
+  // Picture `index`: H.264 as a receiver rebuilds it, MPEG-4 as it is sent, JPEG as the encoder made it.
+  [[nodiscard]] std::vector<std::uint8_t> picture(std::size_t index) const;
+  [[nodiscard]] bool is_key(std::size_t index) const;
 
  private:
+  explicit PacketisedClip(const ImageClip& images) : codec_(images.kind()), images_(images.pictures()) {}
+  [[nodiscard]] bool packetise(std::size_t max_payload, const std::string& user_data);
+
+  ImageKind codec_ = ImageKind::kH264;
   Clip clip_;
+  std::vector<std::string> images_;  // of the other codecs
   std::vector<PacketisedPicture> pictures_;
 };
 

@@ -25,6 +25,12 @@ void put_u32(std::uint8_t* to, std::uint32_t value) {
 
 }  // namespace
 
+std::uint8_t payload_type_of(const CameraOptions& options) {
+  constexpr std::uint8_t kJpeg = 26;
+  if (options.clip && options.clip->codec() == ImageKind::kJpeg) return kJpeg;
+  return options.payload_type & 0x7FU;
+}
+
 void Outgoing::read_header() {
   record.marker = (header[1] & 0x80U) != 0;
   record.sequence = static_cast<std::uint16_t>(header[2] << 8U | header[3]);
@@ -42,7 +48,7 @@ RtpStream::RtpStream(const CameraOptions& options, const PacketFaults& faults, s
       last_picture_(end_of(options)),
       session_(session),
       ssrc_(static_cast<std::uint32_t>(random_())),
-      payload_type_(options.payload_type & 0x7FU),
+      payload_type_(payload_type_of(options)),
       sequence_(options.start_sequence),
       timestamp_base_(options.start_timestamp) {}
 

@@ -30,6 +30,9 @@ struct Outgoing {
   void read_header();
 };
 
+// The payload type of the options' clip: JPEG has a static one (RFC 3551, table 5).
+[[nodiscard]] std::uint8_t payload_type_of(const CameraOptions& options);
+
 class RtpStream {
  public:
   // `options.clip` is set and outlives the packets handed out. `seed` draws restarts without a value, and the SSRC.

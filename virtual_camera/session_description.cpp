@@ -7,6 +7,7 @@
 
 #include "virtual_camera/credentials.h"
 #include "virtual_camera/rtp_packetiser.h"
+#include "virtual_camera/rtp_stream.h"
 
 namespace vexa::camera {
 namespace {
@@ -36,6 +37,20 @@ std::string parameter_sets(const PacketisedClip* clip) {
                      base64_text(picture));
 }
 
+// The lines that tell the codec (RFC 6184, 8.2; RFC 3016, 5.2; RFC 2435).
+std::string format_lines(const CameraOptions& options, std::string_view sets) {
+  const auto type = payload_type_of(options);
+  switch (options.clip ? options.clip->codec() : ImageKind::kH264) {
+    case ImageKind::kJpeg:
+      return fmt::format("a=rtpmap:{} JPEG/{}\r\n", type, options.clock_rate);
+    case ImageKind::kMpeg4:
+      return fmt::format("a=rtpmap:{0} MP4V-ES/{1}\r\na=fmtp:{0} profile-level-id=1\r\n", type, options.clock_rate);
+    case ImageKind::kH264:
+      break;
+  }
+  return fmt::format("a=rtpmap:{0} H264/{1}\r\na=fmtp:{0} packetization-mode=1{2}\r\n", type, options.clock_rate, sets);
+}
+
 std::string description(const CameraOptions& options, std::string_view sets) {
   const std::string range = options.range_clock.empty() ? "" : fmt::format("a=range:clock={}\r\n", options.range_clock);
   return fmt::format(
@@ -45,10 +60,9 @@ std::string description(const CameraOptions& options, std::string_view sets) {
       "t=0 0\r\n"
       "{1}"
       "m=video 0 RTP/AVP {2}\r\n"
-      "a=rtpmap:{2} H264/{3}\r\n"
-      "a=fmtp:{2} packetization-mode=1{4}\r\n"
+      "{3}"
       "a=control:video\r\n",
-      options.address, range, options.payload_type, options.clock_rate, sets);
+      options.address, range, payload_type_of(options), format_lines(options, sets));
 }
 
 }  // namespace

@@ -4,10 +4,12 @@
 #include <gtest/gtest.h>
 
 #include <memory>
+#include <optional>
 #include <string>
 
 #include "tests/media/media_driver.h"
 #include "tests/support/own_address.h"
+#include "virtual_camera/jpeg_picture.h"
 #include "virtual_camera/rtp_packetiser.h"
 #include "virtual_camera/virtual_camera.h"
 
@@ -40,22 +42,44 @@ class LiveCamera {
 
   void introduce(MediaDriver& driver, int timeout = 5000) {
     driver.use(camera_.address(), camera_.http_port(), timeout);
-    driver.use_live_h264();
+    driver.use_live(codec_name());
   }
 
-  bool is_key(std::uint64_t index) const {
-    const auto& units = camera_.clip()->clip().access_units();
-    return units[static_cast<std::size_t>(index % units.size())].key;
-  }
+  bool is_key(std::uint64_t index) const { return camera_.clip()->is_key(place(index)); }
 
-  /// Picture `index` of the stream, as it must arrive.
+  /// Picture `index` of the stream: as it must arrive; of JPEG as the encoder made it.
   std::string picture(std::uint64_t index) const {
-    const auto& units = camera_.clip()->clip().access_units();
-    const auto bytes = units[static_cast<std::size_t>(index % units.size())].as_delivered();
+    const auto bytes = camera_.clip()->picture(place(index));
     return {bytes.begin(), bytes.end()};
   }
 
+  /// Whether the frame is picture `index`. A JPEG picture arrives with a header of the driver's: it must tell the same.
+  bool sent(std::uint64_t index, const std::string& frame) const {
+    if (camera_.clip()->codec() != vexa::camera::ImageKind::kJpeg) return frame == picture(index);
+    const auto arrived = read_frame(frame);
+    return arrived && arrived == read_frame(picture(index));
+  }
+
  private:
+  static std::optional<vexa::camera::JpegPicture> read_frame(const std::string& jpeg) {
+    return vexa::camera::read_jpeg({reinterpret_cast<const std::uint8_t*>(jpeg.data()), jpeg.size()});
+  }
+  std::size_t place(std::uint64_t index) const {
+    return static_cast<std::size_t>(index % camera_.clip()->pictures().size());
+  }
+  const char* codec_name() const {
+    if (camera_.clip() == nullptr) return "H.264";
+    switch (camera_.clip()->codec()) {
+      case vexa::camera::ImageKind::kJpeg:
+        return "JPEG";
+      case vexa::camera::ImageKind::kMpeg4:
+        return "MPEG4";
+      case vexa::camera::ImageKind::kH264:
+        break;
+    }
+    return "H.264";
+  }
+
   vexa::camera::VirtualCamera camera_;
 };
 

@@ -46,6 +46,7 @@ class MediaDriver : public TestDriver {
   using CVexaCommon::m_StreamWaitMs;
   using CVexaCommon::m_VideoStateLock;
   using CVexaCommon::m_VideoTimedOut;
+  using CVexaCommon::OpenLiveRtp;
   using CVexaCommon::ProcessCurrentFrameData;
   using CVexaCommon::PropulateFrameInfoList;
   using CVexaCommon::ReleaseRtpPacketsPtr;
@@ -55,6 +56,7 @@ class MediaDriver : public TestDriver {
   using CVexaCommon::RTPJpegToJIF;
   using CVexaCommon::StampPicture;
   using CVexaCommon::StartStreamingThread;
+  using CVexaCommon::StreamCodec;
   using CVexaCommon::StreamingThread;
   using CVexaCommon::TakeCameraPosition;
 };

@@ -150,7 +150,7 @@ TEST(HttpCameraLimits, SettingsThatMakeNoSenseAreRefusedAtTheStart) {
       {[](CameraOptions& o) { o.clock_rate = 0; }, "frames per second, speed and clock rate must be above 0"},
       {[](CameraOptions& o) { o.max_payload = 2; }, "too small a packet or burst"},
       {[](CameraOptions& o) { o.burst_packets = 0; }, "too small a packet or burst"},
-      {[](CameraOptions& o) { o.clip_path = "/nowhere/clip"; }, "no H.264 pictures in /nowhere/clip"},
+      {[](CameraOptions& o) { o.clip_path = "/nowhere/clip"; }, "no pictures in /nowhere/clip"},
   };
   for (const auto& c : cases) {
     CameraOptions options = test_options();
