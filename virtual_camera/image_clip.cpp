@@ -47,8 +47,6 @@ std::vector<std::string> cut_h264(std::string_view bytes) {
 }  // namespace
 
 std::shared_ptr<const ImageClip> ImageClip::load(const std::string& path) {
-  std::ifstream file(path, std::ios::binary);
-  const std::string bytes((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
   const struct {
     std::string_view extension;
     ImageKind kind;
@@ -58,6 +56,8 @@ std::shared_ptr<const ImageClip> ImageClip::load(const std::string& path) {
                {".m4v", ImageKind::kMpeg4, cut_mpeg4}};
   for (const auto& row : kinds) {
     if (!path.ends_with(row.extension)) continue;
+    std::ifstream file(path, std::ios::binary);
+    const std::string bytes((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
     std::vector<std::string> pictures = row.cut(bytes);
     if (!pictures.empty()) return std::make_shared<const ImageClip>(row.kind, std::move(pictures));
   }
