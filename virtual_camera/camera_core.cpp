@@ -33,6 +33,7 @@ CameraCore::CameraCore(std::shared_ptr<CameraState> state)
     : state_(std::move(state)),
       http_(listener_of<HttpConnection>(state_)),
       rtsp_(listener_of<RtspConnection>(state_)),
+      control_(std::make_shared<AlarmControl>(state_)),
       back_(state_->context) {}
 
 std::string CameraCore::open_ports() {
@@ -67,11 +68,31 @@ std::string CameraCore::start() {
   std::string failure = prepare();
   if (failure.empty()) failure = open_ports();
   if (!failure.empty()) return failure;
+  if (state_->options.control) {
+    if (const asio::error_code error = control_->open(state_->options.control_port)) {
+      vanish();
+      return bind_failure("127.0.0.1", state_->options.control_port, error);
+    }
+  }
   running_ = true;
+  spread_alarms();
   state_->reboot = [weak = weak_from_this()](std::chrono::milliseconds away) {
     if (const std::shared_ptr<CameraCore> core = weak.lock()) core->reboot(away);
   };
   return {};
+}
+
+// Changes may come from any thread; the connections live on the loop's.
+void CameraCore::spread_alarms() {
+  state_->alarms.listen([weak = weak_from_this(), &context = state_->context](const std::string& part) {
+    asio::post(context, [weak, part] {
+      const std::shared_ptr<CameraCore> core = weak.lock();
+      if (!core) return;
+      for (const std::weak_ptr<Connection>& connection : core->state_->connections) {
+        if (const std::shared_ptr<Connection> open = connection.lock()) open->take_alarm(part);
+      }
+    });
+  });
 }
 
 void CameraCore::vanish() {
@@ -86,6 +107,8 @@ void CameraCore::stop() {
   running_ = false;
   state_->reboot = nullptr;
   back_.cancel();
+  state_->alarms.listen(nullptr);
+  control_->close();
   vanish();
 }
 

@@ -8,6 +8,7 @@
 #include <memory>
 #include <string>
 
+#include "virtual_camera/alarm_control.h"
 #include "virtual_camera/camera_state.h"
 #include "virtual_camera/listener.h"
 
@@ -25,16 +26,19 @@ class CameraCore : public std::enable_shared_from_this<CameraCore> {
   [[nodiscard]] const std::shared_ptr<CameraState>& state() const { return state_; }
   [[nodiscard]] std::uint16_t http_port() const { return http_->port(); }
   [[nodiscard]] std::uint16_t rtsp_port() const { return rtsp_->port(); }
+  [[nodiscard]] std::uint16_t control_port() const { return control_->port(); }
 
  private:
   [[nodiscard]] std::string prepare();
   [[nodiscard]] std::string open_ports();
   void vanish();
   void come_back();
+  void spread_alarms();
 
   std::shared_ptr<CameraState> state_;
   std::shared_ptr<Listener> http_;
   std::shared_ptr<Listener> rtsp_;
+  std::shared_ptr<AlarmControl> control_;
   asio::steady_timer back_;
   bool running_ = false;
 };

@@ -16,7 +16,23 @@ void CameraState::take_profile() {
     }
     options.profile = std::make_shared<const SettingRules>(std::get<CameraProfile>(std::move(loaded)));
   }
-  if (options.profile) settings.obey(options.profile);
+  if (!options.profile) return;
+  settings.obey(options.profile);
+  const CameraProfile& model = options.profile->profile();
+  alarms.rearrange({model.alarm_inputs, model.video_detection, model.tampering_detection, model.audio_detection});
+}
+
+void CameraState::report_contacts() {
+  if (!settings.answer("sensor")) return;
+  const std::vector<int> contacts = alarms.contacts();
+  for (std::size_t i = 0; i < contacts.size(); ++i) {
+    settings.set("sensor", "Sensor" + std::to_string(i + 1), std::to_string(contacts[i]));
+  }
+}
+
+void CameraState::switch_detectors() {
+  alarms.switch_detectors(settings.get("system", "TamperingFunc") == "on",
+                          settings.get("audiodetection", "ADFunc") == "on");
 }
 
 }  // namespace vexa::camera

@@ -12,6 +12,7 @@
 #include <utility>
 #include <vector>
 
+#include "virtual_camera/alarm_scene.h"
 #include "virtual_camera/event_loop.h"
 #include "virtual_camera/journal.h"
 #include "virtual_camera/options.h"
@@ -30,6 +31,7 @@ struct CameraState {
   CameraState(CameraOptions camera_options, asio::io_context& loop_context)
       : options(std::move(camera_options)),
         context(loop_context),
+        alarms(options.alarms),
         journal(options.journal_limit),
         sent(options.sent_log_limit),
         packet_faults(options.packet_faults),
@@ -40,10 +42,15 @@ struct CameraState {
 
   // Loads the profile that the options name; `profile_error` says why it could not be.
   void take_profile();
+  // Puts the contacts into the settings, where the inquiry reads them.
+  void report_contacts();
+  // The detectors are as the settings say, from now on.
+  void switch_detectors();
 
   CameraOptions options;      // unchanged once the camera runs
   std::string profile_error;  // empty: none
   asio::io_context& context;
+  AlarmScene alarms;
   SettingsStore settings;
   Journal journal;
   SentLog sent;

@@ -30,6 +30,15 @@ void add_place(CLI::App& app, ProgramOptions& options) {
       ->capture_default_str();
   app.add_option("--http-port", camera.http_port, "0 takes any free port")->capture_default_str();
   app.add_option("--rtsp-port", camera.rtsp_port, "0 takes any free port")->capture_default_str();
+  app.add_option_function<std::uint16_t>(
+         "--control-port",
+         [&camera](std::uint16_t port) {
+           camera.control = true;
+           camera.control_port = port;
+         },
+         "port on 127.0.0.1 that makes things happen around the camera: GET /contact/1/close, /lens/cover, /noise/on, "
+         "/motion/1/50, /walk")
+      ->option_text("PORT");
   app.add_option("--journal", options.journal_path, "write every request to this file, one JSON object a line");
   app.add_option("--duration", options.duration, "end after this many seconds")->check(CLI::NonNegativeNumber);
 }

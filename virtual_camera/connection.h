@@ -25,7 +25,8 @@ class Connection : public std::enable_shared_from_this<Connection> {
   Connection& operator=(const Connection&) = delete;
 
   void start();
-  void reset();  // ends the connection at once with a TCP reset
+  void reset();                                   // ends the connection at once with a TCP reset
+  virtual void take_alarm(const std::string&) {}  // the part of a change around the camera
 
  protected:
   enum class Next { kCloseConnection, kReadOn, kStream };

@@ -1,6 +1,7 @@
 #include "virtual_camera/http_connection.h"
 
 #include <algorithm>
+#include <charconv>
 #include <cmath>
 #include <fstream>
 #include <iterator>
@@ -30,7 +31,22 @@ std::string contents_of(const std::string& path) {
   return {std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
 }
 
+// "interval=SECONDS"; a second where it is not named.
+std::chrono::duration<double> interval_of(std::string_view query) {
+  constexpr std::string_view kKey = "interval=";
+  constexpr int kLongest = 3600;
+  int seconds = 1;
+  if (query.starts_with(kKey)) {
+    query.remove_prefix(kKey.size());
+    std::from_chars(query.data(), query.data() + query.size(), seconds);
+  }
+  return std::chrono::seconds(std::clamp(seconds, 1, kLongest));
+}
+
 }  // namespace
+
+HttpConnection::HttpConnection(asio::ip::tcp::socket socket, std::shared_ptr<CameraState> state)
+    : Connection(std::move(socket), std::move(state)), next_part_(this->state().context) {}
 
 std::size_t HttpConnection::request_size(std::string_view received) const { return head_size(received); }
 
@@ -43,7 +59,58 @@ Answer HttpConnection::answer(const std::string& request) {
   }
   stream_ = open_stream(head->path);
   if (stream_) return {200, stream_->head()};
-  return answer_command(*head, state().settings);
+  if (std::optional<Answer> feed = open_feed(*head)) return *feed;
+  return command(*head);
+}
+
+Answer HttpConnection::command(const RequestHead& head) {
+  if (head.query == "inq=sensor") state().report_contacts();
+  Answer answer = answer_command(head, state().settings);
+  if (answer.status != 204) return answer;
+  state().switch_detectors();
+  if (head.path == "/command/system.cgi" && head.query == "TamperingStatusClear=on") state().alarms.clear_tampering();
+  return answer;
+}
+
+// Nothing for a path that names no feed, or one that the model lacks.
+std::optional<Answer> HttpConnection::open_feed(const RequestHead& head) {
+  if (head.path == "/command/alarmdata.cgi") feed_ = Feed::kAlarms;
+  if (head.path == "/mddata.cgi") feed_ = Feed::kMetadata;
+  if (feed_ == Feed::kNone) return std::nullopt;
+  interval_ = std::chrono::duration_cast<StreamClock::duration>(interval_of(head.query) / state().options.speed);
+  state().switch_detectors();
+  return Answer{200, "HTTP/1.0 200 OK\r\nContent-Type: multipart/x-mixed-replace;boundary=alarm\r\n\r\n"};
+}
+
+void HttpConnection::take_alarm(const std::string& part) {
+  if (feed_ != Feed::kAlarms) return;
+  parts_.push_back(part);
+  next_part_.cancel();
+}
+
+void HttpConnection::stream_feed() {
+  if (!parts_.empty()) {
+    std::string part = std::move(parts_.front());
+    parts_.pop_front();
+    return send_part(std::move(part));
+  }
+  if (std::exchange(part_due_, false)) {
+    const AlarmScene& alarms = state().alarms;
+    return send_part(feed_ == Feed::kAlarms ? alarms.alarm_part() : alarms.metadata_part());
+  }
+  next_part_.expires_after(interval_);
+  next_part_.async_wait([self = shared_from_this(), this](asio::error_code stopped) {
+    if (feed_ == Feed::kNone) return;
+    part_due_ = !stopped;
+    stream_feed();
+  });
+}
+
+void HttpConnection::send_part(std::string part) { send_at(StreamClock::now(), std::move(part)); }
+
+void HttpConnection::ended() {
+  feed_ = Feed::kNone;
+  next_part_.cancel();
 }
 
 // Nothing for a path that names no stream, or one that the camera has nothing for.
@@ -66,12 +133,14 @@ std::optional<HttpStream> HttpConnection::open_stream(const std::string& path) c
 }
 
 Connection::Next HttpConnection::answered() {
+  if (feed_ != Feed::kNone) return Next::kStream;
   if (!stream_) return Next::kCloseConnection;
   stream_began_ = StreamClock::now();
   return Next::kStream;
 }
 
 void HttpConnection::stream() {
+  if (feed_ != Feed::kNone) return stream_feed();
   std::optional<HttpStream::Piece> piece = stream_->next();
   if (!piece) {
     if (stream_->closes()) finish_stream();

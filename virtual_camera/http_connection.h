@@ -3,6 +3,7 @@
 #define VIRTUAL_CAMERA_HTTP_CONNECTION_H_
 
 #include <chrono>
+#include <deque>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -14,7 +15,9 @@ namespace vexa::camera {
 
 class HttpConnection : public Connection {
  public:
-  using Connection::Connection;
+  HttpConnection(asio::ip::tcp::socket socket, std::shared_ptr<CameraState> state);
+
+  void take_alarm(const std::string& part) override;
 
  private:
   RequestKind kind() const override { return RequestKind::kHttp; }
@@ -24,9 +27,23 @@ class HttpConnection : public Connection {
   Next answered() override;
   bool may_idle() const override { return false; }
   void stream() override;
+  void ended() override;
 
   std::optional<HttpStream> open_stream(const std::string& path) const;
 
+  // The streams of alarm data and motion metadata: a part at each interval and, of alarm data, at each change.
+  enum class Feed { kNone, kAlarms, kMetadata };
+
+  std::optional<Answer> open_feed(const RequestHead& head);
+  Answer command(const RequestHead& head);
+  void stream_feed();
+  void send_part(std::string part);
+
+  Feed feed_ = Feed::kNone;
+  std::chrono::steady_clock::duration interval_{0};
+  std::deque<std::string> parts_;  // of changes, not sent yet
+  bool part_due_ = true;
+  asio::steady_timer next_part_;
   std::optional<HttpStream> stream_;
   std::chrono::steady_clock::time_point stream_began_;
 };

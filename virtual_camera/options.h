@@ -9,6 +9,7 @@
 #include <string>
 #include <vector>
 
+#include "virtual_camera/alarm_scene.h"
 #include "virtual_camera/faults.h"
 #include "virtual_camera/http_stream.h"
 
@@ -47,6 +48,12 @@ struct CameraOptions {
   std::string user_data;  // in every picture over HTTP and in key pictures over RTP, such as "CamPos: ..."
   std::size_t stream_piece = 0;  // bytes of an HTTP stream that leave at a time; 0: a picture at once
   std::vector<HttpStreamFault> stream_faults;
+
+  // Sensors and detectors; a profile's win. With a control port (0: any free one) things can be made to happen around
+  // the camera, from this machine alone.
+  AlarmLayout alarms;
+  bool control = false;
+  std::uint16_t control_port = 0;
 
   double frames_per_second = 25;
   double speed = 1;  // pace: 4 sends four times faster, with timestamps advancing by picture as at 1

@@ -21,6 +21,7 @@ class SettingRules {
   SettingRules(const SettingRules&) = delete;
   SettingRules& operator=(const SettingRules&) = delete;
 
+  [[nodiscard]] const CameraProfile& profile() const { return profile_; }
   // The sections whose keys and values are bound, with their settings as the camera leaves the factory.
   [[nodiscard]] std::map<std::string, Pairs> factory() const;
   // Sections that other cameras have and this one lacks.

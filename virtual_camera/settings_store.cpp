@@ -48,9 +48,10 @@ constexpr Default kDefaults[] = {
     {"edgestorage", "EsRTSPRec1Timeout", "60"},
     {"presetposition", "PresetNum", "0"},
     {"sensor", "Sensor1", "0"},
-    {"lod", "LODMinObjectSize", "10"},
-    {"lod", "LODSensitivity", "5"},
-    {"objectdetection", "PositionMode", "absolute"},
+    {"lod", "LODMinObjectSize", "middle"},
+    {"lod", "LODSensitivity", "50"},
+    {"objectdetection", "PositionMode", "current"},
+    {"objectdetection", "ODPreDef", "0"},
     {"a-slot", "Status", "none"},
     {"audiodetection", "ADFunc", "off"},
 };

@@ -35,11 +35,15 @@ std::uint16_t VirtualCamera::http_port() const { return core_->http_port(); }
 
 std::uint16_t VirtualCamera::rtsp_port() const { return core_->rtsp_port(); }
 
+std::uint16_t VirtualCamera::control_port() const { return core_->control_port(); }
+
 std::size_t VirtualCamera::sessions() const {
   return loop_->run([this] { return core_->state()->sessions.size(); });
 }
 
 SettingsStore& VirtualCamera::settings() { return core_->state()->settings; }
+
+AlarmScene& VirtualCamera::alarms() { return core_->state()->alarms; }
 
 Journal& VirtualCamera::journal() { return core_->state()->journal; }
 

@@ -9,6 +9,7 @@
 #include <memory>
 #include <string>
 
+#include "virtual_camera/alarm_scene.h"
 #include "virtual_camera/journal.h"
 #include "virtual_camera/options.h"
 #include "virtual_camera/sent_log.h"
@@ -39,9 +40,11 @@ class VirtualCamera {
   [[nodiscard]] const std::string& address() const;
   [[nodiscard]] std::uint16_t http_port() const;  // valid after start()
   [[nodiscard]] std::uint16_t rtsp_port() const;
-  [[nodiscard]] std::size_t sessions() const;  // open RTSP sessions
+  [[nodiscard]] std::uint16_t control_port() const;  // 0 without one
+  [[nodiscard]] std::size_t sessions() const;        // open RTSP sessions
 
   [[nodiscard]] SettingsStore& settings();
+  [[nodiscard]] AlarmScene& alarms();
   [[nodiscard]] Journal& journal();
   [[nodiscard]] SentLog& sent();
   [[nodiscard]] const PacketisedClip* clip() const;  // the clip streamed; valid after start(), null when none

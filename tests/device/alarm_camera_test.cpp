@@ -1,0 +1,220 @@
+// Alarms, detection settings and metadata between the driver and the virtual camera.
+#include <arpa/inet.h>
+#include <gtest/gtest.h>
+#include <netinet/in.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "tests/device/alarm_driver.h"
+#include "tests/device/detection_records.h"
+#include "tests/support/own_address.h"
+#include "tests/support/process_state.h"
+#include "virtual_camera/virtual_camera.h"
+
+namespace vexa_test {
+namespace {
+
+using Kind = vexa::camera::AlarmEvent::Kind;
+
+vexa::camera::CameraOptions watched_camera() {
+  vexa::camera::CameraOptions options;
+  options.address = own_loopback(0);
+  options.password = "secret";
+  options.rtsp_port = 0;
+  options.control = true;
+  options.speed = 20;  // a part without news 20 times a second
+  return options;
+}
+
+class AlarmsOfACamera : public testing::Test {
+ protected:
+  void start(const vexa::camera::CameraOptions& options = watched_camera()) {
+    camera_ = std::make_unique<vexa::camera::VirtualCamera>(options);
+    ASSERT_TRUE(camera_->start()) << camera_->error();
+    driver_.use(camera_->address(), camera_->http_port(), 5000);
+    SLibDFixedIoBoxInfo& box = driver_.m_FixedIoBoxInfo;
+    box.inputCount = 2;
+    box.videoDetection = box.tamperingDetection = box.audioDetection = true;
+  }
+  void happen(Kind kind, int number, int value) { ASSERT_TRUE(camera_->alarms().happen({{}, kind, number, value})); }
+
+  /// The states of the next status call: input 1, input 2, detection, tampering, audio.
+  std::vector<int> next_states() {
+    std::vector<SLibDPinInfo> pins;
+    EXPECT_EQ(driver_.GetCurrentIoStatus(pins), LIBD_OK);
+    std::vector<int> states;
+    for (const SLibDPinInfo& pin : pins) states.push_back(pin.state);
+    return states;
+  }
+  /// True once a status call gives these states.
+  bool comes_to(const std::vector<int>& states) {
+    return eventually([&] { return next_states() == states; });
+  }
+  /// What the control port answers.
+  std::string ask_control(const std::string& path) {
+    sockaddr_in address{};
+    address.sin_family = AF_INET;
+    address.sin_port = htons(camera_->control_port());
+    address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+    const int connection = socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
+    EXPECT_EQ(connect(connection, reinterpret_cast<sockaddr*>(&address), sizeof address), 0);
+    const std::string request = "GET " + path + " HTTP/1.0\r\n\r\n";
+    EXPECT_EQ(send(connection, request.data(), request.size(), MSG_NOSIGNAL), static_cast<ssize_t>(request.size()));
+    char answer[256] = {};
+    EXPECT_GT(recv(connection, answer, sizeof answer - 1, 0), 0);
+    close(connection);
+    return std::string(answer).substr(9, 3);
+  }
+
+  std::unique_ptr<vexa::camera::VirtualCamera> camera_;
+  AlarmDriver driver_;
+};
+
+TEST_F(AlarmsOfACamera, BeginWithTheStatesOfTheContacts) {
+  start();
+  happen(Kind::kContact, 2, 1);
+  ASSERT_EQ(driver_.StartIoStreaming(), LIBD_OK);
+  EXPECT_EQ(next_states(), (std::vector<int>{0, 1}));
+  EXPECT_EQ(next_states(), (std::vector<int>{0, 1, 0, 0, 0}));
+}
+
+TEST_F(AlarmsOfACamera, LoseNoChange) {
+  start();
+  ASSERT_EQ(driver_.StartIoStreaming(), LIBD_OK);
+  ASSERT_EQ(next_states(), (std::vector<int>{0, 0}));
+  ASSERT_EQ(next_states(), (std::vector<int>{0, 0, 0, 0, 0}));
+  constexpr int kChanges = 500;
+  for (int i = 1; i <= kChanges; ++i) happen(Kind::kContact, 1, i % 2);
+  int seen = 0;
+  int last = 0;
+  for (int calls = 0; seen < kChanges && calls < 10 * kChanges; ++calls) {
+    const int state = next_states().at(0);
+    if (state != last) ++seen;
+    last = state;
+  }
+  EXPECT_EQ(seen, kChanges);
+}
+
+TEST_F(AlarmsOfACamera, OfADetectorComeWhenItIsSwitchedOn) {
+  start();
+  ASSERT_EQ(driver_.StartIoStreaming(), LIBD_OK);
+  ASSERT_EQ(next_states(), (std::vector<int>{0, 0}));
+  happen(Kind::kLens, 1, 1);
+  happen(Kind::kNoise, 1, 1);
+  EXPECT_TRUE(comes_to({0, 0, 0, 0, 0}));
+  ASSERT_EQ(driver_.SetTamperingAlarm(true, LIBD_TAMPER_HIGH), LIBD_OK);
+  EXPECT_TRUE(comes_to({0, 0, 0, 1, 0}));
+  ASSERT_EQ(driver_.SetAudioDetection(true), LIBD_OK);
+  EXPECT_TRUE(comes_to({0, 0, 0, 1, 1}));
+  SLibDIoBoxInfo info;
+  ASSERT_EQ(driver_.GetIoBoxInfo(info), LIBD_OK);
+  EXPECT_EQ(info.tamperLevel, 3);
+  EXPECT_EQ(rows_of(info.pins), (std::vector<PinRow>{{1, 0, 1, 0}, {2, 0, 1, 0}, {3, 4, 1, 0}, {4, 5, 1, 0}}));
+}
+
+TEST_F(AlarmsOfACamera, OfTamperingAreClearedAfterAMinute) {
+  start();
+  ASSERT_EQ(driver_.SetTamperingAlarm(true, LIBD_TAMPER_LOW), LIBD_OK);
+  happen(Kind::kLens, 1, 1);
+  ASSERT_EQ(driver_.StartIoStreaming(), LIBD_OK);
+  ASSERT_EQ(next_states(), (std::vector<int>{0, 0}));
+  EXPECT_EQ(next_states(), (std::vector<int>{0, 0, 0, 1, 0}));
+  alarm_clock_now = 1060;
+  EXPECT_TRUE(comes_to({0, 0, 0, 0, 0}));
+}
+
+TEST_F(AlarmsOfACamera, ComeFromTheControlPort) {
+  start();
+  ASSERT_EQ(driver_.SetTamperingAlarm(true, LIBD_TAMPER_LOW), LIBD_OK);
+  ASSERT_EQ(driver_.SetAudioDetection(true), LIBD_OK);
+  ASSERT_EQ(driver_.StartIoStreaming(), LIBD_OK);
+  ASSERT_EQ(next_states(), (std::vector<int>{0, 0}));
+  const struct {
+    const char* path;
+    std::vector<int> states;
+  } rows[] = {{"/contact/1/close", {1, 0, 0, 0, 0}}, {"/contact/2/close", {1, 1, 0, 0, 0}},
+              {"/contact/1/open", {0, 1, 0, 0, 0}},  {"/lens/cover", {0, 1, 0, 1, 0}},
+              {"/noise/on", {0, 1, 0, 1, 1}},        {"/lens/free", {0, 1, 0, 0, 1}},
+              {"/noise/off", {0, 1, 0, 0, 0}},       {"/motion/4/7", {0, 1, 1, 0, 0}},
+              {"/motion/4/0", {0, 1, 0, 0, 0}}};
+  for (const auto& row : rows) {
+    EXPECT_EQ(ask_control(row.path), "204");
+    EXPECT_TRUE(comes_to(row.states)) << row.path;
+  }
+}
+
+TEST_F(AlarmsOfACamera, ComeFromNoOtherPath) {
+  start();
+  for (const char* path : {"/", "/contact", "/contact/1", "/contact/1/closed", "/contact/x/close", "/lens/1/cover",
+                           "/motion/1/x", "/noise", "/command/main.cgi", "/contact/1/close/again"}) {
+    EXPECT_EQ(ask_control(path), "404") << path;
+  }
+  for (const char* path : {"/contact/0/close", "/contact/3/close", "/contact/-1/open", "/motion/0/1", "/motion/5/1"}) {
+    EXPECT_EQ(ask_control(path), "400") << path;
+  }
+}
+
+TEST_F(AlarmsOfACamera, FollowAnIntruderThroughTheWindows) {
+  start();
+  ASSERT_EQ(driver_.StartModRawData(), LIBD_OK);
+  EXPECT_EQ(ask_control("/walk"), "204");
+  SLibDRawMDFrameInfo frame;
+  for (std::int32_t SLibDRawMDFrameInfo::*window : {&SLibDRawMDFrameInfo::window1, &SLibDRawMDFrameInfo::window2,
+                                                    &SLibDRawMDFrameInfo::window3, &SLibDRawMDFrameInfo::window4}) {
+    EXPECT_TRUE(eventually([&] { return driver_.GetCurrentPosition(frame) == LIBD_OK && frame.*window > 0; }));
+  }
+  EXPECT_TRUE(eventually([&] { return driver_.GetCurrentPosition(frame) == LIBD_OK && frame.window4 == 0; }));
+  EXPECT_EQ(driver_.StopModRawData(), LIBD_OK);
+}
+
+TEST_F(AlarmsOfACamera, OfMotionFollowTheKindOfDetection) {
+  for (const char* kind : {"object", "motion", "lod"}) {
+    vexa::camera::CameraOptions options = watched_camera();
+    options.alarms.detection = kind;
+    start(options);
+    driver_.m_UseMotionDetection = options.alarms.detection == "motion";
+    driver_.SetVMDtype(options.alarms.detection == "lod" ? LIBD_VMD_VMF : LIBD_VMD_WINDOW);
+    happen(Kind::kMotion, 3, 9);
+    ASSERT_EQ(driver_.StartIoStreaming(), LIBD_OK);
+    ASSERT_EQ(next_states(), (std::vector<int>{0, 0}));
+    // Motion by windows shares the first bit, and its own stays out of the part.
+    const bool shared = driver_.m_UseMotionDetection;
+    EXPECT_EQ(next_states(), shared ? (std::vector<int>{1, 0, 0, 0}) : (std::vector<int>{0, 0, 1, 0, 0})) << kind;
+    ASSERT_EQ(driver_.StopIoStreaming(), LIBD_OK);
+  }
+}
+
+TEST_F(AlarmsOfACamera, DetectionSettingsReadBackEqual) {
+  start();
+  driver_.m_FixedPTZControlInfo.presetCount = 16;
+  SLibDDetectionParam current = marked_setting(99);
+  ASSERT_EQ(driver_.SetDetectionParam(current), LIBD_OK);
+  ASSERT_EQ(driver_.SetPositionMode(LIBD_POSITION_CURRENT), LIBD_OK);
+  std::vector<SLibDDetectionParam> settings;
+  ELibDPositionMode mode = LIBD_POSITION_PRESET;
+  ASSERT_EQ(driver_.GetObjectDetectionSetting(settings, mode), LIBD_OK);
+  EXPECT_EQ(mode, LIBD_POSITION_CURRENT);
+  ASSERT_EQ(settings.size(), 1U);
+  EXPECT_EQ(setting_rows(settings[0]), setting_rows(current));
+}
+
+TEST_F(AlarmsOfACamera, LodSettingsReadBackEqual) {
+  start();
+  driver_.m_LodDetection = true;
+  SLibDDetectionParam param;
+  param.windows[0].minObjectWidth = 2;
+  param.windows[0].sensitivity = 77;
+  ASSERT_EQ(driver_.SetDetectionParam(param), LIBD_OK);
+  std::vector<SLibDDetectionParam> settings;
+  ELibDPositionMode mode = LIBD_POSITION_PRESET;
+  ASSERT_EQ(driver_.GetObjectDetectionSetting(settings, mode), LIBD_OK);
+  ASSERT_EQ(settings.size(), 17U);
+  EXPECT_EQ(setting_rows(settings[16]), setting_rows(param));
+}
+
+}  // namespace
+}  // namespace vexa_test
