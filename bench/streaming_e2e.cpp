@@ -157,7 +157,8 @@ std::unique_ptr<CVexaCommon> streaming_driver(const std::string& address) {
   return driver;
 }
 
-/// Takes what waits at the drivers, once in a frame interval as hosts do that show pictures, until all `wanted` frames have come or none do any more.
+/// Takes what waits at the drivers, once in a frame interval as hosts do that show pictures, until all `wanted` frames
+/// have come or none do any more.
 std::uint64_t take_frames(std::vector<std::unique_ptr<CVexaCommon>>& drivers, CountingSink& sink,
                           std::uint64_t wanted) {
   std::uint64_t frames = 0;

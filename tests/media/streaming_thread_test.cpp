@@ -1,7 +1,11 @@
 #include <gtest/gtest.h>
+#include <sys/socket.h>
+#include <unistd.h>
 
 #include <atomic>
+#include <string>
 #include <thread>
+#include <vector>
 
 #include "tests/media/live_camera.h"
 #include "tests/support/process_state.h"
@@ -19,6 +23,22 @@ TEST(StreamingThread, EndsAtOnceForNoDriverAndForOneThatIsStopping) {
   MediaDriver driver;
   driver.m_StopVideoRequested = true;
   EXPECT_EQ(MediaDriver::StreamingThread(static_cast<CVexaCommon*>(&driver)), 0u);
+}
+
+TEST(VideoStreaming, BeginsWithoutAStreamAndWithTheWaitsOfOne) {
+  MediaDriver driver;
+  EXPECT_EQ(driver.m_RtspSocket, -1);
+  EXPECT_EQ(driver.m_StreamSocket, -1);
+  EXPECT_EQ(driver.m_PlaybackScale, 1);
+  EXPECT_EQ(driver.m_KeepAlivePeriod, 1);
+  EXPECT_EQ(driver.m_LastKeepAliveTime, 0);
+  EXPECT_EQ(driver.m_StreamWaitMs, 1);
+  EXPECT_FALSE(driver.m_NoTearDown);
+  EXPECT_FALSE(driver.m_StopVideoRequested);
+  EXPECT_EQ(WaitForSingleObject(driver.m_StopVideoEvent, 0), static_cast<unsigned long>(WAIT_TIMEOUT));
+  const vexa::Guard guard(driver.m_FrameQueueLock);
+  EXPECT_FALSE(driver.m_LargeFrameBuffers);
+  EXPECT_FALSE(driver.m_VideoTimedOut);
 }
 
 TEST(VideoStreaming, StopOfADriverThatNeverStartedIsOkAndDoesNothing) {
@@ -71,6 +91,38 @@ TEST(VideoStreaming, WithoutTearDownNothingIsSentAtTheEnd) {
   ASSERT_EQ(driver.StopVideoStreaming(), LIBD_OK);
   for (const auto& request : camera->journal().snapshot()) EXPECT_EQ(request.bytes.find("TEARDOWN"), std::string::npos);
   EXPECT_EQ(driver.m_RtspSocket, -1);
+}
+
+TEST(VideoStreaming, PicturesOverRtpDoNotWaitForEachOther) {
+  auto options = camera_options();
+  options.pictures = 3;
+  LiveCamera camera(options);
+  MediaDriver driver;
+  camera.introduce(driver);
+  driver.m_StreamWaitMs = 600000;
+  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  EXPECT_EQ(FrameTaker().take_all(driver, 3).size(), 3u);
+}
+
+TEST(VideoStreaming, ADestroyedDriverStopsVideoFirstAndTheAlarmStreamLast) {
+  LiveCamera camera(camera_options());
+  int ends[2] = {-1, -1};
+  ASSERT_EQ(socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends), 0);
+  {
+    MediaDriver driver;
+    camera.introduce(driver);
+    ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+    const vexa::Guard guard(driver.m_IoStreamLock);
+    driver.m_IoStreamSocket = ends[0];
+  }
+  close(ends[1]);
+  std::vector<std::string> lines;
+  for (const auto& request : camera->journal().snapshot())
+    lines.push_back(request.bytes.substr(0, request.bytes.find(' ')));
+  ASSERT_GE(lines.size(), 2u);
+  EXPECT_EQ(lines[lines.size() - 2], "TEARDOWN");
+  EXPECT_EQ(lines.back(), "GET");
+  EXPECT_NE(camera->journal().snapshot().back().bytes.find("AlarmData=off"), std::string::npos);
 }
 
 struct RefusalCase {

@@ -205,6 +205,15 @@ TEST(VideoStart, SetsAsideAZeroedStagingBufferAndKeepsLargeFramesForJpegAlone) {
   }
 }
 
+TEST(VideoStart, CountsTheSilenceFromItsOwnMoment) {
+  OpenedDriver driver;
+  driver.state().now = [] { return static_cast<std::time_t>(5000); };
+  driver.m_StreamWaitMs = 600000;
+  ASSERT_EQ(driver.StartStreamingThread("H.264"), LIBD_OK);
+  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+  EXPECT_EQ(driver.m_LastFrameTime, 5000);
+}
+
 TEST(VideoStart, WithoutAThreadFailsWithTheSystemsTextAndClosesTheStream) {
   OpenedDriver driver;
   const std::string codec = "H.264";

@@ -1,9 +1,12 @@
 #include <fcntl.h>
 #include <gtest/gtest.h>
+
 #include <netinet/in.h>
 #include <sys/resource.h>
 #include <sys/socket.h>
 #include <unistd.h>
+#include <algorithm>
+#include <fstream>
 
 #include <climits>
 #include <set>
@@ -69,6 +72,12 @@ TEST_F(RtspSession, BindsAMediaSocketToAnyAddress) {
   length = sizeof reuse;
   EXPECT_EQ(getsockopt(driver_.m_StreamSocket, SOL_SOCKET, SO_REUSEADDR, &reuse, &length), 0);
   EXPECT_EQ(reuse, 1);
+  int room = 0;
+  length = sizeof room;
+  EXPECT_EQ(getsockopt(driver_.m_StreamSocket, SOL_SOCKET, SO_RCVBUF, &room, &length), 0);
+  int most = 0;
+  ASSERT_TRUE(std::ifstream("/proc/sys/net/core/rmem_max") >> most);
+  EXPECT_EQ(room, 2 * std::min(524288, most));  // the system doubles what it is asked for
 }
 
 TEST_F(RtspSession, GivesEachSessionAPortOfItsOwn) {

@@ -68,6 +68,13 @@ TEST(ParseStatusLine, NeedsBothNumberAndReason) {
   }
 }
 
+TEST(ParseStatusLine, TakesTheNextLineForAMissingReason) {
+  const auto line = parse_status_line("HTTP/1.0 200\r\nServer: camera\r\n\r\n", "HTTP/");
+  ASSERT_TRUE(line);
+  EXPECT_EQ(line->status, 200);
+  EXPECT_EQ(line->reason, "Server: camera");
+}
+
 TEST(ParseStatusLine, EndsTheReasonAtACaret) {
   EXPECT_EQ(parse_status_line("HTTP/1.0 404 Not^Found\r\n", "HTTP/")->reason, "Not");
 }
