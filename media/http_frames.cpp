@@ -6,6 +6,7 @@
 
 #include "device/driver_state.h"
 #include "media/assembly/elementary_unit.h"
+#include "media/assembly/start_code.h"
 #include "transport/failure.h"
 #include "vexa/vexa_common.h"
 
@@ -108,4 +109,12 @@ bool CVexaCommon::TakeUnit(VideoFrameInfo& frame, const vexa::ElementaryCodec& c
   if (frame.frameType != codec.key_frame) frame.frameType = codec.delta_frame;
   stamp_now(frame);
   return true;
+}
+
+const unsigned char* CVexaCommon::find_start_code_h264(const unsigned char* data, unsigned int length) {
+  return vexa::find_start_code_h264(data, length);
+}
+
+const unsigned char* CVexaCommon::find_start_code_mpeg4(const unsigned char* data, unsigned int length) {
+  return vexa::find_start_code_mpeg4(data, length);
 }

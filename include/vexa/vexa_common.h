@@ -166,6 +166,10 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   int http_multipart_jpeg_recv(int socket, char* buffer, int capacity, int timeout);
   int http_multipart_input_recv(int socket, unsigned int& mask, unsigned int& state);
   int http_multipart_mddata_recv(int socket, char* buffer, int capacity, int timeout);
+  /// The first byte of the first 00 00 00 01 in the data; null when there is none. Reads nothing outside the data.
+  static const unsigned char* find_start_code_h264(const unsigned char* data, unsigned int length);
+  /// The same for 00 00 01; of more zeros the last two belong to it.
+  static const unsigned char* find_start_code_mpeg4(const unsigned char* data, unsigned int length);
   int http_stream_recv(int socket, char* buffer, int capacity, StartCodeFinder finder, int codeLength, int timeout);
   bool ReceiveStream(int socket, vexa::StreamWindow& window);
 

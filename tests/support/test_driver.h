@@ -41,6 +41,8 @@ class TestDriver : public CVexaCommon {
   using CVexaCommon::base64Encode;
   using CVexaCommon::BindMediaSocket;
   using CVexaCommon::ClearLatestError;
+  using CVexaCommon::find_start_code_h264;
+  using CVexaCommon::find_start_code_mpeg4;
   using CVexaCommon::ConnectionInfo;
   using CVexaCommon::ConnectionTimeout;
   using CVexaCommon::Fail;

@@ -266,7 +266,7 @@ class ElementaryStream : public HttpStream {
   ElementaryStream() { driver_.hold_stream(1 << 20); }
 
   int receive(int capacity = 1000, int timeout = 200) {
-    return driver_.http_stream_recv(pair_.driver_end(), buffer_.data(), capacity, vexa::find_start_code_h264, 4,
+    return driver_.http_stream_recv(pair_.driver_end(), buffer_.data(), capacity, TestDriver::find_start_code_h264, 4,
                                     timeout);
   }
   std::string frame(int capacity = 1000, int timeout = 200) {
@@ -332,7 +332,7 @@ TEST_F(ElementaryStream, AClosedCameraLetsTheTriesRunOut) {
 }
 
 TEST_F(ElementaryStream, AClosedSocketIsASystemFailure) {
-  EXPECT_EQ(driver_.http_stream_recv(-1, buffer_.data(), 1000, vexa::find_start_code_h264, 4, 100), -1);
+  EXPECT_EQ(driver_.http_stream_recv(-1, buffer_.data(), 1000, TestDriver::find_start_code_h264, 4, 100), -1);
   EXPECT_EQ(driver_.latest_error(), "0 Bad file descriptor");
 }
 
