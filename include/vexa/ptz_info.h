@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "vexa/common_types.h"
+#include "vexa/export.h"
 
 /// Directions of motion, in the order of the camera's words.
 enum ELibDPanTiltDirection : std::int32_t {
@@ -158,3 +159,6 @@ struct SLibDShadowTourInfo {
   std::int32_t maxRecordTime = 0;                   ///< as the camera reports it; read only
   std::map<int, SLibDShadowTourEachSetting> tours;  ///< by number, counted from 1
 };
+
+/// The letters of tours in requests, "A" to "E", for the tour numbers 1 to 5. Constant.
+extern VEXA_API const char* const g_TourSelector[5];

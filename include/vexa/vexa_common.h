@@ -94,6 +94,44 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode GetIRIlluminator(ELibIRIlluminatorMode& mode, int& strength) override;
   ELibDReturnCode SetIRIlluminator(ELibIRIlluminatorMode mode, int strength) override;
 
+  // device/ptz_motion.cpp
+  ELibDReturnCode PanTilt(int pan, int tilt) override;
+  ELibDReturnCode PanTiltAbsolute(int pan, int tilt) override;
+  ELibDReturnCode PanTiltDirect(int x, int y, const SLibDResolutionInfo& picture) override;
+  ELibDReturnCode Zoom(int speed) override;
+  ELibDReturnCode ZoomAbsolute(int position) override;
+  ELibDReturnCode ZoomRelative(int step) override;
+  ELibDReturnCode ZoomArea(int x, int y, int width, int height, const SLibDResolutionInfo& picture) override;
+  ELibDReturnCode SetFocusMode(bool automatic) override;
+  ELibDReturnCode Focus(int speed) override;
+  ELibDReturnCode FocusAbsolute(int position) override;
+
+  // device/ptz_position.cpp
+  ELibDReturnCode GetCurrentPosition(SLibDPTZStatus& status) override;
+  ELibDReturnCode GetPTZControlInfo(SLibDPTZControlInfo& info) override;
+  ELibDReturnCode SetPTZControlInfo(SLibDPTZControlInfo& info) override;
+  ELibDReturnCode GetFixedPTZControlInfo(SLibDFixedPTZControlInfo& info) override;
+
+  // device/presets.cpp
+  ELibDReturnCode GetPresets(std::vector<SLibDPresetInfo>& presets) override;
+  ELibDReturnCode ClearPreset(int index) override;
+  ELibDReturnCode SetPreset(SLibDPresetInfo& preset) override;
+  ELibDReturnCode RecallPreset(int index) override;
+
+  // device/camera_tours.cpp
+  ELibDReturnCode GetCameraTourInfo(SLibDCameraTourInfo& info) override;
+  ELibDReturnCode SetCameraTourInfo(SLibDCameraTourInfo& info) override;
+
+  // device/shadow_tours.cpp
+  ELibDReturnCode GetShadowTourInfo(SLibDShadowTourInfo& info) override;
+  ELibDReturnCode SetShadowTourInfo(SLibDShadowTourInfo& info) override;
+  ELibDReturnCode StartShadowTour(int number) override;
+  ELibDReturnCode StopShadowTour() override;
+  ELibDReturnCode StartRecordShadowTour(int number) override;
+  ELibDReturnCode StopRecordShadowTour() override;
+  ELibDReturnCode StartPreviewShadowTour(int number) override;
+  ELibDReturnCode StopPreviewShadowTour() override;
+
   // device/connection.cpp
   ELibDReturnCode GetCurrentConnectionInfo(SLibDConnectionInfo& info) override;
   ELibDReturnCode SetCurrentConnectionInfo(SLibDConnectionInfo& info) override;
@@ -132,7 +170,6 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode SetVMDtype(ELibDVMDType type) override;
 
   // device/metadata_stream.cpp
-  using CLibraryDevice::GetCurrentPosition;
   ELibDReturnCode StartModRawData() override;
   ELibDReturnCode GetCurrentPosition(SLibDRawMDFrameInfo& frame) override;
   ELibDReturnCode StopModRawData() override;
@@ -330,6 +367,21 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode CheckDetectionParamDetectionArea(SLibDDetectionParam& param);
   ELibDReturnCode AskLodDetection(std::vector<SLibDDetectionParam>& params);
   ELibDReturnCode AskObjectDetection(std::vector<SLibDDetectionParam>& params, ELibDPositionMode& mode);
+
+  // Motion and position: device/ptz_motion.cpp, device/ptz_position.cpp
+  void GetDirectionFromPanTiltSpeed(int pan, int tilt, ELibDPanTiltDirection& direction);
+  // 0, or 1 when the request cannot be opened.
+  int SendPTZCommands(int pan, int tilt, const ELibDPanTiltDirection& direction);
+  int SendPTZCommandForCenterDirection();
+  /// False leaves both angles: no zoom ratios are known, or an angle or ratio is 0.
+  bool GetViewingAngles(int zoom, int& horizontal, int& vertical);
+  bool TakesContinuousPtz();
+  int ImageRotation();
+
+  // Presets and tours: device/presets.cpp, device/camera_tours.cpp
+  bool IsPreset(int index) const;
+  bool GetTextByTourSequenceList(const std::vector<int>& sequence, std::string& text);
+  bool GetTourSequenceListByText(std::string text, std::vector<int>& sequence);
 
   // Shared by model variants: device/model_variants.cpp
   /// Sends the picture to the network when the answer of the "system" inquiry names another output.

@@ -1,0 +1,42 @@
+// Where a camera looks: the text in its pictures, positions as angles, viewing angles by zoom.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "vexa/common_types.h"
+#include "vexa/ptz_info.h"
+
+namespace vexa {
+
+/// What a position text says, in the camera's units.
+struct CameraPosition {
+  bool pan_valid = false;
+  bool tilt_valid = false;
+  bool zoom_valid = false;
+  std::int16_t pan = 0;
+  std::int16_t tilt = 0;
+  int zoom = 0;
+  bool moving = false;
+};
+
+/// Reads "CamPos: " with three flags and three numbers, and "M" behind them while the camera moves.
+std::optional<CameraPosition> read_position_text(const std::string& text);
+
+/// The way from `offset` to `position` in thousandths of the unit of `angle_range`, which `span` units turn through;
+/// the position itself for a span of 0.
+int axis_angle(int position, int span, int angle_range, std::int64_t offset);
+
+struct ViewingAngles {
+  int horizontal;
+  int vertical;
+};
+
+/// The viewing angles at a zoom position, in ten-thousandths of the wide-end angles' unit where ratios count
+/// magnifications. Nothing without zoom ratios, or when a wide-end angle or a ratio in question is 0.
+std::optional<ViewingAngles> viewing_angles(const std::vector<SLibDZoomRatioInt>& ratios,
+                                            const SLibDFixedPanTiltInfo& camera, int zoom);
+
+}  // namespace vexa
