@@ -20,7 +20,8 @@ namespace {
 
 constexpr std::size_t kLargestFile = 1 << 20;
 constexpr std::string_view kProfileExtension = ".json";
-constexpr char kOutOfMemory[] = "there is not enough memory to read it";
+// So short that storing it takes no memory.
+constexpr char kOutOfMemory[] = "out of memory";
 
 class OpenFile {
  public:

@@ -82,8 +82,19 @@ SLibDBrightModeInfo read_bright_mode(const Part& part, Complaints& complaints) {
   return mode;
 }
 
+// A profile promises no mode that its driver never sets.
+void demand_driver_sets(const Part& exposure, DriverClass driver, Complaints& complaints) {
+  const bool sets_none = driver == DriverClass::kHeron || driver == DriverClass::kSimpleHD;
+  complaints.demand(!exposure || !sets_none, exposure, "is not for the drivers \"heron\" and \"simple-hd\"");
+  for (const Part& part : exposure.items()) {
+    const bool sets = driver != DriverClass::kMarlin || part["mode"].text() != "Iris Priority";
+    complaints.demand(sets, part["mode"], "is not for the driver \"marlin\"");
+  }
+}
+
 void read_image(const Part& image, Profile& profile, Complaints& complaints) {
   auto& modes = profile.control.brightModes;
+  demand_driver_sets(image["exposure"], profile.driver, complaints);
   for (const Part& part : image["exposure"].items()) {
     SLibDBrightModeInfo mode = read_bright_mode(part, complaints);
     const bool first = std::none_of(modes.begin(), modes.end(),

@@ -38,8 +38,8 @@ struct Profile {
   DriverClass driver = DriverClass::kCommon;
   std::uint32_t cameraTypes = 0;  ///< CameraTypeBits
 
-  /// All codecs and sizes of the model; the driver narrows them once the camera has reported its settings. Both stream
-  /// counts are the number of streams.
+  /// All codecs and sizes of the model, handed out until the camera has first reported its settings; from then on the
+  /// list is the resolution filter's. Both stream counts are the number of streams.
   SLibDFixedCameraInfo camera;
   std::vector<SLibDCameraInfo> streams;         ///< the streams' settings as they leave the factory
   std::vector<ELibVideoOutMode> videoOutModes;  ///< empty: the network alone

@@ -91,6 +91,8 @@ TEST(ProfileRefusal, NamesWhatTheSchemaCannotSay) {
        "p.json:8: video.outputs: is for the drivers \"simple-hd\" and \"simple-ptz\" only"},
       {"\"value\": 2", "\"value\": 1",
        "p.json:15: image.exposure[0].shutter[1].value: must be above the one before it"},
+      {"\"common\"", "\"heron\"", "p.json:14: image.exposure: is not for the drivers \"heron\" and \"simple-hd\""},
+      {"\"common\"", "\"simple-hd\"", "p.json:14: image.exposure: is not for the drivers \"heron\" and \"simple-hd\""},
       {"\"Shutter Priority\"", "\"Full auto\"", "p.json:15: image.exposure[0].shutter: is not for this mode"},
       {"\"Shutter Priority\"", "\"Iris Priority\"", "p.json:15: image.exposure[0].shutter: is not for this mode"},
       {"\"exposure\": [", "\"exposure\": [{\"mode\": \"Iris Priority\"},",
@@ -106,6 +108,17 @@ TEST(ProfileRefusal, NamesWhatTheSchemaCannotSay) {
       {"\"io\"", "\"edgeStorage\": true, \"io\"",
        "p.json:5: cameraTypes: must name \"edge-storage\" exactly when \"edgeStorage\" is true"},
   });
+}
+
+TEST(ProfileRefusal, NamesTheIrisThatMarlinDoesNotSet) {
+  const auto with_driver = [](const std::string& driver, const std::string& mode, const std::string& steps) {
+    std::string text = changed_profile("\"Shutter Priority\", \"shutter\"", "\"" + mode + "\", \"" + steps + "\"");
+    return text.replace(text.find("common"), 6, driver);
+  };
+  EXPECT_EQ(refusal_of(with_driver("marlin", "Iris Priority", "iris")),
+            "p.json:15: image.exposure[0].mode: is not for the driver \"marlin\"");
+  EXPECT_EQ(refusal_of(with_driver("marlin", "Shutter Priority", "shutter")), "taken");
+  EXPECT_EQ(refusal_of(with_driver("simple-ptz", "Iris Priority", "iris")), "taken");
 }
 
 TEST(ProfileRefusal, NamesAWrongSizeAtBothEdges) {
