@@ -1,4 +1,7 @@
 // Exposure and image controls. Setters send one request; getters read the cached answer of the camera inquiry.
+#include <cerrno>
+#include <new>
+
 #include "device/cgi/image_text.h"
 #include "runtime/base/sync.h"
 #include "runtime/base/text.h"
@@ -57,7 +60,8 @@ ELibDReturnCode CVexaCommon::SetBackLightCompMode(bool on) {
   return SendCommand("/command/camera.cgi?BLComp=%s", on ? "on" : "off");
 }
 
-ELibDReturnCode CVexaCommon::Bright(int step) {
+// Safe: as GetIRIlluminator.
+ELibDReturnCode CVexaCommon::Bright(int step) try {
   const ELibDReturnCode amount = CheckAmountOfBrightness(step);
   if (amount != LIBD_OK) return amount;
   const ELibDReturnCode mode = CheckCurrentBrightMode();
@@ -67,7 +71,10 @@ ELibDReturnCode CVexaCommon::Bright(int step) {
   if (SendInqCommand("camera", answer) != LIBD_OK) return LatestErrorCode();
   int value = 0;
   unsigned entry = 0;
-  if (StoredBrightMode() == vexa::kShutterPriority) {
+  // Another thread may have stored a mode without a control while the camera answered.
+  const auto control = vexa::exposure_control_of(StoredBrightMode());
+  if (!control) return LIBD_INVALID_MODE;
+  if (*control == vexa::ExposureControl::kShutter) {
     const bool moves =
         GetShutterSpeedFromCameraData(answer, value, entry) && GetShutterSpeedFromShutterSpeedList(step, value, entry);
     return moves ? SendCommand("/command/camera.cgi?Shutter=%d", value) : LIBD_OK;
@@ -75,6 +82,10 @@ ELibDReturnCode CVexaCommon::Bright(int step) {
   const bool moves =
       GetIrisPositionFromCameraData(answer, value, entry) && GetIrisPositionFromIrisList(step, value, entry);
   return moves ? SendCommand("/command/camera.cgi?Iris=%d", value) : LIBD_OK;
+} catch (const std::bad_alloc&) {
+  ClearLatestError();
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
 ELibDReturnCode CVexaCommon::CheckAmountOfBrightness(int step) {
@@ -136,7 +147,8 @@ ELibDReturnCode CVexaCommon::BrightAbsolute(int level) {
                  : SendCommand("/command/camera.cgi?Iris=%d", value);
 }
 
-bool CVexaCommon::CameraInquiry(std::string& answer) {
+// Safe: an answer that memory does not hold is a failure and not an exception.
+bool CVexaCommon::CameraInquiry(std::string& answer) try {
   {
     const vexa::Guard guard(m_CameraInquiryLock);
     answer = m_CameraInquiryCache;
@@ -145,6 +157,10 @@ bool CVexaCommon::CameraInquiry(std::string& answer) {
   if (SendInqCommand("camera", answer) != LIBD_OK) return false;
   StoreCameraInquiry(answer);
   return true;
+} catch (const std::bad_alloc&) {
+  ClearLatestError();
+  FailSystem(ENOMEM);
+  return false;
 }
 
 // Kept: the cached answer outlives the change, so getters tell the value before it until GetCameraInfo asks anew. A
@@ -206,11 +222,16 @@ ELibDReturnCode CVexaCommon::SetViewDR(ELibDViewDRMode mode) {
   return AfterImageChange(SendCommand("/command/camera.cgi?ViewDR=%s", word));
 }
 
-ELibDReturnCode CVexaCommon::GetIRIlluminator(ELibIRIlluminatorMode& mode, int& strength) {
+// Safe: a number that memory does not hold is a failure and not an exception.
+ELibDReturnCode CVexaCommon::GetIRIlluminator(ELibIRIlluminatorMode& mode, int& strength) try {
   std::string answer;
   if (!CameraInquiry(answer)) return LatestErrorCode();
   if (read_word(answer, "&IRLed=", vexa::kIlluminatorWords, mode) != LIBD_OK) return LIBD_FAILED;
   return read_number(answer, "&IRLedMaxStrength=", strength) ? LIBD_OK : LIBD_FAILED;
+} catch (const std::bad_alloc&) {
+  ClearLatestError();
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
 // Kept: any mode that is not day/night switches the illuminator off; there is no wrong mode.

@@ -1,4 +1,7 @@
 // Video settings of one stream, and the codecs and sizes that the camera's properties leave.
+#include <cerrno>
+#include <new>
+
 #include "device/cgi/video_text.h"
 #include "device/driver_state.h"
 #include "runtime/base/number_pair.h"
@@ -52,7 +55,8 @@ bool replace(Value& stored, Value value) {
 
 }  // namespace
 
-ELibDReturnCode CVexaCommon::GetCameraInfo(SLibDCameraInfo& info) {
+// Safe: settings that memory does not hold are a failure and not an exception.
+ELibDReturnCode CVexaCommon::GetCameraInfo(SLibDCameraInfo& info) try {
   StoreCameraInquiry({});
   std::string answer;
   if (SendInqCommand("camera", answer) != LIBD_OK) return LatestErrorCode();
@@ -66,6 +70,9 @@ ELibDReturnCode CVexaCommon::GetCameraInfo(SLibDCameraInfo& info) {
   // Kept: the record comes back whole, the driver's stream number with it; hosts set the number before each call.
   info = m_CameraInfo;
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
 void CVexaCommon::StoreCameraInquiry(const std::string& answer) {

@@ -2,8 +2,10 @@
 #include <sys/socket.h>
 
 #include <algorithm>
+#include <cerrno>
 #include <chrono>
 #include <cstring>
+#include <new>
 #include <thread>
 #include <vector>
 
@@ -42,18 +44,21 @@ void pause_before_next_look() { std::this_thread::sleep_for(std::chrono::millise
 
 }  // namespace
 
-int CVexaCommon::http_open(const char* format, ...) {
+// Safe: an exchange that memory does not hold is a failure and not an exception.
+int CVexaCommon::http_open(const char* format, ...) try {
+  ClearLatestError();
   va_list arguments;
   va_start(arguments, format);
   const std::string path = vexa::vformat_within(vexa::kRequestRoom, format, arguments).text;
   va_end(arguments);
-  ClearLatestError();
   const SLibDConnectionInfo info = ConnectionInfo();
   vexa::Socket socket(ConnectHttp(info));
   if (!socket.valid() || !RequestHttp(socket.get(), info, path)) return -1;
   if (!ReadHttpStatus(socket.get(), info.timeout)) return -1;
   if (!vexa::make_nonblocking(socket.get())) return FailSystem();
   return socket.release();
+} catch (const std::bad_alloc&) {
+  return FailSystem(ENOMEM);
 }
 
 int CVexaCommon::ConnectHttp(const SLibDConnectionInfo& info) {
@@ -183,7 +188,8 @@ bool CVexaCommon::GetUrlParameter(const std::string& answer, std::string key, in
   return true;
 }
 
-ELibDReturnCode CVexaCommon::SendInqCommand(const std::string& name, std::string& answer) {
+// Safe: an answer that memory does not hold is a failure and not an exception.
+ELibDReturnCode CVexaCommon::SendInqCommand(const std::string& name, std::string& answer) try {
   ClearLatestError();
   const auto size = m_InquirySizes.find(name);
   if (size == m_InquirySizes.end()) return LIBD_FAILED;
@@ -195,6 +201,9 @@ ELibDReturnCode CVexaCommon::SendInqCommand(const std::string& name, std::string
   if (received < 0) return LIBD_FAILED;
   answer = bytes.data();
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
 ELibDReturnCode CVexaCommon::SendCommand(const char* format, ...) {
