@@ -52,6 +52,12 @@ std::vector<std::unique_ptr<Command>> all_commands() {
   commands.push_back(make_exposure_command());
   commands.push_back(make_daynight_command());
   commands.push_back(make_profile_command());
+  commands.push_back(make_io_command());
+  commands.push_back(make_output_command());
+  commands.push_back(make_watch_command());
+  commands.push_back(make_detection_command());
+  commands.push_back(make_tampering_command());
+  commands.push_back(make_audio_detection_command());
   commands.push_back(make_log_command());
   return commands;
 }

@@ -32,6 +32,12 @@ std::unique_ptr<Command> make_daynight_command();
 std::unique_ptr<Command> make_codecs_command();
 std::unique_ptr<Command> make_exposure_command();
 std::unique_ptr<Command> make_profile_command();
+std::unique_ptr<Command> make_io_command();
+std::unique_ptr<Command> make_output_command();
+std::unique_ptr<Command> make_watch_command();
+std::unique_ptr<Command> make_detection_command();
+std::unique_ptr<Command> make_tampering_command();
+std::unique_ptr<Command> make_audio_detection_command();
 
 }  // namespace vexa::host
 

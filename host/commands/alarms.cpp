@@ -1,0 +1,226 @@
+// vexactl io, output and watch: a camera's pins, its outputs, and its alarms as they come.
+#include <fmt/format.h>
+
+#include <atomic>
+#include <nlohmann/json.hpp>
+#include <optional>
+#include <thread>
+#include <vector>
+
+#include "host/alarm_words.h"
+#include "host/commands/command.h"
+#include "host/interrupt.h"
+#include "host/model_camera.h"
+#include "host/result_output.h"
+
+namespace vexa::host {
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+// Detectors of simple cameras report as one item, all others window by window.
+void follow_detection(const ModelCamera& camera) {
+  camera.device().SetVMDtype(camera.profile().lodDetection ? LIBD_VMD_VMF : LIBD_VMD_WINDOW);
+}
+
+class IoCommand final : public Command {
+ public:
+  CLI::App* declare(CLI::App& program, const char* const* environment) override {
+    CLI::App* command = program.add_subcommand("io", "Show a camera's inputs, outputs and detectors");
+    read_environment(options_.camera.credentials, environment);
+    add_model_options(*command, options_);
+    command->footer("The state of an output is not reported; it shows as \"-\", in JSON as null.");
+    return command;
+  }
+
+  ExitCode run(Terminal& terminal) override {
+    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
+    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
+    const auto& camera = std::get<ModelCamera>(opened);
+    SLibDIoBoxInfo info;
+    const ELibDReturnCode result = camera.device().GetIoBoxInfo(info);
+    if (result != LIBD_OK) return terminal.report(camera.explain(result));
+    if (const auto problem = read_states(camera, info.pins)) return terminal.report(*problem);
+    return write_result(terminal, options_.camera.json ? json_of(info.pins) : table_of(info.pins));
+  }
+
+ private:
+  // The inputs' states come first, then a part with those of the detectors.
+  static std::optional<Problem> read_states(const ModelCamera& camera, std::vector<SLibDPinInfo>& pins) {
+    CLibraryDevice& device = camera.device();
+    follow_detection(camera);
+    const ELibDReturnCode started = device.StartIoStreaming();
+    if (started != LIBD_OK) return camera.explain(started);
+    for (int call = 0; call < 2; ++call) {
+      std::vector<SLibDPinInfo> states;
+      const ELibDReturnCode result = device.GetCurrentIoStatus(states);
+      if (result != LIBD_OK && result != LIBD_NO_FRAME) return camera.explain(result);
+      for (const SLibDPinInfo& state : states) take_state(state, pins);
+    }
+    device.StopIoStreaming();
+    return std::nullopt;
+  }
+
+  // Detectors have other numbers in the list than in the stream; of each kind there is one.
+  static void take_state(const SLibDPinInfo& state, std::vector<SLibDPinInfo>& pins) {
+    for (SLibDPinInfo& pin : pins) {
+      const bool numbered = state.type == PIN_TYPE_SENSOR_INPUT;
+      if (pin.type == state.type && (!numbered || pin.number == state.number)) pin.state = state.state;
+    }
+  }
+
+  static std::string state_of(const SLibDPinInfo& pin) {
+    if (pin.type == PIN_TYPE_ALARM_OUTPUT) return "-";
+    return pin.state != 0 ? "active" : "inactive";
+  }
+
+  static std::string table_of(const std::vector<SLibDPinInfo>& pins) {
+    std::string text;
+    for (const SLibDPinInfo& pin : pins) {
+      text +=
+          fmt::format("{:>2}  {:<9}  {:<3}  {}\n", pin.number, kind_of(pin), pin.enabled ? "on" : "off", state_of(pin));
+    }
+    return text;
+  }
+
+  static std::string json_of(const std::vector<SLibDPinInfo>& pins) {
+    Json list = Json::array();
+    for (const SLibDPinInfo& pin : pins) {
+      const Json state = pin.type == PIN_TYPE_ALARM_OUTPUT ? Json(nullptr) : Json(state_of(pin));
+      list.push_back({{"pin", pin.number}, {"kind", kind_of(pin)}, {"enabled", pin.enabled}, {"state", state}});
+    }
+    return to_text(list);
+  }
+
+  ModelOptions options_;
+};
+
+class OutputCommand final : public Command {
+ public:
+  CLI::App* declare(CLI::App& program, const char* const* environment) override {
+    CLI::App* command = program.add_subcommand("output", "Switch an alarm output of a camera");
+    read_environment(options_.camera.credentials, environment);
+    add_model_options(*command, options_);
+    command->add_option("number", number_, "of the output, counted from 1")->required()->type_name("");
+    command->add_option("switch", switch_, "on or off")->required()->type_name("");
+    return command;
+  }
+
+  ExitCode run(Terminal& terminal) override {
+    if (switch_ != "on" && switch_ != "off") {
+      return terminal.report(usage("an output is switched on or off", "See vexactl output --help."));
+    }
+    if (number_ < 1) return terminal.report(usage("outputs are counted from 1", "vexactl io shows them."));
+    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
+    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
+    const auto& camera = std::get<ModelCamera>(opened);
+    SLibDPinInfo pin;
+    pin.number = number_;
+    pin.type = PIN_TYPE_ALARM_OUTPUT;
+    pin.state = switch_ == "on" ? 1 : 0;
+    const ELibDReturnCode result = camera.device().SetOutput(pin);
+    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera.explain_change("output", result));
+  }
+
+ private:
+  ModelOptions options_;
+  int number_ = 0;
+  std::string switch_;
+};
+
+class WatchCommand final : public Command {
+ public:
+  CLI::App* declare(CLI::App& program, const char* const* environment) override {
+    CLI::App* command = program.add_subcommand("watch", "Show a camera's alarms as they come, until Ctrl-C");
+    read_environment(options_.camera.credentials, environment);
+    add_model_options(*command, options_);
+    command->add_flag("--metadata", metadata_, "show the frames of motion metadata too");
+    command->add_option("--count", count_, "end after this many lines")->check(CLI::PositiveNumber);
+    command->footer("A line says when, which pin, what it is, and its new state; with --json each is a JSON object.");
+    return command;
+  }
+
+  ExitCode run(Terminal& terminal) override {
+    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
+    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
+    const auto& camera = std::get<ModelCamera>(opened);
+    Interrupt::finish_orderly();
+    follow_detection(camera);
+    ELibDReturnCode started = camera.device().StartIoStreaming();
+    if (started == LIBD_OK && metadata_) started = camera.device().StartModRawData();
+    if (started != LIBD_OK) return terminal.report(camera.explain(started));
+    std::thread frames;
+    if (metadata_) frames = std::thread([&] { note(watch_metadata(camera, terminal)); });
+    note(watch_alarms(camera, terminal));
+    if (frames.joinable()) frames.join();
+    camera.device().StopModRawData();
+    camera.device().StopIoStreaming();
+    if (failure_) return terminal.report(*failure_);
+    return Interrupt::requested() ? ExitCode::kInterrupted : ExitCode::kOk;
+  }
+
+ private:
+  [[nodiscard]] WatchFormat format() const { return options_.camera.json ? WatchFormat::kJson : WatchFormat::kText; }
+  [[nodiscard]] bool goes_on() const { return !over_ && !Interrupt::requested(); }
+
+  // What ends one of the two threads ends the other.
+  void note(const std::optional<Problem>& problem) {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    over_ = true;
+    if (problem && !failure_) failure_ = problem;
+  }
+
+  std::optional<Problem> say(Terminal& terminal, const std::string& line) {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    if (over_) return std::nullopt;
+    const int error = terminal.write_result(line);
+    if (error != 0) {
+      return Problem{ExitCode::kCannotWrite, "an alarm cannot be written", "Is standard output still open?"};
+    }
+    over_ = ++lines_ == count_;
+    return std::nullopt;
+  }
+
+  std::optional<Problem> watch_alarms(const ModelCamera& camera, Terminal& terminal) {
+    PinStates states;
+    while (goes_on()) {
+      std::vector<SLibDPinInfo> pins;
+      const ELibDReturnCode result = camera.device().GetCurrentIoStatus(pins);
+      if (result == LIBD_NO_FRAME) continue;
+      if (result != LIBD_OK) return camera.explain(result);
+      const std::string moment = moment_text(std::chrono::system_clock::now());
+      for (const SLibDPinInfo& pin : states.changed(pins)) {
+        if (auto problem = say(terminal, alarm_line(pin, moment, format()))) return problem;
+      }
+    }
+    return std::nullopt;
+  }
+
+  std::optional<Problem> watch_metadata(const ModelCamera& camera, Terminal& terminal) {
+    SLibDRawMDFrameInfo frame;
+    while (goes_on()) {
+      const ELibDReturnCode result = camera.device().GetCurrentPosition(frame);
+      if (result == LIBD_NO_FRAME) continue;
+      if (result != LIBD_OK) return camera.explain(result);
+      const std::string moment = moment_text(std::chrono::system_clock::now());
+      if (auto problem = say(terminal, metadata_line(frame, moment, format()))) return problem;
+    }
+    return std::nullopt;
+  }
+
+  ModelOptions options_;
+  bool metadata_ = false;
+  std::uint64_t count_ = 0;  // 0: no such end
+  std::mutex mutex_;
+  std::uint64_t lines_ = 0;
+  std::atomic<bool> over_{false};
+  std::optional<Problem> failure_;
+};
+
+}  // namespace
+
+std::unique_ptr<Command> make_io_command() { return std::make_unique<IoCommand>(); }
+std::unique_ptr<Command> make_output_command() { return std::make_unique<OutputCommand>(); }
+std::unique_ptr<Command> make_watch_command() { return std::make_unique<WatchCommand>(); }
+
+}  // namespace vexa::host
