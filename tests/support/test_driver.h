@@ -41,13 +41,13 @@ class TestDriver : public CVexaCommon {
   using CVexaCommon::base64Encode;
   using CVexaCommon::BindMediaSocket;
   using CVexaCommon::ClearLatestError;
-  using CVexaCommon::find_start_code_h264;
-  using CVexaCommon::find_start_code_mpeg4;
   using CVexaCommon::ConnectionInfo;
   using CVexaCommon::ConnectionTimeout;
   using CVexaCommon::Fail;
   using CVexaCommon::FailSystem;
   using CVexaCommon::FailWait;
+  using CVexaCommon::find_start_code_h264;
+  using CVexaCommon::find_start_code_mpeg4;
   using CVexaCommon::GetCommonNetworkInfo;
   using CVexaCommon::GetCommonSystemInfo;
   using CVexaCommon::GetUrlParameter;
