@@ -15,8 +15,8 @@
 
 namespace vexa_test {
 
-/// How many times faster than in life cameras play. A thread that watches every access gives hosts no time to spare, and
-/// a queue of 30 frames is soon full.
+/// How many times faster than in life cameras play. A thread that watches every access gives hosts no time to spare,
+/// and a queue of 30 frames is soon full.
 #if defined(__SANITIZE_THREAD__)
 constexpr double kPace = 1;
 #else
