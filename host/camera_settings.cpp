@@ -18,26 +18,57 @@ Json size_or_null(int width, int height) {
 
 Json number_or_null(int number) { return number > 0 ? Json(number) : Json(nullptr); }
 
-// The word of what a getter tells; null when it tells nothing.
-template <typename Value, typename Words>
-Json read_word(CLibraryDevice& device, ELibDReturnCode (CLibraryDevice::*get)(Value&), const Words& words) {
-  Value value{};
-  if ((device.*get)(value) != LIBD_OK) return nullptr;
-  const auto word = word_for(words, value);
-  return word ? Json(*word) : Json(nullptr);
+// A failed exchange leaves its reason in the driver; an answer that lacks a key leaves none. A failure ends the
+// command, so that no earlier one's reason is in the way.
+bool left_a_reason(CLibraryDevice& device) {
+  std::string text;
+  device.GetLatestErrorText(text);
+  return !text.empty();
 }
 
-void add_image(CLibraryDevice& device, Json& settings) {
-  settings["day-night"] = read_word(device, &CLibraryDevice::GetDayNightMode, kDayNightWords);
-  settings["noise-reduction"] = read_word(device, &CLibraryDevice::GetXdnrMode, kNoiseWords);
-  settings["wide-dynamic-range"] = read_word(device, &CLibraryDevice::GetViewDR, kRangeWords);
-  settings["visibility-enhancer"] = read_word(device, &CLibraryDevice::GetVisibilityEnhancerMode, kVisibilityWords);
-  ELibIRIlluminatorMode infrared = LIB_IR_OFF;
-  int strength = 0;
-  const bool told = device.GetIRIlluminator(infrared, strength) == LIBD_OK;
-  const auto word = word_for(kInfraredWords, infrared);
-  settings["infrared"] = told && word ? Json(*word) : Json(nullptr);
-  settings["infrared-strength"] = told ? Json(strength) : Json(nullptr);
+// Asks getters and keeps the first failure that is more than a setting which the camera does not report.
+class SettingReader {
+ public:
+  explicit SettingReader(CLibraryDevice& device) : device_(device) {}
+
+  // The word of what a getter tells; null when it tells nothing.
+  template <typename Value, typename Words>
+  Json word(ELibDReturnCode (CLibraryDevice::*get)(Value&), const Words& words) {
+    Value value{};
+    if (!told((device_.*get)(value))) return nullptr;
+    const auto word = word_for(words, value);
+    return word ? Json(*word) : Json(nullptr);
+  }
+
+  void add_infrared(Json& settings) {
+    ELibIRIlluminatorMode mode = LIB_IR_OFF;
+    int strength = 0;
+    const bool read = told(device_.GetIRIlluminator(mode, strength));
+    const auto word = word_for(kInfraredWords, mode);
+    settings["infrared"] = read && word ? Json(*word) : Json(nullptr);
+    settings["infrared-strength"] = read ? Json(strength) : Json(nullptr);
+  }
+
+  // LIBD_OK when there was none.
+  [[nodiscard]] ELibDReturnCode failure() const { return failure_; }
+
+ private:
+  bool told(ELibDReturnCode result) {
+    const bool unreported = result == LIBD_NOT_SUPPORTED || (result == LIBD_FAILED && !left_a_reason(device_));
+    if (result != LIBD_OK && !unreported && failure_ == LIBD_OK) failure_ = result;
+    return result == LIBD_OK;
+  }
+
+  CLibraryDevice& device_;
+  ELibDReturnCode failure_ = LIBD_OK;
+};
+
+void add_image(SettingReader& reader, Json& settings) {
+  settings["day-night"] = reader.word(&CLibraryDevice::GetDayNightMode, kDayNightWords);
+  settings["noise-reduction"] = reader.word(&CLibraryDevice::GetXdnrMode, kNoiseWords);
+  settings["wide-dynamic-range"] = reader.word(&CLibraryDevice::GetViewDR, kRangeWords);
+  settings["visibility-enhancer"] = reader.word(&CLibraryDevice::GetVisibilityEnhancerMode, kVisibilityWords);
+  reader.add_infrared(settings);
 }
 
 const SLibDVideoCodecInfo* find_offer(const SLibDFixedCameraInfo& offer, const std::string& codec) {
@@ -66,6 +97,15 @@ std::optional<Problem> check_offer(const ModelCamera& camera, const SLibDCameraI
                  advice};
 }
 
+// The camera reports one of the two alone, so that the other codecs' is only known when it is given.
+std::optional<Problem> check_rate(const SLibDCameraInfo& video) {
+  const bool jpeg = video.codecName == "JPEG";
+  if ((jpeg ? video.quality : video.bitRate) > 0) return std::nullopt;
+  return Problem{ExitCode::kUsage,
+                 fmt::format("{} needs {}", printable(video.codecName), jpeg ? "quality" : "bit-rate"),
+                 "The camera reports the rate of its present codec only."};
+}
+
 std::optional<Problem> change_stream(const ModelCamera& camera, const SettingChanges& changes) {
   Result<SLibDCameraInfo> read = camera.video();
   if (const auto* problem = std::get_if<Problem>(&read)) return *problem;
@@ -80,6 +120,7 @@ std::optional<Problem> change_stream(const ModelCamera& camera, const SettingCha
   video.bitRate = changes.bit_rate.value_or(video.bitRate);
   video.quality = changes.quality.value_or(video.quality);
   video.rotation = changes.rotation.value_or(video.rotation);
+  if (auto problem = check_rate(video)) return problem;
   if (auto problem = check_offer(camera, video)) return problem;
   const ELibDReturnCode result = camera.device().SetCameraInfo(video);
   if (result == LIBD_OK) return std::nullopt;
@@ -90,7 +131,8 @@ ELibDReturnCode change_infrared(CLibraryDevice& device, const SettingChanges& ch
   ELibIRIlluminatorMode mode = LIB_IR_OFF;
   int strength = 0;
   const ELibDReturnCode read = device.GetIRIlluminator(mode, strength);
-  if (read != LIBD_OK) return read == LIBD_FAILED ? LIBD_NOT_SUPPORTED : read;
+  if (read == LIBD_FAILED && !left_a_reason(device)) return LIBD_NOT_SUPPORTED;
+  if (read != LIBD_OK) return read;
   return device.SetIRIlluminator(changes.infrared.value_or(mode), changes.infrared_strength.value_or(strength));
 }
 
@@ -100,7 +142,6 @@ Result<Json> read_settings(const ModelCamera& camera) {
   Result<SLibDCameraInfo> read = camera.video();
   if (const auto* problem = std::get_if<Problem>(&read)) return *problem;
   const auto& video = std::get<SLibDCameraInfo>(read);
-  CLibraryDevice& device = camera.device();
   Json settings = {{"stream", video.streamNumber},
                    {"codec", printable(video.codecName)},
                    {"size", size_or_null(video.imageWidth, video.imageHeight)},
@@ -111,9 +152,14 @@ Result<Json> read_settings(const ModelCamera& camera) {
                    {"capture-size", size_or_null(video.captureWidth, video.captureHeight)},
                    {"max-image-size", size_or_null(video.maxImageWidth, video.maxImageHeight)},
                    {"solid-ptz", video.solidPtz ? "on" : "off"},
+                   {"unicast-port", number_or_null(video.unicastVideoPort)},
+                   {"unicast-port-1", number_or_null(video.unicastVideoPort1)},
+                   {"unicast-port-2", number_or_null(video.unicastVideoPort2)},
                    {"rtsp-port", number_or_null(video.rtspPort)}};
-  add_image(device, settings);
-  settings["video-output"] = read_word(device, &CLibraryDevice::GetVideoOutMode, kOutputWords);
+  SettingReader reader(camera.device());
+  add_image(reader, settings);
+  settings["video-output"] = reader.word(&CLibraryDevice::GetVideoOutMode, kOutputWords);
+  if (reader.failure() != LIBD_OK) return camera.explain(reader.failure());
   return settings;
 }
 

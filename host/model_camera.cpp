@@ -76,6 +76,11 @@ Result<SLibDCameraInfo> ModelCamera::video() const {
   info.streamNumber = stream_;
   const ELibDReturnCode result = device_->GetCameraInfo(info);
   if (result != LIBD_OK) return explain(result);
+  // The driver leaves what the camera does not report as it was: in a new driver, empty.
+  if (info.codecName.empty() && info.imageWidth == 0 && info.frameRate == 0) {
+    return Problem{ExitCode::kUsage, fmt::format("the camera reports no video stream {}", stream_),
+                   "--stream counts from 1, the camera's first."};
+  }
   info.streamNumber = stream_;  // the record comes back with the driver's own
   return info;
 }

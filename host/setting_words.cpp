@@ -68,7 +68,7 @@ constexpr SettingKey kKeys[] = {
     {"bit-rate", "kbit/s, 1 to 100000; not for JPEG",
      [](Text t, Into& to) { return take_number(t, 1, 100000, to.bit_rate); }},
     {"quality", "a level, 1 to 100; for JPEG", [](Text t, Into& to) { return take_number(t, 1, 100, to.quality); }},
-    {"rotation", "degrees, 0 to 359; 180 turns the picture where the camera can",
+    {"rotation", "degrees, 0 to 359; 180 turns the picture where the camera can, left out: 0",
      [](Text t, Into& to) { return take_number(t, 0, 359, to.rotation); }},
     {"day-night", "auto, day or night", [](Text t, Into& to) { return take_word(t, kDayNightWords, to.day_night); }},
     {"noise-reduction", "off, low, mid or high",

@@ -144,7 +144,7 @@ class ExposureCommand final : public Command {
     command->add_option("--level", options_.level, "brightness along the mode's steps, 0 to 10000")->type_name("N");
     command->add_option("--step", options_.step, "above 0: one step brighter along the list; below 0: one step back")
         ->type_name("N");
-    command->footer("Without --mode it lists the modes and steps of the camera's model.");
+    command->footer("It shows the modes and steps of the camera's model, none when its profile is not installed.");
     return command;
   }
 
@@ -156,7 +156,8 @@ class ExposureCommand final : public Command {
     if (options_.mode) {
       if (const auto problem = change(camera)) return terminal.report(*problem);
     }
-    if (camera.profile().control.brightModes.empty()) {
+    // Without a profile the driver still changes the mode; only the list is not known.
+    if (!options_.mode && camera.profile().control.brightModes.empty()) {
       return terminal.report({ExitCode::kUsage, "the camera's model offers no exposure modes",
                               "Its profile decides; --profile names another."});
     }

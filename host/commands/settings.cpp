@@ -43,9 +43,11 @@ class SetCommand final : public Command {
     read_environment(options_.camera.credentials, environment);
     add_model_options(*command, options_);
     command->add_option("settings", changes_, "what to change, each as KEY=VALUE")->required()->type_name("");
-    command->footer("Settings:\n" + known_settings() +
-                    "\nFor instance:\n  vexactl set 192.168.0.100 codec=H.264 size=1280x720 frame-rate=25 "
-                    "bit-rate=4000\n\nIt shows the settings as they are afterwards.");
+    command->footer(
+        "Settings:\n" + known_settings() +
+        "\nFor instance:\n  vexactl set 192.168.0.100 codec=H.264 size=1280x720 frame-rate=25 "
+        "bit-rate=4000\n\nA camera does not report its rotation: a change of the video "
+        "stream without rotation=180 turns the picture back.\n\nIt shows the settings as they are afterwards.");
     return command;
   }
 

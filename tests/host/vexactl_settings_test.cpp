@@ -6,6 +6,8 @@
 namespace vexa_test {
 namespace {
 
+using vexa::camera::RequestFault;
+
 class SettingsOfACamera : public WithCamera {
  protected:
   void start_model(const std::string& model) {
@@ -41,6 +43,9 @@ TEST_F(SettingsOfACamera, ShowAsATable) {
             "capture-size         1920x1080\n"
             "max-image-size       1920x1080\n"
             "solid-ptz            off\n"
+            "unicast-port         50000\n"
+            "unicast-port-1       50002\n"
+            "unicast-port-2       50004\n"
             "rtsp-port            554\n"
             "day-night            auto\n"
             "noise-reduction      off\n"
@@ -59,7 +64,7 @@ TEST_F(SettingsOfACamera, AreJsonForScripts) {
   const auto expected = nlohmann::json::parse(R"({
     "stream": 1, "codec": "MPEG4", "size": "640x480", "frame-rate": 25, "bit-rate": 1024, "quality": null,
     "video-standard": "pal", "capture-size": "768x576", "max-image-size": "768x576", "solid-ptz": "off",
-    "rtsp-port": 554, "day-night": "auto", "noise-reduction": null, "wide-dynamic-range": null,
+    "unicast-port": 50000, "unicast-port-1": 50002, "unicast-port-2": 50004, "rtsp-port": 554, "day-night": "auto", "noise-reduction": null, "wide-dynamic-range": null,
     "visibility-enhancer": null, "infrared": null, "infrared-strength": null, "video-output": "ip"})");
   EXPECT_EQ(nlohmann::json::parse(result.out, nullptr, false), expected);
 }
@@ -71,6 +76,63 @@ TEST_F(SettingsOfACamera, OfAnotherStreamAreItsOwn) {
   EXPECT_EQ(json["codec"], "JPEG");
   EXPECT_EQ(json["size"], "640x368");
   EXPECT_EQ(json["quality"], 5);
+}
+
+TEST_F(SettingsOfACamera, OfAStreamThatItDoesNotHaveEndWithOne) {
+  start_model("LMX-H100");
+  for (const std::vector<std::string>& command : std::vector<std::vector<std::string>>{
+           {"settings", place()}, {"set", place(), "frame-rate=5"}, {"codecs", place()}}) {
+    std::vector<std::string> arguments = command;
+    arguments.insert(arguments.end(), {"--stream", "3"});
+    const ProgramResult result = run(arguments);
+    EXPECT_EQ(result.exit_code, 1) << command[0];
+    EXPECT_EQ(result.out, "");
+    EXPECT_EQ(result.err,
+              "vexactl: the camera reports no video stream 3\n  --stream counts from 1, the camera's first.\n");
+  }
+  EXPECT_TRUE(commands().empty());
+}
+
+TEST_F(SettingsOfACamera, ThatCannotBeAskedAreAFailureAndNotUnknown) {
+  start_model("LMX-C100");
+  // The first two system inquiries are for the model; the third is for the video output.
+  RequestFault fault = RequestFault::status("inq=system", "401 Unauthorized");
+  fault.occurrence = 2;
+  camera().add_request_fault(fault);
+  const ProgramResult result = run({"settings", place()});
+  EXPECT_EQ(result.exit_code, 3);
+  EXPECT_EQ(result.out, "");
+  EXPECT_THAT(result.err, testing::HasSubstr("refuses user name and password"));
+}
+
+TEST_F(SettingsOfACamera, NeedTheRateOfACodecOfTheOtherKind) {
+  start_model("LMX-H100");
+  const ProgramResult to_jpeg = run({"set", place(), "codec=JPEG"});
+  EXPECT_EQ(to_jpeg.exit_code, 1);
+  EXPECT_EQ(to_jpeg.err, "vexactl: JPEG needs quality\n  The camera reports the rate of its present codec only.\n");
+  const ProgramResult to_h264 = run({"set", place(), "--stream", "2", "codec=H.264"});
+  EXPECT_EQ(to_h264.exit_code, 1);
+  EXPECT_EQ(to_h264.err, "vexactl: H.264 needs bit-rate\n  The camera reports the rate of its present codec only.\n");
+  EXPECT_TRUE(commands().empty());
+  EXPECT_EQ(run({"set", place(), "codec=JPEG", "quality=7"}).exit_code, 0);
+  EXPECT_EQ(run({"set", place(), "--stream", "2", "codec=H.264", "bit-rate=512"}).exit_code, 0);
+  EXPECT_THAT(commands(),
+              testing::ElementsAre(testing::HasSubstr("&Quality1=7&"), testing::HasSubstr("&BitRate2=512&")));
+}
+
+TEST_F(SettingsOfACamera, OfTheInfraredLightFailWithTheRequest) {
+  start_model("LMX-H100");
+  camera().add_request_fault(RequestFault::status("inq=camera", "503 Service Unavailable"));
+  const ProgramResult busy = run({"set", place(), "infrared-strength=3"});
+  EXPECT_EQ(busy.exit_code, 2);
+  EXPECT_THAT(busy.err, testing::HasSubstr("Service Unavailable"));
+}
+
+TEST_F(SettingsOfACamera, OfTheInfraredLightAreNotThereWithoutIt) {
+  start_model("LMX-C100");
+  const ProgramResult result = run({"set", place(), "infrared-strength=3"});
+  EXPECT_EQ(result.exit_code, 1);
+  EXPECT_EQ(result.err.find("vexactl: cameras of model LMX-C100 have no infrared\n"), 0U) << result.err;
 }
 
 TEST_F(SettingsOfACamera, ChangeInOneRequestForTheStream) {
@@ -152,6 +214,15 @@ TEST_F(SettingsOfACamera, ExposureOfAModelWithoutItEndsWithOne) {
   EXPECT_EQ(result.err,
             "vexactl: the camera's model offers no exposure modes\n"
             "  Its profile decides; --profile names another.\n");
+}
+
+TEST_F(SettingsOfACamera, ExposureChangesAlsoWithoutAProfile) {
+  start_camera();
+  ASSERT_TRUE(camera().settings().apply("system", "ModelName=T-9"));
+  const ProgramResult result = run({"exposure", place(), "--mode", "Full auto"});
+  EXPECT_EQ(result.exit_code, 0) << result.err;
+  EXPECT_EQ(result.out, "");
+  EXPECT_THAT(commands(), testing::ElementsAre("/command/camera.cgi?ExpMode=full"));
 }
 
 TEST_F(SettingsOfACamera, ExposureSaysWhatIsWrong) {
