@@ -29,6 +29,7 @@ bool CVexaCommon::GetTextByTourSequenceList(const std::vector<int>& sequence, st
   return written.has_value();
 }
 
+// NOLINTNEXTLINE(performance-unnecessary-value-param): the operation is called with its text by value
 bool CVexaCommon::GetTourSequenceListByText(std::string text, std::vector<int>& sequence) {
   return vexa::read_tour_sequence(text, sequence);
 }

@@ -41,6 +41,12 @@ class CountedText {
   bool ended_line_ = false;
 };
 
+Node node_of(Node::Kind kind) {
+  Node node;
+  node.kind = kind;
+  return node;
+}
+
 // Takes the parser's events and builds the tree. The parser asks for these names.
 class TreeBuilder {
  public:
@@ -52,20 +58,32 @@ class TreeBuilder {
 
   explicit TreeBuilder(const int& line) : line_(line) {}
 
-  bool null() { return put({Node::Kind::kNull}); }
-  bool boolean(bool value) { return put({.kind = Node::Kind::kBoolean, .flag = value}); }
-  bool number_integer(number_integer_t value) { return put({.kind = Node::Kind::kInteger, .number = value}); }
+  bool null() { return put(node_of(Node::Kind::kNull)); }
+  bool boolean(bool value) {
+    Node node = node_of(Node::Kind::kBoolean);
+    node.flag = value;
+    return put(std::move(node));
+  }
+  bool number_integer(number_integer_t value) {
+    Node node = node_of(Node::Kind::kInteger);
+    node.number = value;
+    return put(std::move(node));
+  }
   bool number_unsigned(number_unsigned_t value) {
     if (value > static_cast<number_unsigned_t>(std::numeric_limits<std::int64_t>::max())) return refuse("too large");
     return number_integer(static_cast<std::int64_t>(value));
   }
-  bool number_float(number_float_t, const string_t&) { return put({.kind = Node::Kind::kFraction}); }
-  bool string(string_t& value) { return put({.kind = Node::Kind::kString, .text = value}); }
+  bool number_float(number_float_t, const string_t&) { return put(node_of(Node::Kind::kFraction)); }
+  bool string(string_t& value) {
+    Node node = node_of(Node::Kind::kString);
+    node.text = value;
+    return put(std::move(node));
+  }
   bool binary(binary_t&) { return refuse("not JSON"); }
 
-  bool start_object(std::size_t) { return open({.kind = Node::Kind::kObject}); }
+  bool start_object(std::size_t) { return open(node_of(Node::Kind::kObject)); }
   bool end_object() { return close(); }
-  bool start_array(std::size_t) { return open({.kind = Node::Kind::kArray}); }
+  bool start_array(std::size_t) { return open(node_of(Node::Kind::kArray)); }
   bool end_array() { return close(); }
 
   bool key(string_t& name) {
@@ -74,7 +92,7 @@ class TreeBuilder {
       problem_ = JsonProblem{line_, name, "occurs twice"};
       return false;
     }
-    object.members.push_back({name, {}});
+    object.members.emplace_back().key = name;
     object.members.back().value.line = line_;
     return true;
   }

@@ -20,8 +20,8 @@ struct Node {
   bool flag = false;
   std::int64_t number = 0;
   std::string text = {};
-  std::vector<Node> items = {};      ///< of an array
-  std::vector<Member> members = {};  ///< of an object, each key once
+  std::vector<Node> items = {};  ///< of an array
+  std::vector<Member> members;   ///< of an object, each key once
 
   /// Null when there is no such member.
   [[nodiscard]] const Node* find(std::string_view key) const;

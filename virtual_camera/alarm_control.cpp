@@ -135,7 +135,7 @@ std::string_view AlarmControl::answer(const std::string& request) {
 }
 
 // A walk that begins while another is under way takes its place.
-void AlarmControl::play(std::shared_ptr<std::vector<AlarmEvent>> events, std::size_t next) {
+void AlarmControl::play(const std::shared_ptr<std::vector<AlarmEvent>>& events, std::size_t next) {
   if (next == events->size()) return;
   pace_.expires_after((*events)[next].after);
   pace_.async_wait([self = shared_from_this(), events, next](asio::error_code stopped) {

@@ -34,7 +34,7 @@ class AlarmControl : public std::enable_shared_from_this<AlarmControl> {
   void accept();
   void take(const std::shared_ptr<Visit>& visit);
   std::string_view answer(const std::string& request);
-  void play(std::shared_ptr<std::vector<AlarmEvent>> events, std::size_t next);
+  void play(const std::shared_ptr<std::vector<AlarmEvent>>& events, std::size_t next);
 
   std::shared_ptr<CameraState> state_;
   asio::ip::tcp::acceptor acceptor_;

@@ -27,7 +27,8 @@ class BitWriter {
  public:
   void bits(std::uint32_t value, int count) {
     for (int bit = count - 1; bit >= 0; --bit) {
-      current_ = static_cast<std::uint8_t>(current_ << 1U | (value >> static_cast<unsigned>(bit) & 1U));
+      current_ =
+          static_cast<std::uint8_t>(static_cast<unsigned>(current_) << 1U | (value >> static_cast<unsigned>(bit) & 1U));
       if (++filled_ == 8) flush();
     }
   }

@@ -57,12 +57,14 @@ bool is_wide(PictureSize size) { return size.width * 5 >= size.height * 8; }
 
 std::vector<std::string> texts_of(const std::vector<PictureSize>& sizes) {
   std::vector<std::string> texts;
+  texts.reserve(sizes.size());
   for (const PictureSize size : sizes) texts.push_back(size_text(size));
   return texts;
 }
 
 std::vector<std::string> texts_of(const std::vector<int>& numbers) {
   std::vector<std::string> texts;
+  texts.reserve(numbers.size());
   for (const int number : numbers) texts.push_back(fmt::format("{}", number));
   return texts;
 }

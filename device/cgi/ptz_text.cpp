@@ -61,7 +61,7 @@ int share_between(int amount, int least, int most) {
 }
 
 int axis_position(int position, int span, int origin) {
-  return cut_to_16_bits(static_cast<long long>(position) * span / (2 * kHostScale) + origin);
+  return cut_to_16_bits(static_cast<long long>(position) * span / (2LL * kHostScale) + origin);
 }
 
 int zoom_step(int step) { return cut_to_16_bits(static_cast<long long>(step) * kWholeZoomStep / 100); }

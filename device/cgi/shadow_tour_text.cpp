@@ -45,7 +45,7 @@ std::optional<std::string> shadow_tour_request(const SLibDShadowTourInfo& info, 
     if (one_is_on && tour.enabled) return std::nullopt;
     one_is_on = one_is_on || tour.enabled;
     const std::string letter_key = shadow_key(++number);
-    request += letter_key + "=" + switch_word(tour.enabled) + letter_key + "Period=always";
+    request.append(letter_key).append("=").append(switch_word(tour.enabled)).append(letter_key).append("Period=always");
   }
   return request;
 }
