@@ -206,11 +206,23 @@ ELibDReturnCode CVexaCommon::SendInqCommand(const std::string& name, std::string
   return LIBD_FAILED;
 }
 
+// Safe: a path that memory does not hold is a failure and not an exception; the driver's end sends a command too.
 ELibDReturnCode CVexaCommon::SendCommand(const char* format, ...) {
+  std::string path;
   va_list arguments;
   va_start(arguments, format);
-  const std::string path = vexa::vformat_within(vexa::kRequestRoom, format, arguments).text;
+  bool written = true;
+  try {
+    path = vexa::vformat_within(vexa::kRequestRoom, format, arguments).text;
+  } catch (const std::bad_alloc&) {
+    written = false;
+  }
   va_end(arguments);
+  if (!written) {
+    ClearLatestError();
+    FailSystem(ENOMEM);
+    return LIBD_FAILED;
+  }
   const int socket = http_open("%s", path.c_str());
   if (socket == -1) return LatestErrorCode();
   http_close(socket);

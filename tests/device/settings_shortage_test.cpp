@@ -5,6 +5,7 @@
 
 #include "tests/device/settings_exchange.h"
 #include "tests/support/failing_new.h"
+#include "tests/support/test_driver.h"
 
 namespace {
 
@@ -96,6 +97,21 @@ TEST(ShortMemory, FailsAReadingOutOfTheCache) {
     if (std::string(row.name) == "CameraInfo") continue;
     EXPECT_GT(failed_readings(row, kLongAnswer), 0) << row.name;
   }
+}
+
+TEST(ShortMemory, FailsACommandBeforeTheCameraIsAsked) {
+  vexa_test::TestDriver driver;
+  driver.use("127.0.0.1", 1, 50);
+  const std::string name(500, 'x');
+  driver.soil_latest_error();
+  ELibDReturnCode result = LIBD_OK;
+  {
+    AllocationFailure failure(0);
+    result = driver.SendCommand("/command/%s", name.c_str());
+    EXPECT_TRUE(failure.happened());
+  }
+  EXPECT_EQ(result, LIBD_FAILED);
+  EXPECT_EQ(driver.latest_error(), "0 Cannot allocate memory");
 }
 
 TEST(ShortMemory, FailsAStepOfBrightness) {
