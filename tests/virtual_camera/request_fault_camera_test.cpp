@@ -57,8 +57,9 @@ TEST_F(FaultyCamera, AByteAtATimeStillMakesTheWholeAnswer) {
   camera_.add_request_fault(RequestFault::byte_at_a_time("", milliseconds(1)));
   const auto client = http();
   client->send(kInquiry);
-  EXPECT_EQ(client->read_once(), "H");
-  EXPECT_EQ("H" + client->read_to_end(), kInquiryAnswer);
+  const std::string first = client->read_once();  // one byte, or a few when this reader comes late
+  EXPECT_LT(first.size(), kInquiryAnswer.size());
+  EXPECT_EQ(first + client->read_to_end(), kInquiryAnswer);
   const auto session = rtsp();
   session->send(kOptions);
   std::string answer;
