@@ -59,7 +59,7 @@ TEST(SettingWords, SayWhatASettingTakes) {
       {"bit-rate=99999999999", "the value of bit-rate cannot be used | It takes kbit/s, 1 to 100000; not for JPEG."},
       {"rotation=360",
        "the value of rotation cannot be used | It takes degrees, 0 to 359; 180 turns the picture where the camera "
-       "can."},
+       "can, left out: 0."},
       {"day-night=AUTO", "the value of day-night cannot be used | It takes auto, day or night."},
       {"noise-reduction=middle", "the value of noise-reduction cannot be used | It takes off, low, mid or high."},
       {"back-light=1", "the value of back-light cannot be used | It takes on or off."},
