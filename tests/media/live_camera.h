@@ -15,10 +15,12 @@
 
 namespace vexa_test {
 
-/// How many times faster than in life cameras play. A thread that watches every access gives hosts no time to spare,
-/// and a queue of 30 frames is soon full.
+/// How many times faster than in life cameras play. Sanitizers leave hosts little time to spare, and a queue of 30
+/// frames is soon full.
 #if defined(__SANITIZE_THREAD__)
 constexpr double kPace = 1;
+#elif defined(__SANITIZE_ADDRESS__)
+constexpr double kPace = 2;
 #else
 constexpr double kPace = 4;
 #endif
