@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "tests/media/media_driver.h"
+#include "tests/media/pace.h"
 #include "tests/support/own_address.h"
 #include "virtual_camera/virtual_camera.h"
 
@@ -56,7 +57,7 @@ class HttpLive : public testing::Test {
     options_.address = own_loopback(0);
     options_.rtsp_port = 0;
     options_.password = "secret";
-    options_.speed = 8;
+    options_.speed = kJpegPace;
   }
 
   void run(const HttpWay& way, int timeout = 5000) {

@@ -8,22 +8,13 @@
 #include <string>
 
 #include "tests/media/media_driver.h"
+#include "tests/media/pace.h"
 #include "tests/support/own_address.h"
 #include "virtual_camera/jpeg_picture.h"
 #include "virtual_camera/rtp_packetiser.h"
 #include "virtual_camera/virtual_camera.h"
 
 namespace vexa_test {
-
-/// How many times faster than in life cameras play. Sanitizers leave hosts little time to spare, and a queue of 30
-/// frames is soon full.
-#if defined(__SANITIZE_THREAD__)
-constexpr double kPace = 1;
-#elif defined(__SANITIZE_ADDRESS__)
-constexpr double kPace = 2;
-#else
-constexpr double kPace = 4;
-#endif
 
 inline vexa::camera::CameraOptions camera_options(unsigned index = 0) {
   vexa::camera::CameraOptions options;

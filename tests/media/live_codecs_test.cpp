@@ -2,6 +2,7 @@
 
 #include <thread>
 
+#include "tests/media/pace.h"
 #include "tests/media/whole_stream.h"
 
 namespace vexa_test {
@@ -113,7 +114,7 @@ class LiveCodecImpaired : public testing::TestWithParam<CodecFaults> {
   static void stream(const std::string& clip, unsigned index) {
     auto options = codec_options(clip, index);
     options.seed = 7 + index;
-    options.speed = 4;
+    options.speed = kJpegPace;
     options.max_payload = 900;
     options.pictures = 400;
     options.start_sequence = 65000;
