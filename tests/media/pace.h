@@ -4,10 +4,8 @@
 namespace vexa_test {
 
 /// For H.264 and MPEG-4, of which 30 frames wait for the host.
-#if defined(__SANITIZE_THREAD__)
+#if defined(__SANITIZE_THREAD__) || defined(__SANITIZE_ADDRESS__)
 constexpr double kPace = 1;
-#elif defined(__SANITIZE_ADDRESS__)
-constexpr double kPace = 2;
 #else
 constexpr double kPace = 4;
 #endif
