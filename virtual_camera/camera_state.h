@@ -13,6 +13,7 @@
 #include <vector>
 
 #include "virtual_camera/alarm_scene.h"
+#include "virtual_camera/camera_pose.h"
 #include "virtual_camera/event_loop.h"
 #include "virtual_camera/journal.h"
 #include "virtual_camera/options.h"
@@ -51,6 +52,7 @@ struct CameraState {
   std::string profile_error;  // empty: none
   asio::io_context& context;
   AlarmScene alarms;
+  PoseSource pose;  // empty: the camera does not know where it looks
   SettingsStore settings;
   Journal journal;
   SentLog sent;
