@@ -6,6 +6,8 @@ namespace vexa::models {
 namespace {
 
 constexpr char kJpeg[] = "JPEG";
+constexpr const char* kCaptureSizes = "captureSizes";
+constexpr const char* kMaxImageSizes = "maxImageSizes";
 
 using Steps = std::vector<SLibDCommonParameterInt>;
 
@@ -102,6 +104,25 @@ void read_outputs(const Part& outputs, Profile& profile, Complaints& complaints)
   complaints.demand(!outputs || keeps_output, outputs, "is for the drivers \"simple-hd\" and \"simple-ptz\" only");
 }
 
+bool is_wide(const SLibDResolutionInfo& size) { return size.width * 5 >= size.height * 8; }
+
+// The camera takes no size that its capture cannot give or that is above its largest, so it leaves the factory with
+// none. Wide pictures, from 8:5 on, are cut out of a wide capture only.
+void demand_factory_sizes(const Part& video, Complaints& complaints) {
+  for (const Part& part : video["streams"].items()) {
+    const SLibDResolutionInfo size = read_size(part["size"], complaints);
+    const auto fits_first_of = [&](const char* list) {
+      const std::vector<Part> limits = video[list].items();
+      if (limits.empty()) return true;
+      const SLibDResolutionInfo limit = read_size(limits.front(), complaints);
+      const bool shaped = list != kCaptureSizes || is_wide(size) == is_wide(limit);
+      return shaped && size.width <= limit.width && size.height <= limit.height;
+    };
+    complaints.demand(fits_first_of(kCaptureSizes), part["size"], "cannot be cut out of the first of captureSizes");
+    complaints.demand(fits_first_of(kMaxImageSizes), part["size"], "is above the first of maxImageSizes");
+  }
+}
+
 }  // namespace
 
 void read_video(const Part& video, Profile& profile, Complaints& complaints) {
@@ -115,9 +136,10 @@ void read_video(const Part& video, Profile& profile, Complaints& complaints) {
     profile.streams.push_back(read_stream(part, camera.codecs, complaints));
     profile.streams.back().streamNumber = static_cast<std::int32_t>(profile.streams.size());
   }
-  for (const char* list : {"captureSizes", "maxImageSizes"}) {
+  for (const char* list : {kCaptureSizes, kMaxImageSizes}) {
     for (const Part& size : video[list].items()) (void)read_size(size, complaints);
   }
+  demand_factory_sizes(video, complaints);
   if (video["solidPtz"]) (void)read_size(video["solidPtz"], complaints);
   camera.streamCount1 = static_cast<std::int32_t>(profile.streams.size());
   camera.streamCount2 = camera.streamCount1;

@@ -8,17 +8,17 @@
 #include <nlohmann/json.hpp>
 #include <utility>
 
+#include "virtual_camera/lined_json.h"
 #include "virtual_camera/profile_place.h"
+#include "virtual_camera/profile_video.h"
 
 namespace vexa::camera {
 namespace {
 
-// The camera's word of what a profile names.
-std::string codec_word(const ProfilePlace& place) {
-  const std::string name = place.one_of({"JPEG", "MPEG4", "H.264"});
-  if (name == "H.264") return "h264";
-  return name == "MPEG4" ? "mpeg4" : "jpeg";
-}
+constexpr std::size_t kLargestFile = 1 << 20;
+constexpr std::size_t kMostSteps = 64;
+constexpr int kMostUnits = 65536;  // of a position of pan and tilt
+constexpr int kMostLensUnits = 65535;
 
 std::string exposure_word(const ProfilePlace& place) {
   const std::string name = place.one_of({"Full auto", "Shutter Priority", "Iris Priority"});
@@ -26,115 +26,82 @@ std::string exposure_word(const ProfilePlace& place) {
   return name == "Iris Priority" ? "iris" : "shutter";
 }
 
-std::vector<int> ascending(const ProfilePlace& list, int most) {
-  std::vector<int> numbers;
-  for (const ProfilePlace& item : list.items()) {
-    const int number = item.number(1, most);
-    if (!numbers.empty() && number <= numbers.back()) item.refuse("must be above the one before it");
-    numbers.push_back(number);
-  }
-  return numbers;
-}
-
-std::vector<PictureSize> sizes_of(const ProfilePlace& list) {
-  std::vector<PictureSize> sizes;
-  for (const ProfilePlace& item : list.items()) {
-    const PictureSize size = item.size();
-    if (std::find(sizes.begin(), sizes.end(), size) != sizes.end()) item.refuse("occurs twice");
-    sizes.push_back(size);
-  }
-  return sizes;
-}
-
-std::vector<std::string> words_of(const ProfilePlace& list, std::initializer_list<std::string_view> words) {
-  std::vector<std::string> found;
-  for (const ProfilePlace& item : list.items()) {
-    std::string word = item.one_of(words);
-    if (std::find(found.begin(), found.end(), word) != found.end()) item.refuse("occurs twice");
-    found.push_back(std::move(word));
-  }
-  return found;
-}
-
-OfferedCodec codec_of(const ProfilePlace& place) {
-  place.with_only({"name", "sizes", "frameRates", "qualities", "bitRates"});
-  OfferedCodec codec;
-  codec.word = codec_word(place.required("name"));
-  codec.sizes = sizes_of(place.required("sizes"));
-  codec.frame_rates = ascending(place.required("frameRates"), 60);
-  const bool jpeg = codec.word == "jpeg";
-  if (place.optional(jpeg ? "bitRates" : "qualities")) place.refuse("has the other codecs' rate");
-  if (jpeg) codec.qualities = ascending(place.required("qualities"), 100);
-  if (!jpeg) codec.bit_rates = ascending(place.required("bitRates"), 100000);
-  return codec;
-}
-
-template <typename Value>
-void demand_offered(const ProfilePlace& place, const std::vector<Value>& offered, const Value& value) {
-  if (std::find(offered.begin(), offered.end(), value) == offered.end()) place.refuse("is not offered by the codec");
-}
-
-StreamDefaults stream_of(const ProfilePlace& place, const CameraProfile& profile) {
-  place.with_only({"codec", "size", "frameRate", "quality", "bitRate"});
-  StreamDefaults stream;
-  stream.codec = codec_word(place.required("codec"));
-  const OfferedCodec* codec = profile.codec(stream.codec);
-  if (codec == nullptr) place.optional("codec").refuse("is not one of the camera's codecs");
-  stream.size = place.required("size").size();
-  stream.frame_rate = place.required("frameRate").number(1, 60);
-  demand_offered(place.optional("size"), codec->sizes, stream.size);
-  demand_offered(place.optional("frameRate"), codec->frame_rates, stream.frame_rate);
-  const bool jpeg = stream.codec == "jpeg";
-  if (place.optional(jpeg ? "bitRate" : "quality")) place.refuse("has the other codecs' rate");
-  int& rate = jpeg ? stream.quality : stream.bit_rate;
-  rate = place.required(jpeg ? "quality" : "bitRate").number(1, 100000);
-  demand_offered(place.optional(jpeg ? "quality" : "bitRate"), jpeg ? codec->qualities : codec->bit_rates, rate);
-  return stream;
-}
-
-void read_video(const ProfilePlace& video, CameraProfile& profile) {
-  video.with_only(
-      {"streams", "codecs", "standards", "captureSizes", "maxImageSizes", "solidPtz", "electronicFlip", "outputs"});
-  for (const ProfilePlace& place : video.required("codecs").items()) {
-    OfferedCodec codec = codec_of(place);
-    if (profile.codec(codec.word) != nullptr) place.refuse("is a codec that occurs twice");
-    profile.codecs.push_back(std::move(codec));
-  }
-  for (const ProfilePlace& place : video.required("streams").items()) {
-    profile.streams.push_back(stream_of(place, profile));
-  }
-  profile.standards = words_of(video.optional("standards"), {"pal", "ntsc"});
-  profile.capture_sizes = sizes_of(video.optional("captureSizes"));
-  profile.max_sizes = sizes_of(video.optional("maxImageSizes"));
-  if (const ProfilePlace solid = video.optional("solidPtz")) profile.solid_ptz = solid.size();
-  profile.electronic_flip = video.optional("electronicFlip").flag();
-  profile.outputs = words_of(video.optional("outputs"), {"ip", "pal", "ntsc"});
-}
-
 std::vector<int> steps_of(const ProfilePlace& list) {
   std::vector<int> values;
-  for (const ProfilePlace& item : list.items()) {
+  for (const ProfilePlace& item : list.items(kMostSteps)) {
     item.with_only({"label", "value"});
-    (void)item.required("label").text();
-    values.push_back(item.required("value").number(0, 10000));
+    (void)item.required("label").text(32);
+    const ProfilePlace place = item.required("value");
+    const int value = place.number(0, 10000);
+    if (!values.empty() && value <= values.back()) place.refuse("must be above the one before it");
+    values.push_back(value);
   }
   return values;
 }
 
-void read_image(const ProfilePlace& image, CameraProfile& profile) {
+// The steps that a mode goes through; other modes have none.
+void read_exposure_steps(const ProfilePlace& place, const char* key, bool wanted, std::vector<int>& steps) {
+  if (!wanted) return place.forbid(key, "is not for this mode");
+  steps = steps_of(place.required(key));
+}
+
+void read_exposure(const ProfilePlace& list, std::string_view driver, CameraProfile& profile) {
+  if (list && (driver == "heron" || driver == "simple-hd")) {
+    list.refuse("is not for the drivers \"heron\" and \"simple-hd\"");
+  }
+  for (const ProfilePlace& place : list.items(3)) {
+    place.with_only({"mode", "shutter", "iris"});
+    const ProfilePlace mode = place.required("mode");
+    const std::string word = exposure_word(mode);
+    if (word == "iris" && driver == "marlin") mode.refuse("is not for the driver \"marlin\"");
+    read_exposure_steps(place, "shutter", word == "shutter", profile.shutter_steps);
+    read_exposure_steps(place, "iris", word == "iris", profile.iris_steps);
+    const bool first = std::find(profile.exposure.begin(), profile.exposure.end(), word) == profile.exposure.end();
+    if (!first) mode.refuse("occurs twice among the exposure modes");
+    profile.exposure.push_back(word);
+  }
+}
+
+void read_image(const ProfilePlace& image, std::string_view driver, CameraProfile& profile) {
   image.with_only({"dayNight", "backLight", "noiseReduction", "wideDynamicRange", "visibilityEnhancer",
                    "infraredStrength", "exposure"});
-  profile.day_night = words_of(image.optional("dayNight"), {"auto", "day", "night"});
+  profile.day_night = image.optional("dayNight").words({"auto", "day", "night"});
   profile.back_light = image.optional("backLight").flag();
   profile.noise_reduction = image.optional("noiseReduction").flag();
   profile.wide_dynamic_range = image.optional("wideDynamicRange").flag();
   profile.visibility_enhancer = image.optional("visibilityEnhancer").flag();
   profile.infrared_strength = image.optional("infraredStrength").number(1, 100);
-  for (const ProfilePlace& place : image.optional("exposure").items()) {
-    place.with_only({"mode", "shutter", "iris"});
-    profile.exposure.push_back(exposure_word(place.required("mode")));
-    if (place.optional("shutter")) profile.shutter_steps = steps_of(place.optional("shutter"));
-    if (place.optional("iris")) profile.iris_steps = steps_of(place.optional("iris"));
+  read_exposure(image.optional("exposure"), driver, profile);
+}
+
+// Pan or tilt. The virtual camera moves by its own units, so the numbers are looked at and left.
+void check_axis(const ProfilePlace& axis) {
+  (void)axis.required("maxSpeed").number(1, 10000);
+  (void)axis.required("span").number(-kMostUnits, kMostUnits);
+  (void)axis.required("origin").number(-kMostUnits, kMostUnits);
+  for (const char* angle : {"angleRange", "wideAngle"}) (void)axis.required(angle).number(1, 36000);
+}
+
+void check_lens(const ProfilePlace& lens) {
+  const int slowest = lens.required("minSpeed").number(1, 10000);
+  const ProfilePlace fastest = lens.required("maxSpeed");
+  if (fastest.number(1, 10000) < slowest) fastest.refuse("must not be below minSpeed");
+  const int nearest = lens.required("minPosition").number(0, kMostLensUnits);
+  const ProfilePlace farthest = lens.required("maxPosition");
+  if (farthest.number(0, kMostLensUnits) < nearest) farthest.refuse("must not be below minPosition");
+}
+
+void check_zoom(const ProfilePlace& zoom) {
+  zoom.with_only({"minSpeed", "maxSpeed", "minPosition", "maxPosition", "ratios"});
+  check_lens(zoom);
+  int last = -1;
+  for (const ProfilePlace& point : zoom.required("ratios").items(64)) {
+    point.with_only({"ratio", "position"});
+    (void)point.required("ratio").number(1, 1000);
+    const ProfilePlace place = point.required("position");
+    const int position = place.number(0, kMostLensUnits);
+    if (position <= last) place.refuse("must be above the one before it");
+    last = position;
   }
 }
 
@@ -143,8 +110,27 @@ void read_ptz(const ProfilePlace& ptz, CameraProfile& profile) {
   ptz.with_only({"dialect", "noMoveSpeed", "pan", "tilt", "zoom", "focus", "presets", "tours", "shadowTours"});
   profile.ptz = true;
   profile.continuous_ptz = ptz.required("dialect").one_of({"continuous", "move"}) == "continuous";
-  profile.focus = static_cast<bool>(ptz.optional("focus"));
+  (void)ptz.optional("noMoveSpeed").flag();
+  check_axis(ptz.required("pan").with_only({"maxSpeed", "span", "angleRange", "origin", "wideAngle"}));
+  const ProfilePlace tilt = ptz.required("tilt");
+  check_axis(tilt.with_only({"maxSpeed", "span", "angleRange", "origin", "wideAngle", "offset"}));
+  (void)tilt.required("offset").number(-kMostUnits, kMostUnits);
+  check_zoom(ptz.required("zoom"));
+  if (const ProfilePlace focus = ptz.optional("focus")) {
+    check_lens(focus.with_only({"minSpeed", "maxSpeed", "minPosition", "maxPosition"}));
+    profile.focus = true;
+  }
   profile.presets = ptz.optional("presets").number(0, 256);
+  for (const char* tours : {"tours", "shadowTours"}) (void)ptz.optional(tours).number(0, 5);
+}
+
+void read_audio(const ProfilePlace& audio, CameraProfile& profile) {
+  if (!audio) return;
+  audio.with_only({"inputs", "outputs"});
+  const auto codecs = {std::string_view("g711_64"), std::string_view("g726_40"), std::string_view("g726_32"),
+                       std::string_view("g726_24"), std::string_view("g726_16")};
+  profile.audio_inputs = audio.required("inputs").words(codecs);
+  (void)audio.optional("outputs").words(codecs);
 }
 
 void read_io(const ProfilePlace& io, CameraProfile& profile) {
@@ -158,24 +144,59 @@ void read_io(const ProfilePlace& io, CameraProfile& profile) {
   profile.audio_detection = io.optional("audioDetection").flag();
 }
 
+// What the types say of the camera, the other parts must bear out.
+void check_types(const ProfilePlace& types, const CameraProfile& profile) {
+  const auto named =
+      types.words({"fixed", "ptz", "sd", "hd", "audio", "edge-storage", "analog-output", "lod-detection"});
+  const struct {
+    const char* word;
+    bool holds;
+    const char* where;
+  } all[] = {{"ptz", profile.ptz, "the profile has a part \"ptz\""},
+             {"audio", !profile.audio_inputs.empty(), "the profile has a part \"audio\""},
+             {"edge-storage", profile.edge_storage, "\"edgeStorage\" is true"},
+             {"analog-output", !profile.outputs.empty(), "\"video\" has \"outputs\""},
+             {"lod-detection", profile.video_detection == "lod", "\"io.videoDetection\" is \"lod\""}};
+  for (const auto& type : all) {
+    const bool is_named = std::find(named.begin(), named.end(), type.word) != named.end();
+    if (is_named == type.holds) continue;
+    types.refuse(fmt::format("must name \"{}\" exactly when {}", type.word, type.where));
+  }
+}
+
 CameraProfile read_camera(const ProfilePlace& root) {
   root.with_only({"$schema", "description", "driver", "model", "cameraTypes", "video", "image", "ptz", "audio", "io",
                   "edgeStorage"});
   CameraProfile profile;
-  profile.model = root.required("model").text();
-  profile.manual_iris_lens =
-      root.required("driver").one_of({"common", "heron", "marlin", "simple-hd", "simple-ptz"}) == "marlin";
-  read_video(root.required("video"), profile);
-  read_image(root.optional("image"), profile);
+  (void)root.optional("$schema").text();
+  (void)root.required("description").text(200);
+  profile.model = root.required("model").text(64);
+  const std::string driver = root.required("driver").one_of({"common", "heron", "marlin", "simple-hd", "simple-ptz"});
+  profile.manual_iris_lens = driver == "marlin";
+  read_video_part(root.required("video"), driver, profile);
+  read_image(root.optional("image"), driver, profile);
   read_ptz(root.optional("ptz"), profile);
-  const ProfilePlace audio = root.optional("audio").with_only({"inputs", "outputs"});
-  profile.audio_inputs = words_of(audio.optional("inputs"), {"g711_64", "g726_40", "g726_32", "g726_24", "g726_16"});
+  read_audio(root.optional("audio"), profile);
   read_io(root.optional("io"), profile);
   profile.edge_storage = root.optional("edgeStorage").flag();
+  check_types(root.required("cameraTypes"), profile);
   return profile;
 }
 
+std::string refusal(const std::string& file, const JsonMistake& mistake) {
+  const std::string_view separator = mistake.key.empty() ? "" : ": ";
+  return fmt::format("{}:{}{}{}: {}", file, mistake.line, separator, mistake.key, mistake.text);
+}
+
+bool is_wide(PictureSize size) { return size.width * 5 >= size.height * 8; }
+
 }  // namespace
+
+bool fits(PictureSize size, PictureSize limit) { return size.width <= limit.width && size.height <= limit.height; }
+
+bool can_be_cut(PictureSize size, PictureSize capture) {
+  return fits(size, capture) && is_wide(size) == is_wide(capture);
+}
 
 std::string size_text(PictureSize size) { return fmt::format("{},{}", size.width, size.height); }
 
@@ -186,22 +207,22 @@ const OfferedCodec* CameraProfile::codec(std::string_view word) const {
 }
 
 std::variant<CameraProfile, std::string> parse_camera_profile(std::string_view text, const std::string& file) {
+  const LinedJson json(text);
+  if (json.mistake()) return refusal(file, *json.mistake());
   try {
-    const auto json = nlohmann::ordered_json::parse(text);
-    return read_camera(ProfilePlace(&json, ""));
+    return read_camera(ProfilePlace(&json.root(), ""));
   } catch (const ProfileMistake& mistake) {
-    const std::string_view separator = mistake.key.empty() ? "" : ": ";
-    return fmt::format("{}: {}{}{}", file, mistake.key, separator, mistake.text);
-  } catch (const nlohmann::json::parse_error& error) {
-    const auto end = text.begin() + static_cast<std::ptrdiff_t>(std::min(error.byte, text.size()));
-    return fmt::format("{}:{}: not JSON", file, 1 + std::count(text.begin(), end, '\n'));
+    return refusal(file, {json.line_of(*mistake.at), mistake.key, mistake.text});
   }
 }
 
 std::variant<CameraProfile, std::string> load_camera_profile(const std::string& path) {
   std::ifstream file(path, std::ios::binary);
-  const std::string text{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
-  if (!file.is_open() || file.bad() || text.empty()) return fmt::format("{}: cannot be read, or is empty", path);
+  std::string text(kLargestFile + 1, '\0');
+  file.read(text.data(), static_cast<std::streamsize>(text.size()));
+  if (!file.is_open() || file.bad() || file.gcount() == 0) return fmt::format("{}: cannot be read, or is empty", path);
+  text.resize(static_cast<std::size_t>(file.gcount()));
+  if (text.size() > kLargestFile) return fmt::format("{}: is larger than 1 MiB", path);
   return parse_camera_profile(text, path);
 }
 

@@ -17,6 +17,9 @@ struct PictureSize {
   bool operator==(const PictureSize&) const = default;
 };
 
+[[nodiscard]] bool fits(PictureSize size, PictureSize limit);
+// Whether a capture of this size can give the picture: wide pictures, from 8:5 on, are cut out of a wide one only.
+[[nodiscard]] bool can_be_cut(PictureSize size, PictureSize capture);
 // "1920,1080", as commands and inquiries have it.
 [[nodiscard]] std::string size_text(PictureSize size);
 
@@ -75,7 +78,7 @@ struct CameraProfile {
   [[nodiscard]] const OfferedCodec* codec(std::string_view word) const;
 };
 
-// The profile, or what is wrong: "FILE: KEY: TEXT", with a line for a mistake in JSON. `file` stands in that text only.
+// The profile, or what is wrong: "FILE:LINE: KEY: TEXT". `file` stands in that text only.
 [[nodiscard]] std::variant<CameraProfile, std::string> parse_camera_profile(std::string_view text,
                                                                             const std::string& file);
 [[nodiscard]] std::variant<CameraProfile, std::string> load_camera_profile(const std::string& path);

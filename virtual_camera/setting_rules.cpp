@@ -50,11 +50,6 @@ bool holds(const std::vector<int>& offered, std::string_view value) {
   return number && std::find(offered.begin(), offered.end(), *number) != offered.end();
 }
 
-bool fits(PictureSize size, PictureSize limit) { return size.width <= limit.width && size.height <= limit.height; }
-
-// Pictures from 8:5 on are wide, and cut out of a wide capture only.
-bool is_wide(PictureSize size) { return size.width * 5 >= size.height * 8; }
-
 std::vector<std::string> texts_of(const std::vector<PictureSize>& sizes) {
   std::vector<std::string> texts;
   texts.reserve(sizes.size());
@@ -283,7 +278,7 @@ bool SettingRules::size_agrees(const Pairs& settings, const OfferedCodec& codec,
   if (std::find(codec.sizes.begin(), codec.sizes.end(), size) == codec.sizes.end()) return false;
   const auto capture = size_of(value_in(settings, "VidCapSize"));
   const auto largest = size_of(value_in(settings, "ImageMaxSize"));
-  if (capture && (!fits(size, *capture) || is_wide(size) != is_wide(*capture))) return false;
+  if (capture && !can_be_cut(size, *capture)) return false;
   if (largest && !fits(size, *largest)) return false;
   return value_in(settings, "SolidPTZ") != "on" || !profile_.solid_ptz || fits(size, *profile_.solid_ptz);
 }

@@ -3,19 +3,36 @@
 
 #include <initializer_list>
 #include <string>
+#include <variant>
 
 #include "tests/models/profile_text.h"
 #include "tests/support/temporary_folder.h"
 #include "vexa/models.h"
+#include "virtual_camera/camera_profile.h"
 
 namespace vexa_test {
 namespace {
+
+// The virtual camera reads profiles on its own; both must refuse the same, at the same place.
+void expect_camera_refuses(const std::string& text, const vexa::ProfileError& error) {
+  const auto read = vexa::camera::parse_camera_profile(text, error.file);
+  const auto* message = std::get_if<std::string>(&read);
+  ASSERT_NE(message, nullptr) << "the virtual camera takes what the library refuses: " << error.Message();
+  vexa::ProfileError place = error;
+  place.text.clear();
+  EXPECT_EQ(message->substr(0, place.Message().size()), place.Message());
+}
 
 std::string refusal_of(const std::string& text) {
   vexa::Profile profile;
   profile.model = "as it was";
   vexa::ProfileError error;
-  if (vexa::ParseProfile(text, "p.json", profile, error)) return "taken";
+  if (vexa::ParseProfile(text, "p.json", profile, error)) {
+    EXPECT_TRUE(std::holds_alternative<vexa::camera::CameraProfile>(vexa::camera::parse_camera_profile(text, "p.json")))
+        << "the virtual camera refuses what the library takes";
+    return "taken";
+  }
+  expect_camera_refuses(text, error);
   EXPECT_EQ(profile.model, "as it was");
   EXPECT_TRUE(profile.camera.codecs.empty());
   return error.Message();
@@ -87,6 +104,18 @@ TEST(ProfileRefusal, NamesWhatTheSchemaCannotSay) {
       {"\"bitRate\": 2000", "\"quality\": 5", "p.json:7: video.streams[0].bitRate: is missing"},
       {"\"codecs\": [", "\"captureSizes\": [\"x\"], \"codecs\": [",
        "p.json:8: video.captureSizes[0]: must be WIDTHxHEIGHT in pixels, for instance \"640x480\""},
+      {"\"codecs\": [", "\"captureSizes\": [\"640x480\"], \"maxImageSizes\": [\"640x480\"], \"codecs\": [", "taken"},
+      {"\"codecs\": [", "\"captureSizes\": [\"639x480\", \"640x480\"], \"codecs\": [",
+       "p.json:7: video.streams[0].size: cannot be cut out of the first of captureSizes"},
+      {"\"codecs\": [", "\"captureSizes\": [\"640x479\"], \"codecs\": [",
+       "p.json:7: video.streams[0].size: cannot be cut out of the first of captureSizes"},
+      {"\"codecs\": [", "\"captureSizes\": [\"800x501\"], \"codecs\": [", "taken"},
+      {"\"codecs\": [", "\"captureSizes\": [\"800x500\"], \"codecs\": [",
+       "p.json:7: video.streams[0].size: cannot be cut out of the first of captureSizes"},
+      {"\"codecs\": [", "\"maxImageSizes\": [\"639x480\", \"640x480\"], \"codecs\": [",
+       "p.json:7: video.streams[0].size: is above the first of maxImageSizes"},
+      {"\"codecs\": [", "\"maxImageSizes\": [\"640x479\"], \"codecs\": [",
+       "p.json:7: video.streams[0].size: is above the first of maxImageSizes"},
       {"\"codecs\": [", "\"outputs\": [\"ip\", \"pal\"], \"codecs\": [",
        "p.json:8: video.outputs: is for the drivers \"simple-hd\" and \"simple-ptz\" only"},
       {"\"value\": 2", "\"value\": 1",
@@ -165,6 +194,8 @@ TEST(ProfileRefusal, NamesTheLineOfAMistakeInJson) {
             "p.json:5: not JSON: something is missing, too many or misspelt here");
   EXPECT_EQ(refusal_of(changed_profile("\"model\"", "\"driver\"")), "p.json:4: driver: occurs twice");
   EXPECT_EQ(refusal_of("[]"), "p.json:1: must be an object");
+  EXPECT_EQ(refusal_of(std::string(16, '[') + std::string(16, ']')), "p.json:1: must be an object");
+  EXPECT_EQ(refusal_of(std::string(17, '[') + std::string(17, ']')), "p.json:1: nested too deeply");
 }
 
 TEST(ProfileRefusal, CutAnywhereIsRefusedWhole) {

@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "tests/support/temporary_folder.h"
 #include "tests/virtual_camera/camera_client.h"
 #include "virtual_camera/command_line.h"
 
@@ -169,15 +170,16 @@ TEST(CommandLine, HelpEndsWellAndMistakesEndWithTwo) {
   for (const auto& mistake : mistakes) EXPECT_EQ(parse(mistake).exit_code, 2) << mistake[0];
 }
 
-// The program as a child process, its standard output on a pipe.
+// The program as a child process, one of its outputs on a pipe.
 class Program {
  public:
-  explicit Program(std::vector<std::string> arguments) {
+  // `channel` is what line() reads: the program's output, or its error output.
+  explicit Program(std::vector<std::string> arguments, int channel = STDOUT_FILENO) {
     std::array<int, 2> ends{};
     EXPECT_EQ(::pipe(ends.data()), 0);
     posix_spawn_file_actions_t actions;
     posix_spawn_file_actions_init(&actions);
-    posix_spawn_file_actions_adddup2(&actions, ends[1], STDOUT_FILENO);
+    posix_spawn_file_actions_adddup2(&actions, ends[1], channel);
     posix_spawn_file_actions_addclose(&actions, ends[0]);
     posix_spawn_file_actions_addclose(&actions, ends[1]);
     arguments.insert(arguments.begin(), std::string(VEXA_BINARY_DIR) + "/bin/vexa-camera");
@@ -250,6 +252,15 @@ TEST(Program, EndsByItselfAfterItsDuration) {
 TEST(Program, AnAddressThatIsNotOursEndsWithOne) {
   Program program({"--address", "192.0.2.1"});
   EXPECT_EQ(program.line(), "");
+  EXPECT_EQ(program.end_by(0), 1);
+}
+
+TEST(Program, AWrongProfileEndsWithOneAndNamesFileLineAndKey) {
+  const vexa_test::TemporaryFolder folder;
+  const std::string wrong = folder.make_file("wrong.json", "{\n\"model\": \"T-1\",\n\"description\": 1}\n");
+  Program program({"--address", own_address(), "--http-port", "0", "--rtsp-port", "0", "--profile", wrong},
+                  STDERR_FILENO);
+  EXPECT_EQ(program.line(), "vexa-camera: " + wrong + ":3: description: must be a text");
   EXPECT_EQ(program.end_by(0), 1);
 }
 
