@@ -8,4 +8,5 @@ if(VEXA_FFMPEG_FOUND)
   add_library(vexa_ffmpeg INTERFACE)
   target_link_libraries(vexa_ffmpeg INTERFACE PkgConfig::VEXA_FFMPEG)
   target_compile_definitions(vexa_ffmpeg INTERFACE VEXA_WITH_FFMPEG)
+  target_link_options(vexa_ffmpeg INTERFACE LINKER:--as-needed)  # a program that calls none of them loads none
 endif()
