@@ -22,17 +22,7 @@ namespace vexa::camera {
 #ifdef VEXA_WITH_FFMPEG
 namespace {
 
-struct FreeContext {
-  void operator()(AVCodecContext* context) const { avcodec_free_context(&context); }
-};
-struct FreeFrame {
-  void operator()(AVFrame* frame) const { av_frame_free(&frame); }
-};
-struct FreePacket {
-  void operator()(AVPacket* packet) const { av_packet_free(&packet); }
-};
-
-std::string trouble(const char* doing, int code) {
+std::string encoder_trouble(const char* doing, int code) {
   char text[AV_ERROR_MAX_STRING_SIZE] = {};
   av_strerror(code, text, sizeof text);
   return std::string(doing) + ": " + text;
@@ -74,6 +64,21 @@ void set_up_motion(AVCodecContext& context, const LiveEncoding& encoding) {
   av_opt_set(context.priv_data, "forced-idr", "1", 0);
 }
 
+void set_up(AVCodecContext& context, const LiveEncoding& encoding) {
+  context.width = encoding.width;
+  context.height = encoding.height;
+  context.pix_fmt = AV_PIX_FMT_YUV420P;
+  context.time_base = {1, encoding.frame_rate};
+  context.framerate = {encoding.frame_rate, 1};
+  context.thread_count = 1;
+  context.flags |= AV_CODEC_FLAG_BITEXACT;  // no name of the encoder in what it writes
+  if (encoding.codec == LiveCodec::kJpeg) {
+    set_up_jpeg(context, encoding);
+  } else {
+    set_up_motion(context, encoding);
+  }
+}
+
 struct StartCode {
   std::size_t at = 0;    // of its first byte
   std::size_t unit = 0;  // of the byte behind it; both are the end of the bytes when there is none
@@ -112,10 +117,16 @@ void copy_plane(const std::uint8_t* from, int width, int height, std::uint8_t* t
 }  // namespace
 
 struct LiveEncoder::Parts {
+  struct Free {
+    void operator()(AVCodecContext* context) const { avcodec_free_context(&context); }
+    void operator()(AVFrame* frame) const { av_frame_free(&frame); }
+    void operator()(AVPacket* packet) const { av_packet_free(&packet); }
+  };
+
   LiveCodec codec = LiveCodec::kH264;
-  std::unique_ptr<AVCodecContext, FreeContext> context;
-  std::unique_ptr<AVFrame, FreeFrame> frame;
-  std::unique_ptr<AVPacket, FreePacket> packet;
+  std::unique_ptr<AVCodecContext, Free> context;
+  std::unique_ptr<AVFrame, Free> frame;
+  std::unique_ptr<AVPacket, Free> packet;
   std::int64_t next = 0;  // picture
   bool key_wanted = false;
 
@@ -139,27 +150,16 @@ std::variant<LiveEncoder, std::string> LiveEncoder::open(const LiveEncoding& enc
   parts->packet.reset(av_packet_alloc());
   if (!parts->context || !parts->frame || !parts->packet) return "no memory for an encoder";
   AVCodecContext& context = *parts->context;
-  context.width = encoding.width;
-  context.height = encoding.height;
-  context.pix_fmt = AV_PIX_FMT_YUV420P;
-  context.time_base = {1, encoding.frame_rate};
-  context.framerate = {encoding.frame_rate, 1};
-  context.thread_count = 1;
-  context.flags |= AV_CODEC_FLAG_BITEXACT;  // no name of the encoder in what it writes
-  if (encoding.codec == LiveCodec::kJpeg) {
-    set_up_jpeg(context, encoding);
-  } else {
-    set_up_motion(context, encoding);
-  }
+  set_up(context, encoding);
   if (const int failed = avcodec_open2(&context, codec, nullptr); failed < 0)
-    return trouble("open the encoder", failed);
+    return encoder_trouble("open the encoder", failed);
   AVFrame& frame = *parts->frame;
   frame.format = context.pix_fmt;
   frame.width = context.width;
   frame.height = context.height;
   frame.color_range = context.color_range;
   frame.quality = context.global_quality;
-  if (const int failed = av_frame_get_buffer(&frame, 0); failed < 0) return trouble("make a picture", failed);
+  if (const int failed = av_frame_get_buffer(&frame, 0); failed < 0) return encoder_trouble("make a picture", failed);
   return LiveEncoder(std::move(parts));
 }
 
@@ -181,7 +181,7 @@ std::variant<EncodedPicture, std::string> LiveEncoder::encode(const I420Picture&
   if (picture.width() != parts_->context->width || picture.height() != parts_->context->height) {
     return "a picture of another size";
   }
-  if (const int failed = parts_->take(picture); failed < 0) return trouble("encode a picture", failed);
+  if (const int failed = parts_->take(picture); failed < 0) return encoder_trouble("encode a picture", failed);
   const AVPacket& packet = *parts_->packet;
   const std::span<const std::uint8_t> bytes(packet.data, static_cast<std::size_t>(packet.size));
   EncodedPicture encoded;

@@ -18,6 +18,7 @@ namespace {
 using Millidegrees = std::int64_t;
 
 constexpr Millidegrees kDegree = 1000;
+constexpr Millidegrees kFullTurn = 360 * kDegree;
 constexpr Millidegrees kNadir = -90 * kDegree;
 constexpr Millidegrees kZenith = 90 * kDegree;
 constexpr Colour kBeyond{30, 128, 128};  // above the zenith and below the nadir
@@ -133,7 +134,6 @@ double in_degrees(Millidegrees angle) { return static_cast<double>(angle) / stat
 
 // One line of the scale, along an elevation.
 void draw_scale_line(Sheet& sheet, Millidegrees elevation, ScaleRange bearings, Millidegrees step) {
-  constexpr Millidegrees kCircle = 360 * kDegree;
   const int line = sheet.row(in_degrees(elevation));
   const int dot = sheet.dot;
   sheet.painter.fill({0, line, sheet.size.width, 1}, kScale);
@@ -143,7 +143,7 @@ void draw_scale_line(Sheet& sheet, Millidegrees elevation, ScaleRange bearings, 
     const int tick = (numbered ? 8 : at % (step / 2) == 0 ? 5 : 3) * dot;
     sheet.painter.fill({column, line - tick, std::max(dot / 2, 1), tick}, kScale);
     if (!numbered) continue;
-    const Millidegrees bearing = (at % kCircle + kCircle) % kCircle;
+    const Millidegrees bearing = (at % kFullTurn + kFullTurn) % kFullTurn;
     sheet.painter.write(bearing_text(bearing), column + 2 * dot, line - (2 + kLetterHeight + 3) * dot, dot, kScale);
     sheet.painter.write(degrees_text(elevation), column + 2 * dot, line + 3 * dot, dot, kScale);
   }
