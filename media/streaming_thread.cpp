@@ -10,7 +10,9 @@
 #include "device/raised_timeout.h"
 #include "media/assembly/h264_units.h"
 #include "runtime/base/sync.h"
+#include "runtime/base/text.h"
 #include "transport/failure.h"
+#include "transport/wire/http_request.h"
 #include "vexa/runtime.h"
 #include "vexa/vexa_common.h"
 
@@ -19,19 +21,27 @@ namespace {
 constexpr unsigned int kFrameCapacity = 1200000;
 constexpr unsigned int kLargeFrameCapacity = 2000000;
 constexpr int kRtspPort = 554;
+constexpr std::size_t kPathRoom = 260;  // of a session's path, the terminator among it
 constexpr int kRtspTransport = 1;
 constexpr int kOpenTimeout = 40000;       // milliseconds
 constexpr useconds_t kExitPoll = 100000;  // microseconds
 
 }  // namespace
 
-ELibDReturnCode CVexaCommon::StartVideoStreaming() {
+ELibDReturnCode CVexaCommon::StartVideoStreaming() { return StartVideo(nullptr); }
+
+ELibDReturnCode CVexaCommon::StartEdgeStorageVideoStreaming(const SLibDEdgeStorageStreamingInfo& info) {
+  return StartVideo(&info);
+}
+
+// Live video, or the recording.
+ELibDReturnCode CVexaCommon::StartVideo(const SLibDEdgeStorageStreamingInfo* recording) {
   if (IsStopRequested()) return LIBD_FAILED;
   const vexa::Guard guard(m_State->start_stop_lock);
   StopVideoStreaming();
   if (IsStopRequested()) return LIBD_FAILED;  // another thread's, which waits for the lock
   try {
-    return StartLiveVideo();
+    return recording == nullptr ? StartLiveVideo() : StartPlayback(*recording);
   } catch (const std::bad_alloc&) {
     return AbandonStart(ENOMEM);
   }
@@ -46,6 +56,7 @@ ELibDReturnCode CVexaCommon::StartLiveVideo() {
     ReleaseRtpPacketsPtr();
     return LatestErrorCode();
   }
+  m_LastFrameTime = m_State->now();
   return StartStreamingThread(camera.codecName);
 }
 
@@ -68,15 +79,50 @@ bool CVexaCommon::OpenLiveRtp(int stream) {
   m_RtpLiveMode = true;
   m_EdgeStoragePlayback = false;
   if (!AllocateRtpPackets()) return false;
-  const SLibDConnectionInfo connection = ConnectionInfo();
-  PrepareCamera();  // once more: an inquiry of the host's may have stored another port meanwhile
   const vexa::RaisedTimeout slow(m_ConnectionInfo.timeout, m_ConnectionLock, {kOpenTimeout, m_SavedTimeout});
-  m_RtspSocket = rtp_over_udp_open("rtsp://%s:%d/media/video%d", connection.host.c_str(), kRtspPort, stream);
+  OpenRtpSession(vexa::format_within(kPathRoom, "/media/video%d", stream).text);
+  return true;
+}
+
+// Opens the session at a path of the camera's, or leaves both sockets closed with the latest error set.
+void CVexaCommon::OpenRtpSession(const std::string& path) {
+  const SLibDConnectionInfo connection = ConnectionInfo();
+  PrepareCamera();  // an inquiry of the host's may have stored another port meanwhile
+  m_RtspSocket = rtp_over_udp_open("rtsp://%s:%d%s", connection.host.c_str(), kRtspPort, path.c_str());
   if (m_RtspSocket == -1 && m_StreamSocket != -1) {
     rtp_over_tcp_close(m_StreamSocket);
     SetStreamSocket(-1);
     Fail({LIBD_STREAM_OPEN_FAILED, LatestErrorText().c_str()});
   }
+}
+
+ELibDReturnCode CVexaCommon::StartPlayback(const SLibDEdgeStorageStreamingInfo& recording) {
+  if (!OpenPlayback(recording)) {
+    ReleaseRtpPacketsPtr();
+    return LIBD_FAILED;
+  }
+  if (m_RtspSocket == -1) {
+    ReleaseRtpPacketsPtr();
+    return LatestErrorCode();
+  }
+  return StartStreamingThread(m_EdgeStorageCodec);
+}
+
+bool CVexaCommon::OpenPlayback(const SLibDEdgeStorageStreamingInfo& recording) {
+  // Safe: a name with blanks or line ends adds neither a header nor another request.
+  const std::string name = vexa::as_one_word(recording.streamName, "");
+  const std::string path = vexa::format_within(kPathRoom, "/media/%s", name.c_str()).text;
+  if (!AllocateRtpPackets()) return false;
+  m_RtpLiveMode = true;
+  m_EdgeStoragePlayback = true;
+  m_FirstPlaybackFrame = true;
+  m_PlaybackScale = recording.scale;
+  m_EdgeStorageCodec = recording.codecName;
+  // Kept: the silence of a playback counts from before its open, however long that takes.
+  m_LastFrameTime = m_State->now();
+  const vexa::RaisedTimeout slow(m_ConnectionInfo.timeout, m_ConnectionLock, {kOpenTimeout, m_SavedTimeout});
+  if (!InitEdgeStorageKeepAlivePeriod()) return false;
+  OpenRtpSession(path);
   return true;
 }
 
@@ -90,7 +136,6 @@ bool CVexaCommon::AllocateRtpPackets() {
 }
 
 ELibDReturnCode CVexaCommon::StartStreamingThread(const std::string& codec) {
-  m_LastFrameTime = m_State->now();
   {
     const vexa::Guard guard(m_FrameQueueLock);
     if (codec != "JPEG") m_LargeFrameBuffers = false;

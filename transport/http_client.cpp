@@ -26,7 +26,7 @@ constexpr int kReceiveBuffer = 131072;
 constexpr int kHeaderRoom = 1023;
 constexpr int kHeaderPause = 10;  // milliseconds between two looks at a header that is not complete
 constexpr std::size_t kPieceRoom = 4096;
-constexpr std::size_t kEndlessAnswer = std::size_t{16} << 20;
+constexpr std::size_t kEndlessAnswer = std::size_t{32} << 20;
 constexpr const char* kSparedInUrls = "$-_.+!*'(),/?&#=";
 
 constexpr int kStatusOk = 200;

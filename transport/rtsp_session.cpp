@@ -238,7 +238,7 @@ bool CVexaCommon::parse_clock(const char* text) {
 void CVexaCommon::rtp_over_udp_close() {
   if (m_RtspSocket == -1 && m_StreamSocket == -1) return;
   // Kept: the switch that recordings are played with holds for live sessions too.
-  if (!m_NoTearDown) {
+  if (WantsTearDown()) {
     try {
       TearDown();
     } catch (const std::bad_alloc&) {
@@ -246,6 +246,12 @@ void CVexaCommon::rtp_over_udp_close() {
     }
   }
   rtp_stream_socket_close_all();
+}
+
+// The host may change its mind at any time.
+bool CVexaCommon::WantsTearDown() {
+  const vexa::Guard guard(m_VideoStateLock);
+  return !m_NoTearDown;
 }
 
 void CVexaCommon::TearDown() {

@@ -174,6 +174,16 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode GetCurrentPosition(SLibDRawMDFrameInfo& frame) override;
   ELibDReturnCode StopModRawData() override;
 
+  // device/edge_storage.cpp
+  ELibDReturnCode GetEdgeStorageMode(SLibDEdgeStorageMode& mode) override;
+  ELibDReturnCode SetEdgeStorageMode(const SLibDEdgeStorageMode& mode) override;
+  ELibDReturnCode GetEdgeStorageRecordList(SLibDEdgeStorageRecordList& list) override;
+  ELibDReturnCode DeleteAllEdgeStorageRecord() override;
+  ELibDReturnCode DeleteEdgeStorageRecordByName(const SLibDEdgeStorageStreamingInfo& info) override;
+  ELibDReturnCode SetEdgeStorageNoTearDown(bool noTearDown) override;
+  // media/streaming_thread.cpp
+  ELibDReturnCode StartEdgeStorageVideoStreaming(const SLibDEdgeStorageStreamingInfo& info) override;
+
   /// Hook of model classes, called when standard or capture size change (-1: no size is given). LIBD_OK.
   virtual ELibDReturnCode InitializeFixedVideoParams(ELibDVideoStandard standard, int width, int height);
 
@@ -229,6 +239,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   bool DescribeRtsp(int socket, const std::string& url, std::string& description);
   bool SetUpRtsp(int socket, const vexa::Formatted& request, int& session);
   bool PlayRtsp(int socket, const std::string& url, int session);
+  bool WantsTearDown();
   void TearDown();
   bool TakeRangeClock(const std::string& answer);
   bool TakeClockRate(const std::string& answer);
@@ -256,11 +267,15 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode GetRtpCurrentVideoFrame(const std::string& codec, VideoFrameInfo& frame);
   ELibDReturnCode StopRtpVideoStreaming();
   void ReleaseRtpPacketsPtr();
+  ELibDReturnCode StartVideo(const SLibDEdgeStorageStreamingInfo* recording);
   ELibDReturnCode StartLiveVideo();
+  ELibDReturnCode StartPlayback(const SLibDEdgeStorageStreamingInfo& recording);
   ELibDReturnCode AbandonStart(int error);
   SLibDCameraInfo PrepareCamera();
   bool OpenLiveHttp(int stream);
   bool OpenLiveRtp(int stream);
+  bool OpenPlayback(const SLibDEdgeStorageStreamingInfo& recording);
+  void OpenRtpSession(const std::string& path);
   bool AllocateRtpPackets();
   ELibDReturnCode StartStreamingThread(const std::string& codec);
   bool NextReadWaits(ELibDReturnCode result) const;
@@ -313,6 +328,8 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode GetCommonSystemInfo(SLibDSystemInfo& info, const std::string& answer);
   ELibDReturnCode GetCommonNetworkInfo(SLibDSystemInfo& info, const std::string& answer);
   bool InitEdgeStorageKeepAlivePeriod();
+  /// Free kilobytes on the card; 0 when the camera names none, -1 when it cannot be asked.
+  int CheckEdgeStorageFreeSize();
   std::int64_t _ld_mkgmtime(std::tm* time);
   bool _ld_is_leap_year(int year);
 
@@ -433,12 +450,14 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   int m_RtpClockRate = 0;  ///< ticks a second
   bool m_EdgeStoragePlayback = false;
   int m_PlaybackScale = 1;
-  bool m_NoTearDown = false;
+  bool m_NoTearDown = false;  ///< guarded by m_VideoStateLock
   int m_KeepAlivePeriod = 1;  ///< seconds
   std::time_t m_LastKeepAliveTime = 0;
   bool m_FirstPlaybackFrame = false;
   std::uint32_t m_PlaybackBaseTimestamp = 0;
-  std::string m_EdgeStorageCodec;
+  std::string m_EdgeStorageCodec;  ///< of the playback under way
+
+  SLibDEdgeStorageMode m_EdgeStorageMode;  ///< as last sent; guarded by m_ConnectionLock
 
   // RTP packets: the streaming thread's
   std::vector<SPacketInfo> m_RtpPackets;       ///< sorted; the data lie in m_RtpPacketBuffer

@@ -62,6 +62,18 @@ std::int64_t utc_seconds(const std::tm& time) {
   return days * 86400 + std::int64_t{time.tm_hour} * 3600 + std::int64_t{time.tm_min} * 60 + time.tm_sec;
 }
 
+void set_date(std::tm& time, int date) {
+  time.tm_year = date / 10000 - 1900;
+  time.tm_mon = date / 100 % 100 - 1;
+  time.tm_mday = date % 100;
+}
+
+void set_clock(std::tm& time, int clock) {
+  time.tm_hour = clock / 10000;
+  time.tm_min = clock / 100 % 100;
+  time.tm_sec = clock % 100;
+}
+
 int days_into_week(int weekday, int first_day) {
   const int days = (weekday - first_day % kDaysPerWeek) % kDaysPerWeek;
   return days < 0 ? days + kDaysPerWeek : days;

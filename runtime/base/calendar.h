@@ -22,6 +22,11 @@ std::optional<int> day_of_year(int year, int month, int day);
 /// added as they are; a month before January counts as January, one after December as the whole year.
 std::int64_t utc_seconds(const std::tm& time);
 
+/// Sets year, month and day to those of the decimal number YYYYMMDD, whatever day that is.
+void set_date(std::tm& time, int date);
+/// Sets hour, minute and second to those of the decimal number hhmmss likewise.
+void set_clock(std::tm& time, int clock);
+
 /// A day as the week rules see it.
 struct WeekDay {
   int year;

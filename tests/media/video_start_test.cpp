@@ -205,13 +205,24 @@ TEST(VideoStart, SetsAsideAZeroedStagingBufferAndKeepsLargeFramesForJpegAlone) {
   }
 }
 
-TEST(VideoStart, CountsTheSilenceFromItsOwnMoment) {
-  OpenedDriver driver;
-  driver.state().now = [] { return static_cast<std::time_t>(5000); };
-  driver.m_StreamWaitMs = 600000;
-  ASSERT_EQ(driver.StartStreamingThread("H.264"), LIBD_OK);
+TEST(VideoStart, CountsTheSilenceFromBehindTheOpen) {
+  static std::atomic<std::time_t> now;
+  now = 5000;
+  auto options = camera_options();
+  options.clip_path.clear();
+  vexa::camera::VirtualCamera camera(options);
+  camera.journal().observe([](const vexa::camera::Request& request) {
+    if (request.bytes.find("TEARDOWN") == std::string::npos) ++now;
+  });
+  ASSERT_TRUE(camera.start()) << camera.error();
+  MediaDriver driver;
+  driver.use(camera.address(), camera.http_port(), 5000);
+  driver.use_live_h264();
+  driver.m_LastKeepAliveTime = 5000;
+  driver.state().now = [] { return now.load(); };
+  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
   EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
-  EXPECT_EQ(driver.m_LastFrameTime, 5000);
+  EXPECT_EQ(driver.m_LastFrameTime, 5006) << "three requests for the keep-alive, three for the session";
 }
 
 TEST(VideoStart, WithoutAThreadFailsWithTheSystemsTextAndClosesTheStream) {

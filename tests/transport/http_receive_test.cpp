@@ -237,7 +237,7 @@ TEST_F(HttpRecvnText, EndsAnAnswerWithoutEnd) {
   std::string text;
   EXPECT_EQ(driver_.http_recvn(socket_, text, 0, 600000), -1);
   expect_error(LIBD_TIMEOUT, "Receive timed out");
-  EXPECT_LT(text.size(), (std::size_t{16} << 20) + 4097);
+  EXPECT_LT(text.size(), (std::size_t{32} << 20) + 4097);
   shutdown(socket_, SHUT_RDWR);
   camera.join();
 }

@@ -5,6 +5,21 @@ namespace {
 
 constexpr std::size_t kCredentialsRoom = 256;
 
+template <typename Predicate>
+std::string encoded_where(std::string_view text, Predicate must_be) {
+  constexpr std::string_view kDigits = "0123456789ABCDEF";
+  std::string encoded;
+  for (const char c : text) {
+    if (!must_be(c)) {
+      encoded += c;
+      continue;
+    }
+    const auto byte = static_cast<unsigned char>(c);
+    encoded += {'%', kDigits[byte >> 4], kDigits[byte & 0xf]};
+  }
+  return encoded;
+}
+
 }  // namespace
 
 std::string joined_credentials(const std::string& user, const std::string& password) {
@@ -17,17 +32,16 @@ Formatted http_get_request(const HttpTarget& target) {
 }
 
 std::string percent_encoded(std::string_view text, std::string_view spared) {
-  constexpr std::string_view kDigits = "0123456789ABCDEF";
-  std::string encoded;
-  for (const char c : text) {
-    if (is_ascii_alphanumeric(c) || spared.find(c) != std::string_view::npos) {
-      encoded += c;
-      continue;
-    }
+  return encoded_where(
+      text, [spared](char c) { return !is_ascii_alphanumeric(c) && spared.find(c) == std::string_view::npos; });
+}
+
+std::string as_one_word(std::string_view text, std::string_view also) {
+  constexpr unsigned char kDelete = 0x7f;
+  return encoded_where(text, [also](char c) {
     const auto byte = static_cast<unsigned char>(c);
-    encoded += {'%', kDigits[byte >> 4], kDigits[byte & 0xf]};
-  }
-  return encoded;
+    return byte <= ' ' || byte == kDelete || also.find(c) != std::string_view::npos;
+  });
 }
 
 }  // namespace vexa

@@ -14,20 +14,6 @@ constexpr std::size_t kMicrosDigits = 6;
 
 int number_in(std::string_view digits) { return leading_int(std::string(digits.substr(0, kLongestNumber))); }
 
-void read_date(std::tm& time, std::string_view digits) {
-  const int date = number_in(digits);
-  time.tm_year = date / 10000 - 1900;
-  time.tm_mon = date / 100 % 100 - 1;
-  time.tm_mday = date % 100;
-}
-
-void read_time(std::tm& time, std::string_view digits) {
-  const int clock = number_in(digits);
-  time.tm_hour = clock / 10000;
-  time.tm_min = clock / 100 % 100;
-  time.tm_sec = clock % 100;
-}
-
 int micros_in(std::string_view digits) {
   int micros = number_in(digits);
   // Kept: a fraction of more than six digits is taken as it is; no camera known sends one.
@@ -46,11 +32,11 @@ RangeClock parse_range_clock(std::string_view text) {
   for (std::size_t at = 0; at < clock.size(); ++at) {
     switch (clock[at]) {
       case 'T':
-        read_date(time, clock.substr(0, at));
+        set_date(time, number_in(clock.substr(0, at)));
         time_begin = field_begin = at + 1;
         break;
       case '.':
-        read_time(time, clock.substr(time_begin, at - time_begin));
+        set_clock(time, number_in(clock.substr(time_begin, at - time_begin)));
         read.seconds = utc_seconds(time);
         field_begin = at + 1;
         break;

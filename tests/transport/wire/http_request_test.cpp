@@ -49,5 +49,20 @@ TEST(PercentEncoded, CopiesLettersDigitsAndWhatIsSpared) {
   EXPECT_EQ(percent_encoded("", kSpared), "");
 }
 
+TEST(AsOneWord, EncodesBlanksAndControlCharactersAndWhatIsNamedAlone) {
+  std::string every;
+  for (int c = 0; c < 256; ++c) every += static_cast<char>(c);
+  std::string expected;
+  for (const char c : every) {
+    const unsigned byte = static_cast<unsigned char>(c);
+    char escaped[4];
+    std::snprintf(escaped, sizeof escaped, "%%%02X", byte);
+    expected += byte <= 32 || byte == 127 || c == '&' ? escaped : std::string(1, c);
+  }
+  EXPECT_EQ(as_one_word(every, "&"), expected);
+  EXPECT_EQ(as_one_word("a&b c", ""), "a&b%20c");
+  EXPECT_EQ(as_one_word("", "&"), "");
+}
+
 }  // namespace
 }  // namespace vexa
