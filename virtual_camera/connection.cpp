@@ -86,6 +86,7 @@ void Connection::received(std::size_t size) {
 }
 
 void Connection::take_request() {
+  received_.erase(0, passed_over(received_));
   const std::size_t size = request_size(received_);
   if (size == 0 && received_.size() <= kMaxRequest) return read();
   request_begun_ = false;
@@ -138,11 +139,18 @@ void Connection::journal(std::string request, const Answer& answer) {
 
 void Connection::deliver() {
   delivered_ = 0;
-  if (delivery_.delay.count() == 0) return deliver_rest();
+  if (delivery_.delay.count() == 0) return begin_delivery();
   set_deadline(delivery_.delay + kLingerLimit);
   pace_.expires_after(delivery_.delay);
   pace_.async_wait([self = shared_from_this()](asio::error_code error) {
-    if (!error && self->open_) self->deliver_rest();
+    if (!error && self->open_) self->begin_delivery();
+  });
+}
+
+void Connection::begin_delivery() {
+  set_deadline(kLingerLimit);
+  claim_socket([self = shared_from_this()] {
+    if (self->open_) self->deliver_rest();
   });
 }
 
@@ -175,6 +183,8 @@ void Connection::delivered() {
       break;
   }
   const bool hold = delivery_.end == DeliveryEnd::kHold;
+  const bool torn = hold && !delivery_.bytes.empty();
+  if (!torn) release_socket();
   const Next next = hold ? Next::kReadOn : answered();
   if (next == Next::kCloseConnection) return linger();
   if (next == Next::kStream) return begin_stream();

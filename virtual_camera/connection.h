@@ -7,6 +7,7 @@
 #include <asio.hpp>
 #include <chrono>
 #include <cstddef>
+#include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -40,6 +41,11 @@ class Connection : public std::enable_shared_from_this<Connection> {
   virtual Next answered() = 0;        // the answer has left whole
   virtual bool may_idle() const = 0;  // whether the peer may stay silent between requests
   virtual void ended() {}             // the connection is gone; called once
+  // Bytes in front of the next request that are none of it.
+  virtual std::size_t passed_over(std::string_view) const { return 0; }
+  // Other things leave by the socket too: calls `ready` once an answer may, and they wait until it is released.
+  virtual void claim_socket(std::function<void()> ready) { ready(); }
+  virtual void release_socket() {}
   // After Next::kStream: calls send_at, which calls it again once the bytes have left, or finish_stream.
   virtual void stream() {}
 
@@ -48,7 +54,7 @@ class Connection : public std::enable_shared_from_this<Connection> {
 
   CameraState& state() const { return *state_; }
   const std::shared_ptr<CameraState>& shared_state() const { return state_; }
-  const asio::ip::tcp::socket& socket() const { return socket_; }
+  asio::ip::tcp::socket& socket() { return socket_; }
 
  private:
   void read();
@@ -58,6 +64,7 @@ class Connection : public std::enable_shared_from_this<Connection> {
   Answer decide(const std::optional<RequestFault>& fault, const std::string& request);
   void journal(std::string request, const Answer& answer);
   void deliver();
+  void begin_delivery();
   void deliver_rest();
   void delivered();
   void begin_stream();

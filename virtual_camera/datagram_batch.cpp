@@ -10,15 +10,6 @@
 namespace vexa::camera {
 namespace {
 
-std::uint64_t fnv1a(std::uint64_t hash, std::span<const std::uint8_t> bytes) {
-  for (const std::uint8_t byte : bytes) hash = (hash ^ byte) * 1099511628211ULL;
-  return hash;
-}
-
-std::uint64_t hash_of(const Outgoing& packet) {
-  return fnv1a(fnv1a(14695981039346656037ULL, packet.header), packet.payload_to_send());
-}
-
 // The system's records take pointers to non-constant bytes, which a send leaves alone.
 iovec piece_of(std::span<const std::uint8_t> bytes) { return {const_cast<std::uint8_t*>(bytes.data()), bytes.size()}; }
 
@@ -53,14 +44,12 @@ void DatagramBatch::flush(int socket) {
   count_ = 0;
 }
 
-const std::vector<SentPacket>& DatagramBatch::send(int socket, const std::vector<Outgoing>& packets, Hashing hashing) {
+const std::vector<SentPacket>& DatagramBatch::send(int socket, const std::vector<Outgoing>& packets,
+                                                   PacketPort::Hashing hashing) {
   records_.clear();
   const auto now = std::chrono::steady_clock::now();
   for (const Outgoing& packet : packets) {
-    SentPacket& record = records_.emplace_back(packet.record);
-    record.time = now;
-    if (hashing == Hashing::kOn) record.hash = hash_of(packet);
-    if (record.lost) continue;
+    if (records_.emplace_back(record_of(packet, now, hashing)).lost) continue;
     add(packet);
     if (count_ == kMost) flush(socket);
   }

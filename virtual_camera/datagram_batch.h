@@ -8,6 +8,7 @@
 #include <cstddef>
 #include <vector>
 
+#include "virtual_camera/packet_port.h"
 #include "virtual_camera/rtp_stream.h"
 #include "virtual_camera/sent_log.h"
 
@@ -15,11 +16,9 @@ namespace vexa::camera {
 
 class DatagramBatch {
  public:
-  enum class Hashing { kOff, kOn };
-
   // Sends the packets on a connected socket, in order, without those marked lost. Returns a record for each; a packet
   // the system refuses is marked lost. The result stays valid until the next call.
-  const std::vector<SentPacket>& send(int socket, const std::vector<Outgoing>& packets, Hashing hashing);
+  const std::vector<SentPacket>& send(int socket, const std::vector<Outgoing>& packets, PacketPort::Hashing hashing);
 
  private:
   static constexpr std::size_t kMost = 64;

@@ -69,6 +69,12 @@ struct CameraOptions {
   // bursts, as they reach a host from a camera behind a 100 Mbit/s port.
   unsigned link_megabits = 0;
 
+  // Packets on the RTSP connection begin so long after PLAY's answer: hosts take an answer off the connection together
+  // with what has come behind it.
+  std::chrono::milliseconds interleaved_pause{250};
+  // A host that takes none of them for so long has its connection reset.
+  std::chrono::milliseconds interleaved_patience{10000};
+
   std::string range_clock;  // for instance "20240131T235959.250Z": adds the range line to the session description
   std::uint32_t first_session = 12345678;    // numbers of later sessions count up from it
   std::chrono::seconds session_timeout{60};  // as advertised

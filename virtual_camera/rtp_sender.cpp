@@ -13,29 +13,16 @@ namespace {
 constexpr std::chrono::seconds kFarBehind{1};
 // Of each datagram on an Ethernet: RTP, UDP and IPv4 headers; preamble, frame header, check sequence and gap.
 constexpr std::size_t kWireOverhead = 12 + 8 + 20 + 38;
-constexpr int kSendBuffer = 1 << 20;
 // Makes the seeds of a camera's sessions differ; the first session has the camera's own.
 constexpr std::uint64_t kSeedStep = 0x9E3779B97F4A7C15ULL;
 
 }  // namespace
 
-RtpSender::RtpSender(std::shared_ptr<CameraState> state, std::uint32_t session, int video)
-    : state_(std::move(state)), session_(session), video_(video), socket_(state_->context), timer_(state_->context) {}
+RtpSender::RtpSender(std::shared_ptr<CameraState> state, std::uint32_t session, int video,
+                     std::unique_ptr<PacketPort> port)
+    : state_(std::move(state)), session_(session), video_(video), port_(std::move(port)), timer_(state_->context) {}
 
-asio::error_code RtpSender::open(const asio::ip::udp::endpoint& client) {
-  asio::error_code error;
-  const asio::ip::address address = asio::ip::make_address(state_->options.address, error);
-  if (!error) socket_.open(client.protocol(), error);
-  if (!error) socket_.bind({address, 0}, error);
-  if (!error) socket_.connect(client, error);
-  if (error) return error;
-  asio::error_code ignored;
-  socket_.set_option(asio::socket_base::send_buffer_size(kSendBuffer), ignored);
-  port_ = socket_.local_endpoint(error).port();
-  return error;
-}
-
-void RtpSender::play() {
+void RtpSender::play(std::chrono::milliseconds pause) {
   if (stream_ || stopped_) return;
   const auto plan = plan_stream(state_->options, state_->settings, video_);
   if (!plan || !plan->clip) return;
@@ -51,7 +38,7 @@ void RtpSender::play() {
   }
   stream_.emplace(options, faults, session_, seed);
   lane_.emplace(std::move(faults), seed);
-  started_ = Clock::now();
+  started_ = Clock::now() + pause;
   load_picture();
   wait_for_next();
 }
@@ -59,8 +46,7 @@ void RtpSender::play() {
 void RtpSender::stop() {
   stopped_ = true;
   timer_.cancel();
-  asio::error_code ignored;
-  socket_.close(ignored);
+  port_->close();
 }
 
 RtpSender::Time RtpSender::picture_time(std::uint64_t picture) const {
@@ -134,8 +120,8 @@ void RtpSender::run_event() {
     offer_burst(now);
     if (state_->options.link_megabits == 0) not_before_ = Clock::now() + state_->options.burst_gap;
   }
-  const auto hashing = state_->options.hash_packets ? DatagramBatch::Hashing::kOn : DatagramBatch::Hashing::kOff;
-  state_->sent.add(batch_.send(socket_.native_handle(), leaving_, hashing));
+  const auto hashing = state_->options.hash_packets ? PacketPort::Hashing::kOn : PacketPort::Hashing::kOff;
+  state_->sent.add(port_->send(leaving_, hashing));
   wait_for_next();
 }
 

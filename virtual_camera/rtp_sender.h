@@ -1,4 +1,4 @@
-// Sends one session's RTP stream over UDP at the pace of the pictures, by an absolute schedule.
+// Sends one session's RTP stream through its port at the pace of the pictures, by an absolute schedule.
 #ifndef VIRTUAL_CAMERA_RTP_SENDER_H_
 #define VIRTUAL_CAMERA_RTP_SENDER_H_
 
@@ -11,23 +11,20 @@
 #include <vector>
 
 #include "virtual_camera/camera_state.h"
-#include "virtual_camera/datagram_batch.h"
 #include "virtual_camera/fault_lane.h"
+#include "virtual_camera/packet_port.h"
 #include "virtual_camera/rtp_stream.h"
 
 namespace vexa::camera {
 
 class RtpSender : public std::enable_shared_from_this<RtpSender> {
  public:
-  // `video`: the number of the camera's video stream.
-  RtpSender(std::shared_ptr<CameraState> state, std::uint32_t session, int video);
+  // `video`: the number of the camera's video stream. The port stands open.
+  RtpSender(std::shared_ptr<CameraState> state, std::uint32_t session, int video, std::unique_ptr<PacketPort> port);
 
-  // Opens the socket towards the client.
-  [[nodiscard]] asio::error_code open(const asio::ip::udp::endpoint& client);
-  [[nodiscard]] std::uint16_t port() const { return port_; }
-  // Starts with the first picture, now, as the video stream is set. Nothing happens without a clip or when already
-  // playing.
-  void play();
+  // Starts with the first picture, after the pause, as the video stream is set. Nothing happens without a clip or when
+  // already playing.
+  void play(std::chrono::milliseconds pause);
   void stop();
 
  private:
@@ -47,10 +44,8 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
   const std::uint32_t session_;
   const int video_;
   double frames_per_second_ = 0;  // of the stream as it was planned at its start
-  asio::ip::udp::socket socket_;
+  const std::unique_ptr<PacketPort> port_;
   asio::steady_timer timer_;
-  DatagramBatch batch_;
-  std::uint16_t port_ = 0;
   std::optional<RtpStream> stream_;
   std::optional<FaultLane> lane_;
   Clock::time_point started_;

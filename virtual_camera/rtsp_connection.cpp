@@ -10,6 +10,7 @@
 #include "virtual_camera/rtsp_message.h"
 #include "virtual_camera/session_description.h"
 #include "virtual_camera/stream_plan.h"
+#include "virtual_camera/udp_port.h"
 
 namespace vexa::camera {
 namespace {
@@ -28,7 +29,18 @@ bool needs_credentials(std::string_view method) { return method != "OPTIONS" && 
 
 }  // namespace
 
-std::size_t RtspConnection::request_size(std::string_view received) const { return rtsp_request_size(received); }
+std::size_t RtspConnection::request_size(std::string_view received) const {
+  return received.starts_with('$') ? 0 : rtsp_request_size(received);
+}
+
+// A host's reports on what it receives.
+std::size_t RtspConnection::passed_over(std::string_view received) const { return leading_packets_size(received); }
+
+void RtspConnection::claim_socket(std::function<void()> ready) { lane_ ? lane_->claim(std::move(ready)) : ready(); }
+
+void RtspConnection::release_socket() {
+  if (lane_) lane_->release();
+}
 
 Answer RtspConnection::answer(const std::string& request) {
   to_play_ = nullptr;
@@ -65,25 +77,45 @@ Answer RtspConnection::describe(const RequestHead& request, std::uint32_t sequen
   return rtsp_answer({"200 OK", sequence, {}, description});
 }
 
-Answer RtspConnection::setup(const RequestHead& request, std::uint32_t sequence) {
-  if (classify_url(request.path) != VideoUrl::kTrack) return status_only("404 Not Found", sequence);
-  const std::string_view transport = request.field("Transport");
-  const std::uint16_t port = client_port_of(transport);
-  if (port == 0) return status_only("461 Unsupported Transport", sequence);
-  if (state().sessions.size() >= kMaxSessions) return status_only("453 Not Enough Bandwidth", sequence);
+RtspConnection::MediaWay RtspConnection::open_udp(const AskedTransport& asked) {
   asio::error_code error;
   const asio::ip::tcp::endpoint peer = socket().remote_endpoint(error);
-  const auto session = std::make_shared<RtspSession>(shared_state(), state().next_session, video_number(request.path));
-  if (!error) error = session->open({peer.address(), port});
-  if (error) return status_only("500 Internal Server Error", sequence);
-  ++state().next_session;
+  auto port = std::make_unique<UdpPort>(state().context);
+  if (!error) error = port->open(state().options.address, {peer.address(), asked.first});
+  if (error) return {};
+  std::string transport = fmt::format("RTP/AVP;unicast;client_port={}-{};server_port={}-{}", asked.first, asked.second,
+                                      port->number(), port->number() + 1);
+  return {std::move(port), std::move(transport)};
+}
+
+// Channels that an earlier session of the connection had are not given again; the host is told which it gets.
+RtspConnection::MediaWay RtspConnection::open_interleaved(const AskedTransport& asked) {
+  constexpr std::uint16_t kChannels = 256;
+  const bool free = asked.first >= next_channel_;
+  const std::uint16_t first = free ? asked.first : next_channel_;
+  const std::uint16_t second = free ? asked.second : static_cast<std::uint16_t>(first + 1);
+  if (std::max(first, second) >= kChannels) return {};
+  next_channel_ = static_cast<std::uint16_t>(std::max(first, second) + 1);
+  const CameraOptions& options = state().options;
+  if (!lane_) lane_ = std::make_shared<InterleavedLane>(weak_from_this(), socket(), options.interleaved_patience);
+  return {std::make_unique<InterleavedPort>(lane_, static_cast<std::uint8_t>(first)),
+          fmt::format("RTP/AVP/TCP;unicast;interleaved={}-{}", first, second), options.interleaved_pause};
+}
+
+Answer RtspConnection::setup(const RequestHead& request, std::uint32_t sequence) {
+  if (classify_url(request.path) != VideoUrl::kTrack) return status_only("404 Not Found", sequence);
+  const AskedTransport asked = asked_transport(request.field("Transport"));
+  if (asked.way == AskedTransport::Way::kNone) return status_only("461 Unsupported Transport", sequence);
+  if (state().sessions.size() >= kMaxSessions) return status_only("453 Not Enough Bandwidth", sequence);
+  MediaWay way = asked.way == AskedTransport::Way::kUdp ? open_udp(asked) : open_interleaved(asked);
+  if (!way.port) return status_only("500 Internal Server Error", sequence);
+  const auto session = std::make_shared<RtspSession>(shared_state(), state().next_session++, video_number(request.path),
+                                                     std::move(way.port), way.pause);
   state().sessions[session->number()] = session;
   own_sessions_.push_back(session);
   session->touch();
-  const std::string fields =
-      fmt::format("Session: {};timeout={}\r\nTransport: RTP/AVP;unicast;client_port={}-{};server_port={}-{}\r\n",
-                  session->number(), state().options.session_timeout.count(), port, second_client_port_of(transport),
-                  session->server_port(), session->server_port() + 1);
+  const std::string fields = fmt::format("Session: {};timeout={}\r\nTransport: {}\r\n", session->number(),
+                                         state().options.session_timeout.count(), way.transport);
   return rtsp_answer({"200 OK", sequence, fields, {}});
 }
 
@@ -128,6 +160,7 @@ bool RtspConnection::may_idle() const {
 
 void RtspConnection::ended() {
   to_play_ = nullptr;
+  if (lane_) lane_->close();
   for (const std::weak_ptr<RtspSession>& own : std::exchange(own_sessions_, {})) {
     if (const std::shared_ptr<RtspSession> session = own.lock()) session->end();
   }

@@ -2,14 +2,19 @@
 #ifndef VIRTUAL_CAMERA_RTSP_CONNECTION_H_
 #define VIRTUAL_CAMERA_RTSP_CONNECTION_H_
 
+#include <chrono>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
 
 #include "virtual_camera/connection.h"
+#include "virtual_camera/interleaved_lane.h"
 #include "virtual_camera/message.h"
+#include "virtual_camera/packet_port.h"
+#include "virtual_camera/rtsp_message.h"
 #include "virtual_camera/rtsp_session.h"
 
 namespace vexa::camera {
@@ -26,6 +31,18 @@ class RtspConnection : public Connection {
   Next answered() override;
   bool may_idle() const override;
   void ended() override;
+  std::size_t passed_over(std::string_view received) const override;
+  void claim_socket(std::function<void()> ready) override;
+  void release_socket() override;
+
+  // Where a session's packets are to go, and how SETUP's answer tells it; no port: it could not be opened.
+  struct MediaWay {
+    std::unique_ptr<PacketPort> port;
+    std::string transport;
+    std::chrono::milliseconds pause{0};
+  };
+  MediaWay open_udp(const AskedTransport& asked);
+  MediaWay open_interleaved(const AskedTransport& asked);
 
   Answer dispatch(const RequestHead& request, std::uint32_t sequence);
   Answer describe(const RequestHead& request, std::uint32_t sequence);
@@ -36,7 +53,9 @@ class RtspConnection : public Connection {
   std::shared_ptr<RtspSession> find_session(const RequestHead& request);
 
   std::vector<std::weak_ptr<RtspSession>> own_sessions_;
-  std::shared_ptr<RtspSession> to_play_;  // starts when the answer to PLAY has left
+  std::shared_ptr<RtspSession> to_play_;   // starts when the answer to PLAY has left
+  std::shared_ptr<InterleavedLane> lane_;  // from the first interleaved session on
+  std::uint16_t next_channel_ = 0;         // no session has it, nor a later one
 };
 
 }  // namespace vexa::camera

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <charconv>
 #include <limits>
+#include <utility>
 
 namespace vexa::camera {
 namespace {
@@ -24,23 +25,35 @@ bool all_digits(std::string_view text) {
   return !text.empty() && text.find_first_not_of("0123456789") == std::string_view::npos;
 }
 
-// The alternative of a Transport field that the camera can serve.
-std::string_view usable_alternative(std::string_view transport) {
-  while (!transport.empty()) {
-    const std::size_t end = std::min(transport.find(','), transport.size());
-    const std::string_view alternative = transport.substr(0, end);
-    const bool udp = alternative.starts_with("RTP/AVP;") || alternative.starts_with("RTP/AVP/UDP;");
-    if (udp && alternative.find("multicast") == std::string_view::npos) return alternative;
-    transport.remove_prefix(std::min(end + 1, transport.size()));
-  }
-  return {};
+// The numbers behind a name of a Transport field, such as "client_port=5000-5001".
+std::optional<std::pair<std::uint16_t, std::uint16_t>> number_pair(std::string_view alternative,
+                                                                   std::string_view name) {
+  const std::size_t found = alternative.find(name);
+  if (found == std::string_view::npos) return std::nullopt;
+  const std::string_view text = alternative.substr(found + name.size());
+  const auto first = leading_number<std::uint16_t>(text);
+  if (!first) return std::nullopt;
+  const auto next = static_cast<std::uint16_t>(*first + 1);
+  const std::size_t dash = std::min(text.find('-'), text.find(';'));
+  if (dash == std::string_view::npos || text[dash] != '-') return std::pair(*first, next);
+  return std::pair(*first, leading_number<std::uint16_t>(text.substr(dash + 1)).value_or(next));
 }
 
-std::string_view port_text(std::string_view transport) {
-  constexpr std::string_view kName = "client_port=";
-  const std::string_view alternative = usable_alternative(transport);
-  const std::size_t found = alternative.find(kName);
-  return found == std::string_view::npos ? std::string_view() : alternative.substr(found + kName.size());
+// One alternative of a Transport field.
+AskedTransport parse_alternative(std::string_view text) {
+  using Way = AskedTransport::Way;
+  constexpr std::uint16_t kMostChannel = 255;
+  if (text.find("multicast") != std::string_view::npos) return {};
+  if (text.starts_with("RTP/AVP;") || text.starts_with("RTP/AVP/UDP;")) {
+    const auto ports = number_pair(text, "client_port=");
+    return ports && ports->first != 0 ? AskedTransport{Way::kUdp, ports->first, ports->second} : AskedTransport{};
+  }
+  if (text != "RTP/AVP/TCP" && !text.starts_with("RTP/AVP/TCP;")) return {};
+  constexpr std::string_view kChannels = "interleaved=";
+  if (text.find(kChannels) == std::string_view::npos) return {Way::kInterleaved, 0, 1};
+  const auto channels = number_pair(text, kChannels);
+  if (!channels || channels->first > kMostChannel || channels->second > kMostChannel) return {};
+  return {Way::kInterleaved, channels->first, channels->second};
 }
 
 std::size_t body_size(const RequestHead& head) {
@@ -77,16 +90,27 @@ std::uint32_t session_of(const RequestHead& request) {
   return all_digits(number) ? leading_number<std::uint32_t>(number).value_or(0) : 0;
 }
 
-std::uint16_t client_port_of(std::string_view transport) {
-  return leading_number<std::uint16_t>(port_text(transport)).value_or(0);
+AskedTransport asked_transport(std::string_view transport) {
+  while (!transport.empty()) {
+    const std::size_t end = std::min(transport.find(','), transport.size());
+    const AskedTransport asked = parse_alternative(transport.substr(0, end));
+    if (asked.way != AskedTransport::Way::kNone) return asked;
+    transport.remove_prefix(std::min(end + 1, transport.size()));
+  }
+  return {};
 }
 
-std::uint16_t second_client_port_of(std::string_view transport) {
-  const std::string_view text = port_text(transport);
-  const std::uint16_t next = static_cast<std::uint16_t>(client_port_of(transport) + 1);
-  const std::size_t dash = std::min(text.find('-'), text.find(';'));
-  if (dash == std::string_view::npos || text[dash] != '-') return next;
-  return leading_number<std::uint16_t>(text.substr(dash + 1)).value_or(next);
+std::size_t leading_packets_size(std::string_view received) {
+  constexpr std::size_t kPrefix = 4;
+  std::size_t size = 0;
+  while (true) {
+    const std::string_view packet = received.substr(size);
+    if (packet.size() < kPrefix || packet[0] != '$') return size;
+    const auto length =
+        static_cast<std::size_t>(static_cast<unsigned char>(packet[2]) << 8U | static_cast<unsigned char>(packet[3]));
+    if (packet.size() - kPrefix < length) return size;
+    size += kPrefix + length;
+  }
 }
 
 VideoUrl classify_url(std::string_view path) {

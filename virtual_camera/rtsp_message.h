@@ -23,10 +23,21 @@ constexpr std::size_t kMaxRtspAnswer = 500;
 [[nodiscard]] std::optional<std::uint32_t> sequence_of(const RequestHead& request);
 // The session a request names; 0 when it names none or no number.
 [[nodiscard]] std::uint32_t session_of(const RequestHead& request);
-// The first client port of a Transport that asks for RTP over UDP, unicast; 0 when there is none.
-[[nodiscard]] std::uint16_t client_port_of(std::string_view transport);
-// The second port of the pair, the one after the first unless named.
-[[nodiscard]] std::uint16_t second_client_port_of(std::string_view transport);
+// How a host wants its packets: in datagrams, or between the answers on the RTSP connection (RFC 2326, 10.12).
+struct AskedTransport {
+  enum class Way { kNone, kUdp, kInterleaved };
+
+  Way way = Way::kNone;
+  // The client's ports, or the channels; the second is the one after the first unless named.
+  std::uint16_t first = 0;
+  std::uint16_t second = 0;
+};
+// The first alternative of a Transport field that the camera can serve. Channels that are not named are 0 and 1.
+[[nodiscard]] AskedTransport asked_transport(std::string_view transport);
+
+// Bytes of the packets a host put before its next request, such as reports of what it received; 0 when there is none,
+// or the first is not yet whole.
+[[nodiscard]] std::size_t leading_packets_size(std::string_view received);
 
 enum class VideoUrl { kNone, kStream, kTrack };
 // What "/media/video1" and "/media/video1/video" name.

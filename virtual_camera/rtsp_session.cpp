@@ -4,10 +4,12 @@
 
 namespace vexa::camera {
 
-RtspSession::RtspSession(std::shared_ptr<CameraState> state, std::uint32_t number, int video)
+RtspSession::RtspSession(std::shared_ptr<CameraState> state, std::uint32_t number, int video,
+                         std::unique_ptr<PacketPort> port, std::chrono::milliseconds pause)
     : state_(std::move(state)),
       number_(number),
-      sender_(std::make_shared<RtpSender>(state_, number, video)),
+      sender_(std::make_shared<RtpSender>(state_, number, video, std::move(port))),
+      pause_(pause),
       expiry_(state_->context) {}
 
 void RtspSession::touch() {

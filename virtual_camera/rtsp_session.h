@@ -3,10 +3,12 @@
 #define VIRTUAL_CAMERA_RTSP_SESSION_H_
 
 #include <asio.hpp>
+#include <chrono>
 #include <cstdint>
 #include <memory>
 
 #include "virtual_camera/camera_state.h"
+#include "virtual_camera/packet_port.h"
 #include "virtual_camera/rtp_sender.h"
 
 namespace vexa::camera {
@@ -14,12 +16,12 @@ namespace vexa::camera {
 class RtspSession : public std::enable_shared_from_this<RtspSession> {
  public:
   // `video`: the number of the camera's video stream that it plays.
-  RtspSession(std::shared_ptr<CameraState> state, std::uint32_t number, int video);
+  // `port` stands open; the first picture leaves through it `pause` after PLAY.
+  RtspSession(std::shared_ptr<CameraState> state, std::uint32_t number, int video, std::unique_ptr<PacketPort> port,
+              std::chrono::milliseconds pause);
 
   [[nodiscard]] std::uint32_t number() const { return number_; }
-  [[nodiscard]] asio::error_code open(const asio::ip::udp::endpoint& client) { return sender_->open(client); }
-  [[nodiscard]] std::uint16_t server_port() const { return sender_->port(); }
-  void play() { sender_->play(); }
+  void play() { sender_->play(pause_); }
   // A request named the session: its time starts over.
   void touch();
   // Stops sending for good. The session leaves the camera's table, when it still stands there.
@@ -28,7 +30,8 @@ class RtspSession : public std::enable_shared_from_this<RtspSession> {
  private:
   std::shared_ptr<CameraState> state_;
   const std::uint32_t number_;
-  std::shared_ptr<RtpSender> sender_;
+  const std::shared_ptr<RtpSender> sender_;
+  const std::chrono::milliseconds pause_;
   asio::steady_timer expiry_;
 };
 

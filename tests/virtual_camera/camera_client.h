@@ -68,6 +68,12 @@ class Client {
     return all;
   }
 
+  // Whether the camera ends the connection although nobody reads.
+  [[nodiscard]] bool reset_unread(int patience = kPatience) {
+    pollfd waiting{socket_.native_handle(), 0, 0};
+    return ::poll(&waiting, 1, patience) == 1 && (waiting.revents & (POLLERR | POLLHUP)) != 0;
+  }
+
   std::string ask(const std::string& request) {
     send(request);
     return read_once();
@@ -118,6 +124,11 @@ struct RtspRequests {
   [[nodiscard]] std::string setup(int sequence, std::uint16_t port) const {
     return fmt::format("SETUP {}/video RTSP/1.0\r\nCSeq: {}\r\nTransport: RTP/AVP;unicast;client_port={}-{}\r\n{}\r\n",
                        url, sequence, port, port + 1, kBasicAdmin);
+  }
+  [[nodiscard]] std::string setup_interleaved(int sequence) const {
+    return fmt::format(
+        "SETUP {}/video RTSP/1.0\r\nCSeq: {}\r\nTransport: RTP/AVP/TCP;unicast;interleaved=0-1;\r\n{}\r\n", url,
+        sequence, kBasicAdmin);
   }
   [[nodiscard]] std::string play(int sequence, std::uint32_t session) const {
     return fmt::format("PLAY {} RTSP/1.0\r\nCSeq: {}\r\nSession: {}\r\nScale: 1\r\nRange: npt=0.000-\r\n{}\r\n", url,

@@ -77,7 +77,7 @@ TEST_F(RtspCamera, WhatItCannotServeIsRefused) {
       {"SETUP rtsp://h/media/video1/video RTSP/1.0\r\nCSeq: 2\r\n" + authorised,
        "RTSP/1.0 461 Unsupported Transport\r\nCSeq: 2\r\n\r\n"},
       {"SETUP rtsp://h/media/video1/video RTSP/1.0\r\nCSeq: 2\r\n"
-       "Transport: RTP/AVP/TCP;unicast;interleaved=0-1;\r\n" +
+       "Transport: RTP/AVP/TCP;unicast;interleaved=256-257\r\n" +
            authorised,
        "RTSP/1.0 461 Unsupported Transport\r\nCSeq: 2\r\n\r\n"},
       {kAsk.play(3, 1), "RTSP/1.0 454 Session Not Found\r\nCSeq: 3\r\n\r\n"},

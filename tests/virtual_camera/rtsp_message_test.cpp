@@ -48,27 +48,60 @@ TEST(RtspMessage, SequenceAndSessionAreDecimalNumbers) {
   }
 }
 
-TEST(RtspMessage, TransportMustOfferUdpUnicastWithAPort) {
+TEST(RtspMessage, TheFirstTransportThatCanBeServedCounts) {
+  using Way = AskedTransport::Way;
   const struct {
     std::string transport;
+    Way way;
     int first, second;
-  } cases[] = {{"RTP/AVP;unicast;client_port=5000-5001", 5000, 5001},
-               {"RTP/AVP/UDP;unicast;client_port=5000-5003", 5000, 5003},
-               {"RTP/AVP;client_port=5000", 5000, 5001},
-               {"RTP/AVP;client_port=5000;mode=play-1", 5000, 5001},
-               {"RTP/AVP/TCP;unicast;interleaved=0-1,RTP/AVP;unicast;client_port=7000-7001", 7000, 7001},
-               {"RTP/AVP/TCP;unicast;interleaved=0-1;", 0, 1},
-               {"RTP/AVP;multicast;client_port=5000-5001", 0, 1},
-               {"RTP/AVP;unicast;client_port=0-1", 0, 1},
-               {"RTP/AVP;unicast;client_port=70000-70001", 0, 1},
-               {"RTP/AVP;unicast;client_port=x", 0, 1},
-               {"RTP/AVP;unicast", 0, 1},
-               {"client_port=5000", 0, 1},
-               {"", 0, 1}};
+  } cases[] = {{"RTP/AVP;unicast;client_port=5000-5001", Way::kUdp, 5000, 5001},
+               {"RTP/AVP/UDP;unicast;client_port=5000-5003", Way::kUdp, 5000, 5003},
+               {"RTP/AVP;client_port=5000", Way::kUdp, 5000, 5001},
+               {"RTP/AVP;client_port=5000;mode=play-1", Way::kUdp, 5000, 5001},
+               {"RTP/AVP;client_port=5000-x", Way::kUdp, 5000, 5001},
+               {"RTP/AVP/TCP;unicast;interleaved=0-1;", Way::kInterleaved, 0, 1},
+               {"RTP/AVP/TCP;unicast;interleaved=4-7", Way::kInterleaved, 4, 7},
+               {"RTP/AVP/TCP;interleaved=254", Way::kInterleaved, 254, 255},
+               {"RTP/AVP/TCP;unicast", Way::kInterleaved, 0, 1},
+               {"RTP/AVP/TCP", Way::kInterleaved, 0, 1},
+               {"RTP/AVP/TCP;unicast;interleaved=0-1,RTP/AVP;unicast;client_port=7000-7001", Way::kInterleaved, 0, 1},
+               {"RTP/AVP;multicast,RTP/AVP;unicast;client_port=7000-7001", Way::kUdp, 7000, 7001},
+               {"RTP/AVP;unicast;client_port=0-1,RTP/AVP/TCP;interleaved=2-3", Way::kInterleaved, 2, 3},
+               {"RTP/AVP/TCP;interleaved=255", Way::kNone, 0, 0},
+               {"RTP/AVP/TCP;interleaved=0-256", Way::kNone, 0, 0},
+               {"RTP/AVP/TCP;interleaved=70000", Way::kNone, 0, 0},
+               {"RTP/AVP/TCP;interleaved=x", Way::kNone, 0, 0},
+               {"RTP/AVP/TCPX;interleaved=0-1", Way::kNone, 0, 0},
+               {"RTP/AVP;multicast;client_port=5000-5001", Way::kNone, 0, 0},
+               {"RTP/AVP;unicast;client_port=70000-70001", Way::kNone, 0, 0},
+               {"RTP/AVP;unicast;client_port=x", Way::kNone, 0, 0},
+               {"RTP/AVP;unicast", Way::kNone, 0, 0},
+               {"client_port=5000", Way::kNone, 0, 0},
+               {"", Way::kNone, 0, 0}};
   for (const auto& c : cases) {
-    EXPECT_EQ(client_port_of(c.transport), c.first) << c.transport;
-    EXPECT_EQ(second_client_port_of(c.transport), c.second) << c.transport;
+    const AskedTransport asked = asked_transport(c.transport);
+    EXPECT_EQ(asked.way, c.way) << c.transport;
+    EXPECT_EQ(asked.first, c.first) << c.transport;
+    EXPECT_EQ(asked.second, c.second) << c.transport;
   }
+}
+
+TEST(RtspMessage, PacketsBeforeARequestAreKnownOnceTheyAreWhole) {
+  const std::string packet("$\1\0\3abc", 7);
+  const std::string empty("$\1\0\0", 4);
+  const struct {
+    std::string received;
+    std::size_t size;
+  } cases[] = {{"", 0},
+               {"TEARDOWN", 0},
+               {packet.substr(0, 3), 0},
+               {packet.substr(0, 6), 0},
+               {packet, 7},
+               {packet + "TEARDOWN", 7},
+               {empty + packet + "$", 11},
+               {std::string("$\0\1\0", 4) + std::string(255, 'x'), 0},
+               {std::string("$\0\1\0", 4) + std::string(256, 'x'), 260}};
+  for (const auto& c : cases) EXPECT_EQ(leading_packets_size(c.received), c.size) << c.received;
 }
 
 TEST(RtspMessage, UrlsNameAStreamOrItsTrack) {
