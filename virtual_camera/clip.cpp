@@ -105,6 +105,15 @@ Clip Clip::from_annex_b(std::span<const std::uint8_t> bytes) {
   return clip;
 }
 
+std::vector<std::string> Clip::delivered() const {
+  std::vector<std::string> pictures;
+  for (const AccessUnit& picture : access_units_) {
+    const std::vector<std::uint8_t> bytes = picture.as_delivered();
+    pictures.emplace_back(bytes.begin(), bytes.end());
+  }
+  return pictures;
+}
+
 std::optional<Clip> Clip::load(const std::string& path) {
   std::ifstream file(path, std::ios::binary);
   const std::vector<char> text{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};

@@ -7,6 +7,7 @@
 #include <optional>
 #include <span>
 #include <string>
+#include <string_view>
 #include <utility>
 #include <vector>
 
@@ -38,8 +39,13 @@ class Clip {
   [[nodiscard]] static std::optional<Clip> load(const std::string& path);
   // Bytes before the first start code are left out.
   [[nodiscard]] static Clip from_annex_b(std::span<const std::uint8_t> bytes);
+  [[nodiscard]] static Clip from_annex_b(std::string_view bytes) {
+    return from_annex_b(std::span(reinterpret_cast<const std::uint8_t*>(bytes.data()), bytes.size()));
+  }
 
   [[nodiscard]] const std::vector<AccessUnit>& access_units() const { return access_units_; }
+  // Every picture as a receiver rebuilds it.
+  [[nodiscard]] std::vector<std::string> delivered() const;
 
  private:
   std::vector<AccessUnit> access_units_;

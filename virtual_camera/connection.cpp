@@ -201,11 +201,11 @@ void Connection::begin_stream() {
   stream();
 }
 
-void Connection::send_at(std::chrono::steady_clock::time_point time, std::string bytes) {
-  delivery_.bytes = std::move(bytes);
+void Connection::send_at(std::chrono::steady_clock::time_point time, std::function<std::string()> make) {
   pace_.expires_at(time);
-  pace_.async_wait([self = shared_from_this()](asio::error_code stopped) {
+  pace_.async_wait([self = shared_from_this(), make = std::move(make)](asio::error_code stopped) {
     if (stopped || !self->open_) return;
+    self->delivery_.bytes = make();
     asio::async_write(self->socket_, asio::buffer(self->delivery_.bytes), [self](asio::error_code error, std::size_t) {
       if (!self->open_) return;
       error ? self->close() : self->stream();

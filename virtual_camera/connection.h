@@ -49,7 +49,8 @@ class Connection : public std::enable_shared_from_this<Connection> {
   // After Next::kStream: calls send_at, which calls it again once the bytes have left, or finish_stream.
   virtual void stream() {}
 
-  void send_at(std::chrono::steady_clock::time_point time, std::string bytes);
+  // `make` is called at that time, unless the connection has ended by then.
+  void send_at(std::chrono::steady_clock::time_point time, std::function<std::string()> make);
   void finish_stream();  // ends the stream and waits for the peer to go
 
   CameraState& state() const { return *state_; }

@@ -5,10 +5,12 @@
 #include <cmath>
 #include <fstream>
 #include <iterator>
+#include <system_error>
 #include <utility>
 
 #include "virtual_camera/credentials.h"
 #include "virtual_camera/message.h"
+#include "virtual_camera/stream_plan.h"
 
 namespace vexa::camera {
 namespace {
@@ -20,10 +22,14 @@ constexpr std::chrono::seconds kHeldUp{1};
 constexpr std::size_t kSoundPieces = 50;  // a second
 constexpr std::string_view kImageStem = "/image";
 
-bool names_image(std::string_view path) {
-  if (!path.starts_with(kImageStem) || path == kImageStem) return false;
+// The number in "/imageN"; nothing for another path.
+std::optional<int> image_number(std::string_view path) {
+  if (!path.starts_with(kImageStem)) return std::nullopt;
   path.remove_prefix(kImageStem.size());
-  return std::all_of(path.begin(), path.end(), [](char c) { return c >= '0' && c <= '9'; });
+  int number = 0;
+  const auto [end, error] = std::from_chars(path.data(), path.data() + path.size(), number);
+  const bool whole = error == std::errc() && end == path.data() + path.size() && path.front() != '-';
+  return whole ? std::optional(number) : std::nullopt;
 }
 
 std::string contents_of(const std::string& path) {
@@ -106,28 +112,49 @@ void HttpConnection::stream_feed() {
   });
 }
 
-void HttpConnection::send_part(std::string part) { send_at(StreamClock::now(), std::move(part)); }
+void HttpConnection::send_part(std::string part) {
+  send_at(StreamClock::now(), [part = std::move(part)] { return part; });
+}
 
 void HttpConnection::ended() {
   feed_ = Feed::kNone;
   next_part_.cancel();
+  stream_.reset();
 }
 
 // Nothing for a path that names no stream, or one that the camera has nothing for.
 std::optional<HttpStream> HttpConnection::open_stream(const std::string& path) const {
+  if (const std::optional<int> number = image_number(path)) return open_images(*number);
+  return path == "/audio" ? open_sound() : std::nullopt;
+}
+
+HttpStreamOptions HttpConnection::stream_options() const {
   const CameraOptions& options = state().options;
-  HttpStreamOptions stream{options.frames_per_second * options.speed,
-                           options.loop,
-                           options.pictures,
-                           options.stream_piece,
-                           options.user_data,
-                           options.stream_faults};
-  if (names_image(path) && options.images) return HttpStream(options.images, std::move(stream));
-  if (path != "/audio" || options.sound_path.empty()) return std::nullopt;
+  HttpStreamOptions stream;
+  stream.loop = options.loop;
+  stream.units = options.pictures;
+  stream.piece = options.stream_piece;
+  stream.faults = options.stream_faults;
+  stream.speed = options.speed;
+  return stream;
+}
+
+std::optional<HttpStream> HttpConnection::open_images(int number) const {
+  std::unique_ptr<PictureSource> source = plan_images(state(), number);
+  if (!source) return std::nullopt;
+  HttpStreamOptions stream = stream_options();
+  stream.user_data = [camera = shared_state()] { return present_user_data(*camera); };
+  return HttpStream(std::move(source), std::move(stream));
+}
+
+std::optional<HttpStream> HttpConnection::open_sound() const {
+  const CameraOptions& options = state().options;
+  if (options.sound_path.empty()) return std::nullopt;
   const std::string codec = state().settings.get("camera", "AudInCodec").value_or("g711_64");
   const std::size_t unit = sound_rate(codec) / kSoundPieces;
   std::string sound = contents_of(options.sound_path + "." + codec);
   if (unit == 0 || sound.size() < unit) return std::nullopt;
+  HttpStreamOptions stream = stream_options();
   stream.units_per_second = static_cast<double>(kSoundPieces) * options.speed;
   return HttpStream(std::move(sound), unit, std::move(stream));
 }
@@ -141,14 +168,24 @@ Connection::Next HttpConnection::answered() {
 
 void HttpConnection::stream() {
   if (feed_ != Feed::kNone) return stream_feed();
-  std::optional<HttpStream::Piece> piece = stream_->next();
-  if (!piece) {
+  const std::optional<std::chrono::nanoseconds> due = stream_->next_due();
+  if (!due) {
+    if (stream_->waits()) return wait_for_picture();
     if (stream_->closes()) finish_stream();
     return;
   }
-  const StreamClock::duration late = StreamClock::now() - (stream_began_ + piece->due);
+  const StreamClock::duration late = StreamClock::now() - (stream_began_ + *due);
   if (late > kHeldUp) stream_began_ += late;
-  send_at(stream_began_ + piece->due, std::move(piece->bytes));
+  send_at(stream_began_ + *due, [this] { return stream_->take(); });
+}
+
+void HttpConnection::wait_for_picture() {
+  stream_->wait([weak = weak_from_this(), &context = state().context, this] {
+    asio::post(context, [weak, this] {
+      const std::shared_ptr<Connection> self = weak.lock();
+      if (self && stream_) stream();
+    });
+  });
 }
 
 Answer HttpConnection::refuse(const std::string&, std::string_view status) const { return http_answer(status, ""); }

@@ -30,6 +30,10 @@ class HttpConnection : public Connection {
   void ended() override;
 
   std::optional<HttpStream> open_stream(const std::string& path) const;
+  std::optional<HttpStream> open_images(int number) const;
+  std::optional<HttpStream> open_sound() const;
+  HttpStreamOptions stream_options() const;
+  void wait_for_picture();
 
   // The streams of alarm data and motion metadata: a part at each interval and, of alarm data, at each change.
   enum class Feed { kNone, kAlarms, kMetadata };

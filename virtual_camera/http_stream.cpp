@@ -5,6 +5,8 @@
 #include <cmath>
 #include <utility>
 
+#include "virtual_camera/clip_source.h"
+
 namespace vexa::camera {
 namespace {
 
@@ -12,15 +14,21 @@ using Action = HttpStreamFault::Action;
 
 }  // namespace
 
+HttpStream::HttpStream(std::unique_ptr<PictureSource> source, HttpStreamOptions options)
+    : source_(std::move(source)), options_(std::move(options)) {}
+
 HttpStream::HttpStream(std::shared_ptr<const ImageClip> clip, HttpStreamOptions options)
-    : clip_(std::move(clip)), options_(std::move(options)) {}
+    : source_(std::make_unique<ClipSource>(std::move(clip), options.units_per_second,
+                                           options.loop ? ClipSource::AtEnd::kStartOver : ClipSource::AtEnd::kStop)),
+      options_(std::move(options)) {}
 
 HttpStream::HttpStream(std::string sound, std::size_t unit, HttpStreamOptions options)
     : sound_(std::move(sound)), sound_unit_(unit), options_(std::move(options)) {}
 
+bool HttpStream::is_jpeg() const { return source_ && source_->format().codec == ImageKind::kJpeg; }
+
 std::string HttpStream::head() const {
-  const bool parts = clip_ && clip_->kind() == ImageKind::kJpeg;
-  const char* type = parts ? "multipart/x-mixed-replace;boundary=picture" : "application/octet-stream";
+  const char* type = is_jpeg() ? "multipart/x-mixed-replace;boundary=picture" : "application/octet-stream";
   return fmt::format("HTTP/1.0 200 OK\r\nContent-Type: {}\r\n\r\n", type);
 }
 
@@ -31,21 +39,46 @@ const HttpStreamFault* HttpStream::fault(Action action) const {
   return nullptr;
 }
 
-// The unit as the clip has it; nothing behind its end.
-std::optional<std::string> HttpStream::content() const {
-  if (!clip_ && sound_unit_ == 0) return std::nullopt;  // another clip was to follow, and is not there
-  const std::uint64_t place = index_ - clip_began_;
-  const std::size_t count = clip_ ? clip_->pictures().size() : sound_.size() / sound_unit_;
-  if (count == 0 || (place >= count && !options_.loop)) return std::nullopt;
-  const auto turn = static_cast<std::size_t>(place % count);
-  if (!clip_) return sound_.substr(turn * sound_unit_, sound_unit_);
-  return with_user_data(clip_->kind(), clip_->pictures()[turn], options_.user_data);
+std::chrono::nanoseconds HttpStream::paced(std::chrono::nanoseconds time) const {
+  return std::chrono::nanoseconds(std::llround(static_cast<double>(time.count()) / options_.speed));
+}
+
+void HttpStream::change_clip(const std::string& path) {
+  const double rate = source_ ? source_->format().frames_per_second : options_.units_per_second;
+  source_began_ = index_ == 0 ? planned_ : planned_ + paced(steady_time(1, rate));
+  std::shared_ptr<const ImageClip> clip = ImageClip::load(path);
+  source_.reset();
+  if (!clip) return;
+  source_ = std::make_unique<ClipSource>(std::move(clip), rate,
+                                         options_.loop ? ClipSource::AtEnd::kStartOver : ClipSource::AtEnd::kStop);
+}
+
+// Takes up the unit's picture or sound, and plans it.
+bool HttpStream::load_content() {
+  if (source_) {
+    picture_ = source_->next();
+    if (picture_) planned_ = source_began_ + paced(picture_->due);
+    return picture_.has_value();
+  }
+  const std::size_t count = sound_unit_ == 0 ? 0 : sound_.size() / sound_unit_;
+  if (count == 0 || (index_ >= count && !options_.loop)) return false;
+  planned_ = steady_time(index_, options_.units_per_second);
+  return true;
+}
+
+std::string HttpStream::content() const {
+  if (!picture_) {
+    const auto turn = static_cast<std::size_t>(index_ % (sound_.size() / sound_unit_));
+    return sound_.substr(turn * sound_unit_, sound_unit_);
+  }
+  const bool takes_text = options_.user_data && source_->format().takes_user_data;
+  return with_user_data(picture_->codec, *picture_->bytes, takes_text ? options_.user_data() : "");
 }
 
 std::string HttpStream::unit_bytes(const std::string& content) const {
   const HttpStreamFault* before = fault(Action::kBefore);
   const std::string front = before != nullptr ? before->text : "";
-  if (!clip_ || clip_->kind() != ImageKind::kJpeg) return front + content;
+  if (!is_jpeg()) return front + content;
   const HttpStreamFault* lie = fault(Action::kDataLength);
   const std::string length = lie != nullptr ? lie->text : std::to_string(content.size());
   const std::string line = fault(Action::kNoDataLength) != nullptr ? "" : fmt::format("DataLen: {}\r\n", length);
@@ -65,31 +98,47 @@ void HttpStream::strike() {
 }
 
 bool HttpStream::load_unit() {
-  if (begun_) ++index_;
-  begun_ = true;
+  if (loaded_) return true;
   if (ended_ || (options_.units != 0 && index_ >= options_.units)) return false;
-  if (const HttpStreamFault* other = fault(Action::kOtherClip)) {
-    clip_ = ImageClip::load(other->text);
-    clip_began_ = index_;
-  }
-  const std::optional<std::string> next = content();
-  if (!next) return false;
+  if (const HttpStreamFault* other = fault(Action::kOtherClip)) change_clip(other->text);
+  if (!load_content()) return false;
   if (const HttpStreamFault* pause = fault(Action::kPause)) late_ += pause->time;
-  const double seconds = static_cast<double>(index_) / options_.units_per_second;
-  due_ = late_ + std::chrono::nanoseconds(std::llround(seconds * 1e9));
-  unit_ = unit_bytes(*next);
-  strike();
+  made_ = false;
+  loaded_ = true;
   return true;
 }
 
-std::optional<HttpStream::Piece> HttpStream::next() {
-  while (unit_.empty()) {
-    if (!load_unit()) return std::nullopt;
+std::optional<std::chrono::nanoseconds> HttpStream::next_due() {
+  if (!load_unit()) return std::nullopt;
+  return planned_ + late_;
+}
+
+std::string HttpStream::take() {
+  if (!load_unit()) return {};
+  if (!std::exchange(made_, true)) {
+    unit_ = unit_bytes(content());
+    strike();
   }
-  const std::size_t count = options_.piece == 0 ? unit_.size() : options_.piece;
-  Piece piece{due_, unit_.substr(0, count)};
-  unit_.erase(0, count);
+  std::string piece = unit_.substr(0, options_.piece == 0 ? unit_.size() : options_.piece);
+  unit_.erase(0, piece.size());
+  if (unit_.empty()) {
+    loaded_ = false;
+    ++index_;
+  }
   return piece;
+}
+
+std::optional<HttpStream::Piece> HttpStream::next() {
+  while (const auto due = next_due()) {
+    std::string piece = take();
+    if (!piece.empty()) return Piece{*due, std::move(piece)};
+  }
+  return std::nullopt;
+}
+
+bool HttpStream::waits() const {
+  const bool over = ended_ || (options_.units != 0 && index_ >= options_.units);
+  return !over && !loaded_ && source_ && !source_->ended();
 }
 
 std::size_t sound_rate(std::string_view codec) {

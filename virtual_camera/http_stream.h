@@ -14,6 +14,7 @@
 #include <vector>
 
 #include "virtual_camera/image_clip.h"
+#include "virtual_camera/picture_source.h"
 
 namespace vexa::camera {
 
@@ -40,9 +41,10 @@ struct HttpStreamFault {
 struct HttpStreamOptions {
   double units_per_second = 25;  // pictures, or pieces of sound
   bool loop = true;
-  std::uint64_t units = 0;  // end after so many; 0: no such end
-  std::size_t piece = 0;    // bytes that leave at a time; 0: a unit at once
-  std::string user_data;    // of every picture
+  std::uint64_t units = 0;                 // end after so many; 0: no such end
+  std::size_t piece = 0;                   // bytes that leave at a time; 0: a unit at once
+  double speed = 1;                        // of sources
+  std::function<std::string()> user_data;  // of a picture that leaves now; empty: none
   std::vector<HttpStreamFault> faults;
 };
 
@@ -53,35 +55,51 @@ class HttpStream {
     std::string bytes;
   };
 
-  // Video; `clip` is not null.
+  // Video; `source` is not null.
+  HttpStream(std::unique_ptr<PictureSource> source, HttpStreamOptions options);
+  // `clip` is not null.
   HttpStream(std::shared_ptr<const ImageClip> clip, HttpStreamOptions options);
   // Sound: the file's bytes, `unit` at a time.
   HttpStream(std::string sound, std::size_t unit, HttpStreamOptions options);
 
   // The head of the answer.
   [[nodiscard]] std::string head() const;
-  // What leaves next; nothing at the stream's end.
+  // When the next piece leaves; nothing at the stream's end, or while its source has no picture.
+  [[nodiscard]] std::optional<std::chrono::nanoseconds> next_due();
+  // The next piece, made as it leaves; empty where a fault leaves nothing of it, or nothing is due.
+  [[nodiscard]] std::string take();
+  // Both at once, over empty pieces; nothing at the stream's end.
   [[nodiscard]] std::optional<Piece> next();
+  // Whether next_due() gave nothing only because the source has no picture yet; then wait() calls `ready` as the
+  // source's does.
+  [[nodiscard]] bool waits() const;
+  void wait(std::function<void()> ready) { source_->wait(std::move(ready)); }
   // Whether the connection closes at the stream's end; else it stays, silent.
   [[nodiscard]] bool closes() const { return closes_; }
 
  private:
   [[nodiscard]] bool load_unit();
-  [[nodiscard]] std::optional<std::string> content() const;
+  [[nodiscard]] bool load_content();
+  [[nodiscard]] std::string content() const;
   [[nodiscard]] std::string unit_bytes(const std::string& content) const;
   [[nodiscard]] const HttpStreamFault* fault(HttpStreamFault::Action action) const;
+  void change_clip(const std::string& path);
   void strike();
+  [[nodiscard]] bool is_jpeg() const;
+  [[nodiscard]] std::chrono::nanoseconds paced(std::chrono::nanoseconds time) const;
 
-  std::shared_ptr<const ImageClip> clip_;
+  std::unique_ptr<PictureSource> source_;  // null: sound, or another clip was to follow and is not there
+  std::optional<SourcePicture> picture_;   // of the unit under way
   std::string sound_;
   std::size_t sound_unit_ = 0;
   HttpStreamOptions options_;
-  std::uint64_t index_ = 0;       // of the unit under way
-  std::uint64_t clip_began_ = 0;  // the unit that the clip began with
-  std::chrono::nanoseconds due_{0};
-  std::chrono::nanoseconds late_{0};
-  std::string unit_;  // what has not left of it
-  bool begun_ = false;
+  std::uint64_t index_ = 0;  // of the unit under way, or of the next
+  std::chrono::nanoseconds source_began_{0};
+  std::chrono::nanoseconds planned_{0};  // when the unit leaves, without the pauses
+  std::chrono::nanoseconds late_{0};     // all pauses so far
+  std::string unit_;                     // what has not left of it
+  bool loaded_ = false;                  // a unit is under way
+  bool made_ = false;                    // its bytes are
   bool ended_ = false;
   bool closes_ = true;
 };

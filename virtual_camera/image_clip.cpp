@@ -4,6 +4,7 @@
 #include <fstream>
 #include <iterator>
 #include <optional>
+#include <utility>
 
 #include "virtual_camera/clip.h"
 
@@ -33,18 +34,13 @@ std::optional<std::size_t> scan_of(std::string_view bytes, std::size_t begin) {
   return std::nullopt;
 }
 
-std::vector<std::string> cut_h264(std::string_view bytes) {
-  const auto* data = reinterpret_cast<const std::uint8_t*>(bytes.data());
-  std::vector<std::string> pictures;
-  const Clip clip = Clip::from_annex_b({data, bytes.size()});
-  for (const AccessUnit& unit : clip.access_units()) {
-    const std::vector<std::uint8_t> delivered = unit.as_delivered();
-    pictures.emplace_back(delivered.begin(), delivered.end());
-  }
-  return pictures;
-}
+std::vector<std::string> cut_h264(std::string_view bytes) { return Clip::from_annex_b(bytes).delivered(); }
 
 }  // namespace
+
+ImageClip::ImageClip(ImageKind kind, std::vector<std::string> pictures) : kind_(kind), pictures_(std::move(pictures)) {
+  for (const std::string& picture : pictures_) keys_.push_back(is_key_picture(kind_, picture));
+}
 
 std::shared_ptr<const ImageClip> ImageClip::load(const std::string& path) {
   const struct {
@@ -62,6 +58,23 @@ std::shared_ptr<const ImageClip> ImageClip::load(const std::string& path) {
     if (!pictures.empty()) return std::make_shared<const ImageClip>(row.kind, std::move(pictures));
   }
   return nullptr;
+}
+
+bool is_key_picture(ImageKind kind, std::string_view picture) {
+  constexpr std::size_t kUnitCode = 3;  // behind 00 00 01
+  constexpr unsigned kSequence = 0xb0;
+  constexpr unsigned kGroup = 0xb3;
+  switch (kind) {
+    case ImageKind::kH264: {
+      const Clip clip = Clip::from_annex_b(picture);
+      return !clip.access_units().empty() && clip.access_units().front().key;
+    }
+    case ImageKind::kMpeg4:
+      return byte_at(picture, kUnitCode) == kSequence || byte_at(picture, kUnitCode) == kGroup;
+    case ImageKind::kJpeg:
+      break;
+  }
+  return true;
 }
 
 std::vector<std::string> cut_jpeg(std::string_view bytes) {

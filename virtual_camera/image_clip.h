@@ -18,16 +18,22 @@ class ImageClip {
   // Null when the file cannot be read, is of no such kind, or holds no picture.
   [[nodiscard]] static std::shared_ptr<const ImageClip> load(const std::string& path);
 
-  ImageClip(ImageKind kind, std::vector<std::string> pictures) : kind_(kind), pictures_(std::move(pictures)) {}
+  ImageClip(ImageKind kind, std::vector<std::string> pictures);
 
   [[nodiscard]] ImageKind kind() const { return kind_; }
   // H.264 pictures have start codes of four bytes throughout.
   [[nodiscard]] const std::vector<std::string>& pictures() const { return pictures_; }
+  [[nodiscard]] bool is_key(std::size_t picture) const { return keys_[picture]; }
 
  private:
   ImageKind kind_;
   std::vector<std::string> pictures_;
+  std::vector<bool> keys_;
 };
+
+// Whether a picture needs none before it: every JPEG picture, of H.264 one with an IDR slice, of MPEG-4 one that a
+// sequence or a group begins with.
+[[nodiscard]] bool is_key_picture(ImageKind kind, std::string_view picture);
 
 // The picture with a text in its user data, where cameras of the kind have it: a comment of a JPEG picture, an SEI unit
 // in front of an H.264 picture, a user-data unit in front of the coded MPEG-4 picture. Unchanged without a text.

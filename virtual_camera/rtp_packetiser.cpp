@@ -44,6 +44,14 @@ Clip with_sei_in_key_pictures(const Clip& clip, const std::string& text) {
   return Clip(std::move(pictures));
 }
 
+ImageClip with_text_in_key_pictures(const ImageClip& clip, const std::string& text) {
+  std::vector<std::string> pictures = clip.pictures();
+  for (std::size_t i = 0; i < pictures.size(); ++i) {
+    if (clip.is_key(i)) pictures[i] = with_user_data(clip.kind(), pictures[i], text);
+  }
+  return {clip.kind(), std::move(pictures)};
+}
+
 // What some cameras put before the header of a JPEG picture: FF D8, zeros and the text.
 std::vector<std::uint8_t> jpeg_user_data(const std::string& text) {
   constexpr std::size_t kText = 32;
@@ -56,9 +64,12 @@ std::vector<std::uint8_t> jpeg_user_data(const std::string& text) {
   return block;
 }
 
-bool is_mpeg4_key(const std::string& picture) {
-  constexpr std::size_t kCode = 3;
-  return picture.size() > kCode && (picture[kCode] == '\xb0' || picture[kCode] == '\xb3');
+// Receivers tell a picture's kind by its first unit, which a user-data unit must not be: a video object's code, which
+// may stand before any picture, goes in front.
+std::string mpeg4_with_text(const std::string& picture, const std::string& text) {
+  static const std::string kVideoObject("\0\0\1\1", 4);
+  const std::string changed = with_user_data(ImageKind::kMpeg4, picture, text);
+  return is_key_picture(ImageKind::kMpeg4, picture) ? changed : kVideoObject + changed;
 }
 
 }  // namespace
@@ -106,22 +117,37 @@ PacketisedPicture packetise_mpeg4(std::span<const std::uint8_t> picture, std::si
   return packets;
 }
 
-PacketisedClip::PacketisedClip(Clip clip, std::size_t max_payload) : clip_(std::move(clip)) {
+std::optional<PacketisedPicture> packetise(ImageKind codec, const std::string& picture, const std::string& text,
+                                           std::size_t max_payload) {
+  switch (codec) {
+    case ImageKind::kH264: {
+      const Clip clip = Clip::from_annex_b(picture);
+      if (clip.access_units().empty()) return std::nullopt;
+      const AccessUnit& unit = clip.access_units().front();
+      return PacketisedPicture(text.empty() ? unit : with_sei(unit, sei_unit(text)), max_payload);
+    }
+    case ImageKind::kMpeg4:
+      return packetise_mpeg4(as_bytes_of(text.empty() ? picture : mpeg4_with_text(picture, text)), max_payload);
+    case ImageKind::kJpeg:
+      break;
+  }
+  const std::optional<JpegPicture> jpeg = read_jpeg(as_bytes_of(picture));
+  if (!jpeg) return std::nullopt;
+  return packetise_jpeg(*jpeg, jpeg_user_data(text), max_payload);
+}
+
+PacketisedClip::PacketisedClip(Clip clip, std::size_t max_payload)
+    : clip_(std::move(clip)), images_(ImageKind::kH264, clip_.delivered()) {
   pictures_.reserve(clip_.access_units().size());
   for (const AccessUnit& access_unit : clip_.access_units()) pictures_.emplace_back(access_unit, max_payload);
 }
 
-bool PacketisedClip::packetise(std::size_t max_payload, const std::string& user_data) {
-  const std::vector<std::uint8_t> block = jpeg_user_data(user_data);
-  for (std::string& image : images_) {
-    if (codec_ == ImageKind::kMpeg4) {
-      if (is_mpeg4_key(image)) image = with_user_data(codec_, image, user_data);
-      pictures_.push_back(packetise_mpeg4(as_bytes_of(image), max_payload));
-      continue;
-    }
-    const std::optional<JpegPicture> jpeg = read_jpeg(as_bytes_of(image));
-    if (!jpeg) return false;
-    pictures_.push_back(packetise_jpeg(*jpeg, block, max_payload));
+bool PacketisedClip::packetise_images(std::size_t max_payload, const std::string& user_data) {
+  const bool in_headers = images_.kind() == ImageKind::kJpeg;
+  for (const std::string& image : images_.pictures()) {
+    auto packets = packetise(images_.kind(), image, in_headers ? user_data : "", max_payload);
+    if (!packets) return false;
+    pictures_.push_back(std::move(*packets));
   }
   return true;
 }
@@ -130,24 +156,15 @@ std::shared_ptr<const PacketisedClip> PacketisedClip::load(const std::string& pa
                                                            const std::string& user_data) {
   const auto images = ImageClip::load(path);
   if (images && images->kind() != ImageKind::kH264) {
-    PacketisedClip clip(*images);
-    if (!clip.packetise(max_payload, user_data)) return nullptr;
+    const bool in_pictures = images->kind() == ImageKind::kMpeg4;
+    PacketisedClip clip(in_pictures ? with_text_in_key_pictures(*images, user_data) : *images);
+    if (!clip.packetise_images(max_payload, user_data)) return nullptr;
     return std::make_shared<const PacketisedClip>(std::move(clip));
   }
   const std::optional<Clip> clip = Clip::load(path);
   if (!clip) return nullptr;
   return std::make_shared<const PacketisedClip>(user_data.empty() ? *clip : with_sei_in_key_pictures(*clip, user_data),
                                                 max_payload);
-}
-
-std::vector<std::uint8_t> PacketisedClip::picture(std::size_t index) const {
-  if (codec_ == ImageKind::kH264) return clip_.access_units()[index].as_delivered();
-  return {images_[index].begin(), images_[index].end()};
-}
-
-bool PacketisedClip::is_key(std::size_t index) const {
-  if (codec_ == ImageKind::kH264) return clip_.access_units()[index].key;
-  return codec_ == ImageKind::kJpeg || is_mpeg4_key(images_[index]);
 }
 
 }  // namespace vexa::camera

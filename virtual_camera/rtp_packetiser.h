@@ -6,8 +6,11 @@
 #include <cstddef>
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <span>
 #include <string>
+#include <string_view>
+#include <utility>
 #include <vector>
 
 #include "virtual_camera/clip.h"
@@ -45,6 +48,12 @@ class PacketisedPicture {
 [[nodiscard]] PacketisedPicture packetise_jpeg(const JpegPicture& picture, std::span<const std::uint8_t> user_data,
                                                std::size_t max_payload);
 
+// A picture of any codec, with a text in its user data where that is not empty: before the first slice of H.264 a SEI
+// unit, before the coded MPEG-4 picture a user-data unit, before the first JPEG header a block. Nothing for one that
+// RTP cannot carry.
+[[nodiscard]] std::optional<PacketisedPicture> packetise(ImageKind codec, const std::string& picture,
+                                                         const std::string& text, std::size_t max_payload);
+
 // A clip cut into packets once, for any number of cameras and clients. Immutable.
 class PacketisedClip {
  public:
@@ -55,20 +64,20 @@ class PacketisedClip {
   [[nodiscard]] static std::shared_ptr<const PacketisedClip> load(const std::string& path, std::size_t max_payload,
                                                                   const std::string& user_data = {});
 
-  [[nodiscard]] ImageKind codec() const { return codec_; }
+  [[nodiscard]] ImageKind codec() const { return images_.kind(); }
+  // H.264 as a receiver rebuilds it, MPEG-4 as it is sent, JPEG as the encoder made it.
+  [[nodiscard]] const ImageClip& images() const { return images_; }
   [[nodiscard]] const Clip& clip() const { return clip_; }  // H.264; empty for other codecs
   [[nodiscard]] const std::vector<PacketisedPicture>& pictures() const { return pictures_; }
-  // Picture `index`: H.264 as a receiver rebuilds it, MPEG-4 as it is sent, JPEG as the encoder made it.
-  [[nodiscard]] std::vector<std::uint8_t> picture(std::size_t index) const;
-  [[nodiscard]] bool is_key(std::size_t index) const;
+  [[nodiscard]] const std::string& picture(std::size_t index) const { return images_.pictures()[index]; }
+  [[nodiscard]] bool is_key(std::size_t index) const { return images_.is_key(index); }
 
  private:
-  explicit PacketisedClip(const ImageClip& images) : codec_(images.kind()), images_(images.pictures()) {}
-  [[nodiscard]] bool packetise(std::size_t max_payload, const std::string& user_data);
+  explicit PacketisedClip(ImageClip images) : images_(std::move(images)) {}
+  [[nodiscard]] bool packetise_images(std::size_t max_payload, const std::string& user_data);
 
-  ImageKind codec_ = ImageKind::kH264;
   Clip clip_;
-  std::vector<std::string> images_;  // of the other codecs
+  ImageClip images_;
   std::vector<PacketisedPicture> pictures_;
 };
 

@@ -24,58 +24,49 @@ RtpSender::RtpSender(std::shared_ptr<CameraState> state, std::uint32_t session, 
 
 void RtpSender::play(std::chrono::milliseconds pause) {
   if (stream_ || stopped_) return;
-  const auto plan = plan_stream(state_->options, state_->settings, video_);
-  if (!plan || !plan->clip) return;
-  CameraOptions options = state_->options;
-  options.clip = plan->clip;
-  options.frames_per_second = plan->frames_per_second;
-  frames_per_second_ = plan->frames_per_second;
+  std::optional<StreamPlan> plan = plan_stream(*state_, video_);
+  if (plan && plan->source) play(std::move(plan->source), pause);
+}
+
+void RtpSender::play(std::unique_ptr<PictureSource> source, std::chrono::milliseconds pause) {
+  if (stream_ || stopped_) return;
   const std::uint64_t seed = state_->options.seed + kSeedStep * state_->plays++;
   PacketFaults faults;
   {
     const std::lock_guard<std::mutex> lock(state_->packet_faults_mutex);
     faults = state_->packet_faults;
   }
-  stream_.emplace(options, faults, session_, seed);
+  stream_.emplace(std::move(source), state_->options, faults, RtpStream::Identity{session_, seed});
   lane_.emplace(std::move(faults), seed);
   started_ = Clock::now() + pause;
-  load_picture();
   wait_for_next();
 }
 
 void RtpSender::stop() {
   stopped_ = true;
   timer_.cancel();
+  stream_.reset();
   port_->close();
 }
 
-RtpSender::Time RtpSender::picture_time(std::uint64_t picture) const {
-  return Time(std::llround(static_cast<double>(picture) * 1e9 / (frames_per_second_ * state_->options.speed)));
-}
-
-void RtpSender::load_picture() {
-  picture_.clear();
-  offered_ = 0;
-  offered_bytes_ = 0;
-  if (stream_->ended()) return;
-  picture_index_ = stream_->next_picture();
-  stream_->take_picture(picture_);
+RtpSender::Time RtpSender::paced(std::chrono::nanoseconds time) const {
+  return Time(std::llround(static_cast<double>(time.count()) / state_->options.speed));
 }
 
 // The bursts of a picture are spread over the first half of its time; a port sends one datagram behind the other.
 std::optional<RtpSender::Time> RtpSender::next_burst() const {
   if (picture_.empty()) return std::nullopt;
-  const Time begin = picture_time(picture_index_);
   if (const unsigned rate = state_->options.link_megabits; rate > 0) {
-    return begin + std::chrono::duration_cast<Time>(std::chrono::microseconds(offered_bytes_ * 8 / rate));
+    return picture_began_ + std::chrono::duration_cast<Time>(std::chrono::microseconds(offered_bytes_ * 8 / rate));
   }
-  const Time half = (picture_time(picture_index_ + 1) - begin) / 2;
+  const Time half = paced(steady_time(1, stream_->format().frames_per_second)) / 2;
   const auto share = static_cast<double>(offered_) / static_cast<double>(picture_.size());
-  return begin + Time(std::llround(static_cast<double>(half.count()) * share));
+  return picture_began_ + Time(std::llround(static_cast<double>(half.count()) * share));
 }
 
-std::optional<RtpSender::Time> RtpSender::next_event() const {
-  const std::optional<Time> burst = next_burst();
+std::optional<RtpSender::Time> RtpSender::next_event() {
+  std::optional<Time> burst = next_burst();
+  if (!burst && stream_->load()) burst = paced(stream_->loaded().due);
   const std::optional<Time> due = lane_->next_due();
   if (!burst || !due) return burst ? burst : due;
   return std::min(*burst, *due);
@@ -83,8 +74,9 @@ std::optional<RtpSender::Time> RtpSender::next_event() const {
 
 void RtpSender::wait_for_next() {
   const std::optional<Time> event = next_event();
+  if (picture_.empty() && !stream_->load() && !stream_->ended()) wait_for_source();
   if (!event) {
-    state_->sent.add_finished_stream();
+    if (stream_->ended() && !std::exchange(finished_, true)) state_->sent.add_finished_stream();
     return;
   }
   slip_if_far_behind(*event);
@@ -94,12 +86,39 @@ void RtpSender::wait_for_next() {
   });
 }
 
+void RtpSender::wait_for_source() {
+  if (std::exchange(waits_for_source_, true)) return;
+  stream_->wait([weak = weak_from_this(), &context = state_->context] {
+    asio::post(context, [weak] {
+      const std::shared_ptr<RtpSender> self = weak.lock();
+      if (!self || self->stopped_) return;
+      self->waits_for_source_ = false;
+      self->wait_for_next();
+    });
+  });
+}
+
 void RtpSender::slip_if_far_behind(Time event) {
   const Clock::duration late = Clock::now() - (started_ + event);
   if (late > kFarBehind) started_ += late;
 }
 
+std::string RtpSender::user_data_of(const SourcePicture& picture) const {
+  if (!stream_->format().takes_user_data) return {};
+  const bool of_key_pictures = !state_->options.user_data.empty();
+  return of_key_pictures && !picture.key ? "" : present_user_data(*state_);
+}
+
+void RtpSender::begin_picture(Time now) {
+  picture_.clear();
+  picture_began_ = now;
+  offered_ = 0;
+  offered_bytes_ = 0;
+  stream_->take_picture(picture_, user_data_of(stream_->loaded()));
+}
+
 void RtpSender::offer_burst(Time now) {
+  if (picture_.empty()) begin_picture(now);
   const std::size_t burst = state_->options.link_megabits > 0 ? 1 : state_->options.burst_packets;
   const std::size_t end = std::min(picture_.size(), offered_ + burst);
   for (; offered_ < end; ++offered_) {
@@ -107,22 +126,23 @@ void RtpSender::offer_burst(Time now) {
     lane_->offer(std::move(picture_[offered_]), now, leaving_);
   }
   if (offered_ < picture_.size()) return;
-  load_picture();
-  if (picture_.empty()) lane_->release_held(leaving_);
+  picture_.clear();
+  if (!stream_->load() && stream_->ended()) lane_->release_held(leaving_);
 }
 
 void RtpSender::run_event() {
+  const std::optional<Time> now = next_event();
+  if (!now) return wait_for_next();
   leaving_.clear();
-  const Time now = *next_event();
   if (lane_->next_due() == now) {
-    lane_->release_due(now, leaving_);
+    lane_->release_due(*now, leaving_);
   } else {
-    offer_burst(now);
+    offer_burst(*now);
     if (state_->options.link_megabits == 0) not_before_ = Clock::now() + state_->options.burst_gap;
   }
   const auto hashing = state_->options.hash_packets ? PacketPort::Hashing::kOn : PacketPort::Hashing::kOff;
   state_->sent.add(port_->send(leaving_, hashing));
-  wait_for_next();
+  if (!stopped_) wait_for_next();
 }
 
 }  // namespace vexa::camera

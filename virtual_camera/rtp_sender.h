@@ -8,6 +8,7 @@
 #include <cstdint>
 #include <memory>
 #include <optional>
+#include <string>
 #include <vector>
 
 #include "virtual_camera/camera_state.h"
@@ -25,17 +26,21 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
   // Starts with the first picture, after the pause, as the video stream is set. Nothing happens without a clip or when
   // already playing.
   void play(std::chrono::milliseconds pause);
+  // The same with another source than the video stream's; not null.
+  void play(std::unique_ptr<PictureSource> source, std::chrono::milliseconds pause);
   void stop();
 
  private:
   using Clock = std::chrono::steady_clock;
   using Time = FaultLane::Time;
 
-  [[nodiscard]] Time picture_time(std::uint64_t picture) const;
+  [[nodiscard]] Time paced(std::chrono::nanoseconds time) const;
   [[nodiscard]] std::optional<Time> next_burst() const;
-  [[nodiscard]] std::optional<Time> next_event() const;
-  void load_picture();
+  [[nodiscard]] std::optional<Time> next_event();
   void wait_for_next();
+  void wait_for_source();
+  [[nodiscard]] std::string user_data_of(const SourcePicture& picture) const;
+  void begin_picture(Time now);
   void run_event();
   void offer_burst(Time now);
   void slip_if_far_behind(Time event);
@@ -43,7 +48,6 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
   std::shared_ptr<CameraState> state_;
   const std::uint32_t session_;
   const int video_;
-  double frames_per_second_ = 0;  // of the stream as it was planned at its start
   const std::unique_ptr<PacketPort> port_;
   asio::steady_timer timer_;
   std::optional<RtpStream> stream_;
@@ -51,10 +55,12 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
   Clock::time_point started_;
   Clock::time_point not_before_;   // the pause after a burst
   std::vector<Outgoing> picture_;  // the picture under way
+  Time picture_began_{0};
   std::size_t offered_ = 0;        // packets of it already offered
   std::size_t offered_bytes_ = 0;  // what they take on the wire
-  std::uint64_t picture_index_ = 0;
   std::vector<Outgoing> leaving_;
+  bool waits_for_source_ = false;
+  bool finished_ = false;
   bool stopped_ = false;
 };
 

@@ -71,9 +71,10 @@ Answer RtspConnection::dispatch(const RequestHead& request, std::uint32_t sequen
 
 Answer RtspConnection::describe(const RequestHead& request, std::uint32_t sequence) {
   if (classify_url(request.path) != VideoUrl::kStream) return status_only("404 Not Found", sequence);
-  const auto plan = plan_stream(state().options, state().settings, video_number(request.path));
+  const auto plan = plan_stream(state(), video_number(request.path));
   if (!plan) return status_only("404 Not Found", sequence);
-  const std::string description = describe_session(state().options, plan->clip.get(), kMaxRtspAnswer - kDescribeHead);
+  const SourceFormat format = plan->source ? plan->source->format() : SourceFormat{};
+  const std::string description = describe_session(state().options, format, kMaxRtspAnswer - kDescribeHead);
   return rtsp_answer({"200 OK", sequence, {}, description});
 }
 

@@ -2,45 +2,28 @@
 
 #include <fmt/format.h>
 
-#include <span>
 #include <string_view>
 
 #include "virtual_camera/credentials.h"
-#include "virtual_camera/rtp_packetiser.h"
 #include "virtual_camera/rtp_stream.h"
 
 namespace vexa::camera {
 namespace {
 
-constexpr std::uint8_t kSequenceParameters = 7;
-constexpr std::uint8_t kPictureParameters = 8;
-
-std::string unit_text(const AccessUnit& picture, std::uint8_t type) {
-  for (const NalUnit& nal : picture.units) {
-    if (nal.type != type) continue;
-    const std::span<const std::uint8_t> unit = picture.unit(nal);
-    return {unit.begin(), unit.end()};
-  }
-  return {};
-}
-
-// ";profile-level-id=...;sprop-parameter-sets=..." of the clip's first picture (RFC 6184, 8.1).
-std::string parameter_sets(const PacketisedClip* clip) {
-  if (clip == nullptr || clip->clip().access_units().empty()) return {};
-  const AccessUnit& first = clip->clip().access_units().front();
-  const std::string sequence = unit_text(first, kSequenceParameters);
-  const std::string picture = unit_text(first, kPictureParameters);
-  if (sequence.size() < 4 || picture.empty()) return {};
+// ";profile-level-id=...;sprop-parameter-sets=..." (RFC 6184, 8.1).
+std::string parameter_sets(const SourceFormat& format) {
+  const std::string& sequence = format.sequence_parameters;
+  if (sequence.size() < 4 || format.picture_parameters.empty()) return {};
   std::string level;
   for (std::size_t i = 1; i < 4; ++i) level += fmt::format("{:02x}", static_cast<unsigned char>(sequence[i]));
   return fmt::format(";profile-level-id={};sprop-parameter-sets={},{}", level, base64_text(sequence),
-                     base64_text(picture));
+                     base64_text(format.picture_parameters));
 }
 
 // The lines that tell the codec (RFC 6184, 8.2; RFC 3016, 5.2; RFC 2435).
-std::string format_lines(const CameraOptions& options, std::string_view sets) {
-  const auto type = payload_type_of(options);
-  switch (options.clip ? options.clip->codec() : ImageKind::kH264) {
+std::string format_lines(const CameraOptions& options, ImageKind codec, std::string_view sets) {
+  const auto type = payload_type_of(options, codec);
+  switch (codec) {
     case ImageKind::kJpeg:
       return fmt::format("a=rtpmap:{} JPEG/{}\r\n", type, options.clock_rate);
     case ImageKind::kMpeg4:
@@ -51,7 +34,7 @@ std::string format_lines(const CameraOptions& options, std::string_view sets) {
   return fmt::format("a=rtpmap:{0} H264/{1}\r\na=fmtp:{0} packetization-mode=1{2}\r\n", type, options.clock_rate, sets);
 }
 
-std::string description(const CameraOptions& options, std::string_view sets) {
+std::string description(const CameraOptions& options, ImageKind codec, std::string_view sets) {
   const std::string range = options.range_clock.empty() ? "" : fmt::format("a=range:clock={}\r\n", options.range_clock);
   return fmt::format(
       "v=0\r\n"
@@ -62,14 +45,14 @@ std::string description(const CameraOptions& options, std::string_view sets) {
       "m=video 0 RTP/AVP {2}\r\n"
       "{3}"
       "a=control:video\r\n",
-      options.address, range, payload_type_of(options), format_lines(options, sets));
+      options.address, range, payload_type_of(options, codec), format_lines(options, codec, sets));
 }
 
 }  // namespace
 
-std::string describe_session(const CameraOptions& options, const PacketisedClip* clip, std::size_t limit) {
-  std::string text = description(options, parameter_sets(clip));
-  return text.size() <= limit ? text : description(options, "");
+std::string describe_session(const CameraOptions& options, const SourceFormat& format, std::size_t limit) {
+  std::string text = description(options, format.codec, parameter_sets(format));
+  return text.size() <= limit ? text : description(options, format.codec, "");
 }
 
 }  // namespace vexa::camera

@@ -6,11 +6,12 @@
 #include <string>
 
 #include "virtual_camera/options.h"
+#include "virtual_camera/picture_source.h"
 
 namespace vexa::camera {
 
-// At most `limit` characters: the parameter sets of the clip, which may be null, are left out where they would not fit.
-[[nodiscard]] std::string describe_session(const CameraOptions& options, const PacketisedClip* clip, std::size_t limit);
+// At most `limit` characters: H.264's parameter sets are left out where they would not fit.
+[[nodiscard]] std::string describe_session(const CameraOptions& options, const SourceFormat& format, std::size_t limit);
 
 }  // namespace vexa::camera
 

@@ -4,12 +4,14 @@
 
 #include <algorithm>
 #include <charconv>
+#include <chrono>
 #include <cstdint>
 #include <string_view>
+#include <utility>
 #include <vector>
 
+#include "virtual_camera/clip_source.h"
 #include "virtual_camera/drawn_h264.h"
-#include "virtual_camera/rtp_packetiser.h"
 
 namespace vexa::camera {
 namespace {
@@ -18,6 +20,19 @@ int leading_int(std::string_view text) {
   int value = 0;
   std::from_chars(text.data(), text.data() + text.size(), value);
   return value;
+}
+
+ClipSource::AtEnd at_end_of(const CameraOptions& options) {
+  return options.loop ? ClipSource::AtEnd::kStartOver : ClipSource::AtEnd::kStop;
+}
+
+// Null for a stream that the camera lacks or has switched off.
+std::unique_ptr<PictureSource> open_drawn(const CameraState& state, int number) {
+  const auto stream = stream_settings(state.settings, number);
+  if (!stream || stream->codec != "h264") return nullptr;
+  const std::vector<std::uint8_t> drawn = draw_h264({stream->width, stream->height, stream->frame_rate});
+  const auto clip = std::make_shared<const PacketisedClip>(Clip::from_annex_b(drawn), state.options.max_payload);
+  return std::make_unique<ClipSource>(clip, stream->frame_rate, ClipSource::AtEnd::kStartOver);
 }
 
 }  // namespace
@@ -37,13 +52,30 @@ std::optional<StreamSettings> stream_settings(const SettingsStore& settings, int
   return stream;
 }
 
-std::optional<StreamPlan> plan_stream(const CameraOptions& options, const SettingsStore& settings, int number) {
-  if (options.clip || !options.profile) return StreamPlan{options.clip, options.frames_per_second};
-  const auto stream = stream_settings(settings, number);
-  if (!stream || stream->codec != "h264") return std::nullopt;
-  const std::vector<std::uint8_t> drawn = draw_h264({stream->width, stream->height, stream->frame_rate});
-  return StreamPlan{std::make_shared<const PacketisedClip>(Clip::from_annex_b(drawn), options.max_payload),
-                    static_cast<double>(stream->frame_rate)};
+std::optional<StreamPlan> plan_stream(const CameraState& state, int number) {
+  const CameraOptions& options = state.options;
+  if (options.clip) {
+    auto clip = std::make_unique<ClipSource>(options.clip, options.frames_per_second, at_end_of(options));
+    if (!options.user_data.empty()) clip->keep_as_they_are();  // it has them from its loading
+    return StreamPlan{std::move(clip)};
+  }
+  if (!options.profile) return StreamPlan{};
+  StreamPlan plan{open_drawn(state, number)};
+  if (!plan.source) return std::nullopt;
+  return plan;
+}
+
+std::unique_ptr<PictureSource> plan_images(const CameraState& state, int number) {
+  const CameraOptions& options = state.options;
+  if (options.images) {
+    return std::make_unique<ClipSource>(options.images, options.frames_per_second, at_end_of(options));
+  }
+  return options.profile ? open_drawn(state, number) : nullptr;
+}
+
+std::string present_user_data(const CameraState& state) {
+  if (!state.options.user_data.empty()) return state.options.user_data;
+  return state.pose ? state.pose(std::chrono::steady_clock::now()).user_data : "";
 }
 
 }  // namespace vexa::camera

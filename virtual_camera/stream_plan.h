@@ -6,8 +6,8 @@
 #include <optional>
 #include <string>
 
-#include "virtual_camera/options.h"
-#include "virtual_camera/settings_store.h"
+#include "virtual_camera/camera_state.h"
+#include "virtual_camera/picture_source.h"
 
 namespace vexa::camera {
 
@@ -25,15 +25,20 @@ struct StreamSettings {
 [[nodiscard]] std::optional<StreamSettings> stream_settings(const SettingsStore& settings, int number);
 
 struct StreamPlan {
-  std::shared_ptr<const PacketisedClip> clip;  // null: the session opens but carries no picture
-  double frames_per_second = 0;
+  std::unique_ptr<PictureSource> source;  // null: the session opens but carries no picture
 };
 
 // What a session on stream `number` sends: the clip that the options name, or, of a camera with a profile and no clip,
-// pictures drawn as the stream is set. Nothing for a stream that such a camera lacks, has switched off, or has set to a
-// codec without pictures here.
-[[nodiscard]] std::optional<StreamPlan> plan_stream(const CameraOptions& options, const SettingsStore& settings,
-                                                    int number);
+// pictures made as the stream is set. Nothing for a stream that such a camera lacks, has switched off, or has set to
+// what RTP cannot carry.
+[[nodiscard]] std::optional<StreamPlan> plan_stream(const CameraState& state, int number);
+
+// What "/imageN" sends: the images that the options name, or, of a camera with a profile and none, pictures made as
+// stream `number` is set. Null where there is no such stream.
+[[nodiscard]] std::unique_ptr<PictureSource> plan_images(const CameraState& state, int number);
+
+// What a picture carries as its user data when it leaves in this moment; empty: nothing.
+[[nodiscard]] std::string present_user_data(const CameraState& state);
 
 }  // namespace vexa::camera
 

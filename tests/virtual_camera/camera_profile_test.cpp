@@ -8,10 +8,8 @@
 
 #include "virtual_camera/cgi.h"
 #include "virtual_camera/message.h"
-#include "virtual_camera/rtp_packetiser.h"
 #include "virtual_camera/setting_rules.h"
 #include "virtual_camera/settings_store.h"
-#include "virtual_camera/stream_plan.h"
 
 namespace vexa::camera {
 namespace {
@@ -223,33 +221,6 @@ TEST(ProfiledCamera, RefusesACommandWithStatus400) {
   of_model(settings, "LMX-H100");
   const auto head = parse_head("GET /command/camera.cgi?XDNR=middle HTTP/1.0\r\n\r\n");
   EXPECT_EQ(answer_command(*head, settings).status, 400);
-}
-
-TEST(StreamPlan, FollowsTheSettingsOfTheStream) {
-  CameraOptions options;
-  auto loaded = load_camera_profile(kProfileFolder + "LMX-H100.json");
-  options.profile = std::make_shared<const SettingRules>(std::get<CameraProfile>(std::move(loaded)));
-  SettingsStore settings;
-  settings.obey(options.profile);
-  ASSERT_TRUE(settings.apply("camera", "ImageCodec1=h264&ImageSize1=320,192&FrameRate1=10&BitRate1=512"));
-  const auto plan = plan_stream(options, settings, 1);
-  ASSERT_TRUE(plan && plan->clip);
-  EXPECT_EQ(plan->frames_per_second, 10);
-  EXPECT_EQ(plan->clip->pictures().size(), 20U);
-  EXPECT_EQ(stream_settings(settings, 1)->width, 320);
-  EXPECT_EQ(stream_settings(settings, 1)->height, 192);
-  ASSERT_TRUE(settings.apply("camera", "ImageCodec2=off"));
-  EXPECT_FALSE(plan_stream(options, settings, 2)) << "switched off";
-  EXPECT_FALSE(plan_stream(options, settings, 3)) << "not there";
-}
-
-TEST(StreamPlan, WithoutAProfileIsTheClip) {
-  CameraOptions options;
-  const SettingsStore settings;
-  const auto plan = plan_stream(options, settings, 7);
-  ASSERT_TRUE(plan);
-  EXPECT_EQ(plan->clip, nullptr);
-  EXPECT_EQ(plan->frames_per_second, 25);
 }
 
 }  // namespace

@@ -131,27 +131,26 @@ TEST(RtspMessage, AnswersHoldStatusSequenceFieldsAndBody) {
 
 TEST(SessionDescription, NamesThePayloadTheClockAndTheTrack) {
   CameraOptions options;
-  EXPECT_EQ(describe_session(options, options.clip.get(), 500),
+  EXPECT_EQ(describe_session(options, {}, 500),
             "v=0\r\no=- 1 1 IN IP4 127.0.0.2\r\ns=video\r\nt=0 0\r\nm=video 0 RTP/AVP 96\r\n"
             "a=rtpmap:96 H264/90000\r\na=fmtp:96 packetization-mode=1\r\na=control:video\r\n");
   options.range_clock = "20240131T235959.250Z";
   options.payload_type = 97;
   options.clock_rate = 48000;
-  EXPECT_EQ(describe_session(options, options.clip.get(), 500),
+  EXPECT_EQ(describe_session(options, {}, 500),
             "v=0\r\no=- 1 1 IN IP4 127.0.0.2\r\ns=video\r\nt=0 0\r\na=range:clock=20240131T235959.250Z\r\n"
             "m=video 0 RTP/AVP 97\r\na=rtpmap:97 H264/48000\r\na=fmtp:97 packetization-mode=1\r\na=control:video\r\n");
 }
 
 TEST(SessionDescription, ParameterSetsAreNamedWhereTheyFit) {
-  const std::vector<std::uint8_t> bytes{0, 0, 1,    0x67, 0x42, 0xC0, 0x1E, 0x55, 0,
-                                        0, 1, 0x68, 0xCE, 0,    0,    1,    0x65, 0x88};
+  const std::string bytes("\0\0\1\x67\x42\xC0\x1E\x55\0\0\1\x68\xCE\0\0\1\x65\x88", 18);
+  const SourceFormat format = source_format(ImageKind::kH264, bytes, 25);
   CameraOptions options;
-  options.clip = std::make_shared<const PacketisedClip>(Clip::from_annex_b(bytes), 1400);
   const std::string sets = ";profile-level-id=42c01e;sprop-parameter-sets=Z0LAHlU=,aM4=\r\n";
-  const std::string whole = describe_session(options, options.clip.get(), 500);
+  const std::string whole = describe_session(options, format, 500);
   EXPECT_NE(whole.find(sets), std::string::npos);
-  EXPECT_EQ(describe_session(options, options.clip.get(), whole.size()), whole);
-  EXPECT_EQ(describe_session(options, options.clip.get(), whole.size() - 1).find("sprop"), std::string::npos);
+  EXPECT_EQ(describe_session(options, format, whole.size()), whole);
+  EXPECT_EQ(describe_session(options, format, whole.size() - 1).find("sprop"), std::string::npos);
 }
 
 }  // namespace
