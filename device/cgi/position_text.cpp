@@ -24,21 +24,24 @@ std::int64_t times(std::int64_t a, std::int64_t b) {
   return (a < 0) == (b < 0) ? kMost : -kMost;
 }
 
+/// A ratio of 0 says nothing.
+std::optional<std::int64_t> known(std::int64_t ratio) {
+  return ratio == 0 ? std::nullopt : std::optional<std::int64_t>(ratio);
+}
+
 /// The magnification at a zoom position in units of 1/10000 of the table's; nothing when a ratio in question is 0.
 std::optional<std::int64_t> magnification(const std::vector<SLibDZoomRatioInt>& ratios, int zoom) {
+  if (zoom <= ratios.front().position) return known(ratios.front().ratio * kRatioUnit);
+  if (zoom >= ratios.back().position) return known(ratios.back().ratio * kRatioUnit);
   const auto above =
       std::find_if(ratios.begin(), ratios.end(), [zoom](const auto& entry) { return entry.position >= zoom; });
-  const SLibDZoomRatioInt& high = above == ratios.end() ? ratios.back() : *above;
-  if (high.ratio == 0) return std::nullopt;
-  if (above == ratios.begin() || above == ratios.end()) return high.ratio * kRatioUnit;
+  const SLibDZoomRatioInt& high = *above;
   const SLibDZoomRatioInt& low = *(above - 1);
-  if (low.ratio == 0) return std::nullopt;
+  if (low.ratio == 0 || high.ratio == 0) return std::nullopt;
   const std::int64_t rise = (static_cast<std::int64_t>(high.ratio) - low.ratio) * kRatioUnit;
   const std::int64_t way = static_cast<std::int64_t>(zoom) - low.position;
   const std::int64_t distance = static_cast<std::int64_t>(high.position) - low.position;
-  const std::int64_t ratio = low.ratio * kRatioUnit + times(rise, way) / distance;
-  if (ratio == 0) return std::nullopt;
-  return ratio;
+  return known(low.ratio * kRatioUnit + times(rise, way) / distance);
 }
 
 }  // namespace
@@ -65,7 +68,9 @@ std::optional<CameraPosition> read_position_text(const std::string& text) {
 
 int axis_angle(int position, int span, int angle_range, std::int64_t offset) {
   if (span == 0) return position;
-  return clamp_to_int(times(times(position - offset, angle_range), 1000) / span);
+  // Safe: kept where its sign can be turned, as a picture upside down asks for.
+  return std::max(clamp_to_int(times(times(position - offset, angle_range), 1000) / span),
+                  -std::numeric_limits<int>::max());
 }
 
 std::optional<ViewingAngles> viewing_angles(const std::vector<SLibDZoomRatioInt>& ratios,

@@ -1,6 +1,7 @@
 // Where the camera looks, as the text of its pictures tells; and the records of control.
 #include <gtest/gtest.h>
 
+#include <climits>
 #include <string>
 
 #include "tests/device/ptz_reach.h"
@@ -94,6 +95,16 @@ TEST_F(PtzPosition, CountsTiltFromItsOffsetOnTheSideOfThePicture) {
   EXPECT_EQ(said("CamPos: 111000000C80000").tilt, 625);
   driver_.m_CameraInfo.rotation = 180;
   EXPECT_EQ(said("CamPos: 111000000C80000").tilt, -1875);
+}
+
+TEST_F(PtzPosition, BeyondAnIntStaysAtItsLimitOnBothSidesOfThePicture) {
+  SLibDFixedPanTiltInfo& camera = driver_.m_FixedPTZControlInfo.panTilt;
+  camera.panSpan = camera.tiltSpan = 1;
+  camera.panAngleRange = camera.tiltAngleRange = INT_MAX;
+  const std::string lowest = "CamPos: 111800080000000";
+  EXPECT_EQ(said(lowest), (PositionSaid{1, -INT_MAX, -INT_MAX, 580000, 340000, false}));
+  driver_.m_CameraInfo.rotation = 180;
+  EXPECT_EQ(said(lowest), (PositionSaid{1, INT_MAX, INT_MAX, 580000, 340000, false}));
 }
 
 TEST_F(PtzPosition, StaysInTheCamerasUnitsWithoutASpan) {

@@ -94,6 +94,13 @@ TEST(ViewingAngles, TakeTheFirstNeighboursOfATableThatIsNotSorted) {
   EXPECT_EQ(viewing_angles({{1, 0}, {2, 5}, {4, 5}, {8, 10}}, wide_angles(100, 100), 5)->horizontal, 500000);
 }
 
+TEST(ViewingAngles, AreThoseOfTheLastRatioAtAndAboveItsPositionWhateverStandsBefore) {
+  EXPECT_EQ(viewing_angles({{1, 0}, {2, 5}, {4, 5}}, wide_angles(100, 100), 5)->horizontal, 250000);
+  EXPECT_EQ(viewing_angles({{1, 0}, {16, 30}, {2, 20}}, wide_angles(100, 100), 25)->horizontal, 500000);
+  EXPECT_EQ(viewing_angles({{4, 30}, {1, 10}}, wide_angles(100, 100), 20)->horizontal, 250000)
+      << "the first comes before the last";
+}
+
 TEST(ViewingAngles, StayWithinAnIntForEveryProfile) {
   const int extremes[] = {INT_MIN, -1, 1, INT_MAX};
   for (const int wide : extremes) {
@@ -124,10 +131,10 @@ TEST(AxisAngle, IsInThousandthsWithoutItsFraction) {
               {5, 0, 360, 7, 5},
               {5, 1, 1, 7, -2000},
               {5, -2, 1, 7, 1000},
-              {-32768, 1, INT_MAX, 0, INT_MIN},
+              {-32768, 1, INT_MAX, 0, -INT_MAX},
               {-32768, -1, INT_MAX, 0, INT_MAX},
               {32767, 1, INT_MAX, -(INT64_C(1) << 31), INT_MAX},
-              {-32768, -1, INT_MIN, INT64_C(1) << 31, INT_MIN}};
+              {-32768, -1, INT_MIN, INT64_C(1) << 31, -INT_MAX}};
   for (const auto& row : rows) {
     EXPECT_EQ(axis_angle(row.position, row.span, row.range, row.offset), row.angle) << row.position << "/" << row.span;
   }
