@@ -27,7 +27,8 @@ struct DriverState {
   CSimpleLock start_stop_lock;                   ///< held by a start or stop of video from begin to end; outermost
   CSimpleLock error_lock;                        ///< guards m_LatestErrorCode and m_LatestErrorText; innermost
   CSimpleLock filter_lock;  ///< guards m_ResolutionFilter and m_FixedCameraInfo; taken before m_ConnectionLock
-  CSimpleLock io_turn;      ///< of m_IoStreamLock: a stop comes next, however soon a poll follows the last
+  CSimpleLock audio_turn;   ///< of m_AudioLock: a stop comes next, however soon a poll follows the last
+  CSimpleLock io_turn;      ///< of m_IoStreamLock likewise
   CSimpleLock md_turn;      ///< of m_MdStreamLock likewise
   SecondsClock now = system_seconds;
   int teardown_timeout = 15000;       ///< milliseconds for the answer to a TEARDOWN; tests put less in its place

@@ -2,11 +2,14 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <ctime>
 #include <thread>
 #include <tuple>
+#include <vector>
 
 #include "tests/device/settings_exchange.h"
+#include "tests/support/failing_new.h"
 #include "tests/support/process_state.h"
 #include "tests/support/stream_pair.h"
 
@@ -169,6 +172,52 @@ TEST_F(AudioSettings, ThatTheCameraRefusesAreNotStored) {
   EXPECT_EQ(fields_of(driver_.m_AudioInfo), fields_of(SLibDAudioInfo()));
 }
 
+/// Lets each allocation of `call` fail in turn, against a camera that plays `script`; every failure is told.
+/// @return how many allocations there are.
+template <typename Call>
+int audio_calls_short_of_memory(const Script& script, Call call) {
+  for (int nth = 0; nth < 1000; ++nth) {
+    AudioDriver driver;
+    ScriptedCamera camera(script);
+    driver.use(camera.host(), camera.port(), 5000);
+    driver.m_AudioInfo = any_record();
+    driver.m_AudioInfo.reserved3 = std::string(40, 'x');
+    driver.m_FixedSystemInfo.capability3 = 1;
+    driver.m_FixedAudioInfo.inputCodecs.resize(1);
+    ELibDReturnCode result = LIBD_OK;
+    bool happened = false;
+    {
+      const AllocationFailure failure(nth);
+      result = call(driver);
+      happened = failure.happened();
+    }
+    EXPECT_EQ(result, happened ? LIBD_FAILED : LIBD_OK) << nth;
+    if (!happened) return nth;
+    EXPECT_EQ(driver.LatestErrorText(), "Cannot allocate memory") << nth;
+  }
+  return 1000;
+}
+
+TEST_F(AudioSettings, FailWhenAnyOneAllocationDoes) {
+  EXPECT_GT(audio_calls_short_of_memory({inquiry("camera", "AudInCodec=g711_64&" + std::string(40, 'x'))},
+                                        [](AudioDriver& driver) {
+                                          SLibDAudioInfo info;
+                                          return driver.GetAudioInfo(info);
+                                        }),
+            3);
+  SLibDAudioInfo set = any_record();
+  set.reserved3 = std::string(40, 'x');
+  EXPECT_GT(audio_calls_short_of_memory({command("/command/camera.cgi?AudInCodec=g711_64&AudioIn=on")},
+                                        [&set](AudioDriver& driver) { return driver.SetAudioInfo(set); }),
+            3);
+  EXPECT_GT(audio_calls_short_of_memory({},
+                                        [](AudioDriver& driver) {
+                                          SLibDFixedAudioInfo info;
+                                          return driver.GetFixedAudioInfo(info);
+                                        }),
+            0);
+}
+
 class AudioStream : public testing::Test {
  protected:
   AudioStream() {
@@ -256,6 +305,27 @@ TEST_F(AudioStream, ThatFailsStaysStored) {
   driver_.m_AudioSocket = -1;
 }
 
+TEST_F(AudioStream, IsStoppedAlthoughOnePollFollowsTheOther) {
+  std::atomic<long> poller_id{0};
+  std::vector<ELibDReturnCode> polled;
+  std::thread poller([&] {
+    poller_id = kernel_thread_id();
+    ELibDReturnCode code = LIBD_OK;
+    while ((code = driver_.GetCurrentAudioFrame(frame_)) != LIBD_FAILED) polled.push_back(code);
+  });
+  ASSERT_TRUE(eventually([&] { return poller_id != 0 && is_sleeping(poller_id); }));
+  std::atomic<long> stopper_id{0};
+  std::thread stopper([&] {
+    stopper_id = kernel_thread_id();
+    driver_.StopAudioStreaming();
+  });
+  ASSERT_TRUE(eventually([&] { return stopper_id != 0 && is_sleeping(stopper_id); }));
+  pair_.say("sound");
+  poller.join();
+  stopper.join();
+  EXPECT_EQ(polled, std::vector<ELibDReturnCode>{LIBD_OK});
+}
+
 TEST_F(AudioStream, ThatIsNotOpenLeavesTheFrame) {
   driver_.StopAudioStreaming();
   frame_.codecType = 99;
@@ -288,6 +358,31 @@ TEST(StartAudioStreaming, ClosesARunningStreamFirst) {
     AudioDriver driver;
     StreamPair running;
     driver.m_AudioSocket = dup(running.driver_end());
+    ScriptedCamera camera({refusal("/audio")});
+    driver.use(camera.host(), camera.port(), 5000);
+    EXPECT_EQ(driver.StartAudioStreaming(), LIBD_UNAUTHORIZED);
+    EXPECT_EQ(driver.m_AudioSocket, -1);
+    EXPECT_EQ(camera.finish(), "");
+  }
+  EXPECT_EQ(open_descriptors(), descriptors);
+}
+
+/// A stream that another thread opens between the stop and the opening of a start.
+class OvertakenStart : public AudioDriver {
+ public:
+  ELibDReturnCode StopAudioStreaming() override {
+    AudioDriver::StopAudioStreaming();
+    m_AudioSocket = dup(other.driver_end());
+    return LIBD_OK;
+  }
+
+  StreamPair other;
+};
+
+TEST(StartAudioStreaming, LosesNoStreamThatAnotherThreadHasOpenedMeanwhile) {
+  const std::size_t descriptors = open_descriptors();
+  {
+    OvertakenStart driver;
     ScriptedCamera camera({refusal("/audio")});
     driver.use(camera.host(), camera.port(), 5000);
     EXPECT_EQ(driver.StartAudioStreaming(), LIBD_UNAUTHORIZED);
