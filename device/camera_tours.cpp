@@ -16,11 +16,15 @@ ELibDReturnCode CVexaCommon::GetCameraTourInfo(SLibDCameraTourInfo& info) try {
   return LIBD_FAILED;
 }
 
-ELibDReturnCode CVexaCommon::SetCameraTourInfo(SLibDCameraTourInfo& info) {
+// Safe: a request that memory does not hold is a failure and not an exception.
+ELibDReturnCode CVexaCommon::SetCameraTourInfo(SLibDCameraTourInfo& info) try {
   const auto request =
       vexa::camera_tour_request(info, m_FixedPTZControlInfo.tourCount, m_FixedPTZControlInfo.presetCount);
   if (!request) return LIBD_INVALID_ARGUMENT;
   return SendCommand("/command/presetposition.cgi?%s", request->c_str());
+} catch (const std::bad_alloc&) {
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
 bool CVexaCommon::GetTextByTourSequenceList(const std::vector<int>& sequence, std::string& text) {

@@ -17,11 +17,15 @@ constexpr int kStoreTimeout = 10000;  // milliseconds
 
 bool CVexaCommon::IsPreset(int index) const { return index >= 0 && index < m_FixedPTZControlInfo.presetCount; }
 
-ELibDReturnCode CVexaCommon::SetPreset(SLibDPresetInfo& preset) {
+// Safe: a request that memory does not hold is a failure and not an exception.
+ELibDReturnCode CVexaCommon::SetPreset(SLibDPresetInfo& preset) try {
   const std::string name = AddUrlEncoding(preset.name, true);
   if (!IsPreset(preset.index) || name.empty()) return LIBD_INVALID_ARGUMENT;
   const vexa::RaisedTimeout slow(m_ConnectionInfo.timeout, m_ConnectionLock, {kStoreTimeout, m_SavedTimeout});
   return SendCommand("/command/presetposition.cgi?PresetSet=%d,%s,on", preset.index + 1, name.c_str());
+} catch (const std::bad_alloc&) {
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
 ELibDReturnCode CVexaCommon::RecallPreset(int index) {

@@ -1,4 +1,9 @@
 // Where the camera looks, and what is known of its motion.
+#include <cerrno>
+#include <new>
+#include <optional>
+#include <utility>
+
 #include "device/cgi/position_text.h"
 #include "runtime/base/sync.h"
 #include "vexa/vexa_common.h"
@@ -10,12 +15,11 @@ constexpr int kUpsideDown = 180;
 }  // namespace
 
 ELibDReturnCode CVexaCommon::GetCurrentPosition(SLibDPTZStatus& status) {
-  std::string text;
+  std::optional<vexa::CameraPosition> position;
   {
     const vexa::Guard guard(m_CamPosLock);
-    text = m_CamPosText;
+    position = vexa::read_position_text(m_CamPosText);
   }
-  const auto position = vexa::read_position_text(text);
   if (!position) return LIBD_FAILED;
   // Kept: the flag is set and never cleared, as the host clears it when it has seen it.
   if (position->moving) status.moving = true;
@@ -45,20 +49,31 @@ bool CVexaCommon::GetViewingAngles(int zoom, int& horizontal, int& vertical) {
   return true;
 }
 
-ELibDReturnCode CVexaCommon::GetPTZControlInfo(SLibDPTZControlInfo& info) {
+// Safe: here and below, a record that memory does not hold is a failure and not an exception.
+ELibDReturnCode CVexaCommon::GetPTZControlInfo(SLibDPTZControlInfo& info) try {
   const vexa::Guard guard(m_ConnectionLock);
   info = m_PTZControlInfo;
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
-ELibDReturnCode CVexaCommon::SetPTZControlInfo(SLibDPTZControlInfo& info) {
+ELibDReturnCode CVexaCommon::SetPTZControlInfo(SLibDPTZControlInfo& info) try {
+  SLibDPTZControlInfo stored = info;
   const vexa::Guard guard(m_ConnectionLock);
-  m_PTZControlInfo = info;
+  m_PTZControlInfo = std::move(stored);
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
-ELibDReturnCode CVexaCommon::GetFixedPTZControlInfo(SLibDFixedPTZControlInfo& info) {
+ELibDReturnCode CVexaCommon::GetFixedPTZControlInfo(SLibDFixedPTZControlInfo& info) try {
   if (!m_FixedPTZControlInfoAvailable) return LIBD_NOT_SUPPORTED;
   info = m_FixedPTZControlInfo;
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }

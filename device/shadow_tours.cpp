@@ -18,17 +18,25 @@ ELibDReturnCode CVexaCommon::GetShadowTourInfo(SLibDShadowTourInfo& info) try {
   return LIBD_FAILED;
 }
 
-ELibDReturnCode CVexaCommon::SetShadowTourInfo(SLibDShadowTourInfo& info) {
+// Safe: a request that memory does not hold is a failure and not an exception.
+ELibDReturnCode CVexaCommon::SetShadowTourInfo(SLibDShadowTourInfo& info) try {
   if (m_FixedPTZControlInfo.shadowTourCount < 1) return LIBD_NOT_SUPPORTED;
   const auto request = vexa::shadow_tour_request(info, m_FixedPTZControlInfo.shadowTourCount);
   if (!request) return LIBD_INVALID_ARGUMENT;
   return SendCommand("/command/presetposition.cgi?%s", request->c_str());
+} catch (const std::bad_alloc&) {
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
-ELibDReturnCode CVexaCommon::StartShadowTour(int number) {
+// Safe: a request that memory does not hold is a failure and not an exception.
+ELibDReturnCode CVexaCommon::StartShadowTour(int number) try {
   const int count = m_FixedPTZControlInfo.shadowTourCount;
   if (!vexa::is_shadow_tour(number, count)) return LIBD_INVALID_ARGUMENT;
   return SendCommand("/command/presetposition.cgi?%s", vexa::shadow_tour_start(number, count).c_str());
+} catch (const std::bad_alloc&) {
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
 // Kept: four shadow tours are named, however many there are; cameras pass over those they lack.
