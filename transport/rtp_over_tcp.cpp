@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstdarg>
+#include <new>
 
 #include "runtime/base/text.h"
 #include "transport/failure.h"
@@ -29,7 +30,8 @@ vexa::Bytes bytes_from(const char* buffer, std::size_t length) {
 
 }  // namespace
 
-int CVexaCommon::rtp_over_tcp_open(const char* format, ...) {
+// Safe: a session that memory does not hold is a failure and not an exception.
+int CVexaCommon::rtp_over_tcp_open(const char* format, ...) try {
   va_list arguments;
   va_start(arguments, format);
   const std::string url = vexa::vformat_within(vexa::kRequestRoom, format, arguments).text;
@@ -51,6 +53,8 @@ int CVexaCommon::rtp_over_tcp_open(const char* format, ...) {
   if (!PlayRtsp(socket.get(), url, session)) return -1;
   SetStreamSocket(socket.get());
   return socket.release();
+} catch (const std::bad_alloc&) {
+  return FailSystem(ENOMEM);
 }
 
 // Reads first and waits only when nothing is there.

@@ -253,6 +253,18 @@ TEST_F(MetadataPart, ShorterThan64BytesFails) {
   EXPECT_EQ(driver_.latest_error(), "0 from before");
 }
 
+TEST_F(MetadataPart, HeaderIsWaitedForASecondWhateverTheTimeout) {
+  std::thread late([this] {
+    for (const char byte : std::string("--part, late\r\n\r")) {
+      pair_.say({&byte, 1});
+      std::this_thread::yield();
+    }
+    pair_.say("\n" + std::string(64, 'a'));
+  });
+  EXPECT_EQ(receive(65, 0), 64);
+  late.join();
+}
+
 TEST_F(MetadataPart, HeaderThatDoesNotComeIsNoFailure) {
   EXPECT_EQ(receive(), 0);
   EXPECT_EQ(driver_.latest_error(), "0 from before");

@@ -1,11 +1,16 @@
 // RTP inside the RTSP connection, on connections of the test's own.
+#include <fcntl.h>
 #include <gtest/gtest.h>
+#include <sys/socket.h>
+#include <sys/time.h>
 
 #include <string>
 #include <thread>
+#include <utility>
 #include <vector>
 
 #include "tests/support/exchange_file.h"
+#include "tests/support/failing_new.h"
 #include "tests/support/process_state.h"
 #include "tests/support/stream_pair.h"
 #include "tests/transport/stream_driver.h"
@@ -231,6 +236,55 @@ TEST_F(RtpOverTcpOpen, GivesTheSocketThatCarriesTheMedia) {
   EXPECT_EQ(driver_.m_RangeClockMicros, 250000);
   EXPECT_NE(trace_.find("Transport: RTP/AVP/TCP;unicast;interleaved=0-1;\r\n"), std::string::npos);
   driver_.m_StreamSocket = -1;
+}
+
+TEST_F(RtpOverTcpOpen, GivesABlockingSocketWithRoomWhoseSingleReadsEndAfterWholeSeconds) {
+  ScriptedCamera camera(inside_the_connection("live_session"));
+  driver_.use(camera.host(), camera.port(), 2345);
+  testing::internal::CaptureStdout();
+  const int socket = driver_.rtp_over_tcp_open("rtsp://%s:%d/media/video%d", camera.host().c_str(), camera.port(), 1);
+  testing::internal::GetCapturedStdout();
+  ASSERT_NE(socket, -1);
+  EXPECT_EQ(fcntl(socket, F_GETFL) & O_NONBLOCK, 0);
+  EXPECT_NE(fcntl(socket, F_GETFD) & FD_CLOEXEC, 0);
+  int room = 0;
+  socklen_t length = sizeof room;
+  EXPECT_EQ(getsockopt(socket, SOL_SOCKET, SO_RCVBUF, &room, &length), 0);
+  EXPECT_EQ(room, 2 * 131072);  // the system doubles what it is asked for
+  for (const int option : {SO_RCVTIMEO, SO_SNDTIMEO}) {
+    timeval limit{};
+    length = sizeof limit;
+    EXPECT_EQ(getsockopt(socket, SOL_SOCKET, option, &limit, &length), 0);
+    EXPECT_EQ(limit.tv_sec, 2);
+    EXPECT_EQ(limit.tv_usec, 0);
+  }
+  driver_.rtp_over_tcp_close(socket);
+  driver_.m_StreamSocket = -1;
+}
+
+TEST_F(RtpOverTcpOpen, FailsWhenAnyOneAllocationDoesAndLeavesNoSocket) {
+  const std::size_t descriptors = open_descriptors();
+  testing::internal::CaptureStdout();
+  bool happened = true;
+  int failures = 0;
+  for (; happened && failures < 1000; ++failures) {
+    ScriptedCamera camera(inside_the_connection("live_session"));
+    driver_.use(camera.host(), camera.port(), 1000);
+    int socket = -1;
+    {
+      const AllocationFailure failure(failures);
+      socket = driver_.rtp_over_tcp_open("rtsp://%s:%d/media/video%d", camera.host().c_str(), camera.port(), 1);
+      happened = failure.happened();
+    }
+    EXPECT_EQ(socket == -1, happened) << failures;
+    EXPECT_EQ(driver_.m_StreamSocket, socket);
+    EXPECT_EQ(driver_.LatestErrorText(), happened || failures > 0 ? "Cannot allocate memory" : "from before");
+    driver_.rtp_over_tcp_close(std::exchange(driver_.m_StreamSocket, -1));
+  }
+  testing::internal::GetCapturedStdout();
+  EXPECT_GT(failures, 5);
+  EXPECT_LT(failures, 1000);
+  EXPECT_EQ(open_descriptors(), descriptors);
 }
 
 TEST_F(RtpOverTcpOpen, NeedsAClock) {
