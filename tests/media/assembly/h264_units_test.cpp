@@ -51,6 +51,26 @@ TEST(H264Units, RebuildsEachPictureByteForByte) {
   }
 }
 
+TEST(H264Units, EverySingleUnitAndEveryFragmentedOneTellsTheFramesType) {
+  for (int type = 0; type < 32; ++type) {
+    const std::int32_t expected = type == 1 ? 22 : type == 5 ? 20 : -1;
+    const auto unit = static_cast<unsigned char>(0x60 | type);
+    Payload frame(100);
+    // The type before is another one: each unit sets its own.
+    const Payload before = {static_cast<unsigned char>(type == 5 ? 0x61 : 0x65), 1};
+    if (type >= 1 && type <= 23) {
+      const AssembledPicture single = assemble_h264(Packets(std::vector<Payload>{before, {unit, 9}}), frame);
+      EXPECT_EQ(single.outcome, Assembly::kWhole) << type;
+      EXPECT_EQ(single.frame_type, expected) << type;
+    }
+    const Payload start = {0x7c, static_cast<unsigned char>(0x80 | type), 9};
+    EXPECT_EQ(assemble_h264(Packets(std::vector<Payload>{before, start}), frame).frame_type, expected) << type;
+    EXPECT_EQ(frame[10], unit) << type;
+    const Payload end = {0x7c, static_cast<unsigned char>(0x40 | type), 9};
+    EXPECT_EQ(assemble_h264(Packets(std::vector<Payload>{before, end}), frame).frame_type, type == 5 ? 22 : 20) << type;
+  }
+}
+
 TEST(H264Units, AFragmentOfType29IsReadLikeOneOfType28) {
   Payload frame(100);
   const AssembledPicture made = assemble_h264(Packets(std::vector<Payload>{{0x7d, 0x81, 0xaa, 0xbb, 1}}), frame);
