@@ -2,7 +2,6 @@
 #include <gtest/gtest.h>
 
 #include <climits>
-#include <future>
 #include <string>
 #include <vector>
 
@@ -76,8 +75,6 @@ TEST(Presets, HaveEveryByteOfTheirNamesEncoded) {
 }
 
 TEST(Presets, WithANameThatIsTooLongForARequestAreNotSent) {
-  PtzDriver driver;
-  give_presets(driver);
   PtzPlay play({});
   give_presets(play.driver);
   EXPECT_EQ(set_preset(play.driver, 0, std::string(4096, '\n')), LIBD_FAILED);
