@@ -1,12 +1,13 @@
-#include "virtual_camera/drawn_h264.h"
+// H.264, Baseline profile (ITU-T H.264), drawn.
+#include <string>
 
-#include <utility>
+#include "virtual_camera/bit_writer.h"
+#include "virtual_camera/drawn_video.h"
 
 namespace vexa::camera {
 namespace {
 
-constexpr std::uint32_t kMacroblock = 16;  // pixels
-constexpr int kSeconds = 2;
+constexpr std::uint32_t kSquareSide = 16;  // pixels
 
 // NAL unit headers: reference importance and type (table 7-1).
 constexpr std::uint8_t kSequenceParameterSet = 0x67;
@@ -22,104 +23,73 @@ constexpr std::uint32_t kMean16x16 = 3;
 constexpr std::uint32_t kMean16x16InP = 8;
 constexpr int kQuantiser = 46;  // a coefficient of 1 is a step of 8 in brightness
 
-// Writes the bits of one NAL unit.
-class BitWriter {
- public:
-  void bits(std::uint32_t value, int count) {
-    for (int bit = count - 1; bit >= 0; --bit) {
-      current_ =
-          static_cast<std::uint8_t>(static_cast<unsigned>(current_) << 1U | (value >> static_cast<unsigned>(bit) & 1U));
-      if (++filled_ == 8) flush();
-    }
-  }
-  // Exp-Golomb codes (9.1).
-  void ue(std::uint32_t value) {
-    int length = 0;
-    while ((value + 1) >> static_cast<unsigned>(length + 1) != 0) ++length;
-    bits(0, length);
-    bits(value + 1, length + 1);
-  }
-  void se(int value) {
-    const auto magnitude = static_cast<std::uint32_t>(value < 0 ? -value : value);
-    ue(value > 0 ? 2 * magnitude - 1 : 2 * magnitude);
-  }
-  // The stop bit, and zeros up to a whole byte.
-  std::vector<std::uint8_t> finish() {
-    bits(1, 1);
-    while (filled_ != 0) bits(0, 1);
-    return std::move(bytes_);
-  }
+// Exp-Golomb codes (9.1).
+void put_ue(BitWriter& out, std::uint32_t value) {
+  const int length = bits_in(value + 1) - 1;
+  out.bits(0, length);
+  out.bits(value + 1, length + 1);
+}
 
- private:
-  void flush() {
-    bytes_.push_back(current_);
-    current_ = 0;
-    filled_ = 0;
-  }
+void put_se(BitWriter& out, int value) {
+  const auto magnitude = static_cast<std::uint32_t>(value < 0 ? -value : value);
+  put_ue(out, value > 0 ? 2 * magnitude - 1 : 2 * magnitude);
+}
 
-  std::vector<std::uint8_t> bytes_;
-  std::uint8_t current_ = 0;
-  int filled_ = 0;
-};
+// The unit's bytes, behind the stop bit.
+std::string finished_unit(BitWriter& out) {
+  out.bits(1, 1);
+  out.pad(0);
+  return out.take();
+}
 
-struct Grid {
-  explicit Grid(const DrawnVideo& video)
-      : columns((static_cast<std::uint32_t>(video.width) + kMacroblock - 1) / kMacroblock),
-        rows((static_cast<std::uint32_t>(video.height) + kMacroblock - 1) / kMacroblock) {}
-  [[nodiscard]] std::uint32_t size() const { return columns * rows; }
-
-  std::uint32_t columns;  // macroblocks
-  std::uint32_t rows;
-};
-
-std::vector<std::uint8_t> sequence_parameters(const DrawnVideo& video, const Grid& grid) {
+std::string sequence_parameters(const DrawnVideo& video, const SquareGrid& grid) {
   BitWriter out;
   out.bits(66, 8);    // Baseline
   out.bits(0xC0, 8);  // decodable as Constrained Baseline and Main
   out.bits(40, 8);    // level 4
-  out.ue(0);          // identifier
-  out.ue(4);          // frame numbers have 8 bits
-  out.ue(2);          // pictures are shown in the order they come
-  out.ue(1);          // one reference picture
+  put_ue(out, 0);     // identifier
+  put_ue(out, 4);     // frame numbers have 8 bits
+  put_ue(out, 2);     // pictures are shown in the order they come
+  put_ue(out, 1);     // one reference picture
   out.bits(0, 1);
-  out.ue(grid.columns - 1);
-  out.ue(grid.rows - 1);
+  put_ue(out, grid.columns - 1);
+  put_ue(out, grid.rows - 1);
   out.bits(0b111, 3);  // frames only, 8x8 inference, cropping
-  out.ue(0);
-  out.ue((grid.columns * kMacroblock - static_cast<std::uint32_t>(video.width)) / 2);
-  out.ue(0);
-  out.ue((grid.rows * kMacroblock - static_cast<std::uint32_t>(video.height)) / 2);
+  put_ue(out, 0);
+  put_ue(out, (grid.columns * kSquareSide - static_cast<std::uint32_t>(video.width)) / 2);
+  put_ue(out, 0);
+  put_ue(out, (grid.rows * kSquareSide - static_cast<std::uint32_t>(video.height)) / 2);
   out.bits(0b10000, 5);  // usability information: none but the timing
   out.bits(1, 1);
   out.bits(1, 32);
   out.bits(2 * static_cast<std::uint32_t>(video.frame_rate), 32);  // fields
   out.bits(0b10000, 5);
-  return out.finish();
+  return finished_unit(out);
 }
 
-std::vector<std::uint8_t> picture_parameters() {
+std::string picture_parameters() {
   BitWriter out;
-  out.ue(0);
-  out.ue(0);
+  put_ue(out, 0);
+  put_ue(out, 0);
   out.bits(0, 2);  // variable-length codes; no field order
-  out.ue(0);
-  out.ue(0);
-  out.ue(0);
+  put_ue(out, 0);
+  put_ue(out, 0);
+  put_ue(out, 0);
   out.bits(0, 3);  // no weighting
-  out.se(kQuantiser - 26);
-  out.se(0);
-  out.se(0);
+  put_se(out, kQuantiser - 26);
+  put_se(out, 0);
+  put_se(out, 0);
   out.bits(0b100, 3);  // slices control the deblocking filter
-  return out.finish();
+  return finished_unit(out);
 }
 
 // A square as bright as its neighbours, or a step brighter or darker.
 enum class Square { kSame, kBrighter, kDarker };
 
 void put_square(BitWriter& out, std::uint32_t type, Square square) {
-  out.ue(type);
-  out.ue(0);  // the colour is the neighbours' mean
-  out.se(0);  // the quantiser stays
+  put_ue(out, type);
+  put_ue(out, 0);  // the colour is the neighbours' mean
+  put_se(out, 0);  // the quantiser stays
   if (square == Square::kSame) {
     out.bits(1, 1);  // no coefficient
     return;
@@ -129,8 +99,8 @@ void put_square(BitWriter& out, std::uint32_t type, Square square) {
   out.bits(1, 1);                                    // no zeros before it
 }
 
-Square pattern(std::uint32_t column, std::uint32_t row, std::uint32_t second) {
-  switch ((column / 4 * 7 + row / 4 * 13 + second * 5) % 5) {
+Square pattern(std::uint32_t column, std::uint32_t row) {
+  switch ((column / 4 * 7 + row / 4 * 13) % 5) {
     case 0:
       return Square::kBrighter;
     case 1:
@@ -140,74 +110,69 @@ Square pattern(std::uint32_t column, std::uint32_t row, std::uint32_t second) {
   }
 }
 
-std::vector<std::uint8_t> key_slice(const Grid& grid, std::uint32_t second) {
+std::string key_slice(const SquareGrid& grid, std::uint64_t second) {
   BitWriter out;
-  out.ue(0);
-  out.ue(kSliceI);
-  out.ue(0);
-  out.bits(0, 8);  // frame number
-  out.ue(second);  // two key pictures in a row differ in it
-  out.bits(0, 2);  // neither kept for output nor for long
-  out.se(0);
-  out.ue(1);  // no deblocking
+  put_ue(out, 0);
+  put_ue(out, kSliceI);
+  put_ue(out, 0);
+  out.bits(0, 8);                        // frame number
+  put_ue(out, second % 2 == 0 ? 0 : 1);  // two key pictures in a row differ in it
+  out.bits(0, 2);                        // neither kept for output nor for long
+  put_se(out, 0);
+  put_ue(out, 1);  // no deblocking
   for (std::uint32_t row = 0; row < grid.rows; ++row) {
     for (std::uint32_t column = 0; column < grid.columns; ++column) {
-      put_square(out, kMean16x16, pattern(column, row, second));
+      put_square(out, kMean16x16, pattern(column, row));
     }
   }
-  return out.finish();
+  return finished_unit(out);
 }
 
-std::vector<std::uint8_t> changed_slice(const Grid& grid, std::uint32_t picture) {
+std::string changed_slice(const SquareGrid& grid, std::uint32_t picture) {
   BitWriter out;
-  out.ue(0);
-  out.ue(kSliceP);
-  out.ue(0);
+  put_ue(out, 0);
+  put_ue(out, kSliceP);
+  put_ue(out, 0);
   out.bits(picture & 0xFFU, 8);
   out.bits(0, 3);  // the references as they are
-  out.se(0);
-  out.ue(1);
-  const std::uint32_t changed = picture * 11 % grid.size();
-  out.ue(changed);  // squares left as they were
+  put_se(out, 0);
+  put_ue(out, 1);
+  const std::uint32_t changed = changed_square(grid, picture);
+  put_ue(out, changed);  // squares left as they were
   put_square(out, kMean16x16InP, picture % 2 == 0 ? Square::kBrighter : Square::kDarker);
-  if (changed + 1 < grid.size()) out.ue(grid.size() - changed - 1);
-  return out.finish();
+  if (changed + 1 < grid.size()) put_ue(out, grid.size() - changed - 1);
+  return finished_unit(out);
 }
 
 // Appends a NAL unit with its start code; bytes that could be taken for a start code are escaped (7.4.1).
-void append_unit(std::vector<std::uint8_t>& to, std::uint8_t header, const std::vector<std::uint8_t>& body) {
-  to.insert(to.end(), {0, 0, 0, 1, header});
+void append_unit(std::string& to, std::uint8_t header, const std::string& body) {
+  to.append("\0\0\0\1", 4) += static_cast<char>(header);
   int zeros = 0;
-  for (const std::uint8_t byte : body) {
-    if (zeros == 2 && byte <= 3) {
-      to.push_back(3);
+  for (const char byte : body) {
+    if (zeros == 2 && static_cast<unsigned char>(byte) <= 3) {
+      to += '\3';
       zeros = 0;
     }
-    to.push_back(byte);
+    to += byte;
     zeros = byte == 0 ? zeros + 1 : 0;
   }
 }
 
 }  // namespace
 
-std::vector<std::uint8_t> draw_h264(const DrawnVideo& video) {
-  const Grid grid(video);
-  const auto rate = static_cast<std::uint32_t>(video.frame_rate);
-  std::vector<std::uint8_t> bytes;
-  for (std::uint32_t second = 0; second < kSeconds; ++second) {
-    for (std::uint32_t picture = 0; picture < rate; ++picture) {
-      std::vector<std::uint8_t> access_unit;
-      if (picture == 0) {
-        append_unit(access_unit, kSequenceParameterSet, sequence_parameters(video, grid));
-        append_unit(access_unit, kPictureParameterSet, picture_parameters());
-        append_unit(access_unit, kIdrSlice, key_slice(grid, second));
-      } else {
-        append_unit(access_unit, kSlice, changed_slice(grid, picture));
-      }
-      bytes.insert(bytes.end(), access_unit.begin(), access_unit.end());
-    }
+std::string draw_h264(const DrawnVideo& video, std::uint64_t index) {
+  const SquareGrid grid(video);
+  const auto rate = static_cast<std::uint64_t>(video.frame_rate);
+  const auto picture = static_cast<std::uint32_t>(index % rate);
+  std::string access_unit;
+  if (picture == 0) {
+    append_unit(access_unit, kSequenceParameterSet, sequence_parameters(video, grid));
+    append_unit(access_unit, kPictureParameterSet, picture_parameters());
+    append_unit(access_unit, kIdrSlice, key_slice(grid, index / rate));
+  } else {
+    append_unit(access_unit, kSlice, changed_slice(grid, picture));
   }
-  return bytes;
+  return access_unit;
 }
 
 }  // namespace vexa::camera

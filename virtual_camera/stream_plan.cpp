@@ -11,7 +11,7 @@
 #include <vector>
 
 #include "virtual_camera/clip_source.h"
-#include "virtual_camera/drawn_h264.h"
+#include "virtual_camera/drawn_video.h"
 
 namespace vexa::camera {
 namespace {
@@ -26,13 +26,25 @@ ClipSource::AtEnd at_end_of(const CameraOptions& options) {
   return options.loop ? ClipSource::AtEnd::kStartOver : ClipSource::AtEnd::kStop;
 }
 
+// The camera's word of a codec.
+std::optional<ImageKind> kind_of(std::string_view word) {
+  if (word == "jpeg") return ImageKind::kJpeg;
+  if (word == "mpeg4") return ImageKind::kMpeg4;
+  if (word == "h264") return ImageKind::kH264;
+  return std::nullopt;
+}
+
+// RTP tells the sides of a JPEG picture in units of 8, in one byte (RFC 2435, 3.1).
+bool rtp_carries(const StreamSettings& stream) {
+  const auto fits = [](int side) { return side % 8 == 0 && side <= 8 * 255; };
+  return kind_of(stream.codec) != ImageKind::kJpeg || (fits(stream.width) && fits(stream.height));
+}
+
 // Null for a stream that the camera lacks or has switched off.
-std::unique_ptr<PictureSource> open_drawn(const CameraState& state, int number) {
-  const auto stream = stream_settings(state.settings, number);
-  if (!stream || stream->codec != "h264") return nullptr;
-  const std::vector<std::uint8_t> drawn = draw_h264({stream->width, stream->height, stream->frame_rate});
-  const auto clip = std::make_shared<const PacketisedClip>(Clip::from_annex_b(drawn), state.options.max_payload);
-  return std::make_unique<ClipSource>(clip, stream->frame_rate, ClipSource::AtEnd::kStartOver);
+std::unique_ptr<PictureSource> open_made(const std::optional<StreamSettings>& stream) {
+  const auto codec = stream ? kind_of(stream->codec) : std::nullopt;
+  if (!codec) return nullptr;
+  return std::make_unique<DrawnSource>(*codec, DrawnVideo{stream->width, stream->height, stream->frame_rate});
 }
 
 }  // namespace
@@ -60,7 +72,9 @@ std::optional<StreamPlan> plan_stream(const CameraState& state, int number) {
     return StreamPlan{std::move(clip)};
   }
   if (!options.profile) return StreamPlan{};
-  StreamPlan plan{open_drawn(state, number)};
+  const auto stream = stream_settings(state.settings, number);
+  if (!stream || !rtp_carries(*stream)) return std::nullopt;
+  StreamPlan plan{open_made(stream)};
   if (!plan.source) return std::nullopt;
   return plan;
 }
@@ -70,7 +84,7 @@ std::unique_ptr<PictureSource> plan_images(const CameraState& state, int number)
   if (options.images) {
     return std::make_unique<ClipSource>(options.images, options.frames_per_second, at_end_of(options));
   }
-  return options.profile ? open_drawn(state, number) : nullptr;
+  return options.profile ? open_made(stream_settings(state.settings, number)) : nullptr;
 }
 
 std::string present_user_data(const CameraState& state) {

@@ -43,6 +43,27 @@ TEST(StreamPlan, FollowsTheSettingsOfTheStream) {
   EXPECT_EQ(plan_images(camera.state, 3), nullptr) << "not there";
 }
 
+TEST(StreamPlan, DrawsInEveryCodecOfTheSettings) {
+  IdleCamera camera(of_profile("LMX-H100"));
+  const struct {
+    const char* command;
+    ImageKind codec;
+  } cases[] = {{"ImageCodec1=jpeg&ImageSize1=640,368&FrameRate1=5&Quality1=5", ImageKind::kJpeg},
+               {"ImageCodec1=mpeg4&ImageSize1=640,368&FrameRate1=5&BitRate1=512", ImageKind::kMpeg4},
+               {"ImageCodec1=h264&ImageSize1=640,368&FrameRate1=5&BitRate1=512", ImageKind::kH264}};
+  for (const auto& c : cases) {
+    ASSERT_TRUE(camera.state.settings.apply("camera", c.command)) << c.command;
+    const auto plan = plan_stream(camera.state, 1);
+    ASSERT_TRUE(plan && plan->source) << c.command;
+    const auto images = plan_images(camera.state, 1);
+    ASSERT_NE(images, nullptr) << c.command;
+    for (const PictureSource* source : {plan->source.get(), images.get()}) {
+      EXPECT_EQ(source->format().codec, c.codec) << c.command;
+      EXPECT_EQ(source->format().frames_per_second, 5) << c.command;
+    }
+  }
+}
+
 TEST(StreamPlan, WithoutAProfileIsTheClip) {
   CameraOptions options;
   IdleCamera silent(options);
