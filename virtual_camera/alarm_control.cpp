@@ -40,7 +40,7 @@ constexpr Switch kSwitches[] = {{"lens", AlarmEvent::Kind::kLens, "cover", "free
 
 std::optional<AlarmEvent> switched(const Switch& by, std::string_view word, int number) {
   if (word != by.on && word != by.off) return std::nullopt;
-  return AlarmEvent{{}, by.kind, number, word == by.on ? 1 : 0};
+  return AlarmEvent{by.kind, number, word == by.on ? 1 : 0};
 }
 
 std::optional<AlarmEvent> event_of(const std::vector<std::string_view>& steps) {
@@ -53,7 +53,7 @@ std::optional<AlarmEvent> event_of(const std::vector<std::string_view>& steps) {
   if (steps[0] == kContact.name) return switched(kContact, steps[2], *number);
   const std::optional<int> value = number_of(steps[2]);
   if (steps[0] != "motion" || !value) return std::nullopt;
-  return AlarmEvent{{}, AlarmEvent::Kind::kMotion, *number, *value};
+  return AlarmEvent{AlarmEvent::Kind::kMotion, *number, *value};
 }
 
 }  // namespace
@@ -66,15 +66,21 @@ struct AlarmControl::Visit {
   std::string request;
 };
 
-std::optional<std::vector<AlarmEvent>> control_events(std::string_view path) {
-  if (path == "/walk") return intruder();
-  const std::optional<AlarmEvent> event = event_of(steps_of(path));
-  if (!event) return std::nullopt;
-  return std::vector<AlarmEvent>{*event};
+std::optional<AlarmEvent> control_event(std::string_view path) { return event_of(steps_of(path)); }
+
+std::optional<std::chrono::seconds> control_walk(std::string_view path) {
+  constexpr std::chrono::seconds kUsual{10};
+  constexpr int kLongest = 3600;
+  const std::vector<std::string_view> steps = steps_of(path);
+  if (steps.empty() || steps.size() > 2 || steps[0] != "walk") return std::nullopt;
+  if (steps.size() == 1) return kUsual;
+  const std::optional<int> seconds = number_of(steps[1]);
+  if (!seconds || *seconds < 1 || *seconds > kLongest) return std::nullopt;
+  return std::chrono::seconds(*seconds);
 }
 
 AlarmControl::AlarmControl(std::shared_ptr<CameraState> state)
-    : state_(std::move(state)), acceptor_(state_->context), pace_(state_->context) {}
+    : state_(std::move(state)), acceptor_(state_->context), watch_(std::make_shared<IntruderWatch>(state_)) {}
 
 asio::error_code AlarmControl::open(std::uint16_t port) {
   asio::error_code error;
@@ -95,7 +101,7 @@ asio::error_code AlarmControl::open(std::uint16_t port) {
 void AlarmControl::close() {
   asio::error_code ignored;
   acceptor_.close(ignored);
-  pace_.cancel();
+  watch_->stop();
 }
 
 void AlarmControl::accept() {
@@ -124,25 +130,15 @@ void AlarmControl::take(const std::shared_ptr<Visit>& visit) {
 
 std::string_view AlarmControl::answer(const std::string& request) {
   const std::optional<RequestHead> head = parse_head(request);
-  const auto events = head ? control_events(head->path) : std::nullopt;
-  if (!events) return "HTTP/1.0 404 Not Found\r\nContent-Length: 0\r\n\r\n";
-  if (events->size() > 1) {
-    play(std::make_shared<std::vector<AlarmEvent>>(*events), 0);
-  } else if (!state_->alarms.happen(events->front())) {
-    return "HTTP/1.0 400 Bad Request\r\nContent-Length: 0\r\n\r\n";
+  if (const auto time = head ? control_walk(head->path) : std::nullopt) {
+    const std::chrono::duration<double, std::milli> at_pace = *time / state_->options.speed;
+    watch_->walk(std::chrono::duration_cast<std::chrono::milliseconds>(at_pace));
+    return "HTTP/1.0 204 No Content\r\n\r\n";
   }
+  const auto event = head ? control_event(head->path) : std::nullopt;
+  if (!event) return "HTTP/1.0 404 Not Found\r\nContent-Length: 0\r\n\r\n";
+  if (!state_->alarms.happen(*event)) return "HTTP/1.0 400 Bad Request\r\nContent-Length: 0\r\n\r\n";
   return "HTTP/1.0 204 No Content\r\n\r\n";
-}
-
-// A walk that begins while another is under way takes its place.
-void AlarmControl::play(const std::shared_ptr<std::vector<AlarmEvent>>& events, std::size_t next) {
-  if (next == events->size()) return;
-  pace_.expires_after((*events)[next].after);
-  pace_.async_wait([self = shared_from_this(), events, next](asio::error_code stopped) {
-    if (stopped) return;
-    self->state_->alarms.happen((*events)[next]);
-    self->play(events, next + 1);
-  });
 }
 
 }  // namespace vexa::camera

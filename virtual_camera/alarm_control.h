@@ -1,22 +1,26 @@
 // The port by which a person or a test makes things happen around a camera, on the loopback address alone:
-//   GET /contact/NUMBER/close or open, /lens/cover or free, /noise/on or off, /motion/WINDOW/VALUE, /walk
+//   GET /contact/NUMBER/close or open, /lens/cover or free, /noise/on or off, /motion/WINDOW/VALUE,
+//   /walk, /walk/SECONDS
 #ifndef VIRTUAL_CAMERA_ALARM_CONTROL_H_
 #define VIRTUAL_CAMERA_ALARM_CONTROL_H_
 
 #include <asio.hpp>
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
-#include <vector>
 
 #include "virtual_camera/camera_state.h"
+#include "virtual_camera/intruder_watch.h"
 
 namespace vexa::camera {
 
-// What a path of the control port asks for; nothing for a path that it does not know.
-[[nodiscard]] std::optional<std::vector<AlarmEvent>> control_events(std::string_view path);
+// What a path of the control port lets happen; nothing for a path that it does not know.
+[[nodiscard]] std::optional<AlarmEvent> control_event(std::string_view path);
+// How long an intruder walks whom a path sends through the scene; nothing for another path.
+[[nodiscard]] std::optional<std::chrono::seconds> control_walk(std::string_view path);
 
 // Lives on the loop's thread.
 class AlarmControl : public std::enable_shared_from_this<AlarmControl> {
@@ -34,11 +38,10 @@ class AlarmControl : public std::enable_shared_from_this<AlarmControl> {
   void accept();
   void take(const std::shared_ptr<Visit>& visit);
   std::string_view answer(const std::string& request);
-  void play(const std::shared_ptr<std::vector<AlarmEvent>>& events, std::size_t next);
 
   std::shared_ptr<CameraState> state_;
   asio::ip::tcp::acceptor acceptor_;
-  asio::steady_timer pace_;
+  std::shared_ptr<IntruderWatch> watch_;
   std::uint16_t port_ = 0;
 };
 

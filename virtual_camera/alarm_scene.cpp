@@ -7,18 +7,6 @@
 
 namespace vexa::camera {
 
-std::vector<AlarmEvent> intruder() {
-  constexpr std::chrono::milliseconds kStay{400};
-  constexpr int kMovement = 60;
-  std::vector<AlarmEvent> events;
-  for (int window = 1; window <= static_cast<int>(AlarmScene::kWindows); ++window) {
-    if (window > 1) events.push_back({kStay, AlarmEvent::Kind::kMotion, window - 1, 0});
-    events.push_back({{}, AlarmEvent::Kind::kMotion, window, kMovement});
-  }
-  events.push_back({kStay, AlarmEvent::Kind::kMotion, static_cast<int>(AlarmScene::kWindows), 0});
-  return events;
-}
-
 void AlarmScene::rearrange(AlarmLayout layout) {
   const std::lock_guard<std::mutex> lock(mutex_);
   layout_ = std::move(layout);
@@ -48,7 +36,8 @@ bool AlarmScene::happen(const AlarmEvent& event) {
       change(motion_[place], event.value);
       return true;
     case AlarmEvent::Kind::kLens:
-      change(covered_, event.value != 0);
+      covered_ = event.value != 0;
+      change(tampered_, covered_);
       return true;
     case AlarmEvent::Kind::kNoise:
       change(noise_, event.value != 0);
@@ -65,7 +54,17 @@ void AlarmScene::switch_detectors(bool tampering, bool audio) {
 
 void AlarmScene::clear_tampering() {
   const std::lock_guard<std::mutex> lock(mutex_);
-  change(covered_, false);
+  change(tampered_, false);
+}
+
+bool AlarmScene::lens_covered() const {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  return covered_;
+}
+
+std::string AlarmScene::detection() const {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  return layout_.detection;
 }
 
 std::string AlarmScene::alarm_part() const {
@@ -97,7 +96,7 @@ std::string AlarmScene::part_locked() const {
     const char* key = layout_.detection == "object" ? "OdWin" : "MdWin";
     for (std::size_t i = 0; i < kWindows; ++i) add(fmt::format("{}{}", key, i + 1), motion_[i] != 0);
   }
-  if (layout_.tampering) add("Tampering", covered_ && tampering_on_);
+  if (layout_.tampering) add("Tampering", tampered_ && tampering_on_);
   if (layout_.audio) add("Audio", noise_ && audio_on_);
   return "--alarm\r\n" + items + "\r\n\r\n";
 }

@@ -4,7 +4,6 @@
 #define VIRTUAL_CAMERA_ALARM_SCENE_H_
 
 #include <array>
-#include <chrono>
 #include <cstddef>
 #include <functional>
 #include <mutex>
@@ -22,18 +21,14 @@ struct AlarmLayout {
   bool audio = true;
 };
 
-// One thing that happens, `after` the one before it.
+// One thing that happens.
 struct AlarmEvent {
   enum class Kind { kContact, kLens, kNoise, kMotion };
 
-  std::chrono::milliseconds after{0};
   Kind kind = Kind::kContact;
   int number = 1;  // of the contact or window
   int value = 0;   // 0: open, free, quiet, still
 };
-
-// Somebody who walks through the windows from the first to the last.
-[[nodiscard]] std::vector<AlarmEvent> intruder();
 
 // Thread-safe. Every change that happens makes one part; what stays as it is makes none.
 class AlarmScene {
@@ -54,6 +49,9 @@ class AlarmScene {
   void switch_detectors(bool tampering, bool audio);
   // The camera forgets the tampering alarm until the lens is covered anew.
   void clear_tampering();
+  [[nodiscard]] bool lens_covered() const;
+  // The kind of detection that the layout names.
+  [[nodiscard]] std::string detection() const;
 
   [[nodiscard]] std::string alarm_part() const;
   [[nodiscard]] std::string metadata_part() const;
@@ -71,6 +69,7 @@ class AlarmScene {
   std::vector<int> contacts_;
   std::array<int, kWindows> motion_{};
   bool covered_ = false;
+  bool tampered_ = false;
   bool noise_ = false;
   bool tampering_on_ = false;
   bool audio_on_ = false;

@@ -18,6 +18,7 @@
 #include "virtual_camera/journal.h"
 #include "virtual_camera/options.h"
 #include "virtual_camera/request_faults.h"
+#include "virtual_camera/scene_stage.h"
 #include "virtual_camera/sent_log.h"
 #include "virtual_camera/settings_store.h"
 
@@ -52,6 +53,7 @@ struct CameraState {
   std::string profile_error;  // empty: none
   asio::io_context& context;
   AlarmScene alarms;
+  SceneStage stage;
   PoseSource pose;  // empty: the camera does not know where it looks
   SettingsStore settings;
   Journal journal;

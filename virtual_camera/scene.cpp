@@ -174,7 +174,7 @@ void draw_mark(Sheet& sheet, const PresetMark& mark) {
   const int row = sheet.row(mark.tilt);
   const int width = (kLetterPitch * static_cast<int>(number.size()) + 3) * dot;
   const int top = row - 26 * dot;
-  sheet.painter.fill({column - dot / 2, top, std::max(dot, 2), 26 * dot}, kFlag);
+  sheet.painter.fill({column - dot / 2, top, std::max(dot, 2), 26 * dot + 1}, kFlag);
   sheet.painter.fill({column, top, width, (kLetterHeight + 4) * dot}, kFlag);
   sheet.painter.write(number, column + 2 * dot, top + 2 * dot, dot, kDark);
 }

@@ -40,7 +40,7 @@ class AlarmsOfACamera : public testing::Test {
     box.inputCount = 2;
     box.videoDetection = box.tamperingDetection = box.audioDetection = true;
   }
-  void happen(Kind kind, int number, int value) { ASSERT_TRUE(camera_->alarms().happen({{}, kind, number, value})); }
+  void happen(Kind kind, int number, int value) { ASSERT_TRUE(camera_->alarms().happen({kind, number, value})); }
 
   /// The states of the next status call: input 1, input 2, detection, tampering, audio.
   std::vector<int> next_states() {
@@ -149,8 +149,9 @@ TEST_F(AlarmsOfACamera, ComeFromTheControlPort) {
 
 TEST_F(AlarmsOfACamera, ComeFromNoOtherPath) {
   start();
-  for (const char* path : {"/", "/contact", "/contact/1", "/contact/1/closed", "/contact/x/close", "/lens/1/cover",
-                           "/motion/1/x", "/noise", "/command/main.cgi", "/contact/1/close/again"}) {
+  for (const char* path :
+       {"/", "/contact", "/contact/1", "/contact/1/closed", "/contact/x/close", "/lens/1/cover", "/motion/1/x",
+        "/noise", "/command/main.cgi", "/contact/1/close/again", "/walk/0", "/walk/3601", "/walk/fast", "/walk/1/2"}) {
     EXPECT_EQ(ask_control(path), "404") << path;
   }
   for (const char* path : {"/contact/0/close", "/contact/3/close", "/contact/-1/open", "/motion/0/1", "/motion/5/1"}) {
@@ -161,7 +162,7 @@ TEST_F(AlarmsOfACamera, ComeFromNoOtherPath) {
 TEST_F(AlarmsOfACamera, FollowAnIntruderThroughTheWindows) {
   start();
   ASSERT_EQ(driver_.StartModRawData(), LIBD_OK);
-  EXPECT_EQ(ask_control("/walk"), "204");
+  EXPECT_EQ(ask_control("/walk/40"), "204");  // two seconds at this camera's pace
   SLibDRawMDFrameInfo frame;
   for (std::int32_t SLibDRawMDFrameInfo::*window : {&SLibDRawMDFrameInfo::window1, &SLibDRawMDFrameInfo::window2,
                                                     &SLibDRawMDFrameInfo::window3, &SLibDRawMDFrameInfo::window4}) {
@@ -169,6 +170,50 @@ TEST_F(AlarmsOfACamera, FollowAnIntruderThroughTheWindows) {
   }
   EXPECT_TRUE(eventually([&] { return driver_.GetCurrentPosition(frame) == LIBD_OK && frame.window4 == 0; }));
   EXPECT_EQ(driver_.StopModRawData(), LIBD_OK);
+}
+
+TEST_F(AlarmsOfACamera, FollowAnIntruderThroughTheAreasThatTheHostSets) {
+  start();
+  driver_.m_UseMotionDetection = false;
+  driver_.SetVMDtype(LIBD_VMD_WINDOW);
+  SLibDDetectionParam param;
+  param.number = 99;
+  for (SLibDDetectionWindow& window : param.windows) window.area = {{0, 0}, {0, 0}};
+  param.windows[1].enabled = 1;
+  param.windows[1].mode = 0;
+  param.windows[1].area = {{6000, 0}, {10000, 10000}};  // the right side, above ground
+  param.windows[2] = param.windows[1];
+  param.windows[2].area = {{0, 0}, {10000, 1000}};  // higher than anybody walks
+  ASSERT_EQ(driver_.SetDetectionParam(param), LIBD_OK);
+  ASSERT_EQ(driver_.StartModRawData(), LIBD_OK);
+  EXPECT_EQ(ask_control("/walk/10"), "204");
+  SLibDRawMDFrameInfo frame;
+  int others = 0;
+  const auto second_window_is = [&](bool moving) {
+    return eventually([&] {
+      if (driver_.GetCurrentPosition(frame) != LIBD_OK) return false;
+      others += frame.window1 + frame.window3 + frame.window4;
+      return (frame.window2 > 0) == moving;
+    });
+  };
+  EXPECT_TRUE(second_window_is(false)) << "the walk begins at the left";
+  EXPECT_TRUE(second_window_is(true));
+  EXPECT_TRUE(second_window_is(false));
+  EXPECT_EQ(others, 0);
+}
+
+TEST_F(AlarmsOfACamera, SeeNobodyThroughACoveredLens) {
+  start();
+  ASSERT_EQ(driver_.StartModRawData(), LIBD_OK);
+  EXPECT_EQ(ask_control("/walk/3600"), "204");
+  SLibDRawMDFrameInfo frame;
+  const auto moving = [&] { return driver_.GetCurrentPosition(frame) == LIBD_OK && frame.window1 > 0; };
+  const auto still = [&] { return driver_.GetCurrentPosition(frame) == LIBD_OK && frame.window1 == 0; };
+  EXPECT_TRUE(eventually(moving));
+  EXPECT_EQ(ask_control("/lens/cover"), "204");
+  EXPECT_TRUE(eventually(still));
+  EXPECT_EQ(ask_control("/lens/free"), "204");
+  EXPECT_TRUE(eventually(moving));
 }
 
 TEST_F(AlarmsOfACamera, OfMotionFollowTheKindOfDetection) {

@@ -16,7 +16,7 @@ class AlarmsByCommand : public WithCamera {
     options.speed = 10;
     start_camera(options);
   }
-  void happen(Kind kind, int number, int value) { ASSERT_TRUE(camera().alarms().happen({{}, kind, number, value})); }
+  void happen(Kind kind, int number, int value) { ASSERT_TRUE(camera().alarms().happen({kind, number, value})); }
 
   bool was_asked(const std::string& text) {
     for (const auto& request : camera().journal().snapshot()) {
