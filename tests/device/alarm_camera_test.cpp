@@ -186,7 +186,7 @@ TEST_F(AlarmsOfACamera, FollowAnIntruderThroughTheAreasThatTheHostSets) {
   param.windows[2].area = {{0, 0}, {10000, 1000}};  // higher than anybody walks
   ASSERT_EQ(driver_.SetDetectionParam(param), LIBD_OK);
   ASSERT_EQ(driver_.StartModRawData(), LIBD_OK);
-  EXPECT_EQ(ask_control("/walk/10"), "204");
+  EXPECT_EQ(ask_control("/walk/30"), "204");
   SLibDRawMDFrameInfo frame;
   int others = 0;
   const auto second_window_is = [&](bool moving) {
