@@ -1,5 +1,6 @@
 // What the camera says it is.
-#include <utility>
+#include <cerrno>
+#include <new>
 
 #include "runtime/base/sync.h"
 #include "runtime/base/text.h"
@@ -17,22 +18,32 @@ void take_value(std::string_view answer, std::string_view key, std::string& text
 
 }  // namespace
 
-ELibDReturnCode CVexaCommon::GetFixedSystemInfo(SLibDFixedSystemInfo& info) {
+// Safe: here and below, what memory does not hold is a failure and not an exception.
+ELibDReturnCode CVexaCommon::GetFixedSystemInfo(SLibDFixedSystemInfo& info) try {
   info = m_FixedSystemInfo;
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
-ELibDReturnCode CVexaCommon::GetFixedConnectionInfo(SLibDFixedConnectionInfo& info) {
+ELibDReturnCode CVexaCommon::GetFixedConnectionInfo(SLibDFixedConnectionInfo& info) try {
   info = m_FixedConnectionInfo;
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
-ELibDReturnCode CVexaCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) {
+ELibDReturnCode CVexaCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) try {
   std::string answer;
   if (SendInqCommand("system", answer) != LIBD_OK) return LatestErrorCode();
   GetCommonSystemInfo(info, answer);
   if (SendInqCommand("network", answer) != LIBD_OK) return LatestErrorCode();
   return GetCommonNetworkInfo(info, answer);
+} catch (const std::bad_alloc&) {
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
 ELibDReturnCode CVexaCommon::GetCommonSystemInfo(SLibDSystemInfo& info, const std::string& answer) {
