@@ -96,10 +96,12 @@ TEST(InputPart, Window1SetsTheValueAndOthersOnlyRaiseIt) {
 }
 
 TEST(InputPart, ComparesTheOtherWindowsWithTheLastSensorsValue) {
-  expect_all({{"Sensor1=1&OdWin2=0", kOdWindows, 0b11, 0b11},
-              {"Sensor1=0&OdWin2=0", kOdWindows, 0b11, 0b00},
-              {"Sensor1=1&OdWin1=0", kOdWindows, 0b11, 0b01},
-              {"Sensor2=-1&OdWin2=x&OdWin3=-4", kOdWindows, 0b110, 0xfffffffeU}});
+  expect_all(
+      {{"Sensor1=1&OdWin2=0", kOdWindows, 0b11, 0b11},
+       {"Sensor1=0&OdWin2=0", kOdWindows, 0b11, 0b00},
+       {"Sensor1=1&OdWin1=0", kOdWindows, 0b11, 0b01},
+       {"Sensor2=-1&MdWin2=x&MdWin3=-4", kMdWindows, 0b11, 0xfffffffeU},  // raised to 0 by the one without a value
+       {"Sensor2=-1&MdWin2=-2&MdWin3=-4", kMdWindows, 0b11, 0xffffffffU}});
 }
 
 TEST(InputPart, NeedsOneWholeWindow) {
