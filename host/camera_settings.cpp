@@ -18,15 +18,8 @@ Json size_or_null(int width, int height) {
 
 Json number_or_null(int number) { return number > 0 ? Json(number) : Json(nullptr); }
 
-// A failed exchange leaves its reason in the driver; an answer that lacks a key leaves none. A failure ends the
-// command, so that no earlier one's reason is in the way.
-bool left_a_reason(CLibraryDevice& device) {
-  std::string text;
-  device.GetLatestErrorText(text);
-  return !text.empty();
-}
-
-// Asks getters and keeps the first failure that is more than a setting which the camera does not report.
+// Asks getters and keeps the first failure that is more than a setting which the camera does not report. A failure ends
+// the command, so that no earlier one's reason is in the way.
 class SettingReader {
  public:
   explicit SettingReader(CLibraryDevice& device) : device_(device) {}

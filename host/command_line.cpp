@@ -22,6 +22,7 @@ Start here:
   vexactl set 192.168.0.100 codec=H.264 size=1280x720 --credentials camera.cred
   vexactl info 192.168.0.100 --credentials camera.cred --cgi-log cgi.log
   vexactl log cgi.log
+  vexactl ptz 192.168.0.100 goto -45 10 --zoom 4 --credentials camera.cred
   where the first line of camera.cred is USER:PASSWORD.
   vexactl COMMAND --help lists the options of a command.
 
@@ -52,6 +53,10 @@ std::vector<std::unique_ptr<Command>> all_commands() {
   commands.push_back(make_exposure_command());
   commands.push_back(make_daynight_command());
   commands.push_back(make_profile_command());
+  commands.push_back(make_ptz_command());
+  commands.push_back(make_preset_command());
+  commands.push_back(make_tour_command());
+  commands.push_back(make_shadow_command());
   commands.push_back(make_io_command());
   commands.push_back(make_output_command());
   commands.push_back(make_watch_command());
@@ -85,11 +90,20 @@ std::string text_of(const CLI::ParseError& error) {
   const bool names_options_only = is(error, CLI::ExitCodes::RequiredError) ||
                                   is(error, CLI::ExitCodes::ArgumentMismatch) ||
                                   is(error, CLI::ExitCodes::ExcludesError);
+  if (text == "A subcommand is required") return "the action is missing, or not one of the command's";
   if (names_options_only) return text;
   const std::string_view kConversion = "Could not convert: ";
   if (!text.starts_with(kConversion)) return "an option's value cannot be used";
   return fmt::format("the value of {} cannot be used",
                      text.substr(kConversion.size(), text.find(" = ") - kConversion.size()));
+}
+
+// "ptz CAMERA pan": the command, with its action where one was given.
+std::string words_of(const CLI::App* command) {
+  const auto actions = command->get_subcommands();
+  if (actions.empty()) return command->get_name();
+  const bool of_camera = command->get_option_no_throw("--camera") != nullptr;
+  return fmt::format("{}{} {}", command->get_name(), of_camera ? " CAMERA" : "", actions.front()->get_name());
 }
 
 ExitCode on_parse_error(const CLI::ParseError& error, const CLI::App& program, Terminal& terminal) {
@@ -102,7 +116,7 @@ ExitCode on_parse_error(const CLI::ParseError& error, const CLI::App& program, T
     return terminal.report(
         {ExitCode::kUsage, "the first argument is not a command", "See vexactl --help for the commands."});
   }
-  const std::string help = fmt::format("See vexactl {} --help.", chosen.front()->get_name());
+  const std::string help = fmt::format("See vexactl {} --help.", words_of(chosen.front()));
   if (is(error, CLI::ExitCodes::ExtrasError)) return terminal.report(not_understood(program.remaining(true), help));
   return terminal.report({ExitCode::kUsage, text_of(error), help});
 }

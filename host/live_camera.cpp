@@ -60,6 +60,12 @@ Result<LiveCamera::Identity> LiveCamera::identify(int stream) {
   return identity;
 }
 
+bool left_a_reason(CLibraryDevice& device) {
+  std::string text;
+  device.GetLatestErrorText(text);
+  return !text.empty();
+}
+
 Problem explain_failure(CLibraryDevice& device, ELibDReturnCode result, const CameraConnection& connection) {
   std::string text;
   device.GetLatestErrorText(text);

@@ -26,6 +26,9 @@ void introduce(CLibraryDevice& device, const CameraConnection& connection);
 [[nodiscard]] Problem explain_failure(CLibraryDevice& device, ELibDReturnCode result,
                                       const CameraConnection& connection);
 
+// Whether the latest failure has a text: a failed exchange leaves one, an answer that lacks a key none.
+[[nodiscard]] bool left_a_reason(CLibraryDevice& device);
+
 // A model class for a camera that streams H.264 over RTSP/RTP.
 class LiveCamera final : public CVexaCommon {
  public:

@@ -1,0 +1,51 @@
+#include "host/commands/action_group.h"
+
+#include <fmt/format.h>
+
+#include "host/printable.h"
+
+namespace vexa::host {
+
+CLI::App* ActionGroup::declare(CLI::App& program, const char* const* environment) {
+  CLI::App* command = program.add_subcommand(text_.name, text_.description);
+  read_environment(options_.camera.credentials, environment);
+  add_model_options(*command, options_);
+  command->require_subcommand(1);
+  command->footer(text_.footer);
+  // The camera's options may stand behind the action too.
+  for (const auto& action : actions_) declared_.push_back(action->declare(*command)->fallthrough());
+  return command;
+}
+
+ExitCode ActionGroup::run(Terminal& terminal) {
+  CameraAction& action = chosen();
+  action.set_json(options_.camera.json);
+  if (const auto problem = action.check()) return terminal.report(*problem);
+  const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
+  if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
+  const auto& camera = std::get<ModelCamera>(opened);
+  if (const auto problem = check_model_(camera)) return terminal.report(*problem);
+  return action.run(camera, terminal);
+}
+
+CameraAction& ActionGroup::chosen() const {
+  std::size_t place = 0;
+  while (place + 1 < declared_.size() && !declared_[place]->parsed()) ++place;
+  return *actions_[place];
+}
+
+Problem model_lacks(const ModelCamera& camera, const std::string& part) {
+  const Profile& profile = camera.profile();
+  if (profile.name.empty()) {
+    return usage(fmt::format("no profile says what cameras of model {} can do", printable(profile.model)),
+                 "Name one with --profile; vexactl profile list shows those installed.");
+  }
+  return usage(fmt::format("cameras of model {} have no {}", printable(profile.model), part),
+               "vexactl profile show tells what a model has.");
+}
+
+ExitCode report_change(const ModelCamera& camera, Terminal& terminal, const std::string& what, ELibDReturnCode result) {
+  return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera.explain_change(what, result));
+}
+
+}  // namespace vexa::host

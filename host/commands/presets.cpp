@@ -1,0 +1,139 @@
+// vexactl preset: a camera's stored positions. They are counted from 1, as on the camera and in its tours.
+#include <fmt/format.h>
+
+#include <nlohmann/json.hpp>
+
+#include "host/commands/action_group.h"
+#include "host/printable.h"
+#include "host/result_output.h"
+
+namespace vexa::host {
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+std::optional<Problem> check_presets(const ModelCamera& camera) {
+  if (camera.profile().control.presetCount > 0) return std::nullopt;
+  return model_lacks(camera, "presets");
+}
+
+// An action on one preset.
+class OnePresetAction : public CameraAction {
+ public:
+  std::optional<Problem> check() override {
+    if (number_ >= 1) return std::nullopt;
+    return usage("presets are counted from 1", "vexactl preset CAMERA list shows them.");
+  }
+
+  ExitCode run(const ModelCamera& camera, Terminal& terminal) final {
+    const int count = camera.profile().control.presetCount;
+    if (number_ > count) {
+      return terminal.report(
+          usage(fmt::format("the camera has no preset {}", number_), fmt::format("It has presets 1 to {}.", count)));
+    }
+    return report_change(camera, terminal, fmt::format("preset {}", number_), act(camera.device(), number_ - 1));
+  }
+
+ protected:
+  void declare_number(CLI::App& action) {
+    action.add_option("number", number_, "of the preset, counted from 1")->required()->type_name("");
+  }
+  // `index` is the driver's, counted from 0.
+  virtual ELibDReturnCode act(CLibraryDevice& device, int index) = 0;
+
+ private:
+  int number_ = 0;
+};
+
+class SetPresetAction final : public OnePresetAction {
+ public:
+  CLI::App* declare(CLI::App& group) override {
+    CLI::App* action = group.add_subcommand("set", "Store where the camera looks now");
+    declare_number(*action);
+    action->add_option("name", name_, "of the preset")->required()->type_name("");
+    return action;
+  }
+  std::optional<Problem> check() override {
+    if (name_.empty()) return usage("a preset needs a name", "For instance: vexactl preset CAMERA set 3 Gate.");
+    return OnePresetAction::check();
+  }
+
+ private:
+  ELibDReturnCode act(CLibraryDevice& device, int index) override {
+    SLibDPresetInfo preset;
+    preset.index = index;
+    preset.name = name_;
+    return device.SetPreset(preset);
+  }
+
+  std::string name_;
+};
+
+class RecallPresetAction final : public OnePresetAction {
+ public:
+  CLI::App* declare(CLI::App& group) override {
+    CLI::App* action = group.add_subcommand("recall", "Go to a stored position");
+    declare_number(*action);
+    return action;
+  }
+
+ private:
+  ELibDReturnCode act(CLibraryDevice& device, int index) override { return device.RecallPreset(index); }
+};
+
+class ClearPresetAction final : public OnePresetAction {
+ public:
+  CLI::App* declare(CLI::App& group) override {
+    CLI::App* action = group.add_subcommand("clear", "Forget a stored position");
+    declare_number(*action);
+    return action;
+  }
+
+ private:
+  ELibDReturnCode act(CLibraryDevice& device, int index) override { return device.ClearPreset(index); }
+};
+
+class ListPresetsAction final : public CameraAction {
+ public:
+  CLI::App* declare(CLI::App& group) override {
+    CLI::App* action = group.add_subcommand("list", "Show the stored positions");
+    action->add_flag("--all", all_, "those without a name too");
+    return action;
+  }
+
+  ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
+    std::vector<SLibDPresetInfo> presets;
+    const ELibDReturnCode result = camera.device().GetPresets(presets);
+    // A camera that names no preset is no failure; the driver leaves the list unnamed.
+    if (result != LIBD_OK && !(result == LIBD_FAILED && !left_a_reason(camera.device()))) {
+      return terminal.report(camera.explain(result));
+    }
+    Json list = Json::array();
+    std::string table;
+    for (const SLibDPresetInfo& preset : presets) {
+      if (preset.name.empty() && !all_) continue;
+      list.push_back({{"preset", preset.index + 1}, {"name", preset.name}});
+      table += fmt::format("{:>3}  {}\n", preset.index + 1, preset.name.empty() ? "-" : printable(preset.name));
+    }
+    return write_result(terminal, json() ? to_text(list) : table);
+  }
+
+ private:
+  bool all_ = false;
+};
+
+}  // namespace
+
+std::unique_ptr<Command> make_preset_command() {
+  std::vector<std::unique_ptr<CameraAction>> actions;
+  actions.push_back(std::make_unique<ListPresetsAction>());
+  actions.push_back(std::make_unique<SetPresetAction>());
+  actions.push_back(std::make_unique<RecallPresetAction>());
+  actions.push_back(std::make_unique<ClearPresetAction>());
+  constexpr ActionGroupText kText{"preset", "Show, store, recall and clear a camera's positions",
+                                  "For instance:\n  vexactl preset 192.168.0.100 set 3 Gate\n"
+                                  "  vexactl preset 192.168.0.100 recall 3"};
+  return std::make_unique<ActionGroup>(kText, check_presets, std::move(actions));
+}
+
+}  // namespace vexa::host

@@ -1,0 +1,165 @@
+// vexactl shadow: movements that a camera records while somebody moves it, and plays back.
+#include <fmt/format.h>
+
+#include <charconv>
+#include <nlohmann/json.hpp>
+
+#include "host/commands/action_group.h"
+#include "host/result_output.h"
+
+namespace vexa::host {
+namespace {
+
+using Json = nlohmann::ordered_json;
+
+constexpr int kLongestResume = 9999;  // seconds
+constexpr char kShadowTours[] = "shadow tours";
+
+std::optional<Problem> check_shadow_tours(const ModelCamera& camera) {
+  if (camera.profile().control.shadowTourCount > 0) return std::nullopt;
+  return model_lacks(camera, kShadowTours);
+}
+
+class ShowShadowsAction final : public CameraAction {
+ public:
+  CLI::App* declare(CLI::App& group) override { return group.add_subcommand("show", "Show the camera's shadow tours"); }
+
+  ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
+    SLibDShadowTourInfo info;
+    const ELibDReturnCode result = camera.device().GetShadowTourInfo(info);
+    if (result != LIBD_OK) return terminal.report(camera.explain(result));
+    return write_result(terminal, json() ? to_text(json_of(info)) : table_of(info));
+  }
+
+ private:
+  static std::string table_of(const SLibDShadowTourInfo& info) {
+    std::string text =
+        fmt::format("Shadow tours are {}; {}; the longest recording is {} s\n", info.enabled ? "on" : "off",
+                    info.resumeTime > 0 ? fmt::format("resumed after {} s", info.resumeTime)
+                                        : std::string("not resumed after a move by hand"),
+                    info.maxRecordTime);
+    for (const auto& [number, tour] : info.tours) {
+      text += fmt::format("{}  {:<3}  {:>4} s recorded\n", number, tour.enabled ? "on" : "off", tour.recordedTime);
+    }
+    return text;
+  }
+
+  static Json json_of(const SLibDShadowTourInfo& info) {
+    Json tours = Json::array();
+    for (const auto& [number, tour] : info.tours) {
+      tours.push_back({{"tour", number}, {"enabled", tour.enabled}, {"recorded-time", tour.recordedTime}});
+    }
+    return {{"enabled", info.enabled},
+            {"resume-seconds", info.resumeTime > 0 ? Json(info.resumeTime) : Json(nullptr)},
+            {"longest-recording", info.maxRecordTime},
+            {"tours", tours}};
+  }
+};
+
+class ResumeShadowsAction final : public CameraAction {
+ public:
+  CLI::App* declare(CLI::App& group) override {
+    CLI::App* action = group.add_subcommand("resume", "Say when a shadow tour goes on after a move by hand");
+    action->add_option("seconds", seconds_, "until it goes on; 0: it does not")
+        ->required()
+        ->type_name("")
+        ->check(CLI::Range(0, kLongestResume));
+    return action;
+  }
+
+  ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
+    SLibDShadowTourInfo info;
+    const ELibDReturnCode read = camera.device().GetShadowTourInfo(info);
+    if (read != LIBD_OK) return terminal.report(camera.explain(read));
+    info.resumeTime = seconds_;
+    return report_change(camera, terminal, kShadowTours, camera.device().SetShadowTourInfo(info));
+  }
+
+ private:
+  int seconds_ = 0;
+};
+
+using StartShadow = ELibDReturnCode (CLibraryDevice::*)(int);
+using StopShadow = ELibDReturnCode (CLibraryDevice::*)();
+
+// An action that is begun with a number and ended without.
+struct ShadowWords {
+  const char* name;
+  const char* description;
+  StartShadow start;
+  StopShadow stop;  // null: the action does not end with "stop" behind it
+};
+
+class ShadowAction final : public CameraAction {
+ public:
+  explicit ShadowAction(ShadowWords words) : words_(words) {}
+
+  CLI::App* declare(CLI::App& group) override {
+    CLI::App* action = group.add_subcommand(words_.name, words_.description);
+    action
+        ->add_option("number", word_,
+                     words_.stop != nullptr ? "of the shadow tour, counted from 1, or stop"
+                                            : "of the shadow tour, counted from 1")
+        ->required()
+        ->type_name("");
+    return action;
+  }
+
+  std::optional<Problem> check() override {
+    if (stops()) return std::nullopt;
+    const auto [end, error] = std::from_chars(word_.data(), word_.data() + word_.size(), number_);
+    if (error == std::errc() && end == word_.data() + word_.size() && number_ >= 1) return std::nullopt;
+    return usage("shadow tours are counted from 1", "vexactl shadow CAMERA show shows them.");
+  }
+
+  ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
+    CLibraryDevice& device = camera.device();
+    if (stops()) return report_change(camera, terminal, kShadowTours, (device.*words_.stop)());
+    const int count = camera.profile().control.shadowTourCount;
+    if (number_ > count) {
+      return terminal.report(usage(fmt::format("the camera has no shadow tour {}", number_),
+                                   fmt::format("It has shadow tours 1 to {}.", count)));
+    }
+    return report_change(camera, terminal, kShadowTours, (device.*words_.start)(number_));
+  }
+
+ private:
+  [[nodiscard]] bool stops() const { return words_.stop != nullptr && word_ == "stop"; }
+
+  ShadowWords words_;
+  std::string word_;
+  int number_ = 0;
+};
+
+class StopShadowAction final : public CameraAction {
+ public:
+  CLI::App* declare(CLI::App& group) override { return group.add_subcommand("stop", "End the shadow tour under way"); }
+  ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
+    return report_change(camera, terminal, kShadowTours, camera.device().StopShadowTour());
+  }
+};
+
+}  // namespace
+
+std::unique_ptr<Command> make_shadow_command() {
+  constexpr ShadowWords kRecord{"record", "Record what moves the camera from now on, or stop recording",
+                                &CLibraryDevice::StartRecordShadowTour, &CLibraryDevice::StopRecordShadowTour};
+  constexpr ShadowWords kPreview{"preview", "Play a recording once, or stop that",
+                                 &CLibraryDevice::StartPreviewShadowTour, &CLibraryDevice::StopPreviewShadowTour};
+  constexpr ShadowWords kStart{"start", "Play a shadow tour over and over", &CLibraryDevice::StartShadowTour, nullptr};
+  std::vector<std::unique_ptr<CameraAction>> actions;
+  actions.push_back(std::make_unique<ShowShadowsAction>());
+  actions.push_back(std::make_unique<ShadowAction>(kRecord));
+  actions.push_back(std::make_unique<ShadowAction>(kPreview));
+  actions.push_back(std::make_unique<ShadowAction>(kStart));
+  actions.push_back(std::make_unique<StopShadowAction>());
+  actions.push_back(std::make_unique<ResumeShadowsAction>());
+  constexpr ActionGroupText kText{"shadow", "Record, preview, start and stop a camera's shadow tours",
+                                  "For instance:\n  vexactl shadow 192.168.0.100 record 1\n"
+                                  "  vexactl ptz 192.168.0.100 pan left --for 5\n"
+                                  "  vexactl shadow 192.168.0.100 record stop\n"
+                                  "  vexactl shadow 192.168.0.100 start 1"};
+  return std::make_unique<ActionGroup>(kText, check_shadow_tours, std::move(actions));
+}
+
+}  // namespace vexa::host
