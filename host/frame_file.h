@@ -3,8 +3,10 @@
 #define HOST_FRAME_FILE_H_
 
 #include <cstddef>
+#include <cstdint>
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "host/problem.h"
 #include "host/unique_fd.h"
@@ -32,6 +34,9 @@ class FrameFile {
   int given_fd_ = -1;
   UniqueFd file_;
 };
+
+// A whole file at once; a former one is replaced.
+[[nodiscard]] std::optional<Problem> write_whole_file(const std::string& path, const std::vector<std::uint8_t>& bytes);
 
 }  // namespace vexa::host
 

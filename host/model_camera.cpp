@@ -51,7 +51,7 @@ Result<ModelCamera> ModelCamera::open(const ModelOptions& options, Terminal& ter
   SLibDSystemInfo system;
   const ELibDReturnCode result = asked.driver->GetCurrentSystemInfo(system);
   if (result != LIBD_OK) return asked.driver->explain(result);
-  ModelCamera camera(std::move(asked.trace), asked.driver->connection(), options.stream);
+  ModelCamera camera(std::move(asked), options.stream);
   if (auto problem = camera.find_profile(options, system.modelName)) return *std::move(problem);
   camera.device_ = MakeDevice(camera.profile_);
   if (!camera.device_) return Problem{ExitCode::kUsage, "there is not enough memory for a driver", "Free some."};
@@ -83,6 +83,12 @@ Result<SLibDCameraInfo> ModelCamera::video() const {
   }
   info.streamNumber = stream_;  // the record comes back with the driver's own
   return info;
+}
+
+Result<LiveCamera*> ModelCamera::live() const {
+  const Result<LiveCamera::Identity> identity = live_->identify(stream_);
+  if (const auto* problem = std::get_if<Problem>(&identity)) return *problem;
+  return live_.get();
 }
 
 Problem ModelCamera::explain(ELibDReturnCode result) const { return explain_failure(*device_, result, connection_); }

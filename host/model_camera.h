@@ -31,18 +31,26 @@ class ModelCamera {
   // The settings of the stream that the options name, as the camera reports them.
   [[nodiscard]] Result<SLibDCameraInfo> video() const;
 
+  // A driver that plays the stream of the options, which it has asked the camera about. This camera's own, as long as
+  // it.
+  [[nodiscard]] Result<LiveCamera*> live() const;
+
   // A failure to read from the camera.
   [[nodiscard]] Problem explain(ELibDReturnCode result) const;
   // A failure to change `what` on a camera that answers.
   [[nodiscard]] Problem explain_change(const std::string& what, ELibDReturnCode result) const;
 
  private:
-  ModelCamera(std::unique_ptr<DriverTrace> trace, CameraConnection connection, int stream)
-      : trace_(std::move(trace)), connection_(std::move(connection)), stream_(stream) {}
+  ModelCamera(OpenCamera asked, int stream)
+      : trace_(std::move(asked.trace)),
+        live_(std::move(asked.driver)),
+        connection_(live_->connection()),
+        stream_(stream) {}
 
   [[nodiscard]] std::optional<Problem> find_profile(const ModelOptions& options, const std::string& model);
 
-  std::unique_ptr<DriverTrace> trace_;  // outlives the driver
+  std::unique_ptr<DriverTrace> trace_;  // outlives the drivers
+  std::unique_ptr<LiveCamera> live_;
   CameraConnection connection_;
   int stream_;
   Profile profile_;

@@ -13,6 +13,14 @@
 
 namespace vexa::host {
 
+bool has_ffmpeg() {
+#ifdef VEXA_WITH_FFMPEG
+  return true;
+#else
+  return false;
+#endif
+}
+
 Problem without_ffmpeg(const std::string& what) {
   return {ExitCode::kUsage, fmt::format("this vexactl was built without FFmpeg's libraries; {} needs them", what),
           "Use one that was built with them, or record the video and let ffmpeg do it."};

@@ -13,6 +13,9 @@ namespace vexa::host {
 
 using FrameBytes = std::vector<std::uint8_t>;
 
+// Whether this build has FFmpeg's libraries.
+[[nodiscard]] bool has_ffmpeg();
+
 // The problem of a build that lacks FFmpeg's libraries; `what` needs them, for instance "decoding H.264".
 [[nodiscard]] Problem without_ffmpeg(const std::string& what);
 

@@ -3,8 +3,6 @@
 #include <algorithm>
 #include <cctype>
 
-#include "host/picture_decoder.h"
-
 #ifdef VEXA_WITH_FFMPEG
 #include "host/ffmpeg_handles.h"
 #endif
@@ -33,6 +31,15 @@ std::optional<PictureFormat> picture_format_of(std::string_view file) {
     if (ends_with_letters(file, ending.text)) return ending.format;
   }
   return std::nullopt;
+}
+
+bool makes_jpeg_of(const std::string& codec) { return codec == "JPEG" || has_ffmpeg(); }
+
+Result<std::vector<std::uint8_t>> jpeg_of(const std::string& codec, const std::vector<FrameBytes>& frames) {
+  if (codec == "JPEG" && !frames.empty()) return frames.back();
+  const Result<Picture> picture = decode_picture(codec, frames);
+  if (const auto* problem = std::get_if<Problem>(&picture)) return *problem;
+  return encode_picture(std::get<Picture>(picture), PictureFormat::kJpeg);
 }
 
 #ifndef VEXA_WITH_FFMPEG

@@ -7,6 +7,7 @@
 #include <thread>
 #include <vector>
 
+#include "host/alarm_snapshots.h"
 #include "host/alarm_words.h"
 #include "host/commands/command.h"
 #include "host/interrupt.h"
@@ -136,15 +137,31 @@ class WatchCommand final : public Command {
     add_model_options(*command, options_);
     command->add_flag("--metadata", metadata_, "show the frames of motion metadata too");
     command->add_option("--count", count_, "end after this many lines")->check(CLI::PositiveNumber);
+    command
+        ->add_option("--snapshot-dir", snapshot_folder_, "write a picture of each alarm that begins into this folder")
+        ->type_name("DIR");
     command->footer("A line says when, which pin, what it is, and its new state; with --json each is a JSON object.");
     return command;
   }
 
   ExitCode run(Terminal& terminal) override {
+    if (snapshot_folder_) {
+      if (const auto problem = check_snapshot_folder(*snapshot_folder_)) return terminal.report(*problem);
+    }
     const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
     if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
     const auto& camera = std::get<ModelCamera>(opened);
     Interrupt::finish_orderly();
+    std::optional<AlarmSnapshots> snapshots;
+    if (snapshot_folder_) {
+      snapshots_ = &snapshots.emplace(*snapshot_folder_);
+      if (const auto problem = snapshots_->start(camera)) return terminal.report(*problem);
+    }
+    return watch(camera, terminal);
+  }
+
+ private:
+  ExitCode watch(const ModelCamera& camera, Terminal& terminal) {
     follow_detection(camera);
     ELibDReturnCode started = camera.device().StartIoStreaming();
     if (started == LIBD_OK && metadata_) started = camera.device().StartModRawData();
@@ -159,7 +176,6 @@ class WatchCommand final : public Command {
     return Interrupt::requested() ? ExitCode::kInterrupted : ExitCode::kOk;
   }
 
- private:
   [[nodiscard]] WatchFormat format() const { return options_.camera.json ? WatchFormat::kJson : WatchFormat::kText; }
   [[nodiscard]] bool goes_on() const { return !over_ && !Interrupt::requested(); }
 
@@ -191,8 +207,18 @@ class WatchCommand final : public Command {
       const std::string moment = moment_text(std::chrono::system_clock::now());
       for (const SLibDPinInfo& pin : states.changed(pins)) {
         if (auto problem = say(terminal, alarm_line(pin, moment, format()))) return problem;
+        if (auto problem = take_snapshot(terminal, pin, moment)) return problem;
       }
     }
+    return std::nullopt;
+  }
+
+  // An alarm without a picture is better than none: only a folder that takes no file ends the watch.
+  std::optional<Problem> take_snapshot(Terminal& terminal, const SLibDPinInfo& pin, const std::string& moment) {
+    if (snapshots_ == nullptr || pin.state == 0) return std::nullopt;
+    auto problem = snapshots_->take(pin, moment);
+    if (!problem || problem->code == ExitCode::kCannotWrite) return problem;
+    terminal.say("vexactl: no picture of this alarm: " + problem->text);
     return std::nullopt;
   }
 
@@ -210,7 +236,9 @@ class WatchCommand final : public Command {
 
   ModelOptions options_;
   bool metadata_ = false;
-  std::uint64_t count_ = 0;  // 0: no such end
+  std::optional<std::string> snapshot_folder_;
+  AlarmSnapshots* snapshots_ = nullptr;  // while they are taken
+  std::uint64_t count_ = 0;              // 0: no such end
   std::mutex mutex_;
   std::uint64_t lines_ = 0;
   std::atomic<bool> over_{false};

@@ -1,11 +1,13 @@
 // vexactl detection, tampering and audio-detection: what a camera's detectors look for, and switching them.
 #include <fmt/format.h>
 
+#include <algorithm>
 #include <nlohmann/json.hpp>
 #include <optional>
 #include <vector>
 
 #include "host/commands/command.h"
+#include "host/detection_picture.h"
 #include "host/model_camera.h"
 #include "host/result_output.h"
 #include "host/setting_words.h"
@@ -49,21 +51,28 @@ class DetectionCommand final : public Command {
     CLI::App* command = program.add_subcommand("detection", "Show or set what a camera's video detection looks for");
     read_environment(options_.camera.credentials, environment);
     add_model_options(*command, options_);
-    command->add_option("action", action_, "show or set")
+    command->add_option("action", action_, "show, set, or draw: a picture with the windows on it")
         ->required()
         ->type_name("")
-        ->check(CLI::IsMember({"show", "set"}));
+        ->check(CLI::IsMember({"show", "set", "draw"}));
+    command->add_option("--out", out_, "draw: the picture's file, NAME.png or NAME.jpg")->type_name("FILE");
     command->add_option("--number", number_, "of the detection setting; 99: the current view")->capture_default_str();
     command->add_option("--sensitivity", sensitivity_, "1 to 100")->check(CLI::Range(1, 100));
     command->add_option("--size", size_, "of the smallest object, for cameras with a size class: small, middle, large");
     command->add_option("--window", window_, "1 to 4, which the options below change")->check(CLI::Range(1, 4));
-    command->add_option("--area", area_, "X1 Y1 X2 Y2, two corners of the window")->expected(4);
+    command
+        ->add_option("--area", area_,
+                     "X1 Y1 X2 Y2, two corners of the window; 10000 is the width or height of the picture")
+        ->expected(4);
     command->add_option("--enabled", enabled_, "on or off")->check(CLI::IsMember({"on", "off"}));
     command->add_option("--mode", mode_, "detect or mask")->check(CLI::IsMember({"detect", "mask"}));
     return command;
   }
 
   ExitCode run(Terminal& terminal) override {
+    if (action_ == "draw") {
+      if (const auto problem = check_picture_file(out_)) return terminal.report(*problem);
+    }
     const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
     if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
     const auto& camera = std::get<ModelCamera>(opened);
@@ -72,6 +81,7 @@ class DetectionCommand final : public Command {
     const ELibDReturnCode read = camera.device().GetObjectDetectionSetting(settings, position);
     if (read != LIBD_OK) return terminal.report(camera.explain(read));
     if (action_ == "show") return show(terminal, camera, settings);
+    if (action_ == "draw") return draw(terminal, camera, settings);
     return set(terminal, camera, settings);
   }
 
@@ -96,6 +106,17 @@ class DetectionCommand final : public Command {
             {"smallest", Json::array({first.minObjectWidth, first.minObjectHeight})},
             {"largest", Json::array({first.maxObjectWidth, first.maxObjectHeight})},
             {"windows", windows}};
+  }
+
+  ExitCode draw(Terminal& terminal, const ModelCamera& camera, const std::vector<SLibDDetectionParam>& settings) const {
+    const auto setting = std::find_if(settings.begin(), settings.end(),
+                                      [this](const SLibDDetectionParam& param) { return param.number == number_; });
+    if (camera.profile().lodDetection || setting == settings.end()) {
+      return terminal.report(usage(fmt::format("the camera has no detection windows of number {}", number_),
+                                   "vexactl detection CAMERA show shows what it has."));
+    }
+    const auto problem = draw_detection(camera, *setting, out_);
+    return problem ? terminal.report(*problem) : ExitCode::kOk;
   }
 
   ExitCode set(Terminal& terminal, const ModelCamera& camera, const std::vector<SLibDDetectionParam>& settings) const {
@@ -136,6 +157,7 @@ class DetectionCommand final : public Command {
 
   ModelOptions options_;
   std::string action_;
+  std::string out_;
   int number_ = 99;
   std::optional<int> sensitivity_;
   std::optional<std::string> size_;
