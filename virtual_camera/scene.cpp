@@ -41,7 +41,7 @@ struct Sheet {
   [[nodiscard]] int row(double elevation) const { return pixel(place.row(elevation)); }
   [[nodiscard]] static int pixel(double at) {
     constexpr double kFar = 1e6;  // a magnified figure may end far outside
-    return static_cast<int>(std::floor(std::clamp(at, -kFar, kFar)));
+    return std::isnan(at) ? 0 : static_cast<int>(std::floor(std::clamp(at, -kFar, kFar)));
   }
 
   I420Picture& picture;

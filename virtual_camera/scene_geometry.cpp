@@ -25,7 +25,7 @@ double turn_between(double from, double to) { return whole_turn(to - from + kCir
 
 Projection::Projection(const View& view)
     : pan_(finite_or_zero(view.pose.pan)),
-      tilt_(finite_or_zero(view.pose.tilt)),
+      tilt_(std::clamp(finite_or_zero(view.pose.tilt), -kCircle, kCircle)),
       scale_(view.size.width / std::clamp(finite_or_zero(view.pose.horizontal_angle), kNarrowest, kCircle)),
       middle_column_(view.size.width / 2.0),
       middle_row_(view.size.height / 2.0) {
