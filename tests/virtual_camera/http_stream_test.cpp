@@ -66,7 +66,7 @@ TEST(HttpStream, GivesEachUnitItsTime) {
   options.faults.push_back({2, Action::kPause, "", 0, std::chrono::milliseconds(50)});
   HttpStream stream(clip(ImageKind::kH264), options);
   const int due[] = {0, 0, 100, 100, 250, 250, 250, 350};
-  for (const int milliseconds : due) EXPECT_EQ(stream.next()->due, std::chrono::milliseconds(milliseconds));
+  for (const int after : due) EXPECT_EQ(stream.next()->due, std::chrono::milliseconds(after));
 }
 
 TEST(HttpStream, LeavesInPiecesOfAnyLength) {

@@ -5,19 +5,16 @@
 namespace vexa::camera {
 namespace {
 
-using std::chrono::seconds;
-using std::chrono::steady_clock;
-
-constexpr steady_clock::time_point kBegin{std::chrono::hours(1)};
+constexpr std::chrono::steady_clock::time_point kBegin{std::chrono::hours(1)};
 
 class SeenByACamera : public testing::Test {
  protected:
   SeenByACamera() {
-    state_.pose = [this](steady_clock::time_point) { return pose_; };
+    state_.pose = [this](std::chrono::steady_clock::time_point) { return pose_; };
     state_.settings.set("camera", "ImageSize1", "640,480");
   }
   // Ten seconds from the left edge of the picture to the right one.
-  void walk() { state_.stage.enter(walk_through(main_view_of(state_, kBegin), seconds(10)), kBegin); }
+  void walk() { state_.stage.enter(walk_through(main_view_of(state_, kBegin), std::chrono::seconds(10)), kBegin); }
   // The windows that are set off at a second of the walk, by their numbers.
   std::string windows_at(double second) {
     const auto moment = kBegin + std::chrono::milliseconds(static_cast<int>(second * 1000));
@@ -88,7 +85,7 @@ TEST_F(SeenByACamera, ZoomBringsTheFigureIntoMoreWindows) {
   walk();
   pose_.horizontal_angle = 4;
   EXPECT_EQ(windows_at(5), "1234");
-  const SceneMoment moment = moment_of(state_, kBegin + seconds(5));
+  const SceneMoment moment = moment_of(state_, kBegin + std::chrono::seconds(5));
   ASSERT_TRUE(moment.intruder);
   EXPECT_NEAR(moment.intruder->bearing, 120, 1e-9);
 }
@@ -113,7 +110,8 @@ TEST_F(SeenByACamera, NobodyIsSeenThroughACoveredLensUntilItIsFree) {
 
 TEST_F(SeenByACamera, NewWalkTakesThePlaceOfTheOneUnderWay) {
   walk();
-  state_.stage.enter(walk_through(main_view_of(state_, kBegin), seconds(10)), kBegin + seconds(4));
+  state_.stage.enter(walk_through(main_view_of(state_, kBegin), std::chrono::seconds(10)),
+                     kBegin + std::chrono::seconds(4));
   EXPECT_EQ(windows_at(3), "");
   EXPECT_EQ(windows_at(9), "23");
   EXPECT_EQ(windows_at(15), "");

@@ -9,8 +9,6 @@
 namespace vexa::camera {
 namespace {
 
-using std::chrono::milliseconds;
-
 constexpr PictureSize kSceneSize{640, 360};
 
 View looking(double pan, double tilt, double angle, bool rotated = false) {
@@ -183,7 +181,7 @@ std::vector<std::string> clock_dots(milliseconds clock) {
 }
 
 TEST(Scene, ClockTellsTheMomentToTheMillisecond) {
-  EXPECT_EQ(clock_dots(milliseconds(12 * 3600000 + 34 * 60000 + 56 * 1000 + 789)),
+  EXPECT_EQ(clock_dots(std::chrono::milliseconds(12 * 3600000 + 34 * 60000 + 56 * 1000 + 789)),
             (std::vector<std::string>{"  #    ###        #####    #        #####   ##        #####  ###   ###  ",
                                       " ##   #   #  ##      #    ##   ##   #      #              # #   # #   # ",
                                       "  #       #  ##     #    # #   ##   ####  #              #  #   # #   # ",
@@ -195,10 +193,10 @@ TEST(Scene, ClockTellsTheMomentToTheMillisecond) {
 
 TEST(Scene, SameMomentGivesTheSamePictureAndTheNextAnother) {
   SceneMoment moment;
-  moment.clock = milliseconds(1000);
+  moment.clock = std::chrono::milliseconds(1000);
   const I420Picture first = rendered(looking(3, 2, 30), moment);
   EXPECT_EQ(first.bytes(), rendered(looking(3, 2, 30), moment).bytes());
-  moment.clock += milliseconds(1);
+  moment.clock += std::chrono::milliseconds(1);
   EXPECT_NE(first.bytes(), rendered(looking(3, 2, 30), moment).bytes());
 }
 
@@ -228,9 +226,9 @@ TEST(Scene, IsDrawnInAnySizeFromAnyPose) {
 
 TEST(ClockOf, CountsFromMidnight) {
   using std::chrono::system_clock;
-  EXPECT_EQ(clock_of(system_clock::time_point()), milliseconds(0));
-  EXPECT_EQ(clock_of(system_clock::time_point(std::chrono::hours(25))), milliseconds(3600000));
-  EXPECT_EQ(clock_of(system_clock::time_point(milliseconds(-1))), milliseconds(86399999));
+  EXPECT_EQ(clock_of(system_clock::time_point()), std::chrono::milliseconds(0));
+  EXPECT_EQ(clock_of(system_clock::time_point(std::chrono::hours(25))), std::chrono::milliseconds(3600000));
+  EXPECT_EQ(clock_of(system_clock::time_point(std::chrono::milliseconds(-1))), std::chrono::milliseconds(86399999));
 }
 
 }  // namespace
