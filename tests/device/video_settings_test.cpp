@@ -308,13 +308,23 @@ TEST(GetCameraInfo, OffersWhatAllReportedPropertiesLeave) {
   EXPECT_EQ(play.complaints(), "");
 }
 
+// The filter keeps its criterion at a word that it does not know: "On" reaches it as neither "on" nor "off".
 TEST(GetCameraInfo, GivesTheFilterTheCamerasOwnWordOfSolidPtz) {
-  Driver play({inquiry("camera", "SolidPTZ=On&VideoStd=ntsc")});
-  SLibDCameraInfo info;
-  EXPECT_EQ(play.driver.GetCameraInfo(info), LIBD_OK);
-  EXPECT_FALSE(info.solidPtz);
-  EXPECT_EQ(play.driver.m_FixedCameraInfo.codecs[0].resolutions[0].text, "1920x1080");
-  EXPECT_EQ(play.complaints(), "");
+  for (const char* before : {"on", "off"}) {
+    SettingsDriver driver;
+    driver.m_ResolutionFilter.Initialize("LMX-P100");
+    driver.m_ResolutionFilter.SetFilterItemCriteria("SolidPTZFilter", before);
+    std::vector<SLibDVideoCodecInfo> expected;
+    driver.m_ResolutionFilter.GetFilteredResolutionList(expected);
+    std::size_t pos = 0;
+    bool changed = false;
+    driver.ParseSolidPTZFromCameraProperty("SolidPTZ=On", pos, changed);
+    EXPECT_FALSE(driver.m_CameraInfo.solidPtz);
+    EXPECT_FALSE(changed);
+    std::vector<SLibDVideoCodecInfo> offered;
+    driver.m_ResolutionFilter.GetFilteredResolutionList(offered);
+    EXPECT_EQ(offered[0].resolutions[0].text, expected[0].resolutions[0].text) << before;
+  }
 }
 
 TEST(GetCameraInfo, MovesAParsersPlaceToTheValuesEnd) {

@@ -1,8 +1,13 @@
-// A host that prints what its driver offers after each property it sets.
+// A host that prints what its driver offers after each property it sets, or after each answer of a camera that it is
+// given on its command line.
 #include <climits>
 #include <cstdio>
+#include <string>
+#include <vector>
 
+#include "tests/support/own_address.h"
 #include "vexa/vexa_common.h"
+#include "virtual_camera/virtual_camera.h"
 
 namespace {
 
@@ -23,9 +28,7 @@ void print_offer(Model& driver) {
   std::printf("\n");
 }
 
-}  // namespace
-
-int main() {
+void set_properties() {
   Model driver;
   driver.SetVidCapSize(INT_MIN, INT_MIN);
   print_offer(driver);
@@ -37,5 +40,36 @@ int main() {
   print_offer(driver);
   driver.SetImageMaxSize(INT_MIN, INT_MIN, LIBD_VIDEO_PAL);
   print_offer(driver);
+}
+
+// One driver reads one answer after the other.
+int read_answers(const std::vector<std::string>& answers) {
+  vexa::camera::CameraOptions options;
+  options.address = vexa_test::own_loopback(0);
+  options.rtsp_port = 0;
+  vexa::camera::VirtualCamera camera(options);
+  if (!camera.start()) return 1;
+  Model driver;
+  SLibDConnectionInfo connection;
+  connection.host = camera.address();
+  connection.port = camera.http_port();
+  connection.timeout = 10000;
+  connection.userName = options.user;
+  connection.password = options.password;
+  driver.SetCurrentConnectionInfo(connection);
+  for (const std::string& answer : answers) {
+    camera.settings().set_answer("camera", answer);
+    SLibDCameraInfo info;
+    if (driver.GetCameraInfo(info) != LIBD_OK) return 1;
+    print_offer(driver);
+  }
+  return 0;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  if (argc > 1) return read_answers({argv + 1, argv + argc});
+  set_properties();
   return 0;
 }
