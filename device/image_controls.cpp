@@ -13,6 +13,8 @@ namespace {
 constexpr unsigned kLargestLevel = 10000;
 constexpr int kLargestStep = 10000;
 
+// Kept: keys are searched with the "&" before them, so one that begins the answer is not found; cameras begin theirs
+// with the video settings.
 /// Reads the word of `key`; the value stays when the answer lacks the key or the word is not known.
 template <typename Value, std::size_t kRows>
 ELibDReturnCode read_word(const std::string& answer, const char* key, const vexa::Word<Value> (&table)[kRows],

@@ -157,6 +157,14 @@ constexpr StepRow kSteps[] = {{"Shutter Priority", 1, "A=1&Shutter=4&Iris=2", "S
                               {"Shutter Priority", 1, "A=1&Shutter=", nullptr},
                               {"Shutter Priority", 1, "A=1&Iris=1", nullptr},
                               {"Shutter Priority", 1, "Shutter=4", nullptr},
+                              {"Iris Priority", 10000, "A=1&Iris=2", "Iris=5"},
+                              {"Iris Priority", -10000, "A=1&Iris=2", "Iris=1"},
+                              {"Iris Priority", 1, "A=1&Iris=1&Iris=2", "Iris=2"},
+                              {"Iris Priority", 1, "A=1&Iris= +1x", "Iris=2"},
+                              {"Iris Priority", 1, "A=1&Iris=3", nullptr},
+                              {"Iris Priority", -1, "A=1&Iris=3", nullptr},
+                              {"Iris Priority", 1, "A=1&Iris=", nullptr},
+                              {"Iris Priority", 1, "Iris=1", nullptr},
                               {"Iris Priority", 1, "A=1&Shutter=4", nullptr},
                               {"Iris Priority", 1, "", nullptr}};
 INSTANTIATE_TEST_SUITE_P(Rows, BrightStep, testing::ValuesIn(kSteps));
@@ -191,6 +199,39 @@ TEST(Bright, TellsTheLatestErrorWhenTheCameraRefuses) {
   EXPECT_EQ(told.driver.Bright(1), LIBD_UNAUTHORIZED);
   EXPECT_EQ(told.complaints(), "");
 }
+
+/// Another thread's change of the mode while the camera answers Bright.
+struct ModeChange {
+  const char* before;
+  const char* after;
+  ELibDReturnCode result;
+  const char* sent;  // null: nothing
+};
+
+class BrightMeanwhile : public testing::TestWithParam<ModeChange> {};
+
+TEST_P(BrightMeanwhile, GoesByTheModeThatIsStoredWhenTheCameraHasAnswered) {
+  SettingsDriver* driver = nullptr;
+  vexa_test::ScriptStep asked = inquiry("camera", "A=1&Shutter=4&Iris=1");
+  asked.meanwhile = [&driver] {
+    SLibDPTZControlInfo info;
+    info.brightMode = GetParam().after;
+    EXPECT_EQ(driver->SetPTZControlInfo(info), LIBD_OK);
+  };
+  vexa_test::Script script{asked};
+  if (GetParam().sent != nullptr) script.push_back(command(std::string("/command/camera.cgi?") + GetParam().sent));
+  Driver play(script);
+  driver = &play.driver;
+  give_lists(play.driver, GetParam().before);
+  EXPECT_EQ(play.driver.Bright(1), GetParam().result);
+  EXPECT_EQ(play.complaints(), "");
+}
+
+INSTANTIATE_TEST_SUITE_P(Modes, BrightMeanwhile,
+                         testing::Values(ModeChange{"Shutter Priority", "Iris Priority", LIBD_OK, "Iris=2"},
+                                         ModeChange{"Iris Priority", "Shutter Priority", LIBD_OK, "Shutter=20"},
+                                         ModeChange{"Iris Priority", "Full auto", LIBD_INVALID_MODE, nullptr},
+                                         ModeChange{"Shutter Priority", "", LIBD_INVALID_MODE, nullptr}));
 
 TEST_F(BrightUnsent, BecauseTheEntryIsNotThere) {
   give_lists(driver_, "Iris Priority");

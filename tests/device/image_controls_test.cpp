@@ -258,6 +258,24 @@ TEST(ImageGetters, TellTheLatestErrorWhenTheInquiryFails) {
   }
 }
 
+TEST(ImageGetters, DoNotFindTheKeyThatBeginsTheAnswer) {
+  const struct {
+    Getter get;
+    const char* key;
+  } rows[] = {{kDayNight, "DayNightMode=auto"},
+              {kXdnr, "XDNR=low"},
+              {kViewDr, "ViewDR=on"},
+              {kVisibility, "VisibilityEnhancer=low"},
+              {kIlluminator, "IRLed=off"}};
+  for (const auto& row : rows) {
+    SettingsDriver driver;
+    driver.cache_inquiry(std::string(row.key) + "&IRLedMaxStrength=1");
+    EXPECT_EQ(row.get(driver), (Said{LIBD_FAILED, kUntouched, row.get == kIlluminator ? kUntouched : 0})) << row.key;
+    driver.cache_inquiry("A=1&" + std::string(row.key) + "&IRLedMaxStrength=1");
+    EXPECT_EQ(row.get(driver).result, LIBD_OK) << row.key;
+  }
+}
+
 TEST(ImageGetters, AskAgainAfterAnEmptyAnswer) {
   Driver play({inquiry("camera", ""), inquiry("camera", "A=1&XDNR=low")});
   EXPECT_EQ(kXdnr(play.driver), (Said{0, kUntouched}));

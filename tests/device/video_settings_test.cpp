@@ -125,6 +125,13 @@ constexpr AnswerRow kBoundRows[] = {
     {"Quality1=7", [](SLibDCameraInfo& i) { i.quality = 7, i.qualityText = "Level 7"; }},
     {"Quality1=", [](SLibDCameraInfo& i) { i.quality = 0, i.qualityText = "Level "; }},
     {"BitRate1=2000", stays},
+    {"ImageCodec1=mpeg4&BitRate1=",
+     [](SLibDCameraInfo& i) { i.codecName = "MPEG4", i.codecType = 1, i.bitRate = 0, i.bitRateText = "kbit/s"; }},
+    {"ImageCodec1=h264&BitRate1=512&BitRate1=64",
+     [](SLibDCameraInfo& i) { i.codecName = "H.264", i.codecType = 2, i.bitRate = 512, i.bitRateText = "512kbit/s"; }},
+    {"ImageCodec1=h264&BitRate1=2M",
+     [](SLibDCameraInfo& i) { i.codecName = "H.264", i.codecType = 2, i.bitRate = 2, i.bitRateText = "2Mkbit/s"; }},
+    {"ImageCodec1=h264&BitRate2=64&BitRate11=64", [](SLibDCameraInfo& i) { i.codecName = "H.264", i.codecType = 2; }},
     {"Quality2=7", stays},
     {"Quality1=7&Quality1=8", [](SLibDCameraInfo& i) { i.quality = 7, i.qualityText = "Level 7"; }}};
 INSTANTIATE_TEST_SUITE_P(QualityAndBitRate, CameraAnswer, testing::ValuesIn(kBoundRows));
@@ -347,6 +354,32 @@ TEST(GetCameraInfo, MovesAParsersPlaceToTheValuesEnd) {
       EXPECT_EQ(changed, differs) << row.key;
     }
   }
+}
+
+TEST(GetCameraInfo, MovesAStreamParsersPlaceToTheValuesEnd) {
+  SettingsDriver driver;
+  const std::string answer = "A=1&ImageCodec7=h264&ImageSize7=640,480&FrameRate7=25&BitRate7=64&Quality7=5";
+  std::int32_t codec = 0;
+  const auto end_of = [&answer](std::size_t key, auto parse) {
+    std::size_t pos = key;
+    parse(pos);
+    return answer.substr(key, pos - key);
+  };
+  EXPECT_EQ(end_of(4, [&](std::size_t& pos) { driver.SetCurrentStreamMode(answer, pos, codec, "ImageCodec7="); }),
+            "ImageCodec7=h264");
+  EXPECT_EQ(end_of(21, [&](std::size_t& pos) { driver.SetCurrentResolution(answer, pos, "ImageSize7="); }),
+            "ImageSize7=640,480");
+  EXPECT_EQ(end_of(40, [&](std::size_t& pos) { driver.SetCurrentFrameRate(answer, pos, "FrameRate7="); }),
+            "FrameRate7=25");
+  EXPECT_EQ(end_of(54, [&](std::size_t& pos) { driver.SetCurrentQualityBitrate(answer, pos, codec, "BitRate7="); }),
+            "BitRate7=64");
+  EXPECT_EQ(end_of(66, [&](std::size_t& pos) { driver.SetCurrentQualityBitrate(answer, pos, 0, "Quality7="); }),
+            "Quality7=5");
+  EXPECT_EQ(codec, 2);
+  EXPECT_EQ(driver.m_CameraInfo.imageSizeText, "640x480");
+  EXPECT_EQ(driver.m_CameraInfo.frameRate, 25);
+  EXPECT_EQ(driver.m_CameraInfo.bitRate, 64);
+  EXPECT_EQ(driver.m_CameraInfo.quality, 5);
 }
 
 TEST(GetCameraInfo, ReadsNothingForAParsersPlaceOutsideTheAnswer) {

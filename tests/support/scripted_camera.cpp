@@ -106,6 +106,7 @@ bool ScriptedCamera::play_connection(std::size_t& step) {
       close(connection);
       return false;
     }
+    if (script_[step].meanwhile) script_[step].meanwhile();
     say(connection, script_[step]);
     then = script_[step].then;
     ++step;

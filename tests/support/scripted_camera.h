@@ -4,6 +4,7 @@
 
 #include <atomic>
 #include <cstddef>
+#include <functional>
 #include <string>
 #include <thread>
 #include <vector>
@@ -27,6 +28,7 @@ struct ScriptStep {
   std::size_t piece = 0;  ///< bytes sent at a time; 0: all at once
   int pause = 0;          ///< milliseconds between pieces
   Then then = Then::kClose;
+  std::function<void()> meanwhile = {};  ///< done by the camera's thread between the request and the answer
 };
 
 using Script = std::vector<ScriptStep>;
