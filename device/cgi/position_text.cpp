@@ -25,14 +25,14 @@ std::int64_t times(std::int64_t a, std::int64_t b) {
 }
 
 /// A ratio of 0 says nothing.
-std::optional<std::int64_t> known(std::int64_t ratio) {
+std::optional<std::int64_t> unless_zero(std::int64_t ratio) {
   return ratio == 0 ? std::nullopt : std::optional<std::int64_t>(ratio);
 }
 
 /// The magnification at a zoom position in units of 1/10000 of the table's; nothing when a ratio in question is 0.
 std::optional<std::int64_t> magnification(const std::vector<SLibDZoomRatioInt>& ratios, int zoom) {
-  if (zoom <= ratios.front().position) return known(ratios.front().ratio * kRatioUnit);
-  if (zoom >= ratios.back().position) return known(ratios.back().ratio * kRatioUnit);
+  if (zoom <= ratios.front().position) return unless_zero(ratios.front().ratio * kRatioUnit);
+  if (zoom >= ratios.back().position) return unless_zero(ratios.back().ratio * kRatioUnit);
   const auto above =
       std::find_if(ratios.begin(), ratios.end(), [zoom](const auto& entry) { return entry.position >= zoom; });
   const SLibDZoomRatioInt& high = *above;
@@ -41,7 +41,7 @@ std::optional<std::int64_t> magnification(const std::vector<SLibDZoomRatioInt>& 
   const std::int64_t rise = (static_cast<std::int64_t>(high.ratio) - low.ratio) * kRatioUnit;
   const std::int64_t way = static_cast<std::int64_t>(zoom) - low.position;
   const std::int64_t distance = static_cast<std::int64_t>(high.position) - low.position;
-  return known(low.ratio * kRatioUnit + times(rise, way) / distance);
+  return unless_zero(low.ratio * kRatioUnit + times(rise, way) / distance);
 }
 
 }  // namespace

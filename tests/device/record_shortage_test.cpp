@@ -15,7 +15,7 @@ using vexa_test::ScriptedCamera;
 using vexa_test::TestDriver;
 
 /// A text of more than a text holds by itself.
-std::string long_text() { return std::string(40, 't'); }
+std::string long_record_text() { return std::string(40, 't'); }
 
 /// The host's records, made before memory runs short.
 struct HostRecords {
@@ -41,12 +41,12 @@ const RecordRow kRecordRows[] = {
 /// How many allocations of the call there are; each that fails is told.
 int failed_records(const RecordRow& row) {
   for (int nth = 0; nth < 1000; ++nth) {
-    ScriptedCamera camera({inquiry("system", "ModelName=" + long_text() + "&Serial=" + long_text()),
-                           inquiry("network", "MacAddress=" + long_text())});
+    ScriptedCamera camera({inquiry("system", "ModelName=" + long_record_text() + "&Serial=" + long_record_text()),
+                           inquiry("network", "MacAddress=" + long_record_text())});
     TestDriver driver;
     driver.use(camera.host(), camera.port(), vexa_test::kPatientTimeout);
-    driver.m_FixedSystemInfo.modelName = driver.m_FixedConnectionInfo.text = long_text();
-    driver.m_ConnectionInfo.proxyHost = long_text();
+    driver.m_FixedSystemInfo.modelName = driver.m_FixedConnectionInfo.text = long_record_text();
+    driver.m_ConnectionInfo.proxyHost = long_record_text();
     HostRecords host;
     ELibDReturnCode result = LIBD_OK;
     bool happened = false;
@@ -73,7 +73,7 @@ TEST(RecordsShortOfMemory, AreAFailure) {
 TEST(SetCurrentConnectionInfo, ShortOfMemoryKeepsTheConnectionWholeAndThrowsNothing) {
   const vexa_test::TemporaryFolder folder;
   SLibDConnectionInfo given;
-  given.host = given.proxyHost = long_text();
+  given.host = given.proxyHost = long_record_text();
   given.timeout = 1234;
   bool happened = true;
   int nth = 0;
