@@ -66,10 +66,14 @@ bool LivePictures::has_picture() const {
 }
 
 std::optional<Problem> await_key_frame(LiveCamera& camera, LivePictures& pictures) {
+  Interrupt::finish_orderly();  // a session that is open is closed
   const ELibDReturnCode started = pictures.start();
   if (started != LIBD_OK) return camera.explain(started);
   const auto give_up = std::chrono::steady_clock::now() + kLongestWaitForKey;
   while (!pictures.has_picture()) {
+    if (Interrupt::requested()) {
+      return Problem{ExitCode::kInterrupted, "interrupted before a picture came", "Nothing was written."};
+    }
     if (pictures.look() == LivePictures::Look::kSilent) return silent_camera();
     if (std::chrono::steady_clock::now() > give_up) {
       return Problem{ExitCode::kNoVideo, "the camera has sent no key picture", "Shorten its key-frame interval."};

@@ -64,15 +64,16 @@ void draw_frame(Picture& picture, const PixelBox& box, int thickness, const Pixe
   fill(picture, {std::max(box.right - most, box.left), box.top, box.right, box.bottom}, colour);
 }
 
-void draw_cross(Picture& picture, const PixelBox& box, const PixelColour& colour) {
+void draw_cross(Picture& picture, const PixelBox& box, int thickness, const PixelColour& colour) {
   const int width = box.right - box.left;
   const int height = box.bottom - box.top;
   const int steps = std::max({width, height, 1});
   for (int step = 0; step <= steps; ++step) {
     const int x = static_cast<int>(std::int64_t{width} * step / steps);
     const int y = static_cast<int>(std::int64_t{height} * step / steps);
-    paint(picture, box.left + x, box.top + y, colour);
-    paint(picture, box.left + x, box.bottom - y, colour);
+    for (const int top : {box.top + y, box.bottom - y}) {
+      fill(picture, {box.left + x, top, box.left + x + thickness - 1, top}, colour);
+    }
   }
 }
 
@@ -102,8 +103,9 @@ void draw_windows(Picture& picture, const SLibDDetectionParam& setting) {
     if (window.area.size() != 2) continue;
     if (window.area[0].x == window.area[1].x || window.area[0].y == window.area[1].y) continue;
     const PixelBox box = box_of(window.area, picture);
-    draw_frame(picture, box, window.enabled == 1 ? 2 * scale : 1, kWindowColours[i]);
-    if (window.mode > 0) draw_cross(picture, box, kWindowColours[i]);
+    const int thin = std::max(1, scale / 2);
+    draw_frame(picture, box, window.enabled == 1 ? 2 * scale : thin, kWindowColours[i]);
+    if (window.mode > 0) draw_cross(picture, box, thin, kWindowColours[i]);
     draw_digit(picture, box, i, scale);
   }
 }

@@ -24,6 +24,12 @@ class PicturesByCommand : public WithCamera {
     start_camera(options);
   }
 
+  void set_a_window() {
+    const ProgramResult result = run(
+        {"detection", place(), "set", "--window", "2", "--area", "2500", "2500", "7500", "7500", "--enabled", "on"});
+    ASSERT_EQ(result.exit_code, 0) << result.err;
+  }
+
   // The only picture in the folder.
   std::string snapshot() {
     for (const auto& entry : std::filesystem::directory_iterator(folder().path())) {
@@ -38,7 +44,7 @@ class PicturesByCommand : public WithCamera {
     const bool watched = camera().journal().wait_for_count("/command/alarmdata.cgi", 1, std::chrono::seconds(30));
     EXPECT_TRUE(watched);
     if (!watched) watch.signal(SIGTERM);
-    EXPECT_TRUE(camera().alarms().happen({{}, vexa::camera::AlarmEvent::Kind::kContact, 1, 1}));
+    EXPECT_TRUE(camera().alarms().happen({vexa::camera::AlarmEvent::Kind::kContact, 1, 1}));
     return watch.wait();
   }
 };
@@ -87,10 +93,7 @@ int distance(const Picture& picture, int x, int y, std::array<int, 3> colour) {
 
 TEST_F(PicturesByCommand, DetectionWindowsAreDrawnOnThePresentPicture) {
   start_model("LMX-P200");
-  ASSERT_EQ(
-      run({"detection", place(), "set", "--window", "2", "--area", "2500", "2500", "7500", "7500", "--enabled", "on"})
-          .exit_code,
-      0);
+  ASSERT_NO_FATAL_FAILURE(set_a_window());
   const ProgramResult result = run({"detection", place(), "draw", "--out", "windows.jpg"});
   EXPECT_EQ(result.exit_code, 0) << result.err;
   const Picture picture = decoded(folder() / "windows.jpg");
@@ -101,6 +104,21 @@ TEST_F(PicturesByCommand, DetectionWindowsAreDrawnOnThePresentPicture) {
   }
   EXPECT_EQ(run({"detection", place(), "draw", "--out", "windows.png"}).exit_code, 0);
   EXPECT_THAT(contents_of(folder() / "windows.png"), testing::StartsWith("\x89PNG"));
+}
+
+TEST_F(PicturesByCommand, CtrlCEndsTheWaitForAPictureAndTheSession) {
+  vexa::camera::CameraOptions options;
+  options.profile_path = VEXA_SOURCE_DIR "/models/profiles/LMX-P200.json";
+  options.packet_faults.loss = 1;
+  start_camera(options);
+  ASSERT_NO_FATAL_FAILURE(set_a_window());
+  ProgramRun draw(folder(), vexactl({"detection", place(), "draw", "--out", "windows.png"}), kCredentials);
+  ASSERT_TRUE(camera().journal().wait_for_count("PLAY", 1, std::chrono::seconds(30)));
+  draw.signal(SIGINT);
+  const ProgramResult result = draw.wait();
+  EXPECT_EQ(result.exit_code, 130);
+  EXPECT_EQ(result.err, "vexactl: interrupted before a picture came\n  Nothing was written.\n");
+  EXPECT_TRUE(camera().journal().wait_for_count("TEARDOWN", 1, std::chrono::seconds(30)));
 }
 
 TEST_F(PicturesByCommand, ACameraWithoutWindowsHasNoneToDraw) {
