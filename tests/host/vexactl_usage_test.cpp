@@ -92,6 +92,13 @@ TEST(CommandLine, EachMistakeEndsWithOneAndSaysWhatToDo) {
        "vexactl: --cgi-log names no file\n  For instance: --cgi-log cgi.log.\n"},
       {{"info", "127.0.0.1", "--cgi-log", std::string(1024, 'f')},
        "vexactl: the name of --cgi-log is longer than 1023 characters\n  Choose a shorter one.\n"},
+      {{"ptz", "cam"}, "vexactl: the action is missing, or not one of the command's\n  See vexactl ptz --help.\n"},
+      {{"ptz", "cam", "fly"},
+       "vexactl: the action is missing, or not one of the command's\n  See vexactl ptz --help.\n"},
+      {{"ptz", "cam", "pan"}, "vexactl: direction is required\n  See vexactl ptz CAMERA pan --help.\n"},
+      {{"ptz", "cam", "pan", "left", "--password=hunter2"},
+       "vexactl: there is no option --password\n  See vexactl ptz CAMERA pan --help.\n"},
+      {{"profile", "show"}, "vexactl: profile is required\n  See vexactl profile show --help.\n"},
       {{"log"}, "vexactl: file is required\n  See vexactl log --help.\n"},
       {{"log", "missing"},
        "vexactl: cannot read missing: No such file or directory\n"
