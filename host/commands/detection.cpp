@@ -48,7 +48,8 @@ Json window_json(const SLibDDetectionWindow& window) {
 class DetectionCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
-    CLI::App* command = program.add_subcommand("detection", "Show or set what a camera's video detection looks for");
+    CLI::App* command =
+        program.add_subcommand("detection", "Show, set or draw what a camera's video detection looks for");
     read_environment(options_.camera.credentials, environment);
     add_model_options(*command, options_);
     command->add_option("action", action_, "show, set, or draw: a picture with the windows on it")

@@ -6,13 +6,13 @@
 
 #include "host/commands/action_group.h"
 #include "host/result_output.h"
+#include "host/tour_words.h"
 
 namespace vexa::host {
 namespace {
 
 using Json = nlohmann::ordered_json;
 
-constexpr int kLongestResume = 9999;  // seconds
 constexpr char kShadowTours[] = "shadow tours";
 
 std::optional<Problem> check_shadow_tours(const ModelCamera& camera) {
@@ -33,11 +33,8 @@ class ShowShadowsAction final : public CameraAction {
 
  private:
   static std::string table_of(const SLibDShadowTourInfo& info) {
-    std::string text =
-        fmt::format("Shadow tours are {}; {}; the longest recording is {} s\n", info.enabled ? "on" : "off",
-                    info.resumeTime > 0 ? fmt::format("resumed after {} s", info.resumeTime)
-                                        : std::string("not resumed after a move by hand"),
-                    info.maxRecordTime);
+    std::string text = fmt::format("Shadow tours are {}; {}; the longest recording is {} s\n",
+                                   info.enabled ? "on" : "off", resume_text(info.resumeTime), info.maxRecordTime);
     for (const auto& [number, tour] : info.tours) {
       text += fmt::format("{}  {:<3}  {:>4} s recorded\n", number, tour.enabled ? "on" : "off", tour.recordedTime);
     }

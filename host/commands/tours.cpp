@@ -7,13 +7,14 @@
 
 #include "host/commands/action_group.h"
 #include "host/result_output.h"
+#include "host/tour_words.h"
 
 namespace vexa::host {
 namespace {
 
 using Json = nlohmann::ordered_json;
 
-constexpr int kLongestTourTime = 9999;  // seconds, of a stay and until a tour resumes
+constexpr int kLongestStay = 9999;  // seconds
 constexpr std::size_t kFewestPresets = 2;
 
 std::optional<Problem> check_tours(const ModelCamera& camera) {
@@ -36,9 +37,7 @@ class ShowToursAction final : public CameraAction {
 
  private:
   static std::string table_of(const SLibDCameraTourInfo& info) {
-    std::string text = fmt::format("Tours are {}; {}\n", info.enabled ? "on" : "off",
-                                   info.resumeTime > 0 ? fmt::format("resumed after {} s", info.resumeTime)
-                                                       : std::string("not resumed after a move by hand"));
+    std::string text = fmt::format("Tours are {}; {}\n", info.enabled ? "on" : "off", resume_text(info.resumeTime));
     for (const auto& [number, tour] : info.tours) {
       text += fmt::format("{}  {:<3}  {:>4} s each  speed {:>3}  presets {}\n", number, tour.enabled ? "on" : "off",
                           tour.stayTime, tour.speed, tour.sequence.empty() ? "-" : presets_text(tour.sequence));
@@ -115,10 +114,10 @@ class SetTourAction final : public ChangeToursAction {
     CLI::App* action = group.add_subcommand("set", "Say which presets a tour visits");
     action->add_option("number", number_, "of the tour, counted from 1")->required()->type_name("");
     action->add_option("presets", text_, "numbers of the presets in turn, such as 1,2,3")->required()->type_name("");
-    action->add_option("--stay", stay_, "seconds at each preset")->check(CLI::Range(1, kLongestTourTime));
+    action->add_option("--stay", stay_, "seconds at each preset")->check(CLI::Range(1, kLongestStay));
     action->add_option("--speed", speed_, "of the turns, in the camera's units")->check(CLI::PositiveNumber);
     action->add_option("--resume", resume_, "seconds after a move by hand until tours go on; 0: they do not")
-        ->check(CLI::Range(0, kLongestTourTime));
+        ->check(CLI::Range(0, kLongestResume));
     action->footer("What is left out stays as it is. Tours that have no presets yet get the same, and stay off.");
     return action;
   }
