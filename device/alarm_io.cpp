@@ -1,5 +1,6 @@
 // Alarm pins: what the camera has, the polled stream of their states, and the outputs.
 #include <chrono>
+#include <new>
 #include <thread>
 #include <utility>
 
@@ -24,7 +25,8 @@ ELibDReturnCode CVexaCommon::GetFixedIoboxInfo(SLibDFixedIoBoxInfo& info) {
   return LIBD_OK;
 }
 
-ELibDReturnCode CVexaCommon::GetIoBoxInfo(SLibDIoBoxInfo& info) {
+// Safe: pins that memory does not hold are a failure and not an exception; the stored record is whole all the same.
+ELibDReturnCode CVexaCommon::GetIoBoxInfo(SLibDIoBoxInfo& info) try {
   // Kept: the list is not emptied first; hosts hand in an empty one.
   vexa::append_pins(m_FixedIoBoxInfo, info.pins);
   int number = vexa::first_detector_number(m_FixedIoBoxInfo);
@@ -36,10 +38,13 @@ ELibDReturnCode CVexaCommon::GetIoBoxInfo(SLibDIoBoxInfo& info) {
     const ELibDReturnCode asked = AskAudioDetection(number, info);
     if (asked != LIBD_OK) return asked;
   }
+  SLibDIoBoxInfo stored = info;
   const vexa::Guard guard(m_ConnectionLock);
-  info.vmdType = m_IoBoxInfo.vmdType;
-  m_IoBoxInfo = info;
+  info.vmdType = stored.vmdType = m_IoBoxInfo.vmdType;
+  std::swap(m_IoBoxInfo, stored);
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  return FailMemory();
 }
 
 ELibDReturnCode CVexaCommon::AskTampering(int number, SLibDIoBoxInfo& info) {
@@ -57,7 +62,8 @@ ELibDReturnCode CVexaCommon::AskAudioDetection(int number, SLibDIoBoxInfo& info)
   return LIBD_OK;
 }
 
-ELibDReturnCode CVexaCommon::StartIoStreaming() {
+// Safe: as GetIoBoxInfo; a stream whose first states memory does not hold is stopped again.
+ELibDReturnCode CVexaCommon::StartIoStreaming() try {
   StopIoStreaming();
   {
     const vexa::RaisedTimeout slow(m_ConnectionInfo.timeout, m_ConnectionLock, {kAlarmRequestTimeout, m_SavedTimeout});
@@ -77,6 +83,9 @@ ELibDReturnCode CVexaCommon::StartIoStreaming() {
   m_PendingPins = vexa::sensor_pins(answer);
   m_LastIoDataTime = m_State->now();
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  StopIoStreaming();
+  return FailMemory();
 }
 
 ELibDReturnCode CVexaCommon::OpenIoStream() {
@@ -115,7 +124,8 @@ ELibDReturnCode CVexaCommon::StopIoStreaming() {
   return SendCommand("/command/system.cgi?AlarmData=off");
 }
 
-ELibDReturnCode CVexaCommon::GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>& pins) {
+// Safe: as GetIoBoxInfo; room for the pins is there before a part is read, so that none is lost for the want of it.
+ELibDReturnCode CVexaCommon::GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>& pins) try {
   const vexa::TurnGuard guard(m_IoStreamLock, m_State->io_turn);
   if (m_IoStreamSocket == -1) return LIBD_FAILED;
   if (!m_PendingPins.empty()) {
@@ -123,6 +133,7 @@ ELibDReturnCode CVexaCommon::GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>&
     m_LastIoDataTime = m_State->now();
     return LIBD_OK;
   }
+  pins.reserve(vexa::kMostStatusPins);
   unsigned int present = 0;
   unsigned int state = 0;
   const int read = http_multipart_input_recv(m_IoStreamSocket, present, state);
@@ -131,9 +142,11 @@ ELibDReturnCode CVexaCommon::GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>&
   if (read == 0) {
     return vexa::alarm_stream_is_silent(now, m_LastIoDataTime, ConnectionTimeout()) ? LIBD_TIMEOUT : LIBD_NO_FRAME;
   }
-  pins = vexa::status_pins({present, state}, m_FixedIoBoxInfo);
+  vexa::take_status_pins({present, state}, m_FixedIoBoxInfo, pins);
   m_LastIoDataTime = now;
   return pins.empty() ? LIBD_NO_FRAME : LIBD_OK;
+} catch (const std::bad_alloc&) {
+  return FailMemory();
 }
 
 ELibDReturnCode CVexaCommon::GetCurrentIoStatus(std::vector<SLibDPinInfo>& pins) {

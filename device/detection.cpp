@@ -1,7 +1,6 @@
 // Detection settings, and the switches of the detectors.
 #include "device/cgi/detection_text.h"
 
-#include <cerrno>
 #include <new>
 
 #include "device/cgi/alarm_text.h"
@@ -15,14 +14,12 @@ constexpr int kDetectionTimeout = 10000;  // milliseconds
 
 }  // namespace
 
+// Safe: settings that memory does not hold are a failure and not an exception.
 ELibDReturnCode CVexaCommon::GetObjectDetectionSetting(std::vector<SLibDDetectionParam>& params,
-                                                       ELibDPositionMode& mode) {
-  try {
-    return m_LodDetection ? AskLodDetection(params) : AskObjectDetection(params, mode);
-  } catch (const std::bad_alloc&) {
-    FailSystem(ENOMEM);
-    return LIBD_FAILED;
-  }
+                                                       ELibDPositionMode& mode) try {
+  return m_LodDetection ? AskLodDetection(params) : AskObjectDetection(params, mode);
+} catch (const std::bad_alloc&) {
+  return FailMemory();
 }
 
 ELibDReturnCode CVexaCommon::AskLodDetection(std::vector<SLibDDetectionParam>& params) {
@@ -58,7 +55,8 @@ ELibDReturnCode CVexaCommon::SetDetectionParam(SLibDDetectionParam& param) {
                      param.windows[0].sensitivity);
 }
 
-ELibDReturnCode CVexaCommon::SetObjectDetectionParameter(SLibDDetectionParam& param, int& socket) {
+// Safe: as GetObjectDetectionSetting.
+ELibDReturnCode CVexaCommon::SetObjectDetectionParameter(SLibDDetectionParam& param, int& socket) try {
   // Safe: a model class may bring areas that nobody has looked at; corners that are not there are not read.
   if (CheckDetectionParamDetectionArea(param) != LIBD_OK) return LIBD_INVALID_ARGUMENT;
   const vexa::RaisedTimeout slow(m_ConnectionInfo.timeout, m_ConnectionLock, {kDetectionTimeout, m_SavedTimeout});
@@ -68,6 +66,8 @@ ELibDReturnCode CVexaCommon::SetObjectDetectionParameter(SLibDDetectionParam& pa
     http_close(socket);
   }
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  return FailMemory();
 }
 
 ELibDReturnCode CVexaCommon::ConverObjectWidthValueToString(SLibDDetectionParam& param, std::string& text) {

@@ -1,5 +1,4 @@
 // Exposure and image controls. Setters send one request; getters read the cached answer of the camera inquiry.
-#include <cerrno>
 #include <new>
 
 #include "device/cgi/image_text.h"
@@ -85,9 +84,7 @@ ELibDReturnCode CVexaCommon::Bright(int step) try {
       GetIrisPositionFromCameraData(answer, value, entry) && GetIrisPositionFromIrisList(step, value, entry);
   return moves ? SendCommand("/command/camera.cgi?Iris=%d", value) : LIBD_OK;
 } catch (const std::bad_alloc&) {
-  ClearLatestError();
-  FailSystem(ENOMEM);
-  return LIBD_FAILED;
+  return FailMemory();
 }
 
 ELibDReturnCode CVexaCommon::CheckAmountOfBrightness(int step) {
@@ -132,7 +129,8 @@ bool CVexaCommon::GetIrisPositionFromIrisList(int step, int& value, unsigned ent
   return entry < modes.size() && step_along(modes[entry].irisPositions, step, value);
 }
 
-ELibDReturnCode CVexaCommon::BrightAbsolute(int level) {
+// Safe: as GetIRIlluminator.
+ELibDReturnCode CVexaCommon::BrightAbsolute(int level) try {
   if (static_cast<unsigned>(level) > kLargestLevel) return LIBD_INVALID_ARGUMENT;
   const std::string mode = StoredBrightMode();
   const auto control = vexa::exposure_control_of(mode);
@@ -147,6 +145,8 @@ ELibDReturnCode CVexaCommon::BrightAbsolute(int level) {
   const int value = vexa::exposure_value(level, steps.back().value);
   return shutter ? SendCommand("/command/camera.cgi?Shutter=%d", value)
                  : SendCommand("/command/camera.cgi?Iris=%d", value);
+} catch (const std::bad_alloc&) {
+  return FailMemory();
 }
 
 // Safe: an answer that memory does not hold is a failure and not an exception.
@@ -160,8 +160,7 @@ bool CVexaCommon::CameraInquiry(std::string& answer) try {
   StoreCameraInquiry(answer);
   return true;
 } catch (const std::bad_alloc&) {
-  ClearLatestError();
-  FailSystem(ENOMEM);
+  FailMemory();
   return false;
 }
 
@@ -231,9 +230,7 @@ ELibDReturnCode CVexaCommon::GetIRIlluminator(ELibIRIlluminatorMode& mode, int& 
   if (read_word(answer, "&IRLed=", vexa::kIlluminatorWords, mode) != LIBD_OK) return LIBD_FAILED;
   return read_number(answer, "&IRLedMaxStrength=", strength) ? LIBD_OK : LIBD_FAILED;
 } catch (const std::bad_alloc&) {
-  ClearLatestError();
-  FailSystem(ENOMEM);
-  return LIBD_FAILED;
+  return FailMemory();
 }
 
 // Kept: any mode that is not day/night switches the illuminator off; there is no wrong mode.

@@ -1,5 +1,6 @@
 // What the model variants do in their own way: exposure modes, and the output that the picture goes to.
 #include <algorithm>
+#include <new>
 #include <string_view>
 
 #include "device/cgi/image_text.h"
@@ -31,7 +32,8 @@ ELibDReturnCode CVexaCommon::BringVideoToNetwork(const std::string& systemAnswer
   return SendCommand("/command/system.cgi?VideoOutMode=ip");
 }
 
-ELibDReturnCode CVexaCommon::ReadSystemBringingVideo(SLibDSystemInfo& info) {
+// Safe: as CVexaCommon::GetCurrentSystemInfo.
+ELibDReturnCode CVexaCommon::ReadSystemBringingVideo(SLibDSystemInfo& info) try {
   std::string answer;
   if (SendInqCommand("system", answer) != LIBD_OK) return LatestErrorCode();
   GetCommonSystemInfo(info, answer);
@@ -39,6 +41,8 @@ ELibDReturnCode CVexaCommon::ReadSystemBringingVideo(SLibDSystemInfo& info) {
   if (brought != LIBD_OK) return brought;
   if (SendInqCommand("network", answer) != LIBD_OK) return LatestErrorCode();
   return GetCommonNetworkInfo(info, answer);
+} catch (const std::bad_alloc&) {
+  return FailMemory();
 }
 
 ELibDReturnCode CVexaCommon::AskVideoOutMode(ELibVideoOutMode& mode) {
@@ -52,7 +56,8 @@ ELibDReturnCode CVexaCommon::AskVideoOutMode(ELibVideoOutMode& mode) {
   return LIBD_OK;
 }
 
-ELibDReturnCode CVexaHeronCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) {
+// Safe: as CVexaCommon::GetCurrentSystemInfo.
+ELibDReturnCode CVexaHeronCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) try {
   std::string system;
   if (SendInqCommand("system", system) != LIBD_OK) return LatestErrorCode();
   GetCommonSystemInfo(info, system);
@@ -60,6 +65,8 @@ ELibDReturnCode CVexaHeronCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) {
   if (SendInqCommand("network", network) != LIBD_OK) return LatestErrorCode();
   GetCommonNetworkInfo(info, network);
   return BringVideoToNetwork(system);
+} catch (const std::bad_alloc&) {
+  return FailMemory();
 }
 
 ELibDReturnCode CVexaHeronCommon::SetBrightMode(std::string&) { return LIBD_NOT_SUPPORTED; }

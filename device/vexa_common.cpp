@@ -1,5 +1,6 @@
 #include "vexa/vexa_common.h"
 
+#include <cerrno>
 #include <cstring>
 
 #include "device/driver_state.h"
@@ -91,6 +92,12 @@ int CVexaCommon::FailSystem(int error) {
   char text[256];
   // The GNU form: answers where the text is.
   return Fail({LIBD_FAILED, strerror_r(error, text, sizeof text)});
+}
+
+ELibDReturnCode CVexaCommon::FailMemory() {
+  ClearLatestError();
+  FailSystem(ENOMEM);
+  return LIBD_FAILED;
 }
 
 int CVexaCommon::FailWait(int answer, const vexa::Failure& expired) {

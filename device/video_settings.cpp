@@ -1,6 +1,6 @@
 // Video settings of one stream, and the codecs and sizes that the camera's properties leave.
-#include <cerrno>
 #include <new>
+#include <utility>
 
 #include "device/cgi/video_text.h"
 #include "device/driver_state.h"
@@ -71,8 +71,7 @@ ELibDReturnCode CVexaCommon::GetCameraInfo(SLibDCameraInfo& info) try {
   info = m_CameraInfo;
   return LIBD_OK;
 } catch (const std::bad_alloc&) {
-  FailSystem(ENOMEM);
-  return LIBD_FAILED;
+  return FailMemory();
 }
 
 void CVexaCommon::StoreCameraInquiry(const std::string& answer) {
@@ -185,7 +184,9 @@ void CVexaCommon::ReadVideoPorts(const std::string& answer) {
   }
 }
 
-ELibDReturnCode CVexaCommon::SetCameraInfo(SLibDCameraInfo& info) {
+// Safe: as GetCameraInfo; a record that memory does not hold twice is not sent.
+ELibDReturnCode CVexaCommon::SetCameraInfo(SLibDCameraInfo& info) try {
+  SLibDCameraInfo stored = info;
   const vexa::CodecRequest codec = vexa::codec_request(info);
   const int stream = info.streamNumber;
   const ELibDReturnCode sent =
@@ -198,8 +199,10 @@ ELibDReturnCode CVexaCommon::SetCameraInfo(SLibDCameraInfo& info) {
                         stream, codec.rate);
   if (sent != LIBD_OK) return sent;
   const vexa::Guard guard(m_ConnectionLock);
-  m_CameraInfo = info;
+  std::swap(m_CameraInfo, stored);
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  return FailMemory();
 }
 
 bool CVexaCommon::TakesElectronicFlip() {
@@ -207,11 +210,14 @@ bool CVexaCommon::TakesElectronicFlip() {
   return m_FixedCameraInfo.electronicFlip != 0;
 }
 
-ELibDReturnCode CVexaCommon::GetFixedCameraInfo(SLibDFixedCameraInfo& info) {
+// Safe: as GetCameraInfo.
+ELibDReturnCode CVexaCommon::GetFixedCameraInfo(SLibDFixedCameraInfo& info) try {
   const vexa::Guard guard(m_State->filter_lock);
   if (!m_FixedCameraInfoAvailable) return LIBD_NOT_SUPPORTED;
   info = m_FixedCameraInfo;
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  return FailMemory();
 }
 
 // Kept: the standard is passed on and not stored; what is offered stays until the camera reports the standard.
@@ -221,25 +227,34 @@ ELibDReturnCode CVexaCommon::SetVideoStandard(ELibDVideoStandard standard) {
   return LIBD_OK;
 }
 
-ELibDReturnCode CVexaCommon::SetVidCapSize(int width, int height) {
+// Safe: as GetCameraInfo.
+ELibDReturnCode CVexaCommon::SetVidCapSize(int width, int height) try {
   const vexa::Guard guard(m_State->filter_lock);
   InitializeFixedVideoParams(StoredVideoStandard(), width, height);
   FilterBy(kCaptureSizeFilter, vexa::format_within(kCaptureSizeRoom, "%d,%d", width, height).text);
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  return FailMemory();
 }
 
-ELibDReturnCode CVexaCommon::SetSolidPTZState(bool on) {
+// Safe: as GetCameraInfo.
+ELibDReturnCode CVexaCommon::SetSolidPTZState(bool on) try {
   const vexa::Guard guard(m_State->filter_lock);
   InitializeFixedVideoParams(StoredVideoStandard(), kNoSize, kNoSize);
   FilterBy(kSolidPtzFilter, on ? "on" : "off");
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  return FailMemory();
 }
 
-ELibDReturnCode CVexaCommon::SetImageMaxSize(int width, int height, ELibDVideoStandard standard) {
+// Safe: as GetCameraInfo.
+ELibDReturnCode CVexaCommon::SetImageMaxSize(int width, int height, ELibDVideoStandard standard) try {
   const vexa::Guard guard(m_State->filter_lock);
   InitializeFixedVideoParams(standard, width, height);
   FilterBy(kMaxSizeFilter, vexa::format_within(kMaxSizeRoom, "%d,%d", width, height).text);
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  return FailMemory();
 }
 
 ELibDVideoStandard CVexaCommon::StoredVideoStandard() {

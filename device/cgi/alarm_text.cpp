@@ -8,7 +8,6 @@ namespace {
 
 constexpr std::int64_t kLongestTampering = 59;  // seconds
 constexpr std::int64_t kSilenceGrace = 15;      // seconds
-constexpr int kMaskBits = 32;
 
 constexpr Word<bool> kDetectorWords[] = {{true, "on"}, {false, "off"}};
 
@@ -90,16 +89,15 @@ std::vector<SLibDPinInfo> sensor_pins(std::string_view answer) {
   return pins;
 }
 
-std::vector<SLibDPinInfo> status_pins(PinMasks masks, const SLibDFixedIoBoxInfo& fixed) {
-  std::vector<SLibDPinInfo> pins;
+void take_status_pins(PinMasks masks, const SLibDFixedIoBoxInfo& fixed, std::vector<SLibDPinInfo>& pins) {
+  pins.clear();
   DetectorTypes detectors(fixed);
-  for (int bit = 0; bit < kMaskBits; ++bit) {
+  for (int bit = 0; bit < static_cast<int>(kMostStatusPins); ++bit) {
     if ((masks.present >> bit & 1) == 0) continue;
     const std::int32_t number = bit + 1;
     pins.push_back(pin_of(number, number > fixed.inputCount ? detectors.next() : PIN_TYPE_SENSOR_INPUT));
     pins.back().state = static_cast<std::int32_t>(masks.state >> bit & 1);
   }
-  return pins;
 }
 
 bool tampering_is_due(std::int32_t state, std::time_t now, std::time_t& since) {

@@ -39,9 +39,11 @@ struct PinMasks {
   std::uint32_t state;
 };
 
-/// The pins that the camera spoke of, in order. Behind the inputs stand the detectors it has: video detection,
-/// tampering, audio.
-std::vector<SLibDPinInfo> status_pins(PinMasks masks, const SLibDFixedIoBoxInfo& fixed);
+inline constexpr std::size_t kMostStatusPins = 32;
+
+/// Replaces `pins` by those that the camera spoke of, in order. Behind the inputs stand the detectors it has: video
+/// detection, tampering, audio. Allocates nothing when there is room for kMostStatusPins.
+void take_status_pins(PinMasks masks, const SLibDFixedIoBoxInfo& fixed, std::vector<SLibDPinInfo>& pins);
 
 /// A tampering pin of `state` was reported at `now`. True when it has been active for a minute and is to be cleared on
 /// the camera. `since` is when it was first seen active, 0 when it is not.

@@ -512,6 +512,8 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   int Fail(const vexa::Failure& failure);
   int FailSystem();
   int FailSystem(int error);
+  /// Records that memory does not hold what an operation needs; LIBD_FAILED.
+  ELibDReturnCode FailMemory();
   /// Records a wait that did not answer 1; -1.
   int FailWait(int answer, const vexa::Failure& expired);
   void ClearLatestError();

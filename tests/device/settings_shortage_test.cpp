@@ -6,6 +6,7 @@
 #include "tests/device/settings_exchange.h"
 #include "tests/support/failing_new.h"
 #include "tests/support/test_driver.h"
+#include "vexa/vexa_variants.h"
 
 namespace {
 
@@ -97,6 +98,106 @@ TEST(ShortMemory, FailsAReadingOutOfTheCache) {
     if (std::string(row.name) == "CameraInfo") continue;
     EXPECT_GT(failed_readings(row, kLongAnswer), 0) << row.name;
   }
+}
+
+// ---- Calls that need no camera ----
+
+using ShortCall = ELibDReturnCode (*)(SettingsDriver&);
+
+struct ShortCallRow {
+  const char* name;
+  ShortCall call;
+};
+
+const ShortCallRow kShortCalls[] = {
+    {"VidCapSize", [](SettingsDriver& d) { return d.SetVidCapSize(1280, 720); }},
+    {"SolidPTZ", [](SettingsDriver& d) { return d.SetSolidPTZState(true); }},
+    {"ImageMaxSize", [](SettingsDriver& d) { return d.SetImageMaxSize(640, 480, LIBD_VIDEO_PAL); }},
+    {"FixedCameraInfo",
+     [](SettingsDriver& d) {
+       SLibDFixedCameraInfo info;
+       return d.GetFixedCameraInfo(info);
+     }},
+    // A mode of which the camera lists no steps: nothing is sent.
+    {"BrightAbsolute", [](SettingsDriver& d) { return d.BrightAbsolute(5000); }}};
+
+TEST(ShortMemory, FailsACallThatNeedsNoCamera) {
+  for (const ShortCallRow& row : kShortCalls) {
+    for (int nth = 0;; ++nth) {
+      ASSERT_LT(nth, 1000) << row.name;
+      SettingsDriver driver;
+      driver.m_FixedCameraInfoAvailable = true;
+      driver.m_PTZControlInfo.brightMode = "Shutter Priority";
+      ASSERT_EQ(driver.SetSolidPTZState(false), LIBD_OK);
+      ELibDReturnCode result = LIBD_OK;
+      bool happened = false;
+      {
+        AllocationFailure failure(nth);
+        result = row.call(driver);
+        happened = failure.happened();
+      }
+      EXPECT_EQ(result, happened ? LIBD_FAILED : LIBD_OK) << row.name << nth;
+      if (!happened) {
+        EXPECT_GT(nth, 0) << row.name;
+        break;
+      }
+      EXPECT_EQ(vexa_test::text_of_latest_error(driver), "Cannot allocate memory") << row.name << nth;
+    }
+  }
+}
+
+TEST(ShortMemory, LeavesTheRecordOfASettingThatFails) {
+  const std::string path = "/command/camera.cgi?ImageCodec1=jpeg&ImageSize1=1,2&FrameRate1=3&Quality1=4";
+  SLibDCameraInfo set;
+  set.codecName = set.imageSizeText = std::string(500, 'x');
+  set.imageWidth = 1;
+  set.imageHeight = 2;
+  set.frameRate = 3;
+  set.quality = 4;
+  for (int nth = 0;; ++nth) {
+    ASSERT_LT(nth, 1000);
+    Played<CVexaCommon> play({vexa_test::command(path)});
+    ELibDReturnCode result = LIBD_OK;
+    bool happened = false;
+    {
+      AllocationFailure failure(nth);
+      result = play.driver.SetCameraInfo(set);
+      happened = failure.happened();
+    }
+    EXPECT_EQ(result, happened ? LIBD_FAILED : LIBD_OK) << nth;
+    EXPECT_EQ(play.driver.m_CameraInfo.frameRate, happened ? 0 : 3) << nth;
+    EXPECT_EQ(play.driver.m_CameraInfo.codecName, happened ? "" : set.codecName) << nth;
+    if (!happened) break;
+  }
+}
+
+template <typename Driver>
+void fail_system_info(const vexa_test::Script& script) {
+  for (int nth = 0;; ++nth) {
+    ASSERT_LT(nth, 1000);
+    Played<Driver> play(script);
+    SLibDSystemInfo info;
+    ELibDReturnCode result = LIBD_OK;
+    bool happened = false;
+    {
+      AllocationFailure failure(nth);
+      result = static_cast<CLibraryDevice&>(play.driver).GetCurrentSystemInfo(info);
+      happened = failure.happened();
+    }
+    EXPECT_EQ(result, happened ? LIBD_FAILED : LIBD_OK) << nth;
+    if (!happened) break;
+    EXPECT_EQ(vexa_test::text_of_latest_error(play.driver), "Cannot allocate memory") << nth;
+  }
+}
+
+TEST(ShortMemory, FailsReadingWhatTheCameraIs) {
+  const std::string name(600, 'N');
+  const auto system = inquiry("system", "ModelName=" + name + "&SoftVersion=" + name + "&VideoOutMode=pal");
+  const auto network = inquiry("network", "MacAddress=" + name);
+  const auto output = vexa_test::command("/command/system.cgi?VideoOutMode=ip");
+  fail_system_info<CVexaCommon>({system, network});
+  fail_system_info<CVexaHeronCommon>({system, network, output});
+  fail_system_info<CVexaSimplePTZCommon>({system, output, network});
 }
 
 TEST(ShortMemory, FailsACommandBeforeTheCameraIsAsked) {

@@ -13,6 +13,12 @@ namespace {
 using vexa_test::PinRow;
 using vexa_test::rows_of;
 
+std::vector<SLibDPinInfo> status_pins(PinMasks masks, const SLibDFixedIoBoxInfo& fixed) {
+  std::vector<SLibDPinInfo> pins(3);
+  take_status_pins(masks, fixed, pins);
+  return pins;
+}
+
 SLibDFixedIoBoxInfo box_of(int inputs, int outputs) {
   SLibDFixedIoBoxInfo fixed;
   fixed.inputCount = inputs;

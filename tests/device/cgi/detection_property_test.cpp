@@ -8,32 +8,14 @@
 #include <vector>
 
 #include "device/cgi/detection_text.h"
-#include "tests/device/detection_records.h"
+#include "tests/device/any_detection.h"
 
 namespace vexa {
 namespace {
 
-SLibDDetectionWindow any_window() {
-  SLibDDetectionWindow window;
-  window.enabled = *rc::gen::arbitrary<int>();
-  window.mode = *rc::gen::arbitrary<int>();
-  window.area = {{*rc::gen::arbitrary<int>(), *rc::gen::arbitrary<int>()},
-                 {*rc::gen::arbitrary<int>(), *rc::gen::arbitrary<int>()}};
-  return window;
-}
-
-SLibDDetectionParam any_setting(int number) {
-  SLibDDetectionParam param;
-  param.number = number;
-  for (SLibDDetectionWindow& window : param.windows) window = any_window();
-  SLibDDetectionWindow& first = param.windows[0];
-  first.minObjectWidth = *rc::gen::arbitrary<int>();
-  first.minObjectHeight = *rc::gen::arbitrary<int>();
-  first.maxObjectWidth = *rc::gen::arbitrary<int>();
-  first.maxObjectHeight = *rc::gen::arbitrary<int>();
-  first.sensitivity = *rc::gen::inRange(1, 101);
-  return param;
-}
+using vexa_test::any_setting;
+using vexa_test::as_told;
+using vexa_test::setting_rows;
 
 /// Two digits at least, zeros and a sign among them.
 std::string two_digits(int number) {
@@ -66,21 +48,6 @@ std::string expected_windows(const SLibDDetectionParam& param, int first) {
   return text;
 }
 
-/// What an answer can tell of a setting.
-SLibDDetectionParam as_told(SLibDDetectionParam param) {
-  const SLibDDetectionWindow first = param.windows[0];
-  for (SLibDDetectionWindow& w : param.windows) {
-    w.enabled = w.enabled == 1 ? 1 : 0;
-    w.mode = w.mode == 0 ? 0 : 1;
-    w.minObjectWidth = first.minObjectWidth;
-    w.minObjectHeight = first.minObjectHeight;
-    w.maxObjectWidth = first.maxObjectWidth;
-    w.maxObjectHeight = first.maxObjectHeight;
-    w.sensitivity = first.sensitivity;
-  }
-  return param;
-}
-
 std::string items_of(const std::string& request) { return "&" + request.substr(request.find('?') + 1); }
 
 std::string answer_items(const SLibDDetectionParam& param) {
@@ -105,7 +72,7 @@ RC_GTEST_PROP(DetectionRequests, ReadBackEqual, ()) {
   const auto read = object_settings(answer, true);
   RC_ASSERT(read.size() == sent.size());
   for (std::size_t i = 0; i < read.size(); ++i) {
-    RC_ASSERT(vexa_test::setting_rows(read[i]) == vexa_test::setting_rows(as_told(sent[i])));
+    RC_ASSERT(setting_rows(read[i]) == setting_rows(as_told(sent[i])));
   }
 }
 
