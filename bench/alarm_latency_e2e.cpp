@@ -76,12 +76,10 @@ class Watcher : public CVexaCommon {
  public:
   explicit Watcher(std::size_t camera) : camera_(camera) {
     m_FixedIoBoxInfo.inputCount = 2;
-    SLibDConnectionInfo info;
-    info.host = vexa::camera::address_after(kFirstAddress, camera);
-    info.port = kHttpPort;
-    info.timeout = kTimeout;
-    info.userName = info.password = "admin";
-    SetCurrentConnectionInfo(info);
+    m_ConnectionInfo.host = vexa::camera::address_after(kFirstAddress, camera);
+    m_ConnectionInfo.port = kHttpPort;
+    m_ConnectionInfo.timeout = m_SavedTimeout = kTimeout;
+    m_ConnectionInfo.userName = m_ConnectionInfo.password = "admin";
   }
 
   bool start() {

@@ -45,12 +45,10 @@ double cpu_now() {
 class Driver : public CVexaCommon {
  public:
   Driver() {
-    SLibDConnectionInfo info;
-    info.host = kAddress;
-    info.port = kHttpPort;
-    info.timeout = 5000;
-    info.userName = info.password = "admin";
-    SetCurrentConnectionInfo(info);
+    m_ConnectionInfo.host = kAddress;
+    m_ConnectionInfo.port = kHttpPort;
+    m_ConnectionInfo.timeout = 5000;
+    m_ConnectionInfo.userName = m_ConnectionInfo.password = "admin";
   }
 
   /// A property that the camera reports differs from what is stored, so the offer is made anew.

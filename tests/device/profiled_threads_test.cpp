@@ -10,6 +10,7 @@
 #include "tests/media/media_driver.h"
 #include "tests/media/pace.h"
 #include "tests/support/own_address.h"
+#include "tests/support/temporary_folder.h"
 #include "vexa/models.h"
 #include "virtual_camera/virtual_camera.h"
 
@@ -77,6 +78,7 @@ class ProfiledThreads : public testing::TestWithParam<const char*> {
     camera_ = std::make_unique<vexa::camera::VirtualCamera>(options);
     ASSERT_TRUE(camera_->start()) << camera_->error();
     device_ = vexa::MakeDevice(profile);
+    device_->SetCGILogPath((folder_ / "cgi.log").c_str());
     SLibDConnectionInfo connection;
     connection.streamTransport = 1;
     connection.host = options.address;
@@ -124,6 +126,7 @@ class ProfiledThreads : public testing::TestWithParam<const char*> {
     shape_offer();
   }
 
+  TemporaryFolder folder_;
   std::unique_ptr<vexa::camera::VirtualCamera> camera_;
   std::unique_ptr<CLibraryDevice> device_;
 };

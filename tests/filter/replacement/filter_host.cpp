@@ -17,6 +17,13 @@ class Model : public CVexaCommon {
     m_FixedSystemInfo.modelName = "LMX-C100";
     m_FixedCameraInfoAvailable = true;
   }
+
+  void use(const vexa::camera::VirtualCamera& camera) {
+    m_ConnectionInfo.host = camera.address();
+    m_ConnectionInfo.port = camera.http_port();
+    m_ConnectionInfo.timeout = 10000;
+    m_ConnectionInfo.userName = m_ConnectionInfo.password = "admin";
+  }
 };
 
 void print_offer(Model& driver) {
@@ -50,13 +57,7 @@ int read_answers(const std::vector<std::string>& answers) {
   vexa::camera::VirtualCamera camera(options);
   if (!camera.start()) return 1;
   Model driver;
-  SLibDConnectionInfo connection;
-  connection.host = camera.address();
-  connection.port = camera.http_port();
-  connection.timeout = 10000;
-  connection.userName = options.user;
-  connection.password = options.password;
-  driver.SetCurrentConnectionInfo(connection);
+  driver.use(camera);
   for (const std::string& answer : answers) {
     camera.settings().set_answer("camera", answer);
     SLibDCameraInfo info;
