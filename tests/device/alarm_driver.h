@@ -10,6 +10,7 @@
 
 #include <atomic>
 #include <ctime>
+#include <functional>
 #include <map>
 #include <mutex>
 #include <string>
@@ -117,6 +118,12 @@ class AlarmCamera {
     set_answer("/command/inquiry.cgi?inq=" + name, "HTTP/1.0 200 OK\r\n\r\n" + body);
   }
 
+  /// Called with the path of each request before its answer, by the camera's thread.
+  void observe(std::function<void(const std::string&)> observer) {
+    const std::lock_guard<std::mutex> guard(mutex_);
+    observer_ = std::move(observer);
+  }
+
   /// The paths asked for since the last time.
   std::vector<std::string> requests() {
     const std::lock_guard<std::mutex> guard(mutex_);
@@ -178,6 +185,7 @@ class AlarmCamera {
     const std::string path = begin == std::string::npos ? std::string() : url.substr(begin);
     const std::lock_guard<std::mutex> guard(mutex_);
     requests_.push_back(path);
+    if (observer_) observer_(path);
     const auto set = answers_.find(path);
     const std::string said = set != answers_.end() ? set->second : "HTTP/1.0 204 No Content\r\n\r\n";
     if (!said.empty()) send(connection, said.data(), said.size(), MSG_NOSIGNAL);
@@ -195,6 +203,7 @@ class AlarmCamera {
   std::mutex mutex_;
   std::map<std::string, std::string> answers_;
   std::vector<std::string> requests_;
+  std::function<void(const std::string&)> observer_;
   std::vector<int> streams_;
   std::thread thread_;
 };

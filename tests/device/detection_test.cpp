@@ -185,6 +185,25 @@ TEST_F(Detection, OfObjectsIsSetByThreeRequests) {
             LIBD_OK);
 }
 
+TEST_F(Detection, OfObjectsWaitsTenSecondsForEachAnswer) {
+  std::vector<int> timeouts;
+  const auto noting = [&](ScriptStep step) {
+    step.meanwhile = [&] { timeouts.push_back(driver_.timeout()); };
+    return step;
+  };
+  const SLibDDetectionParam param = marked_setting(5);
+  EXPECT_EQ(set(param,
+                {noting(command(vexa::object_size_request(param))), noting(command(vexa::first_windows_request(param))),
+                 noting(command(vexa::last_windows_request(param)))}),
+            LIBD_OK);
+  EXPECT_EQ(ask({noting(inquiry("objectdetection", "ODPreDef=0"))}), LIBD_OK);
+  EXPECT_EQ(timeouts, (std::vector<int>{10000, 10000, 10000, 10000}));
+  timeouts.clear();
+  driver_.m_LodDetection = true;
+  EXPECT_EQ(ask({noting(inquiry("lod", "LODMinObjectSize=small&LODSensitivity=1"))}), LIBD_OK);
+  EXPECT_EQ(timeouts, std::vector<int>{kPatientTimeout});
+}
+
 TEST_F(Detection, OfObjectsSendsNoMoreAfterARefusal) {
   const SLibDDetectionParam param = marked_setting(1);
   for (std::size_t refused = 0; refused < 3; ++refused) {

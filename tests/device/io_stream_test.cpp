@@ -57,6 +57,19 @@ TEST_F(IoStream, IsOpenedBetweenSwitchingOnAndTheSensorInquiry) {
   EXPECT_EQ(camera_.closed_streams(1), 1U);
 }
 
+TEST_F(IoStream, WaitsTenSecondsForTheRequestsThatTakeLong) {
+  RequestPaths timeouts;
+  camera_.observe([&](const std::string& path) { timeouts.push_back(path + " " + std::to_string(driver_.timeout())); });
+  stream();
+  report_tampering(1);
+  alarm_clock_now += 60;
+  report_tampering(1);
+  EXPECT_EQ(driver_.StopIoStreaming(), LIBD_OK);
+  EXPECT_EQ(timeouts, (RequestPaths{std::string(kAlarmsOn) + " 10000", std::string(AlarmCamera::kAlarms) + " 10000",
+                                    std::string(kSensorInquiry) + " 5000", std::string(kClearTampering) + " 10000",
+                                    std::string(kAlarmsOff) + " 5000"}));
+}
+
 TEST_F(IoStream, HandsOutTheInputsStatesOnceBeforeItReads) {
   ASSERT_EQ(driver_.StartIoStreaming(), LIBD_OK);
   camera_.say(alarm_part("Sensor1=0&Sensor2=1"));
