@@ -25,6 +25,7 @@
 namespace vexa::camera {
 
 class Connection;
+class LiveVideo;
 class RtspSession;
 
 // Held by every connection, so it outlives the last of them. Members without a lock of their own belong to the loop's
@@ -63,6 +64,7 @@ struct CameraState {
   PacketFaults packet_faults;  // under packet_faults_mutex; options hold those given at the start
   std::vector<std::weak_ptr<Connection>> connections;
   std::map<std::uint32_t, std::shared_ptr<RtspSession>> sessions;
+  std::map<int, std::weak_ptr<LiveVideo>> live;  // what renders a stream, while somebody watches it
   std::uint32_t next_session;
   std::uint64_t plays = 0;                                // streams begun
   std::function<void(std::chrono::milliseconds)> reboot;  // empty while the camera is stopped

@@ -109,7 +109,7 @@ std::vector<std::string> Clip::delivered() const {
   std::vector<std::string> pictures;
   for (const AccessUnit& picture : access_units_) {
     const std::vector<std::uint8_t> bytes = picture.as_delivered();
-    pictures.emplace_back(bytes.begin(), bytes.end());
+    pictures.emplace_back(reinterpret_cast<const char*>(bytes.data()), bytes.size());
   }
   return pictures;
 }

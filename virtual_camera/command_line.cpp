@@ -59,6 +59,10 @@ void add_stream(CLI::App& app, CameraOptions& camera) {
   app.add_option("--profile", camera.profile_path,
                  "profile of the camera model; without --clip it streams what its settings say")
       ->check(CLI::ExistingFile);
+  camera.pictures_made = PicturesMade::kOfTheScene;
+  app.add_flag_callback(
+      "--drawn", [&camera] { camera.pictures_made = PicturesMade::kDrawn; },
+      "with --profile: draw simple pictures instead of the scene, which takes an encoder for each stream watched");
   app.add_option("--clip", camera.clip_path,
                  "file to stream over RTP: H.264 (.h264, Annex B), MPEG-4 (.m4v) or JPEG (.mjpeg)")
       ->check(CLI::ExistingFile);

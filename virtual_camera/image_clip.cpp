@@ -34,28 +34,29 @@ std::optional<std::size_t> scan_of(std::string_view bytes, std::size_t begin) {
   return std::nullopt;
 }
 
-std::vector<std::string> cut_h264(std::string_view bytes) { return Clip::from_annex_b(bytes).delivered(); }
-
 }  // namespace
 
 ImageClip::ImageClip(ImageKind kind, std::vector<std::string> pictures) : kind_(kind), pictures_(std::move(pictures)) {
   for (const std::string& picture : pictures_) keys_.push_back(is_key_picture(kind_, picture));
 }
 
+ImageClip::ImageClip(const Clip& clip) : kind_(ImageKind::kH264), pictures_(clip.delivered()) {
+  for (const AccessUnit& picture : clip.access_units()) keys_.push_back(picture.key);
+}
+
 std::shared_ptr<const ImageClip> ImageClip::load(const std::string& path) {
   const struct {
     std::string_view extension;
-    ImageKind kind;
-    std::vector<std::string> (*cut)(std::string_view);
-  } kinds[] = {{".mjpeg", ImageKind::kJpeg, cut_jpeg},
-               {".h264", ImageKind::kH264, cut_h264},
-               {".m4v", ImageKind::kMpeg4, cut_mpeg4}};
+    ImageClip (*cut)(std::string_view);
+  } kinds[] = {{".mjpeg", [](std::string_view bytes) { return ImageClip(ImageKind::kJpeg, cut_jpeg(bytes)); }},
+               {".h264", [](std::string_view bytes) { return ImageClip(Clip::from_annex_b(bytes)); }},
+               {".m4v", [](std::string_view bytes) { return ImageClip(ImageKind::kMpeg4, cut_mpeg4(bytes)); }}};
   for (const auto& row : kinds) {
     if (!path.ends_with(row.extension)) continue;
     std::ifstream file(path, std::ios::binary);
     const std::string bytes((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
-    std::vector<std::string> pictures = row.cut(bytes);
-    if (!pictures.empty()) return std::make_shared<const ImageClip>(row.kind, std::move(pictures));
+    ImageClip clip = row.cut(bytes);
+    if (!clip.pictures().empty()) return std::make_shared<const ImageClip>(std::move(clip));
   }
   return nullptr;
 }

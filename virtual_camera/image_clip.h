@@ -9,6 +9,8 @@
 
 namespace vexa::camera {
 
+class Clip;
+
 enum class ImageKind { kJpeg, kH264, kMpeg4 };
 
 // A clip cut into pictures. Immutable, shared by any number of cameras.
@@ -19,6 +21,7 @@ class ImageClip {
   [[nodiscard]] static std::shared_ptr<const ImageClip> load(const std::string& path);
 
   ImageClip(ImageKind kind, std::vector<std::string> pictures);
+  explicit ImageClip(const Clip& clip);  // H.264
 
   [[nodiscard]] ImageKind kind() const { return kind_; }
   // H.264 pictures have start codes of four bytes throughout.

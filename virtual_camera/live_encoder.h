@@ -22,6 +22,8 @@ struct LiveEncoding {
   int bit_rate = 2000;   // kbit/s; not JPEG's
   int quality = 5;       // JPEG's: 1 to 10, the best
   int key_interval = 0;  // pictures from key picture to key picture; 0: a second of them
+
+  bool operator==(const LiveEncoding&) const = default;
 };
 
 struct EncodedPicture {

@@ -18,6 +18,10 @@ namespace vexa::camera {
 class PacketisedClip;
 class SettingRules;
 
+// How pictures are made as streams are set: drawn squares, which cost nothing, or the scene before the camera, painted
+// and encoded as they are sent. Builds without encoders draw.
+enum class PicturesMade { kDrawn, kOfTheScene };
+
 enum class SessionExpiry { kNever, kWhenSilent };
 
 struct CameraOptions {
@@ -31,6 +35,7 @@ struct CameraOptions {
   // takes, and what it streams where no clip is given. With neither, the camera takes every setting.
   std::string profile_path;
   std::shared_ptr<const SettingRules> profile;
+  PicturesMade pictures_made = PicturesMade::kDrawn;
 
   // The clip to stream over RTP: a file (".h264", else ".m4v" or ".mjpeg", as ImageClip has it), or one already loaded,
   // which wins and can be shared by many cameras. With neither, sessions open but carry no picture.

@@ -136,8 +136,7 @@ std::optional<PacketisedPicture> packetise(ImageKind codec, const std::string& p
   return packetise_jpeg(*jpeg, jpeg_user_data(text), max_payload);
 }
 
-PacketisedClip::PacketisedClip(Clip clip, std::size_t max_payload)
-    : clip_(std::move(clip)), images_(ImageKind::kH264, clip_.delivered()) {
+PacketisedClip::PacketisedClip(Clip clip, std::size_t max_payload) : clip_(std::move(clip)), images_(clip_) {
   pictures_.reserve(clip_.access_units().size());
   for (const AccessUnit& access_unit : clip_.access_units()) pictures_.emplace_back(access_unit, max_payload);
 }

@@ -12,6 +12,7 @@
 
 #include "virtual_camera/clip_source.h"
 #include "virtual_camera/drawn_video.h"
+#include "virtual_camera/rendered_video.h"
 
 namespace vexa::camera {
 namespace {
@@ -26,28 +27,30 @@ ClipSource::AtEnd at_end_of(const CameraOptions& options) {
   return options.loop ? ClipSource::AtEnd::kStartOver : ClipSource::AtEnd::kStop;
 }
 
-// The camera's word of a codec.
-std::optional<ImageKind> kind_of(std::string_view word) {
+// RTP tells the sides of a JPEG picture in units of 8, in one byte (RFC 2435, 3.1).
+bool rtp_carries(const StreamSettings& stream) {
+  const auto fits = [](int side) { return side % 8 == 0 && side <= 8 * 255; };
+  return codec_kind(stream.codec) != ImageKind::kJpeg || (fits(stream.width) && fits(stream.height));
+}
+
+// Null for a stream that is switched off.
+std::unique_ptr<PictureSource> open_made(CameraState& state, int number, const StreamSettings& stream) {
+  const auto codec = codec_kind(stream.codec);
+  if (!codec) return nullptr;
+  if (state.options.pictures_made == PicturesMade::kOfTheScene) {
+    if (std::unique_ptr<PictureSource> seen = watch_scene(state, number, stream)) return seen;
+  }
+  return std::make_unique<DrawnSource>(*codec, DrawnVideo{stream.width, stream.height, stream.frame_rate});
+}
+
+}  // namespace
+
+std::optional<ImageKind> codec_kind(std::string_view word) {
   if (word == "jpeg") return ImageKind::kJpeg;
   if (word == "mpeg4") return ImageKind::kMpeg4;
   if (word == "h264") return ImageKind::kH264;
   return std::nullopt;
 }
-
-// RTP tells the sides of a JPEG picture in units of 8, in one byte (RFC 2435, 3.1).
-bool rtp_carries(const StreamSettings& stream) {
-  const auto fits = [](int side) { return side % 8 == 0 && side <= 8 * 255; };
-  return kind_of(stream.codec) != ImageKind::kJpeg || (fits(stream.width) && fits(stream.height));
-}
-
-// Null for a stream that the camera lacks or has switched off.
-std::unique_ptr<PictureSource> open_made(const std::optional<StreamSettings>& stream) {
-  const auto codec = stream ? kind_of(stream->codec) : std::nullopt;
-  if (!codec) return nullptr;
-  return std::make_unique<DrawnSource>(*codec, DrawnVideo{stream->width, stream->height, stream->frame_rate});
-}
-
-}  // namespace
 
 std::optional<StreamSettings> stream_settings(const SettingsStore& settings, int number) {
   const auto value = [&](const char* name) { return settings.get("camera", fmt::format("{}{}", name, number)); };
@@ -64,7 +67,7 @@ std::optional<StreamSettings> stream_settings(const SettingsStore& settings, int
   return stream;
 }
 
-std::optional<StreamPlan> plan_stream(const CameraState& state, int number) {
+std::optional<StreamPlan> plan_stream(CameraState& state, int number) {
   const CameraOptions& options = state.options;
   if (options.clip) {
     auto clip = std::make_unique<ClipSource>(options.clip, options.frames_per_second, at_end_of(options));
@@ -74,17 +77,18 @@ std::optional<StreamPlan> plan_stream(const CameraState& state, int number) {
   if (!options.profile) return StreamPlan{};
   const auto stream = stream_settings(state.settings, number);
   if (!stream || !rtp_carries(*stream)) return std::nullopt;
-  StreamPlan plan{open_made(stream)};
+  StreamPlan plan{open_made(state, number, *stream)};
   if (!plan.source) return std::nullopt;
   return plan;
 }
 
-std::unique_ptr<PictureSource> plan_images(const CameraState& state, int number) {
+std::unique_ptr<PictureSource> plan_images(CameraState& state, int number) {
   const CameraOptions& options = state.options;
   if (options.images) {
     return std::make_unique<ClipSource>(options.images, options.frames_per_second, at_end_of(options));
   }
-  return options.profile ? open_made(stream_settings(state.settings, number)) : nullptr;
+  const auto stream = options.profile ? stream_settings(state.settings, number) : std::nullopt;
+  return stream ? open_made(state, number, *stream) : nullptr;
 }
 
 std::string present_user_data(const CameraState& state) {

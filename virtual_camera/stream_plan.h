@@ -5,6 +5,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <string_view>
 
 #include "virtual_camera/camera_state.h"
 #include "virtual_camera/picture_source.h"
@@ -24,18 +25,21 @@ struct StreamSettings {
 // The settings of stream `number`, counted from 1; nothing when the camera has no such stream.
 [[nodiscard]] std::optional<StreamSettings> stream_settings(const SettingsStore& settings, int number);
 
+// The camera's word of a codec; nothing for "off".
+[[nodiscard]] std::optional<ImageKind> codec_kind(std::string_view word);
+
 struct StreamPlan {
   std::unique_ptr<PictureSource> source;  // null: the session opens but carries no picture
 };
 
 // What a session on stream `number` sends: the clip that the options name, or, of a camera with a profile and no clip,
-// pictures made as the stream is set. Nothing for a stream that such a camera lacks, has switched off, or has set to
-// what RTP cannot carry.
-[[nodiscard]] std::optional<StreamPlan> plan_stream(const CameraState& state, int number);
+// pictures made as the stream is set, drawn or of the scene. The state outlives the source, here and below. Nothing for
+// a stream that such a camera lacks, has switched off, or has set to what RTP cannot carry.
+[[nodiscard]] std::optional<StreamPlan> plan_stream(CameraState& state, int number);
 
 // What "/imageN" sends: the images that the options name, or, of a camera with a profile and none, pictures made as
 // stream `number` is set. Null where there is no such stream.
-[[nodiscard]] std::unique_ptr<PictureSource> plan_images(const CameraState& state, int number);
+[[nodiscard]] std::unique_ptr<PictureSource> plan_images(CameraState& state, int number);
 
 // What a picture carries as its user data when it leaves in this moment; empty: nothing.
 [[nodiscard]] std::string present_user_data(const CameraState& state);

@@ -119,6 +119,51 @@ TEST(RtpStream, RestartsTakeTheirValueBeforeTheNamedPicture) {
   EXPECT_EQ(packets[6].record.timestamp, 4600U);
 }
 
+TEST(RtpStream, APictureTakesATextAndOneWithoutIsTheClipsOwn) {
+  const CameraOptions options = stream_options();
+  RtpStream stream(options, {}, 7, 1);
+  std::vector<Outgoing> packets;
+  ASSERT_TRUE(stream.load());
+  EXPECT_EQ(stream.loaded().due.count(), 0);
+  stream.take_picture(packets, "CamPos: 1");
+  const std::size_t told = packets.size();
+  EXPECT_GT(told, 1U) << "a unit of its own";
+  EXPECT_EQ(packets[told - 1].record.picture_packets, told);
+  EXPECT_TRUE(packets[told - 1].record.marker);
+  stream.take_picture(packets);
+  ASSERT_EQ(packets.size(), told + 2);
+  EXPECT_EQ(packets[told].payload.data(), options.clip->pictures()[1].payload(0).data());
+  EXPECT_EQ(packets[told].record.sequence, 1 + told);
+}
+
+TEST(RtpStream, TimestampsFollowTheStampsOfASourceThatRunsBackwards) {
+  /// Three pictures, one each 40 ms, told from the last to the first.
+  class Backwards : public PictureSource {
+   public:
+    [[nodiscard]] const SourceFormat& format() const override { return format_; }
+    [[nodiscard]] bool ended() const override { return sent_ == 3; }
+    [[nodiscard]] std::optional<SourcePicture> next() override {
+      if (ended()) return std::nullopt;
+      SourcePicture picture;
+      picture.bytes = std::make_shared<const std::string>("\0\0\0\1\x65\x88", 6);
+      picture.due = std::chrono::milliseconds(40 * sent_);
+      picture.stamp = std::chrono::milliseconds(80 - 40 * sent_++);
+      return picture;
+    }
+
+   private:
+    SourceFormat format_;
+    int sent_ = 0;
+  };
+  CameraOptions options;
+  options.start_timestamp = 3600;
+  RtpStream stream(std::make_unique<Backwards>(), options, {}, {7, 1});
+  std::vector<std::uint32_t> timestamps;
+  for (const Outgoing& packet : take(stream, 4)) timestamps.push_back(packet.record.timestamp);
+  EXPECT_EQ(timestamps, (std::vector<std::uint32_t>{3600, 0, 4294963696U}));
+  EXPECT_TRUE(stream.ended());
+}
+
 TEST(RtpStream, RestartsWithoutAValueAreDrawnFromTheSeed) {
   PacketFaults faults;
   faults.sequence_restarts = {{1, {}}};
