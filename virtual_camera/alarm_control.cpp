@@ -130,6 +130,10 @@ void AlarmControl::take(const std::shared_ptr<Visit>& visit) {
 
 std::string_view AlarmControl::answer(const std::string& request) {
   const std::optional<RequestHead> head = parse_head(request);
+  if (head && (head->path == "/network/unplug" || head->path == "/network/plug")) {
+    if (state_->set_network) state_->set_network(head->path == "/network/plug");
+    return "HTTP/1.0 204 No Content\r\n\r\n";
+  }
   if (const auto time = head ? control_walk(head->path) : std::nullopt) {
     const std::chrono::duration<double, std::milli> at_pace = *time / state_->options.speed;
     watch_->walk(std::chrono::duration_cast<std::chrono::milliseconds>(at_pace));

@@ -1,6 +1,6 @@
 // The port by which a person or a test makes things happen around a camera, on the loopback address alone:
 //   GET /contact/NUMBER/close or open, /lens/cover or free, /noise/on or off, /motion/WINDOW/VALUE,
-//   /walk, /walk/SECONDS
+//   /walk, /walk/SECONDS, /network/unplug or plug
 #ifndef VIRTUAL_CAMERA_ALARM_CONTROL_H_
 #define VIRTUAL_CAMERA_ALARM_CONTROL_H_
 

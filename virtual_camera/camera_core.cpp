@@ -34,6 +34,7 @@ CameraCore::CameraCore(std::shared_ptr<CameraState> state)
       http_(listener_of<HttpConnection>(state_)),
       rtsp_(listener_of<RtspConnection>(state_)),
       control_(std::make_shared<AlarmControl>(state_)),
+      recorder_(std::make_shared<CardRecorder>(state_)),
       back_(state_->context) {}
 
 std::string CameraCore::open_ports() {
@@ -76,10 +77,21 @@ std::string CameraCore::start() {
   }
   running_ = true;
   spread_alarms();
+  take_calls();
+  return {};
+}
+
+// What its connections and the control port may ask for while it runs.
+void CameraCore::take_calls() {
   state_->reboot = [weak = weak_from_this()](std::chrono::milliseconds away) {
     if (const std::shared_ptr<CameraCore> core = weak.lock()) core->reboot(away);
   };
-  return {};
+  state_->set_network = [weak = weak_from_this()](bool plugged) {
+    if (const std::shared_ptr<CameraCore> core = weak.lock()) core->set_network(plugged);
+  };
+  state_->settings_changed = [weak = std::weak_ptr<CardRecorder>(recorder_)] {
+    if (const std::shared_ptr<CardRecorder> recorder = weak.lock()) recorder->look();
+  };
 }
 
 // Changes may come from any thread; the connections live on the loop's.
@@ -106,6 +118,11 @@ void CameraCore::vanish() {
 void CameraCore::stop() {
   running_ = false;
   state_->reboot = nullptr;
+  state_->set_network = nullptr;
+  state_->settings_changed = nullptr;
+  plugged_ = true;
+  recorder_->see(true);
+  recorder_->stop();
   back_.cancel();
   state_->alarms.listen(nullptr);
   control_->close();
@@ -114,6 +131,11 @@ void CameraCore::stop() {
 
 void CameraCore::reboot(std::chrono::milliseconds away) {
   if (!running_) return;
+  recorder_->stop();
+  vanish_for(away);
+}
+
+void CameraCore::vanish_for(std::chrono::milliseconds away) {
   vanish();
   back_.expires_after(away);
   back_.async_wait([self = shared_from_this()](asio::error_code error) {
@@ -123,7 +145,17 @@ void CameraCore::reboot(std::chrono::milliseconds away) {
 
 void CameraCore::come_back() {
   constexpr std::chrono::milliseconds kRetry{50};
-  if (!open_ports().empty()) reboot(kRetry);
+  recorder_->look();
+  if (plugged_ && !open_ports().empty()) vanish_for(kRetry);
+}
+
+void CameraCore::set_network(bool plugged) {
+  if (!running_ || plugged == plugged_) return;
+  plugged_ = plugged;
+  recorder_->see(plugged_);
+  back_.cancel();
+  vanish();
+  if (plugged_) come_back();
 }
 
 }  // namespace vexa::camera

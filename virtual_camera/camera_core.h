@@ -10,6 +10,7 @@
 
 #include "virtual_camera/alarm_control.h"
 #include "virtual_camera/camera_state.h"
+#include "virtual_camera/card_recorder.h"
 #include "virtual_camera/listener.h"
 
 namespace vexa::camera {
@@ -22,6 +23,8 @@ class CameraCore : public std::enable_shared_from_this<CameraCore> {
   [[nodiscard]] std::string start();
   void stop();
   void reboot(std::chrono::milliseconds away);
+  // Pulls the network cable, or puts it back: without it the camera cannot be reached, and goes on by itself.
+  void set_network(bool plugged);
 
   [[nodiscard]] const std::shared_ptr<CameraState>& state() const { return state_; }
   [[nodiscard]] std::uint16_t http_port() const { return http_->port(); }
@@ -32,15 +35,19 @@ class CameraCore : public std::enable_shared_from_this<CameraCore> {
   [[nodiscard]] std::string prepare();
   [[nodiscard]] std::string open_ports();
   void vanish();
+  void vanish_for(std::chrono::milliseconds away);
   void come_back();
   void spread_alarms();
+  void take_calls();
 
   std::shared_ptr<CameraState> state_;
   std::shared_ptr<Listener> http_;
   std::shared_ptr<Listener> rtsp_;
   std::shared_ptr<AlarmControl> control_;
+  std::shared_ptr<CardRecorder> recorder_;
   asio::steady_timer back_;
   bool running_ = false;
+  bool plugged_ = true;
 };
 
 }  // namespace vexa::camera

@@ -30,6 +30,11 @@ void CameraState::report_contacts() {
   }
 }
 
+void CameraState::report_card() {
+  if (!settings.answer("a-slot") || options.card_bytes == 0) return;
+  settings.set("a-slot", "ASlot", card.space_text());
+}
+
 void CameraState::switch_detectors() {
   alarms.switch_detectors(settings.get("system", "TamperingFunc") == "on",
                           settings.get("audiodetection", "ADFunc") == "on");

@@ -14,6 +14,7 @@
 
 #include "virtual_camera/alarm_scene.h"
 #include "virtual_camera/camera_pose.h"
+#include "virtual_camera/card.h"
 #include "virtual_camera/event_loop.h"
 #include "virtual_camera/journal.h"
 #include "virtual_camera/options.h"
@@ -35,6 +36,7 @@ struct CameraState {
       : options(std::move(camera_options)),
         context(loop_context),
         alarms(options.alarms),
+        card(options.card_bytes),
         journal(options.journal_limit),
         sent(options.sent_log_limit),
         packet_faults(options.packet_faults),
@@ -47,6 +49,8 @@ struct CameraState {
   void take_profile();
   // Puts the contacts into the settings, where the inquiry reads them.
   void report_contacts();
+  // Puts the card's free space into the settings likewise.
+  void report_card();
   // The detectors are as the settings say, from now on.
   void switch_detectors();
 
@@ -55,6 +59,7 @@ struct CameraState {
   asio::io_context& context;
   AlarmScene alarms;
   SceneStage stage;
+  Card card;
   PoseSource pose;  // empty: the camera does not know where it looks
   SettingsStore settings;
   Journal journal;
@@ -66,8 +71,11 @@ struct CameraState {
   std::map<std::uint32_t, std::shared_ptr<RtspSession>> sessions;
   std::map<int, std::weak_ptr<LiveVideo>> live;  // what renders a stream, while somebody watches it
   std::uint32_t next_session;
-  std::uint64_t plays = 0;                                // streams begun
-  std::function<void(std::chrono::milliseconds)> reboot;  // empty while the camera is stopped
+  std::uint64_t plays = 0;  // streams begun
+  // Empty while the camera is stopped.
+  std::function<void(std::chrono::milliseconds)> reboot;
+  std::function<void(bool plugged)> set_network;
+  std::function<void()> settings_changed;
 };
 
 }  // namespace vexa::camera

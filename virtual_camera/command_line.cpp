@@ -37,8 +37,14 @@ void add_place(CLI::App& app, ProgramOptions& options) {
            camera.control_port = port;
          },
          "port on 127.0.0.1 that makes things happen around the camera: GET /contact/1/close, /lens/cover, /noise/on, "
-         "/motion/1/50, /walk")
+         "/motion/1/50, /walk, /network/unplug, /network/plug")
       ->option_text("PORT");
+  app.add_option_function<std::uint64_t>(
+         "--card", [&camera](std::uint64_t megabytes) { camera.card_bytes = megabytes << 20U; },
+         "put a card of this size into the slot: the camera records on it while it is set to and its network is away "
+         "(control port: /network/unplug, /network/plug)")
+      ->check(CLI::Range(1, 1 << 20))
+      ->option_text("MEGABYTES");
   app.add_option("--journal", options.journal_path, "write every request to this file, one JSON object a line");
   app.add_option("--duration", options.duration, "end after this many seconds")->check(CLI::NonNegativeNumber);
 }

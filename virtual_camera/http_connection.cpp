@@ -8,6 +8,7 @@
 #include <system_error>
 #include <utility>
 
+#include "virtual_camera/card_cgi.h"
 #include "virtual_camera/credentials.h"
 #include "virtual_camera/message.h"
 #include "virtual_camera/stream_plan.h"
@@ -71,8 +72,13 @@ Answer HttpConnection::answer(const std::string& request) {
 
 Answer HttpConnection::command(const RequestHead& head) {
   if (head.query == "inq=sensor") state().report_contacts();
+  if (head.query == "inq=a-slot") state().report_card();
+  if (state().settings.answer("a-slot")) {
+    if (std::optional<Answer> answer = answer_card(head, state().card)) return *std::move(answer);
+  }
   Answer answer = answer_command(head, state().settings);
   if (answer.status != 204) return answer;
+  if (state().settings_changed) state().settings_changed();
   state().switch_detectors();
   if (head.path == "/command/system.cgi" && head.query == "TamperingStatusClear=on") state().alarms.clear_tampering();
   return answer;

@@ -60,6 +60,10 @@ struct CameraOptions {
   bool control = false;
   std::uint16_t control_port = 0;
 
+  // The card in the slot, on which the camera records while its network is away; 0 bytes: the slot is empty.
+  std::uint64_t card_bytes = 0;
+  std::vector<int> playback_scales = {1, 2, 4, -1};  // at which recordings are played; another is taken to the nearest
+
   double frames_per_second = 25;
   double speed = 1;  // pace: 4 sends four times faster, with timestamps advancing by picture as at 1
   std::uint32_t clock_rate = 90000;

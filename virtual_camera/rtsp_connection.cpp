@@ -6,6 +6,7 @@
 #include <optional>
 #include <utility>
 
+#include "virtual_camera/card_source.h"
 #include "virtual_camera/credentials.h"
 #include "virtual_camera/rtsp_message.h"
 #include "virtual_camera/session_description.h"
@@ -69,7 +70,25 @@ Answer RtspConnection::dispatch(const RequestHead& request, std::uint32_t sequen
   return rtsp_answer({"501 Not Implemented", sequence, kMethods, {}});
 }
 
+// Nothing for a path that names no recording, or one without a picture.
+std::optional<Recording> RtspConnection::recording_at(std::string_view path, VideoUrl as) {
+  const RecordingUrl url = recording_url(path);
+  if (url.kind != as) return std::nullopt;
+  std::optional<Recording> recording = state().card.find(url.name);
+  return recording && !recording->pictures.empty() ? recording : std::nullopt;
+}
+
+Answer RtspConnection::describe_recording(const Recording& recording, std::uint32_t sequence) {
+  CameraOptions options = state().options;
+  options.range_clock = clock_range(recording);
+  const SourceFormat format = CardSource(state().card, recording, 1).format();
+  return rtsp_answer({"200 OK", sequence, {}, describe_session(options, format, kMaxRtspAnswer - kDescribeHead)});
+}
+
 Answer RtspConnection::describe(const RequestHead& request, std::uint32_t sequence) {
+  if (const auto recording = recording_at(request.path, VideoUrl::kStream)) {
+    return describe_recording(*recording, sequence);
+  }
   if (classify_url(request.path) != VideoUrl::kStream) return status_only("404 Not Found", sequence);
   const auto plan = plan_stream(state(), video_number(request.path));
   if (!plan) return status_only("404 Not Found", sequence);
@@ -104,7 +123,8 @@ RtspConnection::MediaWay RtspConnection::open_interleaved(const AskedTransport& 
 }
 
 Answer RtspConnection::setup(const RequestHead& request, std::uint32_t sequence) {
-  if (classify_url(request.path) != VideoUrl::kTrack) return status_only("404 Not Found", sequence);
+  const bool found = classify_url(request.path) == VideoUrl::kTrack || recording_at(request.path, VideoUrl::kTrack);
+  if (!found) return status_only("404 Not Found", sequence);
   const AskedTransport asked = asked_transport(request.field("Transport"));
   if (asked.way == AskedTransport::Way::kNone) return status_only("461 Unsupported Transport", sequence);
   if (state().sessions.size() >= kMaxSessions) return status_only("453 Not Enough Bandwidth", sequence);
@@ -130,6 +150,14 @@ std::shared_ptr<RtspSession> RtspConnection::find_session(const RequestHead& req
 Answer RtspConnection::play(const RequestHead& request, std::uint32_t sequence) {
   const std::shared_ptr<RtspSession> session = find_session(request);
   if (!session) return status_only("454 Session Not Found", sequence);
+  if (auto recording = recording_at(request.path, VideoUrl::kStream)) {
+    const int scale = offered_scale(state().options.playback_scales, scale_of(request));
+    session->load(std::make_unique<CardSource>(state().card, *std::move(recording), scale));
+    to_play_ = session;
+    const std::string fields =
+        fmt::format("Session: {}\r\nScale: {}\r\nRange: npt=0.000-\r\n", session->number(), scale);
+    return rtsp_answer({"200 OK", sequence, fields, {}});
+  }
   if (classify_url(request.path) == VideoUrl::kNone) return status_only("404 Not Found", sequence);
   to_play_ = session;
   const std::string fields = fmt::format("Session: {}\r\nRange: npt=0.000-\r\n", session->number());

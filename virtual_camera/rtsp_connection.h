@@ -6,10 +6,12 @@
 #include <cstdint>
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
+#include "virtual_camera/card.h"
 #include "virtual_camera/connection.h"
 #include "virtual_camera/interleaved_lane.h"
 #include "virtual_camera/message.h"
@@ -45,6 +47,8 @@ class RtspConnection : public Connection {
   MediaWay open_interleaved(const AskedTransport& asked);
 
   Answer dispatch(const RequestHead& request, std::uint32_t sequence);
+  std::optional<Recording> recording_at(std::string_view path, VideoUrl as);
+  Answer describe_recording(const Recording& recording, std::uint32_t sequence);
   Answer describe(const RequestHead& request, std::uint32_t sequence);
   Answer setup(const RequestHead& request, std::uint32_t sequence);
   Answer play(const RequestHead& request, std::uint32_t sequence);

@@ -129,6 +129,22 @@ int video_number(std::string_view path) {
   return leading_number<int>(path).value_or(0);
 }
 
+RecordingUrl recording_url(std::string_view path) {
+  constexpr std::string_view kStem = "/media/";
+  constexpr std::string_view kTrackName = "/video";
+  if (!path.starts_with(kStem) || classify_url(path) != VideoUrl::kNone) return {};
+  path.remove_prefix(kStem.size());
+  const bool track = path.ends_with(kTrackName);
+  if (track) path.remove_suffix(kTrackName.size());
+  if (path.empty() || path.find('/') != std::string_view::npos) return {};
+  return {track ? VideoUrl::kTrack : VideoUrl::kStream, path};
+}
+
+int scale_of(const RequestHead& request) {
+  const int scale = leading_number<int>(request.field("Scale")).value_or(1);
+  return scale == 0 ? 1 : scale;
+}
+
 Answer rtsp_answer(const RtspAnswer& answer) {
   const std::string sequence = answer.sequence ? fmt::format("CSeq: {}\r\n", *answer.sequence) : "";
   const std::string content =

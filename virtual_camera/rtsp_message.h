@@ -45,6 +45,15 @@ enum class VideoUrl { kNone, kStream, kTrack };
 // The number of the video stream that such a path names; 0 when it names none.
 [[nodiscard]] int video_number(std::string_view path);
 
+// What "/media/NAME" and "/media/NAME/video" name where NAME is that of a recording.
+struct RecordingUrl {
+  VideoUrl kind = VideoUrl::kNone;
+  std::string_view name;
+};
+[[nodiscard]] RecordingUrl recording_url(std::string_view path);
+// The Scale of a request (RFC 2326, 12.34); 1 when it names none.
+[[nodiscard]] int scale_of(const RequestHead& request);
+
 // `status` as in "454 Session Not Found"; `fields` are whole lines; no CSeq line for a request without one.
 struct RtspAnswer {
   std::string_view status;

@@ -12,6 +12,8 @@ RtspSession::RtspSession(std::shared_ptr<CameraState> state, std::uint32_t numbe
       pause_(pause),
       expiry_(state_->context) {}
 
+void RtspSession::play() { source_ ? sender_->play(std::move(source_), pause_) : sender_->play(pause_); }
+
 void RtspSession::touch() {
   if (state_->options.session_expiry == SessionExpiry::kNever) return;
   expiry_.expires_after(state_->options.session_timeout);

@@ -6,9 +6,11 @@
 #include <chrono>
 #include <cstdint>
 #include <memory>
+#include <utility>
 
 #include "virtual_camera/camera_state.h"
 #include "virtual_camera/packet_port.h"
+#include "virtual_camera/picture_source.h"
 #include "virtual_camera/rtp_sender.h"
 
 namespace vexa::camera {
@@ -21,7 +23,9 @@ class RtspSession : public std::enable_shared_from_this<RtspSession> {
               std::chrono::milliseconds pause);
 
   [[nodiscard]] std::uint32_t number() const { return number_; }
-  void play() { sender_->play(pause_); }
+  // What the next play() sends in the place of the video stream.
+  void load(std::unique_ptr<PictureSource> source) { source_ = std::move(source); }
+  void play();
   // A request named the session: its time starts over.
   void touch();
   // Stops sending for good. The session leaves the camera's table, when it still stands there.
@@ -32,6 +36,7 @@ class RtspSession : public std::enable_shared_from_this<RtspSession> {
   const std::uint32_t number_;
   const std::shared_ptr<RtpSender> sender_;
   const std::chrono::milliseconds pause_;
+  std::unique_ptr<PictureSource> source_;  // null: the video stream's
   asio::steady_timer expiry_;
 };
 

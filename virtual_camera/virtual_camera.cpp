@@ -29,6 +29,14 @@ void VirtualCamera::reboot(std::chrono::milliseconds away) {
   loop_->run([this, away] { core_->reboot(away); });
 }
 
+void VirtualCamera::unplug() {
+  loop_->run([this] { core_->set_network(false); });
+}
+
+void VirtualCamera::plug() {
+  loop_->run([this] { core_->set_network(true); });
+}
+
 const std::string& VirtualCamera::address() const { return core_->state()->options.address; }
 
 std::uint16_t VirtualCamera::http_port() const { return core_->http_port(); }
@@ -44,6 +52,8 @@ std::size_t VirtualCamera::sessions() const {
 SettingsStore& VirtualCamera::settings() { return core_->state()->settings; }
 
 AlarmScene& VirtualCamera::alarms() { return core_->state()->alarms; }
+
+Card& VirtualCamera::card() { return core_->state()->card; }
 
 Journal& VirtualCamera::journal() { return core_->state()->journal; }
 

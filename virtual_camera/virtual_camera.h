@@ -10,6 +10,7 @@
 #include <string>
 
 #include "virtual_camera/alarm_scene.h"
+#include "virtual_camera/card.h"
 #include "virtual_camera/journal.h"
 #include "virtual_camera/options.h"
 #include "virtual_camera/sent_log.h"
@@ -35,6 +36,9 @@ class VirtualCamera {
   void stop();
   // Vanishes: every connection is reset, connecting is refused; back on the same ports after `away`, without sessions.
   void reboot(std::chrono::milliseconds away);
+  // Pulls the network cable: as a reboot, but the camera runs on, and records when it is set to; until it is plugged.
+  void unplug();
+  void plug();
 
   [[nodiscard]] const std::string& error() const { return error_; }
   [[nodiscard]] const std::string& address() const;
@@ -45,6 +49,7 @@ class VirtualCamera {
 
   [[nodiscard]] SettingsStore& settings();
   [[nodiscard]] AlarmScene& alarms();
+  [[nodiscard]] Card& card();
   [[nodiscard]] Journal& journal();
   [[nodiscard]] SentLog& sent();
   [[nodiscard]] const PacketisedClip* clip() const;  // the clip streamed; valid after start(), null when none

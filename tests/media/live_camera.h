@@ -60,6 +60,8 @@ class LiveCamera {
   std::size_t place(std::uint64_t index) const {
     return static_cast<std::size_t>(index % camera_.clip()->pictures().size());
   }
+
+ protected:
   const char* codec_name() const {
     if (camera_.clip() == nullptr) return "H.264";
     switch (camera_.clip()->codec()) {
@@ -73,6 +75,7 @@ class LiveCamera {
     return "H.264";
   }
 
+ private:
   vexa::camera::VirtualCamera camera_;
 };
 

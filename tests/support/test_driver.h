@@ -82,6 +82,7 @@ class TestDriver : public CVexaCommon {
   using CVexaCommon::m_ConnectionLock;
   using CVexaCommon::m_ContinuousPTZ;
   using CVexaCommon::m_EdgeStoragePlayback;
+  using CVexaCommon::m_EdgeStorageSupported;
   using CVexaCommon::m_FixedCameraInfo;
   using CVexaCommon::m_FixedConnectionInfo;
   using CVexaCommon::m_FixedSystemInfo;

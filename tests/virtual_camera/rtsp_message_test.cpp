@@ -153,5 +153,40 @@ TEST(SessionDescription, ParameterSetsAreNamedWhereTheyFit) {
   EXPECT_EQ(describe_session(options, format, whole.size() - 1).find("sprop"), std::string::npos);
 }
 
+TEST(RtspMessage, RecordingsAreNamedBehindMediaWhereNoVideoStreamIs) {
+  const struct {
+    const char* path;
+    VideoUrl kind;
+    const char* name;
+  } rows[] = {{"/media/rec1", VideoUrl::kStream, "rec1"},
+              {"/media/rec1/video", VideoUrl::kTrack, "rec1"},
+              {"/media/video", VideoUrl::kStream, "video"},
+              {"/media/videos/video", VideoUrl::kTrack, "videos"},
+              {"/media/video1", VideoUrl::kNone, ""},
+              {"/media/video1/video", VideoUrl::kNone, ""},
+              {"/media/rec1/audio", VideoUrl::kNone, ""},
+              {"/media//video", VideoUrl::kNone, ""},
+              {"/media/", VideoUrl::kNone, ""},
+              {"/medium/rec1", VideoUrl::kNone, ""},
+              {"", VideoUrl::kNone, ""}};
+  for (const auto& row : rows) {
+    EXPECT_EQ(recording_url(row.path).kind, row.kind) << row.path;
+    EXPECT_EQ(recording_url(row.path).name, row.name) << row.path;
+  }
+}
+
+TEST(RtspMessage, ScaleIsReadAsAnIntegerAndIs1WithoutOne) {
+  const struct {
+    const char* field;
+    int scale;
+  } rows[] = {{"Scale: 4\r\n", 4},           {"scale: -1\r\n", -1}, {"", 1}, {"Scale: 0\r\n", 1}, {"Scale: x\r\n", 1},
+              {"Scale: 99999999999\r\n", 1}, {"Scale: 2.5\r\n", 2}};
+  for (const auto& row : rows) {
+    const auto head = parse_head(std::string("PLAY rtsp://a/media/b RTSP/1.0\r\n") + row.field + "\r\n");
+    ASSERT_TRUE(head);
+    EXPECT_EQ(scale_of(*head), row.scale) << row.field;
+  }
+}
+
 }  // namespace
 }  // namespace vexa::camera
