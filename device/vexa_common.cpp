@@ -2,6 +2,7 @@
 
 #include <cerrno>
 #include <cstring>
+#include <new>
 
 #include "device/driver_state.h"
 #include "runtime/base/sync.h"
@@ -60,9 +61,12 @@ CVexaCommon::~CVexaCommon() {
   CloseHandle(m_StopVideoEvent);
 }
 
-ELibDReturnCode CVexaCommon::GetLatestErrorText(std::string& text) {
+// Safe: a text that memory does not hold is a failure and not an exception, and stays the latest one.
+ELibDReturnCode CVexaCommon::GetLatestErrorText(std::string& text) try {
   text = LatestErrorText();
   return LIBD_OK;
+} catch (const std::bad_alloc&) {
+  return LIBD_FAILED;
 }
 
 ELibDReturnCode CVexaCommon::GetCameraType(ELibCameraType type) {

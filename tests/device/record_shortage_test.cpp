@@ -70,6 +70,20 @@ TEST(RecordsShortOfMemory, AreAFailure) {
   }
 }
 
+TEST(GetLatestErrorText, ShortOfMemoryFailsAndKeepsTheText) {
+  TestDriver driver;
+  driver.Fail({LIBD_FAILED, "a text of more than a text holds by itself"});
+  std::string text = "before";
+  {
+    const AllocationFailure failure(0);
+    EXPECT_EQ(driver.GetLatestErrorText(text), LIBD_FAILED);
+    EXPECT_TRUE(failure.happened());
+  }
+  EXPECT_EQ(text, "before");
+  EXPECT_EQ(driver.GetLatestErrorText(text), LIBD_OK);
+  EXPECT_EQ(text, "a text of more than a text holds by itself");
+}
+
 TEST(SetCurrentConnectionInfo, ShortOfMemoryKeepsTheConnectionWholeAndThrowsNothing) {
   const vexa_test::TemporaryFolder folder;
   SLibDConnectionInfo given;
