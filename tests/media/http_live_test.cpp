@@ -12,7 +12,7 @@
 #include <vector>
 
 #include "tests/media/media_driver.h"
-#include "tests/media/pace.h"
+#include "tests/media/video_ways.h"
 #include "tests/support/own_address.h"
 #include "virtual_camera/virtual_camera.h"
 
@@ -35,33 +35,17 @@ constexpr HttpWay kH264Way = {"H.264", VEXA_CLIPS "/small.h264", VIDEO_FRAME_H26
 constexpr HttpWay kMpeg4Way = {"MPEG4", VEXA_CLIPS "/small.m4v", VIDEO_FRAME_MPEG4_KEY, VIDEO_FRAME_MPEG4_DELTA};
 constexpr HttpWay kHttpWays[] = {kJpegWay, kH264Way, kMpeg4Way};
 
-/// A stream without its user-data units, which readers take out.
-std::string without_user_data(const std::string& codec, const std::string& picture) {
-  const bool h264 = codec == "H.264";
-  const std::string code = h264 ? std::string("\0\0\0\1", 4) : std::string("\0\0\1", 3);
-  if (codec == "JPEG") return picture;
-  std::string kept;
-  for (std::size_t unit = picture.find(code); unit != std::string::npos;) {
-    const std::size_t next = picture.find(code, unit + code.size());
-    const int kind = static_cast<unsigned char>(picture[unit + code.size()]);
-    const bool user_data = h264 ? (kind & 0x1f) == 6 : kind == 0xb2;
-    if (!user_data) kept += picture.substr(unit, next - unit);
-    unit = next;
-  }
-  return kept;
-}
-
 class HttpLive : public testing::Test {
  protected:
   HttpLive() {
     options_.address = own_loopback(0);
     options_.rtsp_port = 0;
     options_.password = "secret";
-    options_.speed = kJpegPace;
   }
 
   void run(const HttpWay& way, int timeout = 5000) {
     if (options_.image_path.empty()) options_.image_path = way.clip;
+    options_.speed = std::string(way.codec) == "JPEG" ? kJpegPace : kPace;
     camera_ = std::make_unique<vexa::camera::VirtualCamera>(options_);
     ASSERT_TRUE(camera_->start()) << camera_->error();
     driver_.use(camera_->address(), camera_->http_port(), timeout);
@@ -77,7 +61,7 @@ class HttpLive : public testing::Test {
     if (!clip) clip = vexa::camera::ImageClip::load(way.clip);
     const auto& pictures = clip->pictures();
     const std::string sent = with_user_data(clip->kind(), pictures[index % pictures.size()], user_data);
-    return without_user_data(way.codec, sent);
+    return without_user_data(clip->kind(), sent);
   }
 
   void expect_frames(const HttpWay& way, std::size_t count, const std::string& user_data = "") {
@@ -166,7 +150,6 @@ TEST_F(HttpLive, PicturesOfAMegabyteKeepUp) {
   for (int i = 0; i < 15; ++i) large.insert(2, "\xff\xfe\xff\xff" + std::string(65533, 'x'));
   std::ofstream(path, std::ios::binary) << large;
   options_.image_path = path;
-  options_.speed = 2;
   run(kJpegWay);
   ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
   const auto frames = taker_.take_all(driver_, 50);

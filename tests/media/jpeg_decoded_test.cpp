@@ -7,7 +7,7 @@
 #include <vector>
 
 #include "media/assembly/jpeg_tables.h"
-#include "tests/media/live_camera.h"
+#include "tests/media/video_ways.h"
 
 namespace vexa_test {
 namespace {
@@ -60,29 +60,30 @@ void decode_jpeg(const std::string& bytes, DecodedJpeg& decoded) {
   jpeg_destroy_decompress(&decoder);
 }
 
-class DecodedJpegStream : public testing::TestWithParam<const char*> {};
+class DecodedJpegStream : public testing::TestWithParam<const char*> {
+ protected:
+  static void expect_encoders_pixels(VideoWay way) {
+    const auto options = options_of_every_way(GetParam());
+    const auto clip = vexa::camera::ImageClip::load(options.image_path);
+    LiveCamera camera(options);
+    const auto frames = frames_by(way, camera, 25);
+    ASSERT_EQ(frames.size(), 25u);
+    for (std::size_t i = 0; i < frames.size(); ++i) {
+      DecodedJpeg arrived;
+      decode_jpeg(frames[i], arrived);
+      DecodedJpeg encoded;
+      decode_jpeg(clip->pictures()[i], encoded);
+      ASSERT_EQ(encoded.warnings, 0) << i;
+      ASSERT_EQ(arrived.warnings, 0) << i;
+      EXPECT_EQ(arrived.width, 320u);
+      EXPECT_EQ(arrived.height, 240u);
+      ASSERT_TRUE(arrived.pixels == encoded.pixels) << i;
+    }
+  }
+};
 
 TEST_P(DecodedJpegStream, EqualsTheEncodersPicturePixelForPixelWithoutAWarning) {
-  auto options = camera_options();
-  options.clip_path = std::string(VEXA_CLIPS) + "/" + GetParam();
-  options.pictures = 50;
-  LiveCamera camera(options);
-  MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
-  const auto frames = FrameTaker().take_all(driver, 50);
-  ASSERT_EQ(frames.size(), 50u);
-  for (std::size_t i = 0; i < frames.size(); ++i) {
-    DecodedJpeg arrived;
-    decode_jpeg(frames[i].bytes, arrived);
-    DecodedJpeg encoded;
-    decode_jpeg(camera.picture(i), encoded);
-    ASSERT_EQ(encoded.warnings, 0) << i;
-    ASSERT_EQ(arrived.warnings, 0) << i;
-    EXPECT_EQ(arrived.width, 320u);
-    EXPECT_EQ(arrived.height, 240u);
-    ASSERT_TRUE(arrived.pixels == encoded.pixels) << i;
-  }
+  for (const VideoWay way : {VideoWay::kUdp, VideoWay::kInterleaved, VideoWay::kHttp}) expect_encoders_pixels(way);
 }
 
 INSTANTIATE_TEST_SUITE_P(Clips, DecodedJpegStream, testing::Values("plain.mjpeg", "restart.mjpeg", "sliced.mjpeg"),

@@ -1,9 +1,6 @@
 #include <gtest/gtest.h>
 
-#include <thread>
-
-#include "tests/media/pace.h"
-#include "tests/media/whole_stream.h"
+#include "tests/media/live_camera.h"
 
 namespace vexa_test {
 namespace {
@@ -83,77 +80,6 @@ TEST(LiveH264, TellsWhereTheCameraLooks) {
   for (std::size_t i = 0; i < frames.size(); ++i) ASSERT_TRUE(camera.sent(i, frames[i].bytes)) << "picture " << i;
   EXPECT_EQ(position_of(driver).substr(0, 17), "CamPos: 0123,4567");
 }
-
-struct CodecFaults {
-  const char* name;
-  double loss = 0;
-  double reorder = 0;
-  double duplicate = 0;
-  std::uint32_t start_timestamp = 0;
-};
-
-class LiveCodecImpaired : public testing::TestWithParam<CodecFaults> {
- protected:
-  static constexpr int kPatience = 500;  // milliseconds: longer than a picture is ever held back
-
-  /// Read without the frame queue, which drops JPEG pictures of a host that is slow for a moment.
-  static std::vector<std::string> read_whole_stream(LiveCamera& camera, MediaDriver& driver) {
-    std::vector<unsigned char> buffer(1200000);
-    std::vector<std::string> frames;
-    for (;;) {
-      const bool finished = camera->sent().finished_streams() != 0;
-      CVexaCommon::VideoFrameInfo frame;
-      frame.data = buffer.data();
-      frame.capacity = static_cast<unsigned int>(buffer.size());
-      const ELibDReturnCode code = driver.GetRtpCurrentVideoFrame(driver.StreamCodec(), frame);
-      if (code == LIBD_OK) frames.emplace_back(buffer.begin(), buffer.begin() + frame.length);
-      if (code != LIBD_OK && finished) return frames;
-    }
-  }
-
-  static void stream(const std::string& clip, unsigned index) {
-    auto options = codec_options(clip, index);
-    options.seed = 7 + index;
-    options.speed = kJpegPace;
-    options.max_payload = 900;
-    options.pictures = 400;
-    options.start_sequence = 65000;
-    options.start_timestamp = GetParam().start_timestamp;
-    options.packet_faults.loss = GetParam().loss;
-    options.packet_faults.reorder = GetParam().reorder;
-    options.packet_faults.duplicate = GetParam().duplicate;
-    options.packet_faults.duplicate_distance = 20;
-    LiveCamera camera(options);
-    MediaDriver driver;
-    camera.introduce(driver);
-    driver.use(camera->address(), camera->http_port(), kPatience);
-    ASSERT_TRUE(driver.OpenLiveRtp(1));
-    const std::vector<std::string> frames = read_whole_stream(camera, driver);
-    const std::vector<std::uint64_t> wanted = predicted(camera, camera->sent().snapshot());
-    ASSERT_EQ(frames.size(), wanted.size()) << clip;
-    for (std::size_t i = 0; i < frames.size(); ++i) {
-      ASSERT_TRUE(camera.sent(wanted[i], frames[i])) << clip << ", frame " << i;
-    }
-  }
-};
-
-TEST_P(LiveCodecImpaired, DeliversEveryWholePictureOnceInOrderAndNoDamagedOne) {
-  std::vector<std::thread> hosts;
-  unsigned index = 0;
-  for (const char* clip : {"small.m4v", "plain.mjpeg", "sliced.mjpeg"}) hosts.emplace_back(stream, clip, index++);
-  for (std::thread& host : hosts) host.join();
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    All, LiveCodecImpaired,
-    testing::Values(
-        CodecFaults{.name = "LossPermille1", .loss = 0.001, .start_timestamp = 100000000},
-        CodecFaults{.name = "Loss1", .loss = 0.01, .start_timestamp = 4294000000},
-        CodecFaults{.name = "Loss5", .loss = 0.05, .start_timestamp = 9000000},
-        CodecFaults{.name = "Reorder5", .reorder = 0.05, .start_timestamp = 4294000000},
-        CodecFaults{.name = "Duplicate1", .duplicate = 0.01, .start_timestamp = 9000000},
-        CodecFaults{.name = "All", .loss = 0.01, .reorder = 0.05, .duplicate = 0.01, .start_timestamp = 4294000000}),
-    [](const auto& tested) { return tested.param.name; });
 
 }  // namespace
 }  // namespace vexa_test

@@ -5,13 +5,10 @@
 
 #include <thread>
 
-#include "tests/media/whole_stream.h"
+#include "tests/media/live_camera.h"
 
 namespace vexa_test {
 namespace {
-
-using vexa::camera::CameraOptions;
-using vexa::camera::PacketFaults;
 
 void expect_clip(const LiveCamera& camera, const std::vector<TakenFrame>& frames, std::size_t count) {
   ASSERT_EQ(frames.size(), count);
@@ -101,66 +98,6 @@ std::vector<TakenFrame> take_to_the_end(LiveCamera& camera, MediaDriver& driver,
   }
   return frames;
 }
-
-struct ImpairedCase {
-  const char* name;
-  double loss = 0;
-  double reorder = 0;
-  double duplicate = 0;
-  std::uint32_t start_timestamp = 0;
-};
-
-class LiveStreamImpaired : public testing::TestWithParam<ImpairedCase> {
- protected:
-  static constexpr unsigned kStreams = 5;
-  static constexpr std::uint64_t kPictures = 400;  // of each stream: 2000 a case
-
-  static CameraOptions impaired_options(unsigned index) {
-    auto options = camera_options(index);
-    options.seed = 42 + index;
-    options.max_payload = 600;
-    options.pictures = kPictures;
-    options.start_sequence = 65000;
-    options.start_timestamp = GetParam().start_timestamp;
-    options.packet_faults.loss = GetParam().loss;
-    options.packet_faults.reorder = GetParam().reorder;
-    options.packet_faults.duplicate = GetParam().duplicate;
-    options.packet_faults.duplicate_distance = 20;
-    return options;
-  }
-
-  static void stream(unsigned index) {
-    LiveCamera camera(impaired_options(index));
-    MediaDriver driver;
-    camera.introduce(driver);
-    ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
-    std::vector<std::uint64_t> wanted;
-    const auto frames = take_whole_stream(camera, driver, wanted);
-    ASSERT_EQ(frames.size(), wanted.size()) << "stream " << index;
-    for (std::size_t i = 0; i < frames.size(); ++i) {
-      ASSERT_EQ(frames[i].bytes, camera.picture(wanted[i])) << "stream " << index << ", frame " << i;
-    }
-  }
-};
-
-TEST_P(LiveStreamImpaired, DeliversEveryWholePictureOnceInOrderAndNoDamagedOne) {
-  std::vector<std::thread> hosts;
-  for (unsigned index = 0; index < kStreams; ++index) hosts.emplace_back(stream, index);
-  for (std::thread& host : hosts) host.join();
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    All, LiveStreamImpaired,
-    testing::Values(
-        ImpairedCase{.name = "LossPermille1", .loss = 0.001, .start_timestamp = 100000000},
-        ImpairedCase{.name = "Loss1", .loss = 0.01, .start_timestamp = 4294000000},
-        ImpairedCase{.name = "Loss5", .loss = 0.05, .start_timestamp = 9000000},
-        ImpairedCase{.name = "Loss10", .loss = 0.1, .start_timestamp = 100000000},
-        ImpairedCase{.name = "Reorder5", .reorder = 0.05, .start_timestamp = 4294000000},
-        ImpairedCase{.name = "Reorder5AtTheLift", .reorder = 0.05, .start_timestamp = 9000000},
-        ImpairedCase{.name = "Duplicate1", .duplicate = 0.01, .start_timestamp = 4294000000},
-        ImpairedCase{.name = "All", .loss = 0.01, .reorder = 0.05, .duplicate = 0.01, .start_timestamp = 4294000000}),
-    [](const auto& tested) { return tested.param.name; });
 
 struct RestartCase {
   const char* name;

@@ -50,6 +50,8 @@ class MediaDriver : public TestDriver {
   using CVexaCommon::ProcessCurrentFrameData;
   using CVexaCommon::PropulateFrameInfoList;
   using CVexaCommon::ReleaseRtpPacketsPtr;
+  using CVexaCommon::rtp_over_tcp_open;
+  using CVexaCommon::rtp_over_tcp_payload_recv;
   using CVexaCommon::rtp_over_udp_payload_recv;
   using CVexaCommon::rtp_over_udp_payload_recv_h264;
   using CVexaCommon::rtp_over_udp_recvn;

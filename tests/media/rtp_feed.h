@@ -15,6 +15,24 @@ namespace vexa_test {
 
 using Payload = std::vector<unsigned char>;
 
+struct RtpFields {
+  bool marker = false;
+  unsigned char type = 96;
+  unsigned sequence = 0;
+  unsigned timestamp = 0;
+};
+
+inline Payload rtp_datagram(const RtpFields& fields, const Payload& payload) {
+  const auto [marker, type, sequence, timestamp] = fields;
+  Payload datagram = {0x80, static_cast<unsigned char>(type | (marker ? 0x80 : 0))};
+  for (const unsigned value : {sequence >> 8 & 255u, sequence & 255u, timestamp >> 24, timestamp >> 16 & 255u,
+                               timestamp >> 8 & 255u, timestamp & 255u, 0u, 0u, 0u, 0u}) {
+    datagram.push_back(static_cast<unsigned char>(value));
+  }
+  datagram.insert(datagram.end(), payload.begin(), payload.end());
+  return datagram;
+}
+
 class RtpFeed : public testing::Test {
  protected:
   explicit RtpFeed(std::string codec = "H.264", unsigned char payload_type = 96)
@@ -41,12 +59,7 @@ class RtpFeed : public testing::Test {
   enum class Marker { kUnset, kSet };
 
   void send_packet(const Payload& payload, Marker marker) {
-    Payload datagram = {0x80, static_cast<unsigned char>(payload_type_ | (marker == Marker::kSet ? 0x80 : 0))};
-    for (const unsigned value : {sequence_ >> 8 & 255u, sequence_ & 255u, timestamp_ >> 24, timestamp_ >> 16 & 255u,
-                                 timestamp_ >> 8 & 255u, timestamp_ & 255u, 0u, 0u, 0u, 0u}) {
-      datagram.push_back(static_cast<unsigned char>(value));
-    }
-    datagram.insert(datagram.end(), payload.begin(), payload.end());
+    const Payload datagram = rtp_datagram({marker == Marker::kSet, payload_type_, sequence_, timestamp_}, payload);
     EXPECT_EQ(send(camera_, datagram.data(), datagram.size(), 0), static_cast<ssize_t>(datagram.size()));
     ++sequence_;
   }

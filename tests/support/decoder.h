@@ -8,27 +8,29 @@
 namespace vexa_test {
 
 struct Decoded {
-  bool flawless = false;  ///< it met no damage
+  bool flawless = false;  ///< it met no damage and had nothing to say
   std::size_t frames = 0;
   std::string size;  ///< for instance "640x480"
 };
 
 /// Decodes a file; `format` as ffmpeg calls it, for instance "h264".
 inline Decoded decode(const std::string& path, const std::string& format) {
-  const std::string command =
-      "ffmpeg -v error -nostdin -xerror -err_detect explode -f " + format + " -i '" + path + "' -an -f framemd5 - 2>&1";
+  const std::string command = "ffmpeg -v warning -nostdin -xerror -err_detect explode -f " + format + " -i '" + path +
+                              "' -an -f framemd5 - 2>&1";
   Decoded decoded;
   std::FILE* output = popen(command.c_str(), "r");
   if (output == nullptr) return decoded;
   const std::string dimensions = "#dimensions 0: ";
+  bool silent = true;
   char piece[512];
   while (std::fgets(piece, sizeof piece, output) != nullptr) {
     const std::string line = piece;
     if (line.rfind(dimensions, 0) == 0)
       decoded.size = line.substr(dimensions.size(), line.find('\n') - dimensions.size());
     if (line.rfind("0,", 0) == 0) ++decoded.frames;
+    silent = silent && (line[0] == '#' || line[0] == '0');
   }
-  decoded.flawless = pclose(output) == 0;
+  decoded.flawless = pclose(output) == 0 && silent;
   return decoded;
 }
 

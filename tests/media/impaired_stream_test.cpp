@@ -1,0 +1,117 @@
+// Streams of which packets are lost, sent twice or out of order.
+#include <gtest/gtest.h>
+
+#include <thread>
+#include <vector>
+
+#include "tests/media/whole_stream.h"
+
+namespace vexa_test {
+namespace {
+
+struct Impairment {
+  const char* name;
+  double loss = 0;
+  double reorder = 0;
+  double duplicate = 0;
+  std::uint32_t start_timestamp = 0;
+};
+
+constexpr Impairment kImpairments[] = {
+    {.name = "LossPermille1", .loss = 0.001, .start_timestamp = 100000000},
+    {.name = "Loss1", .loss = 0.01, .start_timestamp = 4294000000},
+    {.name = "Loss5", .loss = 0.05, .start_timestamp = 9000000},
+    {.name = "Loss10", .loss = 0.1, .start_timestamp = 100000000},
+    {.name = "Reorder5", .reorder = 0.05, .start_timestamp = 4294000000},
+    {.name = "Reorder5AtTheLift", .reorder = 0.05, .start_timestamp = 9000000},
+    {.name = "Duplicate1", .duplicate = 0.01, .start_timestamp = 4294000000},
+    {.name = "All", .loss = 0.01, .reorder = 0.05, .duplicate = 0.01, .start_timestamp = 4294000000}};
+
+using Frames = std::vector<std::string>;
+
+/// One of the streams of a test; `index` gives it a camera of its own.
+struct ImpairedStream {
+  unsigned index = 0;
+  std::string clip;
+  std::size_t max_payload = 600;
+  /// All frames of the stream, which ends by itself.
+  Frames (*take)(LiveCamera& camera, MediaDriver& driver);
+};
+
+/// As a host takes them, through the streaming thread and the frame queue.
+Frames take_from_queue(LiveCamera& camera, MediaDriver& driver) {
+  EXPECT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  std::vector<std::uint64_t> wanted;
+  Frames frames;
+  for (TakenFrame& frame : take_whole_stream(camera, driver, wanted)) frames.push_back(std::move(frame.bytes));
+  return frames;
+}
+
+/// Without the frame queue, which drops JPEG pictures of a host that is slow for a moment.
+Frames take_from_assembly(LiveCamera& camera, MediaDriver& driver) {
+  constexpr int kPatience = 500;  // milliseconds: longer than a picture is ever held back
+  driver.use(camera->address(), camera->http_port(), kPatience);
+  EXPECT_TRUE(driver.OpenLiveRtp(1));
+  std::vector<unsigned char> buffer(1200000);
+  Frames frames;
+  for (;;) {
+    const bool finished = camera->sent().finished_streams() != 0;
+    CVexaCommon::VideoFrameInfo frame;
+    frame.data = buffer.data();
+    frame.capacity = static_cast<unsigned int>(buffer.size());
+    const ELibDReturnCode code = driver.GetRtpCurrentVideoFrame(driver.StreamCodec(), frame);
+    if (code == LIBD_OK) frames.emplace_back(buffer.begin(), buffer.begin() + frame.length);
+    if (code != LIBD_OK && finished) return frames;
+  }
+}
+
+class Impaired : public testing::TestWithParam<Impairment> {
+ protected:
+  static void expect_whole_pictures(const ImpairedStream& stream) {
+    auto options = camera_options(stream.index);
+    options.clip_path = std::string(VEXA_CLIPS) + "/" + stream.clip;
+    if (stream.take == take_from_assembly) options.speed = kJpegPace;
+    options.seed = 42 + stream.index;
+    options.max_payload = stream.max_payload;
+    options.pictures = 400;
+    options.start_sequence = 65000;
+    options.start_timestamp = GetParam().start_timestamp;
+    options.packet_faults.loss = GetParam().loss;
+    options.packet_faults.reorder = GetParam().reorder;
+    options.packet_faults.duplicate = GetParam().duplicate;
+    options.packet_faults.duplicate_distance = 20;
+    LiveCamera camera(options);
+    MediaDriver driver;
+    camera.introduce(driver);
+    const Frames frames = stream.take(camera, driver);
+    const std::vector<std::uint64_t> wanted = predicted(camera, camera->sent().snapshot());
+    ASSERT_EQ(frames.size(), wanted.size()) << stream.clip << " " << stream.index;
+    for (std::size_t i = 0; i < frames.size(); ++i) {
+      ASSERT_TRUE(camera.sent(wanted[i], frames[i])) << stream.clip << " " << stream.index << ", frame " << i;
+    }
+  }
+
+  static void expect_whole_pictures(const std::vector<ImpairedStream>& streams) {
+    std::vector<std::thread> hosts;
+    for (const ImpairedStream& stream : streams) hosts.emplace_back([&stream] { expect_whole_pictures(stream); });
+    for (std::thread& host : hosts) host.join();
+  }
+};
+
+TEST_P(Impaired, H264DeliversEveryWholePictureOnceInOrderAndNoDamagedOne) {
+  std::vector<ImpairedStream> streams;
+  for (unsigned index = 0; index < 5; ++index) streams.push_back({index, "small.h264", 600, take_from_queue});
+  expect_whole_pictures(streams);
+}
+
+TEST_P(Impaired, OtherCodecsDeliverEveryWholePictureOnceInOrderAndNoDamagedOne) {
+  expect_whole_pictures(std::vector<ImpairedStream>{{0, "small.m4v", 900, take_from_assembly},
+                                                    {1, "plain.mjpeg", 900, take_from_assembly},
+                                                    {2, "sliced.mjpeg", 900, take_from_assembly}});
+}
+
+INSTANTIATE_TEST_SUITE_P(All, Impaired, testing::ValuesIn(kImpairments),
+                         [](const auto& tested) { return tested.param.name; });
+
+}  // namespace
+}  // namespace vexa_test
