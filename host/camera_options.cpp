@@ -52,7 +52,7 @@ Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal)
   Result<Credentials> credentials = load_credentials(options.credentials);
   if (const auto* problem = std::get_if<Problem>(&credentials)) return *problem;
   const CameraConnection connection{std::get<CameraAddress>(address), std::get<Credentials>(credentials),
-                                    options.timeout_ms, options.cgi_log};
+                                    options.timeout_ms, options.transport, options.cgi_log};
   if (const auto problem = check_name(connection.address)) return *problem;
   if (connection.cgi_log) {
     if (const auto problem = check_cgi_log_target(*connection.cgi_log)) return *problem;

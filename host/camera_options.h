@@ -19,6 +19,7 @@ struct CameraOptions {
   CredentialSources credentials;
   int timeout_ms = 5000;
   std::optional<std::string> cgi_log = {};
+  VideoTransport transport = VideoTransport::kUdp;
   bool trace = false;
   bool json = false;
 };

@@ -17,7 +17,8 @@ constexpr char kDescription[] = "vexactl: drives a network camera from the comma
 constexpr char kFooter[] = R"(
 Start here:
   vexactl info 192.168.0.100 --credentials camera.cred
-  vexactl record 192.168.0.100 --credentials camera.cred --seconds 10 --out live.h264
+  vexactl record 192.168.0.100 --credentials camera.cred --seconds 10 --out live.mkv
+  vexactl snapshot 192.168.0.100 --credentials camera.cred --out live.jpg
   vexactl settings 192.168.0.100 --credentials camera.cred
   vexactl set 192.168.0.100 codec=H.264 size=1280x720 --credentials camera.cred
   vexactl info 192.168.0.100 --credentials camera.cred --cgi-log cgi.log
@@ -47,6 +48,8 @@ std::vector<std::unique_ptr<Command>> all_commands() {
   std::vector<std::unique_ptr<Command>> commands;
   commands.push_back(make_info_command());
   commands.push_back(make_record_command());
+  commands.push_back(make_snapshot_command());
+  commands.push_back(make_listen_command());
   commands.push_back(make_settings_command());
   commands.push_back(make_set_command());
   commands.push_back(make_codecs_command());

@@ -55,6 +55,18 @@ std::optional<Problem> FrameFile::write(const unsigned char* data, std::size_t l
   return std::nullopt;
 }
 
+std::optional<Problem> FrameFile::overwrite(std::size_t at, const unsigned char* data, std::size_t length) {
+  while (length > 0) {
+    const ssize_t written = pwrite(file_.get(), data, length, static_cast<off_t>(at));
+    if (written < 0 && errno == EINTR) continue;
+    if (written <= 0) return problem(written < 0 ? errno : ENOSPC);
+    data += written;
+    at += static_cast<std::size_t>(written);
+    length -= static_cast<std::size_t>(written);
+  }
+  return std::nullopt;
+}
+
 std::optional<Problem> FrameFile::close() {
   if (!file_.reset()) return problem(errno);
   return std::nullopt;

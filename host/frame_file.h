@@ -8,24 +8,28 @@
 #include <string>
 #include <vector>
 
-#include "host/problem.h"
+#include "host/picture_target.h"
 #include "host/unique_fd.h"
 
 namespace vexa::host {
 
 // Opened with the first picture, so that a recording that never begins leaves no empty file, nor a former recording
 // emptied.
-class FrameFile {
+class FrameFile final : public PictureTarget {
  public:
   explicit FrameFile(std::string path) : path_(std::move(path)) {}
   // Writes to a descriptor that is already open, and leaves it open.
   FrameFile(std::string name, int open_fd) : path_(std::move(name)), given_fd_(open_fd) {}
 
-  // Says early what opening would most likely say later; nothing is created.
-  [[nodiscard]] std::optional<Problem> check() const;
+  [[nodiscard]] std::optional<Problem> check() const override;
   [[nodiscard]] std::optional<Problem> write(const unsigned char* data, std::size_t length);
-  [[nodiscard]] std::optional<Problem> close();
-  [[nodiscard]] const std::string& path() const { return path_; }
+  [[nodiscard]] std::optional<Problem> write(const RecordedPicture& picture) override {
+    return write(picture.data, picture.length);
+  }
+  // Writes over what stands in a file of its own, `at` bytes from its beginning.
+  [[nodiscard]] std::optional<Problem> overwrite(std::size_t at, const unsigned char* data, std::size_t length);
+  [[nodiscard]] std::optional<Problem> close() override;
+  [[nodiscard]] const std::string& path() const override { return path_; }
 
  private:
   [[nodiscard]] Problem problem(int error) const;

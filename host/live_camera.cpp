@@ -12,8 +12,8 @@
 namespace vexa::host {
 namespace {
 
+constexpr int kOverHttp = 0;
 constexpr int kOverRtsp = 1;
-constexpr int kCodecH264 = 2;
 
 // The driver opens its CGI log with every connection; unnamed, it would be a file in the working folder. This one is in
 // memory and gone with the driver. /dev/null would not do: the log is flushed to its disk, and says when it has none.
@@ -34,7 +34,7 @@ void introduce(CLibraryDevice& device, const CameraConnection& connection) {
   device.SetCGILogPath(connection.cgi_log.value_or(unshown.path()).c_str());
   device.SetCGILogLevel(connection.cgi_log.has_value());
   SLibDConnectionInfo info;
-  info.streamTransport = kOverRtsp;
+  info.streamTransport = connection.transport == VideoTransport::kHttp ? kOverHttp : kOverRtsp;
   info.host = connection.address.host;
   info.port = connection.address.port;
   info.timeout = connection.timeout_ms;
@@ -43,11 +43,7 @@ void introduce(CLibraryDevice& device, const CameraConnection& connection) {
   device.SetCurrentConnectionInfo(info);
 }
 
-LiveCamera::LiveCamera(const CameraConnection& connection) : connection_(connection) {
-  m_CameraInfo.codecType = kCodecH264;
-  m_CameraInfo.codecName = "H.264";
-  introduce(*this, connection);
-}
+LiveCamera::LiveCamera(const CameraConnection& connection) : connection_(connection) { introduce(*this, connection); }
 
 Result<LiveCamera::Identity> LiveCamera::identify(int stream) {
   Identity identity;
@@ -57,6 +53,8 @@ Result<LiveCamera::Identity> LiveCamera::identify(int stream) {
   identity.video.streamNumber = stream;
   result = GetCameraInfo(identity.video);
   if (result != LIBD_OK) return explain(result);
+  m_CameraInfo.codecType = identity.video.codecType;
+  m_CameraInfo.codecName = identity.video.codecName;
   return identity;
 }
 
@@ -85,7 +83,7 @@ Problem explain_failure(CLibraryDevice& device, ELibDReturnCode result, const Ca
   }
   if (result == LIBD_STREAM_OPEN_FAILED) {
     return {ExitCode::kUnreachable, fmt::format("the camera {} does not open its video: {}", camera, why),
-            "Check that its RTSP port 554 can be reached and that it streams H.264."};
+            "Check that its RTSP port 554 can be reached and that the stream is on."};
   }
   return {ExitCode::kUnreachable, fmt::format("the camera {} cannot be used: {}", camera, why),
           "Check that address and HTTP port are the camera's."};

@@ -12,10 +12,14 @@
 
 namespace vexa::host {
 
+// How pictures come: RTP in datagrams behind an RTSP session, or the camera's HTTP image stream.
+enum class VideoTransport { kUdp, kHttp };
+
 struct CameraConnection {
   CameraAddress address;
   Credentials credentials;
   int timeout_ms = 0;
+  VideoTransport transport = VideoTransport::kUdp;
   std::optional<std::string> cgi_log = {};  // the file that requests and statuses are appended to
 };
 
@@ -29,7 +33,7 @@ void introduce(CLibraryDevice& device, const CameraConnection& connection);
 // Whether the latest failure has a text: a failed exchange leaves one, an answer that lacks a key none.
 [[nodiscard]] bool left_a_reason(CLibraryDevice& device);
 
-// A model class for a camera that streams H.264 over RTSP/RTP.
+// A model class for any camera that streams video.
 class LiveCamera final : public CVexaCommon {
  public:
   // Tells the driver where the camera is; contacts none.
@@ -42,7 +46,7 @@ class LiveCamera final : public CVexaCommon {
     SLibDSystemInfo system;
     SLibDCameraInfo video;  // of the stream asked for
   };
-  // Asks the camera what it is and what the stream is set to, and selects the stream.
+  // Asks the camera what it is and what the stream is set to, and selects the stream and its codec.
   [[nodiscard]] Result<Identity> identify(int stream);
 
  private:

@@ -1,7 +1,7 @@
 #include "host/picture_file.h"
 
-#include <algorithm>
-#include <cctype>
+#include "host/name_end.h"
+#include "host/picture_decoder.h"
 
 #ifdef VEXA_WITH_FFMPEG
 #include "host/ffmpeg_handles.h"
@@ -18,17 +18,11 @@ struct FileEnding {
 constexpr FileEnding kFileEndings[] = {
     {".png", PictureFormat::kPng}, {".jpg", PictureFormat::kJpeg}, {".jpeg", PictureFormat::kJpeg}};
 
-bool ends_with_letters(std::string_view text, std::string_view ending) {
-  if (text.size() <= ending.size()) return false;
-  return std::equal(ending.begin(), ending.end(), text.end() - static_cast<std::ptrdiff_t>(ending.size()),
-                    [](char wanted, char found) { return wanted == std::tolower(static_cast<unsigned char>(found)); });
-}
-
 }  // namespace
 
 std::optional<PictureFormat> picture_format_of(std::string_view file) {
   for (const FileEnding& ending : kFileEndings) {
-    if (ends_with_letters(file, ending.text)) return ending.format;
+    if (has_end(file, ending.text)) return ending.format;
   }
   return std::nullopt;
 }

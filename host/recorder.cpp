@@ -12,8 +12,12 @@ constexpr std::chrono::milliseconds kPollPause{3};
 
 }  // namespace
 
-Recorder::Recorder(CLibraryDevice& camera, FrameFile& file, RecordingLimits limits)
-    : camera_(camera), file_(file), limits_(std::move(limits)), start_(limits_.now()), last_picture_(start_) {
+bool is_key_picture(std::int32_t frame_type) {
+  return frame_type == VIDEO_FRAME_H264_KEY || frame_type == VIDEO_FRAME_MPEG4_KEY || frame_type == VIDEO_FRAME_JPEG;
+}
+
+Recorder::Recorder(CLibraryDevice& camera, PictureTarget& target, RecordingLimits limits)
+    : camera_(camera), target_(target), limits_(std::move(limits)), start_(limits_.now()), last_picture_(start_) {
   meter_.set_camera_rate(limits_.camera_rate);
 }
 
@@ -25,7 +29,7 @@ RecordingEnd Recorder::run(const Progress& progress) {
     frame.sink = &picture_;
     const ELibDReturnCode result = camera_.GetCurrentVideoFrame(frame);
     const Clock::time_point now = limits_.now();
-    if (result == LIBD_OK && !keep(frame.frameType, now)) return RecordingEnd::kCannotWrite;
+    if (result == LIBD_OK && !keep(frame, now)) return RecordingEnd::kCannotWrite;
     if (result == LIBD_NO_FRAME) Interrupt::wait(kPollPause);
     if (result != LIBD_OK && result != LIBD_NO_FRAME) return RecordingEnd::kSilent;
     progress(meter_, now);
@@ -44,12 +48,18 @@ std::optional<RecordingEnd> Recorder::limit_reached(Clock::time_point now) const
   return std::nullopt;
 }
 
-bool Recorder::keep(std::int32_t frame_type, Clock::time_point now) {
-  const bool key_picture = frame_type == VIDEO_FRAME_H264_KEY;
+// The driver stamps pictures of some streams only; the others get the time when they came.
+std::chrono::microseconds Recorder::time_of(const SLibDVideoFrameInfo& frame, Clock::time_point now) const {
+  if (frame.seconds != 0) return std::chrono::seconds(frame.seconds) + std::chrono::microseconds(frame.microseconds);
+  return std::chrono::duration_cast<std::chrono::microseconds>(wall_start_.time_since_epoch() + (now - start_));
+}
+
+bool Recorder::keep(const SLibDVideoFrameInfo& frame, Clock::time_point now) {
+  const bool key_picture = is_key_picture(frame.frameType);
   if (!key_picture && meter_.frames() == 0) return true;  // nothing could be decoded from here on
-  problem_ = file_.write(picture_.bytes.data(), picture_.bytes.size());
+  problem_ = target_.write({picture_.bytes.data(), picture_.bytes.size(), key_picture, time_of(frame, now)});
   if (problem_) return false;
-  if (key_picture && !meter_.stream()) {
+  if (frame.frameType == VIDEO_FRAME_H264_KEY && !meter_.stream()) {
     if (const auto stream = read_stream_parameters(picture_.bytes.data(), picture_.bytes.size())) {
       meter_.set_stream(*stream);
     }

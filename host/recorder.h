@@ -1,4 +1,4 @@
-// Moves live pictures from a driver into a file.
+// Moves live pictures from a driver to where they are kept.
 #ifndef HOST_RECORDER_H_
 #define HOST_RECORDER_H_
 
@@ -8,7 +8,7 @@
 #include <optional>
 #include <vector>
 
-#include "host/frame_file.h"
+#include "host/picture_target.h"
 #include "host/recording_meter.h"
 #include "vexa/library_device.h"
 
@@ -26,15 +26,18 @@ struct RecordingLimits {
 
 enum class RecordingEnd { kComplete, kInterrupted, kSilent, kNoKeyPicture, kCannotWrite };
 
+// Whether a picture can be decoded without those before it; `frame_type` as the driver tells it.
+[[nodiscard]] bool is_key_picture(std::int32_t frame_type);
+
 class Recorder {
  public:
   using Clock = RecordingMeter::Clock;
   using Progress = std::function<void(const RecordingMeter&, Clock::time_point)>;
 
-  Recorder(CLibraryDevice& camera, FrameFile& file, RecordingLimits limits);
+  Recorder(CLibraryDevice& camera, PictureTarget& target, RecordingLimits limits);
 
   // Polls a camera that streams already until the limits, an interruption or a failure end the recording. The camera
-  // goes on streaming; the file stays open.
+  // goes on streaming; the target stays open.
   RecordingEnd run(const Progress& progress);
 
   [[nodiscard]] const RecordingMeter& meter() const { return meter_; }
@@ -49,12 +52,14 @@ class Recorder {
   };
 
   [[nodiscard]] std::optional<RecordingEnd> limit_reached(Clock::time_point now) const;
-  [[nodiscard]] bool keep(std::int32_t frame_type, Clock::time_point now);
+  [[nodiscard]] bool keep(const SLibDVideoFrameInfo& frame, Clock::time_point now);
+  [[nodiscard]] std::chrono::microseconds time_of(const SLibDVideoFrameInfo& frame, Clock::time_point now) const;
 
   CLibraryDevice& camera_;
-  FrameFile& file_;
+  PictureTarget& target_;
   const RecordingLimits limits_;
   Clock::time_point start_;
+  std::chrono::system_clock::time_point wall_start_ = std::chrono::system_clock::now();  // the same moment
   Clock::time_point last_picture_;
   Picture picture_;
   RecordingMeter meter_;

@@ -74,6 +74,8 @@ void add_stream(CLI::App& app, CameraOptions& camera) {
       ->check(CLI::ExistingFile);
   app.add_option("--images", camera.image_path, "file to stream over HTTP: JPEG (.mjpeg), .h264 or MPEG-4 (.m4v)")
       ->check(CLI::ExistingFile);
+  app.add_option("--stream-piece", camera.stream_piece, "bytes of an HTTP stream that leave at a time; 0: a picture")
+      ->type_name("BYTES");
   app.add_option("--sound", camera.sound_path, "sound to stream over HTTP: this name and the codec, \"NAME.g711_64\"");
   app.add_option("--user-data", camera.user_data,
                  "text in every picture over HTTP, and in key pictures over RTP, such as \"CamPos: 1/2/3\"");

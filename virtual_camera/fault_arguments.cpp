@@ -13,6 +13,8 @@ namespace {
 constexpr const char* kPacketGroup = "Packet faults (P is a probability from 0 to 1)";
 constexpr const char* kRequestGroup =
     "Request faults (MATCH is a part of the request's text; MATCH#N strikes only the Nth match)";
+constexpr const char* kStreamGroup =
+    "Faults of HTTP streams (N is a picture, or a piece of sound, counted from 0 in each stream)";
 
 template <typename Number>
 Number number_of(std::string_view text) {
@@ -70,6 +72,7 @@ std::string unescaped(std::string_view text) {
 void FaultArguments::add_to(CLI::App& app, PacketFaults& faults) {
   add_packet_faults(app, faults);
   add_request_faults(app);
+  add_stream_faults(app);
 }
 
 void FaultArguments::add_packet_faults(CLI::App& app, PacketFaults& faults) {
@@ -123,7 +126,43 @@ void FaultArguments::add_request_faults(CLI::App& app) {
   valued("--reboot", reboot_, "MATCH MS: vanish without an answer, come back after this time");
 }
 
+void FaultArguments::add_stream_faults(CLI::App& app) {
+  const auto valued = [&app](const char* name, Pairs& pairs, const char* help) {
+    app.add_option(name, pairs, help)->type_name("")->allow_extra_args(false)->group(kStreamGroup);
+  };
+  valued("--part-length", part_length_, "N TEXT: TEXT stands behind \"DataLen: \"");
+  app.add_option("--no-part-length", no_part_length_, "the part does not announce its length")
+      ->type_name("N")
+      ->allow_extra_args(false)
+      ->group(kStreamGroup);
+  valued("--before-picture", before_picture_, "N TEXT: TEXT stands in front of it (\\r and \\n are known)");
+  valued("--cut-picture", cut_picture_, "N BYTES: only so many bytes of it are sent");
+  valued("--close-stream", close_stream_, "N BYTES: the connection closes after so many bytes of it");
+  valued("--silence-stream", silence_, "N BYTES: nothing comes after so many bytes of it");
+  valued("--pause-stream", pause_, "N MS: it comes later by this time, and so does all that follows");
+  valued("--other-clip", other_clip_, "N FILE: from here on the stream sends this file");
+}
+
+void FaultArguments::apply_stream_faults(CameraOptions& options) const {
+  using Action = HttpStreamFault::Action;
+  const auto add = [&options](Action action, std::string_view index) -> HttpStreamFault& {
+    HttpStreamFault& fault = options.stream_faults.emplace_back();
+    fault.index = number_of<std::uint64_t>(index);
+    fault.action = action;
+    return fault;
+  };
+  for (const std::string& index : no_part_length_) add(Action::kNoDataLength, index);
+  for (const auto& [index, text] : part_length_) add(Action::kDataLength, index).text = text;
+  for (const auto& [index, text] : before_picture_) add(Action::kBefore, index).text = unescaped(text);
+  for (const auto& [index, bytes] : cut_picture_) add(Action::kCut, index).bytes = number_of<std::uint32_t>(bytes);
+  for (const auto& [index, bytes] : close_stream_) add(Action::kClose, index).bytes = number_of<std::uint32_t>(bytes);
+  for (const auto& [index, bytes] : silence_) add(Action::kSilence, index).bytes = number_of<std::uint32_t>(bytes);
+  for (const auto& [index, ms] : pause_) add(Action::kPause, index).time = milliseconds_of(ms);
+  for (const auto& [index, file] : other_clip_) add(Action::kOtherClip, index).text = file;
+}
+
 void FaultArguments::apply(CameraOptions& options) const {
+  apply_stream_faults(options);
   for (const std::string& text : sequence_restarts_) {
     options.packet_faults.sequence_restarts.push_back(restart_of<SequenceRestart>(text));
   }

@@ -23,10 +23,14 @@ class FaultArguments {
 
   void add_packet_faults(CLI::App& app, PacketFaults& faults);
   void add_request_faults(CLI::App& app);
+  void add_stream_faults(CLI::App& app);
+  void apply_stream_faults(CameraOptions& options) const;
 
   std::vector<std::string> sequence_restarts_, timestamp_restarts_;
   std::vector<std::string> no_answer_, reset_, wrong_credentials_;
   Pairs slow_, byte_at_a_time_, cut_, stall_, status_, raw_, reboot_;
+  std::vector<std::string> no_part_length_;
+  Pairs part_length_, before_picture_, cut_picture_, close_stream_, silence_, pause_, other_clip_;
 };
 
 }  // namespace vexa::camera

@@ -9,9 +9,9 @@ namespace {
 // A host that does not read costs the camera no more than twice this.
 constexpr std::size_t kMostWaiting = 1 << 20;
 constexpr std::size_t kMostPacket = 65535;
-constexpr std::size_t kPrefix = 4;
+constexpr std::size_t kLanePrefix = 4;
 
-void append(std::string& text, std::span<const std::uint8_t> bytes) { text.append(bytes.begin(), bytes.end()); }
+void append_piece(std::string& text, std::span<const std::uint8_t> bytes) { text.append(bytes.begin(), bytes.end()); }
 
 }  // namespace
 
@@ -22,12 +22,12 @@ InterleavedLane::InterleavedLane(std::weak_ptr<Connection> owner, asio::ip::tcp:
 bool InterleavedLane::offer(std::uint8_t channel, const Outgoing& packet) {
   const std::span<const std::uint8_t> payload = packet.payload_to_send();
   const std::size_t size = packet.header.size() + payload.size();
-  if (closed_ || size > kMostPacket || waiting_.size() + kPrefix + size > kMostWaiting) return false;
-  const std::uint8_t prefix[kPrefix] = {'$', channel, static_cast<std::uint8_t>(size >> 8U),
-                                        static_cast<std::uint8_t>(size)};
-  append(waiting_, prefix);
-  append(waiting_, packet.header);
-  append(waiting_, payload);
+  if (closed_ || size > kMostPacket || waiting_.size() + kLanePrefix + size > kMostWaiting) return false;
+  const std::uint8_t prefix[kLanePrefix] = {'$', channel, static_cast<std::uint8_t>(size >> 8U),
+                                            static_cast<std::uint8_t>(size)};
+  append_piece(waiting_, prefix);
+  append_piece(waiting_, packet.header);
+  append_piece(waiting_, payload);
   return true;
 }
 

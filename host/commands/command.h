@@ -25,6 +25,8 @@ class Command {
 
 std::unique_ptr<Command> make_info_command();
 std::unique_ptr<Command> make_record_command();
+std::unique_ptr<Command> make_snapshot_command();
+std::unique_ptr<Command> make_listen_command();
 std::unique_ptr<Command> make_log_command();
 std::unique_ptr<Command> make_settings_command();
 std::unique_ptr<Command> make_set_command();

@@ -10,7 +10,9 @@
 #include "host/interrupt.h"
 #include "host/printable.h"
 #include "host/recorder.h"
+#include "host/recording_target.h"
 #include "host/result_output.h"
+#include "host/video_options.h"
 
 namespace vexa::host {
 namespace {
@@ -19,8 +21,6 @@ using Json = nlohmann::ordered_json;
 using Clock = RecordingMeter::Clock;
 
 constexpr double kLongestRecording = 366.0 * 24 * 3600;
-constexpr char kCodec[] = "H.264";
-constexpr int kMostStreams = 16;
 constexpr std::chrono::milliseconds kProgressInterval{250};
 constexpr std::chrono::milliseconds kShortestSilence{2000};
 
@@ -29,7 +29,7 @@ struct RecordOptions {
   std::optional<double> seconds;
   std::optional<std::int64_t> frames;
   std::string out;
-  int stream = 1;
+  VideoOptions video;
   bool quiet = false;
 };
 
@@ -38,6 +38,7 @@ struct Recording {
   std::string camera;
   std::string model;
   std::string file;
+  std::string codec;
   RecordingEnd end;
   RecordingMeter meter;
   Clock::time_point ended;
@@ -52,10 +53,7 @@ std::optional<Problem> check(const RecordOptions& options) {
   if (options.frames && *options.frames < 1) {
     return Problem{ExitCode::kUsage, "--frames is not a number above 0", "For instance: --frames 250."};
   }
-  if (options.stream < 1 || options.stream > kMostStreams) {
-    return Problem{ExitCode::kUsage, fmt::format("--stream is not a number from 1 to {}", kMostStreams),
-                   "1 is the camera's first stream."};
-  }
+  if (auto problem = check_video_options(options.video)) return problem;
   if (options.out.empty()) return Problem{ExitCode::kUsage, "--out names no file", "For instance: --out live.h264."};
   return std::nullopt;
 }
@@ -108,15 +106,11 @@ Json or_null(const std::optional<Value>& value) {
 
 Json to_json(const Recording& recording) {
   const RecordingMeter& meter = recording.meter;
-  Json json = {{"camera", recording.camera},
-               {"modelName", recording.model},
-               {"file", recording.file},
-               {"end", name_of(recording.end)},
-               {"seconds", recording.seconds()},
-               {"frames", meter.frames()},
-               {"keyFrames", meter.key_frames()},
-               {"bytes", meter.bytes()},
-               {"bitsPerSecond", static_cast<std::uint64_t>(meter.mean_bit_rate())}};
+  Json json = {{"camera", recording.camera},    {"modelName", recording.model},
+               {"file", recording.file},        {"codec", recording.codec},
+               {"end", name_of(recording.end)}, {"seconds", recording.seconds()},
+               {"frames", meter.frames()},      {"keyFrames", meter.key_frames()},
+               {"bytes", meter.bytes()},        {"bitsPerSecond", static_cast<std::uint64_t>(meter.mean_bit_rate())}};
   const auto& stream = meter.stream();
   json["width"] = stream ? Json(stream->width) : Json(nullptr);
   json["height"] = stream ? Json(stream->height) : Json(nullptr);
@@ -129,17 +123,17 @@ Json to_json(const Recording& recording) {
 class RecordCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
-    CLI::App* command = program.add_subcommand("record", "Record live H.264 video into a file");
+    CLI::App* command = program.add_subcommand("record", "Record live video into a file");
     read_environment(options_.camera.credentials, environment);
     add_camera_options(*command, options_.camera);
-    command->add_option("--out", options_.out, "file to write, in Annex B byte stream format; - is standard output")
+    command
+        ->add_option("--out", options_.out,
+                     "file to write: .mkv or .mp4, or the pictures alone: .h264, .m4v, .mjpeg; - is standard output")
         ->required()
         ->type_name("FILE");
     command->add_option("--seconds", options_.seconds, "end after this many seconds of video")->type_name("N");
     command->add_option("--frames", options_.frames, "end after this many frames")->type_name("N");
-    command->add_option("--stream", options_.stream, "which of the camera's video streams")
-        ->type_name("N")
-        ->capture_default_str();
+    add_video_options(*command, options_.video);
     command->add_flag("--quiet", options_.quiet, "show no progress");
     command->footer(
         "A recording begins with the first key frame and, without --seconds and --frames, ends with Ctrl-C.\n"
@@ -150,11 +144,12 @@ class RecordCommand final : public Command {
   ExitCode run(Terminal& terminal) override {
     if (const auto problem = check(options_)) return terminal.report(*problem);
     if (options_.quiet) terminal.silence_progress();
-    FrameFile file = to_standard_output() ? FrameFile("standard output", terminal.results()) : FrameFile(options_.out);
-    if (const auto problem = file.check()) return terminal.report(*problem);
+    const RecordingTarget target(options_.out, terminal.results());
+    if (const auto problem = target.check()) return terminal.report(*problem);
+    options_.camera.transport = transport_of(options_.video);
     Result<OpenCamera> opened = open_camera(options_.camera, terminal);
     if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    return record(std::get<OpenCamera>(opened), file, terminal);
+    return record(std::get<OpenCamera>(opened), target, terminal);
   }
 
  private:
@@ -164,17 +159,18 @@ class RecordCommand final : public Command {
   }
   [[nodiscard]] bool to_standard_output() const { return options_.out == "-"; }
 
-  ExitCode record(OpenCamera& camera, FrameFile& file, Terminal& terminal) {
+  ExitCode record(OpenCamera& camera, const RecordingTarget& target, Terminal& terminal) {
     terminal.progress("connecting");
     // Asked first: it finds a wrong address or password within the time-out, which opening a stream may exceed.
-    const Result<LiveCamera::Identity> identified = camera.driver->identify(options_.stream);
+    const Result<LiveCamera::Identity> identified = camera.driver->identify(options_.video.stream);
     if (const auto* problem = std::get_if<Problem>(&identified)) return terminal.report(*problem);
     const auto& identity = std::get<LiveCamera::Identity>(identified);
-    if (identity.video.codecName != kCodec) return terminal.report(other_codec(identity.video));
+    if (const auto problem = other_codec(target, identity.video)) return terminal.report(*problem);
+    const std::unique_ptr<PictureTarget> file = target.open(identity.video.codecName);
     Interrupt::finish_orderly();
     const ELibDReturnCode result = camera.driver->StartVideoStreaming();
     if (result != LIBD_OK) return terminal.report(camera.driver->explain(result));
-    Recorder recorder(*camera.driver, file,
+    Recorder recorder(*camera.driver, *file,
                       {.seconds = options_.seconds,
                        .frames = options_.frames,
                        .camera_rate = static_cast<double>(identity.video.frameRate),
@@ -184,18 +180,24 @@ class RecordCommand final : public Command {
     terminal.progress("closing the session");
     camera.driver->StopVideoStreaming();
     std::optional<Problem> problem = recorder.problem();
-    if (const auto at_close = file.close(); at_close && !problem) problem = at_close;
-    const ExitCode written = summarise(
-        {to_string(camera.address), identity.system.modelName, file.path(), end, recorder.meter(), ended}, terminal);
+    if (const auto at_close = file->close(); at_close && !problem) problem = at_close;
+    const ExitCode written = summarise({to_string(camera.address), identity.system.modelName, file->path(),
+                                        identity.video.codecName, end, recorder.meter(), ended},
+                                       terminal);
     if (problem) return terminal.report(*problem);
     const ExitCode code = judge(end, terminal);
     return code == ExitCode::kOk ? written : code;
   }
 
-  [[nodiscard]] Problem other_codec(const SLibDCameraInfo& video) const {
-    return {ExitCode::kNoVideo,
-            fmt::format("video stream {} of the camera is set to {}", options_.stream, printable(video.codecName)),
-            "Set it to H.264 on the camera, or choose another with --stream."};
+  // When the file's name promises another codec than the camera sends.
+  [[nodiscard]] std::optional<Problem> other_codec(const RecordingTarget& target, const SLibDCameraInfo& video) const {
+    const auto promised = target.codec();
+    if (!promised || video.codecName == *promised) return std::nullopt;
+    return Problem{
+        ExitCode::kNoVideo,
+        fmt::format("video stream {} of the camera is set to {}", options_.video.stream, printable(video.codecName)),
+        fmt::format("Set it to {} on the camera, choose another with --stream, or let --out end in {} or .mkv.",
+                    *promised, usual_end(video.codecName))};
   }
 
   static Recorder::Progress progress_on(Terminal& terminal) {
@@ -228,7 +230,7 @@ class RecordCommand final : public Command {
                                 "Check its network and encoder settings; --timeout makes the wait longer."});
       case RecordingEnd::kNoKeyPicture:
         return terminal.report({ExitCode::kNoVideo, "the camera has sent no key picture to begin with",
-                                "Check that the stream is H.264, and shorten its key-frame interval."});
+                                "Shorten the key-frame interval of the stream."});
       case RecordingEnd::kCannotWrite:
         break;
     }

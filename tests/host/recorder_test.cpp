@@ -4,6 +4,7 @@
 
 #include <deque>
 
+#include "host/frame_file.h"
 #include "tests/support/temporary_folder.h"
 
 namespace vexa::host {
@@ -16,6 +17,8 @@ struct Answer {
   ELibDReturnCode result;
   std::int32_t frame_type = VIDEO_FRAME_INVALID;
   std::string bytes = "";
+  std::int32_t seconds = 0;
+  std::int32_t microseconds = 0;
 };
 
 // A device that answers polls as told, a millisecond each, and then has no frame for ever.
@@ -29,6 +32,8 @@ class ScriptedDevice final : public CLibraryDevice {
     const Answer answer = answers_.front();
     answers_.pop_front();
     frame.frameType = answer.frame_type;
+    frame.seconds = answer.seconds;
+    frame.microseconds = answer.microseconds;
     if (answer.result == LIBD_OK) {
       const std::vector<unsigned char> bytes(answer.bytes.begin(), answer.bytes.end());
       frame.sink->Write(bytes.data(), static_cast<unsigned int>(bytes.size()));
@@ -61,6 +66,44 @@ Outcome record(std::deque<Answer> answers, RecordingLimits limits) {
   const RecordingEnd end = recorder.run([](const RecordingMeter&, Recorder::Clock::time_point) {});
   EXPECT_FALSE(file.close());
   return {end, contents_of(folder / "live")};
+}
+
+// Keeps what it is given.
+class Kept final : public PictureTarget {
+ public:
+  [[nodiscard]] std::optional<Problem> check() const override { return std::nullopt; }
+  [[nodiscard]] std::optional<Problem> write(const RecordedPicture& picture) override {
+    keys.push_back(picture.key);
+    times.push_back(picture.time);
+    return std::nullopt;
+  }
+  [[nodiscard]] std::optional<Problem> close() override { return std::nullopt; }
+  [[nodiscard]] const std::string& path() const override { return name; }
+
+  const std::string name;
+  std::vector<bool> keys;
+  std::vector<std::chrono::microseconds> times;
+};
+
+TEST(Recorder, KeepsTheTimesThatTheDriverGives) {
+  ScriptedDevice device({{LIBD_OK, VIDEO_FRAME_MPEG4_KEY, "K", 1700000000, 250000},
+                         {LIBD_OK, VIDEO_FRAME_MPEG4_DELTA, "d", 1700000000, 290001}});
+  Kept kept;
+  Recorder recorder(device, kept, {.frames = 2, .now = [&device] { return device.now(); }});
+  EXPECT_EQ(recorder.run([](const RecordingMeter&, Recorder::Clock::time_point) {}), RecordingEnd::kComplete);
+  EXPECT_EQ(kept.times, (std::vector<std::chrono::microseconds>{std::chrono::microseconds(1700000000250000),
+                                                                std::chrono::microseconds(1700000000290001)}));
+  EXPECT_EQ(kept.keys, (std::vector<bool>{true, false}));
+}
+
+TEST(Recorder, PicturesWithoutATimeGetTheOneWhenTheyCame) {
+  ScriptedDevice device({{LIBD_OK, VIDEO_FRAME_JPEG, "a"}, kNothing, kNothing, {LIBD_OK, VIDEO_FRAME_JPEG, "b"}});
+  Kept kept;
+  Recorder recorder(device, kept, {.frames = 2, .now = [&device] { return device.now(); }});
+  EXPECT_EQ(recorder.run([](const RecordingMeter&, Recorder::Clock::time_point) {}), RecordingEnd::kComplete);
+  ASSERT_EQ(kept.times.size(), 2U);
+  EXPECT_EQ(kept.times[1] - kept.times[0], std::chrono::milliseconds(3));
+  EXPECT_EQ(kept.keys, (std::vector<bool>{true, true}));
 }
 
 TEST(Recorder, BeginsWithTheFirstKeyPicture) {

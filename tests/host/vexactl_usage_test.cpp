@@ -120,6 +120,13 @@ TEST(CommandLine, EachMistakeEndsWithOneAndSaysWhatToDo) {
        "vexactl: --stream is not a number from 1 to 16\n  1 is the camera's first stream.\n"},
       {{"record", "cam", "--out", "f", "--stream", "17"},
        "vexactl: --stream is not a number from 1 to 16\n  1 is the camera's first stream.\n"},
+      {{"record", "cam", "--out", "f", "--transport", "tcp"},
+       "vexactl: --transport is neither udp nor http\n  udp when not given.\n"},
+      {{"listen", "cam", "--out", "f", "--codec", "g711"},
+       "vexactl: --codec is none of g711_64, g726_40, g726_32, g726_24 and g726_16\n  For instance: --codec "
+       "g711_64.\n"},
+      {{"listen", "cam", "--out", "f", "--seconds", "0"},
+       "vexactl: --seconds is not a number above 0\n  For instance: --seconds 10.\n"},
   };
   for (const Refusal& refusal : refusals) {
     SCOPED_TRACE(testing::PrintToString(refusal.arguments));

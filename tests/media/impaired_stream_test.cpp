@@ -27,7 +27,7 @@ constexpr Impairment kImpairments[] = {
     {.name = "Duplicate1", .duplicate = 0.01, .start_timestamp = 4294000000},
     {.name = "All", .loss = 0.01, .reorder = 0.05, .duplicate = 0.01, .start_timestamp = 4294000000}};
 
-using Frames = std::vector<std::string>;
+using WholeFrames = std::vector<std::string>;
 
 /// One of the streams of a test; `index` gives it a camera of its own.
 struct ImpairedStream {
@@ -35,25 +35,25 @@ struct ImpairedStream {
   std::string clip;
   std::size_t max_payload = 600;
   /// All frames of the stream, which ends by itself.
-  Frames (*take)(LiveCamera& camera, MediaDriver& driver);
+  WholeFrames (*take)(LiveCamera& camera, MediaDriver& driver);
 };
 
 /// As a host takes them, through the streaming thread and the frame queue.
-Frames take_from_queue(LiveCamera& camera, MediaDriver& driver) {
+WholeFrames take_from_queue(LiveCamera& camera, MediaDriver& driver) {
   EXPECT_EQ(driver.StartVideoStreaming(), LIBD_OK);
   std::vector<std::uint64_t> wanted;
-  Frames frames;
+  WholeFrames frames;
   for (TakenFrame& frame : take_whole_stream(camera, driver, wanted)) frames.push_back(std::move(frame.bytes));
   return frames;
 }
 
 /// Without the frame queue, which drops JPEG pictures of a host that is slow for a moment.
-Frames take_from_assembly(LiveCamera& camera, MediaDriver& driver) {
+WholeFrames take_from_assembly(LiveCamera& camera, MediaDriver& driver) {
   constexpr int kPatience = 500;  // milliseconds: longer than a picture is ever held back
   driver.use(camera->address(), camera->http_port(), kPatience);
   EXPECT_TRUE(driver.OpenLiveRtp(1));
   std::vector<unsigned char> buffer(1200000);
-  Frames frames;
+  WholeFrames frames;
   for (;;) {
     const bool finished = camera->sent().finished_streams() != 0;
     CVexaCommon::VideoFrameInfo frame;
@@ -83,7 +83,7 @@ class Impaired : public testing::TestWithParam<Impairment> {
     LiveCamera camera(options);
     MediaDriver driver;
     camera.introduce(driver);
-    const Frames frames = stream.take(camera, driver);
+    const WholeFrames frames = stream.take(camera, driver);
     const std::vector<std::uint64_t> wanted = predicted(camera, camera->sent().snapshot());
     ASSERT_EQ(frames.size(), wanted.size()) << stream.clip << " " << stream.index;
     for (std::size_t i = 0; i < frames.size(); ++i) {

@@ -32,7 +32,7 @@ struct NamedWay {
 
 constexpr NamedWay kDatagrams = {"Datagrams", VideoWay::kUdp};
 constexpr NamedWay kRtspConnection = {"RtspConnection", VideoWay::kInterleaved};
-constexpr NamedWay kHttp = {"Http", VideoWay::kHttp};
+constexpr NamedWay kHttpStream = {"Http", VideoWay::kHttp};
 
 class EveryCodecByEveryWay : public testing::TestWithParam<std::tuple<CodecClip, NamedWay>> {
  protected:
@@ -61,6 +61,7 @@ TEST_P(EveryCodecByEveryWay, FramesAreTheEncodersAndADecoderHasNothingToSay) {
   file.close();
   const Decoded decoded = decode(folder / "frames", clip().format);
   EXPECT_TRUE(decoded.flawless);
+  EXPECT_TRUE(decoded.silent);
   EXPECT_EQ(decoded.frames, kFrames);
   EXPECT_EQ(decoded.size, "320x240");
 }
@@ -71,7 +72,7 @@ std::string name_of_codec_and_way(const testing::TestParamInfo<std::tuple<CodecC
 
 INSTANTIATE_TEST_SUITE_P(Of, EveryCodecByEveryWay,
                          testing::Combine(testing::ValuesIn(kCodecClips),
-                                          testing::Values(kDatagrams, kRtspConnection, kHttp)),
+                                          testing::Values(kDatagrams, kRtspConnection, kHttpStream)),
                          name_of_codec_and_way);
 INSTANTIATE_TEST_SUITE_P(OfSlices, EveryCodecByEveryWay,
                          testing::Combine(testing::Values(kSlicedClip), testing::Values(kDatagrams, kRtspConnection)),

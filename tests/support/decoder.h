@@ -8,7 +8,8 @@
 namespace vexa_test {
 
 struct Decoded {
-  bool flawless = false;  ///< it met no damage and had nothing to say
+  bool flawless = false;  ///< it met no damage
+  bool silent = true;     ///< nor had it anything to say of it
   std::size_t frames = 0;
   std::string size;  ///< for instance "640x480"
 };
@@ -21,16 +22,15 @@ inline Decoded decode(const std::string& path, const std::string& format) {
   std::FILE* output = popen(command.c_str(), "r");
   if (output == nullptr) return decoded;
   const std::string dimensions = "#dimensions 0: ";
-  bool silent = true;
   char piece[512];
   while (std::fgets(piece, sizeof piece, output) != nullptr) {
     const std::string line = piece;
     if (line.rfind(dimensions, 0) == 0)
       decoded.size = line.substr(dimensions.size(), line.find('\n') - dimensions.size());
     if (line.rfind("0,", 0) == 0) ++decoded.frames;
-    silent = silent && (line[0] == '#' || line[0] == '0');
+    decoded.silent = decoded.silent && (line[0] == '#' || line[0] == '0');
   }
-  decoded.flawless = pclose(output) == 0 && silent;
+  decoded.flawless = pclose(output) == 0;
   return decoded;
 }
 

@@ -133,6 +133,38 @@ TEST(CommandLine, EveryRequestFaultHasAnOption) {
   }
 }
 
+TEST(CommandLine, EveryFaultOfAnHttpStreamHasAnOption) {
+  using Action = HttpStreamFault::Action;
+  const struct {
+    std::vector<const char*> arguments;
+    Action action;
+    std::string text;
+    std::size_t bytes;
+    int time;
+  } cases[] = {{{"--part-length", "3", "many"}, Action::kDataLength, "many", 0, 0},
+               {{"--no-part-length", "3"}, Action::kNoDataLength, "", 0, 0},
+               {{"--before-picture", "3", "a\\r\\nb"}, Action::kBefore, "a\r\nb", 0, 0},
+               {{"--cut-picture", "3", "500"}, Action::kCut, "", 500, 0},
+               {{"--close-stream", "3", "500"}, Action::kClose, "", 500, 0},
+               {{"--silence-stream", "3", "500"}, Action::kSilence, "", 500, 0},
+               {{"--pause-stream", "3", "70"}, Action::kPause, "", 0, 70},
+               {{"--other-clip", "3", "b.m4v"}, Action::kOtherClip, "b.m4v", 0, 0}};
+  for (const auto& c : cases) {
+    const CommandLine line = parse(c.arguments);
+    ASSERT_FALSE(line.exit_code) << c.arguments[0];
+    ASSERT_EQ(line.options.camera.stream_faults.size(), 1U) << c.arguments[0];
+    const HttpStreamFault& fault = line.options.camera.stream_faults[0];
+    EXPECT_EQ(fault.index, 3U) << c.arguments[0];
+    EXPECT_EQ(fault.action, c.action) << c.arguments[0];
+    EXPECT_EQ(fault.text, c.text) << c.arguments[0];
+    EXPECT_EQ(fault.bytes, c.bytes) << c.arguments[0];
+    EXPECT_EQ(fault.time.count(), c.time) << c.arguments[0];
+  }
+  EXPECT_EQ(parse({"--stream-piece", "7"}).options.camera.stream_piece, 7U);
+  EXPECT_EQ(parse({"--cut-picture", "x", "5"}).exit_code, 2);
+  EXPECT_EQ(parse({"--pause-stream", "3", "-5"}).exit_code, 2);
+}
+
 TEST(CommandLine, StreamOptionsReachTheCamera) {
   const CommandLine line = parse({"--once", "--pictures", "7", "--fps", "30", "--speed", "4", "--max-payload", "900",
                                   "--start-sequence", "65535", "--start-timestamp", "4294967295", "--session-timeout",

@@ -1,0 +1,195 @@
+// vexactl listen: a camera's sound into a file.
+#include <fmt/format.h>
+
+#include <algorithm>
+#include <array>
+#include <chrono>
+#include <cstdint>
+#include <iterator>
+#include <nlohmann/json.hpp>
+
+#include "host/camera_options.h"
+#include "host/commands/command.h"
+#include "host/interrupt.h"
+#include "host/printable.h"
+#include "host/result_output.h"
+#include "host/sound_file.h"
+
+namespace vexa::host {
+namespace {
+
+using ListenClock = std::chrono::steady_clock;
+
+constexpr double kLongestListening = 366.0 * 24 * 3600;
+constexpr char kCompanded[] = "G711";
+
+struct SoundCodec {
+  const char* word;
+  const char* codec;
+  std::int32_t bit_rate;
+};
+
+constexpr SoundCodec kSoundCodecs[] = {{"g711_64", kCompanded, 64000},
+                                       {"g726_40", "G726", 40000},
+                                       {"g726_32", "G726", 32000},
+                                       {"g726_24", "G726", 24000},
+                                       {"g726_16", "G726", 16000}};
+
+const SoundCodec* find_sound_codec(const std::string& word) {
+  const auto* found = std::find_if(std::begin(kSoundCodecs), std::end(kSoundCodecs),
+                                   [&word](const SoundCodec& codec) { return word == codec.word; });
+  return found == std::end(kSoundCodecs) ? nullptr : found;
+}
+
+// How much is wanted: so many seconds of sound, whatever the clock says.
+class SoundLimit {
+ public:
+  SoundLimit(std::optional<double> seconds, int bit_rate) {
+    if (seconds) bytes_ = static_cast<std::uint64_t>(*seconds * bit_rate / 8 + 0.5);
+  }
+  [[nodiscard]] bool reached(std::uint64_t have) const { return bytes_ && have >= *bytes_; }
+  // Of the next piece, when so much is there already.
+  [[nodiscard]] std::size_t share(std::size_t piece, std::uint64_t have) const {
+    return bytes_ ? static_cast<std::size_t>(std::min<std::uint64_t>(piece, *bytes_ - have)) : piece;
+  }
+
+ private:
+  std::optional<std::uint64_t> bytes_;
+};
+
+// What is heard until the camera, the person or the time ends it.
+struct Listening {
+  ExitCode code = ExitCode::kOk;
+  std::optional<Problem> problem;
+};
+
+class ListenCommand final : public Command {
+ public:
+  CLI::App* declare(CLI::App& program, const char* const* environment) override {
+    CLI::App* command = program.add_subcommand("listen", "Record a camera's sound into a file");
+    read_environment(camera_.credentials, environment);
+    add_camera_options(*command, camera_);
+    command
+        ->add_option("--out", out_,
+                     "file to write: .wav of G.711 sound, else the sound as it comes; - is standard output")
+        ->required()
+        ->type_name("FILE");
+    command->add_option("--codec", codec_, "switch the camera's sound on in this: g711_64, g726_40, _32, _24 or _16")
+        ->type_name("WORD");
+    command->add_option("--seconds", seconds_, "end after this many seconds of sound")->type_name("N");
+    command->footer("Without --seconds it ends with Ctrl-C.");
+    return command;
+  }
+
+  ExitCode run(Terminal& terminal) override {
+    if (seconds_ && !(*seconds_ > 0 && *seconds_ <= kLongestListening)) {
+      return terminal.report(usage("--seconds is not a number above 0", "For instance: --seconds 10."));
+    }
+    if (codec_ && find_sound_codec(*codec_) == nullptr) {
+      return terminal.report(
+          usage("--codec is none of g711_64, g726_40, g726_32, g726_24 and g726_16", "For instance: --codec g711_64."));
+    }
+    FrameFile file = to_standard_output() ? FrameFile("standard output", terminal.results()) : FrameFile(out_);
+    if (const auto problem = file.check()) return terminal.report(*problem);
+    Result<OpenCamera> opened = open_camera(camera_, terminal);
+    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
+    return listen(std::get<OpenCamera>(opened), file, terminal);
+  }
+
+ private:
+  [[nodiscard]] bool to_standard_output() const { return out_ == "-"; }
+
+  ExitCode listen(OpenCamera& camera, FrameFile& file, Terminal& terminal) {
+    terminal.progress("connecting");
+    SLibDAudioInfo sound;
+    ELibDReturnCode result = codec_ ? switch_on(camera, *find_sound_codec(*codec_)) : LIBD_OK;
+    if (result == LIBD_OK) result = camera.driver->GetAudioInfo(sound);
+    if (result != LIBD_OK) return terminal.report(camera.driver->explain(result));
+    if (sound.bitRate == 0) return terminal.report(no_sound());
+    const SoundFormat format = sound_format_of(out_);
+    if (format == SoundFormat::kWave && sound.codec != kCompanded) return terminal.report(no_wave(sound));
+    Interrupt::finish_orderly();
+    result = camera.driver->StartAudioStreaming();
+    if (result != LIBD_OK) return terminal.report(camera.driver->explain(result));
+    SoundFile target(file, format);
+    Listening heard = hear(camera, target, SoundLimit(seconds_, sound.bitRate), terminal);
+    camera.driver->StopAudioStreaming();
+    if (const auto at_close = target.close(); at_close && !heard.problem) heard.problem = at_close;
+    const ExitCode written = summarise(camera, sound, target.bytes(), terminal);
+    if (heard.problem) return terminal.report(*heard.problem);
+    if (heard.code == ExitCode::kInterrupted) {
+      terminal.say("vexactl: interrupted; what was recorded is complete up to here");
+    }
+    return heard.code == ExitCode::kOk ? written : heard.code;
+  }
+
+  static ELibDReturnCode switch_on(OpenCamera& camera, const SoundCodec& codec) {
+    SLibDAudioInfo wanted;
+    wanted.codec = codec.codec;
+    wanted.bitRate = codec.bit_rate;
+    return camera.driver->SetAudioInfo(wanted);
+  }
+
+  static Problem no_sound() {
+    return {ExitCode::kNoVideo, "the camera's sound is off", "Switch it on, for instance with --codec g711_64."};
+  }
+
+  static Problem no_wave(const SLibDAudioInfo& sound) {
+    return usage(fmt::format("the camera's sound is {}, which a .wav here does not hold", printable(sound.codec)),
+                 "Give --out another ending for the sound as it comes, or switch to --codec g711_64.");
+  }
+
+  Listening hear(OpenCamera& camera, SoundFile& target, const SoundLimit& limit, Terminal& terminal) {
+    const auto silence = std::chrono::milliseconds(camera_.timeout_ms);
+    auto last = ListenClock::now();
+    std::array<unsigned char, 4096> piece{};
+    while (!limit.reached(target.bytes())) {
+      if (Interrupt::requested()) return {ExitCode::kInterrupted, std::nullopt};
+      SLibDAudioFrameInfo frame;
+      frame.data = piece.data();
+      frame.capacity = static_cast<std::int32_t>(piece.size());
+      const ELibDReturnCode result = camera.driver->GetCurrentAudioFrame(frame);
+      if (result == LIBD_OK) {
+        last = ListenClock::now();
+        const std::size_t share = limit.share(static_cast<std::size_t>(frame.length), target.bytes());
+        if (auto problem = target.write(piece.data(), share)) {
+          return {problem->code, problem};
+        }
+        terminal.progress(fmt::format("{} bytes of sound", target.bytes()));
+      } else if (result != LIBD_NO_FRAME || ListenClock::now() - last > silence) {
+        return {ExitCode::kNoVideo, Problem{ExitCode::kNoVideo, "the camera has stopped sending sound",
+                                            "Check its network and that its audio input is on."}};
+      }
+    }
+    return {};
+  }
+
+  ExitCode summarise(const OpenCamera& camera, const SLibDAudioInfo& sound, std::uint64_t bytes, Terminal& terminal) {
+    const double seconds = static_cast<double>(bytes) * 8 / sound.bitRate;
+    std::string text = fmt::format("{}: {:.2f} s of {} at {}, {} bytes\n", out_, seconds, printable(sound.codec),
+                                   printable(sound.bitRateLabel), bytes);
+    if (camera_.json) {
+      text = to_text({{"camera", to_string(camera.address)},
+                      {"file", out_},
+                      {"codec", sound.codec},
+                      {"bitsPerSecond", sound.bitRate},
+                      {"seconds", seconds},
+                      {"bytes", bytes}});
+    }
+    if (!to_standard_output()) return write_result(terminal, text);
+    text.pop_back();
+    terminal.say(text);
+    return ExitCode::kOk;
+  }
+
+  CameraOptions camera_;
+  std::optional<std::string> codec_;
+  std::optional<double> seconds_;
+  std::string out_;
+};
+
+}  // namespace
+
+std::unique_ptr<Command> make_listen_command() { return std::make_unique<ListenCommand>(); }
+
+}  // namespace vexa::host

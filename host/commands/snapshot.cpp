@@ -1,0 +1,92 @@
+// vexactl snapshot: one picture of live video into a file.
+#include <fmt/format.h>
+
+#include <nlohmann/json.hpp>
+
+#include "host/camera_options.h"
+#include "host/commands/command.h"
+#include "host/frame_file.h"
+#include "host/live_pictures.h"
+#include "host/picture_decoder.h"
+#include "host/picture_file.h"
+#include "host/printable.h"
+#include "host/result_output.h"
+#include "host/video_options.h"
+
+namespace vexa::host {
+namespace {
+
+class SnapshotCommand final : public Command {
+ public:
+  CLI::App* declare(CLI::App& program, const char* const* environment) override {
+    CLI::App* command = program.add_subcommand("snapshot", "Keep one picture of live video");
+    read_environment(camera_.credentials, environment);
+    add_camera_options(*command, camera_);
+    command->add_option("--out", out_, "file to write: .jpg, .jpeg or .png")->required()->type_name("FILE");
+    add_video_options(*command, video_);
+    command->footer(
+        "A .jpg of a JPEG stream is the picture as the camera sent it. Everything else is decoded first, for which\n"
+        "vexactl must have been built with FFmpeg's libraries.");
+    return command;
+  }
+
+  ExitCode run(Terminal& terminal) override {
+    const auto format = picture_format_of(out_);
+    if (!format) return terminal.report(usage("--out names no picture", "For instance: --out live.jpg, or live.png."));
+    if (const auto problem = check_video_options(video_)) return terminal.report(*problem);
+    if (const auto problem = FrameFile(out_).check()) return terminal.report(*problem);
+    camera_.transport = transport_of(video_);
+    Result<OpenCamera> opened = open_camera(camera_, terminal);
+    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
+    return take(std::get<OpenCamera>(opened), *format, terminal);
+  }
+
+ private:
+  ExitCode take(OpenCamera& camera, PictureFormat format, Terminal& terminal) {
+    terminal.progress("connecting");
+    const Result<LiveCamera::Identity> identified = camera.driver->identify(video_.stream);
+    if (const auto* problem = std::get_if<Problem>(&identified)) return terminal.report(*problem);
+    const auto& identity = std::get<LiveCamera::Identity>(identified);
+    const std::string& codec = identity.video.codecName;
+    const bool possible = has_ffmpeg() || (format == PictureFormat::kJpeg && makes_jpeg_of(codec));
+    if (!possible) return terminal.report(without_ffmpeg(fmt::format("a picture of {} video", printable(codec))));
+    terminal.progress("waiting for a key picture");
+    const Result<FrameBytes> picture = newest_picture(*camera.driver, format);
+    if (const auto* problem = std::get_if<Problem>(&picture)) return terminal.report(*problem);
+    const auto& bytes = std::get<FrameBytes>(picture);
+    if (const auto problem = write_whole_file(out_, bytes)) return terminal.report(*problem);
+    return summarise(camera, identity, bytes.size(), terminal);
+  }
+
+  // As the bytes of a file.
+  static Result<FrameBytes> newest_picture(LiveCamera& camera, PictureFormat format) {
+    LivePictures pictures(camera);
+    if (auto problem = await_key_frame(camera, pictures)) return *problem;
+    const FrameRun run = pictures.newest();
+    if (format == PictureFormat::kJpeg) return jpeg_of(run.codec, run.frames);
+    const Result<Picture> decoded = decode_picture(run.codec, run.frames);
+    if (const auto* problem = std::get_if<Problem>(&decoded)) return *problem;
+    return encode_picture(std::get<Picture>(decoded), format);
+  }
+
+  ExitCode summarise(const OpenCamera& camera, const LiveCamera::Identity& identity, std::size_t size,
+                     Terminal& terminal) const {
+    const std::string codec = printable(identity.video.codecName);
+    if (!camera_.json) return write_result(terminal, fmt::format("{}: {} bytes, from {} video\n", out_, size, codec));
+    return write_result(terminal, to_text({{"camera", to_string(camera.address)},
+                                           {"modelName", identity.system.modelName},
+                                           {"file", out_},
+                                           {"codec", identity.video.codecName},
+                                           {"bytes", size}}));
+  }
+
+  CameraOptions camera_;
+  VideoOptions video_;
+  std::string out_;
+};
+
+}  // namespace
+
+std::unique_ptr<Command> make_snapshot_command() { return std::make_unique<SnapshotCommand>(); }
+
+}  // namespace vexa::host
