@@ -78,7 +78,7 @@ TEST_F(HttpFrames, OfAnUnknownCodecOrAClosedStreamDoNotExist) {
 }
 
 TEST_F(HttpFrames, OfJpegAreThePartsOfTheStream) {
-  pair_.say("DataLen: 3\r\n\r\nabcDataLen: 4\r\n\r\nefgh");
+  pair_.say("DataLen: 3\r\n\r\nabcDataLen: 4\r\n\r\nefghDataLen: 1\r\n\r\ni");
   http_frames_now = 1234;
   EXPECT_EQ(read("JPEG"), LIBD_OK);
   EXPECT_EQ(bytes(), "abc");
@@ -89,6 +89,8 @@ TEST_F(HttpFrames, OfJpegAreThePartsOfTheStream) {
   int received = 0;
   EXPECT_EQ(driver_.GetCurrentJPEGFrameData(frame_, received), LIBD_OK);
   EXPECT_EQ(received, 4);
+  EXPECT_EQ(driver_.GetCurrentJPEGFrameData(frame_, received), LIBD_OK);
+  EXPECT_EQ(bytes(), "i");
 }
 
 TEST_F(HttpFrames, OfJpegThatDoNotFitSaySo) {

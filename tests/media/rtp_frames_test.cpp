@@ -60,6 +60,8 @@ TEST_F(RtpFrames, WithoutASocketOrForAnUnknownCodecNothingIsRead) {
 TEST_F(RtpFrames, WithoutAPacketBufferThereIsNoFrameAndWithACapacityBelow4Nothing) {
   frame_.capacity = 3;
   EXPECT_EQ(read(), LIBD_FAILED);
+  frame_.capacity = 4;
+  EXPECT_EQ(read(), LIBD_NO_FRAME);
   driver_.ReleaseRtpPacketsPtr();
   EXPECT_EQ(read(), LIBD_NO_FRAME);
 }
