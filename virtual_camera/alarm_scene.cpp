@@ -13,9 +13,10 @@ void AlarmScene::rearrange(AlarmLayout layout) {
   contacts_.assign(layout_.inputs < 0 ? 0 : static_cast<std::size_t>(layout_.inputs), 0);
 }
 
-void AlarmScene::listen(Listener listener) {
+std::string AlarmScene::listen(Listener listener) {
   const std::lock_guard<std::mutex> lock(mutex_);
   listener_ = std::move(listener);
+  return part_locked();
 }
 
 template <typename Value>
@@ -65,11 +66,6 @@ bool AlarmScene::lens_covered() const {
 std::string AlarmScene::detection() const {
   const std::lock_guard<std::mutex> lock(mutex_);
   return layout_.detection;
-}
-
-std::string AlarmScene::alarm_part() const {
-  const std::lock_guard<std::mutex> lock(mutex_);
-  return part_locked();
 }
 
 std::string AlarmScene::metadata_part() const {

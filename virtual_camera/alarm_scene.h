@@ -41,7 +41,8 @@ class AlarmScene {
   // Other sensors and detectors, all at rest; before anybody listens.
   void rearrange(AlarmLayout layout);
   // Called with the part of every change, on the thread that makes it. Empty: nobody listens.
-  void listen(Listener listener);
+  // Returns the part of what holds now, before the first of them.
+  std::string listen(Listener listener);
 
   // False for a contact or window that the camera does not have.
   bool happen(const AlarmEvent& event);
@@ -53,7 +54,6 @@ class AlarmScene {
   // The kind of detection that the layout names.
   [[nodiscard]] std::string detection() const;
 
-  [[nodiscard]] std::string alarm_part() const;
   [[nodiscard]] std::string metadata_part() const;
   // State by contact, 1 for a closed one.
   [[nodiscard]] std::vector<int> contacts() const;

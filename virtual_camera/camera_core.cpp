@@ -2,6 +2,7 @@
 
 #include <fmt/format.h>
 
+#include <mutex>
 #include <utility>
 
 #include "virtual_camera/http_connection.h"
@@ -28,6 +29,23 @@ std::string bind_failure(const std::string& address, std::uint16_t port, const a
 }
 
 }  // namespace
+
+// Parts of the alarm-data stream on their way to the loop's thread.
+class CameraCore::AlarmNews {
+ public:
+  void add(const std::string& part) {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    parts_.push_back(part);
+  }
+  [[nodiscard]] std::deque<std::string> take() {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    return std::exchange(parts_, {});
+  }
+
+ private:
+  std::mutex mutex_;
+  std::deque<std::string> parts_;
+};
 
 CameraCore::CameraCore(std::shared_ptr<CameraState> state)
     : state_(std::move(state)),
@@ -94,17 +112,26 @@ void CameraCore::take_calls() {
   };
 }
 
-// Changes may come from any thread; the connections live on the loop's.
+// Changes may come from any thread; the connections live on the loop's. They wait in a queue of their own, because what
+// the loop's thread posts and what others post overtake each other.
 void CameraCore::spread_alarms() {
-  state_->alarms.listen([weak = weak_from_this(), &context = state_->context](const std::string& part) {
-    asio::post(context, [weak, part] {
-      const std::shared_ptr<CameraCore> core = weak.lock();
-      if (!core) return;
-      for (const std::weak_ptr<Connection>& connection : core->state_->connections) {
-        if (const std::shared_ptr<Connection> open = connection.lock()) open->take_alarm(part);
-      }
-    });
-  });
+  const auto news = std::make_shared<AlarmNews>();
+  state_->alarm_part =
+      state_->alarms.listen([weak = weak_from_this(), news, &context = state_->context](const std::string& part) {
+        news->add(part);
+        asio::post(context, [weak, news] {
+          if (const std::shared_ptr<CameraCore> core = weak.lock()) core->tell(news->take());
+        });
+      });
+}
+
+void CameraCore::tell(const std::deque<std::string>& parts) {
+  for (const std::string& part : parts) {
+    state_->alarm_part = part;
+    for (const std::weak_ptr<Connection>& connection : state_->connections) {
+      if (const std::shared_ptr<Connection> open = connection.lock()) open->take_alarm(part);
+    }
+  }
 }
 
 void CameraCore::vanish() {

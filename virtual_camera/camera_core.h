@@ -5,6 +5,7 @@
 #include <asio.hpp>
 #include <chrono>
 #include <cstdint>
+#include <deque>
 #include <memory>
 #include <string>
 
@@ -32,6 +33,8 @@ class CameraCore : public std::enable_shared_from_this<CameraCore> {
   [[nodiscard]] std::uint16_t control_port() const { return control_->port(); }
 
  private:
+  class AlarmNews;
+
   [[nodiscard]] std::string prepare();
   [[nodiscard]] std::string open_ports();
   void vanish();
@@ -39,6 +42,7 @@ class CameraCore : public std::enable_shared_from_this<CameraCore> {
   void come_back();
   void spread_alarms();
   void take_calls();
+  void tell(const std::deque<std::string>& parts);
 
   std::shared_ptr<CameraState> state_;
   std::shared_ptr<Listener> http_;

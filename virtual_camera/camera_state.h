@@ -58,6 +58,7 @@ struct CameraState {
   std::string profile_error;  // empty: none
   asio::io_context& context;
   AlarmScene alarms;
+  std::string alarm_part;  // the newest that streams were told
   SceneStage stage;
   Card card;
   PoseSource pose;  // empty: the camera does not know where it looks

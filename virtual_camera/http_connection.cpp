@@ -107,8 +107,7 @@ void HttpConnection::stream_feed() {
     return send_part(std::move(part));
   }
   if (std::exchange(part_due_, false)) {
-    const AlarmScene& alarms = state().alarms;
-    return send_part(feed_ == Feed::kAlarms ? alarms.alarm_part() : alarms.metadata_part());
+    return send_part(feed_ == Feed::kAlarms ? state().alarm_part : state().alarms.metadata_part());
   }
   next_part_.expires_after(interval_);
   next_part_.async_wait([self = shared_from_this(), this](asio::error_code stopped) {
