@@ -19,7 +19,7 @@
 namespace vexa::camera {
 namespace {
 
-constexpr auto kPatience = std::chrono::seconds(20);
+constexpr auto kLongestWait = std::chrono::seconds(20);
 
 /// One grey from edge to edge, another one each time.
 void paint_grey(std::chrono::steady_clock::time_point, I420Picture& picture) {
@@ -34,7 +34,7 @@ SourcePicture next_picture(PictureSource& source) {
     if (auto picture = source.next()) return *picture;
     const auto came = std::make_shared<std::promise<void>>();
     source.wait([came] { came->set_value(); });
-    if (came->get_future().wait_for(kPatience) != std::future_status::ready) throw std::runtime_error("no picture");
+    if (came->get_future().wait_for(kLongestWait) != std::future_status::ready) throw std::runtime_error("no picture");
   }
 }
 
