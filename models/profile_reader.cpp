@@ -1,6 +1,8 @@
 #include "models/profile_reader.h"
 
 #include <algorithm>
+#include <cstdint>
+#include <limits>
 #include <string_view>
 
 #include "models/reading.h"
@@ -109,9 +111,23 @@ void read_image(const Part& image, Profile& profile, Complaints& complaints) {
   }
 }
 
-void read_pan_tilt(const Part& ptz, SLibDFixedPanTiltInfo& info) {
+// Positions are angles by the span, and travel in 16 bits with a sign; the origin is the one end, half a span from the
+// other.
+void demand_range(const Part& axis, Complaints& complaints) {
+  constexpr std::int32_t kLeast = std::numeric_limits<std::int16_t>::min();
+  constexpr std::int32_t kMost = std::numeric_limits<std::int16_t>::max();
+  const std::int32_t origin = axis["origin"].number();
+  const std::int32_t end = origin + axis["span"].number() / 2;
+  complaints.demand(!axis || axis["span"].number() != 0, axis["span"], "must not be 0: positions are angles by it");
+  complaints.demand(std::min(origin, end) >= kLeast && std::max(origin, end) <= kMost, axis["origin"],
+                    "must keep both ends within -32768 to 32767");
+}
+
+void read_pan_tilt(const Part& ptz, SLibDFixedPanTiltInfo& info, Complaints& complaints) {
   const Part pan = ptz["pan"];
   const Part tilt = ptz["tilt"];
+  demand_range(pan, complaints);
+  demand_range(tilt, complaints);
   info.panMaxSpeed = pan["maxSpeed"].number();
   info.panSpan = pan["span"].number();
   info.panAngleRange = pan["angleRange"].number();
@@ -136,21 +152,27 @@ void read_lens(const Part& part, Lens& lens, Complaints& complaints) {
   complaints.demand(lens.minPosition <= lens.maxPosition, part["maxPosition"], "must not be below minPosition");
 }
 
+void read_zoom_ratios(const Part& list, std::vector<SLibDZoomRatioInt>& ratios, Complaints& complaints) {
+  for (const Part& part : list.items()) {
+    SLibDZoomRatioInt step;
+    step.ratio = part["ratio"].number();
+    step.position = part["position"].number();
+    const bool first = ratios.empty();
+    complaints.demand(first || ratios.back().position < step.position, part["position"],
+                      "must be above the one before it");
+    complaints.demand(first || ratios.back().ratio <= step.ratio, part["ratio"], "must not be below the one before it");
+    ratios.push_back(step);
+  }
+}
+
 void read_ptz(const Part& ptz, Profile& profile, Complaints& complaints) {
   SLibDFixedPTZControlInfo& control = profile.control;
   profile.continuousPtz = ptz["dialect"].text() == "continuous";
   control.noMoveSpeed = ptz["noMoveSpeed"].flag();
-  read_pan_tilt(ptz, control.panTilt);
+  read_pan_tilt(ptz, control.panTilt, complaints);
   read_lens(ptz["zoom"], control.zoom, complaints);
   read_lens(ptz["focus"], control.focus, complaints);
-  for (const Part& part : ptz["zoom"]["ratios"].items()) {
-    SLibDZoomRatioInt step;
-    step.ratio = part["ratio"].number();
-    step.position = part["position"].number();
-    const bool ascends = profile.zoomRatios.empty() || profile.zoomRatios.back().position < step.position;
-    complaints.demand(ascends, part["position"], "must be above the one before it");
-    profile.zoomRatios.push_back(step);
-  }
+  read_zoom_ratios(ptz["zoom"]["ratios"], profile.zoomRatios, complaints);
   control.zoomSteps = profile.zoomRatios;
   control.presetCount = ptz["presets"].number();
   control.tourCount = ptz["tours"].number();

@@ -70,8 +70,9 @@ std::string CameraCore::open_ports() {
 std::string CameraCore::prepare() {
   if (!state_->profile_error.empty()) return state_->profile_error;
   CameraOptions& options = state_->options;
-  const bool rates_stand = options.frames_per_second > 0 && options.speed > 0 && options.clock_rate > 0;
-  if (!rates_stand) return "frames per second, speed and clock rate must be above 0";
+  const bool rates_stand =
+      options.frames_per_second > 0 && options.speed > 0 && options.ptz_speed > 0 && options.clock_rate > 0;
+  if (!rates_stand) return "frames per second, speed, PTZ speed and clock rate must be above 0";
   if (options.max_payload < 3 || options.burst_packets == 0) return "too small a packet or burst";
   if (!options.images && !options.image_path.empty()) {
     options.images = ImageClip::load(options.image_path);

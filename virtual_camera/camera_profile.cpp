@@ -10,6 +10,7 @@
 
 #include "virtual_camera/lined_json.h"
 #include "virtual_camera/profile_place.h"
+#include "virtual_camera/profile_ptz.h"
 #include "virtual_camera/profile_video.h"
 
 namespace vexa::camera {
@@ -17,8 +18,6 @@ namespace {
 
 constexpr std::size_t kLargestFile = 1 << 20;
 constexpr std::size_t kMostSteps = 64;
-constexpr int kMostUnits = 65536;  // of a position of pan and tilt
-constexpr int kMostLensUnits = 65535;
 
 std::string exposure_word(const ProfilePlace& place) {
   const std::string name = place.one_of({"Full auto", "Shutter Priority", "Iris Priority"});
@@ -74,56 +73,6 @@ void read_image(const ProfilePlace& image, std::string_view driver, CameraProfil
   read_exposure(image.optional("exposure"), driver, profile);
 }
 
-// Pan or tilt. The virtual camera moves by its own units, so the numbers are looked at and left.
-void check_axis(const ProfilePlace& axis) {
-  (void)axis.required("maxSpeed").number(1, 10000);
-  (void)axis.required("span").number(-kMostUnits, kMostUnits);
-  (void)axis.required("origin").number(-kMostUnits, kMostUnits);
-  for (const char* angle : {"angleRange", "wideAngle"}) (void)axis.required(angle).number(1, 36000);
-}
-
-void check_lens(const ProfilePlace& lens) {
-  const int slowest = lens.required("minSpeed").number(1, 10000);
-  const ProfilePlace fastest = lens.required("maxSpeed");
-  if (fastest.number(1, 10000) < slowest) fastest.refuse("must not be below minSpeed");
-  const int nearest = lens.required("minPosition").number(0, kMostLensUnits);
-  const ProfilePlace farthest = lens.required("maxPosition");
-  if (farthest.number(0, kMostLensUnits) < nearest) farthest.refuse("must not be below minPosition");
-}
-
-void check_zoom(const ProfilePlace& zoom) {
-  zoom.with_only({"minSpeed", "maxSpeed", "minPosition", "maxPosition", "ratios"});
-  check_lens(zoom);
-  int last = -1;
-  for (const ProfilePlace& point : zoom.required("ratios").items(64)) {
-    point.with_only({"ratio", "position"});
-    (void)point.required("ratio").number(1, 1000);
-    const ProfilePlace place = point.required("position");
-    const int position = place.number(0, kMostLensUnits);
-    if (position <= last) place.refuse("must be above the one before it");
-    last = position;
-  }
-}
-
-void read_ptz(const ProfilePlace& ptz, CameraProfile& profile) {
-  if (!ptz) return;
-  ptz.with_only({"dialect", "noMoveSpeed", "pan", "tilt", "zoom", "focus", "presets", "tours", "shadowTours"});
-  profile.ptz = true;
-  profile.continuous_ptz = ptz.required("dialect").one_of({"continuous", "move"}) == "continuous";
-  (void)ptz.optional("noMoveSpeed").flag();
-  check_axis(ptz.required("pan").with_only({"maxSpeed", "span", "angleRange", "origin", "wideAngle"}));
-  const ProfilePlace tilt = ptz.required("tilt");
-  check_axis(tilt.with_only({"maxSpeed", "span", "angleRange", "origin", "wideAngle", "offset"}));
-  (void)tilt.required("offset").number(-kMostUnits, kMostUnits);
-  check_zoom(ptz.required("zoom"));
-  if (const ProfilePlace focus = ptz.optional("focus")) {
-    check_lens(focus.with_only({"minSpeed", "maxSpeed", "minPosition", "maxPosition"}));
-    profile.focus = true;
-  }
-  profile.presets = ptz.optional("presets").number(0, 256);
-  for (const char* tours : {"tours", "shadowTours"}) (void)ptz.optional(tours).number(0, 5);
-}
-
 void read_audio(const ProfilePlace& audio, CameraProfile& profile) {
   if (!audio) return;
   audio.with_only({"inputs", "outputs"});
@@ -152,7 +101,7 @@ void check_types(const ProfilePlace& types, const CameraProfile& profile) {
     const char* word;
     bool holds;
     const char* where;
-  } all[] = {{"ptz", profile.ptz, "the profile has a part \"ptz\""},
+  } all[] = {{"ptz", profile.ptz.has_value(), "the profile has a part \"ptz\""},
              {"audio", !profile.audio_inputs.empty(), "the profile has a part \"audio\""},
              {"edge-storage", profile.edge_storage, "\"edgeStorage\" is true"},
              {"analog-output", !profile.outputs.empty(), "\"video\" has \"outputs\""},
@@ -175,7 +124,7 @@ CameraProfile read_camera(const ProfilePlace& root) {
   profile.manual_iris_lens = driver == "marlin";
   read_video_part(root.required("video"), driver, profile);
   read_image(root.optional("image"), driver, profile);
-  read_ptz(root.optional("ptz"), profile);
+  profile.ptz = ptz_part(root.optional("ptz"));
   read_audio(root.optional("audio"), profile);
   read_io(root.optional("io"), profile);
   profile.edge_storage = root.optional("edgeStorage").flag();

@@ -2,6 +2,7 @@
 #ifndef VIRTUAL_CAMERA_CAMERA_PROFILE_H_
 #define VIRTUAL_CAMERA_CAMERA_PROFILE_H_
 
+#include <algorithm>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -39,6 +40,55 @@ struct StreamDefaults {
   int bit_rate = 0;  // 0 for JPEG
 };
 
+// How long an axis takes, in milliseconds.
+struct AxisTimes {
+  int travel = 0;  // from end to end at the greatest speed
+  int ramp = 0;    // from rest to the greatest speed
+};
+
+// Pan or tilt, in the camera's units.
+struct TurnProfile {
+  int max_speed = 1;
+  int span = 2;  // twice the way from the origin to the other end
+  int angle_range = 1;  // degrees of the span
+  int origin = 0;
+  int wide_angle = 1;  // degrees that the picture spans at the wide end
+  int offset = 0;      // position of the horizon
+  AxisTimes times;
+
+  [[nodiscard]] int end() const { return origin + span / 2; }
+  [[nodiscard]] double degrees_of_unit() const { return static_cast<double>(angle_range) / span; }
+};
+
+// Zoom or focus, in the camera's units.
+struct LensProfile {
+  int min_speed = 1;
+  int max_speed = 1;
+  int min_position = 0;
+  int max_position = 0;
+  AxisTimes times;
+};
+
+struct ZoomPoint {
+  int ratio = 1;
+  int position = 0;
+};
+
+struct PtzProfile {
+  TurnProfile pan;
+  TurnProfile tilt;
+  LensProfile zoom;
+  std::vector<ZoomPoint> ratios;  // ascending by position, not descending by ratio
+  std::optional<LensProfile> focus;
+  bool continuous = false;  // takes signed speeds
+  int presets = 0;
+  int tours = 0;
+  int shadow_tours = 0;
+
+  // The greatest speed that moves of pan and tilt together take.
+  [[nodiscard]] int shared_speed() const { return std::min(pan.max_speed, tilt.max_speed); }
+};
+
 // Lists begin with what the camera leaves the factory with; an empty list says that it lacks the setting.
 struct CameraProfile {
   std::string model;
@@ -62,10 +112,7 @@ struct CameraProfile {
   std::vector<int> shutter_steps;
   std::vector<int> iris_steps;
 
-  bool ptz = false;
-  bool continuous_ptz = false;
-  bool focus = false;
-  int presets = 0;
+  std::optional<PtzProfile> ptz;
   std::vector<std::string> audio_inputs;
   bool io = false;
   int alarm_inputs = 0;

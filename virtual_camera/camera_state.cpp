@@ -4,6 +4,7 @@
 
 #include "virtual_camera/camera_profile.h"
 #include "virtual_camera/setting_rules.h"
+#include "virtual_camera/stream_plan.h"
 
 namespace vexa::camera {
 
@@ -20,6 +21,23 @@ void CameraState::take_profile() {
   settings.obey(options.profile);
   const CameraProfile& model = options.profile->profile();
   alarms.rearrange({model.alarm_inputs, model.video_detection, model.tampering_detection, model.audio_detection});
+  if (!model.ptz) return;
+  ptz = std::make_unique<PtzHead>(*model.ptz, std::chrono::steady_clock::now(), options.speed * options.ptz_speed);
+  pose = [this](PtzHead::Time now) { return ptz->pose(ptz_picture().turned, now); };
+}
+
+PtzPicture CameraState::ptz_picture() const {
+  PtzPicture picture;
+  if (const auto stream = stream_settings(settings, 1)) picture.size = {stream->width, stream->height};
+  picture.turned = settings.get("camera", "Eflip") == "on";
+  return picture;
+}
+
+void CameraState::report_presets() {
+  settings.erase("presetposition", "PresetName");
+  for (const auto& [key, value] : ptz->preset_settings(std::chrono::steady_clock::now())) {
+    settings.set("presetposition", key, value);
+  }
 }
 
 void CameraState::report_contacts() {

@@ -18,6 +18,7 @@
 #include "virtual_camera/event_loop.h"
 #include "virtual_camera/journal.h"
 #include "virtual_camera/options.h"
+#include "virtual_camera/ptz_head.h"
 #include "virtual_camera/request_faults.h"
 #include "virtual_camera/scene_stage.h"
 #include "virtual_camera/sent_log.h"
@@ -51,6 +52,10 @@ struct CameraState {
   void report_contacts();
   // Puts the card's free space into the settings likewise.
   void report_card();
+  // Puts presets and tours into the settings, likewise.
+  void report_presets();
+  // The picture by which hosts point.
+  [[nodiscard]] PtzPicture ptz_picture() const;
   // The detectors are as the settings say, from now on.
   void switch_detectors();
 
@@ -61,7 +66,8 @@ struct CameraState {
   std::string alarm_part;  // the newest that streams were told
   SceneStage stage;
   Card card;
-  PoseSource pose;  // empty: the camera does not know where it looks
+  std::unique_ptr<PtzHead> ptz;  // null: nothing moves, or nothing is known of the model
+  PoseSource pose;               // empty: the camera does not know where it looks
   SettingsStore settings;
   Journal journal;
   SentLog sent;

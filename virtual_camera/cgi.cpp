@@ -29,6 +29,8 @@ Answer http_answer(std::string_view status, std::string_view body) {
   return answer;
 }
 
+Answer no_content() { return {204, "HTTP/1.0 204 No Content\r\n\r\n"}; }
+
 Answer answer_command(const RequestHead& request, SettingsStore& settings) {
   if (!request.version.starts_with("HTTP/")) return http_answer("400 Bad Request", "");
   if (request.method != "GET") return http_answer("501 Not Implemented", "");
@@ -40,7 +42,7 @@ Answer answer_command(const RequestHead& request, SettingsStore& settings) {
   if (name == "inquiry") return answer_inquiry(request.query, settings);
   if (request.query.find('=') == std::string::npos) return http_answer("400 Bad Request", "");
   if (!settings.apply(name, request.query)) return http_answer("400 Bad Request", "");
-  return {204, "HTTP/1.0 204 No Content\r\n\r\n"};
+  return no_content();
 }
 
 }  // namespace vexa::camera

@@ -18,6 +18,9 @@ struct Answer {
 // `status` as in "404 Not Found".
 [[nodiscard]] Answer http_answer(std::string_view status, std::string_view body);
 
+// A command taken.
+[[nodiscard]] Answer no_content();
+
 // "/command/inquiry.cgi?inq=NAME" reads a section, "/command/NAME.cgi?KEY=VALUE&..." changes one; 400 for what
 // the camera does not take.
 [[nodiscard]] Answer answer_command(const RequestHead& request, SettingsStore& settings);

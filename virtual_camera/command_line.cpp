@@ -87,6 +87,9 @@ void add_stream(CLI::App& app, CameraOptions& camera) {
   app.add_option("--speed", camera.speed, "pace: 4 sends four times faster")
       ->check(CLI::PositiveNumber)
       ->capture_default_str();
+  app.add_option("--ptz-speed", camera.ptz_speed, "pace of pan, tilt, zoom and tours, on top of --speed")
+      ->check(CLI::PositiveNumber)
+      ->capture_default_str();
   app.add_option("--max-payload", camera.max_payload, "RTP payload bytes of a packet")
       ->check(CLI::Range(3, 65000))
       ->capture_default_str();

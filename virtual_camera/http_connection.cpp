@@ -76,12 +76,26 @@ Answer HttpConnection::command(const RequestHead& head) {
   if (state().settings.answer("a-slot")) {
     if (std::optional<Answer> answer = answer_card(head, state().card)) return *std::move(answer);
   }
+  if (head.query == "inq=presetposition" && state().ptz) state().report_presets();
+  if (const std::optional<bool> moved = state().ptz ? move(head) : std::nullopt) {
+    return *moved ? no_content() : http_answer("400 Bad Request", "");
+  }
   Answer answer = answer_command(head, state().settings);
   if (answer.status != 204) return answer;
   if (state().settings_changed) state().settings_changed();
   state().switch_detectors();
   if (head.path == "/command/system.cgi" && head.query == "TamperingStatusClear=on") state().alarms.clear_tampering();
   return answer;
+}
+
+// Whether the head obeys; nothing for a request that is not for it.
+std::optional<bool> HttpConnection::move(const RequestHead& head) {
+  const bool moves = head.path == "/command/ptzf.cgi";
+  if (head.method != "GET" || (!moves && head.path != "/command/presetposition.cgi")) return std::nullopt;
+  PtzHead& ptz = *state().ptz;
+  const PtzHead::Pairs commands = query_pairs(head.query);
+  if (moves) return ptz.move(commands, state().ptz_picture(), StreamClock::now());
+  return ptz.command_presets(commands, StreamClock::now());
 }
 
 // Nothing for a path that names no feed, or one that the model lacks.

@@ -40,6 +40,7 @@ class HttpConnection : public Connection {
 
   std::optional<Answer> open_feed(const RequestHead& head);
   Answer command(const RequestHead& head);
+  std::optional<bool> move(const RequestHead& head);
   void stream_feed();
   void send_part(std::string part);
 

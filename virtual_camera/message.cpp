@@ -88,4 +88,17 @@ std::optional<RequestHead> parse_head(std::string_view head) {
   return parsed;
 }
 
+std::vector<std::pair<std::string, std::string>> query_pairs(std::string_view query) {
+  std::vector<std::pair<std::string, std::string>> pairs;
+  while (!query.empty()) {
+    const std::size_t end = std::min(query.find('&'), query.size());
+    const std::string_view pair = query.substr(0, end);
+    query.remove_prefix(std::min(end + 1, query.size()));
+    const std::size_t equals = pair.find('=');
+    if (equals == std::string_view::npos || equals == 0) continue;
+    pairs.emplace_back(pair.substr(0, equals), pair.substr(equals + 1));
+  }
+  return pairs;
+}
+
 }  // namespace vexa::camera

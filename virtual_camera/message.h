@@ -30,6 +30,9 @@ struct RequestHead {
 // Nothing when the text is no request head.
 [[nodiscard]] std::optional<RequestHead> parse_head(std::string_view head);
 
+// "K=V&K=V" as pairs, undecoded; what has no key or no "=" is left out.
+[[nodiscard]] std::vector<std::pair<std::string, std::string>> query_pairs(std::string_view query);
+
 }  // namespace vexa::camera
 
 #endif  // VIRTUAL_CAMERA_MESSAGE_H_

@@ -66,6 +66,7 @@ struct CameraOptions {
 
   double frames_per_second = 25;
   double speed = 1;  // pace: 4 sends four times faster, with timestamps advancing by picture as at 1
+  double ptz_speed = 1;  // pace of pan, tilt, zoom, focus and tours, on top of the pace of all
   std::uint32_t clock_rate = 90000;
   std::uint16_t start_sequence = 1;
   std::uint32_t start_timestamp = 100000000;

@@ -154,7 +154,7 @@ void SettingRules::add_image() {
         {.words = {}, .least = 0, .most = profile_.infrared_strength});
   }
   add_switch(camera_, "BLComp", profile_.back_light);
-  if (profile_.focus) add_choice(camera_, "FocusMode", {"auto", "manual"});
+  if (profile_.ptz && profile_.ptz->focus) add_choice(camera_, "FocusMode", {"auto", "manual"});
   add_choice(camera_, "AudInCodec", profile_.audio_inputs);
   add_switch(camera_, "AudioIn", !profile_.audio_inputs.empty());
 }
@@ -176,7 +176,7 @@ void SettingRules::add_system() {
   add(system_, "ModelName", profile_.model, {});
   add(system_, "SoftVersion", "1.02.00", {});
   add(system_, "Serial", "100001", {});
-  if (profile_.ptz) add(system_, "ContinuousPanTiltZoomFunc", profile_.continuous_ptz ? "1" : "0", {});
+  if (profile_.ptz) add(system_, "ContinuousPanTiltZoomFunc", profile_.ptz->continuous ? "1" : "0", {});
   add(system_, "ChannelId", "1", {.words = {}, .least = 0, .most = 255});
   add_choice(system_, "VideoOutMode", profile_.outputs);
   add_switch(system_, "TamperingFunc", profile_.tampering_detection);
@@ -198,8 +198,8 @@ void SettingRules::find_lacking() {
   const struct {
     const char* section;
     bool present;
-  } sections[] = {{"ptzf", profile_.ptz},
-                  {"presetposition", profile_.presets > 0},
+  } sections[] = {{"ptzf", profile_.ptz.has_value()},
+                  {"presetposition", profile_.ptz && profile_.ptz->presets > 0},
                   {"sensor", profile_.io},
                   {"main", profile_.alarm_outputs > 0},
                   {"lod", profile_.video_detection == "lod"},
@@ -219,7 +219,7 @@ std::map<std::string, SettingRules::Pairs> SettingRules::factory() const {
 
 bool SettingRules::allow(std::string_view section, std::string_view key, std::string_view value) const {
   if (std::find(lacking_.begin(), lacking_.end(), section) != lacking_.end()) return false;
-  if (section == "ptzf") return profile_.continuous_ptz || key != "ContinuousPanTiltZoom";
+  if (section == "ptzf") return profile_.ptz->continuous || key != "ContinuousPanTiltZoom";
   const auto bound = bound_.find(section);
   if (bound == bound_.end()) return true;
   const auto found = bound->second.values.find(key);

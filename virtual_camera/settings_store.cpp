@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "virtual_camera/message.h"
 #include "virtual_camera/setting_rules.h"
 
 namespace vexa::camera {
@@ -125,15 +126,7 @@ std::optional<std::string> SettingsStore::answer(std::string_view section) const
 }
 
 bool SettingsStore::apply(std::string_view section, std::string_view query) {
-  SettingRules::Pairs changes;
-  while (!query.empty()) {
-    const std::size_t end = std::min(query.find('&'), query.size());
-    const std::string_view pair = query.substr(0, end);
-    query.remove_prefix(std::min(end + 1, query.size()));
-    const std::size_t equals = pair.find('=');
-    if (equals == std::string_view::npos || equals == 0) continue;
-    changes.emplace_back(pair.substr(0, equals), pair.substr(equals + 1));
-  }
+  const SettingRules::Pairs changes = query_pairs(query);
   const std::lock_guard<std::mutex> lock(mutex_);
   if (rules_) {
     const Section* present = find_locked(section);

@@ -55,6 +55,13 @@ AlarmScene& VirtualCamera::alarms() { return core_->state()->alarms; }
 
 Card& VirtualCamera::card() { return core_->state()->card; }
 
+std::optional<CameraPose> VirtualCamera::pose() const {
+  const PoseSource& source = core_->state()->pose;
+  return source ? std::optional<CameraPose>(source(std::chrono::steady_clock::now())) : std::nullopt;
+}
+
+PtzHead* VirtualCamera::ptz() { return core_->state()->ptz.get(); }
+
 Journal& VirtualCamera::journal() { return core_->state()->journal; }
 
 SentLog& VirtualCamera::sent() { return core_->state()->sent; }

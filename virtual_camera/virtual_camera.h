@@ -7,12 +7,15 @@
 #include <cstddef>
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 
 #include "virtual_camera/alarm_scene.h"
 #include "virtual_camera/card.h"
+#include "virtual_camera/camera_pose.h"
 #include "virtual_camera/journal.h"
 #include "virtual_camera/options.h"
+#include "virtual_camera/ptz_head.h"
 #include "virtual_camera/sent_log.h"
 #include "virtual_camera/settings_store.h"
 
@@ -50,6 +53,9 @@ class VirtualCamera {
   [[nodiscard]] SettingsStore& settings();
   [[nodiscard]] AlarmScene& alarms();
   [[nodiscard]] Card& card();
+  // Where it looks now; nothing for a camera that does not know.
+  [[nodiscard]] std::optional<CameraPose> pose() const;
+  [[nodiscard]] PtzHead* ptz();  // null: nothing moves
   [[nodiscard]] Journal& journal();
   [[nodiscard]] SentLog& sent();
   [[nodiscard]] const PacketisedClip* clip() const;  // the clip streamed; valid after start(), null when none

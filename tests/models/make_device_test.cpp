@@ -119,7 +119,7 @@ TEST(MakeDevice, FillsTheRecordsOfPtzAudioAndIo) {
   const auto device = device_of("LMX-P200");
   EXPECT_EQ(ModelFlags::zoom(*device).size(), 7U);
   EXPECT_EQ(ModelFlags::control_record(*device).brightModes.size(), 3U);
-  EXPECT_EQ(ModelFlags::control_record(*device).panTilt.panSpan, 57600);
+  EXPECT_EQ(ModelFlags::control_record(*device).panTilt.panSpan, 115200);
   EXPECT_EQ(ModelFlags::audio(*device).inputCodecs.size(), 2U);
   EXPECT_EQ(ModelFlags::io_record(*device).inputCount, 4);
 }

@@ -120,8 +120,8 @@ TEST(ShippedProfiles, FillTheControlRecord) {
   EXPECT_TRUE(profile.hasControl);
   EXPECT_FALSE(control.noMoveSpeed);
   EXPECT_EQ(control.panTilt.panMaxSpeed, 24);
-  EXPECT_EQ(control.panTilt.panSpan, 57600);
-  EXPECT_EQ(control.panTilt.panAngleRange, 360);
+  EXPECT_EQ(control.panTilt.panSpan, 115200);
+  EXPECT_EQ(control.panTilt.panAngleRange, 720);
   EXPECT_EQ(control.panTilt.panOrigin, -28800);
   EXPECT_EQ(control.panTilt.horizontalWideAngle, 58);
   EXPECT_EQ(control.panTilt.tiltMaxSpeed, 24);
