@@ -49,7 +49,7 @@ struct AxisTimes {
 // Pan or tilt, in the camera's units.
 struct TurnProfile {
   int max_speed = 1;
-  int span = 2;  // twice the way from the origin to the other end
+  int span = 2;         // twice the way from the origin to the other end
   int angle_range = 1;  // degrees of the span
   int origin = 0;
   int wide_angle = 1;  // degrees that the picture spans at the wide end

@@ -153,7 +153,8 @@ PresetSection::Pairs PresetSection::answer() const {
     const auto key = [letter = kTourLetters[i]](const char* name) { return fmt::format("STour{}{}", letter, name); };
     pairs.emplace_back(key(""), on_or_off(tour.on));
     pairs.emplace_back(key("Period"), "always");
-    if (tour.length > 0) pairs.emplace_back(key("RecordedTime"), fmt::format("{}", std::lround(std::ceil(tour.length))));
+    if (tour.length > 0)
+      pairs.emplace_back(key("RecordedTime"), fmt::format("{}", std::lround(std::ceil(tour.length))));
   }
   return pairs;
 }

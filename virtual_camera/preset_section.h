@@ -14,7 +14,7 @@
 
 namespace vexa::camera {
 
-constexpr int kLongestRecording = 60;           // seconds of a shadow tour
+constexpr int kLongestRecording = 60;            // seconds of a shadow tour
 constexpr std::size_t kLongestPresetName = 128;  // bytes
 
 struct Preset {

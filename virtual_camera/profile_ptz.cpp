@@ -75,8 +75,8 @@ void read_lenses(const ProfilePlace& ptz, PtzProfile& profile) {
       {"minSpeed", "maxSpeed", "minPosition", "maxPosition", "ratios", "travelTime", "rampTime"});
   profile.zoom = lens_of(zoom, kZoomTimes);
   profile.ratios = curve_of(zoom.required("ratios"));
-  const ProfilePlace focus = ptz.optional("focus").with_only(
-      {"minSpeed", "maxSpeed", "minPosition", "maxPosition", "travelTime", "rampTime"});
+  const ProfilePlace focus =
+      ptz.optional("focus").with_only({"minSpeed", "maxSpeed", "minPosition", "maxPosition", "travelTime", "rampTime"});
   if (focus) profile.focus = lens_of(focus, kFocusTimes);
 }
 
@@ -88,8 +88,8 @@ std::optional<PtzProfile> ptz_part(const ProfilePlace& ptz) {
   PtzProfile profile;
   profile.continuous = ptz.required("dialect").one_of({"continuous", "move"}) == "continuous";
   (void)ptz.optional("noMoveSpeed").flag();
-  profile.pan = turn_of(ptz.required("pan").with_only({"maxSpeed", "span", "angleRange", "origin", "wideAngle",
-                                                       "travelTime", "rampTime"}),
+  profile.pan = turn_of(ptz.required("pan").with_only(
+                            {"maxSpeed", "span", "angleRange", "origin", "wideAngle", "travelTime", "rampTime"}),
                         kPanTimes);
   const ProfilePlace tilt = ptz.required("tilt").with_only(
       {"maxSpeed", "span", "angleRange", "origin", "wideAngle", "offset", "travelTime", "rampTime"});

@@ -11,8 +11,8 @@ namespace vexa::camera {
 class PtzAxis {
  public:
   struct Mechanics {
-    double least = 0;  // position of the one end
-    double most = 0;   // of the other
+    double least = 0;         // position of the one end
+    double most = 0;          // of the other
     double full_speed = 1;    // units a second, above 0
     double acceleration = 1;  // units a second squared, above 0
   };

@@ -73,8 +73,8 @@ Order move(std::string_view value, const PtzProfile& profile, const PtzPicture& 
     std::string_view word;
     int right;
     int up;
-  } kDirections[] = {{"up-left", -1, 1},   {"up", 0, 1},         {"up-right", 1, 1}, {"left", -1, 0},
-                     {"right", 1, 0},      {"down-left", -1, -1}, {"down", 0, -1},    {"down-right", 1, -1}};
+  } kDirections[] = {{"up-left", -1, 1}, {"up", 0, 1},          {"up-right", 1, 1}, {"left", -1, 0},
+                     {"right", 1, 0},    {"down-left", -1, -1}, {"down", 0, -1},    {"down-right", 1, -1}};
   const Words words = comma_pieces(value);
   for (const auto& direction : kDirections) {
     if (words[0] == direction.word) return turn(direction.right, direction.up, words, profile, picture.turned);

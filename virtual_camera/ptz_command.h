@@ -16,8 +16,8 @@ struct PtzPicture {
   bool turned = false;  // by 180 degrees
 };
 
-// What "KEY=VALUE" of "/command/ptzf.cgi" tells the motors; nothing for what the model lacks or for values out of range.
-// Directions and areas are those of the picture; positions stay the motors' when it is turned.
+// What "KEY=VALUE" of "/command/ptzf.cgi" tells the motors; nothing for what the model lacks or for values out of
+// range. Directions and areas are those of the picture; positions stay the motors' when it is turned.
 [[nodiscard]] std::optional<PtzOrder> ptz_order(std::string_view key, std::string_view value, const PtzProfile& profile,
                                                 const PtzPicture& picture);
 

@@ -1,5 +1,5 @@
-// A camera's moving head: its motors, presets and tours on one clock, and where it looks at any time. There is no timer:
-// what tours have done meanwhile is caught up with whenever somebody asks.
+// A camera's moving head: its motors, presets and tours on one clock, and where it looks at any time. There is no
+// timer: what tours have done meanwhile is caught up with whenever somebody asks.
 #ifndef VIRTUAL_CAMERA_PTZ_HEAD_H_
 #define VIRTUAL_CAMERA_PTZ_HEAD_H_
 

@@ -116,9 +116,8 @@ PtzOrder order_to(const PtzPlace& place, int speed, const PtzProfile& profile) {
 
 double magnification_at(const PtzProfile& profile, double position) {
   const std::vector<ZoomPoint>& curve = profile.ratios;
-  const auto above = std::find_if(curve.begin(), curve.end(), [position](const ZoomPoint& point) {
-    return position <= point.position;
-  });
+  const auto above = std::find_if(curve.begin(), curve.end(),
+                                  [position](const ZoomPoint& point) { return position <= point.position; });
   if (above == curve.end()) return curve.back().ratio;
   if (above == curve.begin()) return above->ratio;
   const ZoomPoint& below = *(above - 1);
@@ -127,9 +126,8 @@ double magnification_at(const PtzProfile& profile, double position) {
 
 double position_of_magnification(const PtzProfile& profile, double magnification) {
   const std::vector<ZoomPoint>& curve = profile.ratios;
-  const auto above = std::find_if(curve.begin(), curve.end(), [magnification](const ZoomPoint& point) {
-    return magnification <= point.ratio;
-  });
+  const auto above = std::find_if(curve.begin(), curve.end(),
+                                  [magnification](const ZoomPoint& point) { return magnification <= point.ratio; });
   if (above == curve.end()) return curve.back().position;
   if (above == curve.begin()) return above->position;
   const ZoomPoint& below = *(above - 1);

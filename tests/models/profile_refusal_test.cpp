@@ -3,6 +3,7 @@
 
 #include <initializer_list>
 #include <string>
+#include <utility>
 #include <variant>
 
 #include "tests/models/profile_text.h"
@@ -161,31 +162,55 @@ TEST(ProfileRefusal, NamesAWrongSizeAtBothEdges) {
   EXPECT_EQ(refusal_of(changed_profile("\"320x240\"", "\"9999x1\"")), "taken");
 }
 
-TEST(ProfileRefusal, ChecksTheLensAndItsCurve) {
+TEST(ProfileRefusal, ChecksTheMotorsAndTheZoomCurve) {
   const std::string ptz = R"("ptz": {"dialect": "move",
-    "pan": {"maxSpeed": 1, "span": 1, "angleRange": 1, "origin": 0, "wideAngle": 1},
-    "tilt": {"maxSpeed": 1, "span": 1, "angleRange": 1, "origin": 0, "wideAngle": 1, "offset": 0},
+    "pan": {"maxSpeed": 1, "span": PANSPAN, "angleRange": 1, "origin": 0, "wideAngle": 1, "travelTime": PANTIME},
+    "tilt": {"maxSpeed": 1, "span": TILTSPAN, "angleRange": 1, "origin": TILTORIGIN, "wideAngle": 1, "offset": 0},
     "zoom": {"minSpeed": 2, "maxSpeed": MAXSPEED, "minPosition": 5, "maxPosition": MAXPOSITION,
-      "ratios": [{"ratio": 1, "position": 0}, {"ratio": 2, "position": POSITION}]}}, "io")";
+      "ratios": [{"ratio": FIRSTRATIO, "position": 0}, {"ratio": SECONDRATIO, "position": SECONDPLACE}]}}, "io")";
   const struct {
-    const char* speed;
-    const char* position;
-    const char* ratio;
+    const char* from;
+    const char* to;
     const char* message;
-  } cases[] = {{"2", "5", "1", "taken"},
-               {"1", "5", "1", "p.json:21: ptz.zoom.maxSpeed: must not be below minSpeed"},
-               {"2", "4", "1", "p.json:21: ptz.zoom.maxPosition: must not be below minPosition"},
-               {"2", "5", "0", "p.json:22: ptz.zoom.ratios[1].position: must be above the one before it"}};
+  } cases[] = {
+      {"", "", "taken"},
+      {"MAXSPEED", "1", "p.json:21: ptz.zoom.maxSpeed: must not be below minSpeed"},
+      {"MAXPOSITION", "4", "p.json:21: ptz.zoom.maxPosition: must not be below minPosition"},
+      {"SECONDPLACE", "0", "p.json:22: ptz.zoom.ratios[1].position: must be above the one before it"},
+      {"SECONDRATIO", "0", "p.json:22: ptz.zoom.ratios[1].ratio: must be from 1 to 1000"},
+      {"FIRSTRATIO", "3", "p.json:22: ptz.zoom.ratios[1].ratio: must not be below the one before it"},
+      {"FIRSTRATIO", "2", "taken"},
+      {"PANSPAN", "0", "p.json:19: ptz.pan.span: must not be 0: positions are angles by it"},
+      {"TILTSPAN", "0", "p.json:20: ptz.tilt.span: must not be 0: positions are angles by it"},
+      {"PANSPAN", "131072", "p.json:19: ptz.pan.origin: must keep both ends within -32768 to 32767"},
+      {"PANSPAN", "131073", "p.json:19: ptz.pan.span: must be from -131072 to 131072"},
+      {"PANSPAN", "65534", "taken"},
+      {"PANSPAN", "65536", "p.json:19: ptz.pan.origin: must keep both ends within -32768 to 32767"},
+      {"PANSPAN", "-65536", "taken"},
+      {"TILTORIGIN", "-32769", "p.json:20: ptz.tilt.origin: must keep both ends within -32768 to 32767"},
+      {"TILTORIGIN", "-32768", "taken"},
+      {"PANTIME", "0", "p.json:19: ptz.pan.travelTime: must be from 1 to 600000"},
+  };
   for (const auto& c : cases) {
     std::string text = changed_profile("[\"fixed\"]", "[\"ptz\"]");
     const auto replace = [&text](const std::string& from, const std::string& to) {
-      text.replace(text.find(from), from.size(), to);
+      const std::size_t at = text.find(from);
+      if (at != std::string::npos) text.replace(at, from.size(), to);
     };
     replace("\"io\"", ptz);
-    replace("MAXSPEED", c.speed);
-    replace("MAXPOSITION", c.position);
-    replace("POSITION", c.ratio);
-    EXPECT_EQ(refusal_of(text), c.message);
+    if (*c.from != '\0') replace(c.from, c.to);
+    for (const auto& [name, usual] : {std::pair("MAXSPEED", "2"),
+                                      {"MAXPOSITION", "5"},
+                                      {"SECONDPLACE", "1"},
+                                      {"SECONDRATIO", "2"},
+                                      {"FIRSTRATIO", "1"},
+                                      {"PANSPAN", "1"},
+                                      {"TILTSPAN", "1"},
+                                      {"TILTORIGIN", "0"},
+                                      {"PANTIME", "1"}}) {
+      replace(name, usual);
+    }
+    EXPECT_EQ(refusal_of(text), c.message) << c.from << " " << c.to;
   }
 }
 
