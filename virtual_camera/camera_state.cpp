@@ -34,6 +34,7 @@ PtzPicture CameraState::ptz_picture() const {
 }
 
 void CameraState::report_presets() {
+  if (!settings.answer("presetposition")) return;
   settings.erase("presetposition", "PresetName");
   for (const auto& [key, value] : ptz->preset_settings(std::chrono::steady_clock::now())) {
     settings.set("presetposition", key, value);

@@ -10,6 +10,7 @@ namespace vexa::camera {
 namespace {
 
 constexpr std::size_t kMostOrders = 2048;  // of one recording; those beyond are obeyed alone
+constexpr double kEndOfTime = 1e12;        // seconds; doubles still tell milliseconds apart there
 constexpr double kBeforePlaying = 1;       // seconds that a shadow tour waits at its start
 
 std::string position_text(const PtzPlace& place, bool turned, bool moving) {
@@ -25,7 +26,7 @@ PtzHead::PtzHead(const PtzProfile& profile, Time start, double pace)
     : mechanism_(profile), section_(profile), start_(start), pace_(pace) {}
 
 double PtzHead::catch_up(Time now) {
-  latest_ = std::max(latest_, std::chrono::duration<double>(now - start_).count() * pace_);
+  latest_ = std::max(latest_, std::min(std::chrono::duration<double>(now - start_).count() * pace_, kEndOfTime));
   if (recording_ && latest_ >= recording_->began + kLongestRecording) {
     const double end = recording_->began + kLongestRecording;
     keep_recording(end);

@@ -207,15 +207,15 @@ TEST_F(PtzByCommand, PresetsAreStoredRecalledAndCleared) {
   start_model("LMX-P200");
   EXPECT_EQ(act("preset", {"set", "3", "Gate 1&2"}).exit_code, 0);
   EXPECT_EQ(last_order(), "presetposition.cgi?PresetSet=3,Gate%201%262,on");
-  EXPECT_EQ(act("preset", {"recall", "256"}).exit_code, 0);
-  EXPECT_EQ(last_order(), "presetposition.cgi?PresetCall=256,24");
+  EXPECT_EQ(act("preset", {"recall", "3"}).exit_code, 0);
+  EXPECT_EQ(last_order(), "presetposition.cgi?PresetCall=3,24");
   EXPECT_EQ(act("preset", {"clear", "1"}).exit_code, 0);
   EXPECT_EQ(last_order(), "presetposition.cgi?PresetClear=1");
 }
 
 TEST_F(PtzByCommand, PresetsAreListedByTheirNames) {
   start_model("LMX-C100");
-  camera().settings().set("presetposition", "PresetName", "1,Gate,3,Door\x1b[2J");
+  camera().settings().set_answer("presetposition", "PresetNum=2&PresetName=1,Gate,3,Door\x1b[2J");
   EXPECT_EQ(act("preset", {"list"}).out, "  1  Gate\n  3  Door\\x1b[2J\n");
   EXPECT_EQ(nlohmann::json::parse(act("preset", {"list", "--json"}).out),
             nlohmann::json::parse(R"([{"preset": 1, "name": "Gate"}, {"preset": 3, "name": "Door\u001b[2J"}])"));
@@ -269,7 +269,7 @@ TEST_F(PtzByCommand, ShadowToursAreRecordedPreviewedAndPlayed) {
   start_model("LMX-P200");
   for (const PtzOrder& one : {PtzOrder{{"record", "2"}, "STourRecord=B"},
                               {{"record", "stop"}, "STourRecord=stop"},
-                              {{"preview", "5"}, "STourPreview=E"},
+                              {{"preview", "2"}, "STourPreview=B"},
                               {{"preview", "stop"}, "STourPreview=stop"},
                               {{"start", "1"}, "STour=on&STourA=on&STourB=off&STourC=off&STourD=off&STourE=off"},
                               {{"stop"}, "STour=off&STourA=off&STourB=off&STourC=off&STourD=off"}}) {

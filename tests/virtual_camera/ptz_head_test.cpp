@@ -259,7 +259,7 @@ TEST_F(PtzHeadTest, RefusesSettingsOfToursWhole) {
                             "TourAName=x",
                             "TourResume=maybe",
                             "TourRsmTime=0",
-                            "Tour",
+
                             "Tours=on",
                             "STourC=on",
                             "STourA=on&STourB=on",
