@@ -166,7 +166,7 @@ TEST(Scene, CoveredLensShowsTheClockAlone) {
 }
 
 // The clock's letters as rows of dots.
-std::vector<std::string> clock_dots(milliseconds clock) {
+std::vector<std::string> clock_dots(std::chrono::milliseconds clock) {
   SceneMoment moment;
   moment.covered = true;
   moment.clock = clock;
