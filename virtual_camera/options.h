@@ -65,7 +65,7 @@ struct CameraOptions {
   std::vector<int> playback_scales = {1, 2, 4, -1};  // at which recordings are played; another is taken to the nearest
 
   double frames_per_second = 25;
-  double speed = 1;  // pace: 4 sends four times faster, with timestamps advancing by picture as at 1
+  double speed = 1;      // pace: 4 sends four times faster, with timestamps advancing by picture as at 1
   double ptz_speed = 1;  // pace of pan, tilt, zoom, focus and tours, on top of the pace of all
   std::uint32_t clock_rate = 90000;
   std::uint16_t start_sequence = 1;

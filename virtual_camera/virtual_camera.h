@@ -11,8 +11,8 @@
 #include <string>
 
 #include "virtual_camera/alarm_scene.h"
-#include "virtual_camera/card.h"
 #include "virtual_camera/camera_pose.h"
+#include "virtual_camera/card.h"
 #include "virtual_camera/journal.h"
 #include "virtual_camera/options.h"
 #include "virtual_camera/ptz_head.h"

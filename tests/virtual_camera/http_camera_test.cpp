@@ -146,8 +146,10 @@ TEST(HttpCameraLimits, SettingsThatMakeNoSenseAreRefusedAtTheStart) {
     const char* error;
   } cases[] = {
       {[](CameraOptions& o) { o.speed = 0; }, "frames per second, speed, PTZ speed and clock rate must be above 0"},
-      {[](CameraOptions& o) { o.frames_per_second = -1; }, "frames per second, speed, PTZ speed and clock rate must be above 0"},
-      {[](CameraOptions& o) { o.clock_rate = 0; }, "frames per second, speed, PTZ speed and clock rate must be above 0"},
+      {[](CameraOptions& o) { o.frames_per_second = -1; },
+       "frames per second, speed, PTZ speed and clock rate must be above 0"},
+      {[](CameraOptions& o) { o.clock_rate = 0; },
+       "frames per second, speed, PTZ speed and clock rate must be above 0"},
       {[](CameraOptions& o) { o.max_payload = 2; }, "too small a packet or burst"},
       {[](CameraOptions& o) { o.burst_packets = 0; }, "too small a packet or burst"},
       {[](CameraOptions& o) { o.clip_path = "/nowhere/clip"; }, "no pictures in /nowhere/clip"},
