@@ -15,6 +15,13 @@ struct CameraPose {
   std::string user_data;         // what the picture carries as its position, "CamPos: ..."; empty: nothing
 };
 
+// A flag in the scene at the place that a preset holds.
+struct PresetMark {
+  int number = 1;
+  double pan = 0;  // degrees, as those of a pose
+  double tilt = 0;
+};
+
 // Any thread.
 using PoseSource = std::function<CameraPose(std::chrono::steady_clock::time_point)>;
 

@@ -1,10 +1,26 @@
 #include "virtual_camera/live_scene.h"
 
+#include <cmath>
 #include <optional>
 
 #include "virtual_camera/stream_plan.h"
 
 namespace vexa::camera {
+namespace {
+
+// Whose setting watches: where settings belong to presets, that of the preset at which the camera stands, and none
+// between them.
+std::optional<int> watching_setting(const CameraState& state, const CameraPose& pose) {
+  constexpr double kNear = 0.1;  // degrees
+  if (!state.ptz || state.settings.get("objectdetection", "PositionMode") != "preset") return kPresentView;
+  for (const PresetMark& mark : state.ptz->preset_marks()) {
+    const bool there = std::abs(turn_between(mark.pan, pose.pan)) < kNear && std::abs(mark.tilt - pose.tilt) < kNear;
+    if (there) return mark.number;
+  }
+  return std::nullopt;
+}
+
+}  // namespace
 
 View view_of(const CameraState& state, PictureSize size, std::chrono::steady_clock::time_point now) {
   View view;
@@ -26,6 +42,7 @@ SceneMoment moment_of(const CameraState& state, std::chrono::steady_clock::time_
   moment.clock = clock_of(std::chrono::system_clock::now());
   moment.intruder = state.stage.intruder(now);
   moment.covered = state.alarms.lens_covered();
+  if (state.ptz) moment.presets = state.ptz->preset_marks();
   return moment;
 }
 
@@ -36,7 +53,9 @@ std::array<bool, kDetectionWindows> alarmed_windows(const CameraState& state,
   const View view = main_view_of(state, now);
   const PictureBox figure = box_of(*intruder, view);
   if (state.alarms.detection() == "lod") return windows_with(figure, whole_picture());
-  return windows_with(figure, detection_setting(state.settings, kPresentView, view.size));
+  const std::optional<int> number = watching_setting(state, view.pose);
+  if (!number) return {};
+  return windows_with(figure, detection_setting(state.settings, *number, view.size));
 }
 
 }  // namespace vexa::camera

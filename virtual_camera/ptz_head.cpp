@@ -249,6 +249,19 @@ CameraPose PtzHead::pose(bool turned, Time now) {
           position_text(mechanism_.place(time), turned, mechanism_.looks_elsewhere(time))};
 }
 
+std::vector<PresetMark> PtzHead::preset_marks() {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  const PtzProfile& profile = mechanism_.profile();
+  std::vector<PresetMark> marks;
+  for (const auto& [number, preset] : section_.presets) {
+    const double pan = preset.place[static_cast<std::size_t>(PtzMotor::kPan)];
+    const double tilt = preset.place[static_cast<std::size_t>(PtzMotor::kTilt)];
+    marks.push_back(
+        {number, pan * profile.pan.degrees_of_unit(), (tilt - profile.tilt.offset) * profile.tilt.degrees_of_unit()});
+  }
+  return marks;
+}
+
 PtzPlace PtzHead::place(Time now) {
   const std::lock_guard<std::mutex> lock(mutex_);
   return mechanism_.place(catch_up(now));

@@ -10,6 +10,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "virtual_camera/camera_pose.h"
 #include "virtual_camera/preset_section.h"
@@ -37,6 +38,8 @@ class PtzHead {
   // counts them that turns them back.
   [[nodiscard]] CameraPose pose(bool turned, Time now);
   [[nodiscard]] PtzPlace place(Time now);
+  // Where the presets look, in the order of their numbers.
+  [[nodiscard]] std::vector<PresetMark> preset_marks();
 
  private:
   // A tour under way: what it does next, and when.

@@ -11,13 +11,6 @@
 
 namespace vexa::camera {
 
-// A flag at the place that a preset holds.
-struct PresetMark {
-  int number = 1;
-  double pan = 0;   // degrees
-  double tilt = 0;  // degrees
-};
-
 struct SceneMoment {
   std::chrono::milliseconds clock{0};  // since midnight, as the picture's clock shows it
   std::vector<PresetMark> presets;

@@ -2,6 +2,12 @@
 
 #include <gtest/gtest.h>
 
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "tests/virtual_camera/ptz_models.h"
+
 namespace vexa::camera {
 namespace {
 
@@ -88,6 +94,54 @@ TEST_F(SeenByACamera, ZoomBringsTheFigureIntoMoreWindows) {
   const SceneMoment moment = moment_of(state_, kBegin + std::chrono::seconds(5));
   ASSERT_TRUE(moment.intruder);
   EXPECT_NEAR(moment.intruder->bearing, 120, 1e-9);
+}
+
+class SeenByADome : public SeenByACamera {
+ protected:
+  SeenByADome() {
+    state_.ptz = std::make_unique<PtzHead>(dome(), kBegin, 1);
+    state_.pose = [this](PtzHead::Time now) { return state_.ptz->pose(false, now); };
+  }
+  // The head rests at `place` a minute after it is told, and a preset holds that place.
+  void set_preset(const std::string& number, const std::string& place) {
+    ASSERT_TRUE(state_.ptz->move({{"AbsolutePanTilt", place}}, {}, now_));
+    now_ += std::chrono::minutes(1);
+    ASSERT_TRUE(state_.ptz->command_presets({{"PresetSet", number + ",name,on"}}, now_));
+  }
+  std::string windows_now() {
+    state_.stage.enter(walk_through(main_view_of(state_, now_), std::chrono::seconds(10)),
+                       now_ - std::chrono::seconds(5));
+    std::string numbers;
+    for (const bool seen : alarmed_windows(state_, now_)) numbers += seen ? '1' : '0';
+    return numbers;
+  }
+
+  PtzHead::Time now_ = kBegin;
+};
+
+TEST_F(SeenByADome, PresetsHaveFlagsWhereTheHeadLookedWhenTheyWereSet) {
+  set_preset("1", "FC18,0640,20");
+  const CameraPose first = state_.pose(now_);
+  set_preset("3", "07D0,0000,20");
+  const std::vector<PresetMark> marks = moment_of(state_, now_).presets;
+  ASSERT_EQ(marks.size(), 2U);
+  EXPECT_EQ(marks[0].number, 1);
+  EXPECT_DOUBLE_EQ(marks[0].pan, first.pan);
+  EXPECT_DOUBLE_EQ(marks[0].tilt, first.tilt);
+  EXPECT_EQ(marks[1].number, 3);
+  EXPECT_DOUBLE_EQ(marks[1].pan, state_.pose(now_).pan);
+}
+
+TEST_F(SeenByADome, WindowsAreThoseOfThePresetAtWhichItStandsWhereSettingsBelongToPresets) {
+  ASSERT_TRUE(state_.settings.apply(
+      "objectdetection", "Od99Win1=on&Od99Win1Area=0,0,10000,10000&Od02Win4=on&Od02Win4Area=0,0,10000,10000"));
+  set_preset("2", "FC18,0640,20");
+  EXPECT_EQ(windows_now(), "1000");
+  state_.settings.set("objectdetection", "PositionMode", "preset");
+  EXPECT_EQ(windows_now(), "0001");
+  ASSERT_TRUE(state_.ptz->move({{"AbsolutePanTilt", "07D0,0000,20"}}, {}, now_));
+  now_ += std::chrono::minutes(1);
+  EXPECT_EQ(windows_now(), "0000") << "no preset is here";
 }
 
 TEST_F(SeenByACamera, WindowsOfTheSimplerKindOfDetectionAreOne) {
