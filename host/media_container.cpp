@@ -153,7 +153,7 @@ std::optional<Problem> MediaContainer::check() const { return FrameFile(path_).c
 std::optional<Problem> MediaContainer::write(const RecordedPicture& picture) {
   if (!muxer_) {
     auto muxer = std::make_unique<Muxer>();
-    if (const auto problem = muxer->open(*this, picture)) return problem;
+    if (auto problem = muxer->open(*this, picture)) return problem;
     muxer_ = std::move(muxer);
   }
   const int error = muxer_->write(picture);

@@ -63,7 +63,7 @@ SoundFormat sound_format_of(const std::string& file) {
 std::optional<Problem> SoundFile::write(const unsigned char* sound, std::size_t length) {
   if (bytes_ == 0 && format_ == SoundFormat::kWave) {
     const auto header = wave_header(0);
-    if (const auto problem = file_.write(header.data(), header.size())) return problem;
+    if (auto problem = file_.write(header.data(), header.size())) return problem;
   }
   bytes_ += length;
   return file_.write(sound, length);
@@ -73,10 +73,10 @@ std::optional<Problem> SoundFile::close() {
   if (bytes_ > 0 && format_ == SoundFormat::kWave) {
     const unsigned char padding = 0;
     if (bytes_ % 2 != 0) {
-      if (const auto problem = file_.write(&padding, 1)) return problem;
+      if (auto problem = file_.write(&padding, 1)) return problem;
     }
     const auto header = wave_header(bytes_);
-    if (const auto problem = file_.overwrite(0, header.data(), header.size())) return problem;
+    if (auto problem = file_.overwrite(0, header.data(), header.size())) return problem;
   }
   return file_.close();
 }

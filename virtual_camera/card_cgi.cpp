@@ -1,26 +1,14 @@
 #include "virtual_camera/card_cgi.h"
 
-#include <charconv>
 #include <string>
 #include <string_view>
+
+#include "virtual_camera/percent_text.h"
 
 namespace vexa::camera {
 namespace {
 
 constexpr std::string_view kDeleteByName = "DeletebyName=";
-
-std::string percent_decoded(std::string_view text) {
-  std::string plain;
-  for (std::size_t i = 0; i < text.size(); ++i) {
-    unsigned byte = 0;
-    const std::string_view digits = text.substr(i + 1, 2);
-    const auto read = std::from_chars(digits.data(), digits.data() + digits.size(), byte, 16);
-    const bool encoded = text[i] == '%' && digits.size() == 2 && read.ptr == digits.data() + digits.size();
-    plain += encoded ? static_cast<char>(byte) : text[i];
-    if (encoded) i += digits.size();
-  }
-  return plain;
-}
 
 Answer search(std::string_view query, const Card& card) {
   if (query != "Order=oldest" && query != "Order=newest") return http_answer("400 Bad Request", "");
@@ -42,7 +30,8 @@ std::optional<Answer> answer_card(const RequestHead& request, Card& card) {
   const std::string_view query = request.query;
   if (query == "delete=all") return deleted(card.erase_all());
   if (!query.starts_with(kDeleteByName)) return std::nullopt;
-  return deleted(card.erase(percent_decoded(query.substr(kDeleteByName.size()))));
+  const std::optional<std::string> name = percent_decoded(query.substr(kDeleteByName.size()));
+  return deleted(name && card.erase(*name));
 }
 
 }  // namespace vexa::camera

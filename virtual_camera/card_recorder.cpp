@@ -1,6 +1,7 @@
 #include "virtual_camera/card_recorder.h"
 
 #include <charconv>
+#include <cmath>
 #include <string_view>
 #include <utility>
 
@@ -27,7 +28,7 @@ std::chrono::steady_clock::duration paced(Duration time, double speed) {
 RecordingHead head_of(const CameraState& state, int image, const SourceFormat& format) {
   RecordingHead head;
   head.codec = format.codec;
-  head.frame_rate = static_cast<int>(format.frames_per_second + 0.5);
+  head.frame_rate = static_cast<int>(std::lround(format.frames_per_second));
   if (const auto stream = stream_settings(state.settings, image)) {
     head.size = std::to_string(stream->width) + "," + std::to_string(stream->height);
     head.bit_rate = stream->bit_rate;

@@ -44,7 +44,7 @@ class Connection : public std::enable_shared_from_this<Connection> {
   // Bytes in front of the next request that are none of it.
   virtual std::size_t passed_over(std::string_view) const { return 0; }
   // Other things leave by the socket too: calls `ready` once an answer may, and they wait until it is released.
-  virtual void claim_socket(std::function<void()> ready) { ready(); }
+  virtual void claim_socket(const std::function<void()>& ready) { ready(); }
   virtual void release_socket() {}
   // After Next::kStream: calls send_at, which calls it again once the bytes have left, or finish_stream.
   virtual void stream() {}

@@ -60,7 +60,7 @@ std::array<MeanCode, 12> mean_codes(std::string_view table) {
   std::size_t symbol = 0;
   for (std::size_t length = 1; length <= kCodeLengths; ++length, code <<= 1U) {
     for (char left = table[length - 1]; left > 0; --left) {
-      codes[static_cast<std::size_t>(table[kCodeLengths + symbol++])] = {code++, static_cast<int>(length)};
+      codes[static_cast<unsigned char>(table[kCodeLengths + symbol++])] = {code++, static_cast<int>(length)};
     }
   }
   return codes;

@@ -73,7 +73,7 @@ class HttpStream {
   // Whether next_due() gave nothing only because the source has no picture yet; then wait() calls `ready` as the
   // source's does.
   [[nodiscard]] bool waits() const;
-  void wait(std::function<void()> ready) { source_->wait(std::move(ready)); }
+  void wait(const std::function<void()>& ready) { source_->wait(ready); }
   // Whether the connection closes at the stream's end; else it stays, silent.
   [[nodiscard]] bool closes() const { return closes_; }
 

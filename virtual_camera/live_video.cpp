@@ -46,17 +46,20 @@ class LiveVideo::Watcher : public PictureSource {
     waiting_.pop_front();
     return picture;
   }
-  void wait(std::function<void()> ready) override {
+  void wait(const std::function<void()>& ready) override {
     {
       const std::lock_guard<std::mutex> lock(video_->mutex_);
-      if (waiting_.empty()) ready_ = std::exchange(ready, nullptr);
+      if (waiting_.empty()) {
+        ready_ = ready;
+        return;
+      }
     }
-    if (ready) ready();
+    ready();
   }
 
   // With the video's lock held. Whether a key picture is needed.
   [[nodiscard]] bool take(SourcePicture picture) {
-    const auto most = static_cast<std::size_t>(2 * video_->encoding().frame_rate);
+    const auto most = 2 * static_cast<std::size_t>(video_->encoding().frame_rate);
     if (waiting_.size() > most) {
       waiting_.clear();
       needs_key_ = true;

@@ -58,7 +58,7 @@ class PictureSource {
   [[nodiscard]] virtual bool ended() const = 0;
   // When next() gave nothing and the source has not ended: calls `ready` once, from any thread or at once, when it is
   // worth asking again. A call that the source does not outlive may be left out.
-  virtual void wait(std::function<void()> ready) { ready(); }
+  virtual void wait(const std::function<void()>& ready) { ready(); }
 };
 
 // The time of picture `index` at a steady rate.

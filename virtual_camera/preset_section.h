@@ -79,11 +79,6 @@ class PresetSection {
   int fastest_;
 };
 
-// The bytes of a percent-encoded text; nothing when it is no such text.
-[[nodiscard]] std::optional<std::string> percent_decoded(std::string_view text);
-// The text with its "%", ",", "&" and control characters percent-encoded, so that a list can hold it.
-[[nodiscard]] std::string percent_encoded_for_list(std::string_view text);
-
 }  // namespace vexa::camera
 
 #endif  // VIRTUAL_CAMERA_PRESET_SECTION_H_

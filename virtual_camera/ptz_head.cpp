@@ -6,6 +6,8 @@
 #include <cstdint>
 #include <utility>
 
+#include "virtual_camera/percent_text.h"
+
 namespace vexa::camera {
 namespace {
 
@@ -33,7 +35,7 @@ double PtzHead::catch_up(Time now) {
     resume_later(end);
   }
   while (program_ && program_->due <= latest_) {
-    if (program_->kind == Program::Kind::kCamera) {
+    if (program_->kind == PtzProgram::Kind::kCamera) {
       step_camera_tour();
     } else {
       step_shadow_tour();
@@ -49,7 +51,7 @@ void PtzHead::begin_program(double due) {
     program_.emplace();
   } else if (const ShadowTour* tour = section_.shadow_tour(); tour != nullptr && tour->length > 0) {
     program_.emplace();
-    program_->kind = Program::Kind::kShadow;
+    program_->kind = PtzProgram::Kind::kShadow;
     program_->shadow = *tour;
   }
   if (program_) program_->due = due;
@@ -60,14 +62,14 @@ void PtzHead::resume_later(double now) {
   const int resume = section_.camera_switch.on ? section_.camera_switch.resume : section_.shadow_switch.resume;
   if (resume == 0) section_.end_tours();
   const double due = at_rest(now) + resume;
-  if (resume == 0 || !program_ || program_->kind != Program::Kind::kCamera) return begin_program(due);
+  if (resume == 0 || !program_ || program_->kind != PtzProgram::Kind::kCamera) return begin_program(due);
   program_->due = due;
   program_->laps = 0;
 }
 
 // Laps are all alike once one has been made: those that are over are left out.
 void PtzHead::begin_lap() {
-  Program& program = *program_;
+  PtzProgram& program = *program_;
   const double length = program.due - program.lap;
   if (program.laps > 1 && latest_ - program.due > length) {
     program.due += std::floor((latest_ - program.due) / length) * length;
@@ -95,7 +97,7 @@ void PtzHead::step_camera_tour() {
 
 // Step 0 goes to the start; each further one obeys an order; behind the last one the camera stands still.
 void PtzHead::step_shadow_tour() {
-  Program& program = *program_;
+  PtzProgram& program = *program_;
   const auto& orders = program.shadow.orders;
   if (program.step == 0) {
     begin_lap();
@@ -108,7 +110,7 @@ void PtzHead::step_shadow_tour() {
     mechanism_.brake(program.due);
     program.step = 0;
     program.due = at_rest(program.due);
-    if (program.kind == Program::Kind::kPreview) resume_later(program.due);
+    if (program.kind == PtzProgram::Kind::kPreview) resume_later(program.due);
     return;
   }
   program.due = program.origin + (program.step < orders.size() ? orders[program.step].first : program.shadow.length);
@@ -204,7 +206,7 @@ bool PtzHead::record(std::string_view value, double now) {
   keep_recording(now);
   program_.reset();
   mechanism_.brake(now);
-  recording_ = Recording{std::string(value), now, {}};
+  recording_ = PtzRecording{std::string(value), now, {}};
   recording_->made.start = mechanism_.place(mechanism_.rests_from());
   return true;
 }
@@ -212,7 +214,7 @@ bool PtzHead::record(std::string_view value, double now) {
 bool PtzHead::preview(std::string_view value, double now) {
   if (section_.shadow_tours.empty()) return false;
   if (value == "stop") {
-    if (!program_ || program_->kind != Program::Kind::kPreview) return true;
+    if (!program_ || program_->kind != PtzProgram::Kind::kPreview) return true;
     mechanism_.brake(now);
     resume_later(now);
     return true;
@@ -221,7 +223,7 @@ bool PtzHead::preview(std::string_view value, double now) {
   if (tour == nullptr || tour->length <= 0) return false;
   keep_recording(now);
   program_.emplace();
-  program_->kind = Program::Kind::kPreview;
+  program_->kind = PtzProgram::Kind::kPreview;
   program_->shadow = *tour;
   program_->due = now;
   return true;

@@ -19,6 +19,25 @@
 
 namespace vexa::camera {
 
+// A tour under way: what it does next, and when.
+struct PtzProgram {
+  enum class Kind { kCamera, kShadow, kPreview };
+
+  Kind kind = Kind::kCamera;
+  ShadowTour shadow;     // of the shadow kinds
+  std::size_t step = 0;  // in the sequence or among the orders
+  double due = 0;
+  double origin = 0;  // what a shadow tour's orders count from
+  double lap = 0;     // the beginning of the one under way
+  int laps = 0;
+};
+// A shadow tour that is being recorded.
+struct PtzRecording {
+  std::string letter;
+  double began = 0;
+  ShadowTour made;
+};
+
 // Any thread.
 class PtzHead {
  public:
@@ -42,24 +61,6 @@ class PtzHead {
   [[nodiscard]] std::vector<PresetMark> preset_marks();
 
  private:
-  // A tour under way: what it does next, and when.
-  struct Program {
-    enum class Kind { kCamera, kShadow, kPreview };
-
-    Kind kind = Kind::kCamera;
-    ShadowTour shadow;     // of the shadow kinds
-    std::size_t step = 0;  // in the sequence or among the orders
-    double due = 0;
-    double origin = 0;  // what a shadow tour's orders count from
-    double lap = 0;     // the beginning of the one under way
-    int laps = 0;
-  };
-  struct Recording {
-    std::string letter;
-    double began = 0;
-    ShadowTour made;
-  };
-
   [[nodiscard]] double catch_up(Time now);
   [[nodiscard]] double at_rest(double now) const { return std::max(now, mechanism_.rests_from()); }
   void begin_program(double due);
@@ -83,8 +84,8 @@ class PtzHead {
   Time start_;
   double pace_;
   double latest_ = 0;  // seconds from the start, at the pace; never falls
-  std::optional<Program> program_;
-  std::optional<Recording> recording_;
+  std::optional<PtzProgram> program_;
+  std::optional<PtzRecording> recording_;
 };
 
 }  // namespace vexa::camera

@@ -27,7 +27,8 @@ PtzAxis lens_motor(const LensProfile& lens, double position) {
 
 PtzAxis focus_motor(const std::optional<LensProfile>& focus) {
   if (!focus) return {PtzAxis::Mechanics{}, 0};
-  return lens_motor(*focus, (focus->min_position + focus->max_position) / 2);
+  const int middle = (focus->min_position + focus->max_position) / 2;
+  return lens_motor(*focus, middle);
 }
 
 // Straight between two points.

@@ -58,7 +58,7 @@ class RtpStream {
   [[nodiscard]] bool load();
   [[nodiscard]] bool ended() const;
   // When load() found no picture and the stream has not ended: as the source's.
-  void wait(std::function<void()> ready) { source_->wait(std::move(ready)); }
+  void wait(const std::function<void()>& ready) { source_->wait(ready); }
   // The picture taken up; only after load() has found one.
   [[nodiscard]] const SourcePicture& loaded() const { return *loaded_; }
   [[nodiscard]] const SourceFormat& format() const { return source_->format(); }

@@ -37,7 +37,7 @@ std::size_t RtspConnection::request_size(std::string_view received) const {
 // A host's reports on what it receives.
 std::size_t RtspConnection::passed_over(std::string_view received) const { return leading_packets_size(received); }
 
-void RtspConnection::claim_socket(std::function<void()> ready) { lane_ ? lane_->claim(std::move(ready)) : ready(); }
+void RtspConnection::claim_socket(const std::function<void()>& ready) { lane_ ? lane_->claim(ready) : ready(); }
 
 void RtspConnection::release_socket() {
   if (lane_) lane_->release();

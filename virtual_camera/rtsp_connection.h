@@ -34,7 +34,7 @@ class RtspConnection : public Connection {
   bool may_idle() const override;
   void ended() override;
   std::size_t passed_over(std::string_view received) const override;
-  void claim_socket(std::function<void()> ready) override;
+  void claim_socket(const std::function<void()>& ready) override;
   void release_socket() override;
 
   // Where a session's packets are to go, and how SETUP's answer tells it; no port: it could not be opened.

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <array>
 #include <chrono>
+#include <cmath>
 #include <cstdint>
 #include <iterator>
 #include <nlohmann/json.hpp>
@@ -45,7 +46,7 @@ const SoundCodec* find_sound_codec(const std::string& word) {
 class SoundLimit {
  public:
   SoundLimit(std::optional<double> seconds, int bit_rate) {
-    if (seconds) bytes_ = static_cast<std::uint64_t>(*seconds * bit_rate / 8 + 0.5);
+    if (seconds) bytes_ = static_cast<std::uint64_t>(std::llround(*seconds * bit_rate / 8));
   }
   [[nodiscard]] bool reached(std::uint64_t have) const { return bytes_ && have >= *bytes_; }
   // Of the next piece, when so much is there already.

@@ -1,5 +1,6 @@
 // A moving head on a clock that the test sets: what it tells of itself, presets, tours.
 #include "virtual_camera/ptz_head.h"
+#include "virtual_camera/percent_text.h"
 
 #include <gtest/gtest.h>
 
