@@ -66,6 +66,7 @@ std::vector<std::unique_ptr<Command>> all_commands() {
   commands.push_back(make_detection_command());
   commands.push_back(make_tampering_command());
   commands.push_back(make_audio_detection_command());
+  commands.push_back(make_edge_command());
   commands.push_back(make_log_command());
   return commands;
 }

@@ -3,7 +3,10 @@
 #include <fmt/format.h>
 #include <sys/mman.h>
 
+#include <algorithm>
+#include <charconv>
 #include <cstring>
+#include <string_view>
 
 #include "host/printable.h"
 #include "host/redactor.h"
@@ -26,6 +29,13 @@ class PrivateLog {
 };
 
 bool mentions_unauthorized(const std::string& text) { return strcasestr(text.c_str(), "unauthorized") != nullptr; }
+
+// The number that the text begins with; 0 for none.
+int whole_number(std::string_view text) {
+  int number = 0;
+  std::from_chars(text.data(), text.data() + text.size(), number);
+  return number;
+}
 
 }  // namespace
 
@@ -56,6 +66,25 @@ Result<LiveCamera::Identity> LiveCamera::identify(int stream) {
   m_CameraInfo.codecType = identity.video.codecType;
   m_CameraInfo.codecName = identity.video.codecName;
   return identity;
+}
+
+Result<CardMode> LiveCamera::card_mode() {
+  std::string answer;
+  const ELibDReturnCode result = SendInqCommand("edgestorage", answer);
+  if (result != LIBD_OK) return explain(result);
+  CardMode mode;
+  SLibDEdgeStorageMode& recording = mode.recording;
+  std::string text;
+  recording.enabled = GetUrlParameter(answer, "Edgestorage=", text) && text == "on";
+  recording.imageNumber = 1;
+  GetUrlParameter(answer, "EsRec1=image", recording.imageNumber);
+  GetUrlParameter(answer, "EsAlmRec1WatchAddress=", recording.watchAddress);
+  if (GetUrlParameter(answer, "EsAlmRec1Time=", text)) {
+    recording.alarmTime1 = whole_number(text);
+    recording.alarmTime2 = whole_number(std::string_view(text).substr(std::min(text.find(','), text.size() - 1) + 1));
+  }
+  mode.free_kilobytes = std::max(CheckEdgeStorageFreeSize(), 0);
+  return mode;
 }
 
 bool left_a_reason(CLibraryDevice& device) {

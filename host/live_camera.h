@@ -33,6 +33,12 @@ void introduce(CLibraryDevice& device, const CameraConnection& connection);
 // Whether the latest failure has a text: a failed exchange leaves one, an answer that lacks a key none.
 [[nodiscard]] bool left_a_reason(CLibraryDevice& device);
 
+// How a camera is set to record on its card.
+struct CardMode {
+  SLibDEdgeStorageMode recording;
+  int free_kilobytes = 0;  // 0 also when no card is there
+};
+
 // A model class for any camera that streams video.
 class LiveCamera final : public CVexaCommon {
  public:
@@ -48,6 +54,9 @@ class LiveCamera final : public CVexaCommon {
   };
   // Asks the camera what it is and what the stream is set to, and selects the stream and its codec.
   [[nodiscard]] Result<Identity> identify(int stream);
+
+  // Asks the camera: the driver's own record of the mode knows only what it has set itself.
+  [[nodiscard]] Result<CardMode> card_mode();
 
  private:
   const CameraConnection connection_;

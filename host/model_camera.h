@@ -28,8 +28,13 @@ class ModelCamera {
   [[nodiscard]] CLibraryDevice& device() const { return *device_; }
   [[nodiscard]] const Profile& profile() const { return profile_; }
   [[nodiscard]] const CameraAddress& address() const { return connection_.address; }
+  [[nodiscard]] int timeout_ms() const { return connection_.timeout_ms; }
+  [[nodiscard]] int stream() const { return stream_; }  // of the options, from 1
   // The settings of the stream that the options name, as the camera reports them.
   [[nodiscard]] Result<SLibDCameraInfo> video() const;
+
+  // How the camera is set to record on its card.
+  [[nodiscard]] Result<CardMode> card_mode() const { return live_->card_mode(); }
 
   // A driver that plays the stream of the options, which it has asked the camera about. This camera's own, as long as
   // it.

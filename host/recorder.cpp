@@ -12,6 +12,22 @@ constexpr std::chrono::milliseconds kPollPause{3};
 
 }  // namespace
 
+const char* name_of(RecordingEnd end) {
+  switch (end) {
+    case RecordingEnd::kComplete:
+      return "complete";
+    case RecordingEnd::kInterrupted:
+      return "interrupted";
+    case RecordingEnd::kSilent:
+      return "silent";
+    case RecordingEnd::kNoKeyPicture:
+      return "noKeyPicture";
+    case RecordingEnd::kCannotWrite:
+      return "cannotWrite";
+  }
+  return "";
+}
+
 bool is_key_picture(std::int32_t frame_type) {
   return frame_type == VIDEO_FRAME_H264_KEY || frame_type == VIDEO_FRAME_MPEG4_KEY || frame_type == VIDEO_FRAME_JPEG;
 }

@@ -26,8 +26,18 @@ struct RecordingLimits {
 
 enum class RecordingEnd { kComplete, kInterrupted, kSilent, kNoKeyPicture, kCannotWrite };
 
+// As JSON tells it, such as "complete".
+[[nodiscard]] const char* name_of(RecordingEnd end);
+
 // Whether a picture can be decoded without those before it; `frame_type` as the driver tells it.
 [[nodiscard]] bool is_key_picture(std::int32_t frame_type);
+
+// Copies and returns, as the driver asks: it holds its queue meanwhile.
+class PictureBytes final : public CDataSink {
+ public:
+  void Write(const unsigned char* data, unsigned int length) override { bytes.assign(data, data + length); }
+  std::vector<unsigned char> bytes;
+};
 
 class Recorder {
  public:
@@ -44,13 +54,6 @@ class Recorder {
   [[nodiscard]] const std::optional<Problem>& problem() const { return problem_; }  // of kCannotWrite
 
  private:
-  // Copies and returns, as the driver asks: it holds its queue meanwhile.
-  class Picture final : public CDataSink {
-   public:
-    void Write(const unsigned char* data, unsigned int length) override { bytes.assign(data, data + length); }
-    std::vector<unsigned char> bytes;
-  };
-
   [[nodiscard]] std::optional<RecordingEnd> limit_reached(Clock::time_point now) const;
   [[nodiscard]] bool keep(const SLibDVideoFrameInfo& frame, Clock::time_point now);
   [[nodiscard]] std::chrono::microseconds time_of(const SLibDVideoFrameInfo& frame, Clock::time_point now) const;
@@ -61,7 +64,7 @@ class Recorder {
   Clock::time_point start_;
   std::chrono::system_clock::time_point wall_start_ = std::chrono::system_clock::now();  // the same moment
   Clock::time_point last_picture_;
-  Picture picture_;
+  PictureBytes picture_;
   RecordingMeter meter_;
   std::optional<Problem> problem_;
 };

@@ -40,6 +40,7 @@ std::unique_ptr<Command> make_watch_command();
 std::unique_ptr<Command> make_detection_command();
 std::unique_ptr<Command> make_tampering_command();
 std::unique_ptr<Command> make_audio_detection_command();
+std::unique_ptr<Command> make_edge_command();
 std::unique_ptr<Command> make_ptz_command();
 std::unique_ptr<Command> make_preset_command();
 std::unique_ptr<Command> make_tour_command();

@@ -70,22 +70,6 @@ std::string progress_line(const RecordingMeter& meter, Clock::time_point now) {
                      meter.recent_bit_rate(now) / 1e6, missing_text(meter, now));
 }
 
-const char* name_of(RecordingEnd end) {
-  switch (end) {
-    case RecordingEnd::kComplete:
-      return "complete";
-    case RecordingEnd::kInterrupted:
-      return "interrupted";
-    case RecordingEnd::kSilent:
-      return "silent";
-    case RecordingEnd::kNoKeyPicture:
-      return "noKeyPicture";
-    case RecordingEnd::kCannotWrite:
-      return "cannotWrite";
-  }
-  return "";
-}
-
 std::string summary_line(const Recording& recording) {
   const RecordingMeter& meter = recording.meter;
   std::string line =

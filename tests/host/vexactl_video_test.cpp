@@ -3,6 +3,7 @@
 #include <nlohmann/json.hpp>
 
 #include "tests/host/camera_fixture.h"
+#include "tests/host/probed_file.h"
 #include "tests/support/decoder.h"
 #include "virtual_camera/image_clip.h"
 
@@ -22,19 +23,6 @@ struct VideoCodec {
 constexpr VideoCodec kVideoCodecs[] = {{"H.264", "h264", VEXA_CLIPS "/small.h264", "h264", "h264"},
                                        {"MPEG4", "mpeg4", VEXA_CLIPS "/small.m4v", "m4v", "m4v"},
                                        {"JPEG", "jpeg", VEXA_CLIPS "/plain.mjpeg", "mjpeg", "mjpeg"}};
-
-// What ffprobe tells of a file, line by line; nothing else, such as a warning.
-std::vector<std::string> probed(const std::string& entries, const std::string& path) {
-  std::vector<std::string> lines;
-  const std::string command = "ffprobe -v warning -show_entries " + entries + " -of csv=p=0 '" + path + "' 2>&1";
-  std::FILE* output = popen((command + " </dev/null").c_str(), "r");
-  char line[128];
-  while (output != nullptr && std::fgets(line, sizeof line, output) != nullptr) {
-    lines.emplace_back(line, std::string_view(line).find('\n'));
-  }
-  if (output != nullptr) pclose(output);
-  return lines;
-}
 
 class VideoCommands : public WithCamera {
  protected:
