@@ -3,9 +3,9 @@
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <charconv>
 #include <cmath>
 
+#include "virtual_camera/percent_text.h"
 #include "virtual_camera/ptz_command.h"
 
 namespace vexa::camera {
