@@ -7,6 +7,7 @@
 #include "device/raised_timeout.h"
 #include "runtime/base/calendar.h"
 #include "runtime/base/sync.h"
+#include "transport/socket.h"
 #include "transport/wire/http_request.h"
 #include "vexa/vexa_common.h"
 
@@ -62,11 +63,9 @@ ELibDReturnCode CVexaCommon::GetEdgeStorageRecordList(SLibDEdgeStorageRecordList
   std::string answer;
   {
     const vexa::RaisedTimeout slow(m_ConnectionInfo.timeout, m_ConnectionLock, {kListTimeout, m_SavedTimeout});
-    const int socket = http_open("/command/search?Order=oldest");
-    if (socket == -1) return LatestErrorCode();
-    const int received = http_recvn(socket, answer, 0, ConnectionTimeout());
-    http_close(socket);
-    if (received < 0) return LatestErrorCode();
+    const vexa::Socket socket(http_open("/command/search?Order=oldest"));
+    if (!socket.valid()) return LatestErrorCode();
+    if (http_recvn(socket.get(), answer, 0, ConnectionTimeout()) < 0) return LatestErrorCode();
   }
   list.records = vexa::read_recordings(answer);
   return LIBD_OK;
@@ -109,9 +108,13 @@ bool CVexaCommon::InitEdgeStorageKeepAlivePeriod() {
   return true;
 }
 
-int CVexaCommon::CheckEdgeStorageFreeSize() {
+// Safe: a size that memory does not hold is a failed inquiry and not an exception.
+int CVexaCommon::CheckEdgeStorageFreeSize() try {
   std::string answer;
   return SendInqCommand("a-slot", answer) == LIBD_OK ? vexa::free_kilobytes(answer) : -1;
+} catch (const std::bad_alloc&) {
+  FailSystem(ENOMEM);
+  return -1;
 }
 
 std::int64_t CVexaCommon::_ld_mkgmtime(std::tm* time) { return vexa::utc_seconds(*time); }

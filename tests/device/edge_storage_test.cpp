@@ -8,6 +8,7 @@
 
 #include "tests/device/edge_storage_reach.h"
 #include "tests/support/failing_new.h"
+#include "tests/support/process_state.h"
 
 namespace vexa_test {
 namespace {
@@ -226,6 +227,39 @@ TEST(RecordList, StaysAsItWasWhenTheCameraRefusesOrTearsTheConnection) {
   EXPECT_EQ(play.complaints(), "");
 }
 
+/// The list of a camera for whose answer the driver waits no longer than some milliseconds.
+ELibDReturnCode impatient_list(ScriptStep step, SLibDEdgeStorageRecordList& list) {
+  EdgeDriver driver;
+  step.meanwhile = [&] {
+    const vexa::Guard guard(driver.m_ConnectionLock);
+    driver.m_ConnectionInfo.timeout = 30;
+  };
+  ScriptedCamera camera({step});
+  driver.use(camera.host(), camera.port());
+  const ELibDReturnCode result = driver.GetEdgeStorageRecordList(list);
+  EXPECT_EQ(text_of_latest_error(driver), "Receive timed out");
+  EXPECT_EQ(driver.m_ConnectionInfo.timeout, kPatientTimeout);
+  EXPECT_EQ(camera.finish(), "");
+  return result;
+}
+
+TEST(RecordList, ThatDoesNotEndIsGivenUpAndTheOneBeforeStays) {
+  ScriptStep silent = list_answer(kOneRecord);
+  silent.then = Then::kStay;
+  ScriptStep trickling = list_answer(std::string(200000, 'x'));
+  trickling.piece = 50;
+  trickling.pause = 5;
+  const ScriptStep racing = list_answer(kOneRecord + std::string(std::size_t{40} << 20, 'x'));
+  const std::size_t descriptors = open_descriptors();
+  for (const ScriptStep& step : {silent, trickling, racing}) {
+    SLibDEdgeStorageRecordList list;
+    list.records.resize(3);
+    EXPECT_EQ(impatient_list(step, list), LIBD_TIMEOUT) << step.answer.size();
+    EXPECT_EQ(list.records.size(), 3u) << step.answer.size();
+    EXPECT_EQ(open_descriptors(), descriptors) << step.answer.size();
+  }
+}
+
 // ---- Deletion ----
 
 SLibDEdgeStorageStreamingInfo recording(const std::string& name) {
@@ -326,6 +360,7 @@ TEST(EdgeStorage, RequestsFailWhenAnyOneAllocationDoes) {
                            {{command(mode_path("off", 1, "1,2", name))},
                             [&](EdgeDriver& d) { return d.SetEdgeStorageMode(mode_of(false, 1, 1, 2, name)); },
                             LIBD_TIMEOUT}};
+  const std::size_t descriptors = open_descriptors();
   for (const ShortRow& row : rows) {
     bool happened = true;
     int nth = 0;
@@ -346,7 +381,23 @@ TEST(EdgeStorage, RequestsFailWhenAnyOneAllocationDoes) {
     }
     EXPECT_GT(nth, 5);
     EXPECT_LT(nth, 1000);
+    EXPECT_EQ(open_descriptors(), descriptors);
   }
+}
+
+TEST(EdgeStorage, FreeSpaceIsMinusOneWhenAnyOneAllocationFails) {
+  const Script script = {inquiry("a-slot", "ASlot=Free space : " + std::string(40, '9') + "Kbyte")};
+  bool happened = true;
+  int nth = 0;
+  for (; happened && nth < 1000; ++nth) {
+    EdgePlay play(script);
+    const AllocationFailure failure(nth);
+    const int space = play.driver.CheckEdgeStorageFreeSize();
+    happened = failure.happened();
+    EXPECT_EQ(space, happened ? -1 : 2147483647) << nth;
+  }
+  EXPECT_GT(nth, 5);
+  EXPECT_LT(nth, 1000);
 }
 
 // ---- The calendar ----
