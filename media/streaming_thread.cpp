@@ -97,6 +97,7 @@ void CVexaCommon::OpenRtpSession(const std::string& path) {
 }
 
 ELibDReturnCode CVexaCommon::StartPlayback(const SLibDEdgeStorageStreamingInfo& recording) {
+  PrepareCamera();
   if (!OpenPlayback(recording)) {
     ReleaseRtpPacketsPtr();
     return LIBD_FAILED;

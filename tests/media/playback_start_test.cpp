@@ -61,14 +61,32 @@ TEST(PlaybackStart, ThatFailsGivesItsCodePutsTheTimeOutBackAndClosesEverything) 
       MediaDriver driver;
       camera.introduce(driver, 5000);
       driver.m_SavedTimeout = 4000;
+      driver.m_CameraInfo.rtspPort = 8554;
       EXPECT_EQ(driver.StartEdgeStorageVideoStreaming(recording_named("a")), row.code) << row.what;
       EXPECT_EQ(driver.LatestErrorText(), row.text) << row.what;
       EXPECT_EQ(driver.m_ConnectionInfo.timeout, 4000) << row.what;
+      EXPECT_EQ(driver.m_CameraInfo.rtspPort, 554) << row.what;
       expect_nothing_open(driver);
       EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK) << row.what;
     }
     EXPECT_TRUE(eventually([&] { return open_descriptors() == descriptors; })) << row.what;
   }
+}
+
+TEST(PlaybackStart, ThatFailsBeforeThereIsAMediaSocketGivesTheTransportsCode) {
+  LiveCamera camera(camera_options());
+  MediaDriver driver;
+  camera.introduce(driver);
+  // The requests reach the camera by a proxy; the session's host is looked up and not found.
+  driver.m_ConnectionInfo.useProxy = true;
+  driver.m_ConnectionInfo.proxyHost = camera->address();
+  driver.m_ConnectionInfo.proxyPort = camera->http_port();
+  driver.m_ConnectionInfo.host = "256.256.256.256";
+  EXPECT_EQ(driver.StartEdgeStorageVideoStreaming(recording_named("a")), LIBD_FAILED);
+  EXPECT_EQ(camera->journal().count("inq=edgestorage"), 1u);
+  EXPECT_EQ(camera->journal().count("DESCRIBE"), 0u);
+  EXPECT_EQ(driver.m_ConnectionInfo.timeout, 5000);
+  expect_nothing_open(driver);
 }
 
 TEST(PlaybackStart, HasFortySecondsForTheKeepAliveSetUpAndTheOpen) {

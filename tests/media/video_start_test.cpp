@@ -155,9 +155,12 @@ TEST(VideoStart, EndsARunningStreamThroughTheInterfaceUnlessItIsRefused) {
   camera.introduce(driver);
   EXPECT_EQ(driver.StartVideoStreaming(), LIBD_FAILED);
   EXPECT_EQ(driver.stops, 1);
+  EXPECT_EQ(driver.StartEdgeStorageVideoStreaming({}), LIBD_FAILED);
+  EXPECT_EQ(driver.stops, 2);
   driver.m_StopVideoRequested = true;
   EXPECT_EQ(driver.StartVideoStreaming(), LIBD_FAILED);
-  EXPECT_EQ(driver.stops, 1) << "a refused start stops nothing";
+  EXPECT_EQ(driver.StartEdgeStorageVideoStreaming({}), LIBD_FAILED);
+  EXPECT_EQ(driver.stops, 2) << "a refused start stops nothing";
 }
 
 /// A driver in the middle of a start: its HTTP image stream is open, the thread is next.
