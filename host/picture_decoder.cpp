@@ -5,7 +5,7 @@
 #include "host/printable.h"
 
 #ifdef VEXA_WITH_FFMPEG
-#include <cstring>
+#include <algorithm>
 #include <optional>
 
 #include "host/ffmpeg_handles.h"
@@ -73,7 +73,7 @@ void take_pictures(AVCodecContext& decoder, FfmpegHandle<AVFrame>& last) {
 int feed(AVCodecContext& decoder, const FrameBytes& bytes) {
   const FfmpegHandle<AVPacket> packet(av_packet_alloc());
   if (!packet || av_new_packet(packet.get(), static_cast<int>(bytes.size())) < 0) return AVERROR(ENOMEM);
-  std::memcpy(packet->data, bytes.data(), bytes.size());
+  std::copy(bytes.begin(), bytes.end(), packet->data);
   return avcodec_send_packet(&decoder, packet.get());
 }
 

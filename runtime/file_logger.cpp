@@ -3,7 +3,9 @@
 #include <array>
 #include <cstdio>
 #include <cstring>
+#include <memory>
 #include <string_view>
+#include <utility>
 
 #include "runtime/base/sync.h"
 #include "vexa/real_time.h"
@@ -34,21 +36,27 @@ bool write_text(typedHandle* file, std::string_view text) {
   return WriteFile(file, text.data(), text.size(), &written, nullptr) == 1 && written == text.size();
 }
 
+struct LogCloser {
+  void operator()(typedHandle* file) const { CloseHandle(file); }
+};
+using OpenLog = std::unique_ptr<typedHandle, LogCloser>;
+
 /// The file, at its end, behind an opening banner; null when it cannot be opened.
-typedHandle* open_log(const std::string& name) {
-  typedHandle* file =
-      CreateFile(name.c_str(), GENERIC_WRITE, FILE_SHARE_WRITE, nullptr, OPEN_ALWAYS, FILE_ATTRIBUTE_NORMAL, nullptr);
+OpenLog open_log(const std::string& name) {
+  OpenLog file(
+      CreateFile(name.c_str(), GENERIC_WRITE, FILE_SHARE_WRITE, nullptr, OPEN_ALWAYS, FILE_ATTRIBUTE_NORMAL, nullptr));
   if (file == nullptr) return nullptr;
-  SetFilePointer(file, 0, nullptr, FILE_END);
-  write_text(file, "\n" + std::string(kBannerRule, '-') + local_time("\n%D-%O-%Y %H:%M:%S.%03L LogFile Opened. "));
-  FlushFileBuffers(file);
+  SetFilePointer(file.get(), 0, nullptr, FILE_END);
+  write_text(file.get(),
+             "\n" + std::string(kBannerRule, '-') + local_time("\n%D-%O-%Y %H:%M:%S.%03L LogFile Opened. "));
+  FlushFileBuffers(file.get());
   return file;
 }
 
 void close_log(typedHandle* file) {
   if (file == nullptr) return;
+  const OpenLog closing(file);
   write_text(file, local_time("\n%D-%O-%Y %H:%M:%S.%03L\tLogFile Closed\n") + std::string(kBannerRule, '-') + "\n");
-  CloseHandle(file);
 }
 
 /// The name of copy `number` of a file: "dir/Log.txt" and 2 give "dir/Log2.txt"; copy 0 is the file itself.
@@ -105,10 +113,11 @@ void CFileLogger::OpenFile() {
   const vexa::Guard guard(m_FileListLock);
   CloseFile();
   if (JoinFile()) return;
-  typedHandle* file = open_log(m_FileName);
+  OpenLog file = open_log(m_FileName);
   if (file == nullptr) return;
+  m_FileInfoList.insert_or_assign(m_FileHandleSeed + 1, FileInfo{m_FileName, file.get(), 1});
   m_FileId = ++m_FileHandleSeed;
-  m_FileInfoList[m_FileId] = {m_FileName, file, 1};
+  (void)file.release();  // the list's
 }
 
 bool CFileLogger::JoinFile() {
@@ -125,8 +134,9 @@ void CFileLogger::CloseFile() {
   const vexa::Guard guard(m_FileListLock);
   FileInfo* entry = FindEntry();
   if (entry != nullptr && --entry->referenceCount < 1) {
-    close_log(entry->fileHandle);
+    typedHandle* file = entry->fileHandle;
     m_FileInfoList.erase(m_FileId);
+    close_log(file);
   }
   m_FileId = 0;
 }
@@ -158,15 +168,14 @@ void CFileLogger::CycleCloseFile() {
   const vexa::Guard guard(m_FileListLock);
   FileInfo* entry = FindEntry();
   if (entry == nullptr) return;
-  close_log(entry->fileHandle);
   // Safe: nothing uses the closed handle again.
-  entry->fileHandle = nullptr;
+  close_log(std::exchange(entry->fileHandle, nullptr));
 }
 
 void CFileLogger::CycleOpenFile() {
   const vexa::Guard guard(m_FileListLock);
   FileInfo* entry = FindEntry();
-  if (entry != nullptr && entry->fileHandle == nullptr) entry->fileHandle = open_log(entry->fileName);
+  if (entry != nullptr && entry->fileHandle == nullptr) entry->fileHandle = open_log(entry->fileName).release();
 }
 
 CFileLogger::FileInfo* CFileLogger::FindEntry() {

@@ -121,7 +121,8 @@ TEST(InterleavedCamera, SendsWhatItSendsInDatagrams) {
     receiver.add(std::span(packet).subspan(12));
     if ((packet[1] & 0x80U) == 0) continue;
     const auto& units = camera.clip()->clip().access_units();
-    EXPECT_TRUE(receiver.take() == units[sent[i].picture % units.size()].as_delivered()) << sent[i].picture;
+    EXPECT_TRUE(receiver.take() == units[static_cast<std::size_t>(sent[i].picture % units.size())].as_delivered())
+        << sent[i].picture;
   }
   EXPECT_EQ(sent.back().picture, 259U);
 }
@@ -168,7 +169,7 @@ TEST(InterleavedCamera, EachSessionOfAConnectionHasChannelsOfItsOwn) {
   host.ask(kAsk.play(3, kFirstSession));
   host.ask(kAsk.play(4, kFirstSession + 1));
   ASSERT_TRUE(camera.sent().wait_for_finished(2, milliseconds(kPatience)));
-  host.take_packets(camera.sent().sent());
+  host.take_packets(static_cast<std::size_t>(camera.sent().sent()));
   std::set<int> channels;
   for (const auto& packet : host.packets) channels.insert(packet.channel);
   EXPECT_EQ(channels, (std::set<int>{0, 2}));
