@@ -167,7 +167,7 @@ class GetRecordingAction final : public PlaybackAction {
 
   std::optional<Problem> check() override {
     if (out_.empty()) return usage("--out names no file", "For instance: --out gap.mkv.");
-    if (const auto problem = target().check()) return problem;
+    if (auto problem = target().check()) return problem;
     return check_scale();
   }
 
