@@ -1,8 +1,15 @@
 # vexa_ffmpeg: FFmpeg's libraries, for the virtual camera's live pictures and vexactl's containers. Debian has them for the
 # machine's own word size; builds without them have no such target and no VEXA_WITH_FFMPEG, and work without those parts.
-find_package(PkgConfig QUIET)
-if(PKG_CONFIG_FOUND AND CMAKE_SIZEOF_VOID_P EQUAL 8)
-  pkg_check_modules(VEXA_FFMPEG QUIET IMPORTED_TARGET libavcodec libavformat libavutil libswscale)
+if(CMAKE_SIZEOF_VOID_P EQUAL 8)
+  if(VEXA_REQUIRE_ALL)
+    find_package(PkgConfig REQUIRED)
+    pkg_check_modules(VEXA_FFMPEG REQUIRED IMPORTED_TARGET libavcodec libavformat libavutil libswscale)
+  else()
+    find_package(PkgConfig QUIET)
+    if(PKG_CONFIG_FOUND)
+      pkg_check_modules(VEXA_FFMPEG QUIET IMPORTED_TARGET libavcodec libavformat libavutil libswscale)
+    endif()
+  endif()
 endif()
 if(VEXA_FFMPEG_FOUND)
   add_library(vexa_ffmpeg INTERFACE)

@@ -9,9 +9,7 @@ target_include_directories(vexa_objects PUBLIC
   $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/include> $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}>)
 target_link_libraries(vexa_objects PRIVATE vexa_warnings PUBLIC VexaCommonFilter Threads::Threads)
 
-if(VEXA_UNITY STREQUAL TOOLS)
-  set_target_properties(vexa_objects PROPERTIES UNITY_BUILD OFF)
-endif()
+vexa_batch(vexa_objects)
 
 add_library(vexa_testable STATIC $<TARGET_OBJECTS:vexa_objects>)
 target_include_directories(vexa_testable PUBLIC ${PROJECT_SOURCE_DIR}/include ${PROJECT_SOURCE_DIR})

@@ -1,22 +1,28 @@
-# Headers that most files of a target read, compiled once for each. Left out under a compiler cache, which would find
-# nothing to keep, and for the library itself, which is to see every warning.
-option(VEXA_PRECOMPILE "Precompile the headers that most tests read" ON)
-if(NOT VEXA_PRECOMPILE OR NOT VEXA_UNITY STREQUAL OFF OR CMAKE_CXX_COMPILER_LAUNCHER)
+# Headers of other libraries that most files of a target read, compiled once. The libraries that ship, and clang-tidy, go
+# without: there each file has to name what it uses.
+option(VEXA_PRECOMPILE "Precompile the headers that most files of the tests and tools read" ON)
+if(NOT VEXA_PRECOMPILE)
   return()
 endif()
 
-set(vexa_precompiled <algorithm> <chrono> <cstdint> <cstring> <map> <memory> <optional> <string> <string_view> <vector>)
+set(vexa_standard_headers <algorithm> <chrono> <cstdint> <cstring> <filesystem> <fstream> <functional> <map> <memory>
+  <optional> <string> <string_view> <thread> <vector>)
 # Through a precompiled header GCC 12 takes its own std::string for ours, and warns of it.
-set(vexa_false_alarms -Wno-array-bounds -Wno-restrict -Wno-stringop-overflow -Wno-stringop-overread)
-
-if(TARGET vexa_virtual_camera)
-  target_precompile_headers(vexa_virtual_camera PRIVATE <asio.hpp> <fmt/format.h> <functional> ${vexa_precompiled})
-  target_compile_options(vexa_virtual_camera PRIVATE ${vexa_false_alarms})
+set(vexa_false_alarms)
+if(CMAKE_CXX_COMPILER_ID STREQUAL GNU)
+  set(vexa_false_alarms -Wno-array-bounds -Wno-restrict -Wno-stringop-overflow -Wno-stringop-overread)
 endif()
-foreach(folder runtime transport media device filter models virtual_camera host contract)
-  if(TARGET ${folder}_tests)
-    target_precompile_headers(${folder}_tests PRIVATE
-      <gmock/gmock.h> <gtest/gtest.h> <fstream> <filesystem> <thread> ${vexa_precompiled})
-    target_compile_options(${folder}_tests PRIVATE ${vexa_false_alarms})
+
+function(vexa_precompile target)
+  if(TARGET ${target})
+    target_precompile_headers(${target} PRIVATE ${ARGN} ${vexa_standard_headers})
+    target_compile_options(${target} PRIVATE ${vexa_false_alarms})
   endif()
+endfunction()
+
+vexa_precompile(vexa_virtual_camera <asio.hpp> <fmt/format.h>)
+vexa_precompile(vexactl_parts <CLI/CLI.hpp> <fmt/format.h> <nlohmann/json.hpp>)
+vexa_precompile(vexactl <CLI/CLI.hpp> <fmt/format.h> <nlohmann/json.hpp>)
+foreach(folder runtime transport media device filter models virtual_camera host contract)
+  vexa_precompile(${folder}_tests <gmock/gmock.h> <gtest/gtest.h>)
 endforeach()

@@ -1,0 +1,2 @@
+// Asio's own code, compiled once for all files.
+#include <asio/impl/src.hpp>
