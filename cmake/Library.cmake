@@ -26,7 +26,7 @@ target_link_options(VexaCommon PRIVATE LINKER:--version-script=${vexa_version_sc
 if(NOT VEXA_SANITIZE)
   target_link_options(VexaCommon PRIVATE LINKER:-z,defs)
 endif()
-set_target_properties(VexaCommon PROPERTIES SOVERSION 1 VERSION 1.0.0 EXPORT_NAME Common
-  LINK_DEPENDS ${vexa_version_script})
+set_target_properties(VexaCommon PROPERTIES SOVERSION ${PROJECT_VERSION_MAJOR} VERSION ${PROJECT_VERSION}
+  EXPORT_NAME Common LINK_DEPENDS ${vexa_version_script})
 
 include(cmake/Install.cmake)

@@ -42,7 +42,8 @@ class Part {
   /// The same for a member that this part should have.
   [[nodiscard]] Complaint complain_of(const char* key, std::string text) const {
     const Part part = (*this)[key];
-    return {part ? part.node_->line : node_->line, part.path_, std::move(text)};
+    const Node* place = part ? part.node_ : node_;
+    return {place == nullptr ? 0 : place->line, part.path_, std::move(text)};
   }
 
  private:

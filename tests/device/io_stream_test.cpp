@@ -330,5 +330,31 @@ TEST_F(IoStream, LosesNoChangeInAnHourAndClearsTamperingOnceAMinute) {
   EXPECT_EQ(clears, 59);
 }
 
+/// A stream that another thread opens between the stop and the opening of a start.
+class OvertakenIoStart : public AlarmDriver {
+ public:
+  ELibDReturnCode StopIoStreaming() override {
+    const ELibDReturnCode result = AlarmDriver::StopIoStreaming();
+    if (m_IoStreamSocket == -1) m_IoStreamSocket = dup(other.driver_end());
+    return result;
+  }
+
+  StreamPair other;
+};
+
+TEST(IoStreamStart, LosesNoStreamThatAnotherThreadHasOpenedMeanwhile) {
+  const std::size_t before = open_descriptors();
+  {
+    AlarmCamera camera;
+    OvertakenIoStart driver;
+    camera.introduce(driver, 5000);
+    camera.set_inquiry("sensor", "Sensor1=1");
+    EXPECT_EQ(driver.StartIoStreaming(), LIBD_OK);
+    EXPECT_EQ(driver.AlarmDriver::StopIoStreaming(), LIBD_OK);
+    EXPECT_EQ(camera.closed_streams(1), 1U);
+  }
+  EXPECT_TRUE(eventually([&] { return open_descriptors() == before; })) << open_descriptors() << ' ' << before;
+}
+
 }  // namespace
 }  // namespace vexa_test

@@ -124,5 +124,30 @@ TEST_F(MetadataStream, IsTheHostsToStopBeforeItDestroysTheDriver) {
   close(socket);
 }
 
+/// A stream that another thread opens between the stop and the opening of a start.
+class OvertakenMetadataStart : public AlarmDriver {
+ public:
+  ELibDReturnCode StopModRawData() override {
+    const ELibDReturnCode result = AlarmDriver::StopModRawData();
+    if (m_MdStreamSocket == -1) m_MdStreamSocket = dup(other.driver_end());
+    return result;
+  }
+
+  StreamPair other;
+};
+
+TEST(MetadataStreamStart, LosesNoStreamThatAnotherThreadHasOpenedMeanwhile) {
+  const std::size_t before = open_descriptors();
+  {
+    AlarmCamera camera;
+    OvertakenMetadataStart driver;
+    camera.introduce(driver, 5000);
+    EXPECT_EQ(driver.StartModRawData(), LIBD_OK);
+    EXPECT_EQ(driver.AlarmDriver::StopModRawData(), LIBD_OK);
+    EXPECT_EQ(camera.closed_streams(1), 1U);
+  }
+  EXPECT_TRUE(eventually([&] { return open_descriptors() == before; })) << open_descriptors() << ' ' << before;
+}
+
 }  // namespace
 }  // namespace vexa_test

@@ -5,6 +5,7 @@
 #include <string>
 #include <vector>
 
+#include "device/cgi/preset_text.h"
 #include "tests/device/ptz_reach.h"
 
 namespace {
@@ -34,6 +35,10 @@ ELibDReturnCode set_preset(PtzDriver& driver, int index, const std::string& name
   preset.index = index;
   preset.name = name;
   return driver.SetPreset(preset);
+}
+
+TEST(UnnamedPresets, OfANegativeCountAreNone) {
+  for (const int count : {0, -1, INT_MIN}) EXPECT_TRUE(vexa::unnamed_presets(count).empty()) << count;
 }
 
 std::string presets_path(const std::string& rest) { return "/command/presetposition.cgi?" + rest; }

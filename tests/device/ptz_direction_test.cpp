@@ -38,4 +38,12 @@ TEST(Directions, AreSentByTheirWords) {
   }
 }
 
+TEST(Directions, WithoutAWordAreNotSent) {
+  for (const int direction : {9, 15}) {
+    PtzPlay play({});
+    EXPECT_EQ(play.driver.SendPTZCommands(1, 1, static_cast<ELibDPanTiltDirection>(direction)), 1) << direction;
+    EXPECT_EQ(play.complaints(), "");
+  }
+}
+
 }  // namespace

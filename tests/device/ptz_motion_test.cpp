@@ -7,6 +7,7 @@
 #include <string>
 #include <vector>
 
+#include "device/cgi/ptz_text.h"
 #include "tests/device/ptz_reach.h"
 
 namespace {
@@ -88,6 +89,12 @@ void fit(PtzDriver& driver, const CameraUnits& camera) {
 constexpr int kSpeeds[] = {-10000, -9999, -5000, -1429, -417, -416, -101, -100, -99,  -50,  -1,   0,
                            1,      50,    99,    100,   101,  250,  416,  417,  5000, 9999, 10000};
 constexpr int kPositions[] = {0, 1, 2, 15, 16, 99, 100, 2499, 2500, 4999, 5000, 5001, 7777, 9998, 9999, 10000};
+TEST(MoveSpeed, HasASignThatCanBeTurnedUnderAnyLargestSpeed) {
+  EXPECT_EQ(vexa::move_speed(10000, INT_MIN), -INT_MAX);
+  EXPECT_EQ(vexa::move_speed(-10000, INT_MIN), -INT_MAX);
+  EXPECT_EQ(vexa::move_speed(10000, INT_MAX), INT_MAX);
+}
+
 constexpr int kNoSpeeds[] = {-10001, 10001, INT_MIN, INT_MAX};
 constexpr int kNoPositions[] = {-1, 10001, INT_MIN, INT_MAX};
 

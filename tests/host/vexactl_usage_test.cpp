@@ -40,7 +40,7 @@ TEST(CommandLine, HelpOfACommandListsItsOptions) {
 TEST(CommandLine, ShowsItsVersion) {
   const ProgramResult result = run({"--version"});
   EXPECT_EQ(result.exit_code, 0);
-  EXPECT_EQ(result.out, "vexactl 1.0.0\n");
+  EXPECT_EQ(result.out, "vexactl " VEXA_VERSION "\n");
 }
 
 struct Refusal {

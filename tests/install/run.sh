@@ -13,6 +13,7 @@ here=$(cd "$(dirname "$0")" && pwd)
 setting() { sed -nE "s/^$1:[A-Z]+=//p" "$build/CMakeCache.txt"; }
 flags=$(setting CMAKE_CXX_FLAGS)
 compiler=$(setting CMAKE_CXX_COMPILER)
+version=$(setting CMAKE_PROJECT_VERSION)
 
 place=$(mktemp -d)
 trap 'rm -rf "$place"' EXIT
@@ -34,7 +35,7 @@ cmake --build "$place/host" >"$place/build.log" || fail "$(cat "$place/build.log
 
 echo "-- a host that finds it with pkg-config"
 export PKG_CONFIG_PATH=$libraries/pkgconfig
-[[ $(pkg-config --modversion vexa-common) == 1.0.0 ]] || fail "vexa-common has another version"
+[[ $(pkg-config --modversion vexa-common) == "$version" ]] || fail "vexa-common has another version than $version"
 # The flags are words to the shell: that is what pkg-config and CMAKE_CXX_FLAGS hold.
 # shellcheck disable=SC2046,SC2086
 "$compiler" $flags -std=c++14 "$here/host/installed_host.cpp" -o "$place/plain_host" \
