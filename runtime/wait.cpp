@@ -1,8 +1,6 @@
 // Waiting on events with one poll; the signal stays in the pipe.
 #include <poll.h>
 
-#include <cerrno>
-#include <chrono>
 #include <cstddef>
 #include <cstdint>
 #include <memory>
@@ -12,8 +10,6 @@
 #include "runtime/handle.h"
 
 namespace {
-
-using Clock = std::chrono::steady_clock;
 
 // The events of one wait, in the order of their handles. Null handles have no entry.
 struct Entries {
@@ -37,21 +33,6 @@ std::optional<Entries> entries_of(unsigned long count, typedHandle* const* handl
   return entries;
 }
 
-// Milliseconds left, rounded up so that no wait ends early.
-int left_until(Clock::time_point deadline) {
-  const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - Clock::now()).count();
-  return left > 0 ? static_cast<int>(left) : 0;
-}
-
-// One poll that a signal handler does not cut short; a negative time-out is none.
-void poll_through_signals(Entries& entries, int timeout_ms) {
-  const auto deadline = Clock::now() + std::chrono::milliseconds(timeout_ms);
-  // Kept: a poll that fails otherwise counts as one that found nothing; hosts see WAIT_TIMEOUT, not WAIT_FAILED.
-  while (poll(entries.list.get(), entries.count, timeout_ms) < 0 && errno == EINTR) {
-    if (timeout_ms > 0) timeout_ms = left_until(deadline);
-  }
-}
-
 }  // namespace
 
 unsigned long WaitForMultipleObjects(unsigned long count, typedHandle* const* handles, int waitAll,
@@ -59,8 +40,10 @@ unsigned long WaitForMultipleObjects(unsigned long count, typedHandle* const* ha
   if (waitAll != 0) return WAIT_FAILED;
   std::optional<Entries> entries = entries_of(count, handles);
   if (!entries) return WAIT_FAILED;
+  // Kept: a signal handler that runs meanwhile ends the wait as a time-out, however much time is left.
+  // Kept: a poll that fails counts as one that found no signal; hosts see WAIT_TIMEOUT, not WAIT_FAILED.
   // Kept: the number goes to poll as a signed one, so that everything from 0x80000000 on waits without limit.
-  poll_through_signals(*entries, static_cast<int>(static_cast<std::uint32_t>(timeoutMs)));
+  poll(entries->list.get(), entries->count, static_cast<int>(static_cast<std::uint32_t>(timeoutMs)));
   // Safe: after the wait no record is read any more, so a handle that was closed meanwhile is not touched again.
   nfds_t entry = 0;
   for (unsigned long i = 0; i < count && entry < entries->count; ++i) {

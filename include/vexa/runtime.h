@@ -180,8 +180,9 @@ VEXA_API int ResetEvent(typedHandle* h);
 /// @return 1 on success; 0 for null, another kind, and when the system reports an error in closing.
 VEXA_API int CloseEventHandle(typedHandle* h);
 
-/// Waits until one of `count` events is signalled. The signal stays. A signal handler that runs meanwhile does not end
-/// the wait. Null entries count as positions and are otherwise skipped; without any event the call is a sleep.
+/// Waits until one of `count` events is signalled. The signal stays. A signal handler that runs in the waiting thread
+/// ends the wait early, as WAIT_TIMEOUT. Null entries count as positions and are otherwise skipped; without any event
+/// the call is a sleep.
 /// @param handles `count` handles, all of them null or events.  @param waitAll 0.
 /// @param timeoutMs milliseconds; 0 only looks, from 0x80000000 on (INFINITE) there is no limit.
 /// @return the lowest index of a signalled event; WAIT_TIMEOUT when there is none; WAIT_FAILED, without waiting, when

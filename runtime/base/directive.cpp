@@ -1,6 +1,7 @@
 #include "runtime/base/directive.h"
 
 #include <algorithm>
+#include <climits>
 
 namespace vexa {
 namespace {
@@ -16,17 +17,24 @@ std::string_view take_while(std::string_view& text, std::string_view set) {
 }
 
 std::size_t bounded_number(std::string_view digits) {
-  std::size_t number = 0;
+  std::uint64_t number = 0;
   for (const char digit : digits) {
-    number = std::min(number * 10 + static_cast<std::size_t>(digit - '0'), kDirectiveTextLimit);
+    number = std::min<std::uint64_t>(number * 10 + static_cast<std::uint64_t>(digit - '0'), INT_MAX);
   }
-  return number;
+  return static_cast<std::size_t>(number);
 }
 
-std::string padded(std::string text, const FieldFlags& flags) {
-  if (text.size() >= flags.width) return text;
-  text.insert(flags.left ? text.size() : 0, flags.width - text.size(), ' ');
-  return text;
+/// As many of `count` characters as the longest text holds.
+std::string run_of(std::size_t count, char character) {
+  return std::string(std::min(count, kDirectiveTextLimit), character);
+}
+
+// Kept: a field wider than the longest text keeps its front, which may be padding alone, as printf fills a full buffer.
+std::string padded(const std::string& before, std::size_t zeros, const std::string& digits, const FieldFlags& flags) {
+  const std::size_t length = before.size() + zeros + digits.size();
+  const std::string blanks = run_of(flags.width > length ? flags.width - length : 0, ' ');
+  const std::string text = before + run_of(zeros, '0') + digits;
+  return (flags.left ? text + blanks : blanks + text).substr(0, kDirectiveTextLimit);
 }
 
 /// Takes one directive, whose "%" is gone already, from the front of `rest`.
@@ -66,12 +74,11 @@ std::string number_field(std::int64_t value, const FieldFlags& flags) {
   if (flags.precision == std::size_t{0} && value == 0) digits.clear();
   std::size_t least = flags.precision.value_or(0);
   if (flags.zeros && !flags.left && !flags.precision && flags.width > sign.size()) least = flags.width - sign.size();
-  if (digits.size() < least) digits.insert(0, least - digits.size(), '0');
-  return padded(sign + digits, flags);
+  return padded(sign, least > digits.size() ? least - digits.size() : 0, digits, flags);
 }
 
 std::string text_field(std::string_view text, const FieldFlags& flags) {
-  return padded(std::string(text.substr(0, flags.precision.value_or(text.size()))), flags);
+  return padded("", 0, std::string(text.substr(0, flags.precision.value_or(text.size()))), flags);
 }
 
 std::string two_digits(std::int64_t value) { return number_field(value, {.zeros = true, .width = 2, .precision = {}}); }

@@ -25,13 +25,13 @@ struct FieldFlags {
   std::optional<std::size_t> precision;
 };
 
-/// Reads the characters "#-.0123456789" as printf does; nothing when printf has no meaning for them. Widths beyond the
-/// longest text count as that.
+/// Reads the characters "#-.0123456789" as printf does; nothing when printf has no meaning for them. Numbers
+/// above INT_MAX count as INT_MAX.
 std::optional<FieldFlags> parse_field_flags(std::string_view text);
 
-/// The number as printf writes it with these flags and "d".
+/// The number as printf writes it with these flags and "d", its first kDirectiveTextLimit characters.
 std::string number_field(std::int64_t value, const FieldFlags& flags);
-/// The text as printf writes it with these flags and "s".
+/// The text as printf writes it with these flags and "s", its first kDirectiveTextLimit characters.
 std::string text_field(std::string_view text, const FieldFlags& flags);
 
 /// At least two or four digits, zeros in front.

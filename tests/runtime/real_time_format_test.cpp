@@ -149,6 +149,18 @@ TEST(RealTimeFormat, CopyingStopsAfter241CharactersAndCutsAt255) {
   EXPECT_EQ(kMarch5.Format((std::string(241, 'x') + "%A").c_str(), true), std::string(241, 'x'));
 }
 
+TEST(RealTimeFormat, APieceWiderThanTheRoomIsCutToWhatFits) {
+  const InZone zone("UTC");
+  const struct {
+    const char* format;
+    std::string text;
+  } cases[] = {{"%1000d", std::string(255, ' ')},          {"%1000A", std::string(255, ' ')},
+               {"%255d", std::string(254, ' ') + "5"},     {"%256d", std::string(255, ' ')},
+               {"%-1000d", "5" + std::string(254, ' ')},   {"%01000d", std::string(255, '0')},
+               {"ab%1000d", "ab" + std::string(253, ' ')}, {"ab%253dcd", "ab" + std::string(252, ' ') + "5"}};
+  for (const auto& c : cases) EXPECT_EQ(kMarch5.Format(c.format, true), c.text) << c.format;
+}
+
 TEST(RealTimeFormat, RandomFormatsNeverPassTheLimit) {
   std::mt19937 random(20260305);
   const std::string alphabet = "%%%%%#-.0123456789AaBbNnYyOoDdHhMmSsLlWwGgXxqz \n";

@@ -92,6 +92,31 @@ TEST(Directive, WidthsAreBoundedByTheLongestText) {
   EXPECT_EQ(number_with("254", 1).size(), 254U);
 }
 
+TEST(Directive, AFieldWiderThanTheLongestTextIsCutAtItsEnd) {
+  const std::string blanks(kDirectiveTextLimit, ' ');
+  const std::string zeros(kDirectiveTextLimit, '0');
+  const struct {
+    const char* flags;
+    std::string text;
+  } cases[] = {{"255", blanks.substr(2) + "-7"},
+               {"256", blanks.substr(1) + "-"},
+               {"257", blanks},
+               {"1000", blanks},
+               {"2147483647", blanks},
+               {"99999999999999999999999", blanks},
+               {"-1000", "-7" + blanks.substr(2)},
+               {"01000", "-" + zeros.substr(1)},
+               {".1000", "-" + zeros.substr(1)},
+               {"1000.600", blanks},
+               {"-1000.600", "-" + zeros.substr(1)},
+               {"700.600", blanks.substr(156) + "-" + zeros.substr(100)},
+               {"-700.100", "-" + zeros.substr(156) + "7" + blanks.substr(101)}};
+  for (const auto& c : cases) EXPECT_EQ(number_with(c.flags, -7), c.text) << c.flags;
+  EXPECT_EQ(text_with("1000", "maart"), blanks);
+  EXPECT_EQ(text_with("258", "maart"), blanks.substr(2) + "ma");
+  EXPECT_EQ(text_with("-1000.2", "maart"), "ma" + blanks.substr(2));
+}
+
 TEST(Directive, TwoAndFourDigitsGrowWithTheNumber) {
   EXPECT_EQ(two_digits(7), "07");
   EXPECT_EQ(two_digits(100), "100");
@@ -144,7 +169,7 @@ TEST(Directive, ALongRunOfFlagsIsCutToo) {
   const std::string run = "%" + std::string(100000, '5');
   EXPECT_EQ(expand((run + "q").c_str()), run.substr(0, 255));
   EXPECT_EQ(expand(run.c_str()), run.substr(0, 255));
-  EXPECT_EQ(expand((run + "n").c_str()), std::string(254, ' ') + "7");
+  EXPECT_EQ(expand((run + "n").c_str()), std::string(255, ' '));
   EXPECT_EQ(expand(("%" + std::string(100000, '0') + "2n").c_str()), "07");
 }
 
