@@ -10,6 +10,7 @@ target_include_directories(vexa_objects PUBLIC
 target_link_libraries(vexa_objects PRIVATE vexa_warnings PUBLIC VexaCommonFilter Threads::Threads)
 
 vexa_batch(vexa_objects)
+vexa_check_locks(vexa_objects)
 
 add_library(vexa_testable STATIC $<TARGET_OBJECTS:vexa_objects>)
 target_include_directories(vexa_testable PUBLIC ${PROJECT_SOURCE_DIR}/include ${PROJECT_SOURCE_DIR})

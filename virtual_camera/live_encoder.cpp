@@ -118,9 +118,9 @@ void copy_plane(const std::uint8_t* from, int width, int height, std::uint8_t* t
 
 struct LiveEncoder::Parts {
   struct Free {
-    void operator()(AVCodecContext* context) const { avcodec_free_context(&context); }
-    void operator()(AVFrame* frame) const { av_frame_free(&frame); }
-    void operator()(AVPacket* packet) const { av_packet_free(&packet); }
+    void operator()(AVCodecContext* freed) const { avcodec_free_context(&freed); }
+    void operator()(AVFrame* freed) const { av_frame_free(&freed); }
+    void operator()(AVPacket* freed) const { av_packet_free(&freed); }
   };
 
   LiveCodec codec = LiveCodec::kH264;
