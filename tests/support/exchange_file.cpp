@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <filesystem>
 #include <fstream>
+#include <iterator>
 #include <sstream>
 #include <stdexcept>
 #include <string_view>
@@ -63,6 +64,22 @@ std::pair<std::string, std::string> key_and_value(const std::string& line) {
   return {line.substr(0, blank), unescaped(std::string_view(line).substr(blank + 1))};
 }
 
+constexpr std::string_view kKnownConditions[] = {"call", "timeout", "playback", "scale", "no_teardown"};
+constexpr std::string_view kKnownResults[] = {"result",  "answer",  "code",   "text", "cseq",
+                                              "session", "seconds", "micros", "rate"};
+
+/// A line that no test looks at would promise what nobody holds.
+template <std::size_t kCount>
+void take_entry(const std::string& line, const std::string_view (&known)[kCount],
+                std::map<std::string, std::string>& entries) {
+  if (line.empty()) return;
+  const auto entry = key_and_value(line);
+  if (std::find(std::begin(known), std::end(known), entry.first) == std::end(known)) {
+    throw std::runtime_error("unknown key <" + entry.first + ">");
+  }
+  if (!entries.insert(entry).second) throw std::runtime_error("<" + entry.first + "> twice");
+}
+
 class Reader {
  public:
   ExchangeFile read(std::istream& file) {
@@ -93,8 +110,7 @@ class Reader {
   void take_content(const std::string& line) {
     switch (section_) {
       case Section::kBefore:
-        if (!line.empty()) exchange_.before.insert(key_and_value(line));
-        return;
+        return take_entry(line, kKnownConditions, exchange_.before);
       case Section::kExpected:
         exchange_.script.back().expected += unescaped(line);
         return;
@@ -102,8 +118,7 @@ class Reader {
         exchange_.script.back().answer += unescaped(line);
         return;
       case Section::kResults:
-        if (!line.empty()) exchange_.results.insert(key_and_value(line));
-        return;
+        return take_entry(line, kKnownResults, exchange_.results);
     }
   }
 
@@ -116,7 +131,11 @@ class Reader {
 ExchangeFile read_exchange(const std::string& path) {
   std::ifstream file(path);
   if (!file) throw std::runtime_error("cannot read " + path);
-  return Reader().read(file);
+  try {
+    return Reader().read(file);
+  } catch (const std::exception& error) {
+    throw std::runtime_error(path + ": " + error.what());
+  }
 }
 
 std::vector<std::string> exchange_names(const std::string& folder) {

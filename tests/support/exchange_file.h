@@ -27,7 +27,7 @@ struct ExchangeFile {
   std::map<std::string, std::string> results;
 };
 
-/// Reads a file of tests/data; throws when it is not written as above.
+/// Reads a file of tests/data; throws when it is not written as above, or has a key that no test knows.
 ExchangeFile read_exchange(const std::string& path);
 
 /// The names of the exchange files in a folder, sorted, without ".txt".

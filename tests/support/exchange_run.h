@@ -3,6 +3,8 @@
 
 #include <gtest/gtest.h>
 
+#include <map>
+#include <set>
 #include <string>
 
 #include "tests/support/exchange_file.h"
@@ -11,7 +13,8 @@
 
 namespace vexa_test {
 
-/// A test of every file in a folder of tests/data/exchanges. The driver's latest error is soiled before.
+/// A test of every file in a folder of tests/data/exchanges. The driver's latest error is soiled before. A line of the
+/// file that the test has not looked at fails it.
 class ExchangeTest : public testing::TestWithParam<std::string> {
  protected:
   explicit ExchangeTest(const std::string& folder)
@@ -20,12 +23,26 @@ class ExchangeTest : public testing::TestWithParam<std::string> {
     descriptors_ = open_descriptors();
   }
 
-  std::string before(const std::string& key, const std::string& otherwise) const {
+  void TearDown() override {
+    for (const auto* entries : {&file_.before, &file_.results}) {
+      for (const auto& [key, value] : *entries) EXPECT_TRUE(read_.contains(key)) << "nobody looks at: " << key;
+    }
+  }
+
+  std::string before(const std::string& key, const std::string& otherwise) {
+    read_.insert(key);
     const auto found = file_.before.find(key);
     return found == file_.before.end() ? otherwise : found->second;
   }
 
-  void expect_result(const std::string& key, const std::string& actual) const {
+  /// Whether the file names `key` before the exchange.
+  bool has(const std::string& key) {
+    read_.insert(key);
+    return file_.before.contains(key);
+  }
+
+  void expect_result(const std::string& key, const std::string& actual) {
+    read_.insert(key);
     const auto expected = file_.results.find(key);
     if (expected == file_.results.end()) return;
     EXPECT_EQ(actual, expected->second) << key;
@@ -38,10 +55,13 @@ class ExchangeTest : public testing::TestWithParam<std::string> {
 
   void expect_nothing_left_open() const { EXPECT_EQ(open_descriptors(), descriptors_); }
 
-  ExchangeFile file_;
+  const Script& script() const { return file_.script; }
+
   TestDriver driver_;
 
  private:
+  const ExchangeFile file_;
+  std::set<std::string> read_;
   std::size_t descriptors_ = 0;
 };
 

@@ -8,6 +8,8 @@
 #include <chrono>
 #include <thread>
 
+#include "tests/support/process_state.h"
+
 namespace vexa_test {
 
 /// While it lives, the thread that made it gets SIGUSR1 every millisecond, without SA_RESTART.
@@ -33,8 +35,16 @@ class Interruptions {
   Interruptions(const Interruptions&) = delete;
   Interruptions& operator=(const Interruptions&) = delete;
 
-  /// Signals taken so far.
-  int count() const { return taken(); }
+  /// Does `work` until a signal has come during it; false when none does. The machine may be too busy to send one each
+  /// millisecond.
+  template <typename Work>
+  bool come_during(Work work) const {
+    return eventually([&work] {
+      const int before = taken();
+      work();
+      return taken() > before;
+    });
+  }
 
  private:
   static std::atomic<int>& taken() {

@@ -10,13 +10,15 @@ class HttpExchange : public ExchangeTest {
 };
 
 TEST_P(HttpExchange, GoesAsWritten) {
-  ScriptedCamera camera(file_.script);
-  driver_.use(camera.host(), camera.port(), std::stoi(before("timeout", "2000")));
+  ScriptedCamera camera(script());
+  driver_.use(camera.host(), camera.port(), std::stoi(before("timeout", "20000")));
   const std::string call = before("call", "");
   const std::string argument = call.substr(call.find(' ') + 1);
   std::string answer = "untouched";
-  const ELibDReturnCode result = call.starts_with("inquire ") ? driver_.SendInqCommand(argument, answer)
-                                                              : driver_.SendCommand("%s", argument.c_str());
+  const bool inquires = call.starts_with("inquire ");
+  ASSERT_TRUE(inquires || call.starts_with("command ")) << "no such call: " << call;
+  const ELibDReturnCode result =
+      inquires ? driver_.SendInqCommand(argument, answer) : driver_.SendCommand("%s", argument.c_str());
   EXPECT_EQ(camera.finish(), "");
   expect_result("result", std::to_string(result));
   expect_result("answer", answer);

@@ -107,8 +107,9 @@ TEST_F(RtpOverTcp, ABufferBelow65535BytesIsRefused) {
 TEST_F(RtpOverTcp, WaitsASecondForAPacketWhateverTheTimeout) {
   EXPECT_EQ(receive(65535, 0), 0);
   EXPECT_EQ(driver_.latest_error(), "0 from before");
-  std::thread late([this] {
-    std::this_thread::sleep_for(std::chrono::milliseconds(100));
+  const long reader = kernel_thread_id();
+  std::thread late([this, reader] {
+    EXPECT_TRUE(eventually([reader] { return is_sleeping(reader); }));
     pair_.say(interleaved(rtp_header() + "late"));
   });
   EXPECT_EQ(receive(65535, 0), 4);
@@ -224,7 +225,7 @@ class RtpOverTcpOpen : public RtpOverTcp {
 
 TEST_F(RtpOverTcpOpen, GivesTheSocketThatCarriesTheMedia) {
   ScriptedCamera camera(inside_the_connection("live_session"));
-  open(camera, 1000);
+  open(camera, 20000);
   EXPECT_NE(socket_, -1);
   EXPECT_EQ(driver_.m_StreamSocket, socket_);
   EXPECT_EQ(driver_.m_RtspSocket, -1);
@@ -269,7 +270,7 @@ TEST_F(RtpOverTcpOpen, FailsWhenAnyOneAllocationDoesAndLeavesNoSocket) {
   int failures = 0;
   for (; happened && failures < 1000; ++failures) {
     ScriptedCamera camera(inside_the_connection("live_session"));
-    driver_.use(camera.host(), camera.port(), 1000);
+    driver_.use(camera.host(), camera.port(), 20000);
     int socket = -1;
     {
       const AllocationFailure failure(failures);
@@ -291,7 +292,7 @@ TEST_F(RtpOverTcpOpen, NeedsAClock) {
   Script script = inside_the_connection("no_clock");
   script.resize(1);
   ScriptedCamera camera(script);
-  open(camera, 1000);
+  open(camera, 20000);
   EXPECT_EQ(socket_, -1);
   EXPECT_EQ(driver_.latest_error(), "0 clock= not found");
 }
@@ -300,7 +301,7 @@ TEST_F(RtpOverTcpOpen, CarriesTheScaleOfAPlayback) {
   ScriptedCamera camera(inside_the_connection("playback_at_scale_4"));
   driver_.m_EdgeStoragePlayback = true;
   driver_.m_PlaybackScale = 4;
-  open(camera, 1000);
+  open(camera, 20000);
   EXPECT_NE(socket_, -1);
   driver_.m_StreamSocket = -1;
 }
@@ -312,7 +313,7 @@ TEST_F(RtpOverTcpOpen, FailsAsTheOpenOverUdpDoesAndLeavesNoSocket) {
     ScriptedCamera camera(inside_the_connection(name));
     driver_.soil_latest_error();
     const auto timeout = file.before.find("timeout");
-    open(camera, timeout == file.before.end() ? 1000 : std::stoi(timeout->second));
+    open(camera, timeout == file.before.end() ? 20000 : std::stoi(timeout->second));
     EXPECT_EQ(socket_, -1) << name;
     EXPECT_EQ(driver_.m_StreamSocket, -1) << name;
     EXPECT_EQ(driver_.latest_error(), file.results.at("code") + " " + file.results.at("text")) << name;

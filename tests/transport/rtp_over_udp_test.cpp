@@ -1,16 +1,17 @@
 #include <gtest/gtest.h>
-#include <poll.h>
 #include <sys/resource.h>
 #include <sys/socket.h>
 #include <unistd.h>
 
 #include <fcntl.h>
 #include <array>
+#include <atomic>
 #include <csignal>
 #include <thread>
 #include <vector>
 
 #include "tests/media/media_driver.h"
+#include "tests/support/process_state.h"
 #include "vexa/runtime.h"
 
 namespace vexa_test {
@@ -155,13 +156,13 @@ TEST_F(RtpOverUdp, DatagramsOfEveryLengthAreTaken) {
 }
 
 TEST_F(RtpOverUdp, ADatagramThatComesDuringTheWaitIsTaken) {
-  std::thread late([this] {
-    pollfd none = {-1, 0, 0};
-    poll(&none, 1, 30);
+  const long reader = kernel_thread_id();
+  std::thread late([this, reader] {
+    EXPECT_TRUE(eventually([reader] { return is_sleeping(reader); }));
     send_datagram(kPacket);
   });
   SPacketInfo packet;
-  EXPECT_EQ(receive(packet, 5000), 14);
+  EXPECT_EQ(receive(packet, 20000), 14);
   late.join();
 }
 
@@ -173,23 +174,28 @@ TEST_F(RtpOverUdp, AStopEndsTheWaitAtOnceAndIsNoTimeOut) {
   EXPECT_EQ(driver_.LatestErrorText(), "from before");
 }
 
-void ignore_signal(int) {}
+std::atomic<int> signals_taken{0};
+
+void count_signal(int) { ++signals_taken; }
 
 TEST_F(RtpOverUdp, ASignalDoesNotEndTheWait) {
   struct sigaction action = {};
-  action.sa_handler = ignore_signal;
+  action.sa_handler = count_signal;
   sigaction(SIGUSR1, &action, nullptr);
   const pthread_t reader = pthread_self();
+  const long reader_id = kernel_thread_id();
   std::thread disturber([&] {
     for (int i = 0; i < 5; ++i) {
-      pollfd none = {-1, 0, 0};
-      poll(&none, 1, 10);
+      EXPECT_TRUE(eventually([reader_id] { return is_sleeping(reader_id); }));
+      const int before = signals_taken;
       pthread_kill(reader, SIGUSR1);
+      EXPECT_TRUE(eventually([before] { return signals_taken > before; }));
     }
+    EXPECT_TRUE(eventually([reader_id] { return is_sleeping(reader_id); }));
     send_datagram(kPacket);
   });
   SPacketInfo packet;
-  EXPECT_EQ(receive(packet, 5000), 14);
+  EXPECT_EQ(receive(packet, 60000), 14);
   disturber.join();
 }
 

@@ -9,8 +9,8 @@ class RtspExchange : public ExchangeTest {
   RtspExchange() : ExchangeTest("rtsp") {
     driver_.m_RangeClockSeconds = 77;
     driver_.m_RangeClockMicros = 78;
-    driver_.m_NoTearDown = file_.before.contains("no_teardown");
-    driver_.m_EdgeStoragePlayback = file_.before.contains("playback");
+    driver_.m_NoTearDown = has("no_teardown");
+    driver_.m_EdgeStoragePlayback = has("playback");
     driver_.m_PlaybackScale = std::stoi(before("playback", before("scale", "1")));
   }
 
@@ -23,15 +23,17 @@ class RtspExchange : public ExchangeTest {
 };
 
 TEST_P(RtspExchange, GoesAsWritten) {
-  ScriptedCamera camera(file_.script);
-  driver_.use(camera.host(), camera.port(), std::stoi(before("timeout", "1000")));
+  const std::string call = before("call", "");
+  ASSERT_TRUE(call == "open" || call == "close") << "no such call: " << call;
+  ScriptedCamera camera(script());
+  driver_.use(camera.host(), camera.port(), std::stoi(before("timeout", "20000")));
   testing::internal::CaptureStdout();
   driver_.m_RtspSocket =
       driver_.rtp_over_udp_open("rtsp://%s:%d/media/video%d", camera.host().c_str(), camera.port(), 1);
   std::string result = driver_.m_RtspSocket == -1 ? "-1" : "open";
   EXPECT_NE(driver_.m_StreamSocket, -1);
   expect_session();
-  if (before("call", "") == "close") {
+  if (call == "close") {
     driver_.rtp_over_udp_close();
     result = driver_.m_RtspSocket == -1 && driver_.m_StreamSocket == -1 ? "closed" : "still open";
   }

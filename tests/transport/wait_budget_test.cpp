@@ -83,8 +83,7 @@ TEST_F(WaitBudgetTest, PassesOverAStopDescriptorThatIsClosedOrHasNoWriter) {
 
 TEST_F(WaitBudgetTest, GoesOnAfterASignal) {
   const vexa_test::Interruptions interruptions;
-  EXPECT_EQ(WaitBudget(50).wait_readable(ends_[0]), 0);
-  EXPECT_GT(interruptions.count(), 0);
+  EXPECT_TRUE(interruptions.come_during([this] { EXPECT_EQ(WaitBudget(50).wait_readable(ends_[0]), 0); }));
 }
 
 }  // namespace
