@@ -20,6 +20,8 @@ using StreamClock = std::chrono::steady_clock;
 
 // A stream that its peer has held up this long goes on from here instead of sending the backlog.
 constexpr std::chrono::seconds kHeldUp{1};
+// How long a picture is held before it is asked for again.
+constexpr std::chrono::milliseconds kHold{1};
 constexpr std::size_t kSoundPieces = 50;  // a second
 constexpr std::string_view kImageStem = "/image";
 
@@ -195,7 +197,17 @@ void HttpConnection::stream() {
   }
   const StreamClock::duration late = StreamClock::now() - (stream_began_ + *due);
   if (late > kHeldUp) stream_began_ += late;
-  send_at(stream_began_ + *due, [this] { return stream_->take(); });
+  send_at(stream_began_ + *due, [this, due = *due] { return holds(due) ? std::string() : stream_->take(); });
+}
+
+// Whether the picture that is due stays. One that leaves late takes the schedule with it.
+bool HttpConnection::holds(std::chrono::nanoseconds due) {
+  const std::function<bool()>& hold = state().options.hold_pictures;
+  if (!hold || !stream_->begins_unit()) return false;
+  const bool held = hold();
+  const StreamClock::duration longer = held ? kHold : StreamClock::duration::zero();
+  stream_began_ = std::max(stream_began_, StreamClock::now() + longer - due);
+  return held;
 }
 
 void HttpConnection::wait_for_picture() {

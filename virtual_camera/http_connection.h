@@ -34,6 +34,7 @@ class HttpConnection : public Connection {
   std::optional<HttpStream> open_sound() const;
   HttpStreamOptions stream_options() const;
   void wait_for_picture();
+  bool holds(std::chrono::nanoseconds due);
 
   // The streams of alarm data and motion metadata: a part at each interval and, of alarm data, at each change.
   enum class Feed { kNone, kAlarms, kMetadata };

@@ -66,6 +66,8 @@ class HttpStream {
   [[nodiscard]] std::string head() const;
   // When the next piece leaves; nothing at the stream's end, or while its source has no picture.
   [[nodiscard]] std::optional<std::chrono::nanoseconds> next_due();
+  // Whether the next piece begins a picture or a piece of sound; only after next_due() has found one.
+  [[nodiscard]] bool begins_unit() const { return !made_; }
   // The next piece, made as it leaves; empty where a fault leaves nothing of it, or nothing is due.
   [[nodiscard]] std::string take();
   // Both at once, over empty pieces; nothing at the stream's end.

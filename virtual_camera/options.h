@@ -5,6 +5,7 @@
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -65,7 +66,11 @@ struct CameraOptions {
   std::vector<int> playback_scales = {1, 2, 4, -1};  // at which recordings are played; another is taken to the nearest
 
   double frames_per_second = 25;
-  double speed = 1;      // pace: 4 sends four times faster, with timestamps advancing by picture as at 1
+  double speed = 1;  // pace: 4 sends four times faster, with timestamps advancing by picture as at 1
+  // Asked on the camera's thread before each picture of a stream leaves; while it returns true the stream stands still,
+  // and goes on at its pace from there. For hosts in the same process, which must not lose a picture on a machine that
+  // is slow for a moment. Empty: never held.
+  std::function<bool()> hold_pictures;
   double ptz_speed = 1;  // pace of pan, tilt, zoom, focus and tours, on top of the pace of all
   std::uint32_t clock_rate = 90000;
   std::uint16_t start_sequence = 1;

@@ -11,6 +11,8 @@ namespace {
 
 // A camera that was kept from running this long goes on from here instead of sending the backlog.
 constexpr std::chrono::seconds kFarBehind{1};
+// How long a picture is held before it is asked for again.
+constexpr std::chrono::milliseconds kHold{1};
 // Of each datagram on an Ethernet: RTP, UDP and IPv4 headers; preamble, frame header, check sequence and gap.
 constexpr std::size_t kWireOverhead = 12 + 8 + 20 + 38;
 // Makes the seeds of a camera's sessions differ; the first session has the camera's own.
@@ -103,6 +105,15 @@ void RtpSender::slip_if_far_behind(Time event) {
   if (late > kFarBehind) started_ += late;
 }
 
+// Whether the picture that is due stays. One that leaves late takes the schedule with it: pictures do not catch up with
+// each other where somebody watches over their pace.
+bool RtpSender::holds(Time event) {
+  if (!state_->options.hold_pictures || !picture_.empty() || lane_->next_due() == event) return false;
+  const bool held = state_->options.hold_pictures();
+  started_ = std::max(started_, Clock::now() + (held ? kHold : Clock::duration::zero()) - event);
+  return held;
+}
+
 std::string RtpSender::user_data_of(const SourcePicture& picture) const {
   if (!stream_->format().takes_user_data) return {};
   const bool of_key_pictures = !state_->options.user_data.empty();
@@ -132,7 +143,7 @@ void RtpSender::offer_burst(Time now) {
 
 void RtpSender::run_event() {
   const std::optional<Time> now = next_event();
-  if (!now) return wait_for_next();
+  if (!now || holds(*now)) return wait_for_next();
   leaving_.clear();
   if (lane_->next_due() == now) {
     lane_->release_due(*now, leaving_);

@@ -41,6 +41,7 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
   void wait_for_source();
   [[nodiscard]] std::string user_data_of(const SourcePicture& picture) const;
   void begin_picture(Time now);
+  [[nodiscard]] bool holds(Time event);
   void run_event();
   void offer_burst(Time now);
   void slip_if_far_behind(Time event);

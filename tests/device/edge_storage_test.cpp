@@ -1,8 +1,8 @@
 // Recordings on the camera's card: what the driver asks and what it makes of the answers.
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <functional>
-#include <future>
 #include <string>
 #include <vector>
 
@@ -325,19 +325,20 @@ TEST(RecordRequests, WaitLongerThanTheConnectionAllowsAndPutTheTimeOutBack) {
       ScriptStep step = taken ? command(row.path) : refusal(row.path);
       step.piece = 9;
       step.pause = 30;
+      std::atomic<EdgeDriver*> driver{nullptr};
+      int seen = 0;
+      step.meanwhile = [&] {
+        const vexa::Guard guard(driver.load()->m_ConnectionLock);
+        seen = driver.load()->m_ConnectionInfo.timeout;
+      };
       EdgePlay play({step});
+      driver = &play.driver;
       play.driver.m_ConnectionInfo.timeout = 20;
       play.driver.m_SavedTimeout = 1234;
-      auto outcome = std::async(std::launch::async, [&] { return row.call(play.driver); });
-      int seen = 0;
-      while (outcome.wait_for(std::chrono::milliseconds(1)) != std::future_status::ready) {
-        const vexa::Guard guard(play.driver.m_ConnectionLock);
-        seen = std::max(seen, play.driver.m_ConnectionInfo.timeout);
-      }
-      EXPECT_EQ(outcome.get(), taken ? LIBD_OK : LIBD_UNAUTHORIZED) << row.path;
-      EXPECT_EQ(seen, row.timeout) << row.path;
+      EXPECT_EQ(row.call(play.driver), taken ? LIBD_OK : LIBD_UNAUTHORIZED) << row.path;
       EXPECT_EQ(play.driver.m_ConnectionInfo.timeout, 1234) << row.path;
       EXPECT_EQ(play.complaints(), "");
+      EXPECT_EQ(seen, row.timeout) << row.path;
     }
   }
 }

@@ -1,6 +1,7 @@
 // Exposure and image controls on the wire.
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <chrono>
 #include <climits>
 #include <future>
@@ -8,6 +9,7 @@
 #include <vector>
 
 #include "tests/device/settings_exchange.h"
+#include "tests/support/process_state.h"
 
 namespace {
 
@@ -322,8 +324,16 @@ TEST(ImageCache, LetsAReaderFinishBeforeASetterReturns) {
   for (const auto& row : rows) {
     Driver play({command(std::string("/command/camera.cgi?") + row.path)});
     play.driver.m_CameraInquiryLock.Lock();
-    auto set = std::async(std::launch::async, [&] { return row.set(play.driver); });
-    EXPECT_EQ(set.wait_for(std::chrono::milliseconds(50)), std::future_status::timeout) << row.path;
+    std::atomic<long> setter{0};
+    auto set = std::async(std::launch::async, [&] {
+      setter = vexa_test::kernel_thread_id();
+      return row.set(play.driver);
+    });
+    const auto has_returned = [&set] { return set.wait_for(std::chrono::seconds(0)) == std::future_status::ready; };
+    // The camera has taken the command: what the setter waits for is the lock.
+    EXPECT_TRUE(
+        vexa_test::eventually([&] { return has_returned() || (play.played() && vexa_test::is_sleeping(setter)); }));
+    EXPECT_FALSE(has_returned()) << row.path;
     play.driver.m_CameraInquiryLock.Unlock();
     EXPECT_EQ(set.get(), LIBD_OK);
     EXPECT_EQ(play.complaints(), "");

@@ -127,6 +127,8 @@ class Played {
  public:
   explicit Played(Script script) : camera_(std::move(script)) { driver.use(camera_.host(), camera_.port()); }
 
+  /// Whether every request has been made and every connection closed.
+  bool played() const { return camera_.played(); }
   /// What was not as written; ends the play.
   std::string complaints() { return camera_.finish(); }
 

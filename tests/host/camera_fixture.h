@@ -3,7 +3,6 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <cstdint>
 #include <memory>
@@ -12,17 +11,14 @@
 #include <vector>
 
 #include "tests/host/program_run.h"
+#include "tests/support/own_address.h"
 #include "virtual_camera/clip.h"
 #include "virtual_camera/virtual_camera.h"
 
 namespace vexa_test {
 
-// Loopback addresses that no other process of a parallel test run uses: four for each process, `index` 0 to 3.
-inline std::string own_address(unsigned index) {
-  const auto pid = static_cast<unsigned>(getpid());
-  return "127." + std::to_string(128 + (pid >> 14 & 127)) + "." + std::to_string(pid >> 6 & 255) + "." +
-         std::to_string((pid & 63) * 4 + index);
-}
+// Loopback addresses that no other process of a parallel test run uses.
+inline std::string own_address(unsigned index) { return own_loopback(index); }
 
 inline constexpr char kUser[] = "operator";
 inline constexpr char kPassword[] = "tr0ub4dor";

@@ -277,9 +277,10 @@ TEST_F(AudioStream, SilentLongerThanTheTimeoutTimesOutAtEveryPoll) {
 }
 
 TEST_F(AudioStream, WaitsASecondWhateverTheTimeout) {
-  driver_.use("127.0.0.1", 1, 10);
-  std::thread late([this] {
-    std::this_thread::sleep_for(std::chrono::milliseconds(100));
+  driver_.use("127.0.0.1", 1, 0);
+  const long reader = kernel_thread_id();
+  std::thread late([this, reader] {
+    EXPECT_TRUE(eventually([reader] { return is_sleeping(reader); }));
     pair_.say("late");
   });
   EXPECT_EQ(driver_.GetCurrentAudioFrame(frame_), LIBD_OK);

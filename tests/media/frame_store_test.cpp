@@ -3,12 +3,26 @@
 #include <gtest/gtest.h>
 
 #include <memory>
+#include <new>
 #include <vector>
+
+#include "tests/support/failing_new.h"
 
 namespace vexa {
 namespace {
 
 using Buffer = std::unique_ptr<unsigned char[]>;
+
+/// Whether no spare buffer of this size is left: taking one allocates.
+bool has_none(FrameStore& store, std::size_t capacity) {
+  const vexa_test::AllocationFailure failure(0);
+  try {
+    const Buffer taken(store.take(capacity));
+  } catch (const std::bad_alloc&) {
+    return failure.happened();
+  }
+  return false;
+}
 
 TEST(FrameStore, GivesTheBufferOfThatSizeThatCameBackLast) {
   FrameStore store;
@@ -27,7 +41,7 @@ TEST(FrameStore, PassesOverNull) {
   store.give_back(nullptr, 8);
   store.give_back(nullptr, 16);
   EXPECT_EQ(Buffer(store.take(8)).get(), spare) << "a null of a larger size does not make the others outgrown";
-  EXPECT_NE(Buffer(store.take(16)).get(), nullptr);
+  EXPECT_TRUE(has_none(store, 16));
 }
 
 TEST(FrameStore, KeepsFourSparesAndNoMore) {
@@ -40,6 +54,7 @@ TEST(FrameStore, KeepsFourSparesAndNoMore) {
     taken.emplace_back(store.take(8));
     EXPECT_EQ(taken.back().get(), buffers[i]);
   }
+  EXPECT_TRUE(has_none(store, 8));
 }
 
 TEST(FrameStore, DropsSmallerSparesWhenALargerOneComesBack) {
@@ -49,24 +64,27 @@ TEST(FrameStore, DropsSmallerSparesWhenALargerOneComesBack) {
   unsigned char* kept = large.get();
   store.give_back(large.release(), 1 << 20);
   EXPECT_EQ(Buffer(store.take(1 << 20)).get(), kept) << "there is room for it among four others";
+  EXPECT_TRUE(has_none(store, 8));
 }
 
 TEST(FrameStore, NeverGivesABufferOfAnotherSize) {
   FrameStore store;
-  store.give_back(new unsigned char[16], 16);
-  Buffer small(store.take(8));
-  Buffer large(store.take(32));
-  small[7] = large[31] = 1;  // address checkers see a buffer that is too short
-  Buffer spare(store.take(16));
-  spare[15] = 1;
+  Buffer first(store.take(16));
+  unsigned char* spare = first.get();
+  store.give_back(first.release(), 16);
+  for (const std::size_t other : {8U, 15U, 17U, 32U}) EXPECT_TRUE(has_none(store, other)) << other;
+  EXPECT_EQ(Buffer(store.take(16)).get(), spare);
 }
 
 TEST(FrameStore, ClearedItKeepsNothing) {
   FrameStore store;
   store.give_back(store.take(8), 8);
   store.clear();
-  store.give_back(store.take(16), 16);
-  EXPECT_NE(Buffer(store.take(16)).get(), nullptr);
+  EXPECT_TRUE(has_none(store, 8));
+  Buffer later(store.take(16));
+  unsigned char* kept = later.get();
+  store.give_back(later.release(), 16);
+  EXPECT_EQ(Buffer(store.take(16)).get(), kept) << "it goes on afterwards";
 }
 
 }  // namespace

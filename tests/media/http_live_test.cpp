@@ -1,8 +1,9 @@
 // Frames and sound from the HTTP streams of a virtual camera.
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <chrono>
-#include <cstdio>
+#include <ctime>
 #include <fstream>
 #include <iterator>
 #include <map>
@@ -14,6 +15,8 @@
 #include "tests/media/media_driver.h"
 #include "tests/media/video_ways.h"
 #include "tests/support/own_address.h"
+#include "tests/support/process_state.h"
+#include "tests/support/temporary_folder.h"
 #include "virtual_camera/virtual_camera.h"
 
 namespace vexa_test {
@@ -46,7 +49,8 @@ class HttpLive : public testing::Test {
   void run(const HttpWay& way, int timeout = 5000) {
     if (options_.image_path.empty()) options_.image_path = way.clip;
     options_.speed = std::string(way.codec) == "JPEG" ? kJpegPace : kPace;
-    camera_ = std::make_unique<vexa::camera::VirtualCamera>(options_);
+    camera_ = std::make_unique<vexa::camera::VirtualCamera>(held_by(pace_, options_));
+    driver_.keep_pace(pace_);
     ASSERT_TRUE(camera_->start()) << camera_->error();
     driver_.use(camera_->address(), camera_->http_port(), timeout);
     const vexa::Guard guard(driver_.m_ConnectionLock);
@@ -96,6 +100,7 @@ class HttpLive : public testing::Test {
   }
 
   CameraOptions options_;
+  const std::shared_ptr<KeptPace> pace_ = std::make_shared<KeptPace>();
   MediaDriver driver_;
   std::unique_ptr<vexa::camera::VirtualCamera> camera_;
   FrameTaker taker_;
@@ -145,7 +150,8 @@ TEST_F(HttpLive, TextBetweenThePartsIsPassedOver) {
 }
 
 TEST_F(HttpLive, PicturesOfAMegabyteKeepUp) {
-  const std::string path = testing::TempDir() + "megabyte_" + own_loopback(1) + ".mjpeg";
+  const TemporaryFolder folder;
+  const std::string path = folder / "megabyte.mjpeg";
   std::string large = picture(kJpegWay, 0);
   for (int i = 0; i < 15; ++i) large.insert(2, "\xff\xfe\xff\xff" + std::string(65533, 'x'));
   std::ofstream(path, std::ios::binary) << large;
@@ -156,11 +162,11 @@ TEST_F(HttpLive, PicturesOfAMegabyteKeepUp) {
   EXPECT_EQ(frames.size(), 50U);
   for (const TakenFrame& frame : frames) EXPECT_TRUE(frame.bytes == large);
   driver_.StopVideoStreaming();
-  std::remove(path.c_str());
 }
 
 TEST_F(HttpLive, ALargePartIsDroppedAndTakenAfterARestart) {
-  const std::string path = testing::TempDir() + "large_" + own_loopback(1) + ".mjpeg";
+  const TemporaryFolder folder;
+  const std::string path = folder / "large.mjpeg";
   std::string large = picture(kJpegWay, 0);
   for (int i = 0; i < 25; ++i) large.insert(2, "\xff\xfe\xff\xff" + std::string(65533, 'x'));
   std::ofstream(path, std::ios::binary) << picture(kJpegWay, 1) << large;
@@ -175,7 +181,6 @@ TEST_F(HttpLive, ALargePartIsDroppedAndTakenAfterARestart) {
   EXPECT_EQ(frames[1].bytes, large);
   EXPECT_EQ(frames[2].bytes, picture(kJpegWay, 1));
   driver_.StopVideoStreaming();
-  std::remove(path.c_str());
 }
 
 struct BrokenStream {
@@ -215,7 +220,26 @@ const BrokenStream kBrokenStreams[] = {
 
 INSTANTIATE_TEST_SUITE_P(Of, BrokenHttpLive, testing::ValuesIn(kBrokenStreams), name_of_broken_stream);
 
-class DisturbedHttpLive : public HttpLive, public testing::WithParamInterface<BrokenStream> {};
+std::atomic<std::time_t> disturbed_now{0};
+
+class DisturbedHttpLive : public HttpLive, public testing::WithParamInterface<BrokenStream> {
+ protected:
+  DisturbedHttpLive() {
+    disturbed_now = 1000;
+    driver_.state().now = [] { return disturbed_now.load(); };
+  }
+
+  /// Polls, while the driver's clock runs, until the stream gives a frame or says that it has been silent too long.
+  ELibDReturnCode next_outcome(TakenFrame& frame) {
+    ELibDReturnCode code = LIBD_NO_FRAME;
+    eventually([&] {
+      code = taker_.take(driver_, frame);
+      if (code == LIBD_NO_FRAME) ++disturbed_now;
+      return code != LIBD_NO_FRAME;
+    });
+    return code;
+  }
+};
 
 TEST_P(DisturbedHttpLive, IsReadUpToTheFaultAgainAfterARestart) {
   const BrokenStream& disturbed = GetParam();
@@ -224,12 +248,11 @@ TEST_P(DisturbedHttpLive, IsReadUpToTheFaultAgainAfterARestart) {
   for (int round = 0; round < 2; ++round) {
     ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
     expect_frames(disturbed.way, 2);
-    TakenFrame frame;
-    for (int polls = 0; polls < 200; ++polls) {
-      if (taker_.take(driver_, frame) == LIBD_OK) {
-        EXPECT_LE(frame.bytes.size(), 1200000U);
-      }
-      std::this_thread::sleep_for(std::chrono::milliseconds(1));
+    for (int outcome = 0; outcome < 2; ++outcome) {
+      TakenFrame frame;
+      const ELibDReturnCode code = next_outcome(frame);
+      EXPECT_TRUE(code == LIBD_OK || code == LIBD_TIMEOUT) << code;
+      EXPECT_LE(frame.bytes.size(), 1200000U);
     }
   }
   EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_OK);

@@ -1,6 +1,9 @@
 // Streams of which packets are lost, sent twice or out of order.
 #include <gtest/gtest.h>
 
+#include <chrono>
+#include <iterator>
+#include <string>
 #include <thread>
 #include <vector>
 
@@ -49,20 +52,24 @@ WholeFrames take_from_queue(LiveCamera& camera, MediaDriver& driver) {
 
 /// Without the frame queue, which drops JPEG pictures of a host that is slow for a moment.
 WholeFrames take_from_assembly(LiveCamera& camera, MediaDriver& driver) {
-  constexpr int kPatience = 500;  // milliseconds: longer than a picture is ever held back
-  driver.use(camera->address(), camera->http_port(), kPatience);
   EXPECT_TRUE(driver.OpenLiveRtp(1));
+  driver.use(camera->address(), camera->http_port(), 500);  // of a read: longer than a picture is ever held back
   std::vector<unsigned char> buffer(1200000);
   WholeFrames frames;
-  for (;;) {
-    const bool finished = camera->sent().finished_streams() != 0;
+  const auto read = [&] {
     CVexaCommon::VideoFrameInfo frame;
     frame.data = buffer.data();
     frame.capacity = static_cast<unsigned int>(buffer.size());
     const ELibDReturnCode code = driver.GetRtpCurrentVideoFrame(driver.StreamCodec(), frame);
     if (code == LIBD_OK) frames.emplace_back(buffer.begin(), buffer.begin() + frame.length);
-    if (code != LIBD_OK && finished) return frames;
-  }
+    return code;
+  };
+  while (camera->sent().finished_streams() == 0) read();
+  const std::size_t wanted = predicted(camera, camera->sent().snapshot()).size();
+  const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(20);
+  while (frames.size() < wanted && std::chrono::steady_clock::now() < end) read();
+  read();  // one more when there is one too many
+  return frames;
 }
 
 class Impaired : public testing::TestWithParam<Impairment> {
@@ -113,7 +120,18 @@ TEST_P(Impaired, OtherCodecsDeliverEveryWholePictureOnceInOrderAndNoDamagedOne) 
                                                     {2, "sliced.mjpeg", 900, take_from_assembly}});
 }
 
-INSTANTIATE_TEST_SUITE_P(All, Impaired, testing::ValuesIn(kImpairments),
+/// A row plays its streams as slowly as in life where the address sanitizer leaves hosts little time, which is half a
+/// minute a row: there the worst loss and the mixture run, which take every path of the assembly. The native build runs
+/// all.
+std::vector<Impairment> impairments_to_run() {
+#if defined(__SANITIZE_ADDRESS__)
+  return {kImpairments[3], kImpairments[7]};
+#else
+  return {std::begin(kImpairments), std::end(kImpairments)};
+#endif
+}
+
+INSTANTIATE_TEST_SUITE_P(All, Impaired, testing::ValuesIn(impairments_to_run()),
                          [](const auto& tested) { return tested.param.name; });
 
 }  // namespace

@@ -6,6 +6,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <utility>
 
 #include "tests/media/media_driver.h"
 #include "tests/media/pace.h"
@@ -25,10 +26,17 @@ inline vexa::camera::CameraOptions camera_options(unsigned index = 0) {
   return options;
 }
 
-/// Starts in its constructor; the port of RTSP is 554, where drivers look for it.
+/// The options of a camera whose streams stand still while a driver that keeps `pace` is behind.
+inline vexa::camera::CameraOptions held_by(const std::shared_ptr<KeptPace>& pace, vexa::camera::CameraOptions options) {
+  options.hold_pictures = [pace] { return pace->is_behind(); };
+  return options;
+}
+
+/// Starts in its constructor; the port of RTSP is 554, where drivers look for it. It sends no faster than the hosts of
+/// the drivers that were introduced to it take their frames.
 class LiveCamera {
  public:
-  explicit LiveCamera(const vexa::camera::CameraOptions& options) : camera_(options) {
+  explicit LiveCamera(vexa::camera::CameraOptions options) : camera_(held_by(pace_, std::move(options))) {
     EXPECT_TRUE(camera_.start()) << camera_.error();
   }
   vexa::camera::VirtualCamera* operator->() { return &camera_; }
@@ -36,6 +44,7 @@ class LiveCamera {
   void introduce(MediaDriver& driver, int timeout = 5000) {
     driver.use(camera_.address(), camera_.http_port(), timeout);
     driver.use_live(codec_name());
+    driver.keep_pace(pace_);
   }
 
   bool is_key(std::uint64_t index) const { return camera_.clip()->is_key(place(index)); }
@@ -76,6 +85,7 @@ class LiveCamera {
   }
 
  private:
+  const std::shared_ptr<KeptPace> pace_ = std::make_shared<KeptPace>();
   vexa::camera::VirtualCamera camera_;
 };
 

@@ -1,7 +1,12 @@
 // The driver with its streaming members in reach, and a host that takes its frames.
 #pragma once
 
+#include <sys/ioctl.h>
+
+#include <algorithm>
 #include <chrono>
+#include <memory>
+#include <mutex>
 #include <string>
 #include <thread>
 #include <vector>
@@ -10,8 +15,55 @@
 
 namespace vexa_test {
 
+class MediaDriver;
+
+/// The drivers that a camera must not run ahead of. A camera sends by the clock, and a driver whose host is kept from
+/// running drops frames: with this a test loses none, however slow the machine is for a moment. Any thread.
+class KeptPace {
+ public:
+  /// Whether one of them has not taken what came.
+  bool is_behind();
+
+  void join(MediaDriver& driver) {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    drivers_.push_back(&driver);
+  }
+  void leave(MediaDriver& driver) {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    drivers_.erase(std::remove(drivers_.begin(), drivers_.end(), &driver), drivers_.end());
+  }
+
+ private:
+  std::mutex mutex_;
+  std::vector<MediaDriver*> drivers_;
+};
+
 class MediaDriver : public TestDriver {
  public:
+  MediaDriver() = default;
+  ~MediaDriver() override {
+    for (const auto& pace : paces_) pace->leave(*this);
+  }
+
+  /// From here on the camera that asks `pace` waits for this driver's host.
+  void keep_pace(const std::shared_ptr<KeptPace>& pace) {
+    if (std::find(paces_.begin(), paces_.end(), pace) != paces_.end()) return;
+    paces_.push_back(pace);
+    pace->join(*this);
+  }
+
+  /// Whether frames wait for the host, or bytes for the streaming thread. Any thread.
+  bool is_behind() {
+    constexpr std::size_t kFewFrames = 3;
+    {
+      const vexa::Guard guard(m_FrameQueueLock);
+      if (m_FrameQueue.size() >= kFewFrames) return true;
+    }
+    const vexa::Guard guard(m_VideoStateLock);
+    int unread = 0;
+    return m_StreamSocket != -1 && ioctl(m_StreamSocket, FIONREAD, &unread) == 0 && unread > 0;
+  }
+
   /// Live video over RTP from the camera that `use` named.
   void use_live(const std::string& codec) {
     const vexa::Guard guard(m_ConnectionLock);
@@ -61,7 +113,15 @@ class MediaDriver : public TestDriver {
   using CVexaCommon::StreamCodec;
   using CVexaCommon::StreamingThread;
   using CVexaCommon::TakeCameraPosition;
+
+ private:
+  std::vector<std::shared_ptr<KeptPace>> paces_;
 };
+
+inline bool KeptPace::is_behind() {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  return std::any_of(drivers_.begin(), drivers_.end(), [](MediaDriver* driver) { return driver->is_behind(); });
+}
 
 /// A frame as the host got it.
 struct TakenFrame {

@@ -135,11 +135,11 @@ struct RefusalCase {
 
 TEST(VideoStreaming, AFailedStartGivesItsCodeAndClosesEverything) {
   const RefusalCase cases[] = {
-      {"keep-alive set-up refused", RequestFault::status("RTSPTimeout", "500 No"), 1000, LIBD_FAILED, "No"},
-      {"keep-alive inquiry refused", RequestFault::status("inq=edgestorage", "401 Who"), 1000, LIBD_FAILED, "Who"},
-      {"session refused", RequestFault::status("DESCRIBE", "404 Gone"), 1000, LIBD_STREAM_OPEN_FAILED, "Gone"},
-      {"session unauthorized", RequestFault::status("SETUP", "401 Who"), 1000, LIBD_STREAM_OPEN_FAILED, "Who"},
-      {"play refused", RequestFault::status("PLAY", "453 Full"), 1000, LIBD_STREAM_OPEN_FAILED, "Full"},
+      {"keep-alive set-up refused", RequestFault::status("RTSPTimeout", "500 No"), 20000, LIBD_FAILED, "No"},
+      {"keep-alive inquiry refused", RequestFault::status("inq=edgestorage", "401 Who"), 20000, LIBD_FAILED, "Who"},
+      {"session refused", RequestFault::status("DESCRIBE", "404 Gone"), 20000, LIBD_STREAM_OPEN_FAILED, "Gone"},
+      {"session unauthorized", RequestFault::status("SETUP", "401 Who"), 20000, LIBD_STREAM_OPEN_FAILED, "Who"},
+      {"play refused", RequestFault::status("PLAY", "453 Full"), 20000, LIBD_STREAM_OPEN_FAILED, "Full"},
   };
   LiveCamera camera(camera_options());
   for (const RefusalCase& c : cases) {
@@ -193,7 +193,7 @@ TEST(VideoStreaming, ASecondStopWhileTheFirstStillWaitsGivesFailed) {
   std::thread first([&] { EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK); });
   int stop_event = -1;
   ASSERT_TRUE(eventFd(driver.m_StopVideoEvent, stop_event));
-  ASSERT_EQ(vexa::WaitBudget(5000).wait_readable(stop_event), 1);
+  ASSERT_EQ(vexa::WaitBudget(20000).wait_readable(stop_event), 1);
   EXPECT_EQ(driver.StopVideoStreaming(), LIBD_FAILED);
   EXPECT_EQ(driver.StartVideoStreaming(), LIBD_FAILED);
   first.join();
@@ -261,7 +261,7 @@ TEST(VideoStreaming, ACameraThatFallsSilentGivesOneTimeOut) {
   options.pictures = 3;
   LiveCamera camera(options);
   MediaDriver driver;
-  camera.introduce(driver, 1000);
+  camera.introduce(driver, 20000);
   driver.state().now = [] { return now.load(); };
   driver.m_KeepAlivePeriod = 60;
   ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
@@ -269,7 +269,7 @@ TEST(VideoStreaming, ACameraThatFallsSilentGivesOneTimeOut) {
   ASSERT_EQ(host.take_all(driver, 3).size(), 3u);
   TakenFrame frame;
   EXPECT_EQ(host.take(driver, frame), LIBD_NO_FRAME);
-  now += 2;  // more than the time-out
+  now += 21;  // more than the time-out
   const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(10);
   ELibDReturnCode code = LIBD_NO_FRAME;
   while (code == LIBD_NO_FRAME && std::chrono::steady_clock::now() < end) {

@@ -34,6 +34,7 @@ class InterleavedReader {
     driver_.rtp_over_tcp_close(connection_);
     driver_.ReleaseRtpPacketsPtr();
     if (assembly_ != -1) close(assembly_);
+    const vexa::Guard guard(driver_.m_VideoStateLock);
     if (driver_.m_StreamSocket != -1) close(driver_.m_StreamSocket);
     driver_.m_StreamSocket = -1;
   }
@@ -46,7 +47,10 @@ class InterleavedReader {
         driver_.rtp_over_tcp_open("rtsp://%s:%d/media/video%d", camera->address().c_str(), camera->rtsp_port(), 1);
     int ends[2];
     if (connection_ == -1 || socketpair(AF_UNIX, SOCK_DGRAM | SOCK_CLOEXEC, 0, ends) != 0) return false;
-    driver_.m_StreamSocket = ends[0];
+    {
+      const vexa::Guard guard(driver_.m_VideoStateLock);
+      driver_.m_StreamSocket = ends[0];
+    }
     assembly_ = ends[1];
     return driver_.AllocateRtpPackets();
   }

@@ -13,6 +13,7 @@
 #include <string>
 #include <vector>
 
+#include "tests/support/own_address.h"
 #include "virtual_camera/options.h"
 
 namespace vexa::camera {
@@ -20,11 +21,8 @@ namespace vexa::camera {
 constexpr int kPatience = 20000;  // milliseconds for what must come
 constexpr const char* kBasicAdmin = "Authorization: Basic YWRtaW46YWRtaW4=\r\n";
 
-// An address of this process alone.
-inline std::string own_address() {
-  const auto id = static_cast<unsigned>(::getpid());
-  return fmt::format("127.{}.{}.{}", 128 + (id >> 15U) % 64, (id >> 7U) % 256, 1 + id % 128);
-}
+// An address of this process alone, as are the fourteen after it.
+inline std::string own_address() { return vexa_test::own_loopback(1); }
 
 inline CameraOptions test_options() {
   CameraOptions options;

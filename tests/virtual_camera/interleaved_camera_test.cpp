@@ -235,8 +235,9 @@ TEST(InterleavedCamera, BeginsAWhileAfterTheAnswerToPlay) {
   host.ask(kAsk.setup_interleaved(1));
   host.ask(kAsk.play(2, kFirstSession));
   const auto answered = camera.journal().snapshot().back().time;
-  const auto answered_ago = std::chrono::system_clock::now() - answered;
-  const auto steady = std::chrono::steady_clock::now() - answered_ago;
+  // The steady clock is read first: a break between the two readings makes the answer seem older, never younger.
+  const auto now = std::chrono::steady_clock::now();
+  const auto steady = now - (std::chrono::system_clock::now() - answered);
   const auto any = [](const std::deque<SentPacket>& packets) { return !packets.empty(); };
   ASSERT_TRUE(camera.sent().wait_for(any, milliseconds(kPatience)));
   EXPECT_GE(camera.sent().snapshot().front().time - steady, milliseconds(115));

@@ -229,10 +229,13 @@ TEST(RtpCamera, AClientWhosePortIsClosedDisturbsNoOther) {
   options.pictures = 50;
   VirtualCamera camera(options);
   ASSERT_TRUE(camera.start()) << camera.error();
-  std::uint16_t closed_port = 0;
-  { closed_port = UdpReceiver().port(); }
+  // Held, so that nobody else is given the port, by a socket that hears another peer alone.
+  asio::io_context context;
+  const auto loopback = asio::ip::make_address("127.0.0.1");
+  asio::ip::udp::socket closed(context, asio::ip::udp::endpoint(loopback, 0));
+  closed.connect(asio::ip::udp::endpoint(loopback, 9));
   Client rtsp(camera.address(), camera.rtsp_port());
-  const std::uint32_t session = session_number(rtsp.ask(kAsk.setup(1, closed_port)));
+  const std::uint32_t session = session_number(rtsp.ask(kAsk.setup(1, closed.local_endpoint().port())));
   rtsp.ask(kAsk.play(2, session));
   Player player(camera);
   EXPECT_TRUE(camera.sent().wait_for_finished(2, milliseconds(kPatience)));

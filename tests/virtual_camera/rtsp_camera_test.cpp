@@ -5,6 +5,7 @@
 #include <string>
 #include <vector>
 
+#include "tests/support/process_state.h"
 #include "tests/virtual_camera/camera_client.h"
 #include "virtual_camera/virtual_camera.h"
 
@@ -153,8 +154,8 @@ TEST(RtspCameraExpiry, ASilentSessionEndsAfterItsTimeout) {
   Client client(camera.address(), camera.rtsp_port());
   client.ask(kAsk.setup(1, 5000));
   EXPECT_EQ(client.ask(kAsk.get_parameter(2, 12345678)).substr(0, 15), "RTSP/1.0 200 OK");
-  EXPECT_EQ(client.read_once(1500), "");
-  EXPECT_EQ(camera.sessions(), 0U);
+  EXPECT_TRUE(vexa_test::eventually([&] { return camera.sessions() == 0; }));
+  EXPECT_EQ(client.read_once(0), "");
   EXPECT_EQ(client.ask(kAsk.get_parameter(3, 12345678)), "RTSP/1.0 454 Session Not Found\r\nCSeq: 3\r\n\r\n");
 }
 
