@@ -2,6 +2,7 @@
 #pragma once
 
 #include <sys/ioctl.h>
+#include <sys/socket.h>
 
 #include <algorithm>
 #include <chrono>
@@ -52,7 +53,8 @@ class MediaDriver : public TestDriver {
     pace->join(*this);
   }
 
-  /// Whether frames wait for the host, or bytes for the streaming thread. Any thread.
+  /// Whether frames wait for the host, or datagrams for the streaming thread. Any thread. Bytes of a connection do not
+  /// count: they wait until what follows them comes, and are not lost.
   bool is_behind() {
     constexpr std::size_t kFewFrames = 3;
     {
@@ -60,8 +62,11 @@ class MediaDriver : public TestDriver {
       if (m_FrameQueue.size() >= kFewFrames) return true;
     }
     const vexa::Guard guard(m_VideoStateLock);
+    int type = 0;
+    socklen_t length = sizeof type;
+    if (getsockopt(m_StreamSocket, SOL_SOCKET, SO_TYPE, &type, &length) != 0 || type != SOCK_DGRAM) return false;
     int unread = 0;
-    return m_StreamSocket != -1 && ioctl(m_StreamSocket, FIONREAD, &unread) == 0 && unread > 0;
+    return ioctl(m_StreamSocket, FIONREAD, &unread) == 0 && unread > 0;
   }
 
   /// Live video over RTP from the camera that `use` named.

@@ -161,7 +161,7 @@ TEST(PlaybackStream, ThatEndsOrWhoseRecordingIsDeletedOrWhoseCameraVanishesFalls
     const std::size_t descriptors = open_descriptors();
     {
       MediaDriver driver;
-      camera.introduce(driver, 20000);
+      camera.introduce(driver, 4000);  // a read of before outlives what happens to the camera by as much
       driver.state().now = [] { return now.load(); };
       driver.state().teardown_timeout = 1000;
       ASSERT_EQ(driver.StartEdgeStorageVideoStreaming(camera.recording()), LIBD_OK) << row.what;
