@@ -1,9 +1,9 @@
 # vexa_fmt: the formatting library of the virtual camera and vexactl. Debian has it compiled for the machine's own word
 # size; other builds compile what they use of it into each file.
-find_package(fmt REQUIRED)
 add_library(vexa_fmt INTERFACE)
 if(CMAKE_SIZEOF_VOID_P EQUAL 8)
+  find_package(fmt REQUIRED)
   target_link_libraries(vexa_fmt INTERFACE fmt::fmt)
 else()
-  target_link_libraries(vexa_fmt INTERFACE fmt::fmt-header-only)
+  target_compile_definitions(vexa_fmt INTERFACE FMT_HEADER_ONLY)
 endif()
