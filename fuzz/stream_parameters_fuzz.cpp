@@ -1,5 +1,5 @@
 // The sequence parameter set reader of the command-line host: the input is a picture.
-#include "host/stream_parameters.h"
+#include "host/recording/stream_parameters.h"
 
 #include <cstddef>
 #include <cstdint>

@@ -2,7 +2,7 @@
 
 #include <fmt/format.h>
 
-#include "host/printable.h"
+#include "host/base/printable.h"
 
 namespace vexa::host {
 

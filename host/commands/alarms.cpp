@@ -7,12 +7,13 @@
 #include <thread>
 #include <vector>
 
-#include "host/alarm_snapshots.h"
-#include "host/alarm_words.h"
+#include "host/base/json_text.h"
+#include "host/camera/model_camera.h"
+#include "host/commands/alarm_snapshots.h"
 #include "host/commands/command.h"
-#include "host/interrupt.h"
-#include "host/model_camera.h"
-#include "host/result_output.h"
+#include "host/console/interrupt.h"
+#include "host/console/result_output.h"
+#include "host/words/alarm_words.h"
 
 namespace vexa::host {
 namespace {

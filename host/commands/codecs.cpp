@@ -4,11 +4,12 @@
 #include <nlohmann/json.hpp>
 #include <utility>
 
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
+#include "host/camera/model_camera.h"
 #include "host/commands/command.h"
-#include "host/model_camera.h"
-#include "host/printable.h"
-#include "host/result_output.h"
-#include "host/setting_words.h"
+#include "host/console/result_output.h"
+#include "host/words/setting_words.h"
 
 namespace vexa::host {
 namespace {

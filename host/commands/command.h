@@ -5,8 +5,8 @@
 #include <CLI/CLI.hpp>
 #include <memory>
 
-#include "host/exit_code.h"
-#include "host/terminal.h"
+#include "host/base/exit_code.h"
+#include "host/console/terminal.h"
 
 namespace vexa::host {
 

@@ -6,11 +6,12 @@
 #include <optional>
 #include <vector>
 
+#include "host/base/json_text.h"
+#include "host/camera/model_camera.h"
 #include "host/commands/command.h"
-#include "host/detection_picture.h"
-#include "host/model_camera.h"
-#include "host/result_output.h"
-#include "host/setting_words.h"
+#include "host/commands/detection_picture.h"
+#include "host/console/result_output.h"
+#include "host/words/setting_words.h"
 
 namespace vexa::host {
 namespace {

@@ -6,13 +6,14 @@
 #include <filesystem>
 #include <nlohmann/json.hpp>
 
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
 #include "host/commands/edge_actions.h"
-#include "host/interrupt.h"
-#include "host/picture_decoder.h"
-#include "host/playback_taker.h"
-#include "host/printable.h"
-#include "host/recording_target.h"
-#include "host/result_output.h"
+#include "host/console/interrupt.h"
+#include "host/console/result_output.h"
+#include "host/picture/picture_decoder.h"
+#include "host/recording/playback_taker.h"
+#include "host/recording/recording_target.h"
 
 namespace vexa::host {
 namespace {

@@ -3,10 +3,11 @@
 
 #include <nlohmann/json.hpp>
 
-#include "host/camera_options.h"
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
+#include "host/camera/camera_options.h"
 #include "host/commands/command.h"
-#include "host/printable.h"
-#include "host/result_output.h"
+#include "host/console/result_output.h"
 
 namespace vexa::host {
 namespace {

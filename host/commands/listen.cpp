@@ -9,12 +9,13 @@
 #include <iterator>
 #include <nlohmann/json.hpp>
 
-#include "host/camera_options.h"
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
+#include "host/camera/camera_options.h"
 #include "host/commands/command.h"
-#include "host/interrupt.h"
-#include "host/printable.h"
-#include "host/result_output.h"
-#include "host/sound_file.h"
+#include "host/console/interrupt.h"
+#include "host/console/result_output.h"
+#include "host/recording/sound_file.h"
 
 namespace vexa::host {
 namespace {

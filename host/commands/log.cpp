@@ -3,12 +3,12 @@
 
 #include <array>
 
-#include "host/cgi_log_rows.h"
+#include "host/access/credentials.h"
+#include "host/cgi_log/cgi_log_rows.h"
+#include "host/cgi_log/followed_file.h"
 #include "host/commands/command.h"
-#include "host/credentials.h"
-#include "host/followed_file.h"
-#include "host/interrupt.h"
-#include "host/result_output.h"
+#include "host/console/interrupt.h"
+#include "host/console/result_output.h"
 
 namespace vexa::host {
 namespace {

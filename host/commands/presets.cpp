@@ -3,9 +3,10 @@
 
 #include <nlohmann/json.hpp>
 
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
 #include "host/commands/action_group.h"
-#include "host/printable.h"
-#include "host/result_output.h"
+#include "host/console/result_output.h"
 
 namespace vexa::host {
 namespace {

@@ -5,9 +5,10 @@
 #include <nlohmann/json.hpp>
 #include <utility>
 
+#include "host/base/json_text.h"
+#include "host/camera/model_camera.h"
 #include "host/commands/command.h"
-#include "host/model_camera.h"
-#include "host/result_output.h"
+#include "host/console/result_output.h"
 
 namespace vexa::host {
 namespace {

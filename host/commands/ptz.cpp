@@ -7,8 +7,8 @@
 
 #include "host/commands/action_group.h"
 #include "host/commands/ptz_watch.h"
-#include "host/interrupt.h"
-#include "host/ptz_scale.h"
+#include "host/console/interrupt.h"
+#include "host/words/ptz_scale.h"
 
 namespace vexa::host {
 namespace {

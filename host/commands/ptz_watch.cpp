@@ -7,11 +7,11 @@
 #include <chrono>
 #include <nlohmann/json.hpp>
 
-#include "host/alarm_words.h"
-#include "host/interrupt.h"
-#include "host/live_pictures.h"
-#include "host/ptz_scale.h"
-#include "host/result_output.h"
+#include "host/camera/live_pictures.h"
+#include "host/console/interrupt.h"
+#include "host/console/result_output.h"
+#include "host/words/alarm_words.h"
+#include "host/words/ptz_scale.h"
 
 namespace vexa::host {
 namespace {

@@ -5,14 +5,15 @@
 #include <chrono>
 #include <nlohmann/json.hpp>
 
-#include "host/camera_options.h"
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
+#include "host/camera/camera_options.h"
+#include "host/camera/video_options.h"
 #include "host/commands/command.h"
-#include "host/interrupt.h"
-#include "host/printable.h"
-#include "host/recorder.h"
-#include "host/recording_target.h"
-#include "host/result_output.h"
-#include "host/video_options.h"
+#include "host/console/interrupt.h"
+#include "host/console/result_output.h"
+#include "host/recording/recorder.h"
+#include "host/recording/recording_target.h"
 
 namespace vexa::host {
 namespace {

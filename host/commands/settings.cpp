@@ -4,9 +4,10 @@
 #include <nlohmann/json.hpp>
 #include <utility>
 
-#include "host/camera_settings.h"
+#include "host/base/json_text.h"
+#include "host/camera/camera_settings.h"
 #include "host/commands/command.h"
-#include "host/result_output.h"
+#include "host/console/result_output.h"
 
 namespace vexa::host {
 namespace {

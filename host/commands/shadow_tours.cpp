@@ -4,9 +4,10 @@
 #include <charconv>
 #include <nlohmann/json.hpp>
 
+#include "host/base/json_text.h"
 #include "host/commands/action_group.h"
-#include "host/result_output.h"
-#include "host/tour_words.h"
+#include "host/console/result_output.h"
+#include "host/words/tour_words.h"
 
 namespace vexa::host {
 namespace {

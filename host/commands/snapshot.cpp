@@ -3,15 +3,16 @@
 
 #include <nlohmann/json.hpp>
 
-#include "host/camera_options.h"
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
+#include "host/camera/camera_options.h"
+#include "host/camera/live_pictures.h"
+#include "host/camera/video_options.h"
 #include "host/commands/command.h"
-#include "host/frame_file.h"
-#include "host/live_pictures.h"
-#include "host/picture_decoder.h"
-#include "host/picture_file.h"
-#include "host/printable.h"
-#include "host/result_output.h"
-#include "host/video_options.h"
+#include "host/console/result_output.h"
+#include "host/picture/picture_decoder.h"
+#include "host/picture/picture_file.h"
+#include "host/recording/frame_file.h"
 
 namespace vexa::host {
 namespace {

@@ -3,7 +3,7 @@
 #include <cstdlib>
 #include <filesystem>
 
-#include "host/picture_file.h"
+#include "host/picture/picture_file.h"
 #include "tests/host/camera_fixture.h"
 
 namespace vexa_test {

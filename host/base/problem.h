@@ -1,0 +1,29 @@
+// A failure as the person at the keyboard meets it.
+#ifndef HOST_BASE_PROBLEM_H_
+#define HOST_BASE_PROBLEM_H_
+
+#include <string>
+#include <variant>
+
+#include "host/base/exit_code.h"
+
+namespace vexa::host {
+
+struct Problem {
+  ExitCode code;
+  std::string text;    // what went wrong, without a full stop
+  std::string advice;  // what to do next, a sentence
+};
+
+// A mistake in what was typed.
+[[nodiscard]] Problem usage(std::string text, std::string advice);
+
+template <typename Value>
+using Result = std::variant<Value, Problem>;
+
+// A file that was named on the command line and cannot be read; `error` is the system's number.
+[[nodiscard]] Problem unreadable(const std::string& path, int error);
+
+}  // namespace vexa::host
+
+#endif  // HOST_BASE_PROBLEM_H_

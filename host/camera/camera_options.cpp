@@ -1,0 +1,69 @@
+#include "host/camera/camera_options.h"
+
+#include <fmt/format.h>
+
+#include <cerrno>
+#include <system_error>
+
+#include "host/cgi_log/cgi_log_target.h"
+
+namespace vexa::host {
+namespace {
+
+constexpr int kLongestTimeout = 600000;
+
+Problem out_of_descriptors() {
+  return {ExitCode::kUsage, fmt::format("cannot show the driver's trace: {}", std::generic_category().message(errno)),
+          "Leave --trace out, or let the process open more files."};
+}
+
+}  // namespace
+
+void add_camera_options(CLI::App& command, CameraOptions& options) {
+  command.add_option("camera,--camera", options.address, "the camera: HOST or HOST:PORT (HTTP port, else 80)")
+      ->required()
+      ->type_name("");
+  auto* user = command.add_option("--user", options.credentials.user, "user name")->type_name("NAME");
+  auto* password =
+      command.add_option("--password-file", options.credentials.password_file, "file whose first line is the password")
+          ->type_name("FILE");
+  command.add_option("--credentials", options.credentials.credentials_file, "file whose first line is USER:PASSWORD")
+      ->type_name("FILE")
+      ->excludes(user)
+      ->excludes(password);
+  command.add_option("--timeout", options.timeout_ms, "longest wait for an answer, in milliseconds")
+      ->type_name("MS")
+      ->capture_default_str();
+  command.add_flag("--json", options.json, "print the result as JSON");
+  command.add_flag("--trace", options.trace, "show the driver's RTSP requests on standard error, without credentials");
+  command
+      .add_option("--cgi-log", options.cgi_log,
+                  "append each request to the camera and its answer's status to this file")
+      ->type_name("FILE");
+}
+
+Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal) {
+  if (options.timeout_ms < 1 || options.timeout_ms > kLongestTimeout) {
+    return Problem{ExitCode::kUsage, fmt::format("--timeout is not a number from 1 to {}", kLongestTimeout),
+                   "It is in milliseconds; 5000 when not given."};
+  }
+  Result<CameraAddress> address = parse_camera_address(options.address);
+  if (const auto* problem = std::get_if<Problem>(&address)) return *problem;
+  Result<Credentials> credentials = load_credentials(options.credentials);
+  if (const auto* problem = std::get_if<Problem>(&credentials)) return *problem;
+  const CameraConnection connection{std::get<CameraAddress>(address), std::get<Credentials>(credentials),
+                                    options.timeout_ms, options.transport, options.cgi_log};
+  if (const auto problem = check_name(connection.address)) return *problem;
+  if (connection.cgi_log) {
+    if (const auto problem = check_cgi_log_target(*connection.cgi_log)) return *problem;
+  }
+  OpenCamera camera{connection.address, nullptr, nullptr};
+  if (options.trace) {
+    camera.trace = DriverTrace::start(terminal, Redactor(connection.credentials));
+    if (!camera.trace) return out_of_descriptors();
+  }
+  camera.driver = std::make_unique<LiveCamera>(connection);
+  return camera;
+}
+
+}  // namespace vexa::host

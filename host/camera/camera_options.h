@@ -1,0 +1,40 @@
+// The options that every command takes which speaks to a camera.
+#ifndef HOST_CAMERA_CAMERA_OPTIONS_H_
+#define HOST_CAMERA_CAMERA_OPTIONS_H_
+
+#include <CLI/CLI.hpp>
+#include <memory>
+#include <optional>
+#include <string>
+
+#include "host/access/credentials.h"
+#include "host/access/driver_trace.h"
+#include "host/camera/live_camera.h"
+#include "host/console/terminal.h"
+
+namespace vexa::host {
+
+struct CameraOptions {
+  std::string address;
+  CredentialSources credentials;
+  int timeout_ms = 5000;
+  std::optional<std::string> cgi_log = {};
+  VideoTransport transport = VideoTransport::kUdp;
+  bool trace = false;
+  bool json = false;
+};
+
+void add_camera_options(CLI::App& command, CameraOptions& options);
+
+// A driver that knows its camera; no camera has been contacted yet.
+struct OpenCamera {
+  CameraAddress address;
+  std::unique_ptr<DriverTrace> trace;  // outlives the driver, which traces to its end
+  std::unique_ptr<LiveCamera> driver;
+};
+
+[[nodiscard]] Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal);
+
+}  // namespace vexa::host
+
+#endif  // HOST_CAMERA_CAMERA_OPTIONS_H_

@@ -1,0 +1,90 @@
+#include "host/camera/live_pictures.h"
+
+#include <utility>
+
+#include "host/console/interrupt.h"
+#include "vexa/video_info.h"
+
+namespace vexa::host {
+namespace {
+
+constexpr std::chrono::milliseconds kNoPicturePause{3};
+constexpr std::chrono::seconds kLongestWaitForKey{30};
+// A camera that never sends a key frame again does not fill the memory.
+constexpr std::size_t kMostKeptBytes = std::size_t{64} * 1024 * 1024;
+
+// Null for a frame that depends on others.
+const char* codec_of_key_frame(std::int32_t type) {
+  switch (type) {
+    case VIDEO_FRAME_JPEG:
+      return "JPEG";
+    case VIDEO_FRAME_MPEG4_KEY:
+      return "MPEG4";
+    case VIDEO_FRAME_H264_KEY:
+      return "H.264";
+    default:
+      return nullptr;
+  }
+}
+
+}  // namespace
+
+LivePictures::Look LivePictures::look() {
+  SLibDVideoFrameInfo frame;
+  frame.sink = this;
+  const ELibDReturnCode result = camera_.GetCurrentVideoFrame(frame);
+  if (result == LIBD_NO_FRAME) {
+    Interrupt::wait(kNoPicturePause);
+    return Look::kNothing;
+  }
+  if (result != LIBD_OK) return Look::kSilent;
+  keep(frame.frameType);
+  return Look::kPicture;
+}
+
+void LivePictures::keep(std::int32_t frame_type) {
+  const char* codec = codec_of_key_frame(frame_type);
+  const std::lock_guard<std::mutex> lock(mutex_);
+  if (codec != nullptr || run_bytes_ + received_.size() > kMostKeptBytes) {
+    run_.frames.clear();
+    run_bytes_ = 0;
+  }
+  if (codec != nullptr) run_.codec = codec;
+  if (codec == nullptr && run_.frames.empty()) return;
+  run_bytes_ += received_.size();
+  run_.frames.push_back(std::exchange(received_, {}));
+}
+
+FrameRun LivePictures::newest() const {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  return run_;
+}
+
+bool LivePictures::has_picture() const {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  return !run_.frames.empty();
+}
+
+std::optional<Problem> await_key_frame(LiveCamera& camera, LivePictures& pictures) {
+  Interrupt::finish_orderly();  // a session that is open is closed
+  const ELibDReturnCode started = pictures.start();
+  if (started != LIBD_OK) return camera.explain(started);
+  const auto give_up = std::chrono::steady_clock::now() + kLongestWaitForKey;
+  while (!pictures.has_picture()) {
+    if (Interrupt::requested()) {
+      return Problem{ExitCode::kInterrupted, "interrupted before a picture came", "Nothing was written."};
+    }
+    if (pictures.look() == LivePictures::Look::kSilent) return silent_camera();
+    if (std::chrono::steady_clock::now() > give_up) {
+      return Problem{ExitCode::kNoVideo, "the camera has sent no key picture", "Shorten its key-frame interval."};
+    }
+  }
+  return std::nullopt;
+}
+
+Problem silent_camera() {
+  return {ExitCode::kNoVideo, "the camera has stopped sending pictures",
+          "Check its network and encoder settings; --timeout makes the wait longer."};
+}
+
+}  // namespace vexa::host

@@ -1,0 +1,34 @@
+#include "host/commands/detection_picture.h"
+
+#include "host/camera/live_pictures.h"
+#include "host/picture/picture_file.h"
+#include "host/picture/window_drawing.h"
+#include "host/recording/frame_file.h"
+
+namespace vexa::host {
+
+std::optional<Problem> check_picture_file(const std::string& file) {
+  if (file.empty()) return usage("--out names no file", "For instance: --out windows.png.");
+  if (!picture_format_of(file)) return usage("--out is no picture file", "Its name ends with .png or .jpg.");
+  if (!has_ffmpeg()) return without_ffmpeg("drawing on a picture");
+  return FrameFile(file).check();
+}
+
+std::optional<Problem> draw_detection(const ModelCamera& camera, const SLibDDetectionParam& setting,
+                                      const std::string& file) {
+  const Result<LiveCamera*> live = camera.live();
+  if (const auto* problem = std::get_if<Problem>(&live)) return *problem;
+  LiveCamera& player = *std::get<LiveCamera*>(live);
+  LivePictures pictures(player);
+  if (auto problem = await_key_frame(player, pictures)) return problem;
+  const FrameRun run = pictures.newest();
+  Result<Picture> decoded = decode_picture(run.codec, run.frames);
+  if (const auto* problem = std::get_if<Problem>(&decoded)) return *problem;
+  auto& picture = std::get<Picture>(decoded);
+  draw_windows(picture, setting);
+  const auto bytes = encode_picture(picture, picture_format_of(file).value_or(PictureFormat::kPng));
+  if (const auto* problem = std::get_if<Problem>(&bytes)) return *problem;
+  return write_whole_file(file, std::get<std::vector<std::uint8_t>>(bytes));
+}
+
+}  // namespace vexa::host

@@ -1,0 +1,39 @@
+// Where the pictures of a recording go.
+#ifndef HOST_RECORDING_PICTURE_TARGET_H_
+#define HOST_RECORDING_PICTURE_TARGET_H_
+
+#include <chrono>
+#include <cstddef>
+#include <optional>
+#include <string>
+
+#include "host/base/problem.h"
+
+namespace vexa::host {
+
+// One picture as the driver handed it out.
+struct RecordedPicture {
+  const unsigned char* data = nullptr;
+  std::size_t length = 0;
+  bool key = false;
+  std::chrono::microseconds time{0};  // since 1970
+};
+
+class PictureTarget {
+ public:
+  PictureTarget() = default;
+  virtual ~PictureTarget() = default;
+  PictureTarget(const PictureTarget&) = delete;
+  PictureTarget& operator=(const PictureTarget&) = delete;
+
+  // Says early what the first picture would most likely meet; nothing is created.
+  [[nodiscard]] virtual std::optional<Problem> check() const = 0;
+  // The first picture is a key picture.
+  [[nodiscard]] virtual std::optional<Problem> write(const RecordedPicture& picture) = 0;
+  [[nodiscard]] virtual std::optional<Problem> close() = 0;
+  [[nodiscard]] virtual const std::string& path() const = 0;
+};
+
+}  // namespace vexa::host
+
+#endif  // HOST_RECORDING_PICTURE_TARGET_H_
