@@ -31,21 +31,22 @@ std::optional<int> parse_port(std::string_view text) {
 
 Result<CameraAddress> parse_camera_address(std::string_view text) {
   if (text.find('@') != std::string_view::npos || text.find('/') != std::string_view::npos) {
-    return usage("the camera's address is HOST or HOST:PORT, not a URL",
-                 "User name and password have options of their own: --user, --password-file, --credentials.");
+    return fail(usage("the camera's address is HOST or HOST:PORT, not a URL",
+                      "User name and password have options of their own: --user, --password-file, --credentials."));
   }
   const std::size_t colon = text.find(':');
   if (colon != std::string_view::npos && text.find(':', colon + 1) != std::string_view::npos) {
-    return usage("IPv6 addresses are not supported", "Give the camera's IPv4 address or its name.");
+    return fail(usage("IPv6 addresses are not supported", "Give the camera's IPv4 address or its name."));
   }
   CameraAddress address{std::string(text.substr(0, colon))};
   if (!is_host(address.host)) {
-    return usage("the camera's address is not a host name or IPv4 address",
-                 "For instance: 192.168.0.100 or cam1:8080.");
+    return fail(
+        usage("the camera's address is not a host name or IPv4 address", "For instance: 192.168.0.100 or cam1:8080."));
   }
   if (colon == std::string_view::npos) return address;
   const std::optional<int> port = parse_port(text.substr(colon + 1));
-  if (!port) return usage("the port in the camera's address is not a number from 1 to 65535", "For instance: cam1:80.");
+  if (!port)
+    return fail(usage("the port in the camera's address is not a number from 1 to 65535", "For instance: cam1:80."));
   address.port = *port;
   return address;
 }

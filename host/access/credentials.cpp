@@ -20,13 +20,13 @@ constexpr std::size_t kLargestFile = 4096;
 
 Result<std::string> read_first_line(const std::string& path) {
   const UniqueFd file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
-  if (!file.valid()) return unreadable(path, errno);
+  if (!file.valid()) return fail(unreadable(path, errno));
   std::string text;
   std::array<char, 512> piece{};
   while (text.size() <= kLargestFile && text.find('\n') == std::string::npos) {
     const ssize_t count = read(file.get(), piece.data(), piece.size());
     if (count < 0 && errno == EINTR) continue;
-    if (count < 0) return unreadable(path, errno);
+    if (count < 0) return fail(unreadable(path, errno));
     if (count == 0) break;
     text.append(piece.data(), static_cast<std::size_t>(count));
   }
@@ -36,22 +36,21 @@ Result<std::string> read_first_line(const std::string& path) {
 }
 
 std::optional<Problem> apply_credentials_file(const std::string& path, Credentials& credentials) {
-  Result<std::string> line = read_first_line(path);
-  if (const auto* problem = std::get_if<Problem>(&line)) return *problem;
-  const auto& text = std::get<std::string>(line);
-  const std::size_t colon = text.find(':');
+  const Result<std::string> text = read_first_line(path);
+  if (!text) return text.error();
+  const std::size_t colon = text->find(':');
   if (colon == std::string::npos) {
     return usage(fmt::format("the first line of {} is not USER:PASSWORD", path),
                  "Write both on one line, with a colon between them.");
   }
-  credentials = {text.substr(0, colon), text.substr(colon + 1)};
+  credentials = {text->substr(0, colon), text->substr(colon + 1)};
   return std::nullopt;
 }
 
 std::optional<Problem> apply_password_file(const std::string& path, Credentials& credentials) {
   Result<std::string> line = read_first_line(path);
-  if (const auto* problem = std::get_if<Problem>(&line)) return *problem;
-  credentials.password = std::get<std::string>(line);
+  if (!line) return line.error();
+  credentials.password = *line;
   return std::nullopt;
 }
 
@@ -93,7 +92,7 @@ Result<Credentials> load_credentials(const CredentialSources& sources) {
   if (!problem && sources.user) credentials.user = *sources.user;
   if (!problem && sources.password_file) problem = apply_password_file(*sources.password_file, credentials);
   if (!problem) problem = check(credentials);
-  if (problem) return *problem;
+  if (problem) return fail(*std::move(problem));
   return credentials;
 }
 

@@ -3,7 +3,8 @@
 #define HOST_BASE_PROBLEM_H_
 
 #include <string>
-#include <variant>
+#include <tl/expected.hpp>
+#include <utility>
 
 #include "host/base/exit_code.h"
 
@@ -18,8 +19,12 @@ struct Problem {
 // A mistake in what was typed.
 [[nodiscard]] Problem usage(std::string text, std::string advice);
 
+// A value, or why there is none.
 template <typename Value>
-using Result = std::variant<Value, Problem>;
+using Result = tl::expected<Value, Problem>;
+
+// What a function that returns a Result<> returns on failure.
+[[nodiscard]] inline tl::unexpected<Problem> fail(Problem problem) { return tl::unexpected(std::move(problem)); }
 
 // A file that was named on the command line and cannot be read; `error` is the system's number.
 [[nodiscard]] Problem unreadable(const std::string& path, int error);

@@ -44,23 +44,22 @@ void add_camera_options(CLI::App& command, CameraOptions& options) {
 
 Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal) {
   if (options.timeout_ms < 1 || options.timeout_ms > kLongestTimeout) {
-    return Problem{ExitCode::kUsage, fmt::format("--timeout is not a number from 1 to {}", kLongestTimeout),
-                   "It is in milliseconds; 5000 when not given."};
+    return fail(usage(fmt::format("--timeout is not a number from 1 to {}", kLongestTimeout),
+                      "It is in milliseconds; 5000 when not given."));
   }
-  Result<CameraAddress> address = parse_camera_address(options.address);
-  if (const auto* problem = std::get_if<Problem>(&address)) return *problem;
-  Result<Credentials> credentials = load_credentials(options.credentials);
-  if (const auto* problem = std::get_if<Problem>(&credentials)) return *problem;
-  const CameraConnection connection{std::get<CameraAddress>(address), std::get<Credentials>(credentials),
-                                    options.timeout_ms, options.transport, options.cgi_log};
-  if (const auto problem = check_name(connection.address)) return *problem;
+  const Result<CameraAddress> address = parse_camera_address(options.address);
+  if (!address) return fail(address.error());
+  const Result<Credentials> credentials = load_credentials(options.credentials);
+  if (!credentials) return fail(credentials.error());
+  const CameraConnection connection{*address, *credentials, options.timeout_ms, options.transport, options.cgi_log};
+  if (const auto problem = check_name(connection.address)) return fail(*problem);
   if (connection.cgi_log) {
-    if (const auto problem = check_cgi_log_target(*connection.cgi_log)) return *problem;
+    if (const auto problem = check_cgi_log_target(*connection.cgi_log)) return fail(*problem);
   }
   OpenCamera camera{connection.address, nullptr, nullptr};
   if (options.trace) {
     camera.trace = DriverTrace::start(terminal, Redactor(connection.credentials));
-    if (!camera.trace) return out_of_descriptors();
+    if (!camera.trace) return fail(out_of_descriptors());
   }
   camera.driver = std::make_unique<LiveCamera>(connection);
   return camera;

@@ -100,24 +100,23 @@ std::optional<Problem> check_rate(const SLibDCameraInfo& video) {
 }
 
 std::optional<Problem> change_stream(const ModelCamera& camera, const SettingChanges& changes) {
-  Result<SLibDCameraInfo> read = camera.video();
-  if (const auto* problem = std::get_if<Problem>(&read)) return *problem;
-  auto& video = std::get<SLibDCameraInfo>(read);
-  if (changes.codec) video.codecName = *changes.codec;
+  Result<SLibDCameraInfo> video = camera.video();
+  if (!video) return video.error();
+  if (changes.codec) video->codecName = *changes.codec;
   if (changes.size) {
-    video.imageWidth = changes.size->width;
-    video.imageHeight = changes.size->height;
-    video.imageSizeText = changes.size->text;
+    video->imageWidth = changes.size->width;
+    video->imageHeight = changes.size->height;
+    video->imageSizeText = changes.size->text;
   }
-  video.frameRate = changes.frame_rate.value_or(video.frameRate);
-  video.bitRate = changes.bit_rate.value_or(video.bitRate);
-  video.quality = changes.quality.value_or(video.quality);
-  video.rotation = changes.rotation.value_or(video.rotation);
-  if (auto problem = check_rate(video)) return problem;
-  if (auto problem = check_offer(camera, video)) return problem;
-  const ELibDReturnCode result = camera.device().SetCameraInfo(video);
+  video->frameRate = changes.frame_rate.value_or(video->frameRate);
+  video->bitRate = changes.bit_rate.value_or(video->bitRate);
+  video->quality = changes.quality.value_or(video->quality);
+  video->rotation = changes.rotation.value_or(video->rotation);
+  if (auto problem = check_rate(*video)) return problem;
+  if (auto problem = check_offer(camera, *video)) return problem;
+  const ELibDReturnCode result = camera.device().SetCameraInfo(*video);
   if (result == LIBD_OK) return std::nullopt;
-  return camera.explain_change(fmt::format("video stream {}", video.streamNumber), result);
+  return camera.explain_change(fmt::format("video stream {}", video->streamNumber), result);
 }
 
 ELibDReturnCode change_infrared(CLibraryDevice& device, const SettingChanges& changes) {
@@ -132,27 +131,26 @@ ELibDReturnCode change_infrared(CLibraryDevice& device, const SettingChanges& ch
 }  // namespace
 
 Result<Json> read_settings(const ModelCamera& camera) {
-  Result<SLibDCameraInfo> read = camera.video();
-  if (const auto* problem = std::get_if<Problem>(&read)) return *problem;
-  const auto& video = std::get<SLibDCameraInfo>(read);
-  Json settings = {{"stream", video.streamNumber},
-                   {"codec", printable(video.codecName)},
-                   {"size", size_or_null(video.imageWidth, video.imageHeight)},
-                   {"frame-rate", number_or_null(video.frameRate)},
-                   {"bit-rate", number_or_null(video.bitRate)},
-                   {"quality", number_or_null(video.quality)},
-                   {"video-standard", video.videoStandard == LIBD_VIDEO_NTSC ? "ntsc" : "pal"},
-                   {"capture-size", size_or_null(video.captureWidth, video.captureHeight)},
-                   {"max-image-size", size_or_null(video.maxImageWidth, video.maxImageHeight)},
-                   {"solid-ptz", video.solidPtz ? "on" : "off"},
-                   {"unicast-port", number_or_null(video.unicastVideoPort)},
-                   {"unicast-port-1", number_or_null(video.unicastVideoPort1)},
-                   {"unicast-port-2", number_or_null(video.unicastVideoPort2)},
-                   {"rtsp-port", number_or_null(video.rtspPort)}};
+  const Result<SLibDCameraInfo> video = camera.video();
+  if (!video) return fail(video.error());
+  Json settings = {{"stream", video->streamNumber},
+                   {"codec", printable(video->codecName)},
+                   {"size", size_or_null(video->imageWidth, video->imageHeight)},
+                   {"frame-rate", number_or_null(video->frameRate)},
+                   {"bit-rate", number_or_null(video->bitRate)},
+                   {"quality", number_or_null(video->quality)},
+                   {"video-standard", video->videoStandard == LIBD_VIDEO_NTSC ? "ntsc" : "pal"},
+                   {"capture-size", size_or_null(video->captureWidth, video->captureHeight)},
+                   {"max-image-size", size_or_null(video->maxImageWidth, video->maxImageHeight)},
+                   {"solid-ptz", video->solidPtz ? "on" : "off"},
+                   {"unicast-port", number_or_null(video->unicastVideoPort)},
+                   {"unicast-port-1", number_or_null(video->unicastVideoPort1)},
+                   {"unicast-port-2", number_or_null(video->unicastVideoPort2)},
+                   {"rtsp-port", number_or_null(video->rtspPort)}};
   SettingReader reader(camera.device());
   add_image(reader, settings);
   settings["video-output"] = reader.word(&CLibraryDevice::GetVideoOutMode, kOutputWords);
-  if (reader.failure() != LIBD_OK) return camera.explain(reader.failure());
+  if (reader.failure() != LIBD_OK) return fail(camera.explain(reader.failure()));
   return settings;
 }
 

@@ -58,11 +58,11 @@ LiveCamera::LiveCamera(const CameraConnection& connection) : connection_(connect
 Result<LiveCamera::Identity> LiveCamera::identify(int stream) {
   Identity identity;
   ELibDReturnCode result = GetCurrentSystemInfo(identity.system);
-  if (result != LIBD_OK) return explain(result);
+  if (result != LIBD_OK) return fail(explain(result));
   m_CameraInfo.streamNumber = stream;
   identity.video.streamNumber = stream;
   result = GetCameraInfo(identity.video);
-  if (result != LIBD_OK) return explain(result);
+  if (result != LIBD_OK) return fail(explain(result));
   m_CameraInfo.codecType = identity.video.codecType;
   m_CameraInfo.codecName = identity.video.codecName;
   return identity;
@@ -71,7 +71,7 @@ Result<LiveCamera::Identity> LiveCamera::identify(int stream) {
 Result<CardMode> LiveCamera::card_mode() {
   std::string answer;
   const ELibDReturnCode result = SendInqCommand("edgestorage", answer);
-  if (result != LIBD_OK) return explain(result);
+  if (result != LIBD_OK) return fail(explain(result));
   CardMode mode;
   SLibDEdgeStorageMode& recording = mode.recording;
   std::string text;

@@ -42,19 +42,18 @@ void add_model_options(CLI::App& command, ModelOptions& options) {
 
 Result<ModelCamera> ModelCamera::open(const ModelOptions& options, Terminal& terminal) {
   if (options.stream < 1 || options.stream > kMostCameraStreams) {
-    return Problem{ExitCode::kUsage, fmt::format("--stream is not a number from 1 to {}", kMostCameraStreams),
-                   "1 is the camera's first stream."};
+    return fail(usage(fmt::format("--stream is not a number from 1 to {}", kMostCameraStreams),
+                      "1 is the camera's first stream."));
   }
-  Result<OpenCamera> opened = open_camera(options.camera, terminal);
-  if (const auto* problem = std::get_if<Problem>(&opened)) return *problem;
-  auto& asked = std::get<OpenCamera>(opened);
+  Result<OpenCamera> asked = open_camera(options.camera, terminal);
+  if (!asked) return fail(asked.error());
   SLibDSystemInfo system;
-  const ELibDReturnCode result = asked.driver->GetCurrentSystemInfo(system);
-  if (result != LIBD_OK) return asked.driver->explain(result);
-  ModelCamera camera(std::move(asked), options.stream);
-  if (auto problem = camera.find_profile(options, system.modelName)) return *std::move(problem);
+  const ELibDReturnCode result = asked->driver->GetCurrentSystemInfo(system);
+  if (result != LIBD_OK) return fail(asked->driver->explain(result));
+  ModelCamera camera(std::move(*asked), options.stream);
+  if (auto problem = camera.find_profile(options, system.modelName)) return fail(*std::move(problem));
   camera.device_ = MakeDevice(camera.profile_);
-  if (!camera.device_) return Problem{ExitCode::kUsage, "there is not enough memory for a driver", "Free some."};
+  if (!camera.device_) return fail(usage("there is not enough memory for a driver", "Free some."));
   introduce(*camera.device_, camera.connection_);
   return camera;
 }
@@ -75,11 +74,11 @@ Result<SLibDCameraInfo> ModelCamera::video() const {
   SLibDCameraInfo info;
   info.streamNumber = stream_;
   const ELibDReturnCode result = device_->GetCameraInfo(info);
-  if (result != LIBD_OK) return explain(result);
+  if (result != LIBD_OK) return fail(explain(result));
   // The driver leaves what the camera does not report as it was: in a new driver, empty.
   if (info.codecName.empty() && info.imageWidth == 0 && info.frameRate == 0) {
-    return Problem{ExitCode::kUsage, fmt::format("the camera reports no video stream {}", stream_),
-                   "--stream counts from 1, the camera's first."};
+    return fail(usage(fmt::format("the camera reports no video stream {}", stream_),
+                      "--stream counts from 1, the camera's first."));
   }
   info.streamNumber = stream_;  // the record comes back with the driver's own
   return info;
@@ -87,7 +86,7 @@ Result<SLibDCameraInfo> ModelCamera::video() const {
 
 Result<LiveCamera*> ModelCamera::live() const {
   const Result<LiveCamera::Identity> identity = live_->identify(stream_);
-  if (const auto* problem = std::get_if<Problem>(&identity)) return *problem;
+  if (!identity) return fail(identity.error());
   return live_.get();
 }
 

@@ -25,7 +25,7 @@ Result<std::size_t> FollowedFile::read(std::span<char> room) {
   for (;;) {
     const ssize_t count = ::read(file_.get(), room.data(), room.size());
     if (count < 0 && errno == EINTR) continue;
-    if (count < 0) return unreadable(path_, errno);
+    if (count < 0) return fail(unreadable(path_, errno));
     place_ += static_cast<off_t>(count);
     return static_cast<std::size_t>(count);
   }

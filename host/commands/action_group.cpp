@@ -21,11 +21,10 @@ ExitCode ActionGroup::run(Terminal& terminal) {
   CameraAction& action = chosen();
   action.set_json(options_.camera.json);
   if (const auto problem = action.check()) return terminal.report(*problem);
-  const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-  if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-  const auto& camera = std::get<ModelCamera>(opened);
-  if (const auto problem = check_model_(camera)) return terminal.report(*problem);
-  return action.run(camera, terminal);
+  const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+  if (!camera) return terminal.report(camera.error());
+  if (const auto problem = check_model_(*camera)) return terminal.report(*problem);
+  return action.run(*camera, terminal);
 }
 
 CameraAction& ActionGroup::chosen() const {

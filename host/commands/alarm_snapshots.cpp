@@ -17,8 +17,8 @@ AlarmSnapshots::~AlarmSnapshots() {
 
 std::optional<Problem> AlarmSnapshots::start(const ModelCamera& camera) {
   const Result<LiveCamera*> live = camera.live();
-  if (const auto* problem = std::get_if<Problem>(&live)) return *problem;
-  LiveCamera& player = *std::get<LiveCamera*>(live);
+  if (!live) return live.error();
+  LiveCamera& player = **live;
   pictures_.emplace(player);
   if (auto problem = await_key_frame(player, *pictures_)) return problem;
   const std::string codec = pictures_->newest().codec;
@@ -35,11 +35,11 @@ std::optional<Problem> AlarmSnapshots::take(const SLibDPinInfo& pin, const std::
   if (silent_) return silent_camera();
   const FrameRun run = pictures_->newest();
   const auto bytes = jpeg_of(run.codec, run.frames);
-  if (const auto* problem = std::get_if<Problem>(&bytes)) return *problem;
+  if (!bytes) return bytes.error();
   std::string name = moment;
   std::replace(name.begin(), name.end(), ':', '-');  // which some file systems do not take
   const std::string file = fmt::format("{}/{}-{}-{}.jpg", folder_, name, kind_of(pin), pin.number);
-  auto problem = write_whole_file(file, std::get<std::vector<std::uint8_t>>(bytes));
+  auto problem = write_whole_file(file, *bytes);
   if (problem) problem->advice = "Make room in the folder of --snapshot-dir.";
   return problem;
 }

@@ -36,13 +36,12 @@ class IoCommand final : public Command {
   }
 
   ExitCode run(Terminal& terminal) override {
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
     SLibDIoBoxInfo info;
-    const ELibDReturnCode result = camera.device().GetIoBoxInfo(info);
-    if (result != LIBD_OK) return terminal.report(camera.explain(result));
-    if (const auto problem = read_states(camera, info.pins)) return terminal.report(*problem);
+    const ELibDReturnCode result = camera->device().GetIoBoxInfo(info);
+    if (result != LIBD_OK) return terminal.report(camera->explain(result));
+    if (const auto problem = read_states(*camera, info.pins)) return terminal.report(*problem);
     return write_result(terminal, options_.camera.json ? json_of(info.pins) : table_of(info.pins));
   }
 
@@ -113,15 +112,14 @@ class OutputCommand final : public Command {
       return terminal.report(usage("an output is switched on or off", "See vexactl output --help."));
     }
     if (number_ < 1) return terminal.report(usage("outputs are counted from 1", "vexactl io shows them."));
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
     SLibDPinInfo pin;
     pin.number = number_;
     pin.type = PIN_TYPE_ALARM_OUTPUT;
     pin.state = switch_ == "on" ? 1 : 0;
-    const ELibDReturnCode result = camera.device().SetOutput(pin);
-    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera.explain_change("output", result));
+    const ELibDReturnCode result = camera->device().SetOutput(pin);
+    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera->explain_change("output", result));
   }
 
  private:
@@ -149,16 +147,15 @@ class WatchCommand final : public Command {
     if (snapshot_folder_) {
       if (const auto problem = check_snapshot_folder(*snapshot_folder_)) return terminal.report(*problem);
     }
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
     Interrupt::finish_orderly();
     std::optional<AlarmSnapshots> snapshots;
     if (snapshot_folder_) {
       snapshots_ = &snapshots.emplace(*snapshot_folder_);
-      if (const auto problem = snapshots_->start(camera)) return terminal.report(*problem);
+      if (const auto problem = snapshots_->start(*camera)) return terminal.report(*problem);
     }
-    return watch(camera, terminal);
+    return watch(*camera, terminal);
   }
 
  private:

@@ -67,15 +67,14 @@ class CodecsCommand final : public Command {
   }
 
   ExitCode run(Terminal& terminal) override {
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
     // Asking for the settings is what narrows the offer.
-    const Result<SLibDCameraInfo> video = camera.video();
-    if (const auto* problem = std::get_if<Problem>(&video)) return terminal.report(*problem);
+    const Result<SLibDCameraInfo> video = camera->video();
+    if (!video) return terminal.report(video.error());
     SLibDFixedCameraInfo offer;
-    const ELibDReturnCode result = camera.device().GetFixedCameraInfo(offer);
-    if (result != LIBD_OK) return terminal.report(camera.explain(result));
+    const ELibDReturnCode result = camera->device().GetFixedCameraInfo(offer);
+    if (result != LIBD_OK) return terminal.report(camera->explain(result));
     const Json json = to_json(offer);
     return write_result(terminal, options_.camera.json ? to_text(json) : offer_table(json));
   }
@@ -151,18 +150,17 @@ class ExposureCommand final : public Command {
 
   ExitCode run(Terminal& terminal) override {
     if (const auto problem = check(options_)) return terminal.report(*problem);
-    const Result<ModelCamera> opened = ModelCamera::open(options_.model, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
+    const Result<ModelCamera> camera = ModelCamera::open(options_.model, terminal);
+    if (!camera) return terminal.report(camera.error());
     if (options_.mode) {
-      if (const auto problem = change(camera)) return terminal.report(*problem);
+      if (const auto problem = change(*camera)) return terminal.report(*problem);
     }
     // Without a profile the driver still changes the mode; only the list is not known.
-    if (!options_.mode && camera.profile().control.brightModes.empty()) {
+    if (!options_.mode && camera->profile().control.brightModes.empty()) {
       return terminal.report({ExitCode::kUsage, "the camera's model offers no exposure modes",
                               "Its profile decides; --profile names another."});
     }
-    const Json json = exposure_json(camera.profile());
+    const Json json = exposure_json(camera->profile());
     return write_result(terminal, options_.model.camera.json ? to_text(json) : exposure_table(json));
   }
 

@@ -75,16 +75,15 @@ class DetectionCommand final : public Command {
     if (action_ == "draw") {
       if (const auto problem = check_picture_file(out_)) return terminal.report(*problem);
     }
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
     std::vector<SLibDDetectionParam> settings;
     ELibDPositionMode position = LIBD_POSITION_PRESET;
-    const ELibDReturnCode read = camera.device().GetObjectDetectionSetting(settings, position);
-    if (read != LIBD_OK) return terminal.report(camera.explain(read));
-    if (action_ == "show") return show(terminal, camera, settings);
-    if (action_ == "draw") return draw(terminal, camera, settings);
-    return set(terminal, camera, settings);
+    const ELibDReturnCode read = camera->device().GetObjectDetectionSetting(settings, position);
+    if (read != LIBD_OK) return terminal.report(camera->explain(read));
+    if (action_ == "show") return show(terminal, *camera, settings);
+    if (action_ == "draw") return draw(terminal, *camera, settings);
+    return set(terminal, *camera, settings);
   }
 
  private:
@@ -185,11 +184,10 @@ class TamperingCommand final : public Command {
     if (!on) return terminal.report(no_switch("tampering"));
     const auto level = value_named(kTamperLevels, level_);
     if (!level) return terminal.report(usage("there is no such level", "It is low, middle or high."));
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
-    const ELibDReturnCode result = camera.device().SetTamperingAlarm(*on, *level);
-    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera.explain_change("tampering detection", result));
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
+    const ELibDReturnCode result = camera->device().SetTamperingAlarm(*on, *level);
+    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera->explain_change("tampering detection", result));
   }
 
  private:
@@ -211,11 +209,10 @@ class AudioDetectionCommand final : public Command {
   ExitCode run(Terminal& terminal) override {
     const std::optional<bool> on = switch_of(switch_);
     if (!on) return terminal.report(no_switch("audio-detection"));
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
-    const ELibDReturnCode result = camera.device().SetAudioDetection(*on);
-    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera.explain_change("audio detection", result));
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
+    const ELibDReturnCode result = camera->device().SetAudioDetection(*on);
+    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera->explain_change("audio detection", result));
   }
 
  private:

@@ -17,18 +17,17 @@ std::optional<Problem> check_picture_file(const std::string& file) {
 std::optional<Problem> draw_detection(const ModelCamera& camera, const SLibDDetectionParam& setting,
                                       const std::string& file) {
   const Result<LiveCamera*> live = camera.live();
-  if (const auto* problem = std::get_if<Problem>(&live)) return *problem;
-  LiveCamera& player = *std::get<LiveCamera*>(live);
+  if (!live) return live.error();
+  LiveCamera& player = **live;
   LivePictures pictures(player);
   if (auto problem = await_key_frame(player, pictures)) return problem;
   const FrameRun run = pictures.newest();
-  Result<Picture> decoded = decode_picture(run.codec, run.frames);
-  if (const auto* problem = std::get_if<Problem>(&decoded)) return *problem;
-  auto& picture = std::get<Picture>(decoded);
-  draw_windows(picture, setting);
-  const auto bytes = encode_picture(picture, picture_format_of(file).value_or(PictureFormat::kPng));
-  if (const auto* problem = std::get_if<Problem>(&bytes)) return *problem;
-  return write_whole_file(file, std::get<std::vector<std::uint8_t>>(bytes));
+  Result<Picture> picture = decode_picture(run.codec, run.frames);
+  if (!picture) return picture.error();
+  draw_windows(*picture, setting);
+  const auto bytes = encode_picture(*picture, picture_format_of(file).value_or(PictureFormat::kPng));
+  if (!bytes) return bytes.error();
+  return write_whole_file(file, *bytes);
 }
 
 }  // namespace vexa::host

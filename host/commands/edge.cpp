@@ -68,11 +68,10 @@ class CardModeAction final : public CameraAction {
   }
 
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
-    const Result<CardMode> asked = camera.card_mode();
-    if (const auto* problem = std::get_if<Problem>(&asked)) return terminal.report(*problem);
-    const auto& mode = std::get<CardMode>(asked);
-    if (switch_.empty()) return write_result(terminal, json() ? to_text(mode_object(mode)) : mode_table(mode));
-    return set(camera, mode.recording, terminal);
+    const Result<CardMode> mode = camera.card_mode();
+    if (!mode) return terminal.report(mode.error());
+    if (switch_.empty()) return write_result(terminal, json() ? to_text(mode_object(*mode)) : mode_table(*mode));
+    return set(camera, mode->recording, terminal);
   }
 
  private:
@@ -103,10 +102,9 @@ class ListRecordingsAction final : public CameraAction {
   CLI::App* declare(CLI::App& group) override { return group.add_subcommand("list", "Show the recordings"); }
 
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
-    const Result<StoredRecordings> listed = list_recordings(camera);
-    if (const auto* problem = std::get_if<Problem>(&listed)) return terminal.report(*problem);
-    const auto& records = std::get<StoredRecordings>(listed);
-    return write_result(terminal, json() ? json_of(records) : table_of(records));
+    const Result<StoredRecordings> records = list_recordings(camera);
+    if (!records) return terminal.report(records.error());
+    return write_result(terminal, json() ? json_of(*records) : table_of(*records));
   }
 };
 
@@ -151,8 +149,7 @@ class DeleteRecordingsAction final : public CameraAction {
   [[nodiscard]] std::optional<Problem> find(const ModelCamera& camera) const {
     if (all_) return std::nullopt;
     const Result<SLibDEdgeStorageRecord> found = find_recording(camera, name_);
-    const auto* problem = std::get_if<Problem>(&found);
-    return problem != nullptr ? std::optional(*problem) : std::nullopt;
+    return found ? std::nullopt : std::optional(found.error());
   }
 
   // Nothing when nobody is there to answer.
@@ -173,17 +170,17 @@ class DeleteRecordingsAction final : public CameraAction {
 Result<StoredRecordings> list_recordings(const ModelCamera& camera) {
   SLibDEdgeStorageRecordList list;
   const ELibDReturnCode result = camera.device().GetEdgeStorageRecordList(list);
-  if (result != LIBD_OK) return camera.explain(result);
+  if (result != LIBD_OK) return fail(camera.explain(result));
   return std::move(list.records);
 }
 
 Result<SLibDEdgeStorageRecord> find_recording(const ModelCamera& camera, const std::string& name) {
   const Result<StoredRecordings> listed = list_recordings(camera);
-  if (const auto* problem = std::get_if<Problem>(&listed)) return *problem;
-  for (const SLibDEdgeStorageRecord& record : std::get<StoredRecordings>(listed)) {
+  if (!listed) return fail(listed.error());
+  for (const SLibDEdgeStorageRecord& record : *listed) {
     if (record.streamName == name) return record;
   }
-  return usage("the card holds no recording of that name", "vexactl edge CAMERA list shows those there are.");
+  return fail(usage("the card holds no recording of that name", "vexactl edge CAMERA list shows those there are."));
 }
 
 std::unique_ptr<Command> make_edge_command() {

@@ -149,8 +149,8 @@ class PlayRecordingAction final : public PlaybackAction {
 
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
     const Result<SLibDEdgeStorageRecord> found = find_recording(camera, name());
-    if (const auto* problem = std::get_if<Problem>(&found)) return terminal.report(*problem);
-    return tell(take(camera, std::get<SLibDEdgeStorageRecord>(found), nullptr, terminal), terminal);
+    if (!found) return terminal.report(found.error());
+    return tell(take(camera, *found, nullptr, terminal), terminal);
   }
 };
 
@@ -173,16 +173,15 @@ class GetRecordingAction final : public PlaybackAction {
   }
 
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
-    const Result<SLibDEdgeStorageRecord> found = find_recording(camera, name());
-    if (const auto* problem = std::get_if<Problem>(&found)) return terminal.report(*problem);
-    const auto& record = std::get<SLibDEdgeStorageRecord>(found);
-    const std::string codec = played_codec(record).value_or("");
+    const Result<SLibDEdgeStorageRecord> record = find_recording(camera, name());
+    if (!record) return terminal.report(record.error());
+    const std::string codec = played_codec(*record).value_or("");
     if (const auto promised = target().codec(); promised && *promised != codec) {
-      return terminal.report({ExitCode::kNoVideo, fmt::format("the recording is of {}", printable(record.imageCodec)),
+      return terminal.report({ExitCode::kNoVideo, fmt::format("the recording is of {}", printable(record->imageCodec)),
                               fmt::format("Let --out end in {} or .mkv.", usual_end(codec))});
     }
     const std::unique_ptr<PictureTarget> file = target().open(codec);
-    return tell(take(camera, record, file.get(), terminal), terminal);
+    return tell(take(camera, *record, file.get(), terminal), terminal);
   }
 
  private:
@@ -212,12 +211,12 @@ class BackfillAction final : public PlaybackAction {
 
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
     const Result<StoredRecordings> listed = list_recordings(camera);
-    if (const auto* problem = std::get_if<Problem>(&listed)) return terminal.report(*problem);
+    if (!listed) return terminal.report(listed.error());
     if (const auto problem = make_folder()) return terminal.report(*problem);
     const std::chrono::seconds since = *utc_moment(since_);
     ExitCode code = ExitCode::kOk;
     Json list = Json::array();
-    for (const SLibDEdgeStorageRecord& record : std::get<StoredRecordings>(listed)) {
+    for (const SLibDEdgeStorageRecord& record : *listed) {
       if (end_of(record) < since) continue;
       const TakenRecording taken = fetch(camera, record, terminal);
       if (taken.problem) code = terminal.report(*taken.problem);

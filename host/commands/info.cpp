@@ -70,13 +70,12 @@ class InfoCommand final : public Command {
   }
 
   ExitCode run(Terminal& terminal) override {
-    Result<OpenCamera> opened = open_camera(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    auto& camera = std::get<OpenCamera>(opened);
-    const Result<LiveCamera::Identity> identity = camera.driver->identify(kStream);
-    if (const auto* problem = std::get_if<Problem>(&identity)) return terminal.report(*problem);
-    CameraFacts facts{camera.address, std::get<LiveCamera::Identity>(identity), {}};
-    camera.driver->GetFixedSystemInfo(facts.driver);
+    Result<OpenCamera> camera = open_camera(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
+    const Result<LiveCamera::Identity> identity = camera->driver->identify(kStream);
+    if (!identity) return terminal.report(identity.error());
+    CameraFacts facts{camera->address, *identity, {}};
+    camera->driver->GetFixedSystemInfo(facts.driver);
     return write_result(terminal, options_.json ? to_text(to_json(facts)) : to_table(facts));
   }
 

@@ -94,8 +94,8 @@ class ListenCommand final : public Command {
     FrameFile file = to_standard_output() ? FrameFile("standard output", terminal.results()) : FrameFile(out_);
     if (const auto problem = file.check()) return terminal.report(*problem);
     Result<OpenCamera> opened = open_camera(camera_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    return listen(std::get<OpenCamera>(opened), file, terminal);
+    if (!opened) return terminal.report(opened.error());
+    return listen(*opened, file, terminal);
   }
 
  private:

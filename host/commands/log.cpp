@@ -72,12 +72,11 @@ class LogView {
 
   ExitCode read_to_end() {
     while (!Interrupt::requested()) {
-      const Result<std::size_t> count = file_.read(piece_);
-      if (const auto* problem = std::get_if<Problem>(&count)) return terminal_.report(*problem);
-      const std::size_t length = std::get<std::size_t>(count);
-      if (length == 0) break;
-      bytes_ += length;
-      reader_.feed({piece_.data(), length});
+      const Result<std::size_t> length = file_.read(piece_);
+      if (!length) return terminal_.report(length.error());
+      if (*length == 0) break;
+      bytes_ += *length;
+      reader_.feed({piece_.data(), *length});
       const ExitCode written = write_rows();
       if (written != ExitCode::kOk) return written;
     }

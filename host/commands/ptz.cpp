@@ -296,10 +296,10 @@ class AreaAction final : public CameraAction {
 
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
     const Result<SLibDCameraInfo> video = camera.video();
-    if (const auto* problem = std::get_if<Problem>(&video)) return terminal.report(*problem);
+    if (!video) return terminal.report(video.error());
     SLibDResolutionInfo size;
-    size.width = std::get<SLibDCameraInfo>(video).imageWidth;
-    size.height = std::get<SLibDCameraInfo>(video).imageHeight;
+    size.width = video->imageWidth;
+    size.height = video->imageHeight;
     CLibraryDevice& device = camera.device();
     const ELibDReturnCode result =
         place_.size() == 2 ? device.PanTiltDirect(on_picture(0), on_picture(1), size)

@@ -133,8 +133,8 @@ class RecordCommand final : public Command {
     if (const auto problem = target.check()) return terminal.report(*problem);
     options_.camera.transport = transport_of(options_.video);
     Result<OpenCamera> opened = open_camera(options_.camera, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    return record(std::get<OpenCamera>(opened), target, terminal);
+    if (!opened) return terminal.report(opened.error());
+    return record(*opened, target, terminal);
   }
 
  private:
@@ -147,18 +147,17 @@ class RecordCommand final : public Command {
   ExitCode record(OpenCamera& camera, const RecordingTarget& target, Terminal& terminal) {
     terminal.progress("connecting");
     // Asked first: it finds a wrong address or password within the time-out, which opening a stream may exceed.
-    const Result<LiveCamera::Identity> identified = camera.driver->identify(options_.video.stream);
-    if (const auto* problem = std::get_if<Problem>(&identified)) return terminal.report(*problem);
-    const auto& identity = std::get<LiveCamera::Identity>(identified);
-    if (const auto problem = other_codec(target, identity.video)) return terminal.report(*problem);
-    const std::unique_ptr<PictureTarget> file = target.open(identity.video.codecName);
+    const Result<LiveCamera::Identity> identity = camera.driver->identify(options_.video.stream);
+    if (!identity) return terminal.report(identity.error());
+    if (const auto problem = other_codec(target, identity->video)) return terminal.report(*problem);
+    const std::unique_ptr<PictureTarget> file = target.open(identity->video.codecName);
     Interrupt::finish_orderly();
     const ELibDReturnCode result = camera.driver->StartVideoStreaming();
     if (result != LIBD_OK) return terminal.report(camera.driver->explain(result));
     Recorder recorder(*camera.driver, *file,
                       {.seconds = options_.seconds,
                        .frames = options_.frames,
-                       .camera_rate = static_cast<double>(identity.video.frameRate),
+                       .camera_rate = static_cast<double>(identity->video.frameRate),
                        .silence = silence()});
     const RecordingEnd end = recorder.run(progress_on(terminal));
     const Clock::time_point ended = Clock::now();
@@ -166,8 +165,8 @@ class RecordCommand final : public Command {
     camera.driver->StopVideoStreaming();
     std::optional<Problem> problem = recorder.problem();
     if (const auto at_close = file->close(); at_close && !problem) problem = at_close;
-    const ExitCode written = summarise({to_string(camera.address), identity.system.modelName, file->path(),
-                                        identity.video.codecName, end, recorder.meter(), ended},
+    const ExitCode written = summarise({to_string(camera.address), identity->system.modelName, file->path(),
+                                        identity->video.codecName, end, recorder.meter(), ended},
                                        terminal);
     if (problem) return terminal.report(*problem);
     const ExitCode code = judge(end, terminal);

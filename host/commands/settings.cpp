@@ -26,11 +26,10 @@ class SettingsCommand final : public Command {
 
   ExitCode run(Terminal& terminal) override {
     const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const Result<Json> settings = read_settings(std::get<ModelCamera>(opened));
-    if (const auto* problem = std::get_if<Problem>(&settings)) return terminal.report(*problem);
-    const auto& json = std::get<Json>(settings);
-    return write_result(terminal, options_.camera.json ? to_text(json) : settings_table(json));
+    if (!opened) return terminal.report(opened.error());
+    const Result<Json> json = read_settings(*opened);
+    if (!json) return terminal.report(json.error());
+    return write_result(terminal, options_.camera.json ? to_text(*json) : settings_table(*json));
   }
 
  private:
@@ -54,17 +53,15 @@ class SetCommand final : public Command {
 
   ExitCode run(Terminal& terminal) override {
     const Result<SettingChanges> changes = parse_changes(changes_);
-    if (const auto* problem = std::get_if<Problem>(&changes)) return terminal.report(*problem);
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
-    if (const auto problem = change_settings(camera, std::get<SettingChanges>(changes))) {
+    if (!changes) return terminal.report(changes.error());
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
+    if (const auto problem = change_settings(*camera, *changes)) {
       return terminal.report(*problem);
     }
-    const Result<Json> settings = read_settings(camera);
-    if (const auto* problem = std::get_if<Problem>(&settings)) return terminal.report(*problem);
-    const auto& json = std::get<Json>(settings);
-    return write_result(terminal, options_.camera.json ? to_text(json) : settings_table(json));
+    const Result<Json> json = read_settings(*camera);
+    if (!json) return terminal.report(json.error());
+    return write_result(terminal, options_.camera.json ? to_text(*json) : settings_table(*json));
   }
 
  private:
@@ -88,11 +85,10 @@ class DayNightCommand final : public Command {
     if (mode_ && !changes.day_night) {
       return terminal.report({ExitCode::kUsage, "there is no such day/night mode", "It is auto, day or night."});
     }
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
-    if (const auto problem = change_settings(camera, changes)) return terminal.report(*problem);
-    return show(camera, terminal);
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
+    if (const auto problem = change_settings(*camera, changes)) return terminal.report(*problem);
+    return show(*camera, terminal);
   }
 
  private:

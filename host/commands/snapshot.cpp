@@ -38,36 +38,34 @@ class SnapshotCommand final : public Command {
     if (const auto problem = FrameFile(out_).check()) return terminal.report(*problem);
     camera_.transport = transport_of(video_);
     Result<OpenCamera> opened = open_camera(camera_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    return take(std::get<OpenCamera>(opened), *format, terminal);
+    if (!opened) return terminal.report(opened.error());
+    return take(*opened, *format, terminal);
   }
 
  private:
   ExitCode take(OpenCamera& camera, PictureFormat format, Terminal& terminal) {
     terminal.progress("connecting");
-    const Result<LiveCamera::Identity> identified = camera.driver->identify(video_.stream);
-    if (const auto* problem = std::get_if<Problem>(&identified)) return terminal.report(*problem);
-    const auto& identity = std::get<LiveCamera::Identity>(identified);
-    const std::string& codec = identity.video.codecName;
+    const Result<LiveCamera::Identity> identity = camera.driver->identify(video_.stream);
+    if (!identity) return terminal.report(identity.error());
+    const std::string& codec = identity->video.codecName;
     const bool possible = has_ffmpeg() || (format == PictureFormat::kJpeg && makes_jpeg_of(codec));
     if (!possible) return terminal.report(without_ffmpeg(fmt::format("a picture of {} video", printable(codec))));
     terminal.progress("waiting for a key picture");
-    const Result<FrameBytes> picture = newest_picture(*camera.driver, format);
-    if (const auto* problem = std::get_if<Problem>(&picture)) return terminal.report(*problem);
-    const auto& bytes = std::get<FrameBytes>(picture);
-    if (const auto problem = write_whole_file(out_, bytes)) return terminal.report(*problem);
-    return summarise(camera, identity, bytes.size(), terminal);
+    const Result<FrameBytes> bytes = newest_picture(*camera.driver, format);
+    if (!bytes) return terminal.report(bytes.error());
+    if (const auto problem = write_whole_file(out_, *bytes)) return terminal.report(*problem);
+    return summarise(camera, *identity, bytes->size(), terminal);
   }
 
   // As the bytes of a file.
   static Result<FrameBytes> newest_picture(LiveCamera& camera, PictureFormat format) {
     LivePictures pictures(camera);
-    if (auto problem = await_key_frame(camera, pictures)) return *problem;
+    if (auto problem = await_key_frame(camera, pictures)) return fail(*std::move(problem));
     const FrameRun run = pictures.newest();
     if (format == PictureFormat::kJpeg) return jpeg_of(run.codec, run.frames);
     const Result<Picture> decoded = decode_picture(run.codec, run.frames);
-    if (const auto* problem = std::get_if<Problem>(&decoded)) return *problem;
-    return encode_picture(std::get<Picture>(decoded), format);
+    if (!decoded) return fail(decoded.error());
+    return encode_picture(*decoded, format);
   }
 
   ExitCode summarise(const OpenCamera& camera, const LiveCamera::Identity& identity, std::size_t size,

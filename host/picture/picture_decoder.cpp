@@ -29,7 +29,7 @@ Problem without_ffmpeg(const std::string& what) {
 #ifndef VEXA_WITH_FFMPEG
 
 Result<Picture> decode_picture(const std::string& codec, const std::vector<FrameBytes>&) {
-  return without_ffmpeg(fmt::format("decoding {}", printable(codec)));
+  return fail(without_ffmpeg(fmt::format("decoding {}", printable(codec))));
 }
 
 #else
@@ -97,7 +97,7 @@ std::optional<Picture> to_rgb(const AVFrame& frame) {
 Result<Picture> decode_picture(const std::string& codec, const std::vector<FrameBytes>& frames) {
   av_log_set_level(AV_LOG_QUIET);  // failures are told here, in this program's words
   const FfmpegHandle<AVCodecContext> decoder = open_decoder(codec);
-  if (!decoder) return undecodable(codec, "there is no decoder for it");
+  if (!decoder) return fail(undecodable(codec, "there is no decoder for it"));
   FfmpegHandle<AVFrame> last;
   int error = 0;
   for (const FrameBytes& frame : frames) {
@@ -106,9 +106,9 @@ Result<Picture> decode_picture(const std::string& codec, const std::vector<Frame
   }
   avcodec_send_packet(decoder.get(), nullptr);  // what still waits for later pictures comes out
   take_pictures(*decoder, last);
-  if (!last) return undecodable(codec, error < 0 ? ffmpeg_error_text(error) : "it holds no picture");
+  if (!last) return fail(undecodable(codec, error < 0 ? ffmpeg_error_text(error) : "it holds no picture"));
   if (auto picture = to_rgb(*last)) return *std::move(picture);
-  return undecodable(codec, "its pixels cannot be converted");
+  return fail(undecodable(codec, "its pixels cannot be converted"));
 }
 
 #endif

@@ -32,14 +32,14 @@ bool makes_jpeg_of(const std::string& codec) { return codec == "JPEG" || has_ffm
 Result<std::vector<std::uint8_t>> jpeg_of(const std::string& codec, const std::vector<FrameBytes>& frames) {
   if (codec == "JPEG" && !frames.empty()) return frames.back();
   const Result<Picture> picture = decode_picture(codec, frames);
-  if (const auto* problem = std::get_if<Problem>(&picture)) return *problem;
-  return encode_picture(std::get<Picture>(picture), PictureFormat::kJpeg);
+  if (!picture) return fail(picture.error());
+  return encode_picture(*picture, PictureFormat::kJpeg);
 }
 
 #ifndef VEXA_WITH_FFMPEG
 
 Result<std::vector<std::uint8_t>> encode_picture(const Picture&, PictureFormat) {
-  return without_ffmpeg("writing a picture");
+  return fail(without_ffmpeg("writing a picture"));
 }
 
 #else
@@ -95,14 +95,14 @@ FfmpegHandle<AVFrame> frame_of(const Picture& picture, const AVCodecContext& enc
 Result<std::vector<std::uint8_t>> encode_picture(const Picture& picture, PictureFormat format) {
   av_log_set_level(AV_LOG_QUIET);
   const FfmpegHandle<AVCodecContext> encoder = open_encoder(picture, format);
-  if (!encoder) return unencodable("there is no encoder for its size");
+  if (!encoder) return fail(unencodable("there is no encoder for its size"));
   const FfmpegHandle<AVFrame> frame = frame_of(picture, *encoder);
   const FfmpegHandle<AVPacket> packet(av_packet_alloc());
-  if (!frame || !packet) return unencodable("there is not enough memory");
+  if (!frame || !packet) return fail(unencodable("there is not enough memory"));
   int error = avcodec_send_frame(encoder.get(), frame.get());
   if (error == 0) error = avcodec_send_frame(encoder.get(), nullptr);
   if (error == 0) error = avcodec_receive_packet(encoder.get(), packet.get());
-  if (error < 0) return unencodable(ffmpeg_error_text(error));
+  if (error < 0) return fail(unencodable(ffmpeg_error_text(error)));
   return std::vector<std::uint8_t>(packet->data, packet->data + packet->size);
 }
 

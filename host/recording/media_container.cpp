@@ -82,17 +82,16 @@ class MediaContainer::Muxer {
   [[nodiscard]] std::optional<Problem> open(const MediaContainer& file, const RecordedPicture& first) {
     av_log_set_level(AV_LOG_QUIET);  // failures are told here, in this program's words
     const FrameBytes picture(first.data, first.data + first.length);
-    const Result<Picture> decoded = decode_picture(file.codec_, {picture});
-    if (const auto* problem = std::get_if<Problem>(&decoded)) return *problem;
-    const auto& size = std::get<Picture>(decoded);
+    const Result<Picture> size = decode_picture(file.codec_, {picture});
+    if (!size) return size.error();
     int result = avformat_alloc_output_context2(&context_, nullptr, muxer_name(file.format_), file.path_.c_str());
     if (result < 0) return unwritten(file.path_, result);
     stream_ = avformat_new_stream(context_, nullptr);
     if (stream_ == nullptr) return unwritten(file.path_, AVERROR(ENOMEM));
     stream_->codecpar->codec_type = AVMEDIA_TYPE_VIDEO;
     stream_->codecpar->codec_id = container_codec(file.codec_);
-    stream_->codecpar->width = size.width;
-    stream_->codecpar->height = size.height;
+    stream_->codecpar->width = size->width;
+    stream_->codecpar->height = size->height;
     stream_->time_base = {1, 90000};  // MP4 takes it, Matroska has its own
     take_headers(codec_headers(file.codec_, picture));
     // Named so that no part of the path is taken for a protocol.

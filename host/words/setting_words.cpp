@@ -102,19 +102,19 @@ Result<SettingChanges> parse_changes(const std::vector<std::string>& texts) {
   for (const std::string& text : texts) {
     const std::size_t equals = text.find('=');
     if (equals == std::string::npos) {
-      return Problem{ExitCode::kUsage, "a setting is not KEY=VALUE", "For instance: codec=H.264 size=1280x720."};
+      return fail(usage("a setting is not KEY=VALUE", "For instance: codec=H.264 size=1280x720."));
     }
     const SettingKey* key = find_key(std::string_view(text).substr(0, equals));
     if (key == nullptr) {
-      return Problem{ExitCode::kUsage, "there is no setting of that name", fmt::format("Known are: {}.", known_keys())};
+      return fail(usage("there is no setting of that name", fmt::format("Known are: {}.", known_keys())));
     }
     if (std::find(seen.begin(), seen.end(), key->key) != seen.end()) {
-      return Problem{ExitCode::kUsage, fmt::format("{} is given twice", key->key), "Give each setting once."};
+      return fail(usage(fmt::format("{} is given twice", key->key), "Give each setting once."));
     }
     seen.push_back(key->key);
     if (!key->take(std::string_view(text).substr(equals + 1), changes)) {
-      return Problem{ExitCode::kUsage, fmt::format("the value of {} cannot be used", key->key),
-                     fmt::format("It takes {}.", key->takes)};
+      return fail(
+          usage(fmt::format("the value of {} cannot be used", key->key), fmt::format("It takes {}.", key->takes)));
     }
   }
   return changes;

@@ -78,8 +78,7 @@ TEST_F(PicturesByCommand, AnAlarmOfAJpegCameraKeepsItsPictureAsItCame) {
 Picture decoded(const std::string& file) {
   const std::string bytes = contents_of(file);
   const auto result = vexa::host::decode_picture("JPEG", {FrameBytes(bytes.begin(), bytes.end())});
-  const auto* picture = std::get_if<Picture>(&result);
-  return picture != nullptr ? *picture : Picture();
+  return result.value_or(Picture());
 }
 
 // How far a pixel is from a colour.

@@ -12,9 +12,7 @@ using vexa_test::TemporaryFolder;
 
 std::string loaded(const CredentialSources& sources) {
   const auto result = load_credentials(sources);
-  if (const auto* problem = std::get_if<Problem>(&result)) return "refused: " + problem->text;
-  const auto& credentials = std::get<Credentials>(result);
-  return credentials.user + "|" + credentials.password;
+  return result ? result->user + "|" + result->password : "refused: " + result.error().text;
 }
 
 TEST(CredentialSources, NobodyGivesNothing) { EXPECT_EQ(loaded({}), "|"); }

@@ -7,8 +7,7 @@ namespace {
 
 std::string refusal_of(const std::vector<std::string>& texts) {
   const Result<SettingChanges> changes = parse_changes(texts);
-  const auto* problem = std::get_if<Problem>(&changes);
-  return problem == nullptr ? "taken" : problem->text + " | " + problem->advice;
+  return changes ? "taken" : changes.error().text + " | " + changes.error().advice;
 }
 
 TEST(SettingWords, ReadsEverySetting) {
@@ -16,8 +15,8 @@ TEST(SettingWords, ReadsEverySetting) {
       parse_changes({"codec=H.264", "size=1280x720", "frame-rate=25", "bit-rate=4000", "quality=5", "rotation=180",
                      "day-night=night", "noise-reduction=mid", "wide-dynamic-range=on", "visibility-enhancer=low",
                      "infrared=daynight", "infrared-strength=7", "back-light=off", "exposure=Iris Priority"});
-  ASSERT_TRUE(std::holds_alternative<SettingChanges>(parsed)) << std::get<Problem>(parsed).text;
-  const auto& changes = std::get<SettingChanges>(parsed);
+  ASSERT_TRUE(parsed) << parsed.error().text;
+  const auto& changes = *parsed;
   EXPECT_EQ(changes.codec, "H.264");
   EXPECT_EQ(changes.size->text, "1280x720");
   EXPECT_EQ(changes.size->width, 1280);
