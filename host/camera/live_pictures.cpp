@@ -8,7 +8,6 @@
 namespace vexa::host {
 namespace {
 
-constexpr std::chrono::milliseconds kNoPicturePause{3};
 constexpr std::chrono::seconds kLongestWaitForKey{30};
 // A camera that never sends a key frame again does not fill the memory.
 constexpr std::size_t kMostKeptBytes = std::size_t{64} * 1024 * 1024;
@@ -34,7 +33,7 @@ LivePictures::Look LivePictures::look() {
   frame.sink = this;
   const ELibDReturnCode result = camera_.GetCurrentVideoFrame(frame);
   if (result == LIBD_NO_FRAME) {
-    Interrupt::wait(kNoPicturePause);
+    Interrupt::wait(kPollPause);
     return Look::kNothing;
   }
   if (result != LIBD_OK) return Look::kSilent;

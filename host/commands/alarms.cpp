@@ -1,15 +1,14 @@
 // vexactl io, output and watch: a camera's pins, its outputs, and its alarms as they come.
 #include <fmt/format.h>
 
-#include <atomic>
 #include <nlohmann/json.hpp>
 #include <optional>
-#include <thread>
 #include <vector>
 
 #include "host/base/json_text.h"
 #include "host/camera/model_camera.h"
 #include "host/commands/alarm_snapshots.h"
+#include "host/commands/alarm_watch.h"
 #include "host/commands/command.h"
 #include "host/console/interrupt.h"
 #include "host/console/result_output.h"
@@ -19,11 +18,6 @@ namespace vexa::host {
 namespace {
 
 using Json = nlohmann::ordered_json;
-
-// Detectors of simple cameras report as one item, all others window by window.
-void follow_detection(const ModelCamera& camera) {
-  camera.device().SetVMDtype(camera.profile().lodDetection ? LIBD_VMD_VMF : LIBD_VMD_WINDOW);
-}
 
 class IoCommand final : public Command {
  public:
@@ -152,95 +146,21 @@ class WatchCommand final : public Command {
     Interrupt::finish_orderly();
     std::optional<AlarmSnapshots> snapshots;
     if (snapshot_folder_) {
-      snapshots_ = &snapshots.emplace(*snapshot_folder_);
-      if (const auto problem = snapshots_->start(*camera)) return terminal.report(*problem);
+      snapshots.emplace(*snapshot_folder_);
+      if (const auto problem = snapshots->start(*camera)) return terminal.report(*problem);
     }
-    return watch(*camera, terminal);
+    return AlarmWatch(*camera, terminal, watch_options(), snapshots ? &*snapshots : nullptr).run();
   }
 
  private:
-  ExitCode watch(const ModelCamera& camera, Terminal& terminal) {
-    follow_detection(camera);
-    ELibDReturnCode started = camera.device().StartIoStreaming();
-    if (started == LIBD_OK && metadata_) started = camera.device().StartModRawData();
-    if (started != LIBD_OK) return terminal.report(camera.explain(started));
-    std::thread frames;
-    if (metadata_) frames = std::thread([&] { note(watch_metadata(camera, terminal)); });
-    note(watch_alarms(camera, terminal));
-    if (frames.joinable()) frames.join();
-    camera.device().StopModRawData();
-    camera.device().StopIoStreaming();
-    if (failure_) return terminal.report(*failure_);
-    return Interrupt::requested() ? ExitCode::kInterrupted : ExitCode::kOk;
-  }
-
-  [[nodiscard]] WatchFormat format() const { return options_.camera.json ? WatchFormat::kJson : WatchFormat::kText; }
-  [[nodiscard]] bool goes_on() const { return !over_ && !Interrupt::requested(); }
-
-  // What ends one of the two threads ends the other.
-  void note(const std::optional<Problem>& problem) {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    over_ = true;
-    if (problem && !failure_) failure_ = problem;
-  }
-
-  std::optional<Problem> say(Terminal& terminal, const std::string& line) {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    if (over_) return std::nullopt;
-    const int error = terminal.write_result(line);
-    if (error != 0) {
-      return Problem{ExitCode::kCannotWrite, "an alarm cannot be written", "Is standard output still open?"};
-    }
-    over_ = ++lines_ == count_;
-    return std::nullopt;
-  }
-
-  std::optional<Problem> watch_alarms(const ModelCamera& camera, Terminal& terminal) {
-    PinStates states;
-    while (goes_on()) {
-      std::vector<SLibDPinInfo> pins;
-      const ELibDReturnCode result = camera.device().GetCurrentIoStatus(pins);
-      if (result == LIBD_NO_FRAME) continue;
-      if (result != LIBD_OK) return camera.explain(result);
-      const std::string moment = moment_text(std::chrono::system_clock::now());
-      for (const SLibDPinInfo& pin : states.changed(pins)) {
-        if (auto problem = say(terminal, alarm_line(pin, moment, format()))) return problem;
-        if (auto problem = take_snapshot(terminal, pin, moment)) return problem;
-      }
-    }
-    return std::nullopt;
-  }
-
-  // An alarm without a picture is better than none: only a folder that takes no file ends the watch.
-  std::optional<Problem> take_snapshot(Terminal& terminal, const SLibDPinInfo& pin, const std::string& moment) {
-    if (snapshots_ == nullptr || pin.state == 0) return std::nullopt;
-    auto problem = snapshots_->take(pin, moment);
-    if (!problem || problem->code == ExitCode::kCannotWrite) return problem;
-    terminal.say("vexactl: no picture of this alarm: " + problem->text);
-    return std::nullopt;
-  }
-
-  std::optional<Problem> watch_metadata(const ModelCamera& camera, Terminal& terminal) {
-    SLibDRawMDFrameInfo frame;
-    while (goes_on()) {
-      const ELibDReturnCode result = camera.device().GetCurrentPosition(frame);
-      if (result == LIBD_NO_FRAME) continue;
-      if (result != LIBD_OK) return camera.explain(result);
-      const std::string moment = moment_text(std::chrono::system_clock::now());
-      if (auto problem = say(terminal, metadata_line(frame, moment, format()))) return problem;
-    }
-    return std::nullopt;
+  [[nodiscard]] AlarmWatchOptions watch_options() const {
+    return {options_.camera.json ? WatchFormat::kJson : WatchFormat::kText, metadata_, count_};
   }
 
   ModelOptions options_;
   bool metadata_ = false;
   std::optional<std::string> snapshot_folder_;
-  AlarmSnapshots* snapshots_ = nullptr;  // while they are taken
-  std::uint64_t count_ = 0;              // 0: no such end
-  std::mutex mutex_;
-  std::uint64_t lines_ = 0;
-  std::atomic<bool> over_{false};
-  std::optional<Problem> failure_;
+  std::uint64_t count_ = 0;  // 0: no such end
 };
 
 }  // namespace

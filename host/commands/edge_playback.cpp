@@ -10,6 +10,7 @@
 #include "host/base/printable.h"
 #include "host/commands/edge_actions.h"
 #include "host/console/interrupt.h"
+#include "host/console/progress.h"
 #include "host/console/result_output.h"
 #include "host/picture/picture_decoder.h"
 #include "host/recording/playback_taker.h"
@@ -19,8 +20,6 @@ namespace vexa::host {
 namespace {
 
 using Json = nlohmann::ordered_json;
-
-constexpr std::chrono::milliseconds kProgressEvery{250};
 
 // What came of a recording.
 struct TakenRecording {
@@ -124,12 +123,11 @@ class PlaybackAction : public CameraAction {
   }
 
   static PlaybackTaker::Report progress_on(Terminal& terminal, const SLibDEdgeStorageRecord& record) {
-    using Clock = std::chrono::steady_clock;
-    return [&terminal, &record, next = Clock::time_point{}](const PlaybackProgress& progress) mutable {
-      if (!terminal.shows_progress() || Clock::now() < next) return;
-      next = Clock::now() + kProgressEvery;
-      terminal.progress(fmt::format("{:8.1f} of {} s  {:7} frames", progress.taken().count(), record.end - record.start,
-                                    progress.frames));
+    return [&record, line = Progress(terminal)](const PlaybackProgress& progress) mutable {
+      line.show([&] {
+        return fmt::format("{:8.1f} of {} s  {:7} frames", progress.taken().count(), record.end - record.start,
+                           progress.frames);
+      });
     };
   }
 

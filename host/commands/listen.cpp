@@ -14,13 +14,14 @@
 #include "host/camera/camera_options.h"
 #include "host/commands/command.h"
 #include "host/console/interrupt.h"
+#include "host/console/progress.h"
 #include "host/console/result_output.h"
 #include "host/recording/sound_file.h"
 
 namespace vexa::host {
 namespace {
 
-using ListenClock = std::chrono::steady_clock;
+using Clock = std::chrono::steady_clock;
 
 constexpr double kLongestListening = 366.0 * 24 * 3600;
 constexpr char kCompanded[] = "G711";
@@ -59,7 +60,7 @@ class SoundLimit {
   std::optional<std::uint64_t> bytes_;
 };
 
-// What is heard until the camera, the person or the time ends it.
+// How receiving ended: with a problem, with Ctrl-C, or at the limit.
 struct Listening {
   ExitCode code = ExitCode::kOk;
   std::optional<Problem> problem;
@@ -114,15 +115,15 @@ class ListenCommand final : public Command {
     result = camera.driver->StartAudioStreaming();
     if (result != LIBD_OK) return terminal.report(camera.driver->explain(result));
     SoundFile target(file, format);
-    Listening heard = hear(camera, target, SoundLimit(seconds_, sound.bitRate), terminal);
+    Listening received = receive(camera, target, SoundLimit(seconds_, sound.bitRate), terminal);
     camera.driver->StopAudioStreaming();
-    if (const auto at_close = target.close(); at_close && !heard.problem) heard.problem = at_close;
+    if (const auto at_close = target.close(); at_close && !received.problem) received.problem = at_close;
     const ExitCode written = summarise(camera, sound, target.bytes(), terminal);
-    if (heard.problem) return terminal.report(*heard.problem);
-    if (heard.code == ExitCode::kInterrupted) {
+    if (received.problem) return terminal.report(*received.problem);
+    if (received.code == ExitCode::kInterrupted) {
       terminal.say("vexactl: interrupted; what was recorded is complete up to here");
     }
-    return heard.code == ExitCode::kOk ? written : heard.code;
+    return received.code == ExitCode::kOk ? written : received.code;
   }
 
   static ELibDReturnCode switch_on(OpenCamera& camera, const SoundCodec& codec) {
@@ -141,9 +142,11 @@ class ListenCommand final : public Command {
                  "Give --out another ending for the sound as it comes, or switch to --codec g711_64.");
   }
 
-  Listening hear(OpenCamera& camera, SoundFile& target, const SoundLimit& limit, Terminal& terminal) {
+  // Polls the driver until the limit, Ctrl-C or a failure.
+  Listening receive(OpenCamera& camera, SoundFile& target, const SoundLimit& limit, Terminal& terminal) {
     const auto silence = std::chrono::milliseconds(camera_.timeout_ms);
-    auto last = ListenClock::now();
+    auto last = Clock::now();
+    Progress progress(terminal);
     std::array<unsigned char, 4096> piece{};
     while (!limit.reached(target.bytes())) {
       if (Interrupt::requested()) return {ExitCode::kInterrupted, std::nullopt};
@@ -151,19 +154,30 @@ class ListenCommand final : public Command {
       frame.data = piece.data();
       frame.capacity = static_cast<std::int32_t>(piece.size());
       const ELibDReturnCode result = camera.driver->GetCurrentAudioFrame(frame);
-      if (result == LIBD_OK) {
-        last = ListenClock::now();
-        const std::size_t share = limit.share(static_cast<std::size_t>(frame.length), target.bytes());
-        if (auto problem = target.write(piece.data(), share)) {
-          return {problem->code, problem};
-        }
-        terminal.progress(fmt::format("{} bytes of sound", target.bytes()));
-      } else if (result != LIBD_NO_FRAME || ListenClock::now() - last > silence) {
-        return {ExitCode::kNoVideo, Problem{ExitCode::kNoVideo, "the camera has stopped sending sound",
-                                            "Check its network and that its audio input is on."}};
+      if (result == LIBD_NO_FRAME && Clock::now() - last <= silence) {
+        Interrupt::wait(kPollPause);  // a connection that the camera has closed has no sound at once
+        continue;
       }
+      if (result == LIBD_NO_FRAME || result == LIBD_TIMEOUT) return ended_by(silent());
+      if (result != LIBD_OK) return ended_by(broken_off(camera, result));
+      last = Clock::now();
+      const std::size_t share = limit.share(static_cast<std::size_t>(frame.length), target.bytes());
+      if (const auto problem = target.write(piece.data(), share)) return ended_by(*problem);
+      progress.show([&target] { return fmt::format("{} bytes of sound", target.bytes()); });
     }
     return {};
+  }
+
+  static Listening ended_by(const Problem& problem) { return {problem.code, problem}; }
+
+  static Problem silent() {
+    return {ExitCode::kNoVideo, "the camera has stopped sending sound",
+            "Check its network and that its audio input is on."};
+  }
+
+  static Problem broken_off(const OpenCamera& camera, ELibDReturnCode result) {
+    const Problem reason = camera.driver->explain(result);
+    return {ExitCode::kNoVideo, fmt::format("the sound has broken off: {}", reason.text), reason.advice};
   }
 
   ExitCode summarise(const OpenCamera& camera, const SLibDAudioInfo& sound, std::uint64_t bytes, Terminal& terminal) {

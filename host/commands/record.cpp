@@ -11,6 +11,7 @@
 #include "host/camera/video_options.h"
 #include "host/commands/command.h"
 #include "host/console/interrupt.h"
+#include "host/console/progress.h"
 #include "host/console/result_output.h"
 #include "host/recording/recorder.h"
 #include "host/recording/recording_target.h"
@@ -22,7 +23,6 @@ using Json = nlohmann::ordered_json;
 using Clock = RecordingMeter::Clock;
 
 constexpr double kLongestRecording = 366.0 * 24 * 3600;
-constexpr std::chrono::milliseconds kProgressInterval{250};
 constexpr std::chrono::milliseconds kShortestSilence{2000};
 
 struct RecordOptions {
@@ -185,10 +185,8 @@ class RecordCommand final : public Command {
   }
 
   static Recorder::Progress progress_on(Terminal& terminal) {
-    return [&terminal, next = Clock::time_point{}](const RecordingMeter& meter, Clock::time_point now) mutable {
-      if (now < next) return;
-      next = now + kProgressInterval;
-      if (terminal.shows_progress()) terminal.progress(progress_line(meter, now));
+    return [progress = Progress(terminal)](const RecordingMeter& meter, Clock::time_point now) mutable {
+      progress.show([&] { return progress_line(meter, now); });
     };
   }
 

@@ -6,6 +6,9 @@
 
 namespace vexa::host {
 
+// How long to leave a driver alone that has nothing to hand out: short beside a picture's time, long beside a call.
+inline constexpr std::chrono::milliseconds kPollPause{3};
+
 // One for the process; every operation may be called from any thread after install().
 //
 // At first a signal ends the process at once with the exit code of an interruption: nothing is open yet that would need

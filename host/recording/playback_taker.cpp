@@ -9,7 +9,6 @@ namespace {
 
 using Clock = std::chrono::steady_clock;
 
-constexpr std::chrono::milliseconds kPlaybackPoll{3};   // short beside a picture's time
 constexpr std::chrono::milliseconds kLatePicture{500};  // that a picture of the last second may come late
 
 std::chrono::microseconds stamp_of(const SLibDVideoFrameInfo& frame) {
@@ -26,7 +25,7 @@ RecordingEnd PlaybackTaker::run(const Report& report) {
     frame.sink = &picture_;
     if (camera_.GetCurrentVideoFrame(frame) != LIBD_OK) {
       if (const auto end = end_of_silence(Clock::now() - latest)) return *end;
-      Interrupt::wait(kPlaybackPoll);
+      Interrupt::wait(kPollPause);
       continue;
     }
     latest = Clock::now();

@@ -5,12 +5,6 @@
 #include "host/console/interrupt.h"
 
 namespace vexa::host {
-namespace {
-
-// How long to leave the driver alone when no picture waits: short beside a picture's time, long beside a call.
-constexpr std::chrono::milliseconds kPollPause{3};
-
-}  // namespace
 
 const char* name_of(RecordingEnd end) {
   switch (end) {

@@ -159,6 +159,19 @@ TEST_F(VideoCommands, SoundThatStopsEndsWithFour) {
   EXPECT_TRUE(contents_of(folder() / "live.g711") == contents_of(VEXA_CLIPS "/tone.g711_64"));
 }
 
+TEST_F(VideoCommands, SoundThatBreaksOffSaysWhyAndKeepsWhatCame) {
+  start(kVideoCodecs[0]);
+  ProgramRun listen(folder(), vexactl({"listen", place(), "--codec", "g711_64", "--out", "live.g711"}), kCredentials);
+  ASSERT_TRUE(eventually([&] { return size_of("live.g711") > 0; }));
+  camera().unplug();
+  const ProgramResult result = listen.wait();
+  EXPECT_EQ(result.exit_code, 4);
+  EXPECT_EQ(result.err, "vexactl: the sound has broken off: the camera " + place() +
+                            " cannot be used: Connection reset by peer\n"
+                            "  Check that address and HTTP port are the camera's.\n");
+  EXPECT_GT(size_of("live.g711"), 0U);
+}
+
 #ifdef VEXA_WITH_FFMPEG
 
 TEST_F(VideoCommands, RecordFillsContainersWithEveryCodecByEveryTransport) {
