@@ -92,7 +92,7 @@ std::optional<Problem> check_offer(const ModelCamera& camera, const SLibDCameraI
 
 // The camera reports one of the two alone, so that the other codecs' is only known when it is given.
 std::optional<Problem> check_rate(const SLibDCameraInfo& video) {
-  const bool jpeg = video.codecName == "JPEG";
+  const bool jpeg = codec_named(video.codecName) == Codec::kJpeg;
   if ((jpeg ? video.quality : video.bitRate) > 0) return std::nullopt;
   return Problem{ExitCode::kUsage,
                  fmt::format("{} needs {}", printable(video.codecName), jpeg ? "quality" : "bit-rate"),
@@ -102,7 +102,7 @@ std::optional<Problem> check_rate(const SLibDCameraInfo& video) {
 std::optional<Problem> change_stream(const ModelCamera& camera, const SettingChanges& changes) {
   Result<SLibDCameraInfo> video = camera.video();
   if (!video) return video.error();
-  if (changes.codec) video->codecName = *changes.codec;
+  if (changes.codec) video->codecName = name_of(*changes.codec);
   if (changes.size) {
     video->imageWidth = changes.size->width;
     video->imageHeight = changes.size->height;

@@ -3,7 +3,6 @@
 #include <utility>
 
 #include "host/console/interrupt.h"
-#include "vexa/video_info.h"
 
 namespace vexa::host {
 namespace {
@@ -11,20 +10,6 @@ namespace {
 constexpr std::chrono::seconds kLongestWaitForKey{30};
 // A camera that never sends a key frame again does not fill the memory.
 constexpr std::size_t kMostKeptBytes = std::size_t{64} * 1024 * 1024;
-
-// Null for a frame that depends on others.
-const char* codec_of_key_frame(std::int32_t type) {
-  switch (type) {
-    case VIDEO_FRAME_JPEG:
-      return "JPEG";
-    case VIDEO_FRAME_MPEG4_KEY:
-      return "MPEG4";
-    case VIDEO_FRAME_H264_KEY:
-      return "H.264";
-    default:
-      return nullptr;
-  }
-}
 
 }  // namespace
 
@@ -42,14 +27,16 @@ LivePictures::Look LivePictures::look() {
 }
 
 void LivePictures::keep(std::int32_t frame_type) {
-  const char* codec = codec_of_key_frame(frame_type);
+  const std::optional<Codec> codec = codec_of_frame(frame_type);
+  if (!codec) return;
+  const bool key = is_key_frame(frame_type);
   const std::lock_guard<std::mutex> lock(mutex_);
-  if (codec != nullptr || run_bytes_ + received_.size() > kMostKeptBytes) {
+  if (key || run_bytes_ + received_.size() > kMostKeptBytes) {
     run_.frames.clear();
     run_bytes_ = 0;
   }
-  if (codec != nullptr) run_.codec = codec;
-  if (codec == nullptr && run_.frames.empty()) return;
+  if (key) run_.codec = *codec;
+  if (!key && run_.frames.empty()) return;
   run_bytes_ += received_.size();
   run_.frames.push_back(std::exchange(received_, {}));
 }

@@ -14,7 +14,7 @@ namespace vexa::host {
 
 // What it takes to decode a picture, see decode_picture().
 struct FrameRun {
-  std::string codec;
+  Codec codec = Codec::kJpeg;
   std::vector<FrameBytes> frames;  // from a key frame to the picture's own
 };
 

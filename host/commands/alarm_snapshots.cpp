@@ -21,8 +21,8 @@ std::optional<Problem> AlarmSnapshots::start(const ModelCamera& camera) {
   LiveCamera& player = **live;
   pictures_.emplace(player);
   if (auto problem = await_key_frame(player, *pictures_)) return problem;
-  const std::string codec = pictures_->newest().codec;
-  if (!makes_jpeg_of(codec)) return without_ffmpeg("a picture of " + codec);
+  const Codec codec = pictures_->newest().codec;
+  if (!makes_jpeg_of(codec)) return without_ffmpeg(fmt::format("a picture of {}", name_of(codec)));
   player_ = std::thread([this] { play(); });
   return std::nullopt;
 }

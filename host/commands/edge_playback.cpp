@@ -85,7 +85,7 @@ class PlaybackAction : public CameraAction {
   TakenRecording take(const ModelCamera& camera, const SLibDEdgeStorageRecord& record, PictureTarget* target,
                       Terminal& terminal) const {
     TakenRecording taken{record.streamName, target != nullptr ? target->path() : "", RecordingEnd::kSilent, {}, {}};
-    const std::optional<std::string> codec = played_codec(record);
+    const std::optional<Codec> codec = codec_listed_as(record.imageCodec);
     if (!codec) {
       taken.problem =
           Problem{ExitCode::kNoVideo,
@@ -94,7 +94,8 @@ class PlaybackAction : public CameraAction {
       return taken;
     }
     Interrupt::finish_orderly();
-    const ELibDReturnCode started = camera.device().StartEdgeStorageVideoStreaming({record.streamName, *codec, scale_});
+    const ELibDReturnCode started =
+        camera.device().StartEdgeStorageVideoStreaming({record.streamName, name_of(*codec), scale_});
     if (started != LIBD_OK) {
       taken.problem = camera.explain(started);
       return taken;
@@ -173,12 +174,12 @@ class GetRecordingAction final : public PlaybackAction {
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
     const Result<SLibDEdgeStorageRecord> record = find_recording(camera, name());
     if (!record) return terminal.report(record.error());
-    const std::string codec = played_codec(*record).value_or("");
-    if (const auto promised = target().codec(); promised && *promised != codec) {
+    const std::optional<Codec> codec = codec_listed_as(record->imageCodec);
+    if (const auto promised = target().codec(); codec && promised && promised != codec) {
       return terminal.report({ExitCode::kNoVideo, fmt::format("the recording is of {}", printable(record->imageCodec)),
-                              fmt::format("Let --out end in {} or .mkv.", usual_end(codec))});
+                              fmt::format("Let --out end in {} or .mkv.", usual_extension(*codec))});
     }
-    const std::unique_ptr<PictureTarget> file = target().open(codec);
+    const std::unique_ptr<PictureTarget> file = target().open();
     return tell(take(camera, *record, file.get(), terminal), terminal);
   }
 
@@ -238,9 +239,10 @@ class BackfillAction final : public PlaybackAction {
   }
 
   TakenRecording fetch(const ModelCamera& camera, const SLibDEdgeStorageRecord& record, Terminal& terminal) const {
-    const std::string codec = played_codec(record).value_or("");
-    const std::string name = file_name_of(record.streamName, has_ffmpeg() ? ".mkv" : usual_end(codec));
-    const auto file = RecordingTarget(std::filesystem::path(out_) / name, -1).open(codec);
+    const std::optional<Codec> codec = codec_listed_as(record.imageCodec);
+    const std::string extension = has_ffmpeg() || !codec ? ".mkv" : usual_extension(*codec);
+    const std::string name = file_name_of(record.streamName, extension);
+    const auto file = RecordingTarget(std::filesystem::path(out_) / name, -1).open();
     return take(camera, record, file.get(), terminal);
   }
 

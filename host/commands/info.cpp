@@ -3,6 +3,7 @@
 
 #include <nlohmann/json.hpp>
 
+#include "host/base/codec.h"
 #include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/camera/camera_options.h"
@@ -25,7 +26,7 @@ constexpr int kStream = 1;
 std::string video_text(const SLibDCameraInfo& video) {
   std::string text =
       fmt::format("{} {}x{}, {} fps", video.codecName, video.imageWidth, video.imageHeight, video.frameRate);
-  if (video.codecName == "JPEG") return text + fmt::format(", quality {}", video.quality);
+  if (codec_named(video.codecName) == Codec::kJpeg) return text + fmt::format(", quality {}", video.quality);
   return text + fmt::format(", {} kbit/s", video.bitRate);
 }
 

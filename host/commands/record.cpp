@@ -150,7 +150,7 @@ class RecordCommand final : public Command {
     const Result<LiveCamera::Identity> identity = camera.driver->identify(options_.video.stream);
     if (!identity) return terminal.report(identity.error());
     if (const auto problem = other_codec(target, identity->video)) return terminal.report(*problem);
-    const std::unique_ptr<PictureTarget> file = target.open(identity->video.codecName);
+    const std::unique_ptr<PictureTarget> file = target.open();
     Interrupt::finish_orderly();
     const ELibDReturnCode result = camera.driver->StartVideoStreaming();
     if (result != LIBD_OK) return terminal.report(camera.driver->explain(result));
@@ -176,12 +176,14 @@ class RecordCommand final : public Command {
   // When the file's name promises another codec than the camera sends.
   [[nodiscard]] std::optional<Problem> other_codec(const RecordingTarget& target, const SLibDCameraInfo& video) const {
     const auto promised = target.codec();
-    if (!promised || video.codecName == *promised) return std::nullopt;
+    const auto sent = codec_named(video.codecName);
+    if (!promised || sent == promised) return std::nullopt;
     return Problem{
         ExitCode::kNoVideo,
         fmt::format("video stream {} of the camera is set to {}", options_.video.stream, printable(video.codecName)),
-        fmt::format("Set it to {} on the camera, choose another with --stream, or let --out end in {} or .mkv.",
-                    *promised, usual_end(video.codecName))};
+        sent ? fmt::format("Set it to {} on the camera, choose another with --stream, or let --out end in {} or .mkv.",
+                           name_of(*promised), usual_extension(*sent))
+             : fmt::format("Set it to {} on the camera, or choose another with --stream.", name_of(*promised))};
   }
 
   static Recorder::Progress progress_on(Terminal& terminal) {

@@ -48,7 +48,8 @@ class SnapshotCommand final : public Command {
     const Result<LiveCamera::Identity> identity = camera.driver->identify(video_.stream);
     if (!identity) return terminal.report(identity.error());
     const std::string& codec = identity->video.codecName;
-    const bool possible = has_ffmpeg() || (format == PictureFormat::kJpeg && makes_jpeg_of(codec));
+    const bool jpeg_as_sent = format == PictureFormat::kJpeg && codec_named(codec) == Codec::kJpeg;
+    const bool possible = has_ffmpeg() || jpeg_as_sent;
     if (!possible) return terminal.report(without_ffmpeg(fmt::format("a picture of {} video", printable(codec))));
     terminal.progress("waiting for a key picture");
     const Result<FrameBytes> bytes = newest_picture(*camera.driver, format);

@@ -2,10 +2,7 @@
 
 #include <fmt/format.h>
 
-#include "host/base/printable.h"
-
 #ifdef VEXA_WITH_FFMPEG
-#include <algorithm>
 #include <optional>
 
 #include "host/picture/ffmpeg_handles.h"
@@ -28,8 +25,12 @@ Problem without_ffmpeg(const std::string& what) {
 
 #ifndef VEXA_WITH_FFMPEG
 
-Result<Picture> decode_picture(const std::string& codec, const std::vector<FrameBytes>&) {
-  return fail(without_ffmpeg(fmt::format("decoding {}", printable(codec))));
+Result<Picture> decode_picture(Codec codec, const std::vector<FrameBytes>&) {
+  return fail(without_ffmpeg(fmt::format("decoding {}", name_of(codec))));
+}
+
+Result<StreamParameters> read_stream_parameters(Codec codec, const FrameBytes&) {
+  return fail(without_ffmpeg(fmt::format("decoding {}", name_of(codec))));
 }
 
 #else
@@ -39,20 +40,15 @@ namespace {
 // Above the largest cameras; a stream that claims more is refused before memory is taken for it.
 constexpr std::int64_t kMostPixels = 64LL * 1024 * 1024;
 
-AVCodecID decoder_id(const std::string& codec) {
-  if (codec == "JPEG") return AV_CODEC_ID_MJPEG;
-  if (codec == "MPEG4") return AV_CODEC_ID_MPEG4;
-  if (codec == "H.264") return AV_CODEC_ID_H264;
-  return AV_CODEC_ID_NONE;
-}
+constexpr double kFastest = 1000;  // pictures a second; a timing above it is not taken for one
 
-Problem undecodable(const std::string& codec, const std::string& why) {
-  return {ExitCode::kNoVideo, fmt::format("the camera's {} picture cannot be decoded: {}", printable(codec), why),
+Problem undecodable(Codec codec, const std::string& why) {
+  return {ExitCode::kNoVideo, fmt::format("the camera's {} picture cannot be decoded: {}", name_of(codec), why),
           "Try again; if it stays, record the stream and look at it with ffprobe."};
 }
 
-FfmpegHandle<AVCodecContext> open_decoder(const std::string& codec) {
-  const AVCodec* decoder = avcodec_find_decoder(decoder_id(codec));
+FfmpegHandle<AVCodecContext> open_decoder(Codec codec) {
+  const AVCodec* decoder = avcodec_find_decoder(ffmpeg_id(codec));
   if (decoder == nullptr) return nullptr;
   FfmpegHandle<AVCodecContext> context(avcodec_alloc_context3(decoder));
   if (!context) return nullptr;
@@ -71,10 +67,8 @@ void take_pictures(AVCodecContext& decoder, FfmpegHandle<AVFrame>& last) {
 }
 
 int feed(AVCodecContext& decoder, const FrameBytes& bytes) {
-  const FfmpegHandle<AVPacket> packet(av_packet_alloc());
-  if (!packet || av_new_packet(packet.get(), static_cast<int>(bytes.size())) < 0) return AVERROR(ENOMEM);
-  std::copy(bytes.begin(), bytes.end(), packet->data);
-  return avcodec_send_packet(&decoder, packet.get());
+  const FfmpegHandle<AVPacket> packet = packet_of(bytes.data(), bytes.size());
+  return packet ? avcodec_send_packet(&decoder, packet.get()) : AVERROR(ENOMEM);
 }
 
 std::optional<Picture> to_rgb(const AVFrame& frame) {
@@ -92,23 +86,46 @@ std::optional<Picture> to_rgb(const AVFrame& frame) {
   return picture;
 }
 
-}  // namespace
+double stated_rate(const AVCodecContext& decoder) {
+  if (decoder.codec_id != AV_CODEC_ID_H264 || decoder.framerate.num <= 0 || decoder.framerate.den <= 0) return 0;
+  const double rate = av_q2d(decoder.framerate);
+  return rate <= kFastest ? rate : 0;
+}
 
-Result<Picture> decode_picture(const std::string& codec, const std::vector<FrameBytes>& frames) {
-  av_log_set_level(AV_LOG_QUIET);  // failures are told here, in this program's words
-  const FfmpegHandle<AVCodecContext> decoder = open_decoder(codec);
-  if (!decoder) return fail(undecodable(codec, "there is no decoder for it"));
-  FfmpegHandle<AVFrame> last;
+// The last of the frames' pictures, and the decoder that made it.
+struct Decoded {
+  FfmpegHandle<AVCodecContext> decoder;
+  FfmpegHandle<AVFrame> picture;
+};
+
+Result<Decoded> decode(Codec codec, const std::vector<FrameBytes>& frames) {
+  av_log_set_level(AV_LOG_QUIET);  // failures are reported in this program's words
+  Decoded decoded{open_decoder(codec), nullptr};
+  if (!decoded.decoder) return fail(undecodable(codec, "there is no decoder for it"));
   int error = 0;
   for (const FrameBytes& frame : frames) {
-    if (const int fed = feed(*decoder, frame); fed < 0) error = fed;
-    take_pictures(*decoder, last);
+    if (const int fed = feed(*decoded.decoder, frame); fed < 0) error = fed;
+    take_pictures(*decoded.decoder, decoded.picture);
   }
-  avcodec_send_packet(decoder.get(), nullptr);  // what still waits for later pictures comes out
-  take_pictures(*decoder, last);
-  if (!last) return fail(undecodable(codec, error < 0 ? ffmpeg_error_text(error) : "it holds no picture"));
-  if (auto picture = to_rgb(*last)) return *std::move(picture);
+  avcodec_send_packet(decoded.decoder.get(), nullptr);  // what still waits for later pictures comes out
+  take_pictures(*decoded.decoder, decoded.picture);
+  if (decoded.picture) return decoded;
+  return fail(undecodable(codec, error < 0 ? ffmpeg_error_text(error) : "it holds no picture"));
+}
+
+}  // namespace
+
+Result<Picture> decode_picture(Codec codec, const std::vector<FrameBytes>& frames) {
+  const Result<Decoded> decoded = decode(codec, frames);
+  if (!decoded) return fail(decoded.error());
+  if (auto picture = to_rgb(*decoded->picture)) return *std::move(picture);
   return fail(undecodable(codec, "its pixels cannot be converted"));
+}
+
+Result<StreamParameters> read_stream_parameters(Codec codec, const FrameBytes& key_frame) {
+  const Result<Decoded> decoded = decode(codec, {key_frame});
+  if (!decoded) return fail(decoded.error());
+  return StreamParameters{decoded->picture->width, decoded->picture->height, stated_rate(*decoded->decoder)};
 }
 
 #endif

@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "host/base/codec.h"
 #include "host/base/problem.h"
 #include "host/picture/picture.h"
 
@@ -20,8 +21,19 @@ using FrameBytes = std::vector<std::uint8_t>;
 [[nodiscard]] Problem without_ffmpeg(const std::string& what);
 
 // Decodes `frames`, which begin with a key frame and follow each other as the driver handed them out, to the picture of
-// the last. `codec` is the camera's name for it: "JPEG", "MPEG4" or "H.264".
-[[nodiscard]] Result<Picture> decode_picture(const std::string& codec, const std::vector<FrameBytes>& frames);
+// the last.
+[[nodiscard]] Result<Picture> decode_picture(Codec codec, const std::vector<FrameBytes>& frames);
+
+// What a stream says of itself.
+struct StreamParameters {
+  int width = 0;          // pixels, cropping applied
+  int height = 0;         // pixels
+  double frame_rate = 0;  // pictures a second; 0: the stream does not say
+};
+
+// Decodes a key frame for what it says of its stream. Of the codecs only H.264 states a frame rate that can be relied
+// on.
+[[nodiscard]] Result<StreamParameters> read_stream_parameters(Codec codec, const FrameBytes& key_frame);
 
 }  // namespace vexa::host
 

@@ -1,6 +1,6 @@
 #include "host/picture/picture_file.h"
 
-#include "host/base/name_end.h"
+#include "host/base/file_extension.h"
 #include "host/picture/picture_decoder.h"
 
 #ifdef VEXA_WITH_FFMPEG
@@ -22,15 +22,15 @@ constexpr FileEnding kFileEndings[] = {
 
 std::optional<PictureFormat> picture_format_of(std::string_view file) {
   for (const FileEnding& ending : kFileEndings) {
-    if (has_end(file, ending.text)) return ending.format;
+    if (has_extension(file, ending.text)) return ending.format;
   }
   return std::nullopt;
 }
 
-bool makes_jpeg_of(const std::string& codec) { return codec == "JPEG" || has_ffmpeg(); }
+bool makes_jpeg_of(Codec codec) { return codec == Codec::kJpeg || has_ffmpeg(); }
 
-Result<std::vector<std::uint8_t>> jpeg_of(const std::string& codec, const std::vector<FrameBytes>& frames) {
-  if (codec == "JPEG" && !frames.empty()) return frames.back();
+Result<std::vector<std::uint8_t>> jpeg_of(Codec codec, const std::vector<FrameBytes>& frames) {
+  if (codec == Codec::kJpeg && !frames.empty()) return frames.back();
   const Result<Picture> picture = decode_picture(codec, frames);
   if (!picture) return fail(picture.error());
   return encode_picture(*picture, PictureFormat::kJpeg);

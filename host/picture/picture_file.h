@@ -21,11 +21,10 @@ enum class PictureFormat { kPng, kJpeg };
 [[nodiscard]] Result<std::vector<std::uint8_t>> encode_picture(const Picture& picture, PictureFormat format);
 
 // Whether jpeg_of() can serve this codec in this build.
-[[nodiscard]] bool makes_jpeg_of(const std::string& codec);
+[[nodiscard]] bool makes_jpeg_of(Codec codec);
 
 // The picture of the last frame as a JPEG file, see decode_picture(). The camera's JPEG stays as it came.
-[[nodiscard]] Result<std::vector<std::uint8_t>> jpeg_of(const std::string& codec,
-                                                        const std::vector<FrameBytes>& frames);
+[[nodiscard]] Result<std::vector<std::uint8_t>> jpeg_of(Codec codec, const std::vector<FrameBytes>& frames);
 
 }  // namespace vexa::host
 

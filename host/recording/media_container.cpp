@@ -3,7 +3,7 @@
 #include <utility>
 #include <vector>
 
-#include "host/base/name_end.h"
+#include "host/base/file_extension.h"
 #include "host/picture/picture_decoder.h"
 #include "host/recording/frame_file.h"
 
@@ -14,7 +14,6 @@
 #include <cstring>
 
 #include "host/picture/ffmpeg_handles.h"
-#include "host/recording/codec_headers.h"
 
 extern "C" {
 #include <libavformat/avformat.h>
@@ -24,8 +23,8 @@ extern "C" {
 namespace vexa::host {
 
 std::optional<ContainerFormat> container_format_of(std::string_view file) {
-  if (has_end(file, ".mkv")) return ContainerFormat::kMatroska;
-  if (has_end(file, ".mp4")) return ContainerFormat::kMp4;
+  if (has_extension(file, ".mkv")) return ContainerFormat::kMatroska;
+  if (has_extension(file, ".mp4")) return ContainerFormat::kMp4;
   return std::nullopt;
 }
 
@@ -44,12 +43,6 @@ std::optional<Problem> MediaContainer::close() { return std::nullopt; }
 namespace {
 
 constexpr AVRational kMicroseconds{1, 1000000};
-
-AVCodecID container_codec(const std::string& codec) {
-  if (codec == "JPEG") return AV_CODEC_ID_MJPEG;
-  if (codec == "MPEG4") return AV_CODEC_ID_MPEG4;
-  return AV_CODEC_ID_H264;
-}
 
 const char* muxer_name(ContainerFormat format) {
   switch (format) {
@@ -80,20 +73,19 @@ class MediaContainer::Muxer {
   Muxer& operator=(const Muxer&) = delete;
 
   [[nodiscard]] std::optional<Problem> open(const MediaContainer& file, const RecordedPicture& first) {
-    av_log_set_level(AV_LOG_QUIET);  // failures are told here, in this program's words
-    const FrameBytes picture(first.data, first.data + first.length);
-    const Result<Picture> size = decode_picture(file.codec_, {picture});
-    if (!size) return size.error();
+    const Result<StreamParameters> video =
+        read_stream_parameters(first.codec, FrameBytes(first.data, first.data + first.length));
+    if (!video) return video.error();
     int result = avformat_alloc_output_context2(&context_, nullptr, muxer_name(file.format_), file.path_.c_str());
     if (result < 0) return unwritten(file.path_, result);
     stream_ = avformat_new_stream(context_, nullptr);
     if (stream_ == nullptr) return unwritten(file.path_, AVERROR(ENOMEM));
     stream_->codecpar->codec_type = AVMEDIA_TYPE_VIDEO;
-    stream_->codecpar->codec_id = container_codec(file.codec_);
-    stream_->codecpar->width = size->width;
-    stream_->codecpar->height = size->height;
+    stream_->codecpar->codec_id = ffmpeg_id(first.codec);
+    stream_->codecpar->width = video->width;
+    stream_->codecpar->height = video->height;
     stream_->time_base = {1, 90000};  // MP4 takes it, Matroska has its own
-    take_headers(codec_headers(file.codec_, picture));
+    take_headers(first);
     // Named so that no part of the path is taken for a protocol.
     result = avio_open(&context_->pb, ("file:" + file.path_).c_str(), AVIO_FLAG_WRITE);
     if (result >= 0) result = avformat_write_header(context_, nullptr);
@@ -103,9 +95,8 @@ class MediaContainer::Muxer {
   }
 
   [[nodiscard]] int write(const RecordedPicture& picture) {
-    const FfmpegHandle<AVPacket> packet(av_packet_alloc());
-    if (!packet || av_new_packet(packet.get(), static_cast<int>(picture.length)) < 0) return AVERROR(ENOMEM);
-    std::memcpy(packet->data, picture.data, picture.length);
+    const FfmpegHandle<AVPacket> packet = packet_of(picture.data, picture.length);
+    if (!packet) return AVERROR(ENOMEM);
     packet->stream_index = stream_->index;
     const std::int64_t before = last_;
     packet->pts = packet->dts = place_of(picture.time);
@@ -123,13 +114,29 @@ class MediaContainer::Muxer {
   }
 
  private:
-  void take_headers(const std::vector<std::uint8_t>& headers) {
-    if (headers.empty()) return;
+  // What a container keeps of the first picture, to be read before any picture: H.264's parameter sets, MPEG-4's
+  // headers. JPEG has none, and a stream without them is written as it is.
+  void take_headers(const RecordedPicture& first) {
+    AVBSFContext* made = nullptr;
+    const AVBitStreamFilter* kind = av_bsf_get_by_name("extract_extradata");
+    if (kind == nullptr || av_bsf_alloc(kind, &made) < 0) return;
+    const FfmpegHandle<AVBSFContext> filter(made);
+    const FfmpegHandle<AVPacket> packet = packet_of(first.data, first.length);
+    if (!packet || avcodec_parameters_copy(filter->par_in, stream_->codecpar) < 0 || av_bsf_init(filter.get()) < 0 ||
+        av_bsf_send_packet(filter.get(), packet.get()) < 0 || av_bsf_receive_packet(filter.get(), packet.get()) < 0) {
+      return;
+    }
+    std::size_t size = 0;
+    const std::uint8_t* headers = av_packet_get_side_data(packet.get(), AV_PKT_DATA_NEW_EXTRADATA, &size);
+    if (headers != nullptr) keep_headers(headers, size);
+  }
+
+  void keep_headers(const std::uint8_t* headers, std::size_t size) {
     AVCodecParameters& parameters = *stream_->codecpar;
-    parameters.extradata = static_cast<std::uint8_t*>(av_mallocz(headers.size() + AV_INPUT_BUFFER_PADDING_SIZE));
+    parameters.extradata = static_cast<std::uint8_t*>(av_mallocz(size + AV_INPUT_BUFFER_PADDING_SIZE));
     if (parameters.extradata == nullptr) return;
-    std::memcpy(parameters.extradata, headers.data(), headers.size());
-    parameters.extradata_size = static_cast<int>(headers.size());
+    std::memcpy(parameters.extradata, headers, size);
+    parameters.extradata_size = static_cast<int>(size);
   }
 
   // In the stream's units, behind the picture before.
@@ -168,8 +175,7 @@ std::optional<Problem> MediaContainer::close() {
 
 #endif
 
-MediaContainer::MediaContainer(std::string path, ContainerFormat format, std::string codec)
-    : path_(std::move(path)), format_(format), codec_(std::move(codec)) {}
+MediaContainer::MediaContainer(std::string path, ContainerFormat format) : path_(std::move(path)), format_(format) {}
 
 MediaContainer::~MediaContainer() = default;
 

@@ -16,12 +16,12 @@ enum class ContainerFormat { kMatroska, kMp4 };
 // By the end of a file's name: ".mkv" or ".mp4", in capitals too.
 [[nodiscard]] std::optional<ContainerFormat> container_format_of(std::string_view file);
 
-// The file is opened with the first picture. Times count from that picture, to the millisecond in Matroska and to
-// 1/90000 s in MP4; two pictures never have the same. A file that is not closed may lack its index.
+// The file is opened with the first picture, whose codec is that of the video. Times count from that picture, to the
+// millisecond in Matroska and to 1/90000 s in MP4; two pictures never have the same. A file that is not closed may lack
+// its index.
 class MediaContainer final : public PictureTarget {
  public:
-  // `codec` is the camera's name for it: "JPEG", "MPEG4" or "H.264".
-  MediaContainer(std::string path, ContainerFormat format, std::string codec);
+  MediaContainer(std::string path, ContainerFormat format);
   ~MediaContainer() override;
 
   [[nodiscard]] std::optional<Problem> check() const override;
@@ -34,7 +34,6 @@ class MediaContainer final : public PictureTarget {
 
   const std::string path_;
   const ContainerFormat format_;
-  const std::string codec_;
   std::unique_ptr<Muxer> muxer_;  // null before the first picture
 };
 

@@ -7,6 +7,7 @@
 #include <optional>
 #include <string>
 
+#include "host/base/codec.h"
 #include "host/base/problem.h"
 
 namespace vexa::host {
@@ -15,6 +16,7 @@ namespace vexa::host {
 struct RecordedPicture {
   const unsigned char* data = nullptr;
   std::size_t length = 0;
+  Codec codec = Codec::kH264;
   bool key = false;
   std::chrono::microseconds time{0};  // since 1970
 };

@@ -46,11 +46,13 @@ std::optional<RecordingEnd> PlaybackTaker::end_of_silence(Clock::duration quiet)
 }
 
 bool PlaybackTaker::keep(const SLibDVideoFrameInfo& frame) {
-  const bool key = is_key_picture(frame.frameType);
+  const std::optional<Codec> codec = codec_of_frame(frame.frameType);
+  if (!codec) return true;  // no picture
+  const bool key = is_key_frame(frame.frameType);
   const std::chrono::microseconds time = stamp_of(frame);
   if (target_ != nullptr) {
     if (!key && progress_.frames == 0) return true;  // nothing could be decoded from here on
-    problem_ = target_->write({picture_.bytes.data(), picture_.bytes.size(), key, time});
+    problem_ = target_->write({picture_.bytes.data(), picture_.bytes.size(), *codec, key, time});
     if (problem_) return false;
   }
   if (progress_.frames++ == 0) progress_.first = time;

@@ -22,10 +22,6 @@ const char* name_of(RecordingEnd end) {
   return "";
 }
 
-bool is_key_picture(std::int32_t frame_type) {
-  return frame_type == VIDEO_FRAME_H264_KEY || frame_type == VIDEO_FRAME_MPEG4_KEY || frame_type == VIDEO_FRAME_JPEG;
-}
-
 Recorder::Recorder(CLibraryDevice& camera, PictureTarget& target, RecordingLimits limits)
     : camera_(camera), target_(target), limits_(std::move(limits)), start_(limits_.now()), last_picture_(start_) {
   meter_.set_camera_rate(limits_.camera_rate);
@@ -65,16 +61,15 @@ std::chrono::microseconds Recorder::time_of(const SLibDVideoFrameInfo& frame, Cl
 }
 
 bool Recorder::keep(const SLibDVideoFrameInfo& frame, Clock::time_point now) {
-  const bool key_picture = is_key_picture(frame.frameType);
-  if (!key_picture && meter_.frames() == 0) return true;  // nothing could be decoded from here on
-  problem_ = target_.write({picture_.bytes.data(), picture_.bytes.size(), key_picture, time_of(frame, now)});
+  const std::optional<Codec> codec = codec_of_frame(frame.frameType);
+  const bool key = is_key_frame(frame.frameType);
+  if (!codec || (!key && meter_.frames() == 0)) return true;  // nothing could be decoded from here on
+  problem_ = target_.write({picture_.bytes.data(), picture_.bytes.size(), *codec, key, time_of(frame, now)});
   if (problem_) return false;
-  if (frame.frameType == VIDEO_FRAME_H264_KEY && !meter_.stream()) {
-    if (const auto stream = read_stream_parameters(picture_.bytes.data(), picture_.bytes.size())) {
-      meter_.set_stream(*stream);
-    }
+  if (key && !meter_.stream()) {
+    if (const auto stream = read_stream_parameters(*codec, picture_.bytes)) meter_.set_stream(*stream);
   }
-  meter_.add(picture_.bytes.size(), key_picture, now);
+  meter_.add(picture_.bytes.size(), key, now);
   last_picture_ = now;
   return true;
 }

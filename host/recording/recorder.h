@@ -29,9 +29,6 @@ enum class RecordingEnd { kComplete, kInterrupted, kSilent, kNoKeyPicture, kCann
 // As JSON tells it, such as "complete".
 [[nodiscard]] const char* name_of(RecordingEnd end);
 
-// Whether a picture can be decoded without those before it; `frame_type` as the driver tells it.
-[[nodiscard]] bool is_key_picture(std::int32_t frame_type);
-
 // Copies and returns, as the driver asks: it holds its queue meanwhile.
 class PictureBytes final : public CDataSink {
  public:

@@ -8,7 +8,7 @@
 #include <deque>
 #include <optional>
 
-#include "host/recording/stream_parameters.h"
+#include "host/picture/picture_decoder.h"
 
 namespace vexa::host {
 

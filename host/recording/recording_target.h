@@ -1,4 +1,4 @@
-// What --out names: a file of pictures one behind the other, or a container.
+// What --out names: a file of pictures one after the other, or a container.
 #ifndef HOST_RECORDING_RECORDING_TARGET_H_
 #define HOST_RECORDING_RECORDING_TARGET_H_
 
@@ -20,18 +20,17 @@ class RecordingTarget {
   [[nodiscard]] bool is_standard_output() const { return out_ == "-"; }
   // Says early that nothing could be written.
   [[nodiscard]] std::optional<Problem> check() const;
-  // The codec that the name stands for, as cameras call it; nothing when any can go there.
-  [[nodiscard]] std::optional<std::string> codec() const;
-  // For video of this codec.
-  [[nodiscard]] std::unique_ptr<PictureTarget> open(const std::string& codec) const;
+  // The codec that the name stands for; nullopt when any can go there.
+  [[nodiscard]] std::optional<Codec> codec() const;
+  [[nodiscard]] std::unique_ptr<PictureTarget> open() const;
 
  private:
   const std::string out_;
   const int standard_output_;
 };
 
-// The usual end of a file's name for a codec's pictures, such as ".h264".
-[[nodiscard]] std::string usual_end(const std::string& codec);
+// The usual extension of a file with a codec's pictures, such as ".h264".
+[[nodiscard]] std::string usual_extension(Codec codec);
 
 }  // namespace vexa::host
 

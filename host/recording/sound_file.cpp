@@ -4,7 +4,7 @@
 #include <array>
 #include <string_view>
 
-#include "host/base/name_end.h"
+#include "host/base/file_extension.h"
 
 namespace vexa::host {
 namespace {
@@ -57,7 +57,7 @@ std::array<unsigned char, kHeaderSize> wave_header(std::uint64_t sound) {
 }  // namespace
 
 SoundFormat sound_format_of(const std::string& file) {
-  return has_end(file, ".wav") ? SoundFormat::kWave : SoundFormat::kRaw;
+  return has_extension(file, ".wav") ? SoundFormat::kWave : SoundFormat::kRaw;
 }
 
 std::optional<Problem> SoundFile::write(const unsigned char* sound, std::size_t length) {

@@ -49,7 +49,6 @@ bool take_switch(std::string_view text, std::optional<bool>& value) {
   return value.has_value();
 }
 
-constexpr std::string_view kCodecs[] = {"JPEG", "MPEG4", "H.264"};
 constexpr std::string_view kExposures[] = {"Full auto", "Shutter Priority", "Iris Priority"};
 
 struct SettingKey {
@@ -62,7 +61,7 @@ using Text = std::string_view;
 using Into = SettingChanges;
 
 constexpr SettingKey kKeys[] = {
-    {"codec", "JPEG, MPEG4 or H.264", [](Text t, Into& to) { return take_text(t, kCodecs, to.codec); }},
+    {"codec", "JPEG, MPEG4 or H.264", [](Text t, Into& to) { return (to.codec = codec_named(t)).has_value(); }},
     {"size", "WIDTHxHEIGHT in pixels, such as 640x480", [](Text t, Into& to) { return take_size(t, to.size); }},
     {"frame-rate", "frames per second, 1 to 60", [](Text t, Into& to) { return take_number(t, 1, 60, to.frame_rate); }},
     {"bit-rate", "kbit/s, 1 to 100000; not for JPEG",

@@ -9,6 +9,7 @@
 #include <string_view>
 #include <vector>
 
+#include "host/base/codec.h"
 #include "host/base/problem.h"
 #include "vexa/common_types.h"
 #include "vexa/image_info.h"
@@ -48,7 +49,7 @@ template <typename Words, typename Value>
 
 // What `vexactl set` is asked to change.
 struct SettingChanges {
-  std::optional<std::string> codec = {};
+  std::optional<Codec> codec = {};
   std::optional<SLibDResolutionInfo> size = {};
   std::optional<int> frame_rate = {};
   std::optional<int> bit_rate = {};

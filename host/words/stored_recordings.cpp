@@ -3,7 +3,6 @@
 #include <fmt/format.h>
 #include <time.h>
 
-#include <array>
 #include <nlohmann/json.hpp>
 
 #include "host/base/json_text.h"
@@ -13,12 +12,6 @@ namespace vexa::host {
 namespace {
 
 using Json = nlohmann::ordered_json;
-
-struct StoredCodec {
-  const char* listed;
-  const char* played;
-};
-constexpr std::array<StoredCodec, 3> kStoredCodecs{{{"h264", "H.264"}, {"mpeg4", "MPEG4"}, {"jpeg", "JPEG"}}};
 
 constexpr char kMomentForm[] = "%Y-%m-%dT%H:%M:%S";
 constexpr char kRecordingRow[] = "{:<20}  {:>7}  {:<6}  {:>9}  {}\n";
@@ -38,13 +31,6 @@ bool fits_a_file_name(char letter) {
 }
 
 }  // namespace
-
-std::optional<std::string> played_codec(const SLibDEdgeStorageRecord& record) {
-  for (const StoredCodec& codec : kStoredCodecs) {
-    if (record.imageCodec == codec.listed) return codec.played;
-  }
-  return std::nullopt;
-}
 
 std::string file_name_of(const std::string& recording, const std::string& end) {
   std::string name;

@@ -14,9 +14,6 @@ namespace vexa::host {
 
 using StoredRecordings = std::vector<SLibDEdgeStorageRecord>;
 
-// "H.264" for the "h264" of a list of recordings, and so on; nothing for a codec that the driver does not play.
-[[nodiscard]] std::optional<std::string> played_codec(const SLibDEdgeStorageRecord& record);
-
 // The name that a recording gives its file, with `end` behind it: no two names give the same one, and none leads out of
 // its folder.
 [[nodiscard]] std::string file_name_of(const std::string& recording, const std::string& end);

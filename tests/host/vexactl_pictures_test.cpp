@@ -77,7 +77,7 @@ TEST_F(PicturesByCommand, AnAlarmOfAJpegCameraKeepsItsPictureAsItCame) {
 
 Picture decoded(const std::string& file) {
   const std::string bytes = contents_of(file);
-  const auto result = vexa::host::decode_picture("JPEG", {FrameBytes(bytes.begin(), bytes.end())});
+  const auto result = vexa::host::decode_picture(vexa::host::Codec::kJpeg, {FrameBytes(bytes.begin(), bytes.end())});
   return result.value_or(Picture());
 }
 

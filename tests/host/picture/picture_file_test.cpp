@@ -59,7 +59,7 @@ TEST(PictureFile, JpegComesBackWithinItsLoss) {
     const Picture picture = colour_slope(width, 48);
     const auto file = encode_picture(picture, PictureFormat::kJpeg);
     ASSERT_TRUE(file);
-    const auto back = decode_picture("JPEG", {*file});
+    const auto back = decode_picture(Codec::kJpeg, {*file});
     ASSERT_TRUE(back) << back.error().text;
     const auto& decoded = *back;
     ASSERT_EQ(decoded.width, width);
@@ -84,12 +84,13 @@ TEST(PictureFile, PngKeepsEveryByte) {
 TEST(PictureDecoder, ComesToThePictureOfTheLastFrame) {
   constexpr std::size_t kPictures = 3;
   const struct {
-    const char* codec;
+    Codec codec;
     const char* clip;
-  } cases[] = {
-      {"JPEG", VEXA_CLIPS "/small.mjpeg"}, {"MPEG4", VEXA_CLIPS "/small.m4v"}, {"H.264", VEXA_CLIPS "/small.h264"}};
+  } cases[] = {{Codec::kJpeg, VEXA_CLIPS "/small.mjpeg"},
+               {Codec::kMpeg4, VEXA_CLIPS "/small.m4v"},
+               {Codec::kH264, VEXA_CLIPS "/small.h264"}};
   for (const auto& one : cases) {
-    SCOPED_TRACE(one.codec);
+    SCOPED_TRACE(one.clip);
     const auto clip = vexa::camera::ImageClip::load(one.clip);
     ASSERT_TRUE(clip);
     std::vector<FrameBytes> frames;
@@ -112,21 +113,56 @@ TEST(PictureDecoder, ComesToThePictureOfTheLastFrame) {
 
 TEST(PictureDecoder, TellsWhatIsNoPicture) {
   const FrameBytes noise(1000, 0x5a);
-  for (const char* codec : {"JPEG", "MPEG4", "H.264"}) {
+  for (const Codec codec : {Codec::kJpeg, Codec::kMpeg4, Codec::kH264}) {
     for (const auto& frames : {std::vector<FrameBytes>{}, {FrameBytes{}}, {noise}, {noise, FrameBytes{}, noise}}) {
       const auto result = decode_picture(codec, frames);
-      ASSERT_FALSE(result) << codec;
+      ASSERT_FALSE(result) << name_of(codec);
       EXPECT_EQ(result.error().code, ExitCode::kNoVideo);
     }
   }
-  EXPECT_EQ(decode_picture("H.265", {noise}).error().text,
-            "the camera's H.265 picture cannot be decoded: there is no decoder for it");
+  EXPECT_EQ(decode_picture(Codec::kH264, {}).error().text,
+            "the camera's H.264 picture cannot be decoded: it holds no picture");
+}
+
+std::string stated_by(Codec codec, const char* clip_path) {
+  const auto clip = vexa::camera::ImageClip::load(clip_path);
+  if (!clip) return "no clip";
+  const std::string& picture = clip->pictures().front();
+  const auto stream = read_stream_parameters(codec, FrameBytes(picture.begin(), picture.end()));
+  if (!stream) return stream.error().text;
+  return std::to_string(stream->width) + "x" + std::to_string(stream->height) + "@" +
+         std::to_string(static_cast<int>(stream->frame_rate * 1000));
+}
+
+TEST(StreamParameters, AreReadFromAKeyPictureOfEachCodec) {
+  EXPECT_EQ(stated_by(Codec::kH264, VEXA_CLIPS "/small.h264"), "320x240@25000");
+  EXPECT_EQ(stated_by(Codec::kH264, VEXA_CLIPS "/low2m.h264"), "640x480@25000");
+  EXPECT_EQ(stated_by(Codec::kH264, VEXA_CLIPS "/hd.h264"), "1920x1080@25000");
+  // The rates of these codecs' headers are no frame rates.
+  EXPECT_EQ(stated_by(Codec::kMpeg4, VEXA_CLIPS "/small.m4v"), "320x240@0");
+  EXPECT_EQ(stated_by(Codec::kJpeg, VEXA_CLIPS "/small.mjpeg"), "320x240@0");
+}
+
+TEST(StreamParameters, OfACutPictureAreReadOrRefused) {
+  const auto clip = vexa::camera::ImageClip::load(VEXA_CLIPS "/small.h264");
+  ASSERT_TRUE(clip);
+  const std::string& picture = clip->pictures().front();
+  for (std::size_t length = 0; length < picture.size(); length += length < 64 ? 1 : 997) {
+    const auto stream = read_stream_parameters(
+        Codec::kH264, FrameBytes(picture.begin(), picture.begin() + static_cast<std::ptrdiff_t>(length)));
+    if (!stream) {
+      EXPECT_EQ(stream.error().code, ExitCode::kNoVideo) << length;
+      continue;
+    }
+    EXPECT_EQ(stream->width, 320) << length;
+    EXPECT_EQ(stream->height, 240) << length;
+  }
 }
 
 #else
 
 TEST(PictureDecoder, RefusesWithoutFfmpegAndSaysWhatToDo) {
-  const auto result = decode_picture("H.264", {});
+  const auto result = decode_picture(Codec::kH264, {});
   ASSERT_FALSE(result);
   EXPECT_EQ(result.error().code, ExitCode::kUsage);
   EXPECT_EQ(result.error().text, "this vexactl was built without FFmpeg's libraries; decoding H.264 needs them");

@@ -49,14 +49,15 @@ std::vector<std::string> decoded_pictures(const std::string& input) {
 
 struct ContainedCodec {
   const char* name;
-  const char* codec;
+  Codec codec;
   const char* clip;
   const char* format;
+  bool has_headers;  // which a container keeps before the pictures
 };
 
-constexpr ContainedCodec kContained[] = {{"H264", "H.264", VEXA_CLIPS "/small.h264", "h264"},
-                                         {"Mpeg4", "MPEG4", VEXA_CLIPS "/small.m4v", "m4v"},
-                                         {"Jpeg", "JPEG", VEXA_CLIPS "/plain.mjpeg", "mjpeg"}};
+constexpr ContainedCodec kContained[] = {{"H264", Codec::kH264, VEXA_CLIPS "/small.h264", "h264", true},
+                                         {"Mpeg4", Codec::kMpeg4, VEXA_CLIPS "/small.m4v", "m4v", true},
+                                         {"Jpeg", Codec::kJpeg, VEXA_CLIPS "/plain.mjpeg", "mjpeg", false}};
 
 class MediaContainerOf : public testing::TestWithParam<ContainedCodec> {
  protected:
@@ -66,13 +67,13 @@ class MediaContainerOf : public testing::TestWithParam<ContainedCodec> {
   void write(const std::string& path, ContainerFormat format, const std::vector<microseconds>& times) {
     const auto clip = vexa::camera::ImageClip::load(GetParam().clip);
     ASSERT_TRUE(clip);
-    MediaContainer container(path, format, GetParam().codec);
+    MediaContainer container(path, format);
     std::ofstream pictures(folder_ / "pictures", std::ios::binary);
     for (std::size_t i = 0; i < times.size(); ++i) {
       const std::string& picture = clip->pictures()[i];
       pictures << picture;
       const auto* data = reinterpret_cast<const unsigned char*>(picture.data());
-      const auto problem = container.write({data, picture.size(), i % 25 == 0, times[i]});
+      const auto problem = container.write({data, picture.size(), GetParam().codec, i % 25 == 0, times[i]});
       ASSERT_FALSE(problem) << problem->text;
     }
     ASSERT_FALSE(container.close());
@@ -106,6 +107,19 @@ TEST_P(MediaContainerOf, HoldsEveryPictureWithItsTime) {
   }
 }
 
+TEST_P(MediaContainerOf, StatesTheSizeAndKeepsTheHeadersOfTheFirstPicture) {
+  for (const char* name : {"a.mkv", "a.mp4"}) {
+    const std::string path = folder_ / name;
+    write(path, *container_format_of(name), {microseconds(0), microseconds(40000)});
+    EXPECT_EQ(lines_of("ffprobe -v warning -show_entries stream=width,height -of csv=p=0 " + path),
+              std::vector<std::string>{"320,240"});
+    // A player reads them without a picture: before the first, and after a jump to any other.
+    const auto headers = lines_of("ffprobe -v warning -show_entries stream=extradata_size -of csv=p=0 " + path);
+    const bool kept = !headers.empty() && !headers[0].empty() && headers[0] != "N/A" && headers[0] != "0";
+    EXPECT_EQ(kept, GetParam().has_headers) << name << ": " << testing::PrintToString(headers);
+  }
+}
+
 TEST_P(MediaContainerOf, NoTwoPicturesHaveTheSameTime) {
   write(folder_ / "a.mkv", ContainerFormat::kMatroska,
         {microseconds(5000000), microseconds(5000000), microseconds(4000000), microseconds(5010000)});
@@ -120,9 +134,9 @@ TEST(MediaContainer, WhatCannotBeWrittenIsTold) {
   ASSERT_TRUE(clip);
   const std::string& picture = clip->pictures()[0];
   const auto write = [&picture](const std::string& path) {
-    MediaContainer container(path, ContainerFormat::kMatroska, "JPEG");
+    MediaContainer container(path, ContainerFormat::kMatroska);
     const auto* data = reinterpret_cast<const unsigned char*>(picture.data());
-    std::optional<Problem> problem = container.write({data, picture.size(), true, microseconds(1)});
+    std::optional<Problem> problem = container.write({data, picture.size(), Codec::kJpeg, true, microseconds(1)});
     return problem ? problem : container.close();
   };
   const auto missing = write("no/such/folder/a.mkv");
@@ -136,9 +150,9 @@ TEST(MediaContainer, WhatCannotBeWrittenIsTold) {
 
 TEST(MediaContainer, AFirstPictureThatIsNoneIsRefusedAndLeavesNoFile) {
   const TemporaryFolder folder;
-  MediaContainer container(folder / "a.mkv", ContainerFormat::kMatroska, "H.264");
+  MediaContainer container(folder / "a.mkv", ContainerFormat::kMatroska);
   const unsigned char nonsense[] = {1, 2, 3, 4};
-  const auto problem = container.write({nonsense, sizeof nonsense, true, microseconds(1)});
+  const auto problem = container.write({nonsense, sizeof nonsense, Codec::kH264, true, microseconds(1)});
   ASSERT_TRUE(problem);
   EXPECT_EQ(problem->code, ExitCode::kNoVideo);
   EXPECT_FALSE(container.close());
@@ -148,7 +162,7 @@ TEST(MediaContainer, AFirstPictureThatIsNoneIsRefusedAndLeavesNoFile) {
 #else
 
 TEST(MediaContainer, IsRefusedWithoutTheLibraries) {
-  MediaContainer container("a.mkv", ContainerFormat::kMatroska, "H.264");
+  MediaContainer container("a.mkv", ContainerFormat::kMatroska);
   const auto problem = container.check();
   ASSERT_TRUE(problem);
   EXPECT_EQ(problem->text, "this vexactl was built without FFmpeg's libraries; writing .mkv and .mp4 needs them");

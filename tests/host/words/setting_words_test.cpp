@@ -17,7 +17,7 @@ TEST(SettingWords, ReadsEverySetting) {
                      "infrared=daynight", "infrared-strength=7", "back-light=off", "exposure=Iris Priority"});
   ASSERT_TRUE(parsed) << parsed.error().text;
   const auto& changes = *parsed;
-  EXPECT_EQ(changes.codec, "H.264");
+  EXPECT_EQ(changes.codec, Codec::kH264);
   EXPECT_EQ(changes.size->text, "1280x720");
   EXPECT_EQ(changes.size->width, 1280);
   EXPECT_EQ(changes.size->height, 720);
