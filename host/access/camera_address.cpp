@@ -4,8 +4,9 @@
 #include <netdb.h>
 
 #include <algorithm>
-#include <charconv>
 #include <memory>
+
+#include "host/base/number_text.h"
 
 namespace vexa::host {
 namespace {
@@ -18,13 +19,6 @@ bool is_host_character(char c) {
 
 bool is_host(std::string_view text) {
   return !text.empty() && text.size() <= kLongestHost && std::all_of(text.begin(), text.end(), is_host_character);
-}
-
-std::optional<int> parse_port(std::string_view text) {
-  int port = 0;
-  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), port);
-  if (error != std::errc() || end != text.data() + text.size() || port < 1 || port > 65535) return std::nullopt;
-  return port;
 }
 
 }  // namespace
@@ -44,7 +38,7 @@ Result<CameraAddress> parse_camera_address(std::string_view text) {
         usage("the camera's address is not a host name or IPv4 address", "For instance: 192.168.0.100 or cam1:8080."));
   }
   if (colon == std::string_view::npos) return address;
-  const std::optional<int> port = parse_port(text.substr(colon + 1));
+  const std::optional<int> port = number_text(text.substr(colon + 1), 1, 65535);
   if (!port)
     return fail(usage("the port in the camera's address is not a number from 1 to 65535", "For instance: cam1:80."));
   address.port = *port;

@@ -11,6 +11,7 @@ namespace vexa::host {
 namespace {
 
 constexpr int kLongestTimeout = 600000;
+constexpr int kMostStreams = 16;
 
 Problem out_of_descriptors() {
   return {ExitCode::kUsage, fmt::format("cannot show the driver's trace: {}", std::generic_category().message(errno)),
@@ -40,6 +41,15 @@ void add_camera_options(CLI::App& command, CameraOptions& options) {
       .add_option("--cgi-log", options.cgi_log,
                   "append each request to the camera and its answer's status to this file")
       ->type_name("FILE");
+}
+
+void add_stream_option(CLI::App& command, int& stream) {
+  command.add_option("--stream", stream, "which of the camera's video streams")->type_name("N")->capture_default_str();
+}
+
+std::optional<Problem> check_stream(int stream) {
+  if (stream >= 1 && stream <= kMostStreams) return std::nullopt;
+  return usage(fmt::format("--stream is not a number from 1 to {}", kMostStreams), "1 is the camera's first stream.");
 }
 
 Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal) {

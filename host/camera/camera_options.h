@@ -26,6 +26,10 @@ struct CameraOptions {
 
 void add_camera_options(CLI::App& command, CameraOptions& options);
 
+// --stream, and what it may be: cameras number their streams from 1, the driver knows 16.
+void add_stream_option(CLI::App& command, int& stream);
+[[nodiscard]] std::optional<Problem> check_stream(int stream);
+
 // A driver that knows its camera; no camera has been contacted yet.
 struct OpenCamera {
   CameraAddress address;

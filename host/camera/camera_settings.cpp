@@ -142,7 +142,7 @@ Result<Json> read_settings(const ModelCamera& camera) {
                    {"video-standard", video->videoStandard == LIBD_VIDEO_NTSC ? "ntsc" : "pal"},
                    {"capture-size", size_or_null(video->captureWidth, video->captureHeight)},
                    {"max-image-size", size_or_null(video->maxImageWidth, video->maxImageHeight)},
-                   {"solid-ptz", video->solidPtz ? "on" : "off"},
+                   {"solid-ptz", switch_word(video->solidPtz)},
                    {"unicast-port", number_or_null(video->unicastVideoPort)},
                    {"unicast-port-1", number_or_null(video->unicastVideoPort1)},
                    {"unicast-port-2", number_or_null(video->unicastVideoPort2)},

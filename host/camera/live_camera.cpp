@@ -4,11 +4,11 @@
 #include <sys/mman.h>
 
 #include <algorithm>
-#include <charconv>
 #include <cstring>
 #include <string_view>
 
 #include "host/access/redactor.h"
+#include "host/base/number_text.h"
 #include "host/base/printable.h"
 #include "host/base/unique_fd.h"
 
@@ -29,13 +29,6 @@ class PrivateLog {
 };
 
 bool mentions_unauthorized(const std::string& text) { return strcasestr(text.c_str(), "unauthorized") != nullptr; }
-
-// The number that the text begins with; 0 for none.
-int whole_number(std::string_view text) {
-  int number = 0;
-  std::from_chars(text.data(), text.data() + text.size(), number);
-  return number;
-}
 
 }  // namespace
 
@@ -80,8 +73,11 @@ Result<CardMode> LiveCamera::card_mode() {
   GetUrlParameter(answer, "EsRec1=image", recording.imageNumber);
   GetUrlParameter(answer, "EsAlmRec1WatchAddress=", recording.watchAddress);
   if (GetUrlParameter(answer, "EsAlmRec1Time=", text)) {
-    recording.alarmTime1 = whole_number(text);
-    recording.alarmTime2 = whole_number(std::string_view(text).substr(std::min(text.find(','), text.size() - 1) + 1));
+    std::string_view times = text;
+    recording.alarmTime1 = take_number<int>(times).value_or(0);
+    const std::size_t comma = times.find(',');
+    times.remove_prefix(comma == std::string_view::npos ? times.size() : comma + 1);
+    recording.alarmTime2 = take_number<int>(times).value_or(0);
   }
   mode.free_kilobytes = std::max(CheckEdgeStorageFreeSize(), 0);
   return mode;

@@ -11,8 +11,6 @@
 namespace vexa::host {
 namespace {
 
-constexpr int kMostCameraStreams = 16;
-
 Profile without_profile(const std::string& model) {
   Profile profile;
   profile.model = model;
@@ -35,16 +33,11 @@ void add_model_options(CLI::App& command, ModelOptions& options) {
       .add_option("--profile", options.profile,
                   "profile of the camera's model, a name or a file [the installed one of the model it reports]")
       ->type_name("PROFILE");
-  command.add_option("--stream", options.stream, "which of the camera's video streams")
-      ->type_name("N")
-      ->capture_default_str();
+  add_stream_option(command, options.stream);
 }
 
 Result<ModelCamera> ModelCamera::open(const ModelOptions& options, Terminal& terminal) {
-  if (options.stream < 1 || options.stream > kMostCameraStreams) {
-    return fail(usage(fmt::format("--stream is not a number from 1 to {}", kMostCameraStreams),
-                      "1 is the camera's first stream."));
-  }
+  if (auto problem = check_stream(options.stream)) return fail(*std::move(problem));
   Result<OpenCamera> asked = open_camera(options.camera, terminal);
   if (!asked) return fail(asked.error());
   SLibDSystemInfo system;

@@ -1,20 +1,17 @@
 #include "host/camera/video_options.h"
 
-#include <fmt/format.h>
+#include "host/camera/camera_options.h"
 
 namespace vexa::host {
 namespace {
 
-constexpr int kMostVideoStreams = 16;
 constexpr char kUdpWord[] = "udp";
 constexpr char kHttpWord[] = "http";
 
 }  // namespace
 
 void add_video_options(CLI::App& command, VideoOptions& options) {
-  command.add_option("--stream", options.stream, "which of the camera's video streams")
-      ->type_name("N")
-      ->capture_default_str();
+  add_stream_option(command, options.stream);
   command
       .add_option("--transport", options.transport, "udp: RTP in datagrams; http: the camera's image stream over HTTP")
       ->type_name("HOW")
@@ -22,10 +19,7 @@ void add_video_options(CLI::App& command, VideoOptions& options) {
 }
 
 std::optional<Problem> check_video_options(const VideoOptions& options) {
-  if (options.stream < 1 || options.stream > kMostVideoStreams) {
-    return usage(fmt::format("--stream is not a number from 1 to {}", kMostVideoStreams),
-                 "1 is the camera's first stream.");
-  }
+  if (auto problem = check_stream(options.stream)) return problem;
   if (options.transport != kUdpWord && options.transport != kHttpWord) {
     return usage("--transport is neither udp nor http", "udp when not given.");
   }

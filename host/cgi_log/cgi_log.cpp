@@ -1,8 +1,9 @@
 #include "host/cgi_log/cgi_log.h"
 
 #include <algorithm>
-#include <charconv>
 #include <utility>
+
+#include "host/base/number_text.h"
 
 namespace vexa::host {
 namespace {
@@ -62,12 +63,11 @@ std::optional<CgiLogLine> parse_cgi_log_line(std::string_view text) {
 }
 
 CgiAnswer to_answer(const CgiLogLine& line) {
-  const std::string& text = line.message;
-  int status = 0;
-  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), status);
-  const auto length = static_cast<std::size_t>(end - text.data());
-  if (error != std::errc{} || (length < text.size() && text[length] != ' ')) return {line.time, std::nullopt, text};
-  return {line.time, status, text.substr(std::min(length + 1, text.size()))};
+  std::string_view rest = line.message;
+  const std::optional<int> status = take_number<int>(rest);
+  if (!status || !(rest.empty() || rest.front() == ' ')) return {line.time, std::nullopt, line.message};
+  if (!rest.empty()) rest.remove_prefix(1);
+  return {line.time, status, std::string(rest)};
 }
 
 std::optional<std::chrono::milliseconds> CgiExchange::duration() const {

@@ -5,6 +5,7 @@
 #include <vector>
 
 #include "host/console/interrupt.h"
+#include "host/words/utc_time.h"
 
 namespace vexa::host {
 
@@ -63,7 +64,7 @@ std::optional<Problem> AlarmWatch::follow_alarms() {
     const ELibDReturnCode result = camera_.device().GetCurrentIoStatus(pins);
     if (result == LIBD_NO_FRAME) continue;
     if (result != LIBD_OK) return camera_.explain(result);
-    const std::string moment = moment_text(std::chrono::system_clock::now());
+    const std::string moment = utc_text(std::chrono::system_clock::now());
     for (const SLibDPinInfo& pin : states.changed(pins)) {
       if (auto problem = show(alarm_line(pin, moment, options_.format))) return problem;
       if (auto problem = take_snapshot(pin, moment)) return problem;
@@ -78,7 +79,7 @@ std::optional<Problem> AlarmWatch::follow_metadata() {
     const ELibDReturnCode result = camera_.device().GetCurrentPosition(frame);
     if (result == LIBD_NO_FRAME) continue;
     if (result != LIBD_OK) return camera_.explain(result);
-    const std::string moment = moment_text(std::chrono::system_clock::now());
+    const std::string moment = utc_text(std::chrono::system_clock::now());
     if (auto problem = show(metadata_line(frame, moment, options_.format))) return problem;
   }
   return std::nullopt;

@@ -13,6 +13,7 @@
 #include "host/console/interrupt.h"
 #include "host/console/result_output.h"
 #include "host/words/alarm_words.h"
+#include "host/words/setting_words.h"
 
 namespace vexa::host {
 namespace {
@@ -73,7 +74,7 @@ class IoCommand final : public Command {
     std::string text;
     for (const SLibDPinInfo& pin : pins) {
       text +=
-          fmt::format("{:>2}  {:<9}  {:<3}  {}\n", pin.number, kind_of(pin), pin.enabled ? "on" : "off", state_of(pin));
+          fmt::format("{:>2}  {:<9}  {:<3}  {}\n", pin.number, kind_of(pin), switch_word(pin.enabled), state_of(pin));
     }
     return text;
   }
@@ -102,16 +103,15 @@ class OutputCommand final : public Command {
   }
 
   ExitCode run(Terminal& terminal) override {
-    if (switch_ != "on" && switch_ != "off") {
-      return terminal.report(usage("an output is switched on or off", "See vexactl output --help."));
-    }
+    const std::optional<bool> on = switch_named(switch_);
+    if (!on) return terminal.report(usage("an output is switched on or off", "See vexactl output --help."));
     if (number_ < 1) return terminal.report(usage("outputs are counted from 1", "vexactl io shows them."));
     const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
     if (!camera) return terminal.report(camera.error());
     SLibDPinInfo pin;
     pin.number = number_;
     pin.type = PIN_TYPE_ALARM_OUTPUT;
-    pin.state = switch_ == "on" ? 1 : 0;
+    pin.state = *on ? 1 : 0;
     const ELibDReturnCode result = camera->device().SetOutput(pin);
     return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera->explain_change("output", result));
   }

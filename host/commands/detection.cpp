@@ -22,11 +22,6 @@ constexpr std::array<SettingWord<ELibDTamperLevel>, 3> kTamperLevels{
     {{"low", LIBD_TAMPER_LOW}, {"middle", LIBD_TAMPER_MIDDLE}, {"high", LIBD_TAMPER_HIGH}}};
 constexpr std::array<SettingWord<int>, 3> kObjectSizes{{{"small", 0}, {"middle", 1}, {"large", 2}}};
 
-std::optional<bool> switch_of(const std::string& word) {
-  if (word != "on" && word != "off") return std::nullopt;
-  return word == "on";
-}
-
 Problem no_switch(const std::string& what) {
   return usage(fmt::format("{} is switched on or off", what), fmt::format("See vexactl {} --help.", what));
 }
@@ -180,7 +175,7 @@ class TamperingCommand final : public Command {
   }
 
   ExitCode run(Terminal& terminal) override {
-    const std::optional<bool> on = switch_of(switch_);
+    const std::optional<bool> on = switch_named(switch_);
     if (!on) return terminal.report(no_switch("tampering"));
     const auto level = value_named(kTamperLevels, level_);
     if (!level) return terminal.report(usage("there is no such level", "It is low, middle or high."));
@@ -207,7 +202,7 @@ class AudioDetectionCommand final : public Command {
   }
 
   ExitCode run(Terminal& terminal) override {
-    const std::optional<bool> on = switch_of(switch_);
+    const std::optional<bool> on = switch_named(switch_);
     if (!on) return terminal.report(no_switch("audio-detection"));
     const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
     if (!camera) return terminal.report(camera.error());

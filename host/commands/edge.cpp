@@ -9,6 +9,7 @@
 #include "host/base/printable.h"
 #include "host/commands/edge_actions.h"
 #include "host/console/result_output.h"
+#include "host/words/setting_words.h"
 
 namespace vexa::host {
 namespace {
@@ -28,7 +29,7 @@ std::string mode_table(const CardMode& mode) {
       "seconds before   {}\n"
       "seconds after    {}\n"
       "free space       {} KB\n",
-      recording.enabled ? "on" : "off", recording.imageNumber,
+      switch_word(recording.enabled), recording.imageNumber,
       recording.watchAddress.empty() ? "-" : printable(recording.watchAddress), recording.alarmTime1,
       recording.alarmTime2, mode.free_kilobytes);
 }
@@ -56,7 +57,7 @@ class CardModeAction final : public CameraAction {
 
   std::optional<Problem> check() override {
     const bool changes = watch_ || before_ || after_;
-    if (!switch_.empty() && switch_ != "on" && switch_ != "off") {
+    if (!switch_.empty() && !switch_named(switch_)) {
       return usage("recording is switched on or off", "For instance: vexactl edge CAMERA mode on --watch 192.168.0.2.");
     }
     if (switch_ != "on" && changes) {

@@ -15,6 +15,7 @@
 #include "host/picture/picture_decoder.h"
 #include "host/recording/playback_taker.h"
 #include "host/recording/recording_target.h"
+#include "host/words/utc_time.h"
 
 namespace vexa::host {
 namespace {

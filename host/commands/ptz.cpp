@@ -1,10 +1,10 @@
 // vexactl ptz: turns, zooms and focuses a camera.
 #include <fmt/format.h>
 
-#include <charconv>
 #include <cmath>
 #include <functional>
 
+#include "host/base/number_text.h"
 #include "host/commands/action_group.h"
 #include "host/commands/ptz_watch.h"
 #include "host/console/interrupt.h"
@@ -60,13 +60,6 @@ ExitCode run_move(const ModelCamera& camera, Terminal& terminal, const Move& mov
   const ELibDReturnCode stopped = move.stop(camera.device());
   if (stopped != LIBD_OK) return report_change(camera, terminal, move.what, stopped);
   return Interrupt::requested() ? ExitCode::kInterrupted : ExitCode::kOk;
-}
-
-std::optional<double> number_in(std::string_view text) {
-  double value = 0;
-  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value);
-  if (error != std::errc() || end != text.data() + text.size() || !std::isfinite(value)) return std::nullopt;
-  return value;
 }
 
 bool has_focus(const ModelCamera& camera) { return camera.profile().control.focus.maxSpeed > 0; }
@@ -138,8 +131,8 @@ class ZoomAction final : public CameraAction {
     if (word_ == "wide" || word_ == "tele") return move_.check();
     std::string_view number = word_;
     if (number.ends_with('x')) number.remove_suffix(1);
-    magnification_ = number_in(number);
-    if (magnification_ && *magnification_ > 0) return std::nullopt;
+    magnification_ = number_text<double>(number);
+    if (magnification_ && std::isfinite(*magnification_) && *magnification_ > 0) return std::nullopt;
     return usage("there is no such zoom", "It is wide, tele, or a magnification such as 4 or 2.5x.");
   }
 
@@ -185,7 +178,7 @@ class FocusAction final : public CameraAction {
     for (const char* word : {"near", "far", "auto", "manual"}) {
       if (word_ == word) return move_.check();
     }
-    position_ = number_in(word_);
+    position_ = number_text<double>(word_);
     if (position_ && *position_ >= 0 && *position_ <= 100) return std::nullopt;
     return usage("there is no such focus", "It is near, far, auto, manual, or a position from 0 to 100 percent.");
   }

@@ -12,6 +12,7 @@
 #include "host/console/result_output.h"
 #include "host/words/alarm_words.h"
 #include "host/words/ptz_scale.h"
+#include "host/words/utc_time.h"
 
 namespace vexa::host {
 namespace {
@@ -80,7 +81,7 @@ class WatchAction final : public CameraAction {
       if (shown == view) continue;
       shown = view;
       ++lines;
-      const auto line = view_line(view, moment_text(std::chrono::system_clock::now()), format());
+      const auto line = view_line(view, utc_text(std::chrono::system_clock::now()), format());
       if (const ExitCode code = write_result(terminal, line); code != ExitCode::kOk) return code;
     }
     return ExitCode::kOk;

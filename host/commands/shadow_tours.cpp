@@ -1,12 +1,13 @@
 // vexactl shadow: movements that a camera records while somebody moves it, and plays back.
 #include <fmt/format.h>
 
-#include <charconv>
 #include <nlohmann/json.hpp>
 
 #include "host/base/json_text.h"
+#include "host/base/number_text.h"
 #include "host/commands/action_group.h"
 #include "host/console/result_output.h"
+#include "host/words/setting_words.h"
 #include "host/words/tour_words.h"
 
 namespace vexa::host {
@@ -35,9 +36,9 @@ class ShowShadowsAction final : public CameraAction {
  private:
   static std::string table_of(const SLibDShadowTourInfo& info) {
     std::string text = fmt::format("Shadow tours are {}; {}; the longest recording is {} s\n",
-                                   info.enabled ? "on" : "off", resume_text(info.resumeTime), info.maxRecordTime);
+                                   switch_word(info.enabled), resume_text(info.resumeTime), info.maxRecordTime);
     for (const auto& [number, tour] : info.tours) {
-      text += fmt::format("{}  {:<3}  {:>4} s recorded\n", number, tour.enabled ? "on" : "off", tour.recordedTime);
+      text += fmt::format("{}  {:<3}  {:>4} s recorded\n", number, switch_word(tour.enabled), tour.recordedTime);
     }
     return text;
   }
@@ -105,8 +106,8 @@ class ShadowAction final : public CameraAction {
 
   std::optional<Problem> check() override {
     if (stops()) return std::nullopt;
-    const auto [end, error] = std::from_chars(word_.data(), word_.data() + word_.size(), number_);
-    if (error == std::errc() && end == word_.data() + word_.size() && number_ >= 1) return std::nullopt;
+    number_ = number_text(word_).value_or(0);
+    if (number_ >= 1) return std::nullopt;
     return usage("shadow tours are counted from 1", "vexactl shadow CAMERA show shows them.");
   }
 

@@ -2,12 +2,13 @@
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <charconv>
 #include <nlohmann/json.hpp>
 
 #include "host/base/json_text.h"
+#include "host/base/number_text.h"
 #include "host/commands/action_group.h"
 #include "host/console/result_output.h"
+#include "host/words/setting_words.h"
 #include "host/words/tour_words.h"
 
 namespace vexa::host {
@@ -38,9 +39,9 @@ class ShowToursAction final : public CameraAction {
 
  private:
   static std::string table_of(const SLibDCameraTourInfo& info) {
-    std::string text = fmt::format("Tours are {}; {}\n", info.enabled ? "on" : "off", resume_text(info.resumeTime));
+    std::string text = fmt::format("Tours are {}; {}\n", switch_word(info.enabled), resume_text(info.resumeTime));
     for (const auto& [number, tour] : info.tours) {
-      text += fmt::format("{}  {:<3}  {:>4} s each  speed {:>3}  presets {}\n", number, tour.enabled ? "on" : "off",
+      text += fmt::format("{}  {:<3}  {:>4} s each  speed {:>3}  presets {}\n", number, switch_word(tour.enabled),
                           tour.stayTime, tour.speed, tour.sequence.empty() ? "-" : presets_text(tour.sequence));
     }
     return text;
@@ -98,14 +99,12 @@ std::optional<Problem> check_tour_number(int number) {
 // "1,2,3"; none for anything else.
 std::optional<std::vector<int>> presets_in(const std::string& text) {
   std::vector<int> presets;
-  const char* const end = text.data() + text.size();
-  for (const char* place = text.data();; ++place) {
-    int number = 0;
-    const auto [stop, error] = std::from_chars(place, end, number);
-    if (error != std::errc() || number < 1 || (stop != end && *stop != ',')) return std::nullopt;
-    presets.push_back(number);
-    if (stop == end) return presets;
-    place = stop;
+  for (std::string_view rest = text;; rest.remove_prefix(1)) {
+    const std::optional<int> number = take_number<int>(rest);
+    if (!number || *number < 1) return std::nullopt;
+    presets.push_back(*number);
+    if (rest.empty()) return presets;
+    if (rest.front() != ',') return std::nullopt;
   }
 }
 

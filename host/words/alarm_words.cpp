@@ -1,9 +1,7 @@
 #include "host/words/alarm_words.h"
 
-#include <fmt/chrono.h>
 #include <fmt/format.h>
 
-#include <ctime>
 #include <nlohmann/json.hpp>
 
 namespace vexa::host {
@@ -23,14 +21,6 @@ std::string kind_of(const SLibDPinInfo& pin) {
     default:
       return "input";
   }
-}
-
-std::string moment_text(std::chrono::system_clock::time_point moment) {
-  const auto since = std::chrono::duration_cast<std::chrono::milliseconds>(moment.time_since_epoch()).count();
-  const auto seconds = static_cast<std::time_t>(since / 1000);
-  std::tm fields{};
-  gmtime_r(&seconds, &fields);
-  return fmt::format("{:%Y-%m-%dT%H:%M:%S}.{:03}Z", fields, since % 1000);
 }
 
 std::vector<SLibDPinInfo> PinStates::changed(const std::vector<SLibDPinInfo>& pins) {

@@ -2,7 +2,6 @@
 #ifndef HOST_WORDS_ALARM_WORDS_H_
 #define HOST_WORDS_ALARM_WORDS_H_
 
-#include <chrono>
 #include <map>
 #include <string>
 #include <utility>
@@ -14,9 +13,6 @@ namespace vexa::host {
 
 // "input", "output", "motion", "tampering" or "audio".
 [[nodiscard]] std::string kind_of(const SLibDPinInfo& pin);
-
-// A moment as "2026-01-31T12:00:00.250Z".
-[[nodiscard]] std::string moment_text(std::chrono::system_clock::time_point moment);
 
 // Remembers the states of pins and tells which of a status call's are new. A pin not seen before counts as inactive.
 class PinStates {

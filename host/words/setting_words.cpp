@@ -3,17 +3,15 @@
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <charconv>
+
+#include "host/base/number_text.h"
 
 namespace vexa::host {
 namespace {
 
 bool take_number(std::string_view text, int least, int most, std::optional<int>& number) {
-  int value = 0;
-  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value);
-  if (error != std::errc() || end != text.data() + text.size() || value < least || value > most) return false;
-  number = value;
-  return true;
+  number = number_text(text, least, most);
+  return number.has_value();
 }
 
 template <typename Words, typename Value>
@@ -44,11 +42,6 @@ bool take_text(std::string_view text, const std::string_view (&known)[kCount], s
   return true;
 }
 
-bool take_switch(std::string_view text, std::optional<bool>& value) {
-  if (text == "on" || text == "off") value = text == "on";
-  return value.has_value();
-}
-
 constexpr std::string_view kExposures[] = {"Full auto", "Shutter Priority", "Iris Priority"};
 
 struct SettingKey {
@@ -77,7 +70,7 @@ constexpr SettingKey kKeys[] = {
      [](Text t, Into& to) { return take_word(t, kVisibilityWords, to.visibility); }},
     {"infrared", "off or daynight", [](Text t, Into& to) { return take_word(t, kInfraredWords, to.infrared); }},
     {"infrared-strength", "0 to 100", [](Text t, Into& to) { return take_number(t, 0, 100, to.infrared_strength); }},
-    {"back-light", "on or off", [](Text t, Into& to) { return take_switch(t, to.back_light); }},
+    {"back-light", "on or off", [](Text t, Into& to) { return (to.back_light = switch_named(t)).has_value(); }},
     {"exposure", "\"Full auto\", \"Shutter Priority\" or \"Iris Priority\"",
      [](Text t, Into& to) { return take_text(t, kExposures, to.exposure); }}};
 
@@ -117,6 +110,13 @@ Result<SettingChanges> parse_changes(const std::vector<std::string>& texts) {
     }
   }
   return changes;
+}
+
+const char* switch_word(bool on) { return on ? "on" : "off"; }
+
+std::optional<bool> switch_named(std::string_view word) {
+  if (word != "on" && word != "off") return std::nullopt;
+  return word == "on";
 }
 
 std::optional<ELibDDayNightType> parse_day_night(std::string_view word) {

@@ -70,6 +70,10 @@ struct SettingChanges {
 // Reads "KEY=VALUE" texts, each key once; a refusal says what the key takes.
 [[nodiscard]] Result<SettingChanges> parse_changes(const std::vector<std::string>& texts);
 
+// "on" or "off".
+[[nodiscard]] const char* switch_word(bool on);
+[[nodiscard]] std::optional<bool> switch_named(std::string_view word);
+
 // "auto", "day" or "night".
 [[nodiscard]] std::optional<ELibDDayNightType> parse_day_night(std::string_view word);
 

@@ -1,20 +1,19 @@
 #include "host/words/stored_recordings.h"
 
 #include <fmt/format.h>
-#include <time.h>
 
 #include <nlohmann/json.hpp>
 
 #include "host/base/json_text.h"
 #include "host/base/printable.h"
+#include "host/words/utc_time.h"
 
 namespace vexa::host {
 namespace {
 
 using Json = nlohmann::ordered_json;
 
-constexpr char kMomentForm[] = "%Y-%m-%dT%H:%M:%S";
-constexpr char kRecordingRow[] = "{:<20}  {:>7}  {:<6}  {:>9}  {}\n";
+constexpr char kRow[] = "{:<20}  {:>7}  {:<6}  {:>9}  {}\n";
 
 Json object_of(const SLibDEdgeStorageRecord& record) {
   return {{"name", record.streamName},       {"start", utc_text(start_of(record))},
@@ -42,34 +41,15 @@ std::string file_name_of(const std::string& recording, const std::string& end) {
   return (name.empty() ? "%" : name) + end;
 }
 
-std::string utc_text(std::chrono::seconds since_1970) {
-  const auto moment = static_cast<std::time_t>(since_1970.count());
-  std::tm fields{};
-  gmtime_r(&moment, &fields);
-  return fmt::format("{:04}-{:02}-{:02}T{:02}:{:02}:{:02}Z", fields.tm_year + 1900, fields.tm_mon + 1, fields.tm_mday,
-                     fields.tm_hour, fields.tm_min, fields.tm_sec);
-}
-
-std::optional<std::chrono::seconds> utc_moment(const std::string& text) {
-  std::tm fields{};
-  const char* rest = strptime(text.c_str(), kMomentForm, &fields);
-  if (rest == nullptr) return std::nullopt;
-  const std::chrono::seconds moment(timegm(&fields));
-  // Days such as 30 February become others, and short forms such as 2024-1-31 longer ones.
-  const std::string whole = utc_text(moment);
-  if (text != whole && text + "Z" != whole) return std::nullopt;
-  return moment;
-}
-
 std::chrono::seconds start_of(const SLibDEdgeStorageRecord& record) { return std::chrono::seconds(record.start); }
 
 std::chrono::seconds end_of(const SLibDEdgeStorageRecord& record) { return std::chrono::seconds(record.end); }
 
 std::string table_of(const StoredRecordings& records) {
-  std::string table = fmt::format(kRecordingRow, "start", "seconds", "codec", "KB", "name");
+  std::string table = fmt::format(kRow, "start", "seconds", "codec", "KB", "name");
   for (const SLibDEdgeStorageRecord& record : records) {
-    table += fmt::format(kRecordingRow, utc_text(start_of(record)), record.end - record.start,
-                         printable(record.imageCodec), record.size, printable(record.streamName));
+    table += fmt::format(kRow, utc_text(start_of(record)), record.end - record.start, printable(record.imageCodec),
+                         record.size, printable(record.streamName));
   }
   return table;
 }

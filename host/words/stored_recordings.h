@@ -4,7 +4,6 @@
 
 #include <chrono>
 #include <cstdint>
-#include <optional>
 #include <string>
 #include <vector>
 
@@ -17,11 +16,6 @@ using StoredRecordings = std::vector<SLibDEdgeStorageRecord>;
 // The name that a recording gives its file, with `end` behind it: no two names give the same one, and none leads out of
 // its folder.
 [[nodiscard]] std::string file_name_of(const std::string& recording, const std::string& end);
-
-// "2024-01-31T23:59:59Z".
-[[nodiscard]] std::string utc_text(std::chrono::seconds since_1970);
-// The same text as seconds since 1970, also without its "Z"; nothing for any other text and for days that do not exist.
-[[nodiscard]] std::optional<std::chrono::seconds> utc_moment(const std::string& text);
 
 [[nodiscard]] std::chrono::seconds start_of(const SLibDEdgeStorageRecord& record);
 // Begins the recording's last second: pictures may come up to a second later.
