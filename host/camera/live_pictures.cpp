@@ -13,17 +13,17 @@ constexpr std::size_t kMostKeptBytes = std::size_t{64} * 1024 * 1024;
 
 }  // namespace
 
-LivePictures::Look LivePictures::look() {
+LivePictures::Polled LivePictures::poll() {
   SLibDVideoFrameInfo frame;
   frame.sink = this;
   const ELibDReturnCode result = camera_.GetCurrentVideoFrame(frame);
   if (result == LIBD_NO_FRAME) {
     Interrupt::wait(kPollPause);
-    return Look::kNothing;
+    return Polled::kNone;
   }
-  if (result != LIBD_OK) return Look::kSilent;
+  if (result != LIBD_OK) return Polled::kSilent;
   keep(frame.frameType);
-  return Look::kPicture;
+  return Polled::kPicture;
 }
 
 void LivePictures::keep(std::int32_t frame_type) {
@@ -31,24 +31,24 @@ void LivePictures::keep(std::int32_t frame_type) {
   if (!codec) return;
   const bool key = is_key_frame(frame_type);
   const std::lock_guard<std::mutex> lock(mutex_);
-  if (key || run_bytes_ + received_.size() > kMostKeptBytes) {
-    run_.frames.clear();
-    run_bytes_ = 0;
+  if (key || group_bytes_ + received_.size() > kMostKeptBytes) {
+    group_.frames.clear();
+    group_bytes_ = 0;
   }
-  if (key) run_.codec = *codec;
-  if (!key && run_.frames.empty()) return;
-  run_bytes_ += received_.size();
-  run_.frames.push_back(std::exchange(received_, {}));
+  if (key) group_.codec = *codec;
+  if (!key && group_.frames.empty()) return;
+  group_bytes_ += received_.size();
+  group_.frames.push_back(std::exchange(received_, {}));
 }
 
-FrameRun LivePictures::newest() const {
+PictureGroup LivePictures::newest() const {
   const std::lock_guard<std::mutex> lock(mutex_);
-  return run_;
+  return group_;
 }
 
 bool LivePictures::has_picture() const {
   const std::lock_guard<std::mutex> lock(mutex_);
-  return !run_.frames.empty();
+  return !group_.frames.empty();
 }
 
 std::optional<Problem> await_key_frame(LiveCamera& camera, LivePictures& pictures) {
@@ -60,7 +60,7 @@ std::optional<Problem> await_key_frame(LiveCamera& camera, LivePictures& picture
     if (Interrupt::requested()) {
       return Problem{ExitCode::kInterrupted, "interrupted before a picture came", "Nothing was written."};
     }
-    if (pictures.look() == LivePictures::Look::kSilent) return silent_camera();
+    if (pictures.poll() == LivePictures::Polled::kSilent) return silent_camera();
     if (std::chrono::steady_clock::now() > give_up) {
       return Problem{ExitCode::kNoVideo, "the camera has sent no key picture", "Shorten its key-frame interval."};
     }

@@ -13,7 +13,7 @@
 namespace vexa::host {
 
 // What it takes to decode a picture, see decode_picture().
-struct FrameRun {
+struct PictureGroup {
   Codec codec = Codec::kJpeg;
   std::vector<FrameBytes> frames;  // from a key frame to the picture's own
 };
@@ -21,7 +21,7 @@ struct FrameRun {
 // Keeps what it takes to decode the newest picture. One thread looks; any may ask for the newest.
 class LivePictures final : private CDataSink {
  public:
-  enum class Look { kPicture, kNothing, kSilent };
+  enum class Polled { kPicture, kNone, kSilent };
 
   // The camera's driver knows its settings already, and outlives this.
   explicit LivePictures(CLibraryDevice& camera) : camera_(camera) {}
@@ -31,10 +31,10 @@ class LivePictures final : private CDataSink {
 
   [[nodiscard]] ELibDReturnCode start() { return camera_.StartVideoStreaming(); }
   // Takes the next picture. When none waits it first sleeps a little.
-  [[nodiscard]] Look look();
+  [[nodiscard]] Polled poll();
 
   // Without frames until the first key frame has come.
-  [[nodiscard]] FrameRun newest() const;
+  [[nodiscard]] PictureGroup newest() const;
   [[nodiscard]] bool has_picture() const;
 
  private:
@@ -44,8 +44,8 @@ class LivePictures final : private CDataSink {
   CLibraryDevice& camera_;
   FrameBytes received_;
   mutable std::mutex mutex_;  // of what follows
-  FrameRun run_;
-  std::size_t run_bytes_ = 0;
+  PictureGroup group_;
+  std::size_t group_bytes_ = 0;
 };
 
 // Starts the video and waits for the first key frame, half a minute at most.

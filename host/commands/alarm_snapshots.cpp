@@ -28,13 +28,13 @@ std::optional<Problem> AlarmSnapshots::start(const ModelCamera& camera) {
 }
 
 void AlarmSnapshots::play() {
-  while (!over_ && !silent_) silent_ = pictures_->look() == LivePictures::Look::kSilent;
+  while (!over_ && !silent_) silent_ = pictures_->poll() == LivePictures::Polled::kSilent;
 }
 
 std::optional<Problem> AlarmSnapshots::take(const SLibDPinInfo& pin, const std::string& moment) {
   if (silent_) return silent_camera();
-  const FrameRun run = pictures_->newest();
-  const auto bytes = jpeg_of(run.codec, run.frames);
+  const PictureGroup group = pictures_->newest();
+  const auto bytes = jpeg_of(group.codec, group.frames);
   if (!bytes) return bytes.error();
   std::string name = moment;
   std::replace(name.begin(), name.end(), ':', '-');  // which some file systems do not take

@@ -21,8 +21,8 @@ std::optional<Problem> draw_detection(const ModelCamera& camera, const SLibDDete
   LiveCamera& player = **live;
   LivePictures pictures(player);
   if (auto problem = await_key_frame(player, pictures)) return problem;
-  const FrameRun run = pictures.newest();
-  Result<Picture> picture = decode_picture(run.codec, run.frames);
+  const PictureGroup group = pictures.newest();
+  Result<Picture> picture = decode_picture(group.codec, group.frames);
   if (!picture) return picture.error();
   draw_windows(*picture, setting);
   const auto bytes = encode_picture(*picture, picture_format_of(file).value_or(PictureFormat::kPng));

@@ -18,7 +18,7 @@ namespace vexa::host {
 namespace {
 
 using Json = nlohmann::ordered_json;
-using SteadyClock = std::chrono::steady_clock;
+using Clock = std::chrono::steady_clock;
 
 // A position comes with a key picture at the latest.
 constexpr std::chrono::seconds kLongestWaitForPosition{10};
@@ -69,13 +69,13 @@ class WatchAction final : public CameraAction {
 
   ExitCode follow(const ModelCamera& camera, LivePictures& pictures, Terminal& terminal) const {
     std::optional<PtzView> shown;
-    const auto give_up = SteadyClock::now() + kLongestWaitForPosition;
+    const auto give_up = Clock::now() + kLongestWaitForPosition;
     for (std::uint64_t lines = 0; count_ == 0 || lines < count_;) {
       if (Interrupt::requested()) return ExitCode::kInterrupted;
-      if (pictures.look() == LivePictures::Look::kSilent) return terminal.report(silent_camera());
+      if (pictures.poll() == LivePictures::Polled::kSilent) return terminal.report(silent_camera());
       SLibDPTZStatus status;
       const bool told = camera.device().GetCurrentPosition(status) == LIBD_OK;
-      if (!told && !shown && SteadyClock::now() > give_up) return terminal.report(no_position());
+      if (!told && !shown && Clock::now() > give_up) return terminal.report(no_position());
       if (!told) continue;
       const PtzView view = view_of(status, camera.profile());
       if (shown == view) continue;

@@ -62,9 +62,9 @@ class SnapshotCommand final : public Command {
   static Result<FrameBytes> newest_picture(LiveCamera& camera, PictureFormat format) {
     LivePictures pictures(camera);
     if (auto problem = await_key_frame(camera, pictures)) return fail(*std::move(problem));
-    const FrameRun run = pictures.newest();
-    if (format == PictureFormat::kJpeg) return jpeg_of(run.codec, run.frames);
-    const Result<Picture> decoded = decode_picture(run.codec, run.frames);
+    const PictureGroup group = pictures.newest();
+    if (format == PictureFormat::kJpeg) return jpeg_of(group.codec, group.frames);
+    const Result<Picture> decoded = decode_picture(group.codec, group.frames);
     if (!decoded) return fail(decoded.error());
     return encode_picture(*decoded, format);
   }

@@ -10,19 +10,19 @@
 namespace vexa::host {
 namespace {
 
-struct FileEnding {
+struct Extension {
   std::string_view text;
   PictureFormat format;
 };
 
-constexpr FileEnding kFileEndings[] = {
+constexpr Extension kExtensions[] = {
     {".png", PictureFormat::kPng}, {".jpg", PictureFormat::kJpeg}, {".jpeg", PictureFormat::kJpeg}};
 
 }  // namespace
 
 std::optional<PictureFormat> picture_format_of(std::string_view file) {
-  for (const FileEnding& ending : kFileEndings) {
-    if (has_extension(file, ending.text)) return ending.format;
+  for (const Extension& extension : kExtensions) {
+    if (has_extension(file, extension.text)) return extension.format;
   }
   return std::nullopt;
 }

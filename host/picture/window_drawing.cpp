@@ -7,12 +7,11 @@
 namespace vexa::host {
 namespace {
 
-using PixelColour = std::array<std::uint8_t, 3>;
+using Colour = std::array<std::uint8_t, 3>;
 
 constexpr std::size_t kWindowCount = std::extent_v<decltype(SLibDDetectionParam::windows)>;
-constexpr std::array<PixelColour, kWindowCount> kWindowColours{
-    {{255, 64, 64}, {64, 255, 64}, {64, 160, 255}, {255, 224, 32}}};
-constexpr PixelColour kDigitColour{0, 0, 0};
+constexpr std::array<Colour, kWindowCount> kColours{{{255, 64, 64}, {64, 255, 64}, {64, 160, 255}, {255, 224, 32}}};
+constexpr Colour kDigitColour{0, 0, 0};
 
 constexpr int kDigitWidth = 5;
 constexpr int kDigitHeight = 7;
@@ -24,21 +23,21 @@ constexpr std::array<std::array<unsigned, kDigitHeight>, kWindowCount> kDigits{
      {0x02, 0x06, 0x0a, 0x12, 0x1f, 0x02, 0x02}}};
 
 // Pixels, both corners within.
-struct PixelBox {
+struct Box {
   int left;
   int top;
   int right;
   int bottom;
 };
 
-void paint(Picture& picture, int x, int y, const PixelColour& colour) {
+void paint(Picture& picture, int x, int y, const Colour& colour) {
   if (x < 0 || y < 0 || x >= picture.width || y >= picture.height) return;
   const auto place = std::size_t{3} * (static_cast<std::size_t>(y) * static_cast<std::size_t>(picture.width) +
                                        static_cast<std::size_t>(x));
   std::copy(colour.begin(), colour.end(), picture.rgb.begin() + static_cast<std::ptrdiff_t>(place));
 }
 
-void fill(Picture& picture, const PixelBox& box, const PixelColour& colour) {
+void fill(Picture& picture, const Box& box, const Colour& colour) {
   for (int y = box.top; y <= box.bottom; ++y) {
     for (int x = box.left; x <= box.right; ++x) paint(picture, x, y, colour);
   }
@@ -50,13 +49,13 @@ int pixel_at(std::int32_t share, int size) {
   return static_cast<int>(std::min<std::int64_t>(pixel, size - 1));
 }
 
-PixelBox box_of(const std::vector<SLibDCommonPosition>& area, const Picture& picture) {
+Box box_of(const std::vector<SLibDCommonPosition>& area, const Picture& picture) {
   const auto [left, right] = std::minmax({pixel_at(area[0].x, picture.width), pixel_at(area[1].x, picture.width)});
   const auto [top, bottom] = std::minmax({pixel_at(area[0].y, picture.height), pixel_at(area[1].y, picture.height)});
   return {left, top, right, bottom};
 }
 
-void draw_frame(Picture& picture, const PixelBox& box, int thickness, const PixelColour& colour) {
+void draw_frame(Picture& picture, const Box& box, int thickness, const Colour& colour) {
   const int most = thickness - 1;
   fill(picture, {box.left, box.top, box.right, std::min(box.top + most, box.bottom)}, colour);
   fill(picture, {box.left, std::max(box.bottom - most, box.top), box.right, box.bottom}, colour);
@@ -64,7 +63,7 @@ void draw_frame(Picture& picture, const PixelBox& box, int thickness, const Pixe
   fill(picture, {std::max(box.right - most, box.left), box.top, box.right, box.bottom}, colour);
 }
 
-void draw_cross(Picture& picture, const PixelBox& box, int thickness, const PixelColour& colour) {
+void draw_cross(Picture& picture, const Box& box, int thickness, const Colour& colour) {
   const int width = box.right - box.left;
   const int height = box.bottom - box.top;
   const int steps = std::max({width, height, 1});
@@ -78,9 +77,9 @@ void draw_cross(Picture& picture, const PixelBox& box, int thickness, const Pixe
 }
 
 // A digit of black on a patch of the window's colour, `scale` pixels a dot.
-void draw_digit(Picture& picture, const PixelBox& box, std::size_t window, int scale) {
+void draw_digit(Picture& picture, const Box& box, std::size_t window, int scale) {
   fill(picture, {box.left, box.top, box.left + (kDigitWidth + 2) * scale - 1, box.top + (kDigitHeight + 2) * scale - 1},
-       kWindowColours[window]);
+       kColours[window]);
   for (int row = 0; row < kDigitHeight; ++row) {
     for (int column = 0; column < kDigitWidth; ++column) {
       const unsigned bit = 1U << (kDigitWidth - 1 - column);
@@ -102,10 +101,10 @@ void draw_windows(Picture& picture, const SLibDDetectionParam& setting) {
     const SLibDDetectionWindow& window = setting.windows[i];
     if (window.area.size() != 2) continue;
     if (window.area[0].x == window.area[1].x || window.area[0].y == window.area[1].y) continue;
-    const PixelBox box = box_of(window.area, picture);
+    const Box box = box_of(window.area, picture);
     const int thin = std::max(1, scale / 2);
-    draw_frame(picture, box, window.enabled == 1 ? 2 * scale : thin, kWindowColours[i]);
-    if (window.mode > 0) draw_cross(picture, box, thin, kWindowColours[i]);
+    draw_frame(picture, box, window.enabled == 1 ? 2 * scale : thin, kColours[i]);
+    if (window.mode > 0) draw_cross(picture, box, thin, kColours[i]);
     draw_digit(picture, box, i, scale);
   }
 }
