@@ -2,6 +2,7 @@
 
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <cerrno>
 #include <system_error>
 
@@ -20,7 +21,8 @@ Problem out_of_descriptors() {
 
 }  // namespace
 
-void add_camera_options(CLI::App& command, CameraOptions& options) {
+void add_camera_options(CLI::App& command, CameraOptions& options, const char* const* environment) {
+  read_environment(options.credentials, environment);
   command.add_option("camera,--camera", options.address, "the camera: HOST or HOST:PORT (HTTP port, else 80)")
       ->required()
       ->type_name("");
@@ -45,6 +47,15 @@ void add_camera_options(CLI::App& command, CameraOptions& options) {
 
 void add_stream_option(CLI::App& command, int& stream) {
   command.add_option("--stream", stream, "which of the camera's video streams")->type_name("N")->capture_default_str();
+}
+
+void add_model_options(CLI::App& command, ModelOptions& options, const char* const* environment) {
+  add_camera_options(command, options.camera, environment);
+  command
+      .add_option("--profile", options.profile,
+                  "profile of the camera's model, a name or a file [the installed one of the model it reports]")
+      ->type_name("PROFILE");
+  add_stream_option(command, options.stream);
 }
 
 std::optional<Problem> check_stream(int stream) {

@@ -27,15 +27,6 @@ Problem wrong_profile(const ProfileError& error) {
           "See docs/model_profiles.md for what a profile holds, or vexactl profile list for those installed."};
 }
 
-void add_model_options(CLI::App& command, ModelOptions& options) {
-  add_camera_options(command, options.camera);
-  command
-      .add_option("--profile", options.profile,
-                  "profile of the camera's model, a name or a file [the installed one of the model it reports]")
-      ->type_name("PROFILE");
-  add_stream_option(command, options.stream);
-}
-
 Result<ModelCamera> ModelCamera::open(const ModelOptions& options, Terminal& terminal) {
   if (auto problem = check_stream(options.stream)) return fail(*std::move(problem));
   Result<OpenCamera> asked = open_camera(options.camera, terminal);

@@ -11,15 +11,6 @@
 
 namespace vexa::host {
 
-struct ModelOptions {
-  CameraOptions camera;
-  std::optional<std::string> profile = {};  // --profile; else the installed one of the model that the camera names
-  int stream = 1;
-};
-
-// The options of every command that speaks to a camera, and those that name its profile and video stream.
-void add_model_options(CLI::App& command, ModelOptions& options);
-
 class ModelCamera {
  public:
   // Asks the camera for its model and makes that model's driver. A model without a profile gets the common driver.

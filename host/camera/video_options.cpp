@@ -1,5 +1,7 @@
 #include "host/camera/video_options.h"
 
+#include <CLI/CLI.hpp>
+
 #include "host/camera/camera_options.h"
 
 namespace vexa::host {

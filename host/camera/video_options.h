@@ -2,11 +2,14 @@
 #ifndef HOST_CAMERA_VIDEO_OPTIONS_H_
 #define HOST_CAMERA_VIDEO_OPTIONS_H_
 
-#include <CLI/CLI.hpp>
 #include <optional>
 #include <string>
 
 #include "host/camera/live_camera.h"
+
+namespace CLI {
+class App;
+}
 
 namespace vexa::host {
 

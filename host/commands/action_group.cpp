@@ -2,14 +2,15 @@
 
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
+
 #include "host/base/printable.h"
 
 namespace vexa::host {
 
 CLI::App* ActionGroup::declare(CLI::App& program, const char* const* environment) {
   CLI::App* command = program.add_subcommand(text_.name, text_.description);
-  read_environment(options_.camera.credentials, environment);
-  add_model_options(*command, options_);
+  add_model_options(*command, options_, environment);
   command->require_subcommand(1);
   command->footer(text_.footer);
   // The camera's options may stand behind the action too.

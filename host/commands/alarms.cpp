@@ -1,6 +1,7 @@
 // vexactl io, output and watch: a camera's pins, its outputs, and its alarms as they come.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 #include <optional>
 #include <vector>
@@ -24,8 +25,7 @@ class IoCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("io", "Show a camera's inputs, outputs and detectors");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->footer("The state of an output is not reported; it shows as \"-\", in JSON as null.");
     return command;
   }
@@ -95,8 +95,7 @@ class OutputCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("output", "Switch an alarm output of a camera");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->add_option("number", number_, "of the output, counted from 1")->required()->type_name("");
     command->add_option("switch", switch_, "on or off")->required()->type_name("");
     return command;
@@ -126,8 +125,7 @@ class WatchCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("watch", "Show a camera's alarms as they come, until Ctrl-C");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->add_flag("--metadata", metadata_, "show the frames of motion metadata too");
     command->add_option("--count", count_, "end after this many lines")->check(CLI::PositiveNumber);
     command

@@ -1,6 +1,7 @@
 // vexactl codecs and exposure: what a camera offers, and steps along its exposure.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 #include <utility>
 
@@ -60,8 +61,7 @@ class CodecsCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("codecs", "List the codecs and sizes that a camera offers as it is set");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->footer("Capture size, largest size and solid PTZ of the camera narrow what it offers.");
     return command;
   }
@@ -137,8 +137,7 @@ class ExposureCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("exposure", "Show what a camera offers for exposure, or set it");
-    read_environment(options_.model.camera.credentials, environment);
-    add_model_options(*command, options_.model);
+    add_model_options(*command, options_.model, environment);
     command->add_option("--mode", options_.mode, "\"Full auto\", \"Shutter Priority\" or \"Iris Priority\"")
         ->type_name("MODE");
     command->add_option("--level", options_.level, "brightness along the mode's steps, 0 to 10000")->type_name("N");

@@ -1,6 +1,7 @@
 // vexactl detection, tampering and audio-detection: what a camera's detectors look for, and switching them.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <nlohmann/json.hpp>
 #include <optional>
@@ -46,8 +47,7 @@ class DetectionCommand final : public Command {
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command =
         program.add_subcommand("detection", "Show, set or draw what a camera's video detection looks for");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->add_option("action", action_, "show, set, or draw: a picture with the windows on it")
         ->required()
         ->type_name("")
@@ -167,8 +167,7 @@ class TamperingCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("tampering", "Switch a camera's tampering detector");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->add_option("switch", switch_, "on or off")->required()->type_name("");
     command->add_option("--level", level_, "low, middle or high")->capture_default_str();
     return command;
@@ -195,8 +194,7 @@ class AudioDetectionCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("audio-detection", "Switch a camera's audio detector");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->add_option("switch", switch_, "on or off")->required()->type_name("");
     return command;
   }

@@ -1,6 +1,7 @@
 // vexactl edge: recording on a camera's card, and the recordings there. Playing them has a file of its own.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <iostream>
 #include <nlohmann/json.hpp>
 #include <optional>

@@ -1,6 +1,7 @@
 // vexactl edge play, get and backfill: recordings played by the camera, counted or kept in files.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <chrono>
 #include <filesystem>

@@ -1,6 +1,7 @@
 // vexactl info: what a camera says it is.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
 #include "host/base/codec.h"
@@ -65,8 +66,7 @@ class InfoCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("info", "Show what a camera is, and how its video is set");
-    read_environment(options_.credentials, environment);
-    add_camera_options(*command, options_);
+    add_camera_options(*command, options_, environment);
     return command;
   }
 

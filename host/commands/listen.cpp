@@ -1,6 +1,7 @@
 // vexactl listen: a camera's sound into a file.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <array>
 #include <chrono>
@@ -70,8 +71,7 @@ class ListenCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("listen", "Record a camera's sound into a file");
-    read_environment(camera_.credentials, environment);
-    add_camera_options(*command, camera_);
+    add_camera_options(*command, camera_, environment);
     command
         ->add_option("--out", out_,
                      "file to write: .wav of G.711 sound, else the sound as it comes; - is standard output")

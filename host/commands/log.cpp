@@ -1,6 +1,7 @@
 // vexactl log: the driver's CGI log as a table.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <array>
 
 #include "host/access/credentials.h"

@@ -1,6 +1,7 @@
 // vexactl preset: a camera's stored positions. They are counted from 1, as on the camera and in its tours.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
 #include "host/base/json_text.h"

@@ -1,6 +1,7 @@
 // vexactl profile: the profiles of camera models.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <array>
 #include <nlohmann/json.hpp>
 #include <utility>

@@ -1,6 +1,7 @@
 // vexactl ptz: turns, zooms and focuses a camera.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <cmath>
 #include <functional>
 

@@ -1,6 +1,7 @@
 // vexactl record: live video into a file.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <chrono>
 #include <nlohmann/json.hpp>
@@ -109,8 +110,7 @@ class RecordCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("record", "Record live video into a file");
-    read_environment(options_.camera.credentials, environment);
-    add_camera_options(*command, options_.camera);
+    add_camera_options(*command, options_.camera, environment);
     command
         ->add_option("--out", options_.out,
                      "file to write: .mkv or .mp4, or the pictures alone: .h264, .m4v, .mjpeg; - is standard output")

@@ -1,6 +1,7 @@
 // vexactl settings, set and daynight: how a camera is set, and changing it.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 #include <utility>
 
@@ -18,8 +19,7 @@ class SettingsCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("settings", "Show how a camera is set");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->footer("A setting that the camera does not report shows as \"-\", in JSON as null.");
     return command;
   }
@@ -40,8 +40,7 @@ class SetCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("set", "Change a camera's settings");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->add_option("settings", changes_, "what to change, each as KEY=VALUE")->required()->type_name("");
     command->footer(
         "Settings:\n" + known_settings() +
@@ -73,8 +72,7 @@ class DayNightCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("daynight", "Show or set a camera's day/night mode");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->add_option("mode", mode_, "auto, day or night; left out: show the present mode")->type_name("");
     return command;
   }

@@ -1,6 +1,7 @@
 // vexactl shadow: movements that a camera records while somebody moves it, and plays back.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
 #include "host/base/json_text.h"

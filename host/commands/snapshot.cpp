@@ -1,6 +1,7 @@
 // vexactl snapshot: one picture of live video into a file.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
 #include "host/base/json_text.h"
@@ -21,8 +22,7 @@ class SnapshotCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("snapshot", "Keep one picture of live video");
-    read_environment(camera_.credentials, environment);
-    add_camera_options(*command, camera_);
+    add_camera_options(*command, camera_, environment);
     command->add_option("--out", out_, "file to write: .jpg, .jpeg or .png")->required()->type_name("FILE");
     add_video_options(*command, video_);
     command->footer(

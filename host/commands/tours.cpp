@@ -1,6 +1,7 @@
 // vexactl tour: a camera's tours, each a row of presets that it visits in turn.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <nlohmann/json.hpp>
 
