@@ -2,8 +2,8 @@
 #ifndef HOST_COMMAND_LINE_H_
 #define HOST_COMMAND_LINE_H_
 
-#include "host/exit_code.h"
-#include "host/terminal.h"
+#include "host/base/exit_code.h"
+#include "host/console/terminal.h"
 
 namespace vexa::host {
 

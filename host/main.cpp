@@ -3,9 +3,9 @@
 #include <cstdio>
 #include <exception>
 
+#include "host/access/driver_trace.h"
 #include "host/command_line.h"
-#include "host/driver_trace.h"
-#include "host/interrupt.h"
+#include "host/console/interrupt.h"
 
 namespace {
 

@@ -2,17 +2,18 @@
 
 #include <fmt/format.h>
 
-#include "host/printable.h"
+#include <CLI/CLI.hpp>
+
+#include "host/base/printable.h"
 
 namespace vexa::host {
 
 CLI::App* ActionGroup::declare(CLI::App& program, const char* const* environment) {
   CLI::App* command = program.add_subcommand(text_.name, text_.description);
-  read_environment(options_.camera.credentials, environment);
-  add_model_options(*command, options_);
+  add_model_options(*command, options_, environment);
   command->require_subcommand(1);
   command->footer(text_.footer);
-  // The camera's options may stand behind the action too.
+  // The camera's options may follow the action too.
   for (const auto& action : actions_) declared_.push_back(action->declare(*command)->fallthrough());
   return command;
 }
@@ -21,11 +22,10 @@ ExitCode ActionGroup::run(Terminal& terminal) {
   CameraAction& action = chosen();
   action.set_json(options_.camera.json);
   if (const auto problem = action.check()) return terminal.report(*problem);
-  const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-  if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-  const auto& camera = std::get<ModelCamera>(opened);
-  if (const auto problem = check_model_(camera)) return terminal.report(*problem);
-  return action.run(camera, terminal);
+  const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+  if (!camera) return terminal.report(camera.error());
+  if (const auto problem = check_model_(*camera)) return terminal.report(*problem);
+  return action.run(*camera, terminal);
 }
 
 CameraAction& ActionGroup::chosen() const {
@@ -41,7 +41,7 @@ Problem model_lacks(const ModelCamera& camera, const std::string& part) {
                  "Name one with --profile; vexactl profile list shows those installed.");
   }
   return usage(fmt::format("cameras of model {} have no {}", printable(profile.model), part),
-               "vexactl profile show tells what a model has.");
+               "vexactl profile show lists what a model has.");
 }
 
 ExitCode report_change(const ModelCamera& camera, Terminal& terminal, const std::string& what, ELibDReturnCode result) {

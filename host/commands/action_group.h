@@ -7,8 +7,8 @@
 #include <string>
 #include <vector>
 
+#include "host/camera/model_camera.h"
 #include "host/commands/command.h"
-#include "host/model_camera.h"
 
 namespace vexa::host {
 

@@ -1,47 +1,42 @@
 // vexactl io, output and watch: a camera's pins, its outputs, and its alarms as they come.
 #include <fmt/format.h>
 
-#include <atomic>
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 #include <optional>
-#include <thread>
 #include <vector>
 
-#include "host/alarm_snapshots.h"
-#include "host/alarm_words.h"
+#include "host/base/json_text.h"
+#include "host/camera/model_camera.h"
+#include "host/commands/alarm_snapshots.h"
+#include "host/commands/alarm_watch.h"
 #include "host/commands/command.h"
-#include "host/interrupt.h"
-#include "host/model_camera.h"
-#include "host/result_output.h"
+#include "host/console/interrupt.h"
+#include "host/console/result_output.h"
+#include "host/words/alarm_words.h"
+#include "host/words/setting_words.h"
 
 namespace vexa::host {
 namespace {
 
 using Json = nlohmann::ordered_json;
 
-// Detectors of simple cameras report as one item, all others window by window.
-void follow_detection(const ModelCamera& camera) {
-  camera.device().SetVMDtype(camera.profile().lodDetection ? LIBD_VMD_VMF : LIBD_VMD_WINDOW);
-}
-
 class IoCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("io", "Show a camera's inputs, outputs and detectors");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->footer("The state of an output is not reported; it shows as \"-\", in JSON as null.");
     return command;
   }
 
   ExitCode run(Terminal& terminal) override {
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
     SLibDIoBoxInfo info;
-    const ELibDReturnCode result = camera.device().GetIoBoxInfo(info);
-    if (result != LIBD_OK) return terminal.report(camera.explain(result));
-    if (const auto problem = read_states(camera, info.pins)) return terminal.report(*problem);
+    const ELibDReturnCode result = camera->device().GetIoBoxInfo(info);
+    if (result != LIBD_OK) return terminal.report(camera->explain(result));
+    if (const auto problem = read_states(*camera, info.pins)) return terminal.report(*problem);
     return write_result(terminal, options_.camera.json ? json_of(info.pins) : table_of(info.pins));
   }
 
@@ -79,7 +74,7 @@ class IoCommand final : public Command {
     std::string text;
     for (const SLibDPinInfo& pin : pins) {
       text +=
-          fmt::format("{:>2}  {:<9}  {:<3}  {}\n", pin.number, kind_of(pin), pin.enabled ? "on" : "off", state_of(pin));
+          fmt::format("{:>2}  {:<9}  {:<3}  {}\n", pin.number, kind_of(pin), switch_word(pin.enabled), state_of(pin));
     }
     return text;
   }
@@ -100,27 +95,24 @@ class OutputCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("output", "Switch an alarm output of a camera");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->add_option("number", number_, "of the output, counted from 1")->required()->type_name("");
     command->add_option("switch", switch_, "on or off")->required()->type_name("");
     return command;
   }
 
   ExitCode run(Terminal& terminal) override {
-    if (switch_ != "on" && switch_ != "off") {
-      return terminal.report(usage("an output is switched on or off", "See vexactl output --help."));
-    }
+    const std::optional<bool> on = switch_named(switch_);
+    if (!on) return terminal.report(usage("an output is switched on or off", "See vexactl output --help."));
     if (number_ < 1) return terminal.report(usage("outputs are counted from 1", "vexactl io shows them."));
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
     SLibDPinInfo pin;
     pin.number = number_;
     pin.type = PIN_TYPE_ALARM_OUTPUT;
-    pin.state = switch_ == "on" ? 1 : 0;
-    const ELibDReturnCode result = camera.device().SetOutput(pin);
-    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera.explain_change("output", result));
+    pin.state = *on ? 1 : 0;
+    const ELibDReturnCode result = camera->device().SetOutput(pin);
+    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera->explain_change("output", result));
   }
 
  private:
@@ -132,15 +124,14 @@ class OutputCommand final : public Command {
 class WatchCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
-    CLI::App* command = program.add_subcommand("watch", "Show a camera's alarms as they come, until Ctrl-C");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    CLI::App* command = program.add_subcommand("watch", "Show a camera's alarms as they occur, until Ctrl-C");
+    add_model_options(*command, options_, environment);
     command->add_flag("--metadata", metadata_, "show the frames of motion metadata too");
     command->add_option("--count", count_, "end after this many lines")->check(CLI::PositiveNumber);
     command
         ->add_option("--snapshot-dir", snapshot_folder_, "write a picture of each alarm that begins into this folder")
         ->type_name("DIR");
-    command->footer("A line says when, which pin, what it is, and its new state; with --json each is a JSON object.");
+    command->footer("Each line gives the time, the pin, its kind and its new state; with --json it is a JSON object.");
     return command;
   }
 
@@ -148,101 +139,26 @@ class WatchCommand final : public Command {
     if (snapshot_folder_) {
       if (const auto problem = check_snapshot_folder(*snapshot_folder_)) return terminal.report(*problem);
     }
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
     Interrupt::finish_orderly();
     std::optional<AlarmSnapshots> snapshots;
     if (snapshot_folder_) {
-      snapshots_ = &snapshots.emplace(*snapshot_folder_);
-      if (const auto problem = snapshots_->start(camera)) return terminal.report(*problem);
+      snapshots.emplace(*snapshot_folder_);
+      if (const auto problem = snapshots->start(*camera)) return terminal.report(*problem);
     }
-    return watch(camera, terminal);
+    return AlarmWatch(*camera, terminal, watch_options(), snapshots ? &*snapshots : nullptr).run();
   }
 
  private:
-  ExitCode watch(const ModelCamera& camera, Terminal& terminal) {
-    follow_detection(camera);
-    ELibDReturnCode started = camera.device().StartIoStreaming();
-    if (started == LIBD_OK && metadata_) started = camera.device().StartModRawData();
-    if (started != LIBD_OK) return terminal.report(camera.explain(started));
-    std::thread frames;
-    if (metadata_) frames = std::thread([&] { note(watch_metadata(camera, terminal)); });
-    note(watch_alarms(camera, terminal));
-    if (frames.joinable()) frames.join();
-    camera.device().StopModRawData();
-    camera.device().StopIoStreaming();
-    if (failure_) return terminal.report(*failure_);
-    return Interrupt::requested() ? ExitCode::kInterrupted : ExitCode::kOk;
-  }
-
-  [[nodiscard]] WatchFormat format() const { return options_.camera.json ? WatchFormat::kJson : WatchFormat::kText; }
-  [[nodiscard]] bool goes_on() const { return !over_ && !Interrupt::requested(); }
-
-  // What ends one of the two threads ends the other.
-  void note(const std::optional<Problem>& problem) {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    over_ = true;
-    if (problem && !failure_) failure_ = problem;
-  }
-
-  std::optional<Problem> say(Terminal& terminal, const std::string& line) {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    if (over_) return std::nullopt;
-    const int error = terminal.write_result(line);
-    if (error != 0) {
-      return Problem{ExitCode::kCannotWrite, "an alarm cannot be written", "Is standard output still open?"};
-    }
-    over_ = ++lines_ == count_;
-    return std::nullopt;
-  }
-
-  std::optional<Problem> watch_alarms(const ModelCamera& camera, Terminal& terminal) {
-    PinStates states;
-    while (goes_on()) {
-      std::vector<SLibDPinInfo> pins;
-      const ELibDReturnCode result = camera.device().GetCurrentIoStatus(pins);
-      if (result == LIBD_NO_FRAME) continue;
-      if (result != LIBD_OK) return camera.explain(result);
-      const std::string moment = moment_text(std::chrono::system_clock::now());
-      for (const SLibDPinInfo& pin : states.changed(pins)) {
-        if (auto problem = say(terminal, alarm_line(pin, moment, format()))) return problem;
-        if (auto problem = take_snapshot(terminal, pin, moment)) return problem;
-      }
-    }
-    return std::nullopt;
-  }
-
-  // An alarm without a picture is better than none: only a folder that takes no file ends the watch.
-  std::optional<Problem> take_snapshot(Terminal& terminal, const SLibDPinInfo& pin, const std::string& moment) {
-    if (snapshots_ == nullptr || pin.state == 0) return std::nullopt;
-    auto problem = snapshots_->take(pin, moment);
-    if (!problem || problem->code == ExitCode::kCannotWrite) return problem;
-    terminal.say("vexactl: no picture of this alarm: " + problem->text);
-    return std::nullopt;
-  }
-
-  std::optional<Problem> watch_metadata(const ModelCamera& camera, Terminal& terminal) {
-    SLibDRawMDFrameInfo frame;
-    while (goes_on()) {
-      const ELibDReturnCode result = camera.device().GetCurrentPosition(frame);
-      if (result == LIBD_NO_FRAME) continue;
-      if (result != LIBD_OK) return camera.explain(result);
-      const std::string moment = moment_text(std::chrono::system_clock::now());
-      if (auto problem = say(terminal, metadata_line(frame, moment, format()))) return problem;
-    }
-    return std::nullopt;
+  [[nodiscard]] AlarmWatchOptions watch_options() const {
+    return {options_.camera.json ? WatchFormat::kJson : WatchFormat::kText, metadata_, count_};
   }
 
   ModelOptions options_;
   bool metadata_ = false;
   std::optional<std::string> snapshot_folder_;
-  AlarmSnapshots* snapshots_ = nullptr;  // while they are taken
-  std::uint64_t count_ = 0;              // 0: no such end
-  std::mutex mutex_;
-  std::uint64_t lines_ = 0;
-  std::atomic<bool> over_{false};
-  std::optional<Problem> failure_;
+  std::uint64_t count_ = 0;  // 0: no such end
 };
 
 }  // namespace

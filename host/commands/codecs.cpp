@@ -1,14 +1,16 @@
 // vexactl codecs and exposure: what a camera offers, and steps along its exposure.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 #include <utility>
 
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
+#include "host/camera/model_camera.h"
 #include "host/commands/command.h"
-#include "host/model_camera.h"
-#include "host/printable.h"
-#include "host/result_output.h"
-#include "host/setting_words.h"
+#include "host/console/result_output.h"
+#include "host/words/setting_words.h"
 
 namespace vexa::host {
 namespace {
@@ -59,22 +61,20 @@ class CodecsCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("codecs", "List the codecs and sizes that a camera offers as it is set");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->footer("Capture size, largest size and solid PTZ of the camera narrow what it offers.");
     return command;
   }
 
   ExitCode run(Terminal& terminal) override {
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
     // Asking for the settings is what narrows the offer.
-    const Result<SLibDCameraInfo> video = camera.video();
-    if (const auto* problem = std::get_if<Problem>(&video)) return terminal.report(*problem);
+    const Result<SLibDCameraInfo> video = camera->video();
+    if (!video) return terminal.report(video.error());
     SLibDFixedCameraInfo offer;
-    const ELibDReturnCode result = camera.device().GetFixedCameraInfo(offer);
-    if (result != LIBD_OK) return terminal.report(camera.explain(result));
+    const ELibDReturnCode result = camera->device().GetFixedCameraInfo(offer);
+    if (result != LIBD_OK) return terminal.report(camera->explain(result));
     const Json json = to_json(offer);
     return write_result(terminal, options_.camera.json ? to_text(json) : offer_table(json));
   }
@@ -137,8 +137,7 @@ class ExposureCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("exposure", "Show what a camera offers for exposure, or set it");
-    read_environment(options_.model.camera.credentials, environment);
-    add_model_options(*command, options_.model);
+    add_model_options(*command, options_.model, environment);
     command->add_option("--mode", options_.mode, "\"Full auto\", \"Shutter Priority\" or \"Iris Priority\"")
         ->type_name("MODE");
     command->add_option("--level", options_.level, "brightness along the mode's steps, 0 to 10000")->type_name("N");
@@ -150,18 +149,17 @@ class ExposureCommand final : public Command {
 
   ExitCode run(Terminal& terminal) override {
     if (const auto problem = check(options_)) return terminal.report(*problem);
-    const Result<ModelCamera> opened = ModelCamera::open(options_.model, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
+    const Result<ModelCamera> camera = ModelCamera::open(options_.model, terminal);
+    if (!camera) return terminal.report(camera.error());
     if (options_.mode) {
-      if (const auto problem = change(camera)) return terminal.report(*problem);
+      if (const auto problem = change(*camera)) return terminal.report(*problem);
     }
     // Without a profile the driver still changes the mode; only the list is not known.
-    if (!options_.mode && camera.profile().control.brightModes.empty()) {
+    if (!options_.mode && camera->profile().control.brightModes.empty()) {
       return terminal.report({ExitCode::kUsage, "the camera's model offers no exposure modes",
                               "Its profile decides; --profile names another."});
     }
-    const Json json = exposure_json(camera.profile());
+    const Json json = exposure_json(camera->profile());
     return write_result(terminal, options_.model.camera.json ? to_text(json) : exposure_table(json));
   }
 

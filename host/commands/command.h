@@ -2,11 +2,14 @@
 #ifndef HOST_COMMANDS_COMMAND_H_
 #define HOST_COMMANDS_COMMAND_H_
 
-#include <CLI/CLI.hpp>
 #include <memory>
 
-#include "host/exit_code.h"
-#include "host/terminal.h"
+#include "host/base/exit_code.h"
+#include "host/console/terminal.h"
+
+namespace CLI {
+class App;
+}
 
 namespace vexa::host {
 

@@ -1,16 +1,18 @@
-// vexactl detection, tampering and audio-detection: what a camera's detectors look for, and switching them.
+// vexactl detection, tampering and audio-detection: the settings of a camera's detectors, and switching them.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <nlohmann/json.hpp>
 #include <optional>
 #include <vector>
 
+#include "host/base/json_text.h"
+#include "host/camera/model_camera.h"
 #include "host/commands/command.h"
-#include "host/detection_picture.h"
-#include "host/model_camera.h"
-#include "host/result_output.h"
-#include "host/setting_words.h"
+#include "host/commands/detection_picture.h"
+#include "host/console/result_output.h"
+#include "host/words/setting_words.h"
 
 namespace vexa::host {
 namespace {
@@ -20,11 +22,6 @@ using Json = nlohmann::ordered_json;
 constexpr std::array<SettingWord<ELibDTamperLevel>, 3> kTamperLevels{
     {{"low", LIBD_TAMPER_LOW}, {"middle", LIBD_TAMPER_MIDDLE}, {"high", LIBD_TAMPER_HIGH}}};
 constexpr std::array<SettingWord<int>, 3> kObjectSizes{{{"small", 0}, {"middle", 1}, {"large", 2}}};
-
-std::optional<bool> switch_of(const std::string& word) {
-  if (word != "on" && word != "off") return std::nullopt;
-  return word == "on";
-}
 
 Problem no_switch(const std::string& what) {
   return usage(fmt::format("{} is switched on or off", what), fmt::format("See vexactl {} --help.", what));
@@ -48,10 +45,8 @@ Json window_json(const SLibDDetectionWindow& window) {
 class DetectionCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
-    CLI::App* command =
-        program.add_subcommand("detection", "Show, set or draw what a camera's video detection looks for");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    CLI::App* command = program.add_subcommand("detection", "Show, set or draw a camera's video detection settings");
+    add_model_options(*command, options_, environment);
     command->add_option("action", action_, "show, set, or draw: a picture with the windows on it")
         ->required()
         ->type_name("")
@@ -74,16 +69,15 @@ class DetectionCommand final : public Command {
     if (action_ == "draw") {
       if (const auto problem = check_picture_file(out_)) return terminal.report(*problem);
     }
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
     std::vector<SLibDDetectionParam> settings;
     ELibDPositionMode position = LIBD_POSITION_PRESET;
-    const ELibDReturnCode read = camera.device().GetObjectDetectionSetting(settings, position);
-    if (read != LIBD_OK) return terminal.report(camera.explain(read));
-    if (action_ == "show") return show(terminal, camera, settings);
-    if (action_ == "draw") return draw(terminal, camera, settings);
-    return set(terminal, camera, settings);
+    const ELibDReturnCode read = camera->device().GetObjectDetectionSetting(settings, position);
+    if (read != LIBD_OK) return terminal.report(camera->explain(read));
+    if (action_ == "show") return show(terminal, *camera, settings);
+    if (action_ == "draw") return draw(terminal, *camera, settings);
+    return set(terminal, *camera, settings);
   }
 
  private:
@@ -123,7 +117,7 @@ class DetectionCommand final : public Command {
   ExitCode set(Terminal& terminal, const ModelCamera& camera, const std::vector<SLibDDetectionParam>& settings) const {
     SLibDDetectionParam param = chosen(camera, settings);
     if (size_ && !value_named(kObjectSizes, *size_)) {
-      return terminal.report(usage("there is no such size", "It is small, middle or large."));
+      return terminal.report(usage("unknown size", "Choose small, middle or large."));
     }
     change(param);
     const ELibDReturnCode result = camera.device().SetDetectionParam(param);
@@ -172,23 +166,21 @@ class TamperingCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("tampering", "Switch a camera's tampering detector");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->add_option("switch", switch_, "on or off")->required()->type_name("");
     command->add_option("--level", level_, "low, middle or high")->capture_default_str();
     return command;
   }
 
   ExitCode run(Terminal& terminal) override {
-    const std::optional<bool> on = switch_of(switch_);
+    const std::optional<bool> on = switch_named(switch_);
     if (!on) return terminal.report(no_switch("tampering"));
     const auto level = value_named(kTamperLevels, level_);
-    if (!level) return terminal.report(usage("there is no such level", "It is low, middle or high."));
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
-    const ELibDReturnCode result = camera.device().SetTamperingAlarm(*on, *level);
-    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera.explain_change("tampering detection", result));
+    if (!level) return terminal.report(usage("unknown level", "Choose low, middle or high."));
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
+    const ELibDReturnCode result = camera->device().SetTamperingAlarm(*on, *level);
+    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera->explain_change("tampering detection", result));
   }
 
  private:
@@ -201,20 +193,18 @@ class AudioDetectionCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("audio-detection", "Switch a camera's audio detector");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->add_option("switch", switch_, "on or off")->required()->type_name("");
     return command;
   }
 
   ExitCode run(Terminal& terminal) override {
-    const std::optional<bool> on = switch_of(switch_);
+    const std::optional<bool> on = switch_named(switch_);
     if (!on) return terminal.report(no_switch("audio-detection"));
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
-    const ELibDReturnCode result = camera.device().SetAudioDetection(*on);
-    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera.explain_change("audio detection", result));
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
+    const ELibDReturnCode result = camera->device().SetAudioDetection(*on);
+    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera->explain_change("audio detection", result));
   }
 
  private:

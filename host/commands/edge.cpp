@@ -1,13 +1,16 @@
 // vexactl edge: recording on a camera's card, and the recordings there. Playing them has a file of its own.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <iostream>
 #include <nlohmann/json.hpp>
 #include <optional>
 
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
 #include "host/commands/edge_actions.h"
-#include "host/printable.h"
-#include "host/result_output.h"
+#include "host/console/result_output.h"
+#include "host/words/setting_words.h"
 
 namespace vexa::host {
 namespace {
@@ -27,7 +30,7 @@ std::string mode_table(const CardMode& mode) {
       "seconds before   {}\n"
       "seconds after    {}\n"
       "free space       {} KB\n",
-      recording.enabled ? "on" : "off", recording.imageNumber,
+      switch_word(recording.enabled), recording.imageNumber,
       recording.watchAddress.empty() ? "-" : printable(recording.watchAddress), recording.alarmTime1,
       recording.alarmTime2, mode.free_kilobytes);
 }
@@ -55,7 +58,7 @@ class CardModeAction final : public CameraAction {
 
   std::optional<Problem> check() override {
     const bool changes = watch_ || before_ || after_;
-    if (!switch_.empty() && switch_ != "on" && switch_ != "off") {
+    if (!switch_.empty() && !switch_named(switch_)) {
       return usage("recording is switched on or off", "For instance: vexactl edge CAMERA mode on --watch 192.168.0.2.");
     }
     if (switch_ != "on" && changes) {
@@ -67,11 +70,10 @@ class CardModeAction final : public CameraAction {
   }
 
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
-    const Result<CardMode> asked = camera.card_mode();
-    if (const auto* problem = std::get_if<Problem>(&asked)) return terminal.report(*problem);
-    const auto& mode = std::get<CardMode>(asked);
-    if (switch_.empty()) return write_result(terminal, json() ? to_text(mode_object(mode)) : mode_table(mode));
-    return set(camera, mode.recording, terminal);
+    const Result<CardMode> mode = camera.card_mode();
+    if (!mode) return terminal.report(mode.error());
+    if (switch_.empty()) return write_result(terminal, json() ? to_text(mode_object(*mode)) : mode_table(*mode));
+    return set(camera, mode->recording, terminal);
   }
 
  private:
@@ -87,7 +89,7 @@ class CardModeAction final : public CameraAction {
     }
     const ELibDReturnCode result = camera.device().SetEdgeStorageMode(mode);
     if (result != LIBD_NO_FRAME) return report_change(camera, terminal, "recording on the card", result);
-    return terminal.report({ExitCode::kUnreachable, "the card has no free space, or there is none; recording is on",
+    return terminal.report({ExitCode::kUnreachable, "the card is full or missing; recording is on",
                             "vexactl edge CAMERA delete makes room."});
   }
 
@@ -102,10 +104,9 @@ class ListRecordingsAction final : public CameraAction {
   CLI::App* declare(CLI::App& group) override { return group.add_subcommand("list", "Show the recordings"); }
 
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
-    const Result<StoredRecordings> listed = list_recordings(camera);
-    if (const auto* problem = std::get_if<Problem>(&listed)) return terminal.report(*problem);
-    const auto& records = std::get<StoredRecordings>(listed);
-    return write_result(terminal, json() ? json_of(records) : table_of(records));
+    const Result<StoredRecordings> records = list_recordings(camera);
+    if (!records) return terminal.report(records.error());
+    return write_result(terminal, json() ? json_of(*records) : table_of(*records));
   }
 };
 
@@ -131,7 +132,7 @@ class DeleteRecordingsAction final : public CameraAction {
     if (!yes_) {
       const std::optional<std::string> answer = ask(terminal);
       if (!answer) {
-        return terminal.report(usage("nothing was deleted: there is no answer", "Answer y, or give --yes."));
+        return terminal.report(usage("nothing was deleted: no answer was given", "Answer y, or give --yes."));
       }
       if (*answer != "y" && *answer != "yes") {
         terminal.say("vexactl: nothing was deleted");
@@ -150,8 +151,7 @@ class DeleteRecordingsAction final : public CameraAction {
   [[nodiscard]] std::optional<Problem> find(const ModelCamera& camera) const {
     if (all_) return std::nullopt;
     const Result<SLibDEdgeStorageRecord> found = find_recording(camera, name_);
-    const auto* problem = std::get_if<Problem>(&found);
-    return problem != nullptr ? std::optional(*problem) : std::nullopt;
+    return found ? std::nullopt : std::optional(found.error());
   }
 
   // Nothing when nobody is there to answer.
@@ -172,17 +172,17 @@ class DeleteRecordingsAction final : public CameraAction {
 Result<StoredRecordings> list_recordings(const ModelCamera& camera) {
   SLibDEdgeStorageRecordList list;
   const ELibDReturnCode result = camera.device().GetEdgeStorageRecordList(list);
-  if (result != LIBD_OK) return camera.explain(result);
+  if (result != LIBD_OK) return fail(camera.explain(result));
   return std::move(list.records);
 }
 
 Result<SLibDEdgeStorageRecord> find_recording(const ModelCamera& camera, const std::string& name) {
   const Result<StoredRecordings> listed = list_recordings(camera);
-  if (const auto* problem = std::get_if<Problem>(&listed)) return *problem;
-  for (const SLibDEdgeStorageRecord& record : std::get<StoredRecordings>(listed)) {
+  if (!listed) return fail(listed.error());
+  for (const SLibDEdgeStorageRecord& record : *listed) {
     if (record.streamName == name) return record;
   }
-  return usage("the card holds no recording of that name", "vexactl edge CAMERA list shows those there are.");
+  return fail(usage("the card has no recording of that name", "vexactl edge CAMERA list shows what it has."));
 }
 
 std::unique_ptr<Command> make_edge_command() {

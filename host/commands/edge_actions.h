@@ -6,7 +6,7 @@
 #include <string>
 
 #include "host/commands/action_group.h"
-#include "host/stored_recordings.h"
+#include "host/words/stored_recordings.h"
 
 namespace vexa::host {
 

@@ -1,25 +1,27 @@
 // vexactl edge play, get and backfill: recordings played by the camera, counted or kept in files.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <chrono>
 #include <filesystem>
 #include <nlohmann/json.hpp>
 
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
 #include "host/commands/edge_actions.h"
-#include "host/interrupt.h"
-#include "host/picture_decoder.h"
-#include "host/playback_taker.h"
-#include "host/printable.h"
-#include "host/recording_target.h"
-#include "host/result_output.h"
+#include "host/console/interrupt.h"
+#include "host/console/progress.h"
+#include "host/console/result_output.h"
+#include "host/picture/picture_decoder.h"
+#include "host/recording/playback_taker.h"
+#include "host/recording/recording_target.h"
+#include "host/words/utc_time.h"
 
 namespace vexa::host {
 namespace {
 
 using Json = nlohmann::ordered_json;
-
-constexpr std::chrono::milliseconds kProgressEvery{250};
 
 // What came of a recording.
 struct TakenRecording {
@@ -85,16 +87,16 @@ class PlaybackAction : public CameraAction {
   TakenRecording take(const ModelCamera& camera, const SLibDEdgeStorageRecord& record, PictureTarget* target,
                       Terminal& terminal) const {
     TakenRecording taken{record.streamName, target != nullptr ? target->path() : "", RecordingEnd::kSilent, {}, {}};
-    const std::optional<std::string> codec = played_codec(record);
+    const std::optional<Codec> codec = codec_listed_as(record.imageCodec);
     if (!codec) {
-      taken.problem =
-          Problem{ExitCode::kNoVideo,
-                  fmt::format("the recording is of a codec that cannot be played: {}", printable(record.imageCodec)),
-                  "JPEG, MPEG-4 and H.264 can."};
+      taken.problem = Problem{ExitCode::kNoVideo,
+                              fmt::format("the recording's codec cannot be played: {}", printable(record.imageCodec)),
+                              "JPEG, MPEG-4 and H.264 can."};
       return taken;
     }
     Interrupt::finish_orderly();
-    const ELibDReturnCode started = camera.device().StartEdgeStorageVideoStreaming({record.streamName, *codec, scale_});
+    const ELibDReturnCode started =
+        camera.device().StartEdgeStorageVideoStreaming({record.streamName, name_of(*codec), scale_});
     if (started != LIBD_OK) {
       taken.problem = camera.explain(started);
       return taken;
@@ -123,12 +125,11 @@ class PlaybackAction : public CameraAction {
   }
 
   static PlaybackTaker::Report progress_on(Terminal& terminal, const SLibDEdgeStorageRecord& record) {
-    using Clock = std::chrono::steady_clock;
-    return [&terminal, &record, next = Clock::time_point{}](const PlaybackProgress& progress) mutable {
-      if (!terminal.shows_progress() || Clock::now() < next) return;
-      next = Clock::now() + kProgressEvery;
-      terminal.progress(fmt::format("{:8.1f} of {} s  {:7} frames", progress.taken().count(), record.end - record.start,
-                                    progress.frames));
+    return [&record, line = Progress(terminal)](const PlaybackProgress& progress) mutable {
+      line.show([&] {
+        return fmt::format("{:8.1f} of {} s  {:7} frames", progress.taken().count(), record.end - record.start,
+                           progress.frames);
+      });
     };
   }
 
@@ -148,8 +149,8 @@ class PlayRecordingAction final : public PlaybackAction {
 
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
     const Result<SLibDEdgeStorageRecord> found = find_recording(camera, name());
-    if (const auto* problem = std::get_if<Problem>(&found)) return terminal.report(*problem);
-    return tell(take(camera, std::get<SLibDEdgeStorageRecord>(found), nullptr, terminal), terminal);
+    if (!found) return terminal.report(found.error());
+    return tell(take(camera, *found, nullptr, terminal), terminal);
   }
 };
 
@@ -172,16 +173,15 @@ class GetRecordingAction final : public PlaybackAction {
   }
 
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
-    const Result<SLibDEdgeStorageRecord> found = find_recording(camera, name());
-    if (const auto* problem = std::get_if<Problem>(&found)) return terminal.report(*problem);
-    const auto& record = std::get<SLibDEdgeStorageRecord>(found);
-    const std::string codec = played_codec(record).value_or("");
-    if (const auto promised = target().codec(); promised && *promised != codec) {
-      return terminal.report({ExitCode::kNoVideo, fmt::format("the recording is of {}", printable(record.imageCodec)),
-                              fmt::format("Let --out end in {} or .mkv.", usual_end(codec))});
+    const Result<SLibDEdgeStorageRecord> record = find_recording(camera, name());
+    if (!record) return terminal.report(record.error());
+    const std::optional<Codec> codec = codec_listed_as(record->imageCodec);
+    if (const auto promised = target().codec(); codec && promised && promised != codec) {
+      return terminal.report({ExitCode::kNoVideo, fmt::format("the recording is of {}", printable(record->imageCodec)),
+                              fmt::format("End --out in {} or .mkv.", usual_extension(*codec))});
     }
-    const std::unique_ptr<PictureTarget> file = target().open(codec);
-    return tell(take(camera, record, file.get(), terminal), terminal);
+    const std::unique_ptr<PictureTarget> file = target().open();
+    return tell(take(camera, *record, file.get(), terminal), terminal);
   }
 
  private:
@@ -194,7 +194,7 @@ class GetRecordingAction final : public PlaybackAction {
 class BackfillAction final : public PlaybackAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("backfill", "Fetch all that was recorded since a moment");
+    CLI::App* action = group.add_subcommand("backfill", "Fetch everything recorded since a given time");
     action->add_option("--since", since_, "such as 2024-01-31T23:59:59, in UTC")->required()->type_name("TIME");
     action->add_option("--out", out_, "folder for the files, .mkv where FFmpeg's libraries are there")
         ->required()
@@ -204,19 +204,19 @@ class BackfillAction final : public PlaybackAction {
   }
 
   std::optional<Problem> check() override {
-    if (!utc_moment(since_)) return usage("--since is no moment", "For instance: --since 2024-01-31T23:59:59.");
+    if (!utc_moment(since_)) return usage("--since is not a time", "For instance: --since 2024-01-31T23:59:59.");
     if (out_.empty()) return usage("--out names no folder", "For instance: --out gap.");
     return check_scale();
   }
 
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
     const Result<StoredRecordings> listed = list_recordings(camera);
-    if (const auto* problem = std::get_if<Problem>(&listed)) return terminal.report(*problem);
+    if (!listed) return terminal.report(listed.error());
     if (const auto problem = make_folder()) return terminal.report(*problem);
     const std::chrono::seconds since = *utc_moment(since_);
     ExitCode code = ExitCode::kOk;
     Json list = Json::array();
-    for (const SLibDEdgeStorageRecord& record : std::get<StoredRecordings>(listed)) {
+    for (const SLibDEdgeStorageRecord& record : *listed) {
       if (end_of(record) < since) continue;
       const TakenRecording taken = fetch(camera, record, terminal);
       if (taken.problem) code = terminal.report(*taken.problem);
@@ -240,9 +240,10 @@ class BackfillAction final : public PlaybackAction {
   }
 
   TakenRecording fetch(const ModelCamera& camera, const SLibDEdgeStorageRecord& record, Terminal& terminal) const {
-    const std::string codec = played_codec(record).value_or("");
-    const std::string name = file_name_of(record.streamName, has_ffmpeg() ? ".mkv" : usual_end(codec));
-    const auto file = RecordingTarget(std::filesystem::path(out_) / name, -1).open(codec);
+    const std::optional<Codec> codec = codec_listed_as(record.imageCodec);
+    const std::string extension = has_ffmpeg() || !codec ? ".mkv" : usual_extension(*codec);
+    const std::string name = file_name_of(record.streamName, extension);
+    const auto file = RecordingTarget(std::filesystem::path(out_) / name, -1).open();
     return take(camera, record, file.get(), terminal);
   }
 

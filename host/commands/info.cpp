@@ -1,12 +1,15 @@
-// vexactl info: what a camera says it is.
+// vexactl info: a camera's identity and video settings.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
-#include "host/camera_options.h"
+#include "host/base/codec.h"
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
+#include "host/camera/camera_options.h"
 #include "host/commands/command.h"
-#include "host/printable.h"
-#include "host/result_output.h"
+#include "host/console/result_output.h"
 
 namespace vexa::host {
 namespace {
@@ -24,7 +27,7 @@ constexpr int kStream = 1;
 std::string video_text(const SLibDCameraInfo& video) {
   std::string text =
       fmt::format("{} {}x{}, {} fps", video.codecName, video.imageWidth, video.imageHeight, video.frameRate);
-  if (video.codecName == "JPEG") return text + fmt::format(", quality {}", video.quality);
+  if (codec_named(video.codecName) == Codec::kJpeg) return text + fmt::format(", quality {}", video.quality);
   return text + fmt::format(", {} kbit/s", video.bitRate);
 }
 
@@ -62,20 +65,18 @@ Json to_json(const CameraFacts& facts) {
 class InfoCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
-    CLI::App* command = program.add_subcommand("info", "Show what a camera is, and how its video is set");
-    read_environment(options_.credentials, environment);
-    add_camera_options(*command, options_);
+    CLI::App* command = program.add_subcommand("info", "Show a camera's identity and video settings");
+    add_camera_options(*command, options_, environment);
     return command;
   }
 
   ExitCode run(Terminal& terminal) override {
-    Result<OpenCamera> opened = open_camera(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    auto& camera = std::get<OpenCamera>(opened);
-    const Result<LiveCamera::Identity> identity = camera.driver->identify(kStream);
-    if (const auto* problem = std::get_if<Problem>(&identity)) return terminal.report(*problem);
-    CameraFacts facts{camera.address, std::get<LiveCamera::Identity>(identity), {}};
-    camera.driver->GetFixedSystemInfo(facts.driver);
+    Result<OpenCamera> camera = open_camera(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
+    const Result<LiveCamera::Identity> identity = camera->driver->identify(kStream);
+    if (!identity) return terminal.report(identity.error());
+    CameraFacts facts{camera->address, *identity, {}};
+    camera->driver->GetFixedSystemInfo(facts.driver);
     return write_result(terminal, options_.json ? to_text(to_json(facts)) : to_table(facts));
   }
 

@@ -1,6 +1,7 @@
 // vexactl listen: a camera's sound into a file.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <array>
 #include <chrono>
@@ -9,17 +10,19 @@
 #include <iterator>
 #include <nlohmann/json.hpp>
 
-#include "host/camera_options.h"
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
+#include "host/camera/camera_options.h"
 #include "host/commands/command.h"
-#include "host/interrupt.h"
-#include "host/printable.h"
-#include "host/result_output.h"
-#include "host/sound_file.h"
+#include "host/console/interrupt.h"
+#include "host/console/progress.h"
+#include "host/console/result_output.h"
+#include "host/recording/sound_file.h"
 
 namespace vexa::host {
 namespace {
 
-using ListenClock = std::chrono::steady_clock;
+using Clock = std::chrono::steady_clock;
 
 constexpr double kLongestListening = 366.0 * 24 * 3600;
 constexpr char kCompanded[] = "G711";
@@ -42,7 +45,7 @@ const SoundCodec* find_sound_codec(const std::string& word) {
   return found == std::end(kSoundCodecs) ? nullptr : found;
 }
 
-// How much is wanted: so many seconds of sound, whatever the clock says.
+// How much is wanted, in seconds of sound rather than of the clock.
 class SoundLimit {
  public:
   SoundLimit(std::optional<double> seconds, int bit_rate) {
@@ -58,7 +61,7 @@ class SoundLimit {
   std::optional<std::uint64_t> bytes_;
 };
 
-// What is heard until the camera, the person or the time ends it.
+// How receiving ended: with a problem, with Ctrl-C, or at the limit.
 struct Listening {
   ExitCode code = ExitCode::kOk;
   std::optional<Problem> problem;
@@ -68,11 +71,10 @@ class ListenCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("listen", "Record a camera's sound into a file");
-    read_environment(camera_.credentials, environment);
-    add_camera_options(*command, camera_);
+    add_camera_options(*command, camera_, environment);
     command
         ->add_option("--out", out_,
-                     "file to write: .wav of G.711 sound, else the sound as it comes; - is standard output")
+                     "file to write: .wav for G.711 sound, otherwise the sound as received; - is standard output")
         ->required()
         ->type_name("FILE");
     command->add_option("--codec", codec_, "switch the camera's sound on in this: g711_64, g726_40, _32, _24 or _16")
@@ -88,13 +90,13 @@ class ListenCommand final : public Command {
     }
     if (codec_ && find_sound_codec(*codec_) == nullptr) {
       return terminal.report(
-          usage("--codec is none of g711_64, g726_40, g726_32, g726_24 and g726_16", "For instance: --codec g711_64."));
+          usage("--codec must be g711_64, g726_40, g726_32, g726_24 or g726_16", "For instance: --codec g711_64."));
     }
     FrameFile file = to_standard_output() ? FrameFile("standard output", terminal.results()) : FrameFile(out_);
     if (const auto problem = file.check()) return terminal.report(*problem);
     Result<OpenCamera> opened = open_camera(camera_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    return listen(std::get<OpenCamera>(opened), file, terminal);
+    if (!opened) return terminal.report(opened.error());
+    return listen(*opened, file, terminal);
   }
 
  private:
@@ -113,15 +115,15 @@ class ListenCommand final : public Command {
     result = camera.driver->StartAudioStreaming();
     if (result != LIBD_OK) return terminal.report(camera.driver->explain(result));
     SoundFile target(file, format);
-    Listening heard = hear(camera, target, SoundLimit(seconds_, sound.bitRate), terminal);
+    Listening received = receive(camera, target, SoundLimit(seconds_, sound.bitRate), terminal);
     camera.driver->StopAudioStreaming();
-    if (const auto at_close = target.close(); at_close && !heard.problem) heard.problem = at_close;
+    if (const auto at_close = target.close(); at_close && !received.problem) received.problem = at_close;
     const ExitCode written = summarise(camera, sound, target.bytes(), terminal);
-    if (heard.problem) return terminal.report(*heard.problem);
-    if (heard.code == ExitCode::kInterrupted) {
+    if (received.problem) return terminal.report(*received.problem);
+    if (received.code == ExitCode::kInterrupted) {
       terminal.say("vexactl: interrupted; what was recorded is complete up to here");
     }
-    return heard.code == ExitCode::kOk ? written : heard.code;
+    return received.code == ExitCode::kOk ? written : received.code;
   }
 
   static ELibDReturnCode switch_on(OpenCamera& camera, const SoundCodec& codec) {
@@ -136,13 +138,15 @@ class ListenCommand final : public Command {
   }
 
   static Problem no_wave(const SLibDAudioInfo& sound) {
-    return usage(fmt::format("the camera's sound is {}, which a .wav here does not hold", printable(sound.codec)),
-                 "Give --out another ending for the sound as it comes, or switch to --codec g711_64.");
+    return usage(fmt::format("the camera's sound is {}, which vexactl does not write to .wav", printable(sound.codec)),
+                 "Give --out another extension for the sound as received, or switch to --codec g711_64.");
   }
 
-  Listening hear(OpenCamera& camera, SoundFile& target, const SoundLimit& limit, Terminal& terminal) {
+  // Polls the driver until the limit, Ctrl-C or a failure.
+  Listening receive(OpenCamera& camera, SoundFile& target, const SoundLimit& limit, Terminal& terminal) {
     const auto silence = std::chrono::milliseconds(camera_.timeout_ms);
-    auto last = ListenClock::now();
+    auto last = Clock::now();
+    Progress progress(terminal);
     std::array<unsigned char, 4096> piece{};
     while (!limit.reached(target.bytes())) {
       if (Interrupt::requested()) return {ExitCode::kInterrupted, std::nullopt};
@@ -150,19 +154,30 @@ class ListenCommand final : public Command {
       frame.data = piece.data();
       frame.capacity = static_cast<std::int32_t>(piece.size());
       const ELibDReturnCode result = camera.driver->GetCurrentAudioFrame(frame);
-      if (result == LIBD_OK) {
-        last = ListenClock::now();
-        const std::size_t share = limit.share(static_cast<std::size_t>(frame.length), target.bytes());
-        if (auto problem = target.write(piece.data(), share)) {
-          return {problem->code, problem};
-        }
-        terminal.progress(fmt::format("{} bytes of sound", target.bytes()));
-      } else if (result != LIBD_NO_FRAME || ListenClock::now() - last > silence) {
-        return {ExitCode::kNoVideo, Problem{ExitCode::kNoVideo, "the camera has stopped sending sound",
-                                            "Check its network and that its audio input is on."}};
+      if (result == LIBD_NO_FRAME && Clock::now() - last <= silence) {
+        Interrupt::wait(kPollPause);  // on a connection that the camera has closed the call returns at once
+        continue;
       }
+      if (result == LIBD_NO_FRAME || result == LIBD_TIMEOUT) return ended_by(silent());
+      if (result != LIBD_OK) return ended_by(broken_off(camera, result));
+      last = Clock::now();
+      const std::size_t share = limit.share(static_cast<std::size_t>(frame.length), target.bytes());
+      if (const auto problem = target.write(piece.data(), share)) return ended_by(*problem);
+      progress.show([&target] { return fmt::format("{} bytes of sound", target.bytes()); });
     }
     return {};
+  }
+
+  static Listening ended_by(const Problem& problem) { return {problem.code, problem}; }
+
+  static Problem silent() {
+    return {ExitCode::kNoVideo, "the camera has stopped sending sound",
+            "Check its network and that its audio input is on."};
+  }
+
+  static Problem broken_off(const OpenCamera& camera, ELibDReturnCode result) {
+    const Problem reason = camera.driver->explain(result);
+    return {ExitCode::kNoVideo, fmt::format("the sound has broken off: {}", reason.text), reason.advice};
   }
 
   ExitCode summarise(const OpenCamera& camera, const SLibDAudioInfo& sound, std::uint64_t bytes, Terminal& terminal) {

@@ -1,11 +1,13 @@
 // vexactl preset: a camera's stored positions. They are counted from 1, as on the camera and in its tours.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
 #include "host/commands/action_group.h"
-#include "host/printable.h"
-#include "host/result_output.h"
+#include "host/console/result_output.h"
 
 namespace vexa::host {
 namespace {
@@ -48,7 +50,7 @@ class OnePresetAction : public CameraAction {
 class SetPresetAction final : public OnePresetAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("set", "Store where the camera looks now");
+    CLI::App* action = group.add_subcommand("set", "Store the present position");
     declare_number(*action);
     action->add_option("name", name_, "of the preset")->required()->type_name("");
     return action;
@@ -84,7 +86,7 @@ class RecallPresetAction final : public OnePresetAction {
 class ClearPresetAction final : public OnePresetAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("clear", "Forget a stored position");
+    CLI::App* action = group.add_subcommand("clear", "Clear a stored position");
     declare_number(*action);
     return action;
   }

@@ -1,23 +1,25 @@
-// vexactl ptz watch: where a camera looks, as its pictures say.
+// vexactl ptz watch: a camera's position, taken from its pictures.
 #include "host/commands/ptz_watch.h"
 
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <chrono>
 #include <nlohmann/json.hpp>
 
-#include "host/alarm_words.h"
-#include "host/interrupt.h"
-#include "host/live_pictures.h"
-#include "host/ptz_scale.h"
-#include "host/result_output.h"
+#include "host/camera/live_pictures.h"
+#include "host/console/interrupt.h"
+#include "host/console/result_output.h"
+#include "host/words/alarm_words.h"
+#include "host/words/ptz_scale.h"
+#include "host/words/utc_time.h"
 
 namespace vexa::host {
 namespace {
 
 using Json = nlohmann::ordered_json;
-using SteadyClock = std::chrono::steady_clock;
+using Clock = std::chrono::steady_clock;
 
 // A position comes with a key picture at the latest.
 constexpr std::chrono::seconds kLongestWaitForPosition{10};
@@ -42,11 +44,10 @@ std::string view_line(const PtzView& view, const std::string& moment, WatchForma
 class WatchAction final : public CameraAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("watch", "Show where the camera looks, a line for each change");
+    CLI::App* action = group.add_subcommand("watch", "Show the camera's position, a line for each change");
     action->add_option("--count", count_, "end after this many lines")->check(CLI::PositiveNumber);
     action->footer(
-        "Angles are degrees: pan to the right, tilt up, and what the picture spans across and down. The first line "
-        "tells "
+        "Angles are degrees: pan to the right, tilt up, and what the picture spans across and down. The first line is "
         "the present position; with --json each line is a JSON object. Ends with Ctrl-C.");
     return action;
   }
@@ -68,27 +69,27 @@ class WatchAction final : public CameraAction {
 
   ExitCode follow(const ModelCamera& camera, LivePictures& pictures, Terminal& terminal) const {
     std::optional<PtzView> shown;
-    const auto give_up = SteadyClock::now() + kLongestWaitForPosition;
+    const auto give_up = Clock::now() + kLongestWaitForPosition;
     for (std::uint64_t lines = 0; count_ == 0 || lines < count_;) {
       if (Interrupt::requested()) return ExitCode::kInterrupted;
-      if (pictures.look() == LivePictures::Look::kSilent) return terminal.report(silent_camera());
+      if (pictures.poll() == LivePictures::Polled::kSilent) return terminal.report(silent_camera());
       SLibDPTZStatus status;
       const bool told = camera.device().GetCurrentPosition(status) == LIBD_OK;
-      if (!told && !shown && SteadyClock::now() > give_up) return terminal.report(no_position());
+      if (!told && !shown && Clock::now() > give_up) return terminal.report(no_position());
       if (!told) continue;
       const PtzView view = view_of(status, camera.profile());
       if (shown == view) continue;
       shown = view;
       ++lines;
-      const auto line = view_line(view, moment_text(std::chrono::system_clock::now()), format());
+      const auto line = view_line(view, utc_text(std::chrono::system_clock::now()), format());
       if (const ExitCode code = write_result(terminal, line); code != ExitCode::kOk) return code;
     }
     return ExitCode::kOk;
   }
 
   static Problem no_position() {
-    return {ExitCode::kNoVideo, "the camera's pictures do not say where it looks",
-            "Let the camera put its position into the user data of its pictures."};
+    return {ExitCode::kNoVideo, "the camera's pictures carry no position",
+            "Configure the camera to put its position into the user data of its pictures."};
   }
 
   std::uint64_t count_ = 0;  // 0: no such end

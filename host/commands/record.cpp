@@ -1,18 +1,21 @@
 // vexactl record: live video into a file.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <chrono>
 #include <nlohmann/json.hpp>
 
-#include "host/camera_options.h"
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
+#include "host/camera/camera_options.h"
+#include "host/camera/video_options.h"
 #include "host/commands/command.h"
-#include "host/interrupt.h"
-#include "host/printable.h"
-#include "host/recorder.h"
-#include "host/recording_target.h"
-#include "host/result_output.h"
-#include "host/video_options.h"
+#include "host/console/interrupt.h"
+#include "host/console/progress.h"
+#include "host/console/result_output.h"
+#include "host/recording/recorder.h"
+#include "host/recording/recording_target.h"
 
 namespace vexa::host {
 namespace {
@@ -21,7 +24,6 @@ using Json = nlohmann::ordered_json;
 using Clock = RecordingMeter::Clock;
 
 constexpr double kLongestRecording = 366.0 * 24 * 3600;
-constexpr std::chrono::milliseconds kProgressInterval{250};
 constexpr std::chrono::milliseconds kShortestSilence{2000};
 
 struct RecordOptions {
@@ -33,7 +35,7 @@ struct RecordOptions {
   bool quiet = false;
 };
 
-// What the summary says, as text and as JSON.
+// The summary's content, as text and as JSON.
 struct Recording {
   std::string camera;
   std::string model;
@@ -108,8 +110,7 @@ class RecordCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("record", "Record live video into a file");
-    read_environment(options_.camera.credentials, environment);
-    add_camera_options(*command, options_.camera);
+    add_camera_options(*command, options_.camera, environment);
     command
         ->add_option("--out", options_.out,
                      "file to write: .mkv or .mp4, or the pictures alone: .h264, .m4v, .mjpeg; - is standard output")
@@ -132,8 +133,8 @@ class RecordCommand final : public Command {
     if (const auto problem = target.check()) return terminal.report(*problem);
     options_.camera.transport = transport_of(options_.video);
     Result<OpenCamera> opened = open_camera(options_.camera, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    return record(std::get<OpenCamera>(opened), target, terminal);
+    if (!opened) return terminal.report(opened.error());
+    return record(*opened, target, terminal);
   }
 
  private:
@@ -146,18 +147,17 @@ class RecordCommand final : public Command {
   ExitCode record(OpenCamera& camera, const RecordingTarget& target, Terminal& terminal) {
     terminal.progress("connecting");
     // Asked first: it finds a wrong address or password within the time-out, which opening a stream may exceed.
-    const Result<LiveCamera::Identity> identified = camera.driver->identify(options_.video.stream);
-    if (const auto* problem = std::get_if<Problem>(&identified)) return terminal.report(*problem);
-    const auto& identity = std::get<LiveCamera::Identity>(identified);
-    if (const auto problem = other_codec(target, identity.video)) return terminal.report(*problem);
-    const std::unique_ptr<PictureTarget> file = target.open(identity.video.codecName);
+    const Result<LiveCamera::Identity> identity = camera.driver->identify(options_.video.stream);
+    if (!identity) return terminal.report(identity.error());
+    if (const auto problem = other_codec(target, identity->video)) return terminal.report(*problem);
+    const std::unique_ptr<PictureTarget> file = target.open();
     Interrupt::finish_orderly();
     const ELibDReturnCode result = camera.driver->StartVideoStreaming();
     if (result != LIBD_OK) return terminal.report(camera.driver->explain(result));
     Recorder recorder(*camera.driver, *file,
                       {.seconds = options_.seconds,
                        .frames = options_.frames,
-                       .camera_rate = static_cast<double>(identity.video.frameRate),
+                       .camera_rate = static_cast<double>(identity->video.frameRate),
                        .silence = silence()});
     const RecordingEnd end = recorder.run(progress_on(terminal));
     const Clock::time_point ended = Clock::now();
@@ -165,8 +165,8 @@ class RecordCommand final : public Command {
     camera.driver->StopVideoStreaming();
     std::optional<Problem> problem = recorder.problem();
     if (const auto at_close = file->close(); at_close && !problem) problem = at_close;
-    const ExitCode written = summarise({to_string(camera.address), identity.system.modelName, file->path(),
-                                        identity.video.codecName, end, recorder.meter(), ended},
+    const ExitCode written = summarise({to_string(camera.address), identity->system.modelName, file->path(),
+                                        identity->video.codecName, end, recorder.meter(), ended},
                                        terminal);
     if (problem) return terminal.report(*problem);
     const ExitCode code = judge(end, terminal);
@@ -176,19 +176,19 @@ class RecordCommand final : public Command {
   // When the file's name promises another codec than the camera sends.
   [[nodiscard]] std::optional<Problem> other_codec(const RecordingTarget& target, const SLibDCameraInfo& video) const {
     const auto promised = target.codec();
-    if (!promised || video.codecName == *promised) return std::nullopt;
+    const auto sent = codec_named(video.codecName);
+    if (!promised || sent == promised) return std::nullopt;
     return Problem{
         ExitCode::kNoVideo,
         fmt::format("video stream {} of the camera is set to {}", options_.video.stream, printable(video.codecName)),
-        fmt::format("Set it to {} on the camera, choose another with --stream, or let --out end in {} or .mkv.",
-                    *promised, usual_end(video.codecName))};
+        sent ? fmt::format("Set it to {} on the camera, choose another with --stream, or end --out in {} or .mkv.",
+                           name_of(*promised), usual_extension(*sent))
+             : fmt::format("Set it to {} on the camera, or choose another with --stream.", name_of(*promised))};
   }
 
   static Recorder::Progress progress_on(Terminal& terminal) {
-    return [&terminal, next = Clock::time_point{}](const RecordingMeter& meter, Clock::time_point now) mutable {
-      if (now < next) return;
-      next = now + kProgressInterval;
-      if (terminal.shows_progress()) terminal.progress(progress_line(meter, now));
+    return [progress = Progress(terminal)](const RecordingMeter& meter, Clock::time_point now) mutable {
+      progress.show([&] { return progress_line(meter, now); });
     };
   }
 

@@ -1,12 +1,14 @@
 // vexactl settings, set and daynight: how a camera is set, and changing it.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 #include <utility>
 
-#include "host/camera_settings.h"
+#include "host/base/json_text.h"
+#include "host/camera/camera_settings.h"
 #include "host/commands/command.h"
-#include "host/result_output.h"
+#include "host/console/result_output.h"
 
 namespace vexa::host {
 namespace {
@@ -16,20 +18,18 @@ using Json = nlohmann::ordered_json;
 class SettingsCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
-    CLI::App* command = program.add_subcommand("settings", "Show how a camera is set");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    CLI::App* command = program.add_subcommand("settings", "Show a camera's settings");
+    add_model_options(*command, options_, environment);
     command->footer("A setting that the camera does not report shows as \"-\", in JSON as null.");
     return command;
   }
 
   ExitCode run(Terminal& terminal) override {
     const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const Result<Json> settings = read_settings(std::get<ModelCamera>(opened));
-    if (const auto* problem = std::get_if<Problem>(&settings)) return terminal.report(*problem);
-    const auto& json = std::get<Json>(settings);
-    return write_result(terminal, options_.camera.json ? to_text(json) : settings_table(json));
+    if (!opened) return terminal.report(opened.error());
+    const Result<Json> json = read_settings(*opened);
+    if (!json) return terminal.report(json.error());
+    return write_result(terminal, options_.camera.json ? to_text(*json) : settings_table(*json));
   }
 
  private:
@@ -40,30 +40,26 @@ class SetCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("set", "Change a camera's settings");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->add_option("settings", changes_, "what to change, each as KEY=VALUE")->required()->type_name("");
-    command->footer(
-        "Settings:\n" + known_settings() +
-        "\nFor instance:\n  vexactl set 192.168.0.100 codec=H.264 size=1280x720 frame-rate=25 "
-        "bit-rate=4000\n\nA camera does not report its rotation: a change of the video "
-        "stream without rotation=180 turns the picture back.\n\nIt shows the settings as they are afterwards.");
+    command->footer("Settings:\n" + known_settings() +
+                    "\nFor instance:\n  vexactl set 192.168.0.100 codec=H.264 size=1280x720 frame-rate=25 "
+                    "bit-rate=4000\n\nA camera does not report its rotation: a change of the video "
+                    "stream without rotation=180 resets it to 0.\n\nIt shows the resulting settings.");
     return command;
   }
 
   ExitCode run(Terminal& terminal) override {
     const Result<SettingChanges> changes = parse_changes(changes_);
-    if (const auto* problem = std::get_if<Problem>(&changes)) return terminal.report(*problem);
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
-    if (const auto problem = change_settings(camera, std::get<SettingChanges>(changes))) {
+    if (!changes) return terminal.report(changes.error());
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
+    if (const auto problem = change_settings(*camera, *changes)) {
       return terminal.report(*problem);
     }
-    const Result<Json> settings = read_settings(camera);
-    if (const auto* problem = std::get_if<Problem>(&settings)) return terminal.report(*problem);
-    const auto& json = std::get<Json>(settings);
-    return write_result(terminal, options_.camera.json ? to_text(json) : settings_table(json));
+    const Result<Json> json = read_settings(*camera);
+    if (!json) return terminal.report(json.error());
+    return write_result(terminal, options_.camera.json ? to_text(*json) : settings_table(*json));
   }
 
  private:
@@ -75,8 +71,7 @@ class DayNightCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("daynight", "Show or set a camera's day/night mode");
-    read_environment(options_.camera.credentials, environment);
-    add_model_options(*command, options_);
+    add_model_options(*command, options_, environment);
     command->add_option("mode", mode_, "auto, day or night; left out: show the present mode")->type_name("");
     return command;
   }
@@ -85,13 +80,12 @@ class DayNightCommand final : public Command {
     SettingChanges changes;
     if (mode_) changes.day_night = parse_day_night(*mode_);
     if (mode_ && !changes.day_night) {
-      return terminal.report({ExitCode::kUsage, "there is no such day/night mode", "It is auto, day or night."});
+      return terminal.report({ExitCode::kUsage, "unknown day/night mode", "Choose auto, day or night."});
     }
-    const Result<ModelCamera> opened = ModelCamera::open(options_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    const auto& camera = std::get<ModelCamera>(opened);
-    if (const auto problem = change_settings(camera, changes)) return terminal.report(*problem);
-    return show(camera, terminal);
+    const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
+    if (!camera) return terminal.report(camera.error());
+    if (const auto problem = change_settings(*camera, changes)) return terminal.report(*problem);
+    return show(*camera, terminal);
   }
 
  private:

@@ -1,12 +1,15 @@
-// vexactl shadow: movements that a camera records while somebody moves it, and plays back.
+// vexactl shadow: movements by hand that a camera records and plays back.
 #include <fmt/format.h>
 
-#include <charconv>
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
+#include "host/base/json_text.h"
+#include "host/base/number_text.h"
 #include "host/commands/action_group.h"
-#include "host/result_output.h"
-#include "host/tour_words.h"
+#include "host/console/result_output.h"
+#include "host/words/setting_words.h"
+#include "host/words/tour_words.h"
 
 namespace vexa::host {
 namespace {
@@ -34,9 +37,9 @@ class ShowShadowsAction final : public CameraAction {
  private:
   static std::string table_of(const SLibDShadowTourInfo& info) {
     std::string text = fmt::format("Shadow tours are {}; {}; the longest recording is {} s\n",
-                                   info.enabled ? "on" : "off", resume_text(info.resumeTime), info.maxRecordTime);
+                                   switch_word(info.enabled), resume_text(info.resumeTime), info.maxRecordTime);
     for (const auto& [number, tour] : info.tours) {
-      text += fmt::format("{}  {:<3}  {:>4} s recorded\n", number, tour.enabled ? "on" : "off", tour.recordedTime);
+      text += fmt::format("{}  {:<3}  {:>4} s recorded\n", number, switch_word(tour.enabled), tour.recordedTime);
     }
     return text;
   }
@@ -56,8 +59,8 @@ class ShowShadowsAction final : public CameraAction {
 class ResumeShadowsAction final : public CameraAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("resume", "Say when a shadow tour goes on after a move by hand");
-    action->add_option("seconds", seconds_, "until it goes on; 0: it does not")
+    CLI::App* action = group.add_subcommand("resume", "Set when a shadow tour resumes after a move by hand");
+    action->add_option("seconds", seconds_, "until it resumes; 0: never")
         ->required()
         ->type_name("")
         ->check(CLI::Range(0, kLongestResume));
@@ -84,7 +87,7 @@ struct ShadowWords {
   const char* name;
   const char* description;
   StartShadow start;
-  StopShadow stop;  // null: the action does not end with "stop" behind it
+  StopShadow stop;  // null: the action takes no "stop"
 };
 
 class ShadowAction final : public CameraAction {
@@ -104,8 +107,8 @@ class ShadowAction final : public CameraAction {
 
   std::optional<Problem> check() override {
     if (stops()) return std::nullopt;
-    const auto [end, error] = std::from_chars(word_.data(), word_.data() + word_.size(), number_);
-    if (error == std::errc() && end == word_.data() + word_.size() && number_ >= 1) return std::nullopt;
+    number_ = number_text(word_).value_or(0);
+    if (number_ >= 1) return std::nullopt;
     return usage("shadow tours are counted from 1", "vexactl shadow CAMERA show shows them.");
   }
 
@@ -130,7 +133,7 @@ class ShadowAction final : public CameraAction {
 
 class StopShadowAction final : public CameraAction {
  public:
-  CLI::App* declare(CLI::App& group) override { return group.add_subcommand("stop", "End the shadow tour under way"); }
+  CLI::App* declare(CLI::App& group) override { return group.add_subcommand("stop", "End the running shadow tour"); }
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
     return report_change(camera, terminal, kShadowTours, camera.device().StopShadowTour());
   }

@@ -1,17 +1,19 @@
 // vexactl snapshot: one picture of live video into a file.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
-#include "host/camera_options.h"
+#include "host/base/json_text.h"
+#include "host/base/printable.h"
+#include "host/camera/camera_options.h"
+#include "host/camera/live_pictures.h"
+#include "host/camera/video_options.h"
 #include "host/commands/command.h"
-#include "host/frame_file.h"
-#include "host/live_pictures.h"
-#include "host/picture_decoder.h"
-#include "host/picture_file.h"
-#include "host/printable.h"
-#include "host/result_output.h"
-#include "host/video_options.h"
+#include "host/console/result_output.h"
+#include "host/picture/picture_decoder.h"
+#include "host/picture/picture_file.h"
+#include "host/recording/frame_file.h"
 
 namespace vexa::host {
 namespace {
@@ -19,9 +21,8 @@ namespace {
 class SnapshotCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
-    CLI::App* command = program.add_subcommand("snapshot", "Keep one picture of live video");
-    read_environment(camera_.credentials, environment);
-    add_camera_options(*command, camera_);
+    CLI::App* command = program.add_subcommand("snapshot", "Save one picture of live video");
+    add_camera_options(*command, camera_, environment);
     command->add_option("--out", out_, "file to write: .jpg, .jpeg or .png")->required()->type_name("FILE");
     add_video_options(*command, video_);
     command->footer(
@@ -37,36 +38,35 @@ class SnapshotCommand final : public Command {
     if (const auto problem = FrameFile(out_).check()) return terminal.report(*problem);
     camera_.transport = transport_of(video_);
     Result<OpenCamera> opened = open_camera(camera_, terminal);
-    if (const auto* problem = std::get_if<Problem>(&opened)) return terminal.report(*problem);
-    return take(std::get<OpenCamera>(opened), *format, terminal);
+    if (!opened) return terminal.report(opened.error());
+    return take(*opened, *format, terminal);
   }
 
  private:
   ExitCode take(OpenCamera& camera, PictureFormat format, Terminal& terminal) {
     terminal.progress("connecting");
-    const Result<LiveCamera::Identity> identified = camera.driver->identify(video_.stream);
-    if (const auto* problem = std::get_if<Problem>(&identified)) return terminal.report(*problem);
-    const auto& identity = std::get<LiveCamera::Identity>(identified);
-    const std::string& codec = identity.video.codecName;
-    const bool possible = has_ffmpeg() || (format == PictureFormat::kJpeg && makes_jpeg_of(codec));
+    const Result<LiveCamera::Identity> identity = camera.driver->identify(video_.stream);
+    if (!identity) return terminal.report(identity.error());
+    const std::string& codec = identity->video.codecName;
+    const bool jpeg_as_sent = format == PictureFormat::kJpeg && codec_named(codec) == Codec::kJpeg;
+    const bool possible = has_ffmpeg() || jpeg_as_sent;
     if (!possible) return terminal.report(without_ffmpeg(fmt::format("a picture of {} video", printable(codec))));
     terminal.progress("waiting for a key picture");
-    const Result<FrameBytes> picture = newest_picture(*camera.driver, format);
-    if (const auto* problem = std::get_if<Problem>(&picture)) return terminal.report(*problem);
-    const auto& bytes = std::get<FrameBytes>(picture);
-    if (const auto problem = write_whole_file(out_, bytes)) return terminal.report(*problem);
-    return summarise(camera, identity, bytes.size(), terminal);
+    const Result<FrameBytes> bytes = newest_picture(*camera.driver, format);
+    if (!bytes) return terminal.report(bytes.error());
+    if (const auto problem = write_whole_file(out_, *bytes)) return terminal.report(*problem);
+    return summarise(camera, *identity, bytes->size(), terminal);
   }
 
   // As the bytes of a file.
   static Result<FrameBytes> newest_picture(LiveCamera& camera, PictureFormat format) {
     LivePictures pictures(camera);
-    if (auto problem = await_key_frame(camera, pictures)) return *problem;
-    const FrameRun run = pictures.newest();
-    if (format == PictureFormat::kJpeg) return jpeg_of(run.codec, run.frames);
-    const Result<Picture> decoded = decode_picture(run.codec, run.frames);
-    if (const auto* problem = std::get_if<Problem>(&decoded)) return *problem;
-    return encode_picture(std::get<Picture>(decoded), format);
+    if (auto problem = await_key_frame(camera, pictures)) return fail(*std::move(problem));
+    const PictureGroup group = pictures.newest();
+    if (format == PictureFormat::kJpeg) return jpeg_of(group.codec, group.frames);
+    const Result<Picture> decoded = decode_picture(group.codec, group.frames);
+    if (!decoded) return fail(decoded.error());
+    return encode_picture(*decoded, format);
   }
 
   ExitCode summarise(const OpenCamera& camera, const LiveCamera::Identity& identity, std::size_t size,

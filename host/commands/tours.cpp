@@ -1,13 +1,16 @@
 // vexactl tour: a camera's tours, each a row of presets that it visits in turn.
 #include <fmt/format.h>
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
-#include <charconv>
 #include <nlohmann/json.hpp>
 
+#include "host/base/json_text.h"
+#include "host/base/number_text.h"
 #include "host/commands/action_group.h"
-#include "host/result_output.h"
-#include "host/tour_words.h"
+#include "host/console/result_output.h"
+#include "host/words/setting_words.h"
+#include "host/words/tour_words.h"
 
 namespace vexa::host {
 namespace {
@@ -37,9 +40,9 @@ class ShowToursAction final : public CameraAction {
 
  private:
   static std::string table_of(const SLibDCameraTourInfo& info) {
-    std::string text = fmt::format("Tours are {}; {}\n", info.enabled ? "on" : "off", resume_text(info.resumeTime));
+    std::string text = fmt::format("Tours are {}; {}\n", switch_word(info.enabled), resume_text(info.resumeTime));
     for (const auto& [number, tour] : info.tours) {
-      text += fmt::format("{}  {:<3}  {:>4} s each  speed {:>3}  presets {}\n", number, tour.enabled ? "on" : "off",
+      text += fmt::format("{}  {:<3}  {:>4} s each  speed {:>3}  presets {}\n", number, switch_word(tour.enabled),
                           tour.stayTime, tour.speed, tour.sequence.empty() ? "-" : presets_text(tour.sequence));
     }
     return text;
@@ -97,28 +100,26 @@ std::optional<Problem> check_tour_number(int number) {
 // "1,2,3"; none for anything else.
 std::optional<std::vector<int>> presets_in(const std::string& text) {
   std::vector<int> presets;
-  const char* const end = text.data() + text.size();
-  for (const char* place = text.data();; ++place) {
-    int number = 0;
-    const auto [stop, error] = std::from_chars(place, end, number);
-    if (error != std::errc() || number < 1 || (stop != end && *stop != ',')) return std::nullopt;
-    presets.push_back(number);
-    if (stop == end) return presets;
-    place = stop;
+  for (std::string_view rest = text;; rest.remove_prefix(1)) {
+    const std::optional<int> number = take_number<int>(rest);
+    if (!number || *number < 1) return std::nullopt;
+    presets.push_back(*number);
+    if (rest.empty()) return presets;
+    if (rest.front() != ',') return std::nullopt;
   }
 }
 
 class SetTourAction final : public ChangeToursAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("set", "Say which presets a tour visits");
+    CLI::App* action = group.add_subcommand("set", "Set which presets a tour visits");
     action->add_option("number", number_, "of the tour, counted from 1")->required()->type_name("");
     action->add_option("presets", text_, "numbers of the presets in turn, such as 1,2,3")->required()->type_name("");
     action->add_option("--stay", stay_, "seconds at each preset")->check(CLI::Range(1, kLongestStay));
     action->add_option("--speed", speed_, "of the turns, in the camera's units")->check(CLI::PositiveNumber);
-    action->add_option("--resume", resume_, "seconds after a move by hand until tours go on; 0: they do not")
+    action->add_option("--resume", resume_, "seconds after a move by hand until tours resume; 0: never")
         ->check(CLI::Range(0, kLongestResume));
-    action->footer("What is left out stays as it is. Tours that have no presets yet get the same, and stay off.");
+    action->footer("Settings left out stay as they are. Tours without presets get the same presets, and stay off.");
     return action;
   }
 
@@ -143,7 +144,7 @@ class SetTourAction final : public ChangeToursAction {
     }
     const int fastest = std::min(limits.panTilt.panMaxSpeed, limits.panTilt.tiltMaxSpeed);
     if (speed_ && *speed_ > fastest) {
-      return usage("the camera does not turn so fast", fmt::format("Its speeds are 1 to {}.", fastest));
+      return usage("the camera does not turn that fast", fmt::format("Its speeds are 1 to {}.", fastest));
     }
     tour->second.sequence = presets_;
     if (stay_) tour->second.stayTime = *stay_;
@@ -164,7 +165,7 @@ class SetTourAction final : public ChangeToursAction {
 class StartTourAction final : public ChangeToursAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("start", "Let the camera go on a tour, and stop another");
+    CLI::App* action = group.add_subcommand("start", "Start a tour, and stop any other");
     action->add_option("number", number_, "of the tour, counted from 1")->required()->type_name("");
     return action;
   }
@@ -189,7 +190,7 @@ class StartTourAction final : public ChangeToursAction {
 
 class StopTourAction final : public ChangeToursAction {
  public:
-  CLI::App* declare(CLI::App& group) override { return group.add_subcommand("stop", "End the tour under way"); }
+  CLI::App* declare(CLI::App& group) override { return group.add_subcommand("stop", "End the running tour"); }
 
  private:
   std::optional<Problem> change(const ModelCamera&, SLibDCameraTourInfo& info) override {
@@ -200,7 +201,7 @@ class StopTourAction final : public ChangeToursAction {
       if (presets.empty()) presets = tour.sequence;
     }
     if (complete(info, presets)) return std::nullopt;
-    return usage("no tour has presets, so none is under way", "vexactl tour CAMERA set gives a tour its presets.");
+    return usage("no tour has presets, so none is running", "vexactl tour CAMERA set gives a tour its presets.");
   }
 };
 

@@ -3,8 +3,10 @@
 
 #include <fstream>
 #include <iostream>
+#include <string>
 
-struct Recording : CDataSink {  // the host's receiver of frames
+// Receives each frame while GetCurrentVideoFrame runs.
+struct Recording : CDataSink {
   void Write(const unsigned char* data, unsigned int length) override {
     file.write(reinterpret_cast<const char*>(data), length);
     ++frames;
@@ -13,26 +15,61 @@ struct Recording : CDataSink {  // the host's receiver of frames
   int frames = 0;
 };
 
+int failed(const char* what, const std::string& why) {
+  std::cerr << what << ": " << why << "\n";
+  return 1;
+}
+
+// Why the camera's latest operation failed.
+std::string reason(CLibraryDevice& camera, ELibDReturnCode code) {
+  std::string text;
+  camera.GetLatestErrorText(text);
+  return text + " (code " + std::to_string(code) + ")";
+}
+
+// Takes frames until there are enough; the stream is open.
+ELibDReturnCode record(CLibraryDevice& camera, Recording& recording, int frames) {
+  SLibDVideoFrameInfo frame;
+  frame.sink = &recording;
+  while (recording.frames < frames && recording.file) {
+    const ELibDReturnCode result = camera.GetCurrentVideoFrame(frame);
+    if (result == LIBD_NO_FRAME) poll(nullptr, 0, 3);  // milliseconds; none waits yet
+    // LIBD_TIMEOUT: the camera has been silent for longer than the connection's time-out.
+    if (result != LIBD_OK && result != LIBD_NO_FRAME) return result;
+  }
+  return LIBD_OK;
+}
+
 int main(int argc, char** argv) {
-  const char* address = argc > 1 ? argv[1] : "127.0.0.2";
-  SLibDConnectionInfo connection{1 /* RTSP */, address, 80, false, false, "", 0, 5000 /* ms */, "admin", "admin"};
-  SLibDCameraInfo video;
-  Recording recording;
-  SLibDVideoFrameInfo frame{&recording};
+  SLibDConnectionInfo connection;
+  connection.host = argc > 1 ? argv[1] : "127.0.0.2";
+  connection.port = 80;            // HTTP
+  connection.streamTransport = 1;  // video by RTSP
+  connection.timeout = 5000;       // milliseconds
+  connection.userName = "admin";
+  connection.password = "admin";
+
   vexa::Profile profile;
   vexa::ProfileError error;
-  if (!vexa::LoadProfile("VX-2000", profile, error)) {
-    std::cerr << error.Message() << "\n";
-    return 3;
-  }
+  if (!vexa::LoadProfile("VX-2000", profile, error)) return failed("no profile", error.Message());
   const auto camera = vexa::MakeDevice(profile);  // the driver of this model: it knows what the camera can do
+  if (!camera) return failed("no driver", "out of memory");
   camera->SetCurrentConnectionInfo(connection);
-  if (camera->GetCameraInfo(video) != LIBD_OK) return 1;
+
+  SLibDCameraInfo video;
+  ELibDReturnCode result = camera->GetCameraInfo(video);
+  if (result != LIBD_OK) return failed("cannot read the video settings", reason(*camera, result));
   video.bitRate = 4000;  // kbit/s
-  if (camera->SetCameraInfo(video) != LIBD_OK || camera->StartVideoStreaming() != LIBD_OK) return 1;
-  while (recording.frames < 250) {
-    if (camera->GetCurrentVideoFrame(frame) == LIBD_TIMEOUT) return 2;  // the camera has fallen silent
-    poll(nullptr, 0, 3);                                                // milliseconds
-  }
-  return camera->StopVideoStreaming() == LIBD_OK ? 0 : 1;
+  result = camera->SetCameraInfo(video);
+  if (result != LIBD_OK) return failed("cannot set the bit rate", reason(*camera, result));
+
+  Recording recording;
+  result = camera->StartVideoStreaming();
+  if (result != LIBD_OK) return failed("cannot open the video", reason(*camera, result));
+  result = record(*camera, recording, 250);
+  const std::string why = reason(*camera, result);
+  camera->StopVideoStreaming();
+  if (result != LIBD_OK) return failed("the video has ended early", why);
+  if (!recording.file.flush()) return failed("cannot write", "live.h264");
+  return 0;
 }

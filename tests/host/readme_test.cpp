@@ -25,5 +25,45 @@ TEST_F(FirstHost, RecordsLiveVideo) {
   EXPECT_TRUE(contents_of(folder() / "live.h264") == pictures(250));
 }
 
+TEST_F(FirstHost, SaysWhyItEndsEarly) {
+  const struct {
+    const char* what;
+    vexa::camera::RequestFault fault;
+    const char* message;
+  } cases[] = {
+      {"no settings", vexa::camera::RequestFault::status("inq=camera", "503 Service Unavailable"),
+       "cannot read the video settings: Service Unavailable (code 0)\n"},
+      {"refused", vexa::camera::RequestFault::status("SETUP", "453 Not Enough Bandwidth"),
+       "cannot open the video: Not Enough Bandwidth (code -103)\n"},
+  };
+  for (const auto& row : cases) {
+    SCOPED_TRACE(row.what);
+    vexa::camera::CameraOptions options;
+    options.address = own_address(3);
+    options.http_port = 80;
+    options.clip_path = VEXA_CLIPS "/small.h264";
+    options.request_faults = {row.fault};
+    vexa::camera::VirtualCamera camera(options);
+    ASSERT_TRUE(camera.start()) << camera.error();
+    const ProgramResult result = ProgramRun(folder(), {VEXA_BINARY_DIR "/bin/first-host", own_address(3)}).wait();
+    EXPECT_EQ(result.exit_code, 1);
+    EXPECT_EQ(result.err, row.message);
+  }
+}
+
+TEST_F(FirstHost, EndsWhenTheCameraFallsSilent) {
+  vexa::camera::CameraOptions options;
+  options.address = own_address(3);
+  options.http_port = 80;
+  options.clip_path = VEXA_CLIPS "/small.h264";
+  options.packet_faults.loss = 1;
+  options.packet_faults.first_picture = 10;
+  vexa::camera::VirtualCamera camera(options);
+  ASSERT_TRUE(camera.start()) << camera.error();
+  const ProgramResult result = ProgramRun(folder(), {VEXA_BINARY_DIR "/bin/first-host", own_address(3)}).wait();
+  EXPECT_EQ(result.exit_code, 1);
+  EXPECT_THAT(result.err, testing::MatchesRegex("the video has ended early: .*\\(code -200\\)\n"));
+}
+
 }  // namespace
 }  // namespace vexa_test

@@ -3,7 +3,7 @@
 #include <cstdlib>
 #include <filesystem>
 
-#include "host/picture_file.h"
+#include "host/picture/picture_file.h"
 #include "tests/host/camera_fixture.h"
 
 namespace vexa_test {
@@ -77,9 +77,8 @@ TEST_F(PicturesByCommand, AnAlarmOfAJpegCameraKeepsItsPictureAsItCame) {
 
 Picture decoded(const std::string& file) {
   const std::string bytes = contents_of(file);
-  const auto result = vexa::host::decode_picture("JPEG", {FrameBytes(bytes.begin(), bytes.end())});
-  const auto* picture = std::get_if<Picture>(&result);
-  return picture != nullptr ? *picture : Picture();
+  const auto result = vexa::host::decode_picture(vexa::host::Codec::kJpeg, {FrameBytes(bytes.begin(), bytes.end())});
+  return result.value_or(Picture());
 }
 
 // How far a pixel is from a colour.

@@ -35,33 +35,33 @@ class PtzByCommand : public WithCamera {
   }
 };
 
-struct PtzOrder {
+struct Order {
   std::vector<std::string> arguments;
   std::string order;
 };
 
 TEST_F(PtzByCommand, EachMoveIsOneRequestOfSignedSpeeds) {
   start_model("LMX-P200");
-  for (const PtzOrder& one : {PtzOrder{{"pan", "left"}, "ptzf.cgi?ContinuousPanTiltZoom=-50,0,"},
-                              {{"pan", "right", "--speed", "1"}, "ptzf.cgi?ContinuousPanTiltZoom=1,0,"},
-                              {{"tilt", "up", "--speed", "100"}, "ptzf.cgi?ContinuousPanTiltZoom=0,100,"},
-                              {{"tilt", "down"}, "ptzf.cgi?ContinuousPanTiltZoom=0,-50,"},
-                              {{"zoom", "tele"}, "ptzf.cgi?ContinuousPanTiltZoom=,,50"},
-                              {{"zoom", "wide", "--speed", "7"}, "ptzf.cgi?ContinuousPanTiltZoom=,,-7"},
-                              {{"zoom", "tele", "--step", "50"}, "ptzf.cgi?RelativeZoom=0800"},
-                              {{"zoom", "wide", "--step", "100"}, "ptzf.cgi?RelativeZoom=FFFFF000"},
-                              {{"zoom", "1"}, "ptzf.cgi?AbsoluteZoom=0000"},
-                              {{"zoom", "30x"}, "ptzf.cgi?AbsoluteZoom=7AC0"},
-                              {{"focus", "auto"}, "camera.cgi?FocusMode=auto"},
-                              {{"focus", "manual"}, "camera.cgi?FocusMode=manual"},
-                              {{"focus", "near", "--speed", "100"}, "ptzf.cgi?Move=near,8"},
-                              {{"focus", "far", "--speed", "1"}, "ptzf.cgi?Move=far,1"},
-                              {{"focus", "0"}, "ptzf.cgi?AbsoluteFocus=1000"},
-                              {{"focus", "100"}, "ptzf.cgi?AbsoluteFocus=F000"},
-                              {{"goto", "-45", "90"}, "ptzf.cgi?AbsolutePanTilt=FFFFE3E0,3840,24"},
-                              {{"goto", "0", "0", "--scale"}, "ptzf.cgi?AbsolutePanTilt=FFFF8F80,FFFFF6A0,24"},
-                              {{"area", "100", "100"}, "ptzf.cgi?AreaZoom=959,539,0,0,image1"},
-                              {{"area", "50", "0", "25.5", "10"}, "ptzf.cgi?AreaZoom=0,-540,489,108,image1"}}) {
+  for (const Order& one : {Order{{"pan", "left"}, "ptzf.cgi?ContinuousPanTiltZoom=-50,0,"},
+                           {{"pan", "right", "--speed", "1"}, "ptzf.cgi?ContinuousPanTiltZoom=1,0,"},
+                           {{"tilt", "up", "--speed", "100"}, "ptzf.cgi?ContinuousPanTiltZoom=0,100,"},
+                           {{"tilt", "down"}, "ptzf.cgi?ContinuousPanTiltZoom=0,-50,"},
+                           {{"zoom", "tele"}, "ptzf.cgi?ContinuousPanTiltZoom=,,50"},
+                           {{"zoom", "wide", "--speed", "7"}, "ptzf.cgi?ContinuousPanTiltZoom=,,-7"},
+                           {{"zoom", "tele", "--step", "50"}, "ptzf.cgi?RelativeZoom=0800"},
+                           {{"zoom", "wide", "--step", "100"}, "ptzf.cgi?RelativeZoom=FFFFF000"},
+                           {{"zoom", "1"}, "ptzf.cgi?AbsoluteZoom=0000"},
+                           {{"zoom", "30x"}, "ptzf.cgi?AbsoluteZoom=7AC0"},
+                           {{"focus", "auto"}, "camera.cgi?FocusMode=auto"},
+                           {{"focus", "manual"}, "camera.cgi?FocusMode=manual"},
+                           {{"focus", "near", "--speed", "100"}, "ptzf.cgi?Move=near,8"},
+                           {{"focus", "far", "--speed", "1"}, "ptzf.cgi?Move=far,1"},
+                           {{"focus", "0"}, "ptzf.cgi?AbsoluteFocus=1000"},
+                           {{"focus", "100"}, "ptzf.cgi?AbsoluteFocus=F000"},
+                           {{"goto", "-45", "90"}, "ptzf.cgi?AbsolutePanTilt=FFFFE3E0,3840,24"},
+                           {{"goto", "0", "0", "--scale"}, "ptzf.cgi?AbsolutePanTilt=FFFF8F80,FFFFF6A0,24"},
+                           {{"area", "100", "100"}, "ptzf.cgi?AreaZoom=959,539,0,0,image1"},
+                           {{"area", "50", "0", "25.5", "10"}, "ptzf.cgi?AreaZoom=0,-540,489,108,image1"}}) {
     SCOPED_TRACE(testing::PrintToString(one.arguments));
     const std::size_t before = orders().size();
     const ProgramResult result = act("ptz", one.arguments);
@@ -117,8 +117,9 @@ TEST_F(PtzByCommand, WhatTheModelCannotDoIsRefused) {
   start_model("LMX-C100");
   EXPECT_EQ(act("ptz", {"focus", "auto"}).err,
             "vexactl: cameras of model LMX-C100 have no focus motor\n"
-            "  vexactl profile show tells what a model has.\n");
-  EXPECT_EQ(act("ptz", {"zoom", "19"}).err, "vexactl: the lens does not zoom so far\n  It magnifies 1 to 18 times.\n");
+            "  vexactl profile show lists what a model has.\n");
+  EXPECT_EQ(act("ptz", {"zoom", "19"}).err,
+            "vexactl: the zoom is out of the lens's range\n  It magnifies 1 to 18 times.\n");
   EXPECT_EQ(act("ptz", {"goto", "0", "0", "--zoom", "19"}).exit_code, 1);
   EXPECT_EQ(act("ptz", {"goto", "181", "0"}).exit_code, 1);
   EXPECT_EQ(act("ptz", {"goto", "0", "-91"}).exit_code, 1);
@@ -128,7 +129,7 @@ TEST_F(PtzByCommand, WhatTheModelCannotDoIsRefused) {
   EXPECT_EQ(act("tour", {"set", "1", "1,2", "--speed", "19"}).exit_code, 1);
   EXPECT_EQ(act("shadow", {"show"}).err,
             "vexactl: cameras of model LMX-C100 have no shadow tours\n"
-            "  vexactl profile show tells what a model has.\n");
+            "  vexactl profile show lists what a model has.\n");
   EXPECT_EQ(orders(), std::vector<std::string>());
 }
 
@@ -236,7 +237,7 @@ TEST_F(PtzByCommand, ATourIsSetStartedAndStopped) {
   EXPECT_EQ(act("tour", {"start", "1"}).err,
             "vexactl: tour 1 has no presets\n  Give it some: vexactl tour CAMERA set 1 1,2,3.\n");
   EXPECT_EQ(act("tour", {"stop"}).err,
-            "vexactl: no tour has presets, so none is under way\n"
+            "vexactl: no tour has presets, so none is running\n"
             "  vexactl tour CAMERA set gives a tour its presets.\n");
   EXPECT_EQ(orders(), std::vector<std::string>());
   EXPECT_EQ(act("tour", {"set", "1", "1,16,3", "--stay", "15", "--speed", "18", "--resume", "30"}).exit_code, 0);
@@ -267,12 +268,12 @@ TEST_F(PtzByCommand, ToursWithoutPresetsGetThoseOfTheOneSet) {
 
 TEST_F(PtzByCommand, ShadowToursAreRecordedPreviewedAndPlayed) {
   start_model("LMX-P200");
-  for (const PtzOrder& one : {PtzOrder{{"record", "2"}, "STourRecord=B"},
-                              {{"record", "stop"}, "STourRecord=stop"},
-                              {{"preview", "2"}, "STourPreview=B"},
-                              {{"preview", "stop"}, "STourPreview=stop"},
-                              {{"start", "1"}, "STour=on&STourA=on&STourB=off&STourC=off&STourD=off&STourE=off"},
-                              {{"stop"}, "STour=off&STourA=off&STourB=off&STourC=off&STourD=off"}}) {
+  for (const Order& one : {Order{{"record", "2"}, "STourRecord=B"},
+                           {{"record", "stop"}, "STourRecord=stop"},
+                           {{"preview", "2"}, "STourPreview=B"},
+                           {{"preview", "stop"}, "STourPreview=stop"},
+                           {{"start", "1"}, "STour=on&STourA=on&STourB=off&STourC=off&STourD=off&STourE=off"},
+                           {{"stop"}, "STour=off&STourA=off&STourB=off&STourC=off&STourD=off"}}) {
     const ProgramResult result = act("shadow", one.arguments);
     EXPECT_EQ(result.exit_code, 0) << result.err;
     EXPECT_EQ(last_order(), "presetposition.cgi?" + one.order);

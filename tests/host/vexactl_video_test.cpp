@@ -132,8 +132,8 @@ TEST_F(VideoCommands, SoundOfOtherCodecsIsKeptRawOnly) {
   result = run({"listen", place(), "--out", "live.wav"});
   EXPECT_EQ(result.exit_code, 1);
   EXPECT_EQ(result.err,
-            "vexactl: the camera's sound is G726, which a .wav here does not hold\n"
-            "  Give --out another ending for the sound as it comes, or switch to --codec g711_64.\n");
+            "vexactl: the camera's sound is G726, which vexactl does not write to .wav\n"
+            "  Give --out another extension for the sound as received, or switch to --codec g711_64.\n");
 }
 
 TEST_F(VideoCommands, SoundThatIsOffEndsWithFour) {
@@ -157,6 +157,19 @@ TEST_F(VideoCommands, SoundThatStopsEndsWithFour) {
             "vexactl: the camera has stopped sending sound\n"
             "  Check its network and that its audio input is on.\n");
   EXPECT_TRUE(contents_of(folder() / "live.g711") == contents_of(VEXA_CLIPS "/tone.g711_64"));
+}
+
+TEST_F(VideoCommands, SoundThatBreaksOffSaysWhyAndKeepsWhatCame) {
+  start(kVideoCodecs[0]);
+  ProgramRun listen(folder(), vexactl({"listen", place(), "--codec", "g711_64", "--out", "live.g711"}), kCredentials);
+  ASSERT_TRUE(eventually([&] { return size_of("live.g711") > 0; }));
+  camera().unplug();
+  const ProgramResult result = listen.wait();
+  EXPECT_EQ(result.exit_code, 4);
+  EXPECT_EQ(result.err, "vexactl: the sound has broken off: the camera " + place() +
+                            " cannot be used: Connection reset by peer\n"
+                            "  Check that address and HTTP port are the camera's.\n");
+  EXPECT_GT(size_of("live.g711"), 0U);
 }
 
 #ifdef VEXA_WITH_FFMPEG
@@ -208,7 +221,7 @@ TEST_F(VideoCommands, WhatNeedsFfmpegsLibrariesIsRefusedBeforeAnythingIsAsked) {
   EXPECT_EQ(result.exit_code, 1);
   EXPECT_EQ(result.err,
             "vexactl: this vexactl was built without FFmpeg's libraries; a picture of H.264 video needs them\n"
-            "  Use one that was built with them, or record the video and let ffmpeg do it.\n");
+            "  Use a build that has them, or record the video and decode it with ffmpeg.\n");
   EXPECT_EQ(camera().journal().count("PLAY"), 0U);
 }
 

@@ -1,0 +1,36 @@
+// A descriptor that closes itself.
+#ifndef HOST_BASE_UNIQUE_FD_H_
+#define HOST_BASE_UNIQUE_FD_H_
+
+#include <unistd.h>
+
+#include <utility>
+
+namespace vexa::host {
+
+class UniqueFd {
+ public:
+  UniqueFd() = default;
+  explicit UniqueFd(int fd) : fd_(fd) {}
+  UniqueFd(UniqueFd&& other) noexcept : fd_(std::exchange(other.fd_, -1)) {}
+  UniqueFd& operator=(UniqueFd&& other) noexcept {
+    std::swap(fd_, other.fd_);
+    return *this;
+  }
+  UniqueFd(const UniqueFd&) = delete;
+  UniqueFd& operator=(const UniqueFd&) = delete;
+  ~UniqueFd() { reset(); }
+
+  [[nodiscard]] int get() const { return fd_; }
+  [[nodiscard]] bool valid() const { return fd_ >= 0; }
+
+  // Closes now. False when the system had kept a write error until the end.
+  bool reset() { return fd_ < 0 || close(std::exchange(fd_, -1)) == 0; }
+
+ private:
+  int fd_ = -1;
+};
+
+}  // namespace vexa::host
+
+#endif  // HOST_BASE_UNIQUE_FD_H_

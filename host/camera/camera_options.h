@@ -1,0 +1,57 @@
+// The options that every command takes which speaks to a camera.
+#ifndef HOST_CAMERA_CAMERA_OPTIONS_H_
+#define HOST_CAMERA_CAMERA_OPTIONS_H_
+
+#include <memory>
+#include <optional>
+#include <string>
+
+#include "host/access/credentials.h"
+#include "host/access/driver_trace.h"
+#include "host/camera/live_camera.h"
+#include "host/console/terminal.h"
+
+namespace CLI {
+class App;
+}
+
+namespace vexa::host {
+
+struct CameraOptions {
+  std::string address;
+  CredentialSources credentials;
+  int timeout_ms = 5000;
+  std::optional<std::string> cgi_log = {};
+  VideoTransport transport = VideoTransport::kUdp;
+  bool trace = false;
+  bool json = false;
+};
+
+// Adds the options. User name and password of the process `environment` are taken where no option gives them.
+void add_camera_options(CLI::App& command, CameraOptions& options, const char* const* environment);
+
+// --stream, and what it may be: cameras number their streams from 1, the driver knows 16.
+void add_stream_option(CLI::App& command, int& stream);
+[[nodiscard]] std::optional<Problem> check_stream(int stream);
+
+struct ModelOptions {
+  CameraOptions camera;
+  std::optional<std::string> profile = {};  // --profile; else the installed one of the model that the camera names
+  int stream = 1;
+};
+
+// The options of every command that speaks to a camera, and those that name its profile and video stream.
+void add_model_options(CLI::App& command, ModelOptions& options, const char* const* environment);
+
+// A driver that knows its camera; no camera has been contacted yet.
+struct OpenCamera {
+  CameraAddress address;
+  std::unique_ptr<DriverTrace> trace;  // outlives the driver, which traces to its end
+  std::unique_ptr<LiveCamera> driver;
+};
+
+[[nodiscard]] Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal);
+
+}  // namespace vexa::host
+
+#endif  // HOST_CAMERA_CAMERA_OPTIONS_H_

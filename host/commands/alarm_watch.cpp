@@ -1,0 +1,97 @@
+#include "host/commands/alarm_watch.h"
+
+#include <chrono>
+#include <thread>
+#include <vector>
+
+#include "host/console/interrupt.h"
+#include "host/words/utc_time.h"
+
+namespace vexa::host {
+
+void follow_detection(const ModelCamera& camera) {
+  camera.device().SetVMDtype(camera.profile().lodDetection ? LIBD_VMD_VMF : LIBD_VMD_WINDOW);
+}
+
+ExitCode AlarmWatch::run() {
+  follow_detection(camera_);
+  const ELibDReturnCode started = camera_.device().StartIoStreaming();
+  if (started != LIBD_OK) return terminal_.report(camera_.explain(started));
+  if (options_.metadata) {
+    follow_both();
+  } else {
+    end(follow_alarms());
+  }
+  camera_.device().StopIoStreaming();
+  if (failure_) return terminal_.report(*failure_);
+  return Interrupt::requested() ? ExitCode::kInterrupted : ExitCode::kOk;
+}
+
+void AlarmWatch::follow_both() {
+  const ELibDReturnCode started = camera_.device().StartModRawData();
+  if (started != LIBD_OK) {
+    end(camera_.explain(started));
+    return;
+  }
+  std::thread metadata([this] { end(follow_metadata()); });
+  end(follow_alarms());
+  metadata.join();
+  camera_.device().StopModRawData();
+}
+
+bool AlarmWatch::goes_on() const { return !over_ && !Interrupt::requested(); }
+
+void AlarmWatch::end(const std::optional<Problem>& problem) {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  over_ = true;
+  if (problem && !failure_) failure_ = problem;
+}
+
+std::optional<Problem> AlarmWatch::show(const std::string& line) {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  if (over_) return std::nullopt;
+  if (terminal_.write_result(line) != 0) {
+    return Problem{ExitCode::kCannotWrite, "an alarm cannot be written", "Is standard output still open?"};
+  }
+  if (++shown_ == options_.lines) over_ = true;
+  return std::nullopt;
+}
+
+std::optional<Problem> AlarmWatch::follow_alarms() {
+  PinStates states;
+  while (goes_on()) {
+    std::vector<SLibDPinInfo> pins;
+    const ELibDReturnCode result = camera_.device().GetCurrentIoStatus(pins);
+    if (result == LIBD_NO_FRAME) continue;
+    if (result != LIBD_OK) return camera_.explain(result);
+    const std::string moment = utc_text(std::chrono::system_clock::now());
+    for (const SLibDPinInfo& pin : states.changed(pins)) {
+      if (auto problem = show(alarm_line(pin, moment, options_.format))) return problem;
+      if (auto problem = take_snapshot(pin, moment)) return problem;
+    }
+  }
+  return std::nullopt;
+}
+
+std::optional<Problem> AlarmWatch::follow_metadata() {
+  SLibDRawMDFrameInfo frame;
+  while (goes_on()) {
+    const ELibDReturnCode result = camera_.device().GetCurrentPosition(frame);
+    if (result == LIBD_NO_FRAME) continue;
+    if (result != LIBD_OK) return camera_.explain(result);
+    const std::string moment = utc_text(std::chrono::system_clock::now());
+    if (auto problem = show(metadata_line(frame, moment, options_.format))) return problem;
+  }
+  return std::nullopt;
+}
+
+// An alarm without a picture is better than none: only a folder that takes no file ends the watch.
+std::optional<Problem> AlarmWatch::take_snapshot(const SLibDPinInfo& pin, const std::string& moment) {
+  if (snapshots_ == nullptr || pin.state == 0) return std::nullopt;
+  auto problem = snapshots_->take(pin, moment);
+  if (!problem || problem->code == ExitCode::kCannotWrite) return problem;
+  terminal_.say("vexactl: no picture of this alarm: " + problem->text);
+  return std::nullopt;
+}
+
+}  // namespace vexa::host

@@ -1,0 +1,58 @@
+#include "host/console/terminal.h"
+
+#include <fmt/format.h>
+#include <unistd.h>
+
+#include "host/base/write_all.h"
+
+namespace vexa::host {
+namespace {
+
+constexpr std::string_view kEraseLine = "\r\x1b[K";
+
+// A failure of standard error itself cannot be reported.
+void write_error_text(std::string_view text) { (void)write_all(STDERR_FILENO, text.data(), text.size()); }
+
+}  // namespace
+
+Terminal::Terminal(UniqueFd results) : results_(std::move(results)), shows_progress_(isatty(STDERR_FILENO) == 1) {}
+
+Terminal::~Terminal() { clear_progress(); }
+
+int Terminal::write_result(std::string_view text) { return write_all(results_.get(), text.data(), text.size()); }
+
+void Terminal::say(std::string_view line) {
+  const std::lock_guard lock(mutex_);
+  const std::string restored = progress_;
+  erase_progress_locked();
+  write_error_text(fmt::format("{}\n{}", line, restored));
+  progress_ = restored;
+}
+
+ExitCode Terminal::report(const Problem& problem) {
+  clear_progress();
+  say(fmt::format("vexactl: {}", problem.text));
+  if (!problem.advice.empty()) say(fmt::format("  {}", problem.advice));
+  return problem.code;
+}
+
+void Terminal::progress(std::string_view line) {
+  if (!shows_progress_) return;
+  const std::lock_guard lock(mutex_);
+  erase_progress_locked();
+  progress_ = line;
+  write_error_text(progress_);
+}
+
+void Terminal::clear_progress() {
+  const std::lock_guard lock(mutex_);
+  erase_progress_locked();
+}
+
+void Terminal::erase_progress_locked() {
+  if (progress_.empty()) return;
+  write_error_text(kEraseLine);
+  progress_.clear();
+}
+
+}  // namespace vexa::host
