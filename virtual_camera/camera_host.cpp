@@ -6,8 +6,8 @@
 #include <cstdint>
 #include <limits>
 
-#include "virtual_camera/event_loop.h"
-#include "virtual_camera/rtp_packetiser.h"
+#include "virtual_camera/codec/rtp_packetiser.h"
+#include "virtual_camera/server/event_loop.h"
 
 namespace vexa::camera {
 

@@ -2,8 +2,8 @@
 
 #include <utility>
 
-#include "virtual_camera/camera_core.h"
-#include "virtual_camera/event_loop.h"
+#include "virtual_camera/server/camera_core.h"
+#include "virtual_camera/server/event_loop.h"
 
 namespace vexa::camera {
 

@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "virtual_camera/clip.h"
+#include "virtual_camera/codec/clip.h"
 
 namespace vexa::host {
 namespace {

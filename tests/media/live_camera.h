@@ -10,8 +10,8 @@
 #include "tests/media/media_driver.h"
 #include "tests/media/pace.h"
 #include "tests/support/own_address.h"
-#include "virtual_camera/jpeg_picture.h"
-#include "virtual_camera/rtp_packetiser.h"
+#include "virtual_camera/codec/jpeg_picture.h"
+#include "virtual_camera/codec/rtp_packetiser.h"
 #include "virtual_camera/virtual_camera.h"
 
 namespace vexa_test {

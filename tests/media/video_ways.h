@@ -10,7 +10,7 @@
 
 #include "tests/media/live_camera.h"
 #include "tests/media/rtp_feed.h"
-#include "virtual_camera/image_clip.h"
+#include "virtual_camera/codec/image_clip.h"
 
 namespace vexa_test {
 

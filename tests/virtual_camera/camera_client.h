@@ -13,7 +13,7 @@
 #include <string>
 #include <vector>
 
-#include "virtual_camera/options.h"
+#include "virtual_camera/values/options.h"
 
 namespace vexa::camera {
 
