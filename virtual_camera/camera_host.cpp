@@ -3,6 +3,7 @@
 #include <fmt/format.h>
 
 #include <algorithm>
+#include <asio/ip/address_v4.hpp>
 #include <cstdint>
 #include <limits>
 

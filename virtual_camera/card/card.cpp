@@ -14,18 +14,6 @@ using std::chrono::microseconds;
 constexpr std::chrono::microseconds kTenth{100};
 constexpr std::uint64_t kKilobyte = 1024;
 
-const char* codec_word(ImageKind codec) {
-  switch (codec) {
-    case ImageKind::kJpeg:
-      return "jpeg";
-    case ImageKind::kMpeg4:
-      return "mpeg4";
-    case ImageKind::kH264:
-      break;
-  }
-  return "h264";
-}
-
 std::string clock_text(microseconds moment) {
   const auto tenths = moment % std::chrono::seconds(1) / kTenth;
   return fmt::format("{}.{:04}Z", second_text(moment), tenths);
@@ -49,7 +37,7 @@ std::string clock_range(const Recording& recording) {
 
 std::string search_line(const Recording& recording) {
   const RecordingHead& head = recording.head;
-  const bool jpeg = head.codec == ImageKind::kJpeg;
+  const bool jpeg = head.codec == Codec::kJpeg;
   return fmt::format(
       "StreamName={},Start={},End={},ImageCodec={},ImageSize={},FrameRate={},{}={},AudioCodec=none,Size={},Status={}"
       "\r\n",

@@ -18,7 +18,7 @@ namespace vexa::camera {
 
 // What a recording is of.
 struct RecordingHead {
-  ImageKind codec = ImageKind::kH264;
+  Codec codec = Codec::kH264;
   std::string size = "640,480";  // "width,height"
   int frame_rate = 25;
   int bit_rate = 0;  // kbit/s; JPEG has its quality instead

@@ -17,9 +17,7 @@ Answer search(std::string_view query, const Card& card) {
   return lines ? http_answer("200 OK", *lines) : http_answer("503 Service Unavailable", "");
 }
 
-Answer deleted(bool done) {
-  return done ? Answer{204, "HTTP/1.0 204 No Content\r\n\r\n"} : http_answer("400 Bad Request", "");
-}
+Answer deleted(bool done) { return done ? no_content() : http_answer("400 Bad Request", ""); }
 
 }  // namespace
 

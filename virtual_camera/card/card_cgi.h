@@ -5,7 +5,7 @@
 #include <optional>
 
 #include "virtual_camera/card/card.h"
-#include "virtual_camera/model/cgi.h"
+#include "virtual_camera/wire/answer.h"
 #include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {

@@ -6,8 +6,6 @@
 #include <cstdint>
 #include <string>
 
-#include "virtual_camera/source/picture_source.h"
-
 namespace vexa::camera {
 
 struct DrawnVideo {
@@ -48,21 +46,6 @@ struct SquareColour {
 // The square that changes in picture `index`, counted row by row, and what it becomes.
 [[nodiscard]] std::uint32_t changed_square(const SquareGrid& grid, std::uint64_t index);
 [[nodiscard]] SquareColour changed_colour(std::uint64_t index);
-
-// Drawn as they are asked for.
-class DrawnSource : public PictureSource {
- public:
-  DrawnSource(ImageKind codec, const DrawnVideo& video);
-
-  [[nodiscard]] const SourceFormat& format() const override { return format_; }
-  [[nodiscard]] std::optional<SourcePicture> next() override;
-  [[nodiscard]] bool ended() const override { return false; }
-
- private:
-  const DrawnVideo video_;
-  SourceFormat format_;
-  std::uint64_t index_ = 0;
-};
 
 }  // namespace vexa::camera
 

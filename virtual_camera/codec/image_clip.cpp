@@ -36,11 +36,11 @@ std::optional<std::size_t> scan_of(std::string_view bytes, std::size_t begin) {
 
 }  // namespace
 
-ImageClip::ImageClip(ImageKind kind, std::vector<std::string> pictures) : kind_(kind), pictures_(std::move(pictures)) {
+ImageClip::ImageClip(Codec kind, std::vector<std::string> pictures) : kind_(kind), pictures_(std::move(pictures)) {
   for (const std::string& picture : pictures_) keys_.push_back(is_key_picture(kind_, picture));
 }
 
-ImageClip::ImageClip(const Clip& clip) : kind_(ImageKind::kH264), pictures_(clip.delivered()) {
+ImageClip::ImageClip(const Clip& clip) : kind_(Codec::kH264), pictures_(clip.delivered()) {
   for (const AccessUnit& picture : clip.access_units()) keys_.push_back(picture.key);
 }
 
@@ -48,9 +48,9 @@ std::shared_ptr<const ImageClip> ImageClip::load(const std::string& path) {
   const struct {
     std::string_view extension;
     ImageClip (*cut)(std::string_view);
-  } kinds[] = {{".mjpeg", [](std::string_view bytes) { return ImageClip(ImageKind::kJpeg, cut_jpeg(bytes)); }},
+  } kinds[] = {{".mjpeg", [](std::string_view bytes) { return ImageClip(Codec::kJpeg, cut_jpeg(bytes)); }},
                {".h264", [](std::string_view bytes) { return ImageClip(Clip::from_annex_b(bytes)); }},
-               {".m4v", [](std::string_view bytes) { return ImageClip(ImageKind::kMpeg4, cut_mpeg4(bytes)); }}};
+               {".m4v", [](std::string_view bytes) { return ImageClip(Codec::kMpeg4, cut_mpeg4(bytes)); }}};
   for (const auto& row : kinds) {
     if (!path.ends_with(row.extension)) continue;
     std::ifstream file(path, std::ios::binary);
@@ -61,18 +61,18 @@ std::shared_ptr<const ImageClip> ImageClip::load(const std::string& path) {
   return nullptr;
 }
 
-bool is_key_picture(ImageKind kind, std::string_view picture) {
+bool is_key_picture(Codec kind, std::string_view picture) {
   constexpr std::size_t kUnitCode = 3;  // behind 00 00 01
   constexpr unsigned kSequence = 0xb0;
   constexpr unsigned kGroup = 0xb3;
   switch (kind) {
-    case ImageKind::kH264: {
+    case Codec::kH264: {
       const Clip clip = Clip::from_annex_b(picture);
       return !clip.access_units().empty() && clip.access_units().front().key;
     }
-    case ImageKind::kMpeg4:
+    case Codec::kMpeg4:
       return byte_at(picture, kUnitCode) == kSequence || byte_at(picture, kUnitCode) == kGroup;
-    case ImageKind::kJpeg:
+    case Codec::kJpeg:
       break;
   }
   return true;
@@ -118,15 +118,15 @@ std::string sei_unit(std::string_view text) {
   return unit + '\x80';
 }
 
-std::string with_user_data(ImageKind kind, const std::string& picture, std::string_view text) {
+std::string with_user_data(Codec kind, const std::string& picture, std::string_view text) {
   if (text.empty()) return picture;
   std::string changed = picture;
   switch (kind) {
-    case ImageKind::kJpeg:
+    case Codec::kJpeg:
       return changed.insert(kMarkerSize, "\xff\xfe" + two_bytes(text.size() + kMarkerSize).append(text));
-    case ImageKind::kH264:
+    case Codec::kH264:
       return sei_unit(text) + picture;
-    case ImageKind::kMpeg4:
+    case Codec::kMpeg4:
       return changed.insert(picture.find(std::string("\0\0\1\xb6", 4)), std::string("\0\0\1\xb2", 4).append(text));
   }
   return changed;

@@ -7,11 +7,11 @@
 #include <string_view>
 #include <vector>
 
+#include "virtual_camera/values/codec.h"
+
 namespace vexa::camera {
 
 class Clip;
-
-enum class ImageKind { kJpeg, kH264, kMpeg4 };
 
 // A clip cut into pictures. Immutable, shared by any number of cameras.
 class ImageClip {
@@ -20,27 +20,27 @@ class ImageClip {
   // Null when the file cannot be read, is of no such kind, or holds no picture.
   [[nodiscard]] static std::shared_ptr<const ImageClip> load(const std::string& path);
 
-  ImageClip(ImageKind kind, std::vector<std::string> pictures);
+  ImageClip(Codec kind, std::vector<std::string> pictures);
   explicit ImageClip(const Clip& clip);  // H.264
 
-  [[nodiscard]] ImageKind kind() const { return kind_; }
+  [[nodiscard]] Codec kind() const { return kind_; }
   // H.264 pictures have start codes of four bytes throughout.
   [[nodiscard]] const std::vector<std::string>& pictures() const { return pictures_; }
   [[nodiscard]] bool is_key(std::size_t picture) const { return keys_[picture]; }
 
  private:
-  ImageKind kind_;
+  Codec kind_;
   std::vector<std::string> pictures_;
   std::vector<bool> keys_;
 };
 
 // Whether a picture needs none before it: every JPEG picture, of H.264 one with an IDR slice, of MPEG-4 one that a
 // sequence or a group begins with.
-[[nodiscard]] bool is_key_picture(ImageKind kind, std::string_view picture);
+[[nodiscard]] bool is_key_picture(Codec kind, std::string_view picture);
 
 // The picture with a text in its user data, where cameras of the kind have it: a comment of a JPEG picture, an SEI unit
 // in front of an H.264 picture, a user-data unit in front of the coded MPEG-4 picture. Unchanged without a text.
-[[nodiscard]] std::string with_user_data(ImageKind kind, const std::string& picture, std::string_view text);
+[[nodiscard]] std::string with_user_data(Codec kind, const std::string& picture, std::string_view text);
 
 // A SEI unit of unregistered user data (ITU-T H.264, D.1.7) that holds the text, behind a start code of four bytes.
 [[nodiscard]] std::string sei_unit(std::string_view text);

@@ -8,7 +8,7 @@
 namespace vexa::camera {
 namespace {
 
-using JpegBytes = std::span<const std::uint8_t>;
+using Bytes = std::span<const std::uint8_t>;
 
 // Markers of ITU-T T.81, table B.1.
 constexpr std::uint8_t kFrame = 0xC0;
@@ -24,11 +24,11 @@ constexpr std::size_t kAcSymbols = 162;
 constexpr std::size_t kCounts = 16;
 constexpr unsigned kLongestSide = 2040;
 
-unsigned number_at(JpegBytes bytes, std::size_t at) { return static_cast<unsigned>(bytes[at] << 8U | bytes[at + 1]); }
+unsigned number_at(Bytes bytes, std::size_t at) { return static_cast<unsigned>(bytes[at] << 8U | bytes[at + 1]); }
 
 class Reader {
  public:
-  explicit Reader(JpegBytes file) : file_(file) {}
+  explicit Reader(Bytes file) : file_(file) {}
 
   std::optional<JpegPicture> read() {
     std::size_t at = 2;  // behind SOI
@@ -44,7 +44,7 @@ class Reader {
   }
 
  private:
-  bool take(std::uint8_t marker, JpegBytes segment) {
+  bool take(std::uint8_t marker, Bytes segment) {
     switch (marker) {
       case kFrame:
         return take_frame(segment);
@@ -61,7 +61,7 @@ class Reader {
     }
   }
 
-  bool take_frame(JpegBytes segment) {
+  bool take_frame(Bytes segment) {
     static constexpr std::size_t kThreeComponents = 15;
     if (segment.size() != kThreeComponents || segment[0] != 8 || segment[5] != 3) return false;
     picture_.height = number_at(segment, 1);
@@ -72,31 +72,31 @@ class Reader {
     return halved && segment[14] == chrominance_;
   }
 
-  bool take_tables(JpegBytes segment) {
+  bool take_tables(Bytes segment) {
     while (!segment.empty()) {
       if (segment.size() < 1 + kTable || segment[0] > 3) return false;
-      const JpegBytes table = segment.subspan(1, kTable);
+      const Bytes table = segment.subspan(1, kTable);
       tables_[segment[0]].assign(table.begin(), table.end());
       segment = segment.subspan(1 + kTable);
     }
     return true;
   }
 
-  bool take_huffman(JpegBytes segment) {
+  bool take_huffman(Bytes segment) {
     while (segment.size() > kCounts) {
       const std::size_t symbols = (segment[0] & 0xF0U) == 0 ? kDcSymbols : kAcSymbols;
-      const JpegBytes counts = segment.subspan(1, kCounts);
+      const Bytes counts = segment.subspan(1, kCounts);
       if (std::accumulate(counts.begin(), counts.end(), std::size_t{0}) != symbols) return false;
       const std::size_t length = 1 + kCounts + symbols;
       if (segment.size() < length) return false;
-      const JpegBytes table = segment.subspan(1, length - 1);
+      const Bytes table = segment.subspan(1, length - 1);
       picture_.huffman[segment[0]].assign(table.begin(), table.end());
       segment = segment.subspan(length);
     }
     return segment.empty();
   }
 
-  std::optional<JpegPicture> finish(JpegBytes scan) {
+  std::optional<JpegPicture> finish(Bytes scan) {
     const auto fits = [](unsigned side) { return side != 0 && side <= kLongestSide && side % 8 == 0; };
     const bool whole =
         tables_.count(luminance_) != 0 && tables_.count(chrominance_) != 0 && picture_.huffman.size() == 4;
@@ -107,7 +107,7 @@ class Reader {
     return std::move(picture_);
   }
 
-  JpegBytes file_;
+  Bytes file_;
   JpegPicture picture_;
   std::map<std::uint8_t, std::vector<std::uint8_t>> tables_;
   std::uint8_t luminance_ = 0;
@@ -116,7 +116,7 @@ class Reader {
 
 }  // namespace
 
-std::optional<JpegPicture> read_jpeg(JpegBytes file) {
+std::optional<JpegPicture> read_jpeg(Bytes file) {
   if (file.size() < 2 || file[0] != 0xFF || file[1] != 0xD8) return std::nullopt;
   return Reader(file).read();
 }

@@ -28,13 +28,13 @@ std::string encoder_trouble(const char* doing, int code) {
   return std::string(doing) + ": " + text;
 }
 
-const AVCodec* encoder_of(LiveCodec codec) {
+const AVCodec* encoder_of(Codec codec) {
   switch (codec) {
-    case LiveCodec::kJpeg:
+    case Codec::kJpeg:
       return avcodec_find_encoder(AV_CODEC_ID_MJPEG);
-    case LiveCodec::kMpeg4:
+    case Codec::kMpeg4:
       return avcodec_find_encoder(AV_CODEC_ID_MPEG4);
-    case LiveCodec::kH264:
+    case Codec::kH264:
       return avcodec_find_encoder_by_name("libx264");
   }
   return nullptr;
@@ -56,7 +56,7 @@ void set_up_motion(AVCodecContext& context, const LiveEncoding& encoding) {
   context.bit_rate = std::int64_t{std::max(encoding.bit_rate, 1)} * 1000;
   context.gop_size = encoding.key_interval > 0 ? encoding.key_interval : encoding.frame_rate;
   context.max_b_frames = 0;
-  if (encoding.codec == LiveCodec::kMpeg4) return;
+  if (encoding.codec == Codec::kMpeg4) return;
   context.rc_max_rate = context.bit_rate;
   context.rc_buffer_size = static_cast<int>(std::min<std::int64_t>(context.bit_rate, 1000000000));
   av_opt_set(context.priv_data, "preset", "ultrafast", 0);
@@ -72,7 +72,7 @@ void set_up(AVCodecContext& context, const LiveEncoding& encoding) {
   context.framerate = {encoding.frame_rate, 1};
   context.thread_count = 1;
   context.flags |= AV_CODEC_FLAG_BITEXACT;  // no name of the encoder in what it writes
-  if (encoding.codec == LiveCodec::kJpeg) {
+  if (encoding.codec == Codec::kJpeg) {
     set_up_jpeg(context, encoding);
   } else {
     set_up_motion(context, encoding);
@@ -123,7 +123,7 @@ struct LiveEncoder::Parts {
     void operator()(AVPacket* packet) const { av_packet_free(&packet); }
   };
 
-  LiveCodec codec = LiveCodec::kH264;
+  Codec codec = Codec::kH264;
   std::unique_ptr<AVCodecContext, Free> context;
   std::unique_ptr<AVFrame, Free> frame;
   std::unique_ptr<AVPacket, Free> packet;
@@ -186,7 +186,7 @@ std::variant<EncodedPicture, std::string> LiveEncoder::encode(const I420Picture&
   const std::span<const std::uint8_t> bytes(packet.data, static_cast<std::size_t>(packet.size));
   EncodedPicture encoded;
   encoded.key = (packet.flags & AV_PKT_FLAG_KEY) != 0;
-  if (parts_->codec == LiveCodec::kH264) {
+  if (parts_->codec == Codec::kH264) {
     encoded.bytes = plain_h264(bytes);
   } else {
     encoded.bytes.assign(bytes.begin(), bytes.end());

@@ -9,13 +9,12 @@
 #include <vector>
 
 #include "virtual_camera/codec/i420_picture.h"
+#include "virtual_camera/values/codec.h"
 
 namespace vexa::camera {
 
-enum class LiveCodec { kJpeg, kMpeg4, kH264 };
-
 struct LiveEncoding {
-  LiveCodec codec = LiveCodec::kH264;
+  Codec codec = Codec::kH264;
   int width = 0;  // pixels, even
   int height = 0;
   int frame_rate = 25;   // pictures a second

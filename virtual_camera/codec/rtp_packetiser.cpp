@@ -14,7 +14,7 @@ constexpr std::size_t kFuHeaderSize = 2;
 
 constexpr std::uint8_t kSei = 6;
 
-std::span<const std::uint8_t> as_bytes_of(const std::string& text) {
+std::span<const std::uint8_t> bytes_of(const std::string& text) {
   return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
 }
 
@@ -28,7 +28,7 @@ AccessUnit with_sei(const AccessUnit& picture, const std::string& unit) {
   const bool four_bytes = slice->offset >= kStartCode && picture.bytes[slice->offset - kStartCode] == 0;
   const std::size_t place = slice->offset - (four_bytes ? kStartCode : kStartCode - 1);
   AccessUnit changed = picture;
-  const auto inserted = as_bytes_of(unit);
+  const auto inserted = bytes_of(unit);
   changed.bytes.insert(changed.bytes.begin() + static_cast<std::ptrdiff_t>(place), inserted.begin(), inserted.end());
   for (NalUnit& nal : changed.units) nal.offset += nal.offset > place ? unit.size() : 0;
   const auto index = slice - picture.units.begin();
@@ -59,7 +59,7 @@ std::vector<std::uint8_t> jpeg_user_data(const std::string& text) {
   std::vector<std::uint8_t> block(168);
   block[0] = 0xFF;
   block[1] = 0xD8;
-  const auto bytes = as_bytes_of(text).first(std::min(text.size(), block.size() - kText));
+  const auto bytes = bytes_of(text).first(std::min(text.size(), block.size() - kText));
   std::copy(bytes.begin(), bytes.end(), block.begin() + kText);
   return block;
 }
@@ -68,8 +68,8 @@ std::vector<std::uint8_t> jpeg_user_data(const std::string& text) {
 // may stand before any picture, goes in front.
 std::string mpeg4_with_text(const std::string& picture, const std::string& text) {
   static const std::string kVideoObject("\0\0\1\1", 4);
-  const std::string changed = with_user_data(ImageKind::kMpeg4, picture, text);
-  return is_key_picture(ImageKind::kMpeg4, picture) ? changed : kVideoObject + changed;
+  const std::string changed = with_user_data(Codec::kMpeg4, picture, text);
+  return is_key_picture(Codec::kMpeg4, picture) ? changed : kVideoObject + changed;
 }
 
 }  // namespace
@@ -117,21 +117,21 @@ PacketisedPicture packetise_mpeg4(std::span<const std::uint8_t> picture, std::si
   return packets;
 }
 
-std::optional<PacketisedPicture> packetise(ImageKind codec, const std::string& picture, const std::string& text,
+std::optional<PacketisedPicture> packetise(Codec codec, const std::string& picture, const std::string& text,
                                            std::size_t max_payload) {
   switch (codec) {
-    case ImageKind::kH264: {
+    case Codec::kH264: {
       const Clip clip = Clip::from_annex_b(picture);
       if (clip.access_units().empty()) return std::nullopt;
       const AccessUnit& unit = clip.access_units().front();
       return PacketisedPicture(text.empty() ? unit : with_sei(unit, sei_unit(text)), max_payload);
     }
-    case ImageKind::kMpeg4:
-      return packetise_mpeg4(as_bytes_of(text.empty() ? picture : mpeg4_with_text(picture, text)), max_payload);
-    case ImageKind::kJpeg:
+    case Codec::kMpeg4:
+      return packetise_mpeg4(bytes_of(text.empty() ? picture : mpeg4_with_text(picture, text)), max_payload);
+    case Codec::kJpeg:
       break;
   }
-  const std::optional<JpegPicture> jpeg = read_jpeg(as_bytes_of(picture));
+  const std::optional<JpegPicture> jpeg = read_jpeg(bytes_of(picture));
   if (!jpeg) return std::nullopt;
   return packetise_jpeg(*jpeg, jpeg_user_data(text), max_payload);
 }
@@ -142,7 +142,7 @@ PacketisedClip::PacketisedClip(Clip clip, std::size_t max_payload) : clip_(std::
 }
 
 bool PacketisedClip::packetise_images(std::size_t max_payload, const std::string& user_data) {
-  const bool in_headers = images_.kind() == ImageKind::kJpeg;
+  const bool in_headers = images_.kind() == Codec::kJpeg;
   for (const std::string& image : images_.pictures()) {
     auto packets = packetise(images_.kind(), image, in_headers ? user_data : "", max_payload);
     if (!packets) return false;
@@ -154,8 +154,8 @@ bool PacketisedClip::packetise_images(std::size_t max_payload, const std::string
 std::shared_ptr<const PacketisedClip> PacketisedClip::load(const std::string& path, std::size_t max_payload,
                                                            const std::string& user_data) {
   const auto images = ImageClip::load(path);
-  if (images && images->kind() != ImageKind::kH264) {
-    const bool in_pictures = images->kind() == ImageKind::kMpeg4;
+  if (images && images->kind() != Codec::kH264) {
+    const bool in_pictures = images->kind() == Codec::kMpeg4;
     PacketisedClip clip(in_pictures ? with_text_in_key_pictures(*images, user_data) : *images);
     if (!clip.packetise_images(max_payload, user_data)) return nullptr;
     return std::make_shared<const PacketisedClip>(std::move(clip));

@@ -51,7 +51,7 @@ class PacketisedPicture {
 // A picture of any codec, with a text in its user data where that is not empty: before the first slice of H.264 a SEI
 // unit, before the coded MPEG-4 picture a user-data unit, before the first JPEG header a block. Nothing for one that
 // RTP cannot carry.
-[[nodiscard]] std::optional<PacketisedPicture> packetise(ImageKind codec, const std::string& picture,
+[[nodiscard]] std::optional<PacketisedPicture> packetise(Codec codec, const std::string& picture,
                                                          const std::string& text, std::size_t max_payload);
 
 // A clip cut into packets once, for any number of cameras and clients. Immutable.
@@ -64,7 +64,7 @@ class PacketisedClip {
   [[nodiscard]] static std::shared_ptr<const PacketisedClip> load(const std::string& path, std::size_t max_payload,
                                                                   const std::string& user_data = {});
 
-  [[nodiscard]] ImageKind codec() const { return images_.kind(); }
+  [[nodiscard]] Codec codec() const { return images_.kind(); }
   // H.264 as a receiver rebuilds it, MPEG-4 as it is sent, JPEG as the encoder made it.
   [[nodiscard]] const ImageClip& images() const { return images_; }
   [[nodiscard]] const Clip& clip() const { return clip_; }  // H.264; empty for other codecs

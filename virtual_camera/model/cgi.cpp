@@ -1,8 +1,5 @@
 #include "virtual_camera/model/cgi.h"
 
-#include <fmt/format.h>
-
-#include <charconv>
 #include <optional>
 
 namespace vexa::camera {
@@ -19,17 +16,6 @@ Answer answer_inquiry(std::string_view query, const SettingsStore& settings) {
 }
 
 }  // namespace
-
-Answer http_answer(std::string_view status, std::string_view body) {
-  Answer answer;
-  std::from_chars(status.data(), status.data() + status.size(), answer.status);
-  const std::string_view challenge = answer.status == 401 ? "WWW-Authenticate: Basic realm=\"camera\"\r\n" : "";
-  answer.bytes = fmt::format("HTTP/1.0 {}\r\n{}Content-Type: text/plain\r\nContent-Length: {}\r\n\r\n{}", status,
-                             challenge, body.size(), body);
-  return answer;
-}
-
-Answer no_content() { return {204, "HTTP/1.0 204 No Content\r\n\r\n"}; }
 
 Answer answer_command(const RequestHead& request, SettingsStore& settings) {
   if (!request.version.starts_with("HTTP/")) return http_answer("400 Bad Request", "");

@@ -3,8 +3,9 @@
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <charconv>
 #include <optional>
+
+#include "virtual_camera/values/number_text.h"
 
 namespace vexa::camera {
 namespace {
@@ -12,13 +13,6 @@ namespace {
 const std::vector<std::string> kSwitch = {"off", "on"};
 const std::vector<std::string> kStrengths = {"off", "low", "mid", "high"};
 constexpr int kOften = 100000;
-
-std::optional<int> whole_number(std::string_view text) {
-  int value = 0;
-  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value);
-  if (error != std::errc() || end != text.data() + text.size()) return std::nullopt;
-  return value;
-}
 
 std::optional<PictureSize> size_of(std::string_view text) {
   const std::size_t comma = text.find(',');

@@ -1,11 +1,11 @@
 #include "virtual_camera/program/fault_arguments.h"
 
-#include <charconv>
 #include <chrono>
 #include <cstdint>
 #include <optional>
 #include <string_view>
-#include <system_error>
+
+#include "virtual_camera/values/number_text.h"
 
 namespace vexa::camera {
 namespace {
@@ -18,12 +18,9 @@ constexpr const char* kStreamGroup =
 
 template <typename Number>
 Number number_of(std::string_view text) {
-  Number number{};
-  const auto result = std::from_chars(text.data(), text.data() + text.size(), number);
-  if (result.ec != std::errc{} || result.ptr != text.data() + text.size()) {
-    throw CLI::ValidationError("fault value", "not a number in range: " + std::string(text));
-  }
-  return number;
+  const std::optional<Number> number = whole_number<Number>(text);
+  if (!number) throw CLI::ValidationError("fault value", "not a number in range: " + std::string(text));
+  return *number;
 }
 
 std::chrono::milliseconds milliseconds_of(std::string_view text) {

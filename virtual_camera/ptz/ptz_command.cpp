@@ -1,10 +1,11 @@
 #include "virtual_camera/ptz/ptz_command.h"
 
 #include <algorithm>
-#include <charconv>
 #include <cstdint>
 #include <cstdlib>
 #include <vector>
+
+#include "virtual_camera/values/number_text.h"
 
 namespace vexa::camera {
 namespace {
@@ -18,11 +19,10 @@ MotorOrder going(int place, double speed = 1) { return {MotorOrder::Kind::kGoTo,
 
 // Four hexadecimal digits, or eight that widen a negative number of 16 bits.
 std::optional<int> hex_number(std::string_view text) {
-  std::uint32_t number = 0;
-  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number, 16);
-  if (error != std::errc() || end != text.data() + text.size()) return std::nullopt;
-  if (text.size() == 8 && number >= 0xFFFF8000) return static_cast<int>(number - 0xFFFF8000) - 0x8000;
-  return text.size() == 4 ? std::optional<int>(static_cast<int>(number)) : std::nullopt;
+  const auto number = whole_number<std::uint32_t>(text, 16);
+  if (!number) return std::nullopt;
+  if (text.size() == 8 && *number >= 0xFFFF8000) return static_cast<int>(*number - 0xFFFF8000) - 0x8000;
+  return text.size() == 4 ? std::optional<int>(static_cast<int>(*number)) : std::nullopt;
 }
 
 std::optional<int> signed_hex(std::string_view text) {
@@ -169,10 +169,7 @@ std::vector<std::string_view> comma_pieces(std::string_view text) {
 }
 
 std::optional<int> number_within(std::string_view text, int least, int most) {
-  int number = 0;
-  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
-  if (error != std::errc() || end != text.data() + text.size()) return std::nullopt;
-  return held(number, least, most);
+  return held(whole_number(text), least, most);
 }
 
 std::optional<PtzOrder> ptz_order(std::string_view key, std::string_view value, const PtzProfile& profile,

@@ -2,7 +2,8 @@
 #ifndef VIRTUAL_CAMERA_RTP_INTERLEAVED_LANE_H_
 #define VIRTUAL_CAMERA_RTP_INTERLEAVED_LANE_H_
 
-#include <asio.hpp>
+#include <asio/ip/tcp.hpp>
+#include <asio/steady_timer.hpp>
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
@@ -13,15 +14,16 @@
 #include <vector>
 
 #include "virtual_camera/rtp/packet_port.h"
-#include "virtual_camera/server/connection.h"
 
 namespace vexa::camera {
 
 // What the sessions of one connection send on it. Answers and packets take turns; neither is ever torn by the other.
 class InterleavedLane : public std::enable_shared_from_this<InterleavedLane> {
  public:
-  // `socket` is the owner's. An owner whose peer takes nothing for `patience` is reset.
-  InterleavedLane(std::weak_ptr<Connection> owner, asio::ip::tcp::socket& socket, std::chrono::milliseconds patience);
+  // `socket` is the owner's. `reset` ends the owner's connection where writing fails, or the peer takes nothing for
+  // `patience`; it is called only while the owner lives.
+  InterleavedLane(std::weak_ptr<void> owner, std::function<void()> reset, asio::ip::tcp::socket& socket,
+                  std::chrono::milliseconds patience);
 
   // Puts a packet behind those that wait; false when there is no room for it.
   [[nodiscard]] bool offer(std::uint8_t channel, const Outgoing& packet);
@@ -35,10 +37,11 @@ class InterleavedLane : public std::enable_shared_from_this<InterleavedLane> {
  private:
   void write_rest();
   void written();
-  void watch(const std::shared_ptr<Connection>& owner);
+  void watch();
 
-  const std::weak_ptr<Connection> owner_;
-  asio::ip::tcp::socket& socket_;  // touched only while the owner lives
+  const std::weak_ptr<void> owner_;
+  const std::function<void()> reset_;  // called only while the owner lives
+  asio::ip::tcp::socket& socket_;      // touched only while the owner lives
   const std::chrono::milliseconds patience_;
   asio::steady_timer stalled_;
   std::string waiting_;

@@ -1,10 +1,10 @@
 #include "virtual_camera/rtp/rtp_sender.h"
 
 #include <algorithm>
+#include <asio/io_context.hpp>
+#include <asio/post.hpp>
 #include <cmath>
 #include <utility>
-
-#include "virtual_camera/source/stream_plan.h"
 
 namespace vexa::camera {
 namespace {
@@ -13,32 +13,24 @@ namespace {
 constexpr std::chrono::seconds kFarBehind{1};
 // Of each datagram on an Ethernet: RTP, UDP and IPv4 headers; preamble, frame header, check sequence and gap.
 constexpr std::size_t kWireOverhead = 12 + 8 + 20 + 38;
-// Makes the seeds of a camera's sessions differ; the first session has the camera's own.
-constexpr std::uint64_t kSeedStep = 0x9E3779B97F4A7C15ULL;
 
 }  // namespace
 
-RtpSender::RtpSender(std::shared_ptr<CameraState> state, std::uint32_t session, int video,
-                     std::unique_ptr<PacketPort> port)
-    : state_(std::move(state)), session_(session), video_(video), port_(std::move(port)), timer_(state_->context) {}
+RtpSender::RtpSender(asio::io_context& context, std::shared_ptr<const CameraOptions> options,
+                     std::shared_ptr<SentLog> sent, std::uint32_t session, std::unique_ptr<PacketPort> port)
+    : context_(context),
+      options_(std::move(options)),
+      sent_(std::move(sent)),
+      session_(session),
+      port_(std::move(port)),
+      timer_(context) {}
 
-void RtpSender::play(std::chrono::milliseconds pause) {
-  if (stream_ || stopped_) return;
-  std::optional<StreamPlan> plan = plan_stream(*state_, video_);
-  if (plan && plan->source) play(std::move(plan->source), pause);
-}
-
-void RtpSender::play(std::unique_ptr<PictureSource> source, std::chrono::milliseconds pause) {
-  if (stream_ || stopped_) return;
-  const std::uint64_t seed = state_->options.seed + kSeedStep * state_->plays++;
-  PacketFaults faults;
-  {
-    const std::lock_guard<std::mutex> lock(state_->packet_faults_mutex);
-    faults = state_->packet_faults;
-  }
-  stream_.emplace(std::move(source), state_->options, faults, RtpStream::Identity{session_, seed});
-  lane_.emplace(std::move(faults), seed);
-  started_ = Clock::now() + pause;
+void RtpSender::play(Play play) {
+  if (!may_play()) return;
+  user_data_ = std::move(play.user_data);
+  stream_.emplace(std::move(play.source), *options_, play.faults, RtpStream::Identity{session_, play.seed});
+  lane_.emplace(std::move(play.faults), play.seed);
+  started_ = Clock::now() + play.pause;
   wait_for_next();
 }
 
@@ -50,13 +42,13 @@ void RtpSender::stop() {
 }
 
 RtpSender::Time RtpSender::paced(std::chrono::nanoseconds time) const {
-  return Time(std::llround(static_cast<double>(time.count()) / state_->options.speed));
+  return Time(std::llround(static_cast<double>(time.count()) / options_->speed));
 }
 
 // The bursts of a picture are spread over the first half of its time; a port sends one datagram behind the other.
 std::optional<RtpSender::Time> RtpSender::next_burst() const {
   if (picture_.empty()) return std::nullopt;
-  if (const unsigned rate = state_->options.link_megabits; rate > 0) {
+  if (const unsigned rate = options_->link_megabits; rate > 0) {
     return picture_began_ + std::chrono::duration_cast<Time>(std::chrono::microseconds(offered_bytes_ * 8 / rate));
   }
   const Time half = paced(steady_time(1, stream_->format().frames_per_second)) / 2;
@@ -76,7 +68,7 @@ void RtpSender::wait_for_next() {
   const std::optional<Time> event = next_event();
   if (picture_.empty() && !stream_->load() && !stream_->ended()) wait_for_source();
   if (!event) {
-    if (stream_->ended() && !std::exchange(finished_, true)) state_->sent.add_finished_stream();
+    if (stream_->ended() && !std::exchange(finished_, true)) sent_->add_finished_stream();
     return;
   }
   slip_if_far_behind(*event);
@@ -88,7 +80,7 @@ void RtpSender::wait_for_next() {
 
 void RtpSender::wait_for_source() {
   if (std::exchange(waits_for_source_, true)) return;
-  stream_->wait([weak = weak_from_this(), &context = state_->context] {
+  stream_->wait([weak = weak_from_this(), &context = context_] {
     asio::post(context, [weak] {
       const std::shared_ptr<RtpSender> self = weak.lock();
       if (!self || self->stopped_) return;
@@ -105,8 +97,8 @@ void RtpSender::slip_if_far_behind(Time event) {
 
 std::string RtpSender::user_data_of(const SourcePicture& picture) const {
   if (!stream_->format().takes_user_data) return {};
-  const bool of_key_pictures = !state_->options.user_data.empty();
-  return of_key_pictures && !picture.key ? "" : present_user_data(*state_);
+  const bool of_key_pictures = !options_->user_data.empty();
+  return of_key_pictures && !picture.key ? "" : user_data_();
 }
 
 void RtpSender::begin_picture(Time now) {
@@ -119,7 +111,7 @@ void RtpSender::begin_picture(Time now) {
 
 void RtpSender::offer_burst(Time now) {
   if (picture_.empty()) begin_picture(now);
-  const std::size_t burst = state_->options.link_megabits > 0 ? 1 : state_->options.burst_packets;
+  const std::size_t burst = options_->link_megabits > 0 ? 1 : options_->burst_packets;
   const std::size_t end = std::min(picture_.size(), offered_ + burst);
   for (; offered_ < end; ++offered_) {
     offered_bytes_ += picture_[offered_].payload_to_send().size() + kWireOverhead;
@@ -138,10 +130,10 @@ void RtpSender::run_event() {
     lane_->release_due(*now, leaving_);
   } else {
     offer_burst(*now);
-    if (state_->options.link_megabits == 0) not_before_ = Clock::now() + state_->options.burst_gap;
+    if (options_->link_megabits == 0) not_before_ = Clock::now() + options_->burst_gap;
   }
-  const auto hashing = state_->options.hash_packets ? PacketPort::Hashing::kOn : PacketPort::Hashing::kOff;
-  state_->sent.add(port_->send(leaving_, hashing));
+  const auto hashing = options_->hash_packets ? PacketPort::Hashing::kOn : PacketPort::Hashing::kOff;
+  sent_->add(port_->send(leaving_, hashing));
   if (!stopped_) wait_for_next();
 }
 

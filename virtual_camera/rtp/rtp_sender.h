@@ -2,10 +2,11 @@
 #ifndef VIRTUAL_CAMERA_RTP_RTP_SENDER_H_
 #define VIRTUAL_CAMERA_RTP_RTP_SENDER_H_
 
-#include <asio.hpp>
+#include <asio/steady_timer.hpp>
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <string>
@@ -14,20 +15,32 @@
 #include "virtual_camera/rtp/fault_lane.h"
 #include "virtual_camera/rtp/packet_port.h"
 #include "virtual_camera/rtp/rtp_stream.h"
-#include "virtual_camera/server/camera_state.h"
+#include "virtual_camera/rtp/sent_log.h"
+#include "virtual_camera/source/picture_source.h"
+#include "virtual_camera/values/options.h"
 
 namespace vexa::camera {
 
+// One for each session. Lives on the loop's thread.
 class RtpSender : public std::enable_shared_from_this<RtpSender> {
  public:
-  // `video`: the number of the camera's video stream. The port stands open.
-  RtpSender(std::shared_ptr<CameraState> state, std::uint32_t session, int video, std::unique_ptr<PacketPort> port);
+  // What a stream is played with.
+  struct Play {
+    std::unique_ptr<PictureSource> source;   // not null
+    std::function<std::string()> user_data;  // of a picture that leaves now; not empty
+    PacketFaults faults;
+    std::uint64_t seed = 1;
+    std::chrono::milliseconds pause{0};  // before the first picture
+  };
 
-  // Starts with the first picture, after the pause, as the video stream is set. Nothing happens without a clip or when
-  // already playing.
-  void play(std::chrono::milliseconds pause);
-  // The same with another source than the video stream's; not null.
-  void play(std::unique_ptr<PictureSource> source, std::chrono::milliseconds pause);
+  // The port stands open. The context outlives the sender.
+  RtpSender(asio::io_context& context, std::shared_ptr<const CameraOptions> options, std::shared_ptr<SentLog> sent,
+            std::uint32_t session, std::unique_ptr<PacketPort> port);
+
+  // Whether play() would start a stream: none plays, and stop() has not been called.
+  [[nodiscard]] bool may_play() const { return !stream_ && !stopped_; }
+  // Starts with the first picture. Has no effect unless may_play().
+  void play(Play play);
   void stop();
 
  private:
@@ -45,11 +58,13 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
   void offer_burst(Time now);
   void slip_if_far_behind(Time event);
 
-  std::shared_ptr<CameraState> state_;
+  asio::io_context& context_;
+  const std::shared_ptr<const CameraOptions> options_;
+  const std::shared_ptr<SentLog> sent_;
   const std::uint32_t session_;
-  const int video_;
   const std::unique_ptr<PacketPort> port_;
   asio::steady_timer timer_;
+  std::function<std::string()> user_data_;
   std::optional<RtpStream> stream_;
   std::optional<FaultLane> lane_;
   Clock::time_point started_;

@@ -29,9 +29,9 @@ void put_u32(std::uint8_t* to, std::uint32_t value) {
 
 }  // namespace
 
-std::uint8_t payload_type_of(const CameraOptions& options, ImageKind codec) {
+std::uint8_t payload_type_of(const CameraOptions& options, Codec codec) {
   constexpr std::uint8_t kJpeg = 26;
-  return codec == ImageKind::kJpeg ? kJpeg : options.payload_type & 0x7FU;
+  return codec == Codec::kJpeg ? kJpeg : options.payload_type & 0x7FU;
 }
 
 void Outgoing::read_header() {

@@ -38,7 +38,7 @@ struct Outgoing {
 };
 
 // The options' payload type; JPEG has a static one (RFC 3551, table 5).
-[[nodiscard]] std::uint8_t payload_type_of(const CameraOptions& options, ImageKind codec);
+[[nodiscard]] std::uint8_t payload_type_of(const CameraOptions& options, Codec codec);
 
 class RtpStream {
  public:

@@ -2,7 +2,7 @@
 #ifndef VIRTUAL_CAMERA_RTP_UDP_PORT_H_
 #define VIRTUAL_CAMERA_RTP_UDP_PORT_H_
 
-#include <asio.hpp>
+#include <asio/ip/udp.hpp>
 #include <cstdint>
 #include <string>
 #include <vector>

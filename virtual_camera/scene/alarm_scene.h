@@ -11,15 +11,9 @@
 #include <string_view>
 #include <vector>
 
-namespace vexa::camera {
+#include "virtual_camera/values/alarm_layout.h"
 
-// Which sensors and detectors the camera has.
-struct AlarmLayout {
-  int inputs = 2;
-  std::string detection = "object";  // "object", "motion" (both by window), "lod" (one item); empty: none
-  bool tampering = true;
-  bool audio = true;
-};
+namespace vexa::camera {
 
 // One thing that happens.
 struct AlarmEvent {

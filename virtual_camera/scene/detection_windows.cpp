@@ -3,10 +3,13 @@
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <charconv>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
+
+#include "virtual_camera/ptz/ptz_command.h"
+#include "virtual_camera/values/number_text.h"
 
 namespace vexa::camera {
 namespace {
@@ -18,16 +21,15 @@ constexpr PictureBox kWholePicture{0, 0, kWholeSide, kWholeSide};
 template <std::size_t kPlaces>
 std::optional<std::array<int, kPlaces>> numbers_of(const std::optional<std::string>& text) {
   if (!text) return std::nullopt;
+  const std::vector<std::string_view> pieces = comma_pieces(*text);
+  if (pieces.size() != kPlaces) return std::nullopt;
   std::array<int, kPlaces> numbers{};
-  const char* at = text->data();
-  const char* const end = at + text->size();
   for (std::size_t i = 0; i < kPlaces; ++i) {
-    if (i > 0 && (at == end || *at++ != ',')) return std::nullopt;
-    const auto [next, error] = std::from_chars(at, end, numbers[i]);
-    if (error != std::errc()) return std::nullopt;
-    at = next;
+    const std::optional<int> number = whole_number(pieces[i]);
+    if (!number) return std::nullopt;
+    numbers[i] = *number;
   }
-  return at == end ? std::optional(numbers) : std::nullopt;
+  return numbers;
 }
 
 // Reads the keys of one detection number, written by hosts with two digits and known with one as well.

@@ -1,8 +1,15 @@
 #include "virtual_camera/server/alarm_control.h"
 
-#include <charconv>
+#include <asio/buffer.hpp>
+#include <asio/io_context.hpp>
+#include <asio/read_until.hpp>
+#include <asio/steady_timer.hpp>
+#include <asio/write.hpp>
 #include <utility>
+#include <vector>
 
+#include "virtual_camera/server/camera_state.h"
+#include "virtual_camera/values/number_text.h"
 #include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {
@@ -19,12 +26,6 @@ std::vector<std::string_view> steps_of(std::string_view path) {
     path.remove_prefix(steps.back().size());
   }
   return steps;
-}
-
-std::optional<int> number_of(std::string_view text) {
-  int number = 0;
-  const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
-  return error == std::errc() && end == text.data() + text.size() ? std::optional<int>(number) : std::nullopt;
 }
 
 struct Switch {
@@ -48,10 +49,10 @@ std::optional<AlarmEvent> event_of(const std::vector<std::string_view>& steps) {
     if (steps.size() == 2 && steps[0] == by.name) return switched(by, steps[1], 1);
   }
   if (steps.size() != 3) return std::nullopt;
-  const std::optional<int> number = number_of(steps[1]);
+  const std::optional<int> number = whole_number(steps[1]);
   if (!number) return std::nullopt;
   if (steps[0] == kContact.name) return switched(kContact, steps[2], *number);
-  const std::optional<int> value = number_of(steps[2]);
+  const std::optional<int> value = whole_number(steps[2]);
   if (steps[0] != "motion" || !value) return std::nullopt;
   return AlarmEvent{AlarmEvent::Kind::kMotion, *number, *value};
 }
@@ -74,42 +75,28 @@ std::optional<std::chrono::seconds> control_walk(std::string_view path) {
   const std::vector<std::string_view> steps = steps_of(path);
   if (steps.empty() || steps.size() > 2 || steps[0] != "walk") return std::nullopt;
   if (steps.size() == 1) return kUsual;
-  const std::optional<int> seconds = number_of(steps[1]);
+  const std::optional<int> seconds = whole_number(steps[1]);
   if (!seconds || *seconds < 1 || *seconds > kLongest) return std::nullopt;
   return std::chrono::seconds(*seconds);
 }
 
 AlarmControl::AlarmControl(std::shared_ptr<CameraState> state)
-    : state_(std::move(state)), acceptor_(state_->context), watch_(std::make_shared<IntruderWatch>(state_)) {}
+    : state_(std::move(state)), watch_(std::make_shared<IntruderWatch>(state_)) {}
 
 asio::error_code AlarmControl::open(std::uint16_t port) {
-  asio::error_code error;
-  const asio::ip::tcp::endpoint endpoint(asio::ip::address_v4::loopback(), port_ != 0 ? port_ : port);
-  acceptor_.open(endpoint.protocol(), error);
-  if (!error) acceptor_.set_option(asio::socket_base::reuse_address(true), error);
-  if (!error) acceptor_.bind(endpoint, error);
-  if (!error) acceptor_.listen(asio::socket_base::max_listen_connections, error);
-  if (error) {
-    close();
-    return error;
+  if (!listener_) {
+    const auto take_visit = [weak = weak_from_this()](asio::ip::tcp::socket socket) {
+      if (const std::shared_ptr<AlarmControl> self = weak.lock())
+        self->take(std::make_shared<Visit>(std::move(socket)));
+    };
+    listener_ = std::make_shared<Listener>(state_->context, "127.0.0.1", take_visit);
   }
-  port_ = acceptor_.local_endpoint(error).port();
-  accept();
-  return error;
+  return listener_->open(port);
 }
 
 void AlarmControl::close() {
-  asio::error_code ignored;
-  acceptor_.close(ignored);
+  if (listener_) listener_->close();
   watch_->stop();
-}
-
-void AlarmControl::accept() {
-  acceptor_.async_accept([self = shared_from_this()](asio::error_code error, asio::ip::tcp::socket socket) {
-    if (error) return;
-    self->take(std::make_shared<Visit>(std::move(socket)));
-    self->accept();
-  });
 }
 
 void AlarmControl::take(const std::shared_ptr<Visit>& visit) {
@@ -131,7 +118,7 @@ void AlarmControl::take(const std::shared_ptr<Visit>& visit) {
 std::string_view AlarmControl::answer(const std::string& request) {
   const std::optional<RequestHead> head = parse_head(request);
   if (head && (head->path == "/network/unplug" || head->path == "/network/plug")) {
-    if (state_->set_network) state_->set_network(head->path == "/network/plug");
+    if (state_->requests.set_network) state_->requests.set_network(head->path == "/network/plug");
     return "HTTP/1.0 204 No Content\r\n\r\n";
   }
   if (const auto time = head ? control_walk(head->path) : std::nullopt) {

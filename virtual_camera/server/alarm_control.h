@@ -4,7 +4,8 @@
 #ifndef VIRTUAL_CAMERA_SERVER_ALARM_CONTROL_H_
 #define VIRTUAL_CAMERA_SERVER_ALARM_CONTROL_H_
 
-#include <asio.hpp>
+#include <asio/error_code.hpp>
+#include <asio/ip/tcp.hpp>
 #include <chrono>
 #include <cstdint>
 #include <memory>
@@ -12,10 +13,13 @@
 #include <string>
 #include <string_view>
 
-#include "virtual_camera/server/camera_state.h"
+#include "virtual_camera/scene/alarm_scene.h"
 #include "virtual_camera/server/intruder_watch.h"
+#include "virtual_camera/server/listener.h"
 
 namespace vexa::camera {
+
+struct CameraState;
 
 // What a path of the control port lets happen; nothing for a path that it does not know.
 [[nodiscard]] std::optional<AlarmEvent> control_event(std::string_view path);
@@ -30,19 +34,17 @@ class AlarmControl : public std::enable_shared_from_this<AlarmControl> {
   // Port 0 takes any free one.
   [[nodiscard]] asio::error_code open(std::uint16_t port);
   void close();
-  [[nodiscard]] std::uint16_t port() const { return port_; }
+  [[nodiscard]] std::uint16_t port() const { return listener_ ? listener_->port() : std::uint16_t{0}; }
 
  private:
   struct Visit;
 
-  void accept();
   void take(const std::shared_ptr<Visit>& visit);
   std::string_view answer(const std::string& request);
 
   std::shared_ptr<CameraState> state_;
-  asio::ip::tcp::acceptor acceptor_;
+  std::shared_ptr<Listener> listener_;  // null until the first open()
   std::shared_ptr<IntruderWatch> watch_;
-  std::uint16_t port_ = 0;
 };
 
 }  // namespace vexa::camera

@@ -2,8 +2,12 @@
 
 #include <fmt/format.h>
 
+#include <asio/io_context.hpp>
+#include <asio/post.hpp>
+#include <cstddef>
 #include <mutex>
 #include <utility>
+#include <vector>
 
 #include "virtual_camera/codec/rtp_packetiser.h"
 #include "virtual_camera/server/http_connection.h"
@@ -12,10 +16,21 @@
 namespace vexa::camera {
 namespace {
 
+// Far above what honest hosts open at once; more connections are closed at once.
+constexpr std::size_t kMaxConnections = 512;
+
+void keep(std::vector<std::weak_ptr<Connection>>& connections, const std::shared_ptr<Connection>& connection) {
+  std::erase_if(connections, [](const std::weak_ptr<Connection>& other) { return other.expired(); });
+  if (connections.size() >= kMaxConnections) return;
+  connections.push_back(connection);
+  connection->start();
+}
+
 template <typename Kind>
 std::shared_ptr<Listener> listener_of(const std::shared_ptr<CameraState>& state) {
-  return std::make_shared<Listener>(
-      state, [state](asio::ip::tcp::socket socket) { return std::make_shared<Kind>(std::move(socket), state); });
+  return std::make_shared<Listener>(state->context, state->options.address, [state](asio::ip::tcp::socket socket) {
+    keep(state->connections, std::make_shared<Kind>(std::move(socket), state));
+  });
 }
 
 std::string bind_failure(const std::string& address, std::uint16_t port, const asio::error_code& error) {
@@ -102,13 +117,13 @@ std::string CameraCore::start() {
 
 // What its connections and the control port may ask for while it runs.
 void CameraCore::take_calls() {
-  state_->reboot = [weak = weak_from_this()](std::chrono::milliseconds away) {
+  state_->requests.reboot = [weak = weak_from_this()](std::chrono::milliseconds away) {
     if (const std::shared_ptr<CameraCore> core = weak.lock()) core->reboot(away);
   };
-  state_->set_network = [weak = weak_from_this()](bool plugged) {
+  state_->requests.set_network = [weak = weak_from_this()](bool plugged) {
     if (const std::shared_ptr<CameraCore> core = weak.lock()) core->set_network(plugged);
   };
-  state_->settings_changed = [weak = std::weak_ptr<CardRecorder>(recorder_)] {
+  state_->requests.settings_changed = [weak = std::weak_ptr<CardRecorder>(recorder_)] {
     if (const std::shared_ptr<CardRecorder> recorder = weak.lock()) recorder->look();
   };
 }
@@ -145,9 +160,7 @@ void CameraCore::vanish() {
 
 void CameraCore::stop() {
   running_ = false;
-  state_->reboot = nullptr;
-  state_->set_network = nullptr;
-  state_->settings_changed = nullptr;
+  state_->requests = {};
   plugged_ = true;
   recorder_->see(true);
   recorder_->stop();

@@ -2,7 +2,7 @@
 #ifndef VIRTUAL_CAMERA_SERVER_CAMERA_CORE_H_
 #define VIRTUAL_CAMERA_SERVER_CAMERA_CORE_H_
 
-#include <asio.hpp>
+#include <asio/steady_timer.hpp>
 #include <chrono>
 #include <cstdint>
 #include <deque>

@@ -1,62 +1,61 @@
 #include "virtual_camera/server/camera_state.h"
 
+#include <utility>
 #include <variant>
 
 #include "virtual_camera/model/camera_profile.h"
 #include "virtual_camera/model/setting_rules.h"
-#include "virtual_camera/source/stream_plan.h"
+#include "virtual_camera/server/settings_report.h"
 
 namespace vexa::camera {
+namespace {
 
-void CameraState::take_profile() {
-  if (!options.profile && !options.profile_path.empty()) {
-    auto loaded = load_camera_profile(options.profile_path);
-    if (const auto* error = std::get_if<std::string>(&loaded)) {
-      profile_error = *error;
-      return;
-    }
-    options.profile = std::make_shared<const SettingRules>(std::get<CameraProfile>(std::move(loaded)));
-  }
-  if (!options.profile) return;
-  settings.obey(options.profile);
+// Loads the profile that the options name, where they hold none. Returns why it could not be loaded; empty on success.
+std::string load_profile(CameraOptions& options) {
+  if (options.profile || options.profile_path.empty()) return {};
+  auto loaded = load_camera_profile(options.profile_path);
+  if (auto* error = std::get_if<std::string>(&loaded)) return std::move(*error);
+  options.profile = std::make_shared<const SettingRules>(std::get<CameraProfile>(std::move(loaded)));
+  return {};
+}
+
+AlarmLayout layout_of(const CameraOptions& options) {
+  if (!options.profile) return options.alarms;
   const CameraProfile& model = options.profile->profile();
-  alarms.rearrange({model.alarm_inputs, model.video_detection, model.tampering_detection, model.audio_detection});
-  if (!model.ptz) return;
-  ptz = std::make_unique<PtzHead>(*model.ptz, std::chrono::steady_clock::now(), options.speed * options.ptz_speed);
-  pose = [this](PtzHead::Time now) { return ptz->pose(ptz_picture().turned, now); };
+  return {model.alarm_inputs, model.video_detection, model.tampering_detection, model.audio_detection};
 }
 
-PtzPicture CameraState::ptz_picture() const {
-  PtzPicture picture;
-  if (const auto stream = stream_settings(settings, 1)) picture.size = {stream->width, stream->height};
-  picture.turned = settings.get("camera", "Eflip") == "on";
-  return picture;
+std::unique_ptr<PtzHead> head_of(const CameraOptions& options) {
+  if (!options.profile || !options.profile->profile().ptz) return nullptr;
+  return std::make_unique<PtzHead>(*options.profile->profile().ptz, std::chrono::steady_clock::now(),
+                                   options.speed * options.ptz_speed);
 }
 
-void CameraState::report_presets() {
-  if (!settings.answer("presetposition")) return;
-  settings.erase("presetposition", "PresetName");
-  for (const auto& [key, value] : ptz->preset_settings(std::chrono::steady_clock::now())) {
-    settings.set("presetposition", key, value);
-  }
+PoseSource pose_of(PtzHead* ptz, const SettingsStore& settings) {
+  if (ptz == nullptr) return nullptr;
+  return [ptz, &settings](PtzHead::Time now) { return ptz->pose(pointed_picture(settings).turned, now); };
 }
 
-void CameraState::report_contacts() {
-  if (!settings.answer("sensor")) return;
-  const std::vector<int> contacts = alarms.contacts();
-  for (std::size_t i = 0; i < contacts.size(); ++i) {
-    settings.set("sensor", "Sensor" + std::to_string(i + 1), std::to_string(contacts[i]));
-  }
+}  // namespace
+
+CameraState::CameraState(CameraOptions camera_options, asio::io_context& loop_context)
+    : options(std::move(camera_options)),
+      profile_error(load_profile(options)),
+      context(loop_context),
+      alarms(layout_of(options)),
+      card(options.card_bytes),
+      ptz(head_of(options)),
+      pose(pose_of(ptz.get(), settings)),
+      scene(settings, alarms, stage, pose, ptz.get()),
+      sources(options, settings, scene),
+      journal(options.journal_limit),
+      sent(options.sent_log_limit),
+      packet_faults(options.packet_faults),
+      next_session(options.first_session) {
+  if (options.profile) settings.obey(options.profile);
+  for (const RequestFault& fault : options.request_faults) request_faults.add(fault);
 }
 
-void CameraState::report_card() {
-  if (!settings.answer("a-slot") || options.card_bytes == 0) return;
-  settings.set("a-slot", "ASlot", card.space_text());
-}
-
-void CameraState::switch_detectors() {
-  alarms.switch_detectors(settings.get("system", "TamperingFunc") == "on",
-                          settings.get("audiodetection", "ADFunc") == "on");
-}
+CameraState::~CameraState() = default;
 
 }  // namespace vexa::camera

@@ -1,11 +1,14 @@
 #include "virtual_camera/server/card_recorder.h"
 
-#include <charconv>
+#include <asio/io_context.hpp>
+#include <asio/post.hpp>
 #include <cmath>
 #include <string_view>
 #include <utility>
 
-#include "virtual_camera/source/stream_plan.h"
+#include "virtual_camera/model/stream_settings.h"
+#include "virtual_camera/server/camera_state.h"
+#include "virtual_camera/values/number_text.h"
 
 namespace vexa::camera {
 namespace {
@@ -13,11 +16,7 @@ namespace {
 constexpr std::string_view kSection = "edgestorage";
 constexpr std::string_view kImage = "image";
 
-int number_at(std::string_view text) {
-  int number = 0;
-  std::from_chars(text.data(), text.data() + text.size(), number);
-  return number;
-}
+int number_at(std::string_view text) { return leading_number(text).value_or(0); }
 
 template <typename Duration>
 std::chrono::steady_clock::duration paced(Duration time, double speed) {
@@ -25,11 +24,11 @@ std::chrono::steady_clock::duration paced(Duration time, double speed) {
       std::chrono::duration<double>(std::chrono::duration<double>(time) / speed));
 }
 
-RecordingHead head_of(const CameraState& state, int image, const SourceFormat& format) {
+RecordingHead head_of(const SettingsStore& settings, int image, const SourceFormat& format) {
   RecordingHead head;
   head.codec = format.codec;
   head.frame_rate = static_cast<int>(std::lround(format.frames_per_second));
-  if (const auto stream = stream_settings(state.settings, image)) {
+  if (const auto stream = stream_settings(settings, image)) {
     head.size = std::to_string(stream->width) + "," + std::to_string(stream->height);
     head.bit_rate = stream->bit_rate;
     head.quality = stream->quality;
@@ -85,9 +84,9 @@ void CardRecorder::stop() {
 }
 
 void CardRecorder::begin(int image) {
-  std::optional<StreamPlan> plan = plan_stream(*state_, image);
+  std::optional<StreamPlan> plan = state_->sources.plan(image);
   if (!plan || !plan->source) return;
-  if (state_->card.begin(head_of(*state_, image, plan->source->format())).empty()) return;
+  if (state_->card.begin(head_of(state_->settings, image, plan->source->format())).empty()) return;
   source_ = std::move(plan->source);
   ++made_;
   began_ = std::chrono::steady_clock::now();

@@ -2,17 +2,19 @@
 #ifndef VIRTUAL_CAMERA_SERVER_CARD_RECORDER_H_
 #define VIRTUAL_CAMERA_SERVER_CARD_RECORDER_H_
 
-#include <asio.hpp>
+#include <asio/steady_timer.hpp>
 #include <chrono>
 #include <cstdint>
 #include <memory>
 #include <optional>
 #include <string>
 
-#include "virtual_camera/server/camera_state.h"
+#include "virtual_camera/model/settings_store.h"
 #include "virtual_camera/source/picture_source.h"
 
 namespace vexa::camera {
+
+struct CameraState;
 
 // How hosts have set edge storage.
 struct RecorderSettings {

@@ -2,7 +2,12 @@
 
 #include <fmt/format.h>
 
+#include <asio/buffer.hpp>
+#include <asio/post.hpp>
+#include <asio/write.hpp>
 #include <utility>
+
+#include "virtual_camera/server/camera_state.h"
 
 namespace vexa::camera {
 namespace {
@@ -125,7 +130,7 @@ void Connection::answer_request(std::string request) {
   const Answer answer = decide(fault, request);
   journal(std::move(request), answer);
   if (fault && fault->action == FaultAction::kReboot) {
-    if (state_->reboot) state_->reboot(fault->time);
+    if (state_->requests.reboot) state_->requests.reboot(fault->time);
     return;
   }
   delivery_ = plan_delivery(fault, answer.bytes);

@@ -4,19 +4,23 @@
 #define VIRTUAL_CAMERA_SERVER_CONNECTION_H_
 
 #include <array>
-#include <asio.hpp>
+#include <asio/ip/tcp.hpp>
+#include <asio/steady_timer.hpp>
 #include <chrono>
 #include <cstddef>
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 
-#include "virtual_camera/model/cgi.h"
-#include "virtual_camera/server/camera_state.h"
+#include "virtual_camera/server/journal.h"
 #include "virtual_camera/server/request_faults.h"
+#include "virtual_camera/wire/answer.h"
 
 namespace vexa::camera {
+
+struct CameraState;
 
 class Connection : public std::enable_shared_from_this<Connection> {
  public:

@@ -2,7 +2,9 @@
 #ifndef VIRTUAL_CAMERA_SERVER_EVENT_LOOP_H_
 #define VIRTUAL_CAMERA_SERVER_EVENT_LOOP_H_
 
-#include <asio.hpp>
+#include <asio/dispatch.hpp>
+#include <asio/executor_work_guard.hpp>
+#include <asio/io_context.hpp>
 #include <future>
 #include <thread>
 #include <utility>

@@ -2,7 +2,7 @@
 
 #include <utility>
 
-#include "virtual_camera/scene/live_scene.h"
+#include "virtual_camera/server/camera_state.h"
 
 namespace vexa::camera {
 
@@ -10,7 +10,7 @@ IntruderWatch::IntruderWatch(std::shared_ptr<CameraState> state) : state_(std::m
 
 void IntruderWatch::walk(std::chrono::milliseconds duration) {
   const auto now = std::chrono::steady_clock::now();
-  state_->stage.enter(walk_through(main_view_of(*state_, now), duration), now);
+  state_->stage.enter(walk_through(state_->scene.main_view(now), duration), now);
   look();
 }
 
@@ -31,7 +31,7 @@ void IntruderWatch::tell(const std::array<bool, kDetectionWindows>& seen) {
 void IntruderWatch::look() {
   constexpr std::chrono::milliseconds kInterval{20};
   const auto now = std::chrono::steady_clock::now();
-  tell(alarmed_windows(*state_, now));
+  tell(state_->scene.alarmed_windows(now));
   if (!state_->stage.intruder(now)) return;
   pace_.expires_after(kInterval);
   pace_.async_wait([self = shared_from_this()](asio::error_code stopped) {

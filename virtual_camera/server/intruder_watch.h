@@ -3,14 +3,15 @@
 #define VIRTUAL_CAMERA_SERVER_INTRUDER_WATCH_H_
 
 #include <array>
-#include <asio.hpp>
+#include <asio/steady_timer.hpp>
 #include <chrono>
 #include <memory>
 
 #include "virtual_camera/scene/detection_windows.h"
-#include "virtual_camera/server/camera_state.h"
 
 namespace vexa::camera {
+
+struct CameraState;
 
 // Lives on the loop's thread.
 class IntruderWatch : public std::enable_shared_from_this<IntruderWatch> {

@@ -3,26 +3,24 @@
 #include <netinet/in.h>
 #include <netinet/tcp.h>
 
+#include <asio/io_context.hpp>
+#include <chrono>
 #include <utility>
-#include <vector>
 
 namespace vexa::camera {
 namespace {
-
-// Far above what honest hosts open at once; beyond it new connections are closed at once.
-constexpr std::size_t kMaxConnections = 512;
 
 using SegmentSize = asio::detail::socket_option::integer<IPPROTO_TCP, TCP_MAXSEG>;
 constexpr int kNetworkSegment = 1448;
 
 }  // namespace
 
-Listener::Listener(std::shared_ptr<CameraState> state, Factory make)
-    : state_(std::move(state)), make_(std::move(make)), acceptor_(state_->context), retry_(state_->context) {}
+Listener::Listener(asio::io_context& context, std::string address, Take take)
+    : address_(std::move(address)), take_(std::move(take)), acceptor_(context), retry_(context) {}
 
 asio::error_code Listener::open(std::uint16_t port) {
   asio::error_code error;
-  const asio::ip::address address = asio::ip::make_address(state_->options.address, error);
+  const asio::ip::address address = asio::ip::make_address(address_, error);
   if (error) return error;
   const asio::ip::tcp::endpoint endpoint(address, port_ != 0 ? port_ : port);
   acceptor_.open(endpoint.protocol(), error);
@@ -51,7 +49,7 @@ void Listener::accept() {
   acceptor_.async_accept([self = shared_from_this()](asio::error_code error, asio::ip::tcp::socket socket) {
     if (!self->acceptor_.is_open()) return;
     if (!error) {
-      self->accepted(std::move(socket));
+      self->take_(std::move(socket));
       return self->accept();
     }
     // Out of descriptors: the waiting peers keep their place until some are free again.
@@ -60,15 +58,6 @@ void Listener::accept() {
       if (!stopped && self->acceptor_.is_open()) self->accept();
     });
   });
-}
-
-void Listener::accepted(asio::ip::tcp::socket socket) {
-  std::vector<std::weak_ptr<Connection>>& connections = state_->connections;
-  std::erase_if(connections, [](const std::weak_ptr<Connection>& connection) { return connection.expired(); });
-  if (connections.size() >= kMaxConnections) return;
-  const std::shared_ptr<Connection> connection = make_(std::move(socket));
-  connections.push_back(connection);
-  connection->start();
 }
 
 }  // namespace vexa::camera

@@ -2,22 +2,23 @@
 #ifndef VIRTUAL_CAMERA_SERVER_LISTENER_H_
 #define VIRTUAL_CAMERA_SERVER_LISTENER_H_
 
-#include <asio.hpp>
+#include <asio/ip/tcp.hpp>
+#include <asio/steady_timer.hpp>
 #include <cstdint>
 #include <functional>
 #include <memory>
 #include <string>
 
-#include "virtual_camera/server/camera_state.h"
-#include "virtual_camera/server/connection.h"
-
 namespace vexa::camera {
 
+// Lives on the loop's thread.
 class Listener : public std::enable_shared_from_this<Listener> {
  public:
-  using Factory = std::function<std::shared_ptr<Connection>(asio::ip::tcp::socket)>;
+  // Takes a connection that has been accepted.
+  using Take = std::function<void(asio::ip::tcp::socket)>;
 
-  Listener(std::shared_ptr<CameraState> state, Factory make);
+  // The context outlives it.
+  Listener(asio::io_context& context, std::string address, Take take);
 
   // Port 0 takes any free one the first time and the same again later.
   [[nodiscard]] asio::error_code open(std::uint16_t port);
@@ -26,10 +27,9 @@ class Listener : public std::enable_shared_from_this<Listener> {
 
  private:
   void accept();
-  void accepted(asio::ip::tcp::socket socket);
 
-  std::shared_ptr<CameraState> state_;
-  Factory make_;
+  const std::string address_;
+  const Take take_;
   asio::ip::tcp::acceptor acceptor_;
   asio::steady_timer retry_;
   std::uint16_t port_ = 0;

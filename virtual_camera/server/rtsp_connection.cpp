@@ -8,8 +8,8 @@
 
 #include "virtual_camera/card/card_source.h"
 #include "virtual_camera/rtp/udp_port.h"
+#include "virtual_camera/server/camera_state.h"
 #include "virtual_camera/server/session_description.h"
-#include "virtual_camera/source/stream_plan.h"
 #include "virtual_camera/wire/credentials.h"
 #include "virtual_camera/wire/rtsp_message.h"
 
@@ -90,7 +90,7 @@ Answer RtspConnection::describe(const RequestHead& request, std::uint32_t sequen
     return describe_recording(*recording, sequence);
   }
   if (classify_url(request.path) != VideoUrl::kStream) return status_only("404 Not Found", sequence);
-  const auto plan = plan_stream(state(), video_number(request.path));
+  const auto plan = state().sources.plan(video_number(request.path));
   if (!plan) return status_only("404 Not Found", sequence);
   const SourceFormat format = plan->source ? plan->source->format() : SourceFormat{};
   const std::string description = describe_session(state().options, format, kMaxRtspAnswer - kDescribeHead);
@@ -117,7 +117,10 @@ RtspConnection::MediaWay RtspConnection::open_interleaved(const AskedTransport& 
   if (std::max(first, second) >= kChannels) return {};
   next_channel_ = static_cast<std::uint16_t>(std::max(first, second) + 1);
   const CameraOptions& options = state().options;
-  if (!lane_) lane_ = std::make_shared<InterleavedLane>(weak_from_this(), socket(), options.interleaved_patience);
+  if (!lane_) {
+    lane_ = std::make_shared<InterleavedLane>(
+        weak_from_this(), [this] { reset(); }, socket(), options.interleaved_patience);
+  }
   return {std::make_unique<InterleavedPort>(lane_, static_cast<std::uint8_t>(first)),
           fmt::format("RTP/AVP/TCP;unicast;interleaved={}-{}", first, second), options.interleaved_pause};
 }

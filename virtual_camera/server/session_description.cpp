@@ -21,20 +21,20 @@ std::string parameter_sets(const SourceFormat& format) {
 }
 
 // The lines that tell the codec (RFC 6184, 8.2; RFC 3016, 5.2; RFC 2435).
-std::string format_lines(const CameraOptions& options, ImageKind codec, std::string_view sets) {
+std::string format_lines(const CameraOptions& options, Codec codec, std::string_view sets) {
   const auto type = payload_type_of(options, codec);
   switch (codec) {
-    case ImageKind::kJpeg:
+    case Codec::kJpeg:
       return fmt::format("a=rtpmap:{} JPEG/{}\r\n", type, options.clock_rate);
-    case ImageKind::kMpeg4:
+    case Codec::kMpeg4:
       return fmt::format("a=rtpmap:{0} MP4V-ES/{1}\r\na=fmtp:{0} profile-level-id=1\r\n", type, options.clock_rate);
-    case ImageKind::kH264:
+    case Codec::kH264:
       break;
   }
   return fmt::format("a=rtpmap:{0} H264/{1}\r\na=fmtp:{0} packetization-mode=1{2}\r\n", type, options.clock_rate, sets);
 }
 
-std::string description(const CameraOptions& options, ImageKind codec, std::string_view sets) {
+std::string description(const CameraOptions& options, Codec codec, std::string_view sets) {
   const std::string range = options.range_clock.empty() ? "" : fmt::format("a=range:clock={}\r\n", options.range_clock);
   return fmt::format(
       "v=0\r\n"

@@ -25,7 +25,7 @@ HttpStream::HttpStream(std::shared_ptr<const ImageClip> clip, HttpStreamOptions 
 HttpStream::HttpStream(std::string sound, std::size_t unit, HttpStreamOptions options)
     : sound_(std::move(sound)), sound_unit_(unit), options_(std::move(options)) {}
 
-bool HttpStream::is_jpeg() const { return source_ && source_->format().codec == ImageKind::kJpeg; }
+bool HttpStream::is_jpeg() const { return source_ && source_->format().codec == Codec::kJpeg; }
 
 std::string HttpStream::head() const {
   const char* type = is_jpeg() ? "multipart/x-mixed-replace;boundary=picture" : "application/octet-stream";

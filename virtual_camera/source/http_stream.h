@@ -15,28 +15,9 @@
 
 #include "virtual_camera/codec/image_clip.h"
 #include "virtual_camera/source/picture_source.h"
+#include "virtual_camera/values/faults.h"
 
 namespace vexa::camera {
-
-// What goes wrong at one picture or piece of sound, counted from 0 in each stream.
-struct HttpStreamFault {
-  enum class Action {
-    kDataLength,    // "DataLen: " is followed by `text`
-    kNoDataLength,  // the part does not announce its length
-    kBefore,        // `text` stands in front of it
-    kCut,           // only the first `bytes` bytes of it are sent; the stream goes on with the next
-    kClose,         // the connection closes after `bytes` bytes of it
-    kSilence,       // nothing more comes after `bytes` bytes of it
-    kPause,         // it comes later by `time`, and so does all that follows
-    kOtherClip,     // from here on the stream sends the clip of the file `text`, from its beginning
-  };
-
-  std::uint64_t index = 0;
-  Action action = Action::kSilence;
-  std::string text;
-  std::size_t bytes = 0;
-  std::chrono::milliseconds time{0};
-};
 
 struct HttpStreamOptions {
   double units_per_second = 25;  // pictures, or pieces of sound

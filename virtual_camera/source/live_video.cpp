@@ -8,18 +8,18 @@
 namespace vexa::camera {
 namespace {
 
-using LiveClock = std::chrono::steady_clock;
+using Clock = std::chrono::steady_clock;
 
-ImageKind kind_of_live(LiveCodec codec) {
+Codec kind_of_live(Codec codec) {
   switch (codec) {
-    case LiveCodec::kJpeg:
-      return ImageKind::kJpeg;
-    case LiveCodec::kMpeg4:
-      return ImageKind::kMpeg4;
-    case LiveCodec::kH264:
+    case Codec::kJpeg:
+      return Codec::kJpeg;
+    case Codec::kMpeg4:
+      return Codec::kMpeg4;
+    case Codec::kH264:
       break;
   }
-  return ImageKind::kH264;
+  return Codec::kH264;
 }
 
 }  // namespace
@@ -124,19 +124,19 @@ std::chrono::nanoseconds LiveVideo::time_of(std::uint64_t index) const {
 
 // A machine too slow for the rate leaves pictures out; those that it makes keep their times.
 void LiveVideo::run() {
-  const LiveClock::time_point began = LiveClock::now();
+  const Clock::time_point began = Clock::now();
   std::unique_lock<std::mutex> lock(mutex_);
   for (std::uint64_t index = 0; !stopped_;) {
     lock.unlock();
-    make_picture(index, LiveClock::now());
-    const auto late = std::chrono::duration<double>(LiveClock::now() - began).count();
+    make_picture(index, Clock::now());
+    const auto late = std::chrono::duration<double>(Clock::now() - began).count();
     index = std::max(index + 1, static_cast<std::uint64_t>(late * encoding_.frame_rate * speed_));
     lock.lock();
     changed_.wait_until(lock, began + time_of(index), [this] { return stopped_; });
   }
 }
 
-void LiveVideo::make_picture(std::uint64_t index, LiveClock::time_point now) {
+void LiveVideo::make_picture(std::uint64_t index, Clock::time_point now) {
   {
     const std::lock_guard<std::mutex> lock(mutex_);
     if (std::exchange(key_wanted_, false)) encoder_.ask_for_key();

@@ -26,11 +26,11 @@ std::chrono::nanoseconds steady_time(std::uint64_t index, double frames_per_seco
   return std::chrono::nanoseconds(std::llround(static_cast<double>(index) * 1e9 / frames_per_second));
 }
 
-SourceFormat source_format(ImageKind codec, std::string_view first_picture, double frames_per_second) {
+SourceFormat source_format(Codec codec, std::string_view first_picture, double frames_per_second) {
   SourceFormat format;
   format.codec = codec;
   format.frames_per_second = frames_per_second;
-  if (codec != ImageKind::kH264) return format;
+  if (codec != Codec::kH264) return format;
   const Clip clip = Clip::from_annex_b(first_picture);
   if (clip.access_units().empty()) return format;
   format.sequence_parameters = first_unit_of(clip.access_units().front(), kSequenceParameters);

@@ -19,7 +19,7 @@ class PacketisedPicture;
 
 // A coded picture on its way to one taker. What it points to is immutable and may be shared by any number of takers.
 struct SourcePicture {
-  ImageKind codec = ImageKind::kH264;
+  Codec codec = Codec::kH264;
   bool key = false;                                  // needs no picture before it
   std::shared_ptr<const std::string> bytes;          // H.264 behind start codes of four bytes throughout; never null
   std::shared_ptr<const PacketisedPicture> packets;  // the same as RTP payloads, where it was cut before; else null
@@ -32,7 +32,7 @@ struct SourcePicture {
 
 // What is known of a source's pictures before the first of them.
 struct SourceFormat {
-  ImageKind codec = ImageKind::kH264;
+  Codec codec = Codec::kH264;
   double frames_per_second = 25;
   // Whether pictures take user data on their way out: the options', or where the camera looks now. Else they leave as
   // they are, like recordings.
@@ -65,7 +65,7 @@ class PictureSource {
 [[nodiscard]] std::chrono::nanoseconds steady_time(std::uint64_t index, double frames_per_second);
 
 // The format of pictures that begin with this one.
-[[nodiscard]] SourceFormat source_format(ImageKind codec, std::string_view first_picture, double frames_per_second);
+[[nodiscard]] SourceFormat source_format(Codec codec, std::string_view first_picture, double frames_per_second);
 
 }  // namespace vexa::camera
 

@@ -9,12 +9,12 @@
 #include <string>
 #include <vector>
 
-#include "virtual_camera/scene/alarm_scene.h"
-#include "virtual_camera/source/http_stream.h"
+#include "virtual_camera/values/alarm_layout.h"
 #include "virtual_camera/values/faults.h"
 
 namespace vexa::camera {
 
+class ImageClip;
 class PacketisedClip;
 class SettingRules;
 

@@ -2,9 +2,9 @@
 
 #include <fmt/format.h>
 
-#include <charconv>
 #include <cstddef>
-#include <system_error>
+
+#include "virtual_camera/values/number_text.h"
 
 namespace vexa::camera {
 
@@ -16,8 +16,9 @@ std::optional<std::string> percent_decoded(std::string_view text) {
     if (text.front() == '%') {
       length = 3;
       if (text.size() < length) return std::nullopt;
-      const auto [end, error] = std::from_chars(text.data() + 1, text.data() + length, value, 16);
-      if (error != std::errc() || end != text.data() + length) return std::nullopt;
+      const auto code = whole_number<unsigned>(text.substr(1, 2), 16);
+      if (!code) return std::nullopt;
+      value = *code;
     }
     bytes += static_cast<char>(value);
     text.remove_prefix(length);

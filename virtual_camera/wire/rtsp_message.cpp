@@ -3,23 +3,15 @@
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <charconv>
 #include <limits>
 #include <utility>
+
+#include "virtual_camera/values/number_text.h"
 
 namespace vexa::camera {
 namespace {
 
 constexpr std::string_view kVideoStem = "/media/video";
-
-// The digits at the start of a text as a number; nothing when there are none or it is out of range.
-template <typename Number>
-std::optional<Number> leading_number(std::string_view text) {
-  Number number{};
-  const auto result = std::from_chars(text.data(), text.data() + text.size(), number);
-  if (result.ec != std::errc{}) return std::nullopt;
-  return number;
-}
 
 bool all_digits(std::string_view text) {
   return !text.empty() && text.find_first_not_of("0123456789") == std::string_view::npos;

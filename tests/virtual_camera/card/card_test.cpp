@@ -22,7 +22,7 @@ constexpr microseconds kStart = 1706745599s + 250ms;  // 2024-01-31 23:59:59.25
 
 RecordingHead jpeg_head() {
   RecordingHead head;
-  head.codec = ImageKind::kJpeg;
+  head.codec = Codec::kJpeg;
   head.size = "640,480";
   head.frame_rate = 5;
   head.quality = 7;
@@ -63,7 +63,7 @@ TEST(Card, ListsABitRateForCodecsWithoutAQuality) {
   RecordingHead head;
   head.bit_rate = 8000;
   Card card(100);
-  for (const ImageKind codec : {ImageKind::kH264, ImageKind::kMpeg4}) {
+  for (const Codec codec : {Codec::kH264, Codec::kMpeg4}) {
     head.codec = codec;
     record(card, 0, head);
   }

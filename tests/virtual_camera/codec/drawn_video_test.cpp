@@ -10,6 +10,7 @@
 #include "tests/support/temporary_folder.h"
 #include "virtual_camera/codec/clip.h"
 #include "virtual_camera/codec/rtp_packetiser.h"
+#include "virtual_camera/source/drawn_source.h"
 
 namespace vexa::camera {
 namespace {
@@ -61,15 +62,15 @@ TEST(DrawnVideo, ADecoderFindsEveryPictureInTheSizeAskedFor) {
 }
 
 TEST(DrawnVideo, BeginsEachSecondWithAKeyPicture) {
-  for (const ImageKind codec : {ImageKind::kH264, ImageKind::kMpeg4, ImageKind::kJpeg}) {
+  for (const Codec codec : {Codec::kH264, Codec::kMpeg4, Codec::kJpeg}) {
     DrawnSource source(codec, {320, 240, 5});
     EXPECT_EQ(source.format().codec, codec);
     EXPECT_EQ(source.format().frames_per_second, 5);
-    EXPECT_EQ(source.format().sequence_parameters.empty(), codec != ImageKind::kH264);
+    EXPECT_EQ(source.format().sequence_parameters.empty(), codec != Codec::kH264);
     for (std::uint64_t i = 0; i < 12; ++i) {
       const auto picture = source.next();
       ASSERT_TRUE(picture);
-      EXPECT_EQ(picture->key, codec == ImageKind::kJpeg || i % 5 == 0) << i;
+      EXPECT_EQ(picture->key, codec == Codec::kJpeg || i % 5 == 0) << i;
       EXPECT_EQ(is_key_picture(codec, *picture->bytes), picture->key) << i;
       EXPECT_EQ(picture->due, std::chrono::milliseconds(200 * i));
     }
@@ -88,9 +89,9 @@ TEST(DrawnVideo, ChangesFromPictureToPicture) {
 TEST(DrawnVideo, RtpCarriesItsPictures) {
   const DrawnVideo video{640, 368, 5};
   for (std::uint64_t i = 0; i < 6; ++i) {
-    EXPECT_TRUE(packetise(ImageKind::kH264, draw_h264(video, i), "", 1400)) << i;
-    EXPECT_TRUE(packetise(ImageKind::kMpeg4, draw_mpeg4(video, i), "", 1400)) << i;
-    EXPECT_TRUE(packetise(ImageKind::kJpeg, draw_jpeg(video, i), "", 1400)) << i;
+    EXPECT_TRUE(packetise(Codec::kH264, draw_h264(video, i), "", 1400)) << i;
+    EXPECT_TRUE(packetise(Codec::kMpeg4, draw_mpeg4(video, i), "", 1400)) << i;
+    EXPECT_TRUE(packetise(Codec::kJpeg, draw_jpeg(video, i), "", 1400)) << i;
   }
 }
 

@@ -37,17 +37,17 @@ TEST(ImageClip, CutsMpeg4PicturesBehindTheCodedPicture) {
 
 TEST(ImageClip, PutsUserDataWhereItsKindHasIt) {
   const std::string text = "CamPos: 1";
-  EXPECT_EQ(with_user_data(ImageKind::kJpeg, jpeg("x"), text), std::string("\xff\xd8\xff\xfe\0\x0b"
-                                                                           "CamPos: 1",
-                                                                           15) +
-                                                                   jpeg("x").substr(2));
+  EXPECT_EQ(with_user_data(Codec::kJpeg, jpeg("x"), text), std::string("\xff\xd8\xff\xfe\0\x0b"
+                                                                       "CamPos: 1",
+                                                                       15) +
+                                                               jpeg("x").substr(2));
   const std::string slice = std::string("\0\0\0\1", 4) + "eslice";
-  EXPECT_EQ(with_user_data(ImageKind::kH264, slice, text),
+  EXPECT_EQ(with_user_data(Codec::kH264, slice, text),
             std::string("\0\0\0\1\6\5\x19", 7) + std::string(16, 'u') + text + "\x80" + slice);
   const std::string key = unit('\xb0', "sequence") + unit('\xb6', "picture");
-  EXPECT_EQ(with_user_data(ImageKind::kMpeg4, key, text),
+  EXPECT_EQ(with_user_data(Codec::kMpeg4, key, text),
             unit('\xb0', "sequence") + unit('\xb2', text) + unit('\xb6', "picture"));
-  for (const ImageKind kind : {ImageKind::kJpeg, ImageKind::kH264, ImageKind::kMpeg4}) {
+  for (const Codec kind : {Codec::kJpeg, Codec::kH264, Codec::kMpeg4}) {
     EXPECT_EQ(with_user_data(kind, key, ""), key);
   }
 }
@@ -55,11 +55,10 @@ TEST(ImageClip, PutsUserDataWhereItsKindHasIt) {
 TEST(ImageClip, LoadsEveryKindByItsExtension) {
   const struct {
     const char* file;
-    ImageKind kind;
+    Codec kind;
     std::size_t pictures;
-  } cases[] = {{"/small.mjpeg", ImageKind::kJpeg, 50},
-               {"/small.h264", ImageKind::kH264, 250},
-               {"/small.m4v", ImageKind::kMpeg4, 100}};
+  } cases[] = {
+      {"/small.mjpeg", Codec::kJpeg, 50}, {"/small.h264", Codec::kH264, 250}, {"/small.m4v", Codec::kMpeg4, 100}};
   for (const auto& c : cases) {
     const auto clip = ImageClip::load(std::string(VEXA_CLIPS) + c.file);
     ASSERT_NE(clip, nullptr) << c.file;

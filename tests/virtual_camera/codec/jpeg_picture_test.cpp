@@ -103,13 +103,13 @@ TEST(PacketiseMpeg4, CutsThePictureIntoPieces) {
 TEST(PacketisedClip, KnowsTheCodecAndTheKeyPicturesOfItsFile) {
   const auto mpeg4 = PacketisedClip::load(VEXA_CLIPS "/small.m4v", 1400);
   ASSERT_TRUE(mpeg4);
-  EXPECT_EQ(mpeg4->codec(), ImageKind::kMpeg4);
+  EXPECT_EQ(mpeg4->codec(), Codec::kMpeg4);
   EXPECT_TRUE(mpeg4->is_key(0));
   EXPECT_FALSE(mpeg4->is_key(1));
   EXPECT_TRUE(mpeg4->is_key(25));
   const auto jpeg = PacketisedClip::load(VEXA_CLIPS "/plain.mjpeg", 1400);
   ASSERT_TRUE(jpeg);
-  EXPECT_EQ(jpeg->codec(), ImageKind::kJpeg);
+  EXPECT_EQ(jpeg->codec(), Codec::kJpeg);
   EXPECT_TRUE(jpeg->is_key(1));
   EXPECT_FALSE(PacketisedClip::load(VEXA_CLIPS "/small.mjpeg", 1400)) << "RTP cannot carry its Huffman tables";
 }

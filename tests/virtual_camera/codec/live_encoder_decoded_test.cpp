@@ -31,9 +31,7 @@ I420Picture seen(int index, PictureSize size = kEncodedSize) {
   return picture;
 }
 
-LiveEncoding small_encoding(LiveCodec codec) {
-  return {codec, kEncodedSize.width, kEncodedSize.height, 25, 1000, 8, 5};
-}
+LiveEncoding small_encoding(Codec codec) { return {codec, kEncodedSize.width, kEncodedSize.height, 25, 1000, 8, 5}; }
 
 EncodedPicture encoded(LiveEncoder& encoder, const I420Picture& picture) {
   auto result = encoder.encode(picture);
@@ -80,7 +78,7 @@ double signal_to_noise(const std::uint8_t* original, const char* decoded, std::s
 }
 
 struct EncoderCase {
-  LiveCodec codec;
+  Codec codec;
   const char* format;
   const char* name;
 };
@@ -101,7 +99,7 @@ TEST_P(LiveEncoderOf, GivesOneAccessUnitAPictureThatDecodesToIt) {
 }
 
 TEST_P(LiveEncoderOf, MakesKeyPicturesAtTheIntervalAndWhenAsked) {
-  const bool all = GetParam().codec == LiveCodec::kJpeg;
+  const bool all = GetParam().codec == Codec::kJpeg;
   auto opened = LiveEncoder::open(small_encoding(GetParam().codec));
   auto& encoder = std::get<LiveEncoder>(opened);
   std::string keys;
@@ -125,7 +123,7 @@ TEST_P(LiveEncoderOf, EncodesAtEveryRateAndInTheLeastAndOddestSizes) {
     LiveEncoding encoding = small_encoding(GetParam().codec);
     encoding.frame_rate = rate;
     encoding.key_interval = 0;
-    EXPECT_EQ(encode_all(encoding, 2).back().key, GetParam().codec == LiveCodec::kJpeg || rate == 1) << rate;
+    EXPECT_EQ(encode_all(encoding, 2).back().key, GetParam().codec == Codec::kJpeg || rate == 1) << rate;
   }
   for (const PictureSize size : {PictureSize{48, 32}, {176, 150}}) {
     LiveEncoding encoding = small_encoding(GetParam().codec);
@@ -152,13 +150,13 @@ TEST_P(LiveEncoderOf, MakesMoreBytesOfMoreBitsOrBetterQuality) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Codecs, LiveEncoderOf,
-                         testing::Values(EncoderCase{LiveCodec::kJpeg, "mjpeg", "Jpeg"},
-                                         EncoderCase{LiveCodec::kMpeg4, "m4v", "Mpeg4"},
-                                         EncoderCase{LiveCodec::kH264, "h264", "H264"}),
+                         testing::Values(EncoderCase{Codec::kJpeg, "mjpeg", "Jpeg"},
+                                         EncoderCase{Codec::kMpeg4, "m4v", "Mpeg4"},
+                                         EncoderCase{Codec::kH264, "h264", "H264"}),
                          [](const auto& tested) { return std::string(tested.param.name); });
 
 TEST(LiveH264, BeginsKeyPicturesWithParameterSetsAndHasNoOtherUnits) {
-  for (const EncodedPicture& picture : encode_all(small_encoding(LiveCodec::kH264), 6)) {
+  for (const EncodedPicture& picture : encode_all(small_encoding(Codec::kH264), 6)) {
     const Clip clip = Clip::from_annex_b(picture.bytes);
     ASSERT_EQ(clip.access_units().size(), 1U);
     std::vector<int> types;
@@ -169,7 +167,7 @@ TEST(LiveH264, BeginsKeyPicturesWithParameterSetsAndHasNoOtherUnits) {
 }
 
 TEST(LiveMpeg4, BeginsKeyPicturesWithHeadersAndHasNoUserData) {
-  for (const EncodedPicture& picture : encode_all(small_encoding(LiveCodec::kMpeg4), 6)) {
+  for (const EncodedPicture& picture : encode_all(small_encoding(Codec::kMpeg4), 6)) {
     const std::string bytes(picture.bytes.begin(), picture.bytes.end());
     const std::string start("\0\0\1", 3);
     EXPECT_EQ(bytes.substr(0, 4), start + (picture.key ? "\xB0" : "\xB6"));
@@ -199,7 +197,7 @@ long jpeg_warnings(const std::vector<std::uint8_t>& file) {
 
 TEST(LiveJpeg, CanTravelOverRtpAtEveryQualityAndDecodesWithoutAWarning) {
   for (int quality = 1; quality <= 10; ++quality) {
-    LiveEncoding encoding = small_encoding(LiveCodec::kJpeg);
+    LiveEncoding encoding = small_encoding(Codec::kJpeg);
     encoding.quality = quality;
     const auto pictures = encode_all(encoding, 1);
     const auto jpeg = read_jpeg(pictures.front().bytes);

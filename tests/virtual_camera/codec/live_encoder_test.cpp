@@ -12,14 +12,14 @@ std::string refusal_of(const LiveEncoding& encoding) {
 }
 
 TEST(LiveEncoder, OpensWhereTheBuildHasEncodersAndElseSaysWhyNot) {
-  for (const LiveCodec codec : {LiveCodec::kJpeg, LiveCodec::kMpeg4, LiveCodec::kH264}) {
+  for (const Codec codec : {Codec::kJpeg, Codec::kMpeg4, Codec::kH264}) {
     EXPECT_EQ(refusal_of({codec, 320, 192}), has_live_encoders() ? "" : "this build is without FFmpeg's libraries");
   }
 }
 
 TEST(LiveEncoder, RefusesWhatNoPictureCanBe) {
   if (!has_live_encoders()) GTEST_SKIP() << "built without FFmpeg's libraries";
-  for (const LiveCodec codec : {LiveCodec::kJpeg, LiveCodec::kMpeg4, LiveCodec::kH264}) {
+  for (const Codec codec : {Codec::kJpeg, Codec::kMpeg4, Codec::kH264}) {
     for (const auto& [width, height] : {std::pair(0, 192), {320, 0}, {-2, 192}, {319, 192}, {320, 191}}) {
       EXPECT_EQ(refusal_of({codec, width, height}), "sides of a picture are even and at least 2");
     }

@@ -87,13 +87,13 @@ std::string with_code(char code, const std::string& rest) { return std::string("
 
 TEST(RtpPacketiser, ATextOfH264GoesBeforeTheFirstSlice) {
   const std::string code("\0\0\0\1", 4);
-  const auto key = packetise(ImageKind::kH264, code + "gsps" + code + "hpps" + code + "e\x88idr", "CamPos: 1", 1400);
+  const auto key = packetise(Codec::kH264, code + "gsps" + code + "hpps" + code + "e\x88idr", "CamPos: 1", 1400);
   ASSERT_TRUE(key);
   ASSERT_EQ(key->packets(), 4U);
   EXPECT_EQ(payload_text(*key, 1), "hpps");
   EXPECT_EQ(payload_text(*key, 2), "\6\5\x19" + std::string(16, 'u') + "CamPos: 1\x80");
   EXPECT_EQ(payload_text(*key, 3), "e\x88idr");
-  const auto delta = packetise(ImageKind::kH264, code + "A\x9apicture", "CamPos: 1", 1400);
+  const auto delta = packetise(Codec::kH264, code + "A\x9apicture", "CamPos: 1", 1400);
   ASSERT_TRUE(delta);
   ASSERT_EQ(delta->packets(), 2U);
   EXPECT_EQ(payload_text(*delta, 1), "A\x9apicture");
@@ -102,16 +102,16 @@ TEST(RtpPacketiser, ATextOfH264GoesBeforeTheFirstSlice) {
 TEST(RtpPacketiser, ATextOfMpeg4LeavesThePicturesKindAtItsFront) {
   const std::string key = with_code('\xb0', "sequence") + with_code('\xb6', "plane");
   const std::string told = with_code('\xb0', "sequence") + with_code('\xb2', "CamPos: 1") + with_code('\xb6', "plane");
-  EXPECT_EQ(payload_text(*packetise(ImageKind::kMpeg4, key, "CamPos: 1", 1400), 0), told);
+  EXPECT_EQ(payload_text(*packetise(Codec::kMpeg4, key, "CamPos: 1", 1400), 0), told);
   const std::string delta = with_code('\xb6', "plane");
-  EXPECT_EQ(payload_text(*packetise(ImageKind::kMpeg4, delta, "CamPos: 1", 1400), 0),
+  EXPECT_EQ(payload_text(*packetise(Codec::kMpeg4, delta, "CamPos: 1", 1400), 0),
             with_code('\1', "") + with_code('\xb2', "CamPos: 1") + delta);
-  EXPECT_EQ(payload_text(*packetise(ImageKind::kMpeg4, delta, "", 1400), 0), delta);
+  EXPECT_EQ(payload_text(*packetise(Codec::kMpeg4, delta, "", 1400), 0), delta);
 }
 
 TEST(RtpPacketiser, WhatRtpCannotCarryIsNothing) {
-  EXPECT_FALSE(packetise(ImageKind::kH264, "no unit", "", 1400));
-  EXPECT_FALSE(packetise(ImageKind::kJpeg, "no picture", "", 1400));
+  EXPECT_FALSE(packetise(Codec::kH264, "no unit", "", 1400));
+  EXPECT_FALSE(packetise(Codec::kJpeg, "no picture", "", 1400));
 }
 
 TEST(RtpPacketiser, AMissingFileIsNoClip) { EXPECT_EQ(PacketisedClip::load("/nowhere/clip.h264", 1400), nullptr); }

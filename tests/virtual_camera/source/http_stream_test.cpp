@@ -7,7 +7,7 @@ namespace {
 
 using Action = HttpStreamFault::Action;
 
-std::shared_ptr<const ImageClip> clip(ImageKind kind) {
+std::shared_ptr<const ImageClip> clip(Codec kind) {
   return std::make_shared<const ImageClip>(kind, std::vector<std::string>{"one", "two", "three"});
 }
 
@@ -24,7 +24,7 @@ std::string sent(HttpStream& stream, int most = 100) {
 
 std::string elementary(HttpStreamOptions options) {
   options.loop = false;
-  HttpStream stream(clip(ImageKind::kH264), std::move(options));
+  HttpStream stream(clip(Codec::kH264), std::move(options));
   const std::string text = sent(stream);
   return text + (stream.closes() ? "" : "|silent");
 }
@@ -40,22 +40,22 @@ std::string part(const std::string& lines, const std::string& picture) {
 }
 
 TEST(HttpStream, PutsEachJpegPictureIntoAPartOfItsOwn) {
-  HttpStream stream(clip(ImageKind::kJpeg), {});
+  HttpStream stream(clip(Codec::kJpeg), {});
   EXPECT_NE(stream.head().find("multipart/x-mixed-replace"), std::string::npos);
   EXPECT_EQ(sent(stream, 2), part("DataLen: 3\r\n", "one") + "|" + part("DataLen: 3\r\n", "two"));
 }
 
 TEST(HttpStream, SendsElementaryStreamsAsTheyAre) {
   EXPECT_EQ(elementary({}), "one|two|three");
-  EXPECT_EQ(HttpStream(clip(ImageKind::kMpeg4), {}).head().find("multipart"), std::string::npos);
+  EXPECT_EQ(HttpStream(clip(Codec::kMpeg4), {}).head().find("multipart"), std::string::npos);
 }
 
 TEST(HttpStream, StartsOverUnlessItIsToldToEnd) {
-  HttpStream stream(clip(ImageKind::kH264), {});
+  HttpStream stream(clip(Codec::kH264), {});
   EXPECT_EQ(sent(stream, 4), "one|two|three|one");
   HttpStreamOptions four;
   four.units = 4;
-  HttpStream ending(clip(ImageKind::kH264), four);
+  HttpStream ending(clip(Codec::kH264), four);
   EXPECT_EQ(sent(ending), "one|two|three|one");
 }
 
@@ -64,7 +64,7 @@ TEST(HttpStream, GivesEachUnitItsTime) {
   options.units_per_second = 10;
   options.piece = 2;
   options.faults.push_back({2, Action::kPause, "", 0, std::chrono::milliseconds(50)});
-  HttpStream stream(clip(ImageKind::kH264), options);
+  HttpStream stream(clip(Codec::kH264), options);
   const int due[] = {0, 0, 100, 100, 250, 250, 250, 350};
   for (const int after : due) EXPECT_EQ(stream.next()->due, std::chrono::milliseconds(after));
 }
@@ -93,17 +93,17 @@ TEST(HttpStream, ShowsEachFaultAtItsUnit) {
 }
 
 TEST(HttpStream, LiesAboutTheLengthOfAPart) {
-  HttpStream lie(clip(ImageKind::kJpeg), with_fault(Action::kDataLength, "-7"));
+  HttpStream lie(clip(Codec::kJpeg), with_fault(Action::kDataLength, "-7"));
   sent(lie, 1);
   EXPECT_EQ(sent(lie, 1), part("DataLen: -7\r\n", "two"));
-  HttpStream none(clip(ImageKind::kJpeg), with_fault(Action::kNoDataLength));
+  HttpStream none(clip(Codec::kJpeg), with_fault(Action::kNoDataLength));
   sent(none, 1);
   EXPECT_EQ(sent(none, 1), part("", "two"));
 }
 
 TEST(HttpStream, OfAnotherClipBeginsWithItsFirstPicture) {
   const auto other = ImageClip::load(VEXA_CLIPS "/small.m4v");
-  HttpStream stream(clip(ImageKind::kH264), with_fault(Action::kOtherClip, VEXA_CLIPS "/small.m4v"));
+  HttpStream stream(clip(Codec::kH264), with_fault(Action::kOtherClip, VEXA_CLIPS "/small.m4v"));
   EXPECT_EQ(sent(stream, 3), "one|" + other->pictures()[0] + "|" + other->pictures()[1]);
 }
 

@@ -38,7 +38,7 @@ SourcePicture next_picture(PictureSource& source) {
   }
 }
 
-class LiveVideoTest : public testing::TestWithParam<LiveCodec> {
+class LiveVideoTest : public testing::TestWithParam<Codec> {
  protected:
   void SetUp() override {
     if (!has_live_encoders()) GTEST_SKIP() << "this build has no encoders";
@@ -82,7 +82,7 @@ TEST_P(LiveVideoTest, EachWhoWatchesBeginsWithAKeyPictureAndADecoderFindsThemAll
     later_bytes += *same.bytes;
   }
   const vexa_test::TemporaryFolder folder(vexa_test::memory_folder());
-  const char* format = GetParam() == LiveCodec::kJpeg ? "mjpeg" : GetParam() == LiveCodec::kMpeg4 ? "m4v" : "h264";
+  const char* format = GetParam() == Codec::kJpeg ? "mjpeg" : GetParam() == Codec::kMpeg4 ? "m4v" : "h264";
   const auto all = vexa_test::decode(folder.make_file("all", bytes), format);
   EXPECT_TRUE(all.flawless);
   EXPECT_EQ(all.frames, 12U);
@@ -104,7 +104,7 @@ TEST_P(LiveVideoTest, EndsWithTheLastWhoWatches) {
   EXPECT_TRUE(video.expired());
 }
 
-INSTANTIATE_TEST_SUITE_P(Of, LiveVideoTest, testing::Values(LiveCodec::kJpeg, LiveCodec::kMpeg4, LiveCodec::kH264));
+INSTANTIATE_TEST_SUITE_P(Of, LiveVideoTest, testing::Values(Codec::kJpeg, Codec::kMpeg4, Codec::kH264));
 
 TEST(LiveVideo, SaysWhyThereIsNone) {
   LiveEncoding encoding;

@@ -144,7 +144,7 @@ TEST(SessionDescription, NamesThePayloadTheClockAndTheTrack) {
 
 TEST(SessionDescription, ParameterSetsAreNamedWhereTheyFit) {
   const std::string bytes("\0\0\1\x67\x42\xC0\x1E\x55\0\0\1\x68\xCE\0\0\1\x65\x88", 18);
-  const SourceFormat format = source_format(ImageKind::kH264, bytes, 25);
+  const SourceFormat format = source_format(Codec::kH264, bytes, 25);
   CameraOptions options;
   const std::string sets = ";profile-level-id=42c01e;sprop-parameter-sets=Z0LAHlU=,aM4=\r\n";
   const std::string whole = describe_session(options, format, 500);

@@ -1,12 +1,16 @@
 // What the streams of a camera send as they are set.
-#include "virtual_camera/source/stream_plan.h"
+#include "virtual_camera/source/stream_sources.h"
 
 #include <gtest/gtest.h>
 
 #include <chrono>
+#include <memory>
 #include <string>
 #include <utility>
+#include <variant>
 
+#include "virtual_camera/model/camera_profile.h"
+#include "virtual_camera/model/setting_rules.h"
 #include "virtual_camera/source/clip_source.h"
 
 namespace vexa::camera {
@@ -14,48 +18,58 @@ namespace {
 
 /// A camera that does not run.
 struct IdleCamera {
-  explicit IdleCamera(CameraOptions options) : state(std::move(options), context) {}
+  explicit IdleCamera(CameraOptions of, PoseSource pose = nullptr)
+      : options(std::move(of)),
+        scene(settings, alarms, stage, std::move(pose), nullptr),
+        sources(options, settings, scene) {
+    if (options.profile) settings.obey(options.profile);
+  }
 
-  asio::io_context context;
-  CameraState state;
+  CameraOptions options;
+  SettingsStore settings;
+  AlarmScene alarms{AlarmLayout{}};
+  SceneStage stage;
+  LiveScene scene;
+  StreamSources sources;
 };
 
 CameraOptions of_profile(const std::string& model) {
   CameraOptions options;
-  options.profile_path = VEXA_SOURCE_DIR "/models/profiles/" + model + ".json";
+  auto profile = load_camera_profile(VEXA_SOURCE_DIR "/models/profiles/" + model + ".json");
+  options.profile = std::make_shared<const SettingRules>(std::get<CameraProfile>(std::move(profile)));
   return options;
 }
 
-TEST(StreamPlan, FollowsTheSettingsOfTheStream) {
+TEST(StreamSources, FollowsTheSettingsOfTheStream) {
   IdleCamera camera(of_profile("LMX-H100"));
-  SettingsStore& settings = camera.state.settings;
+  SettingsStore& settings = camera.settings;
   ASSERT_TRUE(settings.apply("camera", "ImageCodec1=h264&ImageSize1=320,192&FrameRate1=10&BitRate1=512"));
-  const auto plan = plan_stream(camera.state, 1);
+  const auto plan = camera.sources.plan(1);
   ASSERT_TRUE(plan && plan->source);
-  EXPECT_EQ(plan->source->format().codec, ImageKind::kH264);
+  EXPECT_EQ(plan->source->format().codec, Codec::kH264);
   EXPECT_EQ(plan->source->format().frames_per_second, 10);
   EXPECT_EQ(stream_settings(settings, 1)->width, 320);
   EXPECT_EQ(stream_settings(settings, 1)->height, 192);
   ASSERT_TRUE(settings.apply("camera", "ImageCodec2=off"));
-  EXPECT_FALSE(plan_stream(camera.state, 2)) << "switched off";
-  EXPECT_FALSE(plan_stream(camera.state, 3)) << "not there";
-  EXPECT_EQ(plan_images(camera.state, 2), nullptr) << "switched off";
-  EXPECT_EQ(plan_images(camera.state, 3), nullptr) << "not there";
+  EXPECT_FALSE(camera.sources.plan(2)) << "switched off";
+  EXPECT_FALSE(camera.sources.plan(3)) << "not there";
+  EXPECT_EQ(camera.sources.open_images(2), nullptr) << "switched off";
+  EXPECT_EQ(camera.sources.open_images(3), nullptr) << "not there";
 }
 
-TEST(StreamPlan, DrawsInEveryCodecOfTheSettings) {
+TEST(StreamSources, DrawsInEveryCodecOfTheSettings) {
   IdleCamera camera(of_profile("LMX-H100"));
   const struct {
     const char* command;
-    ImageKind codec;
-  } cases[] = {{"ImageCodec1=jpeg&ImageSize1=640,368&FrameRate1=5&Quality1=5", ImageKind::kJpeg},
-               {"ImageCodec1=mpeg4&ImageSize1=640,368&FrameRate1=5&BitRate1=512", ImageKind::kMpeg4},
-               {"ImageCodec1=h264&ImageSize1=640,368&FrameRate1=5&BitRate1=512", ImageKind::kH264}};
+    Codec codec;
+  } cases[] = {{"ImageCodec1=jpeg&ImageSize1=640,368&FrameRate1=5&Quality1=5", Codec::kJpeg},
+               {"ImageCodec1=mpeg4&ImageSize1=640,368&FrameRate1=5&BitRate1=512", Codec::kMpeg4},
+               {"ImageCodec1=h264&ImageSize1=640,368&FrameRate1=5&BitRate1=512", Codec::kH264}};
   for (const auto& c : cases) {
-    ASSERT_TRUE(camera.state.settings.apply("camera", c.command)) << c.command;
-    const auto plan = plan_stream(camera.state, 1);
+    ASSERT_TRUE(camera.settings.apply("camera", c.command)) << c.command;
+    const auto plan = camera.sources.plan(1);
     ASSERT_TRUE(plan && plan->source) << c.command;
-    const auto images = plan_images(camera.state, 1);
+    const auto images = camera.sources.open_images(1);
     ASSERT_NE(images, nullptr) << c.command;
     for (const PictureSource* source : {plan->source.get(), images.get()}) {
       EXPECT_EQ(source->format().codec, c.codec) << c.command;
@@ -64,40 +78,38 @@ TEST(StreamPlan, DrawsInEveryCodecOfTheSettings) {
   }
 }
 
-TEST(StreamPlan, WithoutAProfileIsTheClip) {
+TEST(StreamSources, WithoutAProfileIsTheClip) {
   CameraOptions options;
   IdleCamera silent(options);
-  const auto nothing = plan_stream(silent.state, 7);
+  const auto nothing = silent.sources.plan(7);
   ASSERT_TRUE(nothing);
   EXPECT_EQ(nothing->source, nullptr);
-  EXPECT_EQ(plan_images(silent.state, 7), nullptr);
+  EXPECT_EQ(silent.sources.open_images(7), nullptr);
   options.clip = PacketisedClip::load(VEXA_CLIPS "/small.m4v", 1400);
   options.images = ImageClip::load(VEXA_CLIPS "/small.mjpeg");
   options.frames_per_second = 7;
   IdleCamera camera(options);
-  const auto plan = plan_stream(camera.state, 7);
+  const auto plan = camera.sources.plan(7);
   ASSERT_TRUE(plan && plan->source);
-  EXPECT_EQ(plan->source->format().codec, ImageKind::kMpeg4);
+  EXPECT_EQ(plan->source->format().codec, Codec::kMpeg4);
   EXPECT_EQ(plan->source->format().frames_per_second, 7);
-  const auto images = plan_images(camera.state, 7);
+  const auto images = camera.sources.open_images(7);
   ASSERT_NE(images, nullptr);
-  EXPECT_EQ(images->format().codec, ImageKind::kJpeg);
+  EXPECT_EQ(images->format().codec, Codec::kJpeg);
 }
 
-TEST(StreamPlan, UserDataAreTheOptionsOrWhereTheCameraLooks) {
+TEST(StreamSources, UserDataAreTheOptionsOrWhereTheCameraLooks) {
   CameraOptions options;
-  IdleCamera still(options);
-  EXPECT_EQ(present_user_data(still.state), "");
+  EXPECT_EQ(IdleCamera(options).sources.present_user_data(), "");
   int calls = 0;
-  still.state.pose = [&calls](std::chrono::steady_clock::time_point) {
+  const auto pose = [&calls](std::chrono::steady_clock::time_point) {
     return CameraPose{0, 0, 60, "CamPos: " + std::to_string(++calls)};
   };
-  EXPECT_EQ(present_user_data(still.state), "CamPos: 1");
-  EXPECT_EQ(present_user_data(still.state), "CamPos: 2");
+  const IdleCamera moving(options, pose);
+  EXPECT_EQ(moving.sources.present_user_data(), "CamPos: 1");
+  EXPECT_EQ(moving.sources.present_user_data(), "CamPos: 2");
   options.user_data = "CamPos: fixed";
-  IdleCamera fixed(options);
-  fixed.state.pose = still.state.pose;
-  EXPECT_EQ(present_user_data(fixed.state), "CamPos: fixed");
+  EXPECT_EQ(IdleCamera(options, pose).sources.present_user_data(), "CamPos: fixed");
 }
 
 TEST(ClipSource, HandsOutEveryPictureWithItsTimeWithoutACopy) {

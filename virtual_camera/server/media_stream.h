@@ -1,0 +1,35 @@
+// "/imageN" and "/audio": a stream of pictures or sound as the body of an HTTP answer.
+#ifndef VIRTUAL_CAMERA_SERVER_MEDIA_STREAM_H_
+#define VIRTUAL_CAMERA_SERVER_MEDIA_STREAM_H_
+
+#include <memory>
+#include <string>
+
+#include "virtual_camera/server/http_body.h"
+#include "virtual_camera/source/http_stream.h"
+
+namespace vexa::camera {
+
+struct CameraState;
+
+class MediaStream : public HttpBody {
+ public:
+  explicit MediaStream(HttpStream stream);
+
+  [[nodiscard]] std::string head() const override { return stream_.head(); }
+  void go_on(Line& line) override;
+
+ private:
+  HttpStream stream_;
+  bool begun_ = false;
+  Clock::time_point began_;
+};
+
+// The pictures of stream `number`; null where the camera has none.
+[[nodiscard]] std::unique_ptr<HttpBody> open_image_stream(const std::shared_ptr<CameraState>& state, int number);
+// The sound in the codec that is set; null where the camera has none.
+[[nodiscard]] std::unique_ptr<HttpBody> open_sound_stream(const std::shared_ptr<CameraState>& state);
+
+}  // namespace vexa::camera
+
+#endif  // VIRTUAL_CAMERA_SERVER_MEDIA_STREAM_H_
