@@ -15,8 +15,8 @@
 
 #include "device/driver_state.h"
 #include "vexa/vexa_common.h"
-#include "virtual_camera/options.h"
-#include "virtual_camera/rtp_stream.h"
+#include "virtual_camera/rtp/rtp_stream.h"
+#include "virtual_camera/values/options.h"
 
 namespace {
 

@@ -23,7 +23,7 @@
 #include <vector>
 
 #include "vexa/vexa_common.h"
-#include "virtual_camera/rtp_packetiser.h"
+#include "virtual_camera/codec/rtp_packetiser.h"
 #include "virtual_camera/virtual_camera.h"
 
 namespace {

@@ -3,11 +3,12 @@
 #include <fmt/format.h>
 
 #include <algorithm>
+#include <asio/ip/address_v4.hpp>
 #include <cstdint>
 #include <limits>
 
-#include "virtual_camera/event_loop.h"
-#include "virtual_camera/rtp_packetiser.h"
+#include "virtual_camera/codec/rtp_packetiser.h"
+#include "virtual_camera/server/event_loop.h"
 
 namespace vexa::camera {
 

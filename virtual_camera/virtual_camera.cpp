@@ -2,8 +2,8 @@
 
 #include <utility>
 
-#include "virtual_camera/camera_core.h"
-#include "virtual_camera/event_loop.h"
+#include "virtual_camera/server/camera_core.h"
+#include "virtual_camera/server/event_loop.h"
 
 namespace vexa::camera {
 
@@ -72,10 +72,6 @@ void VirtualCamera::add_request_fault(RequestFault fault) { core_->state()->requ
 
 void VirtualCamera::clear_request_faults() { core_->state()->request_faults.clear(); }
 
-void VirtualCamera::set_packet_faults(PacketFaults faults) {
-  CameraState& state = *core_->state();
-  const std::lock_guard<std::mutex> lock(state.packet_faults_mutex);
-  state.packet_faults = std::move(faults);
-}
+void VirtualCamera::set_packet_faults(PacketFaults faults) { core_->state()->packet_faults.set(std::move(faults)); }
 
 }  // namespace vexa::camera

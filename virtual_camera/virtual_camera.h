@@ -10,14 +10,14 @@
 #include <optional>
 #include <string>
 
-#include "virtual_camera/alarm_scene.h"
-#include "virtual_camera/camera_pose.h"
-#include "virtual_camera/card.h"
-#include "virtual_camera/journal.h"
-#include "virtual_camera/options.h"
-#include "virtual_camera/ptz_head.h"
-#include "virtual_camera/sent_log.h"
-#include "virtual_camera/settings_store.h"
+#include "virtual_camera/card/card.h"
+#include "virtual_camera/model/settings_store.h"
+#include "virtual_camera/ptz/camera_pose.h"
+#include "virtual_camera/ptz/ptz_head.h"
+#include "virtual_camera/rtp/sent_log.h"
+#include "virtual_camera/scene/alarm_scene.h"
+#include "virtual_camera/server/journal.h"
+#include "virtual_camera/values/options.h"
 
 namespace vexa::camera {
 

@@ -12,7 +12,7 @@
 
 #include "tests/host/program_run.h"
 #include "tests/support/own_address.h"
-#include "virtual_camera/clip.h"
+#include "virtual_camera/codec/clip.h"
 #include "virtual_camera/virtual_camera.h"
 
 namespace vexa_test {

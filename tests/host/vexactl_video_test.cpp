@@ -5,7 +5,7 @@
 #include "tests/host/camera_fixture.h"
 #include "tests/host/probed_file.h"
 #include "tests/support/decoder.h"
-#include "virtual_camera/image_clip.h"
+#include "virtual_camera/codec/image_clip.h"
 
 namespace vexa_test {
 namespace {

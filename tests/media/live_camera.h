@@ -11,8 +11,8 @@
 #include "tests/media/media_driver.h"
 #include "tests/media/pace.h"
 #include "tests/support/own_address.h"
-#include "virtual_camera/jpeg_picture.h"
-#include "virtual_camera/rtp_packetiser.h"
+#include "virtual_camera/codec/jpeg_picture.h"
+#include "virtual_camera/codec/rtp_packetiser.h"
 #include "virtual_camera/virtual_camera.h"
 
 namespace vexa_test {
@@ -57,7 +57,7 @@ class LiveCamera {
 
   /// Whether the frame is picture `index`. A JPEG picture arrives with a header of the driver's: it must tell the same.
   bool sent(std::uint64_t index, const std::string& frame) const {
-    if (camera_.clip()->codec() != vexa::camera::ImageKind::kJpeg) return frame == picture(index);
+    if (camera_.clip()->codec() != vexa::camera::Codec::kJpeg) return frame == picture(index);
     const auto arrived = read_frame(frame);
     return arrived && arrived == read_frame(picture(index));
   }
@@ -74,11 +74,11 @@ class LiveCamera {
   const char* codec_name() const {
     if (camera_.clip() == nullptr) return "H.264";
     switch (camera_.clip()->codec()) {
-      case vexa::camera::ImageKind::kJpeg:
+      case vexa::camera::Codec::kJpeg:
         return "JPEG";
-      case vexa::camera::ImageKind::kMpeg4:
+      case vexa::camera::Codec::kMpeg4:
         return "MPEG4";
-      case vexa::camera::ImageKind::kH264:
+      case vexa::camera::Codec::kH264:
         break;
     }
     return "H.264";

@@ -18,7 +18,7 @@ std::string position_of(MediaDriver& driver) {
   return driver.m_CamPosText;
 }
 
-class LiveCodec : public testing::TestWithParam<const char*> {
+class Codec : public testing::TestWithParam<const char*> {
  protected:
   static bool is_jpeg() { return std::string(GetParam()).ends_with(".mjpeg"); }
   static std::int32_t type_of(const LiveCamera& camera, std::uint64_t picture) {
@@ -27,7 +27,7 @@ class LiveCodec : public testing::TestWithParam<const char*> {
   }
 };
 
-TEST_P(LiveCodec, DeliversEveryPictureAcrossTheLoopOfTheClip) {
+TEST_P(Codec, DeliversEveryPictureAcrossTheLoopOfTheClip) {
   auto options = codec_options(GetParam());
   options.pictures = 120;
   options.start_sequence = 65500;
@@ -46,7 +46,7 @@ TEST_P(LiveCodec, DeliversEveryPictureAcrossTheLoopOfTheClip) {
   }
 }
 
-TEST_P(LiveCodec, TellsWhereTheCameraLooksAndLosesNoPictureByIt) {
+TEST_P(Codec, TellsWhereTheCameraLooksAndLosesNoPictureByIt) {
   auto options = codec_options(GetParam());
   options.pictures = 30;
   options.user_data = "CamPos: 0123,4567,89ab,cdef and more";
@@ -60,7 +60,7 @@ TEST_P(LiveCodec, TellsWhereTheCameraLooksAndLosesNoPictureByIt) {
   EXPECT_EQ(position_of(driver), "CamPos: 0123,4567,89ab,c");
 }
 
-INSTANTIATE_TEST_SUITE_P(Clips, LiveCodec, testing::Values("small.m4v", "plain.mjpeg", "restart.mjpeg", "sliced.mjpeg"),
+INSTANTIATE_TEST_SUITE_P(Clips, Codec, testing::Values("small.m4v", "plain.mjpeg", "restart.mjpeg", "sliced.mjpeg"),
                          [](const auto& tested) {
                            std::string name = tested.param;
                            name[name.find('.')] = '_';

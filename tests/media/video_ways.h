@@ -10,7 +10,7 @@
 
 #include "tests/media/live_camera.h"
 #include "tests/media/rtp_feed.h"
-#include "virtual_camera/image_clip.h"
+#include "virtual_camera/codec/image_clip.h"
 
 namespace vexa_test {
 
@@ -104,9 +104,9 @@ inline std::vector<std::string> frames_by(VideoWay way, LiveCamera& camera, std:
 }
 
 /// A picture without its user-data units, which the readers of HTTP streams take out.
-inline std::string without_user_data(vexa::camera::ImageKind kind, const std::string& picture) {
-  if (kind == vexa::camera::ImageKind::kJpeg) return picture;
-  const bool h264 = kind == vexa::camera::ImageKind::kH264;
+inline std::string without_user_data(vexa::camera::Codec kind, const std::string& picture) {
+  if (kind == vexa::camera::Codec::kJpeg) return picture;
+  const bool h264 = kind == vexa::camera::Codec::kH264;
   const std::string code = h264 ? std::string("\0\0\0\1", 4) : std::string("\0\0\1", 3);
   std::string kept;
   for (std::size_t unit = picture.find(code); unit != std::string::npos;) {

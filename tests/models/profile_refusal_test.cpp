@@ -9,7 +9,7 @@
 #include "tests/models/profile_text.h"
 #include "tests/support/temporary_folder.h"
 #include "vexa/models.h"
-#include "virtual_camera/camera_profile.h"
+#include "virtual_camera/model/camera_profile.h"
 
 namespace vexa_test {
 namespace {

@@ -9,8 +9,8 @@
 
 #include "device/cgi/position_text.h"
 #include "vexa/models.h"
-#include "virtual_camera/camera_profile.h"
-#include "virtual_camera/ptz_mechanism.h"
+#include "virtual_camera/model/camera_profile.h"
+#include "virtual_camera/ptz/ptz_mechanism.h"
 
 namespace vexa_test {
 namespace {

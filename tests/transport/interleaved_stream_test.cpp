@@ -8,8 +8,8 @@
 
 #include "tests/support/stream_pair.h"
 #include "tests/transport/stream_driver.h"
-#include "virtual_camera/rtp_packetiser.h"
-#include "virtual_camera/rtp_stream.h"
+#include "virtual_camera/codec/rtp_packetiser.h"
+#include "virtual_camera/rtp/rtp_stream.h"
 
 namespace vexa_test {
 namespace {

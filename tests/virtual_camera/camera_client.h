@@ -14,7 +14,7 @@
 #include <vector>
 
 #include "tests/support/own_address.h"
-#include "virtual_camera/options.h"
+#include "virtual_camera/values/options.h"
 
 namespace vexa::camera {
 

@@ -9,7 +9,7 @@
 #include "tests/support/process_state.h"
 #include "tests/virtual_camera/camera_client.h"
 #include "tests/virtual_camera/depacketiser.h"
-#include "virtual_camera/rtp_packetiser.h"
+#include "virtual_camera/codec/rtp_packetiser.h"
 #include "virtual_camera/virtual_camera.h"
 
 namespace vexa::camera {

@@ -9,8 +9,8 @@
 #include <optional>
 
 #include "virtual_camera/camera_host.h"
-#include "virtual_camera/command_line.h"
-#include "virtual_camera/journal_file.h"
+#include "virtual_camera/program/command_line.h"
+#include "virtual_camera/program/journal_file.h"
 
 namespace vexa::camera {
 namespace {

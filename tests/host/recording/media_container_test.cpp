@@ -8,7 +8,7 @@
 #include <vector>
 
 #include "tests/support/temporary_folder.h"
-#include "virtual_camera/image_clip.h"
+#include "virtual_camera/codec/image_clip.h"
 
 namespace vexa::host {
 namespace {

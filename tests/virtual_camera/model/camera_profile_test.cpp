@@ -1,0 +1,227 @@
+// A camera that follows a profile: what it reads of the file, and which settings it has and takes.
+#include "virtual_camera/model/camera_profile.h"
+
+#include <gtest/gtest.h>
+
+#include <filesystem>
+#include <string>
+
+#include "virtual_camera/model/cgi.h"
+#include "virtual_camera/model/setting_rules.h"
+#include "virtual_camera/model/settings_store.h"
+#include "virtual_camera/wire/message.h"
+
+namespace vexa::camera {
+namespace {
+
+const std::string kProfileFolder = VEXA_SOURCE_DIR "/models/profiles/";
+
+const std::string kPlainProfile = R"({
+  "description": "plain", "driver": "common", "model": "T-1", "cameraTypes": ["fixed"],
+  "video": {
+    "streams": [{"codec": "H.264", "size": "640x480", "frameRate": 25, "bitRate": 2000}],
+    "codecs": [{"name": "H.264", "sizes": ["640x480", "320x240"], "frameRates": [1, 25], "bitRates": [512, 2000]}]
+  },
+  "io": {"inputs": 1, "outputs": 0}
+})";
+
+std::string mistake_in(const std::string& from, const std::string& to) {
+  std::string text = kPlainProfile;
+  text.replace(text.find(from), from.size(), to);
+  const auto parsed = parse_camera_profile(text, "p.json");
+  const auto* error = std::get_if<std::string>(&parsed);
+  return error == nullptr ? "taken" : *error;
+}
+
+TEST(CameraProfile, NamesFileAndKeyOfWhatItCannotRead) {
+  const struct {
+    const char* from;
+    const char* to;
+    const char* error;
+  } cases[] = {
+      {"\"plain\"", "\"plain again\"", "taken"},
+      {"\"T-1\"", "1", "p.json:2: model: must be a text"},
+      {"\"T-1\"", "\"\"", "p.json:2: model: must have 1 to 64 characters"},
+      {"\"model\": \"T-1\", ", "", "p.json:1: model: is missing"},
+      {"\"common\"", "\"rare\"",
+       "p.json:2: driver: must be one of \"common\", \"heron\", \"marlin\", \"simple-hd\", \"simple-ptz\""},
+      {"\"io\"", "\"oi\"",
+       "p.json:7: oi: is not known here; known are: $schema, description, driver, model, cameraTypes, video, image, "
+       "ptz, "
+       "audio, io, edgeStorage"},
+      {"\"model\"", "\"driver\"", "p.json:2: driver: occurs twice"},
+      {"\"outputs\": 0", "\"inputs\": 1", "p.json:7: inputs: occurs twice"},
+      {"\"inputs\": 1", "\"inputs\": 17", "p.json:7: io.inputs: must be from 0 to 16"},
+      {"\"inputs\": 1", "\"inputs\": 18446744073709551615", "p.json:7: io.inputs: must be from 0 to 16"},
+      {"\"inputs\": 1", "\"inputs\": true", "p.json:7: io.inputs: must be a whole number"},
+      {"\"inputs\": 1", "\"inputs\": 1.0", "p.json:7: io.inputs: must be a whole number"},
+      {"\"inputs\": 1, \"outputs\": 0", "\"inputs\": 1,\n \"outputs\": 0,\n \"audioDetection\":\n 1",
+       "p.json:9: io.audioDetection: must be true or false"},
+      {"\"size\": \"640x480\"", "\"size\": \"640*480\"",
+       "p.json:4: video.streams[0].size: must be WIDTHxHEIGHT in pixels, for instance \"640x480\""},
+      {"\"size\": \"640x480\"", "\"size\": \"800x600\"",
+       "p.json:4: video.streams[0].size: is not one of those that the codec offers"},
+      {"\"codec\": \"H.264\"", "\"codec\": \"JPEG\"",
+       "p.json:4: video.streams[0].codec: is not one of the camera's codecs"},
+      {"[1, 25]", "[25,\n 1]", "p.json:6: video.codecs[0].frameRates[1]: must be above the one before it"},
+      {"[1, 25]", "[]", "p.json:5: video.codecs[0].frameRates: must have 1 to 32 items"},
+      {"[1, 25]", "25", "p.json:5: video.codecs[0].frameRates: must be a list"},
+      {"\"bitRates\"", "\"qualities\": [1], \"bitRates\"", "p.json:5: video.codecs[0].qualities: is for JPEG only"},
+      {"\"640x480\", \"320x240\"", "\"640x480\", \"640x480\"",
+       "p.json:5: video.codecs[0].sizes[1]: occurs twice in its list"},
+      {"[\"fixed\"]", "[\"ptz\"]",
+       "p.json:2: cameraTypes: must name \"ptz\" exactly when the profile has a part \"ptz\""},
+      {"\"io\": {", "\"io\": [", "p.json:7: not JSON: something is missing, too many or misspelt here"}};
+  for (const auto& c : cases) EXPECT_EQ(mistake_in(c.from, c.to), c.error);
+  EXPECT_EQ(std::get<std::string>(load_camera_profile("/nowhere.json")), "/nowhere.json: cannot be read, or is empty");
+  EXPECT_EQ(std::get<std::string>(parse_camera_profile("[]", "p.json")), "p.json:1: must be an object");
+  const std::string deep(17, '[');
+  EXPECT_EQ(std::get<std::string>(parse_camera_profile(deep + std::string(17, ']'), "p.json")),
+            "p.json:1: nested too deeply");
+}
+
+TEST(CameraProfile, ReadsEveryProfileThatIsShipped) {
+  std::size_t read = 0;
+  for (const auto& file : std::filesystem::directory_iterator(kProfileFolder)) {
+    const auto loaded = load_camera_profile(file.path());
+    ASSERT_TRUE(std::holds_alternative<CameraProfile>(loaded)) << std::get<std::string>(loaded);
+    EXPECT_EQ(std::get<CameraProfile>(loaded).model, file.path().stem());
+    ++read;
+  }
+  EXPECT_GE(read, 5U);
+}
+
+SettingsStore& of_model(SettingsStore& settings, const std::string& model) {
+  auto loaded = load_camera_profile(kProfileFolder + model + ".json");
+  settings.obey(std::make_shared<const SettingRules>(std::get<CameraProfile>(std::move(loaded))));
+  return settings;
+}
+
+TEST(ProfiledCamera, AnswersWithTheSettingsOfItsModelOnly) {
+  SettingsStore settings;
+  of_model(settings, "LMX-A100");
+  EXPECT_EQ(settings.answer("camera"),
+            "VideoStd=pal&VidCapSize=1280,1024&ImageCodec1=h264&ImageSize1=1280,1024&FrameRate1=15&BitRate1=2000&"
+            "Quality1=1&UcVideoPort=50000&UcVideoPort1=50002&UcVideoPort2=50004&RTSPPort=554&RTSPTimeout=60&"
+            "RTPUserData=off&DayNightMode=auto&DayNight=off&VisibilityEnhancer=off&BLComp=off");
+  EXPECT_EQ(settings.answer("system"),
+            "ModelName=LMX-A100&SoftVersion=1.02.00&Serial=100001&ChannelId=1&VideoOutMode=ip&TamperingFunc=off&"
+            "TamperingLevel=middle&TamperingStatusClear=off&AlarmData=off");
+  EXPECT_EQ(settings.answer("edgestorage"), "EsRTSPRec1Timeout=60");
+  EXPECT_EQ(settings.answer("presetposition"), std::nullopt);
+}
+
+struct SettingCase {
+  const char* model;
+  const char* section;
+  const char* query;
+  bool taken;
+};
+
+TEST(ProfiledCamera, TakesWhatItsModelHasAndRefusesTheRest) {
+  const SettingCase cases[] = {
+      {"LMX-H100", "camera", "VideoStd=ntsc", true},
+      {"LMX-H100", "camera", "VideoStd=secam", false},
+      {"LMX-H100", "camera", "XDNR=mid", true},
+      {"LMX-H100", "camera", "XDNR=middle", false},
+      {"LMX-A100", "camera", "XDNR=mid", false},
+      {"LMX-H100", "camera", "ViewDR=on", true},
+      {"LMX-A100", "camera", "ViewDR=on", false},
+      {"LMX-H100", "camera", "VisibilityEnhancer=high", true},
+      {"LMX-H100", "camera", "BLComp=on", true},
+      {"LMX-H100", "camera", "IRLed=daynight&IRLedMaxStrength=10", true},
+      {"LMX-H100", "camera", "IRLed=daynight&IRLedMaxStrength=11", false},
+      {"LMX-H100", "camera", "IRLed=on&IRLedMaxStrength=10", false},
+      {"LMX-M300", "camera", "IRLed=off&IRLedMaxStrength=0", false},
+      {"LMX-H100", "camera", "DayNightMode=manual&DayNight=on", true},
+      {"LMX-H100", "camera", "DayNightMode=day", false},
+      {"LMX-P100", "camera", "ExpMode=shutter", true},
+      {"LMX-P100", "camera", "ExpMode=manual", false},
+      {"LMX-H100", "camera", "ExpMode=full", false},
+      {"LMX-M300", "camera", "ExpMode=autoirislens&AutoShutter=off&AutoSlowShutter=off", true},
+      {"LMX-M300", "camera", "ExpMode=shutter", false},
+      {"LMX-P100", "camera", "Shutter=27", true},
+      {"LMX-P100", "camera", "Shutter=26", false},
+      {"LMX-P100", "camera", "Iris=17", true},
+      {"VX-2000", "camera", "Iris=17", false},
+      {"LMX-P100", "camera", "FocusMode=manual", true},
+      {"LMX-C100", "camera", "FocusMode=manual", false},
+      {"LMX-M300", "camera", "AudInCodec=g726_32&AudioIn=on", true},
+      {"LMX-M300", "camera", "AudInCodec=g726_40&AudioIn=on", false},
+      {"LMX-H100", "camera", "AudInCodec=g711_64&AudioIn=on", false},
+      {"LMX-H100", "camera", "RTSPPort=8554", true},
+      {"LMX-H100", "camera", "RTSPPort=0", false},
+      {"LMX-H100", "camera", "Eflip=on", true},
+      {"LMX-C100", "camera", "Eflip=on", false},
+      {"LMX-H100", "camera", "ImageCodec2=off", true},
+      {"LMX-C100", "camera", "ImageCodec1=off", false},
+      {"LMX-C100", "camera", "ImageCodec2=off", false},
+      {"LMX-H100", "camera", "FrameRate1=24", false},
+      {"LMX-H100", "camera", "FrameRate1=x", false},
+      {"LMX-H100", "camera", "BitRate1=8000", true},
+      {"LMX-H100", "camera", "BitRate1=8001", false},
+      {"LMX-H100", "camera", "ImageCodec1=jpeg&ImageSize1=1280,720&FrameRate1=30&Quality1=10&Eflip=off", true},
+      {"LMX-H100", "camera", "ImageCodec1=jpeg&ImageSize1=1280,720&FrameRate1=30&Quality1=11&Eflip=off", false},
+      {"LMX-H100", "camera", "ImageCodec1=mpeg4&ImageSize1=1280,720&FrameRate1=30&BitRate1=512", false},
+      {"LMX-H100", "camera", "ImageCodec1=mpeg4&ImageSize1=640,368&FrameRate1=30&BitRate1=512", true},
+      {"LMX-P100", "camera", "ImageCodec1=mpeg4&ImageSize1=640,368&FrameRate1=30&BitRate1=512", false},
+      {"LMX-H100", "camera", "ImageSize1=640,480", false},
+      {"LMX-H100", "camera", "VidCapSize=1280,960&ImageSize1=640,480&ImageSize2=640,480", true},
+      {"LMX-H100", "camera", "ImageMaxSize=1280,720&ImageSize1=1920,1080", false},
+      {"LMX-H100", "camera", "SolidPTZ=on&ImageSize1=640,368", true},
+      {"LMX-H100", "camera", "SolidPTZ=on&ImageSize1=1280,720", false},
+      {"VX-2000", "camera", "SolidPTZ=off", false},
+      {"LMX-H100", "camera", "NoSuchKey=1", false},
+      {"LMX-H100", "system", "TamperingFunc=on&TamperingLevel=high", true},
+      {"LMX-P100", "system", "TamperingFunc=on&TamperingLevel=high", false},
+      {"LMX-H100", "system", "ModelName=LMX-H200", false},
+      {"LMX-H100", "system", "ChannelId=3", true},
+      {"LMX-C100", "system", "VideoOutMode=ntsc", true},
+      {"LMX-C100", "system", "VideoOutMode=vga", false},
+      {"LMX-H100", "system", "VideoOutMode=ip", false},
+      {"LMX-H100", "system", "AlarmData=on", true},
+      {"LMX-P200", "ptzf", "ContinuousPanTiltZoom=0,0,", true},
+      {"LMX-P100", "ptzf", "ContinuousPanTiltZoom=0,0,", false},
+      {"LMX-P100", "ptzf", "Move=left,12", true},
+      {"LMX-H100", "ptzf", "Move=left,12", false},
+      {"LMX-H100", "presetposition", "PresetCall=1,24", false},
+      {"LMX-P100", "presetposition", "PresetCall=1,24", true},
+      {"LMX-M300", "lod", "LODSensitivity=5", true},
+      {"LMX-H100", "lod", "LODSensitivity=5", false},
+      {"LMX-M300", "objectdetection", "PositionMode=preset", false},
+      {"VX-2000", "edgestorage", "Edgestorage=on", true},
+      {"LMX-H100", "edgestorage", "Edgestorage=on", false},
+      {"LMX-H100", "edgestorage", "EsRTSPRec1Timeout=60", true},
+      {"LMX-M300", "audiodetection", "ADFunc=on", true},
+      {"LMX-H100", "audiodetection", "ADFunc=on", false},
+  };
+  for (const SettingCase& c : cases) {
+    SettingsStore settings;
+    of_model(settings, c.model);
+    const auto before = settings.answer(c.section);
+    EXPECT_EQ(settings.apply(c.section, c.query), c.taken) << c.model << " " << c.query;
+    if (!c.taken) {
+      EXPECT_EQ(settings.answer(c.section), before) << c.model << " " << c.query;
+    }
+  }
+}
+
+TEST(ProfiledCamera, ShrinksAStreamThatNoLongerFits) {
+  SettingsStore settings;
+  of_model(settings, "LMX-H100");
+  ASSERT_TRUE(settings.apply("camera", "SolidPTZ=on"));
+  EXPECT_EQ(settings.get("camera", "ImageSize1"), "640,368");
+  ASSERT_TRUE(settings.apply("camera", "SolidPTZ=off&VidCapSize=1280,960"));
+  EXPECT_EQ(settings.get("camera", "ImageSize1"), "1280,960");
+  EXPECT_EQ(settings.get("camera", "ImageSize2"), "1280,960");
+}
+
+TEST(ProfiledCamera, RefusesACommandWithStatus400) {
+  SettingsStore settings;
+  of_model(settings, "LMX-H100");
+  const auto head = parse_head("GET /command/camera.cgi?XDNR=middle HTTP/1.0\r\n\r\n");
+  EXPECT_EQ(answer_command(*head, settings).status, 400);
+}
+
+}  // namespace
+}  // namespace vexa::camera

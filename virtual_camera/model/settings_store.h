@@ -1,0 +1,54 @@
+// The camera's settings: sections of key=value pairs, read by inquiries and changed by commands.
+#ifndef VIRTUAL_CAMERA_MODEL_SETTINGS_STORE_H_
+#define VIRTUAL_CAMERA_MODEL_SETTINGS_STORE_H_
+
+#include <map>
+#include <memory>
+#include <mutex>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+namespace vexa::camera {
+
+class SettingRules;
+
+// Thread-safe. Values are kept as they came, without decoding; keys keep the order in which they were first set.
+class SettingsStore {
+ public:
+  SettingsStore();  // with a plausible camera's defaults
+
+  [[nodiscard]] std::optional<std::string> get(std::string_view section, std::string_view key) const;
+  void set(std::string_view section, std::string_view key, std::string_view value);
+  void erase(std::string_view section, std::string_view key);
+  void erase_section(std::string_view section);
+  // Replaces a section's inquiry answer by this text, whatever its keys say; nothing puts the keys back.
+  void set_answer(std::string_view section, std::optional<std::string> text);
+
+  // "key=value&key=value" in order; nothing when there is no such section.
+  [[nodiscard]] std::optional<std::string> answer(std::string_view section) const;
+  // Applies the pairs of a command's query ("K=V&K=V") to a section. False, and nothing changed, where the rules that
+  // the store obeys forbid it.
+  [[nodiscard]] bool apply(std::string_view section, std::string_view query);
+  // Has, from now on, the settings and the rules of a camera model. Without rules every command is taken.
+  void obey(std::shared_ptr<const SettingRules> rules);
+
+ private:
+  struct Section {
+    std::vector<std::pair<std::string, std::string>> pairs;
+    std::optional<std::string> whole_answer;
+  };
+
+  void set_locked(Section& section, std::string_view key, std::string_view value);
+  [[nodiscard]] const Section* find_locked(std::string_view section) const;
+
+  mutable std::mutex mutex_;
+  std::map<std::string, Section, std::less<>> sections_;
+  std::shared_ptr<const SettingRules> rules_;
+};
+
+}  // namespace vexa::camera
+
+#endif  // VIRTUAL_CAMERA_MODEL_SETTINGS_STORE_H_

@@ -1,0 +1,61 @@
+#include "virtual_camera/server/camera_state.h"
+
+#include <utility>
+#include <variant>
+
+#include "virtual_camera/model/camera_profile.h"
+#include "virtual_camera/model/setting_rules.h"
+#include "virtual_camera/server/settings_report.h"
+
+namespace vexa::camera {
+namespace {
+
+// Loads the profile that the options name, where they hold none. Returns why it could not be loaded; empty on success.
+std::string load_profile(CameraOptions& options) {
+  if (options.profile || options.profile_path.empty()) return {};
+  auto loaded = load_camera_profile(options.profile_path);
+  if (auto* error = std::get_if<std::string>(&loaded)) return std::move(*error);
+  options.profile = std::make_shared<const SettingRules>(std::get<CameraProfile>(std::move(loaded)));
+  return {};
+}
+
+AlarmLayout layout_of(const CameraOptions& options) {
+  if (!options.profile) return options.alarms;
+  const CameraProfile& model = options.profile->profile();
+  return {model.alarm_inputs, model.video_detection, model.tampering_detection, model.audio_detection};
+}
+
+std::unique_ptr<PtzHead> head_of(const CameraOptions& options) {
+  if (!options.profile || !options.profile->profile().ptz) return nullptr;
+  return std::make_unique<PtzHead>(*options.profile->profile().ptz, std::chrono::steady_clock::now(),
+                                   options.speed * options.ptz_speed);
+}
+
+PoseSource pose_of(PtzHead* ptz, const SettingsStore& settings) {
+  if (ptz == nullptr) return nullptr;
+  return [ptz, &settings](PtzHead::Time now) { return ptz->pose(pointed_picture(settings).turned, now); };
+}
+
+}  // namespace
+
+CameraState::CameraState(CameraOptions camera_options, asio::io_context& loop_context)
+    : options(std::move(camera_options)),
+      profile_error(load_profile(options)),
+      context(loop_context),
+      alarms(layout_of(options)),
+      card(options.card_bytes),
+      ptz(head_of(options)),
+      pose(pose_of(ptz.get(), settings)),
+      scene(settings, alarms, stage, pose, ptz.get()),
+      sources(options, settings, scene),
+      journal(options.journal_limit),
+      sent(options.sent_log_limit),
+      packet_faults(options.packet_faults),
+      next_session(options.first_session) {
+  if (options.profile) settings.obey(options.profile);
+  for (const RequestFault& fault : options.request_faults) request_faults.add(fault);
+}
+
+CameraState::~CameraState() = default;
+
+}  // namespace vexa::camera

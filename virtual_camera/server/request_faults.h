@@ -1,0 +1,50 @@
+// Which request meets which fault, and what a fault does to the sending of an answer.
+#ifndef VIRTUAL_CAMERA_SERVER_REQUEST_FAULTS_H_
+#define VIRTUAL_CAMERA_SERVER_REQUEST_FAULTS_H_
+
+#include <chrono>
+#include <cstdint>
+#include <mutex>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "virtual_camera/values/faults.h"
+
+namespace vexa::camera {
+
+// Thread-safe. Every rule counts its own matches; the first rule in force wins.
+class RequestFaultList {
+ public:
+  void add(RequestFault fault);
+  void clear();
+  [[nodiscard]] std::optional<RequestFault> take(std::string_view request);
+
+ private:
+  struct Rule {
+    RequestFault fault;
+    std::uint32_t matches = 0;
+  };
+  std::mutex mutex_;
+  std::vector<Rule> rules_;
+};
+
+enum class DeliveryEnd { kAsUsual, kClose, kReset, kHold };
+
+// How an answer leaves.
+struct Delivery {
+  std::string bytes;
+  std::chrono::milliseconds delay{0};     // before the first byte
+  std::chrono::milliseconds interval{0};  // between single bytes; 0: all in one write
+  DeliveryEnd end = DeliveryEnd::kAsUsual;
+};
+
+// True when the request must not be carried out, because the fault answers in its place.
+[[nodiscard]] bool replaces_request(FaultAction action);
+
+[[nodiscard]] Delivery plan_delivery(const std::optional<RequestFault>& fault, std::string answer);
+
+}  // namespace vexa::camera
+
+#endif  // VIRTUAL_CAMERA_SERVER_REQUEST_FAULTS_H_

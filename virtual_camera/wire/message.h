@@ -1,0 +1,38 @@
+// The head of a request: a request line and header fields, the same in HTTP (RFC 1945) and RTSP (RFC 2326).
+#ifndef VIRTUAL_CAMERA_WIRE_MESSAGE_H_
+#define VIRTUAL_CAMERA_WIRE_MESSAGE_H_
+
+#include <cstddef>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+namespace vexa::camera {
+
+struct RequestHead {
+  std::string method;
+  std::string target;   // as sent: "/command/..." or with scheme and authority before it
+  std::string path;     // of the target, without the query
+  std::string query;    // after the "?"
+  std::string version;  // "HTTP/1.0", "RTSP/1.0"
+  std::vector<std::pair<std::string, std::string>> fields;
+
+  // The value of a field, whatever the case of its name; empty when absent.
+  [[nodiscard]] std::string_view field(std::string_view name) const;
+};
+
+// Bytes up to and including the empty line that ends the head; 0 when it has not come yet. Empty lines before the
+// request line belong to the head.
+[[nodiscard]] std::size_t head_size(std::string_view received);
+
+// Nothing when the text is no request head.
+[[nodiscard]] std::optional<RequestHead> parse_head(std::string_view head);
+
+// "K=V&K=V" as pairs, undecoded; what has no key or no "=" is left out.
+[[nodiscard]] std::vector<std::pair<std::string, std::string>> query_pairs(std::string_view query);
+
+}  // namespace vexa::camera
+
+#endif  // VIRTUAL_CAMERA_WIRE_MESSAGE_H_
