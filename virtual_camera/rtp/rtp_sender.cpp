@@ -100,8 +100,8 @@ void RtpSender::slip_if_far_behind(Time event) {
 // Whether the picture that is due stays. One that leaves late takes the schedule with it: pictures do not catch up with
 // each other where somebody watches over their pace.
 bool RtpSender::holds(Time event) {
-  if (!state_->options.hold_pictures || !picture_.empty() || lane_->next_due() == event) return false;
-  const bool held = state_->options.hold_pictures();
+  if (!options_->hold_pictures || !picture_.empty() || lane_->next_due() == event) return false;
+  const bool held = options_->hold_pictures();
   started_ = std::max(started_, Clock::now() + (held ? kHold : Clock::duration::zero()) - event);
   return held;
 }
