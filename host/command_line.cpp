@@ -80,10 +80,10 @@ std::string showable(const std::string& argument) {
 Problem not_understood(const std::vector<std::string>& extras, const std::string& help) {
   for (const std::string& extra : extras) {
     if (!showable(extra).empty()) {
-      return {ExitCode::kUsage, fmt::format("there is no option {}", showable(extra)), help};
+      return {ExitCode::kUsage, fmt::format("unknown option {}", showable(extra)), help};
     }
   }
-  return {ExitCode::kUsage, "there is an argument too many", help};
+  return {ExitCode::kUsage, "there are too many arguments", help};
 }
 
 bool is(const CLI::ParseError& error, CLI::ExitCodes kind) { return error.get_exit_code() == static_cast<int>(kind); }
@@ -118,7 +118,7 @@ ExitCode on_parse_error(const CLI::ParseError& error, const CLI::App& program, T
   const auto chosen = program.get_subcommands();
   if (chosen.empty()) {
     return terminal.report(
-        {ExitCode::kUsage, "the first argument is not a command", "See vexactl --help for the commands."});
+        {ExitCode::kUsage, "the command is missing or unknown", "See vexactl --help for the commands."});
   }
   const std::string help = fmt::format("See vexactl {} --help.", words_of(chosen.front()));
   if (is(error, CLI::ExitCodes::ExtrasError)) return terminal.report(not_understood(program.remaining(true), help));

@@ -1,4 +1,4 @@
-// Where the camera is, as written on the command line.
+// The camera's address, as given on the command line.
 #ifndef HOST_ACCESS_CAMERA_ADDRESS_H_
 #define HOST_ACCESS_CAMERA_ADDRESS_H_
 
@@ -20,7 +20,7 @@ struct CameraAddress {
 
 [[nodiscard]] std::string to_string(const CameraAddress& address);
 
-// Looks the host up as the driver will, so that a misspelt name is called one.
+// Resolves the host as the driver will, so that a misspelt name is reported as one.
 [[nodiscard]] std::optional<Problem> check_name(const CameraAddress& address);
 
 }  // namespace vexa::host

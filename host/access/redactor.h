@@ -1,4 +1,4 @@
-// Keeps the password out of everything that vexactl prints on behalf of others.
+// Keeps the password out of everything that vexactl prints for others: the driver's trace, a camera's answers.
 #ifndef HOST_ACCESS_REDACTOR_H_
 #define HOST_ACCESS_REDACTOR_H_
 
@@ -16,7 +16,7 @@ class Redactor {
   explicit Redactor(const Credentials& credentials);
 
   // The text with "***" for the password, for the credentials as they travel (Base64), and for the value of every
-  // Basic authorization, whoever's it is.
+  // Basic authorization, also one that is not this user's.
   [[nodiscard]] std::string operator()(std::string_view text) const;
 
  private:

@@ -1,4 +1,4 @@
-// What vexactl tells the script that started it.
+// The exit codes of vexactl.
 #ifndef HOST_BASE_EXIT_CODE_H_
 #define HOST_BASE_EXIT_CODE_H_
 

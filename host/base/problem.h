@@ -1,4 +1,4 @@
-// A failure as the person at the keyboard meets it.
+// A failure as the user sees it.
 #ifndef HOST_BASE_PROBLEM_H_
 #define HOST_BASE_PROBLEM_H_
 

@@ -8,7 +8,7 @@
 namespace vexa::host {
 namespace {
 
-// A pipe that somebody else has made non-blocking must not cost a byte.
+// A pipe that another process has made non-blocking must not cost a byte.
 void wait_for_room(int fd) {
   pollfd room{fd, POLLOUT, 0};
   poll(&room, 1, -1);

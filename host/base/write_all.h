@@ -5,7 +5,7 @@
 
 namespace vexa::host {
 
-// Writes every byte, however the system splits them and whatever signals come. Returns 0, or the error's number.
+// Writes every byte, across partial writes and signals. Returns 0, or the error's number.
 [[nodiscard]] int write_all(int fd, const void* data, std::size_t length);
 
 }  // namespace vexa::host

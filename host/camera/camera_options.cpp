@@ -16,7 +16,7 @@ constexpr int kMostStreams = 16;
 
 Problem out_of_descriptors() {
   return {ExitCode::kUsage, fmt::format("cannot show the driver's trace: {}", std::generic_category().message(errno)),
-          "Leave --trace out, or let the process open more files."};
+          "Leave --trace out, or raise the limit of open files."};
 }
 
 }  // namespace

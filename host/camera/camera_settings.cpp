@@ -24,7 +24,7 @@ class SettingReader {
  public:
   explicit SettingReader(CLibraryDevice& device) : device_(device) {}
 
-  // The word of what a getter tells; null when it tells nothing.
+  // The word for a getter's value; null when the camera does not report it.
   template <typename Value, typename Words>
   Json word(ELibDReturnCode (CLibraryDevice::*get)(Value&), const Words& words) {
     Value value{};

@@ -19,7 +19,8 @@ constexpr int kOverHttp = 0;
 constexpr int kOverRtsp = 1;
 
 // The driver opens its CGI log with every connection; unnamed, it would be a file in the working folder. This one is in
-// memory and gone with the driver. /dev/null would not do: the log is flushed to its disk, and says when it has none.
+// memory and gone with the driver. /dev/null would not do: the driver syncs the log to disk and reports a failure
+// there.
 class PrivateLog {
  public:
   [[nodiscard]] std::string path() const { return fmt::format("/proc/self/fd/{}", memory_.get()); }
@@ -94,7 +95,7 @@ Problem explain_failure(CLibraryDevice& device, ELibDReturnCode result, const Ca
   device.GetLatestErrorText(text);
   const std::string why = text.empty() ? "no answer" : printable(Redactor(connection.credentials)(text));
   const std::string camera = to_string(connection.address);
-  // A refused RTSP session answers LIBD_STREAM_OPEN_FAILED whatever the reason; only the text tells.
+  // A refused RTSP session returns LIBD_STREAM_OPEN_FAILED for any reason; only the text distinguishes them.
   if (result == LIBD_UNAUTHORIZED || mentions_unauthorized(text)) {
     return {ExitCode::kUnauthorized, fmt::format("the camera {} refuses user name and password: {}", camera, why),
             fmt::format("Give them with --user and --password-file, --credentials FILE, or {} and {}.", kUserVariable,

@@ -12,7 +12,7 @@
 
 namespace vexa::host {
 
-// How pictures come: RTP in datagrams behind an RTSP session, or the camera's HTTP image stream.
+// The transport of pictures: RTP in datagrams, set up by RTSP, or the camera's HTTP image stream.
 enum class VideoTransport { kUdp, kHttp };
 
 struct CameraConnection {
@@ -23,17 +23,17 @@ struct CameraConnection {
   std::optional<std::string> cgi_log = {};  // the file that requests and statuses are appended to
 };
 
-// Tells a driver where its camera is, and where its CGI log goes; contacts no camera.
+// Gives a driver its camera's address and the file of its CGI log. Contacts no camera.
 void introduce(CLibraryDevice& device, const CameraConnection& connection);
 
-// Puts a driver's latest failure into words; `result` is what the failed operation answered.
+// Puts a driver's latest failure into words; `result` is what the failed operation returned.
 [[nodiscard]] Problem explain_failure(CLibraryDevice& device, ELibDReturnCode result,
                                       const CameraConnection& connection);
 
 // Whether the latest failure has a text: a failed exchange leaves one, an answer that lacks a key none.
 [[nodiscard]] bool left_a_reason(CLibraryDevice& device);
 
-// How a camera is set to record on its card.
+// A camera's settings for recording on its card.
 struct CardMode {
   SLibDEdgeStorageMode recording;
   int free_kilobytes = 0;  // 0 also when no card is there
@@ -42,7 +42,7 @@ struct CardMode {
 // A model class for any camera that streams video.
 class LiveCamera final : public CVexaCommon {
  public:
-  // Tells the driver where the camera is; contacts none.
+  // Gives the driver the camera's address; contacts no camera.
   explicit LiveCamera(const CameraConnection& connection);
 
   [[nodiscard]] Problem explain(ELibDReturnCode result) { return explain_failure(*this, result, connection_); }
@@ -52,10 +52,10 @@ class LiveCamera final : public CVexaCommon {
     SLibDSystemInfo system;
     SLibDCameraInfo video;  // of the stream asked for
   };
-  // Asks the camera what it is and what the stream is set to, and selects the stream and its codec.
+  // Reads the camera's identity and the stream's settings, and selects the stream and its codec.
   [[nodiscard]] Result<Identity> identify(int stream);
 
-  // Asks the camera: the driver's own record of the mode knows only what it has set itself.
+  // Asks the camera: the driver's own record holds only a mode that this driver has set.
   [[nodiscard]] Result<CardMode> card_mode();
 
  private:

@@ -18,7 +18,7 @@ struct PictureGroup {
   std::vector<FrameBytes> frames;  // from a key frame to the picture's own
 };
 
-// Keeps what it takes to decode the newest picture. One thread looks; any may ask for the newest.
+// Keeps what it takes to decode the newest picture. One thread polls; any may ask for the newest.
 class LivePictures final : private CDataSink {
  public:
   enum class Polled { kPicture, kNone, kSilent };

@@ -1,4 +1,4 @@
-// A camera whose model is known: the driver that its profile asks for.
+// A camera of a known model, with the driver class that its profile names.
 #ifndef HOST_CAMERA_MODEL_CAMERA_H_
 #define HOST_CAMERA_MODEL_CAMERA_H_
 
@@ -31,9 +31,9 @@ class ModelCamera {
   // it.
   [[nodiscard]] Result<LiveCamera*> live() const;
 
-  // A failure to read from the camera.
+  // Puts a failure to read from the camera into words.
   [[nodiscard]] Problem explain(ELibDReturnCode result) const;
-  // A failure to change `what` on a camera that answers.
+  // Puts a failure to change `what` on a reachable camera into words.
   [[nodiscard]] Problem explain_change(const std::string& what, ELibDReturnCode result) const;
 
  private:

@@ -1,4 +1,4 @@
-// The options that say which video of a camera is meant, and how it is to come.
+// The options that choose a camera's video stream and its transport.
 #ifndef HOST_CAMERA_VIDEO_OPTIONS_H_
 #define HOST_CAMERA_VIDEO_OPTIONS_H_
 

@@ -87,7 +87,7 @@ void CgiLogReader::feed(std::string_view bytes) {
 }
 
 void CgiLogReader::keep(char c) {
-  // One more than is shown tells that there is more.
+  // One character more than is shown marks a longer line.
   if (!settled_ && line_.size() <= kLongestLine) line_ += c;
 }
 

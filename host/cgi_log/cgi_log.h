@@ -46,7 +46,7 @@ struct CgiExchange {
   [[nodiscard]] std::optional<std::chrono::milliseconds> duration() const;
 };
 
-// Takes a log's bytes in pieces of any size, and hands out each exchange as soon as it is complete.
+// Takes a log's bytes in pieces of any size, and passes on each exchange as soon as it is complete.
 class CgiLogReader {
  public:
   using Take = std::function<void(const CgiExchange&)>;
@@ -56,7 +56,7 @@ class CgiLogReader {
   explicit CgiLogReader(Take take) : take_(std::move(take)) {}
 
   void feed(std::string_view bytes);
-  // A line ends where the next begins, and the last has no end: this says that it is complete.
+  // A line ends where the next begins, so the last one has no end: this declares it complete.
   void settle();
   // Another file follows, whose answers may be those to the requests of this one.
   void begin_file();

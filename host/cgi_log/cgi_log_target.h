@@ -9,7 +9,7 @@
 
 namespace vexa::host {
 
-// The driver says nothing about a log that it cannot write, so this does; the file exists afterwards.
+// The driver does not report a log that it cannot write, so this does. Creates the file.
 [[nodiscard]] std::optional<Problem> check_cgi_log_target(const std::string& path);
 
 }  // namespace vexa::host

@@ -13,7 +13,7 @@ CLI::App* ActionGroup::declare(CLI::App& program, const char* const* environment
   add_model_options(*command, options_, environment);
   command->require_subcommand(1);
   command->footer(text_.footer);
-  // The camera's options may stand behind the action too.
+  // The camera's options may follow the action too.
   for (const auto& action : actions_) declared_.push_back(action->declare(*command)->fallthrough());
   return command;
 }
@@ -41,7 +41,7 @@ Problem model_lacks(const ModelCamera& camera, const std::string& part) {
                  "Name one with --profile; vexactl profile list shows those installed.");
   }
   return usage(fmt::format("cameras of model {} have no {}", printable(profile.model), part),
-               "vexactl profile show tells what a model has.");
+               "vexactl profile show lists what a model has.");
 }
 
 ExitCode report_change(const ModelCamera& camera, Terminal& terminal, const std::string& what, ELibDReturnCode result) {

@@ -46,7 +46,8 @@ std::optional<Problem> AlarmSnapshots::take(const SLibDPinInfo& pin, const std::
 
 std::optional<Problem> check_snapshot_folder(const std::string& folder) {
   if (!folder.empty() && !FrameFile(folder + "/x").check()) return std::nullopt;
-  return usage("--snapshot-dir is no folder that you may write to", "Make it first; one is enough for many cameras.");
+  return usage("--snapshot-dir is not a folder that you can write to",
+               "Create it first; several cameras can share one.");
 }
 
 }  // namespace vexa::host

@@ -124,14 +124,14 @@ class OutputCommand final : public Command {
 class WatchCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
-    CLI::App* command = program.add_subcommand("watch", "Show a camera's alarms as they come, until Ctrl-C");
+    CLI::App* command = program.add_subcommand("watch", "Show a camera's alarms as they occur, until Ctrl-C");
     add_model_options(*command, options_, environment);
     command->add_flag("--metadata", metadata_, "show the frames of motion metadata too");
     command->add_option("--count", count_, "end after this many lines")->check(CLI::PositiveNumber);
     command
         ->add_option("--snapshot-dir", snapshot_folder_, "write a picture of each alarm that begins into this folder")
         ->type_name("DIR");
-    command->footer("A line says when, which pin, what it is, and its new state; with --json each is a JSON object.");
+    command->footer("Each line gives the time, the pin, its kind and its new state; with --json it is a JSON object.");
     return command;
   }
 

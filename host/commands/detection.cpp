@@ -1,4 +1,4 @@
-// vexactl detection, tampering and audio-detection: what a camera's detectors look for, and switching them.
+// vexactl detection, tampering and audio-detection: the settings of a camera's detectors, and switching them.
 #include <fmt/format.h>
 
 #include <CLI/CLI.hpp>
@@ -45,8 +45,7 @@ Json window_json(const SLibDDetectionWindow& window) {
 class DetectionCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
-    CLI::App* command =
-        program.add_subcommand("detection", "Show, set or draw what a camera's video detection looks for");
+    CLI::App* command = program.add_subcommand("detection", "Show, set or draw a camera's video detection settings");
     add_model_options(*command, options_, environment);
     command->add_option("action", action_, "show, set, or draw: a picture with the windows on it")
         ->required()
@@ -118,7 +117,7 @@ class DetectionCommand final : public Command {
   ExitCode set(Terminal& terminal, const ModelCamera& camera, const std::vector<SLibDDetectionParam>& settings) const {
     SLibDDetectionParam param = chosen(camera, settings);
     if (size_ && !value_named(kObjectSizes, *size_)) {
-      return terminal.report(usage("there is no such size", "It is small, middle or large."));
+      return terminal.report(usage("unknown size", "Choose small, middle or large."));
     }
     change(param);
     const ELibDReturnCode result = camera.device().SetDetectionParam(param);
@@ -177,7 +176,7 @@ class TamperingCommand final : public Command {
     const std::optional<bool> on = switch_named(switch_);
     if (!on) return terminal.report(no_switch("tampering"));
     const auto level = value_named(kTamperLevels, level_);
-    if (!level) return terminal.report(usage("there is no such level", "It is low, middle or high."));
+    if (!level) return terminal.report(usage("unknown level", "Choose low, middle or high."));
     const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
     if (!camera) return terminal.report(camera.error());
     const ELibDReturnCode result = camera->device().SetTamperingAlarm(*on, *level);

@@ -9,7 +9,7 @@ namespace vexa::host {
 
 std::optional<Problem> check_picture_file(const std::string& file) {
   if (file.empty()) return usage("--out names no file", "For instance: --out windows.png.");
-  if (!picture_format_of(file)) return usage("--out is no picture file", "Its name ends with .png or .jpg.");
+  if (!picture_format_of(file)) return usage("--out is not a picture file", "Its name ends with .png or .jpg.");
   if (!has_ffmpeg()) return without_ffmpeg("drawing on a picture");
   return FrameFile(file).check();
 }

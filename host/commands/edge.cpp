@@ -89,7 +89,7 @@ class CardModeAction final : public CameraAction {
     }
     const ELibDReturnCode result = camera.device().SetEdgeStorageMode(mode);
     if (result != LIBD_NO_FRAME) return report_change(camera, terminal, "recording on the card", result);
-    return terminal.report({ExitCode::kUnreachable, "the card has no free space, or there is none; recording is on",
+    return terminal.report({ExitCode::kUnreachable, "the card is full or missing; recording is on",
                             "vexactl edge CAMERA delete makes room."});
   }
 
@@ -132,7 +132,7 @@ class DeleteRecordingsAction final : public CameraAction {
     if (!yes_) {
       const std::optional<std::string> answer = ask(terminal);
       if (!answer) {
-        return terminal.report(usage("nothing was deleted: there is no answer", "Answer y, or give --yes."));
+        return terminal.report(usage("nothing was deleted: no answer was given", "Answer y, or give --yes."));
       }
       if (*answer != "y" && *answer != "yes") {
         terminal.say("vexactl: nothing was deleted");
@@ -182,7 +182,7 @@ Result<SLibDEdgeStorageRecord> find_recording(const ModelCamera& camera, const s
   for (const SLibDEdgeStorageRecord& record : *listed) {
     if (record.streamName == name) return record;
   }
-  return fail(usage("the card holds no recording of that name", "vexactl edge CAMERA list shows those there are."));
+  return fail(usage("the card has no recording of that name", "vexactl edge CAMERA list shows what it has."));
 }
 
 std::unique_ptr<Command> make_edge_command() {

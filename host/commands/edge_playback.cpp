@@ -89,10 +89,9 @@ class PlaybackAction : public CameraAction {
     TakenRecording taken{record.streamName, target != nullptr ? target->path() : "", RecordingEnd::kSilent, {}, {}};
     const std::optional<Codec> codec = codec_listed_as(record.imageCodec);
     if (!codec) {
-      taken.problem =
-          Problem{ExitCode::kNoVideo,
-                  fmt::format("the recording is of a codec that cannot be played: {}", printable(record.imageCodec)),
-                  "JPEG, MPEG-4 and H.264 can."};
+      taken.problem = Problem{ExitCode::kNoVideo,
+                              fmt::format("the recording's codec cannot be played: {}", printable(record.imageCodec)),
+                              "JPEG, MPEG-4 and H.264 can."};
       return taken;
     }
     Interrupt::finish_orderly();
@@ -179,7 +178,7 @@ class GetRecordingAction final : public PlaybackAction {
     const std::optional<Codec> codec = codec_listed_as(record->imageCodec);
     if (const auto promised = target().codec(); codec && promised && promised != codec) {
       return terminal.report({ExitCode::kNoVideo, fmt::format("the recording is of {}", printable(record->imageCodec)),
-                              fmt::format("Let --out end in {} or .mkv.", usual_extension(*codec))});
+                              fmt::format("End --out in {} or .mkv.", usual_extension(*codec))});
     }
     const std::unique_ptr<PictureTarget> file = target().open();
     return tell(take(camera, *record, file.get(), terminal), terminal);
@@ -195,7 +194,7 @@ class GetRecordingAction final : public PlaybackAction {
 class BackfillAction final : public PlaybackAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("backfill", "Fetch all that was recorded since a moment");
+    CLI::App* action = group.add_subcommand("backfill", "Fetch everything recorded since a given time");
     action->add_option("--since", since_, "such as 2024-01-31T23:59:59, in UTC")->required()->type_name("TIME");
     action->add_option("--out", out_, "folder for the files, .mkv where FFmpeg's libraries are there")
         ->required()
@@ -205,7 +204,7 @@ class BackfillAction final : public PlaybackAction {
   }
 
   std::optional<Problem> check() override {
-    if (!utc_moment(since_)) return usage("--since is no moment", "For instance: --since 2024-01-31T23:59:59.");
+    if (!utc_moment(since_)) return usage("--since is not a time", "For instance: --since 2024-01-31T23:59:59.");
     if (out_.empty()) return usage("--out names no folder", "For instance: --out gap.");
     return check_scale();
   }

@@ -1,4 +1,4 @@
-// vexactl info: what a camera says it is.
+// vexactl info: a camera's identity and video settings.
 #include <fmt/format.h>
 
 #include <CLI/CLI.hpp>
@@ -65,7 +65,7 @@ Json to_json(const CameraFacts& facts) {
 class InfoCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
-    CLI::App* command = program.add_subcommand("info", "Show what a camera is, and how its video is set");
+    CLI::App* command = program.add_subcommand("info", "Show a camera's identity and video settings");
     add_camera_options(*command, options_, environment);
     return command;
   }

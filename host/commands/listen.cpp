@@ -45,7 +45,7 @@ const SoundCodec* find_sound_codec(const std::string& word) {
   return found == std::end(kSoundCodecs) ? nullptr : found;
 }
 
-// How much is wanted: so many seconds of sound, whatever the clock says.
+// How much is wanted, in seconds of sound rather than of the clock.
 class SoundLimit {
  public:
   SoundLimit(std::optional<double> seconds, int bit_rate) {
@@ -74,7 +74,7 @@ class ListenCommand final : public Command {
     add_camera_options(*command, camera_, environment);
     command
         ->add_option("--out", out_,
-                     "file to write: .wav of G.711 sound, else the sound as it comes; - is standard output")
+                     "file to write: .wav for G.711 sound, otherwise the sound as received; - is standard output")
         ->required()
         ->type_name("FILE");
     command->add_option("--codec", codec_, "switch the camera's sound on in this: g711_64, g726_40, _32, _24 or _16")
@@ -90,7 +90,7 @@ class ListenCommand final : public Command {
     }
     if (codec_ && find_sound_codec(*codec_) == nullptr) {
       return terminal.report(
-          usage("--codec is none of g711_64, g726_40, g726_32, g726_24 and g726_16", "For instance: --codec g711_64."));
+          usage("--codec must be g711_64, g726_40, g726_32, g726_24 or g726_16", "For instance: --codec g711_64."));
     }
     FrameFile file = to_standard_output() ? FrameFile("standard output", terminal.results()) : FrameFile(out_);
     if (const auto problem = file.check()) return terminal.report(*problem);
@@ -138,8 +138,8 @@ class ListenCommand final : public Command {
   }
 
   static Problem no_wave(const SLibDAudioInfo& sound) {
-    return usage(fmt::format("the camera's sound is {}, which a .wav here does not hold", printable(sound.codec)),
-                 "Give --out another ending for the sound as it comes, or switch to --codec g711_64.");
+    return usage(fmt::format("the camera's sound is {}, which vexactl does not write to .wav", printable(sound.codec)),
+                 "Give --out another extension for the sound as received, or switch to --codec g711_64.");
   }
 
   // Polls the driver until the limit, Ctrl-C or a failure.
@@ -155,7 +155,7 @@ class ListenCommand final : public Command {
       frame.capacity = static_cast<std::int32_t>(piece.size());
       const ELibDReturnCode result = camera.driver->GetCurrentAudioFrame(frame);
       if (result == LIBD_NO_FRAME && Clock::now() - last <= silence) {
-        Interrupt::wait(kPollPause);  // a connection that the camera has closed has no sound at once
+        Interrupt::wait(kPollPause);  // on a connection that the camera has closed the call returns at once
         continue;
       }
       if (result == LIBD_NO_FRAME || result == LIBD_TIMEOUT) return ended_by(silent());

@@ -62,7 +62,7 @@ class LogView {
         reader_.begin_file();
         continue;
       }
-      // A line still being written grows from one look to the next.
+      // A line still being written has grown since the previous read.
       if (bytes_ == before) reader_.settle();
       const ExitCode written = write_rows();
       if (written != ExitCode::kOk) return written;
@@ -101,13 +101,13 @@ class LogView {
   ExitCode conclude() {
     const std::string& path = options_.path;
     if (reader_.lines() == 0 && !reader_.saw_banner()) {
-      return terminal_.report({ExitCode::kUsage,
-                               bytes_ == 0 ? fmt::format("{} is empty", path) : fmt::format("{} is no CGI log", path),
-                               "The other commands write one with --cgi-log FILE."});
+      return terminal_.report(
+          {ExitCode::kUsage, bytes_ == 0 ? fmt::format("{} is empty", path) : fmt::format("{} is not a CGI log", path),
+           "The other commands write one with --cgi-log FILE."});
     }
     if (reader_.foreign_lines() > 0) {
       terminal_.say(
-          fmt::format("vexactl: left out what is no line of a CGI log: {} in {}", reader_.foreign_lines(), path));
+          fmt::format("vexactl: skipped lines that are not of a CGI log: {} in {}", reader_.foreign_lines(), path));
     }
     if (reader_.lines() == 0) terminal_.say(fmt::format("vexactl: {} holds no request", path));
     return ExitCode::kOk;
@@ -130,10 +130,10 @@ class LogCommand final : public Command {
     CLI::App* command = program.add_subcommand("log", "Show the requests and answers that --cgi-log has written");
     redactor_ = redactor_of(environment);
     command->add_option("file", options_.path, "the log")->required()->type_name("");
-    command->add_flag("--follow", options_.follow, "go on with what is appended, through rotation, until Ctrl-C");
+    command->add_flag("--follow", options_.follow, "keep reading what is appended, also after rotation, until Ctrl-C");
     command->add_flag("--json", options_.json, "print a line of JSON for each request");
     command->footer(
-        "Times are local. An answer belongs to the request before it; a request that another follows has got none.\n"
+        "Times are local. An answer belongs to the request before it; a request followed by another got no answer.\n"
         "The password in VEXACTL_PASSWORD is hidden, should a camera have sent it back.");
     return command;
   }

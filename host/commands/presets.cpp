@@ -50,7 +50,7 @@ class OnePresetAction : public CameraAction {
 class SetPresetAction final : public OnePresetAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("set", "Store where the camera looks now");
+    CLI::App* action = group.add_subcommand("set", "Store the present position");
     declare_number(*action);
     action->add_option("name", name_, "of the preset")->required()->type_name("");
     return action;
@@ -86,7 +86,7 @@ class RecallPresetAction final : public OnePresetAction {
 class ClearPresetAction final : public OnePresetAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("clear", "Forget a stored position");
+    CLI::App* action = group.add_subcommand("clear", "Clear a stored position");
     declare_number(*action);
     return action;
   }

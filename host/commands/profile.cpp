@@ -95,7 +95,7 @@ class ProfileCommand final : public Command {
     command->require_subcommand(1);
     list_ = command->add_subcommand("list", "List the installed profiles");
     list_->add_flag("--json", json_, "print the result as JSON");
-    show_ = command->add_subcommand("show", "Show what a profile says of its model");
+    show_ = command->add_subcommand("show", "Show what a profile defines");
     show_->add_option("profile", profile_, "name of an installed profile, or a file")->required()->type_name("");
     show_->add_flag("--json", json_, "print the result as JSON");
     check_ = command->add_subcommand("check", "Check profile files; names file, line and key of the first mistake");
@@ -145,7 +145,7 @@ class ProfileCommand final : public Command {
       Profile profile;
       ProfileError error;
       if (!LoadProfile(file, profile, error)) return terminal.report(wrong_profile(error));
-      table += fmt::format("{}: right\n", file);
+      table += fmt::format("{}: valid\n", file);
     }
     return write_result(terminal, table);
   }

@@ -54,7 +54,7 @@ struct Move {
 
 ExitCode run_move(const ModelCamera& camera, Terminal& terminal, const Move& move, std::optional<double> seconds) {
   if (!seconds) return report_change(camera, terminal, move.what, move.start(camera.device()));
-  Interrupt::finish_orderly();  // what moves is stopped, whatever happens
+  Interrupt::finish_orderly();  // a started move is stopped also after Ctrl-C
   const ELibDReturnCode started = move.start(camera.device());
   if (started != LIBD_OK) return report_change(camera, terminal, move.what, started);
   if (!Interrupt::requested()) Interrupt::wait(std::chrono::milliseconds(std::lround(*seconds * 1000)));
@@ -66,7 +66,7 @@ ExitCode run_move(const ModelCamera& camera, Terminal& terminal, const Move& mov
 bool has_focus(const ModelCamera& camera) { return camera.profile().control.focus.maxSpeed > 0; }
 bool has_zoom(const ModelCamera& camera) { return camera.profile().control.zoom.maxSpeed > 0; }
 
-// Both axes, told apart by their words.
+// Pan or tilt, by their words.
 class TurnAction final : public CameraAction {
  public:
   struct Words {
@@ -91,7 +91,7 @@ class TurnAction final : public CameraAction {
 
   std::optional<Problem> check() override {
     if (direction_ != words_.backward && direction_ != words_.forward) {
-      return usage("there is no such direction", fmt::format("It is {} or {}.", words_.backward, words_.forward));
+      return usage("unknown direction", fmt::format("It is {} or {}.", words_.backward, words_.forward));
     }
     return move_.check();
   }
@@ -134,7 +134,7 @@ class ZoomAction final : public CameraAction {
     if (number.ends_with('x')) number.remove_suffix(1);
     magnification_ = number_text<double>(number);
     if (magnification_ && std::isfinite(*magnification_) && *magnification_ > 0) return std::nullopt;
-    return usage("there is no such zoom", "It is wide, tele, or a magnification such as 4 or 2.5x.");
+    return usage("not a zoom direction or magnification", "It is wide, tele, or a magnification such as 4 or 2.5x.");
   }
 
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
@@ -152,7 +152,7 @@ class ZoomAction final : public CameraAction {
   ExitCode go(const ModelCamera& camera, Terminal& terminal) const {
     const auto position = zoom_position_at(*magnification_, camera.profile());
     if (!position) {
-      return terminal.report(usage("the lens does not zoom so far",
+      return terminal.report(usage("the zoom is out of the lens's range",
                                    fmt::format("It magnifies {} times.", zoom_range_text(camera.profile()))));
     }
     return report_change(camera, terminal, "zoom", camera.device().ZoomAbsolute(*position));
@@ -167,7 +167,7 @@ class ZoomAction final : public CameraAction {
 class FocusAction final : public CameraAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("focus", "Focus by hand, or leave it to the camera");
+    CLI::App* action = group.add_subcommand("focus", "Focus by hand or automatically");
     action->add_option("way", word_, "near, far, auto, manual, or a position from 0 to 100 percent")
         ->required()
         ->type_name("");
@@ -181,7 +181,7 @@ class FocusAction final : public CameraAction {
     }
     position_ = number_text<double>(word_);
     if (position_ && *position_ >= 0 && *position_ <= 100) return std::nullopt;
-    return usage("there is no such focus", "It is near, far, auto, manual, or a position from 0 to 100 percent.");
+    return usage("not a focus mode or position", "It is near, far, auto, manual, or a position from 0 to 100 percent.");
   }
 
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
@@ -239,7 +239,7 @@ class GotoAction final : public CameraAction {
     if (zoom_) {
       zoom = zoom_position_at(*zoom_, camera.profile());
       if (!zoom) {
-        return terminal.report(usage("the lens does not zoom so far",
+        return terminal.report(usage("the zoom is out of the lens's range",
                                      fmt::format("It magnifies {} times.", zoom_range_text(camera.profile()))));
       }
     }
@@ -253,7 +253,7 @@ class GotoAction final : public CameraAction {
     return on_scale_ ? static_cast<int>(value) : axis.position_at(value);
   }
   static Problem too_far(const Profile& profile) {
-    return usage("the camera does not turn so far",
+    return usage("the position is out of the camera's range",
                  fmt::format("It pans from {} and tilts from {} degrees.", pan_axis(profile).range_text(),
                              tilt_axis(profile).range_text()));
   }
@@ -347,7 +347,7 @@ std::unique_ptr<Command> make_ptz_command() {
   actions.push_back(std::make_unique<StopAction>());
   actions.push_back(make_ptz_watch_action());
   constexpr ActionGroupText kText{
-      "ptz", "Turn, zoom and focus a camera, and show where it looks",
+      "ptz", "Turn, zoom and focus a camera, and show its position",
       "For instance:\n  vexactl ptz 192.168.0.100 pan left --speed 30 --for 2\n"
       "  vexactl ptz 192.168.0.100 goto -45 10 --zoom 4\n  vexactl ptz 192.168.0.100 watch"};
   return std::make_unique<ActionGroup>(kText, check_moves, std::move(actions));

@@ -1,4 +1,4 @@
-// vexactl ptz watch: where a camera looks, as its pictures say.
+// vexactl ptz watch: a camera's position, taken from its pictures.
 #include "host/commands/ptz_watch.h"
 
 #include <fmt/format.h>
@@ -44,11 +44,10 @@ std::string view_line(const PtzView& view, const std::string& moment, WatchForma
 class WatchAction final : public CameraAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("watch", "Show where the camera looks, a line for each change");
+    CLI::App* action = group.add_subcommand("watch", "Show the camera's position, a line for each change");
     action->add_option("--count", count_, "end after this many lines")->check(CLI::PositiveNumber);
     action->footer(
-        "Angles are degrees: pan to the right, tilt up, and what the picture spans across and down. The first line "
-        "tells "
+        "Angles are degrees: pan to the right, tilt up, and what the picture spans across and down. The first line is "
         "the present position; with --json each line is a JSON object. Ends with Ctrl-C.");
     return action;
   }
@@ -89,8 +88,8 @@ class WatchAction final : public CameraAction {
   }
 
   static Problem no_position() {
-    return {ExitCode::kNoVideo, "the camera's pictures do not say where it looks",
-            "Let the camera put its position into the user data of its pictures."};
+    return {ExitCode::kNoVideo, "the camera's pictures carry no position",
+            "Configure the camera to put its position into the user data of its pictures."};
   }
 
   std::uint64_t count_ = 0;  // 0: no such end

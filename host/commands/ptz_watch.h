@@ -1,4 +1,4 @@
-// The action of vexactl ptz that shows where a camera looks.
+// The action of vexactl ptz that shows a camera's position.
 #ifndef HOST_COMMANDS_PTZ_WATCH_H_
 #define HOST_COMMANDS_PTZ_WATCH_H_
 

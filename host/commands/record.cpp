@@ -35,7 +35,7 @@ struct RecordOptions {
   bool quiet = false;
 };
 
-// What the summary says, as text and as JSON.
+// The summary's content, as text and as JSON.
 struct Recording {
   std::string camera;
   std::string model;
@@ -181,7 +181,7 @@ class RecordCommand final : public Command {
     return Problem{
         ExitCode::kNoVideo,
         fmt::format("video stream {} of the camera is set to {}", options_.video.stream, printable(video.codecName)),
-        sent ? fmt::format("Set it to {} on the camera, choose another with --stream, or let --out end in {} or .mkv.",
+        sent ? fmt::format("Set it to {} on the camera, choose another with --stream, or end --out in {} or .mkv.",
                            name_of(*promised), usual_extension(*sent))
              : fmt::format("Set it to {} on the camera, or choose another with --stream.", name_of(*promised))};
   }

@@ -18,7 +18,7 @@ using Json = nlohmann::ordered_json;
 class SettingsCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
-    CLI::App* command = program.add_subcommand("settings", "Show how a camera is set");
+    CLI::App* command = program.add_subcommand("settings", "Show a camera's settings");
     add_model_options(*command, options_, environment);
     command->footer("A setting that the camera does not report shows as \"-\", in JSON as null.");
     return command;
@@ -42,11 +42,10 @@ class SetCommand final : public Command {
     CLI::App* command = program.add_subcommand("set", "Change a camera's settings");
     add_model_options(*command, options_, environment);
     command->add_option("settings", changes_, "what to change, each as KEY=VALUE")->required()->type_name("");
-    command->footer(
-        "Settings:\n" + known_settings() +
-        "\nFor instance:\n  vexactl set 192.168.0.100 codec=H.264 size=1280x720 frame-rate=25 "
-        "bit-rate=4000\n\nA camera does not report its rotation: a change of the video "
-        "stream without rotation=180 turns the picture back.\n\nIt shows the settings as they are afterwards.");
+    command->footer("Settings:\n" + known_settings() +
+                    "\nFor instance:\n  vexactl set 192.168.0.100 codec=H.264 size=1280x720 frame-rate=25 "
+                    "bit-rate=4000\n\nA camera does not report its rotation: a change of the video "
+                    "stream without rotation=180 resets it to 0.\n\nIt shows the resulting settings.");
     return command;
   }
 
@@ -81,7 +80,7 @@ class DayNightCommand final : public Command {
     SettingChanges changes;
     if (mode_) changes.day_night = parse_day_night(*mode_);
     if (mode_ && !changes.day_night) {
-      return terminal.report({ExitCode::kUsage, "there is no such day/night mode", "It is auto, day or night."});
+      return terminal.report({ExitCode::kUsage, "unknown day/night mode", "Choose auto, day or night."});
     }
     const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
     if (!camera) return terminal.report(camera.error());

@@ -1,4 +1,4 @@
-// vexactl shadow: movements that a camera records while somebody moves it, and plays back.
+// vexactl shadow: movements by hand that a camera records and plays back.
 #include <fmt/format.h>
 
 #include <CLI/CLI.hpp>
@@ -59,8 +59,8 @@ class ShowShadowsAction final : public CameraAction {
 class ResumeShadowsAction final : public CameraAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("resume", "Say when a shadow tour goes on after a move by hand");
-    action->add_option("seconds", seconds_, "until it goes on; 0: it does not")
+    CLI::App* action = group.add_subcommand("resume", "Set when a shadow tour resumes after a move by hand");
+    action->add_option("seconds", seconds_, "until it resumes; 0: never")
         ->required()
         ->type_name("")
         ->check(CLI::Range(0, kLongestResume));
@@ -87,7 +87,7 @@ struct ShadowWords {
   const char* name;
   const char* description;
   StartShadow start;
-  StopShadow stop;  // null: the action does not end with "stop" behind it
+  StopShadow stop;  // null: the action takes no "stop"
 };
 
 class ShadowAction final : public CameraAction {
@@ -133,7 +133,7 @@ class ShadowAction final : public CameraAction {
 
 class StopShadowAction final : public CameraAction {
  public:
-  CLI::App* declare(CLI::App& group) override { return group.add_subcommand("stop", "End the shadow tour under way"); }
+  CLI::App* declare(CLI::App& group) override { return group.add_subcommand("stop", "End the running shadow tour"); }
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
     return report_change(camera, terminal, kShadowTours, camera.device().StopShadowTour());
   }

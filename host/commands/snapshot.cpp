@@ -21,7 +21,7 @@ namespace {
 class SnapshotCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
-    CLI::App* command = program.add_subcommand("snapshot", "Keep one picture of live video");
+    CLI::App* command = program.add_subcommand("snapshot", "Save one picture of live video");
     add_camera_options(*command, camera_, environment);
     command->add_option("--out", out_, "file to write: .jpg, .jpeg or .png")->required()->type_name("FILE");
     add_video_options(*command, video_);

@@ -112,14 +112,14 @@ std::optional<std::vector<int>> presets_in(const std::string& text) {
 class SetTourAction final : public ChangeToursAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("set", "Say which presets a tour visits");
+    CLI::App* action = group.add_subcommand("set", "Set which presets a tour visits");
     action->add_option("number", number_, "of the tour, counted from 1")->required()->type_name("");
     action->add_option("presets", text_, "numbers of the presets in turn, such as 1,2,3")->required()->type_name("");
     action->add_option("--stay", stay_, "seconds at each preset")->check(CLI::Range(1, kLongestStay));
     action->add_option("--speed", speed_, "of the turns, in the camera's units")->check(CLI::PositiveNumber);
-    action->add_option("--resume", resume_, "seconds after a move by hand until tours go on; 0: they do not")
+    action->add_option("--resume", resume_, "seconds after a move by hand until tours resume; 0: never")
         ->check(CLI::Range(0, kLongestResume));
-    action->footer("What is left out stays as it is. Tours that have no presets yet get the same, and stay off.");
+    action->footer("Settings left out stay as they are. Tours without presets get the same presets, and stay off.");
     return action;
   }
 
@@ -144,7 +144,7 @@ class SetTourAction final : public ChangeToursAction {
     }
     const int fastest = std::min(limits.panTilt.panMaxSpeed, limits.panTilt.tiltMaxSpeed);
     if (speed_ && *speed_ > fastest) {
-      return usage("the camera does not turn so fast", fmt::format("Its speeds are 1 to {}.", fastest));
+      return usage("the camera does not turn that fast", fmt::format("Its speeds are 1 to {}.", fastest));
     }
     tour->second.sequence = presets_;
     if (stay_) tour->second.stayTime = *stay_;
@@ -165,7 +165,7 @@ class SetTourAction final : public ChangeToursAction {
 class StartTourAction final : public ChangeToursAction {
  public:
   CLI::App* declare(CLI::App& group) override {
-    CLI::App* action = group.add_subcommand("start", "Let the camera go on a tour, and stop another");
+    CLI::App* action = group.add_subcommand("start", "Start a tour, and stop any other");
     action->add_option("number", number_, "of the tour, counted from 1")->required()->type_name("");
     return action;
   }
@@ -190,7 +190,7 @@ class StartTourAction final : public ChangeToursAction {
 
 class StopTourAction final : public ChangeToursAction {
  public:
-  CLI::App* declare(CLI::App& group) override { return group.add_subcommand("stop", "End the tour under way"); }
+  CLI::App* declare(CLI::App& group) override { return group.add_subcommand("stop", "End the running tour"); }
 
  private:
   std::optional<Problem> change(const ModelCamera&, SLibDCameraTourInfo& info) override {
@@ -201,7 +201,7 @@ class StopTourAction final : public ChangeToursAction {
       if (presets.empty()) presets = tour.sequence;
     }
     if (complete(info, presets)) return std::nullopt;
-    return usage("no tour has presets, so none is under way", "vexactl tour CAMERA set gives a tour its presets.");
+    return usage("no tour has presets, so none is running", "vexactl tour CAMERA set gives a tour its presets.");
   }
 };
 

@@ -63,7 +63,7 @@ void Interrupt::finish_orderly() { orderly = true; }
 bool Interrupt::requested() { return raised; }
 
 void Interrupt::wait(std::chrono::milliseconds time) {
-  // The byte stays in the pipe: once a signal has come, nothing waits any more.
+  // The byte stays in the pipe: after a signal no call waits any more.
   pollfd wake{wake_read, POLLIN, 0};
   poll(&wake, 1, static_cast<int>(time.count()));
 }

@@ -6,7 +6,7 @@
 
 namespace vexa::host {
 
-// How long to leave a driver alone that has nothing to hand out: short beside a picture's time, long beside a call.
+// The pause between two polls of a driver that has no data: short compared with a frame, long compared with a call.
 inline constexpr std::chrono::milliseconds kPollPause{3};
 
 // One for the process; every operation may be called from any thread after install().

@@ -10,7 +10,7 @@ namespace {
 
 constexpr std::string_view kEraseLine = "\r\x1b[K";
 
-// Nobody is left to be told when standard error itself fails.
+// A failure of standard error itself cannot be reported.
 void write_error_text(std::string_view text) { (void)write_all(STDERR_FILENO, text.data(), text.size()); }
 
 }  // namespace

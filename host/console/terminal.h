@@ -1,4 +1,4 @@
-// What vexactl says and where: results on standard output, all else on standard error.
+// The output of vexactl: results on standard output, everything else on standard error.
 #ifndef HOST_CONSOLE_TERMINAL_H_
 #define HOST_CONSOLE_TERMINAL_H_
 
@@ -31,7 +31,7 @@ class Terminal {
 
   [[nodiscard]] bool shows_progress() const { return shows_progress_; }
   void silence_progress() { shows_progress_ = false; }
-  // Replaces the progress line; nothing without a terminal.
+  // Replaces the progress line; does nothing without a terminal.
   void progress(std::string_view line);
   void clear_progress();
 

@@ -20,7 +20,7 @@ bool has_ffmpeg() {
 
 Problem without_ffmpeg(const std::string& what) {
   return {ExitCode::kUsage, fmt::format("this vexactl was built without FFmpeg's libraries; {} needs them", what),
-          "Use one that was built with them, or record the video and let ffmpeg do it."};
+          "Use a build that has them, or record the video and decode it with ffmpeg."};
 }
 
 #ifndef VEXA_WITH_FFMPEG
@@ -44,7 +44,7 @@ constexpr double kFastest = 1000;  // pictures a second; a timing above it is no
 
 Problem undecodable(Codec codec, const std::string& why) {
   return {ExitCode::kNoVideo, fmt::format("the camera's {} picture cannot be decoded: {}", name_of(codec), why),
-          "Try again; if it stays, record the stream and look at it with ffprobe."};
+          "Try again; if it persists, record the stream and examine it with ffprobe."};
 }
 
 FfmpegHandle<AVCodecContext> open_decoder(Codec codec) {

@@ -20,19 +20,19 @@ using FrameBytes = std::vector<std::uint8_t>;
 // The problem of a build that lacks FFmpeg's libraries; `what` needs them, for instance "decoding H.264".
 [[nodiscard]] Problem without_ffmpeg(const std::string& what);
 
-// Decodes `frames`, which begin with a key frame and follow each other as the driver handed them out, to the picture of
+// Decodes `frames`, which begin with a key frame and follow each other as the driver delivered them, to the picture of
 // the last.
 [[nodiscard]] Result<Picture> decode_picture(Codec codec, const std::vector<FrameBytes>& frames);
 
-// What a stream says of itself.
+// What a stream states about itself.
 struct StreamParameters {
   int width = 0;          // pixels, cropping applied
   int height = 0;         // pixels
-  double frame_rate = 0;  // pictures a second; 0: the stream does not say
+  double frame_rate = 0;  // pictures a second; 0: not stated
 };
 
-// Decodes a key frame for what it says of its stream. Of the codecs only H.264 states a frame rate that can be relied
-// on.
+// Decodes a key frame to learn its stream's parameters. Only the frame rate that H.264 states is reliable; the other
+// codecs give 0.
 [[nodiscard]] Result<StreamParameters> read_stream_parameters(Codec codec, const FrameBytes& key_frame);
 
 }  // namespace vexa::host

@@ -139,7 +139,7 @@ class MediaContainer::Muxer {
     parameters.extradata_size = static_cast<int>(size);
   }
 
-  // In the stream's units, behind the picture before.
+  // In the stream's units, after the previous picture.
   std::int64_t place_of(std::chrono::microseconds time) {
     if (!began_) began_ = time;
     const std::int64_t place = av_rescale_q((time - *began_).count(), kMicroseconds, stream_->time_base);

@@ -1,4 +1,4 @@
-// Where the pictures of a recording go.
+// The destination of a recording's pictures.
 #ifndef HOST_RECORDING_PICTURE_TARGET_H_
 #define HOST_RECORDING_PICTURE_TARGET_H_
 
@@ -12,7 +12,7 @@
 
 namespace vexa::host {
 
-// One picture as the driver handed it out.
+// One picture as the driver delivered it.
 struct RecordedPicture {
   const unsigned char* data = nullptr;
   std::size_t length = 0;
@@ -28,7 +28,7 @@ class PictureTarget {
   PictureTarget(const PictureTarget&) = delete;
   PictureTarget& operator=(const PictureTarget&) = delete;
 
-  // Says early what the first picture would most likely meet; nothing is created.
+  // Reports early the failure that the first picture would most likely meet. Creates no file.
   [[nodiscard]] virtual std::optional<Problem> check() const = 0;
   // The first picture is a key picture.
   [[nodiscard]] virtual std::optional<Problem> write(const RecordedPicture& picture) = 0;

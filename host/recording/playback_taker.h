@@ -29,8 +29,8 @@ struct PlaybackProgress {
   [[nodiscard]] std::chrono::duration<double> taken() const { return last - first; }
 };
 
-// Cameras do not tell the end of a playback: forward it has come when a picture of the recording's last second was
-// there and that second is over; backward, when pictures no longer come.
+// Cameras do not report the end of a playback. Forward it has ended when a picture of the recording's last second has
+// come and that second is over; backward, when pictures no longer come.
 class PlaybackTaker {
  public:
   using Report = std::function<void(const PlaybackProgress&)>;

@@ -54,7 +54,7 @@ std::optional<RecordingEnd> Recorder::limit_reached(Clock::time_point now) const
   return std::nullopt;
 }
 
-// The driver stamps pictures of some streams only; the others get the time when they came.
+// The driver stamps pictures of some streams only; the others get the time of their arrival.
 std::chrono::microseconds Recorder::time_of(const SLibDVideoFrameInfo& frame, Clock::time_point now) const {
   if (frame.seconds != 0) return std::chrono::seconds(frame.seconds) + std::chrono::microseconds(frame.microseconds);
   return std::chrono::duration_cast<std::chrono::microseconds>(wall_start_.time_since_epoch() + (now - start_));

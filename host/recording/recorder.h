@@ -1,4 +1,4 @@
-// Moves live pictures from a driver to where they are kept.
+// Moves live pictures from a driver to their file.
 #ifndef HOST_RECORDING_RECORDER_H_
 #define HOST_RECORDING_RECORDER_H_
 
@@ -17,8 +17,8 @@ namespace vexa::host {
 struct RecordingLimits {
   std::optional<double> seconds = {};        // from the first picture on
   std::optional<std::uint64_t> frames = {};  // with neither, a recording goes on until it is interrupted
-  double camera_rate = 0;                    // pictures a second, as the camera's settings say; 0: unknown
-  // Longest wait for the next picture. The driver's own word for silence may take twice the connection's time-out.
+  double camera_rate = 0;                    // pictures a second by the camera's settings; 0: unknown
+  // Longest wait for the next picture. The driver itself may report silence only after twice the connection's time-out.
   std::chrono::milliseconds silence{5000};
   std::chrono::seconds first_picture{30};  // longest wait for the key picture that a recording begins with
   std::function<RecordingMeter::Clock::time_point()> now = RecordingMeter::Clock::now;
@@ -26,7 +26,7 @@ struct RecordingLimits {
 
 enum class RecordingEnd { kComplete, kInterrupted, kSilent, kNoKeyPicture, kCannotWrite };
 
-// As JSON tells it, such as "complete".
+// Its word in JSON, such as "complete".
 [[nodiscard]] const char* name_of(RecordingEnd end);
 
 // Copies and returns, as the driver asks: it holds its queue meanwhile.

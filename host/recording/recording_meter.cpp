@@ -43,7 +43,7 @@ double RecordingMeter::recent_bit_rate(Clock::time_point now) const {
 double RecordingMeter::mean_bit_rate() const {
   const double seconds = std::chrono::duration<double>(last_ - first_).count();
   if (seconds <= 0) return 0;
-  // The last picture's time has not passed yet: its bytes belong to the interval behind it.
+  // The last picture's time has not passed yet: its bytes belong to the interval after it.
   return static_cast<double>(bytes_ - last_bytes_) * 8 / seconds;
 }
 

@@ -12,13 +12,13 @@
 
 namespace vexa::host {
 
-// Times are the host's, when a picture came into its hands: live pictures carry no time stamps of their own.
+// Times are the host's, of a picture's arrival: live pictures carry no time stamps of their own.
 class RecordingMeter {
  public:
   using Clock = std::chrono::steady_clock;
 
   void add(std::size_t bytes, bool key_picture, Clock::time_point now);
-  // Pictures a second, as the camera's settings say; a rate that the stream itself states counts more. 0: unknown.
+  // Pictures a second by the camera's settings, 0 for unknown. A rate that the stream itself states has precedence.
   void set_camera_rate(double rate) { camera_rate_ = rate; }
   void set_stream(const StreamParameters& stream) { stream_ = stream; }
 
@@ -37,7 +37,7 @@ class RecordingMeter {
   // Bits a second from the first picture to the last; 0 while there is no time between them.
   [[nodiscard]] double mean_bit_rate() const;
 
-  // Pictures that a stream of the stated rate has sent from the first one received until now; nothing when no rate is
+  // Pictures that a stream of the stated rate has sent from the first one received until now; nullopt when no rate is
   // stated. One picture may be on its way. A camera that runs slower than it says counts as losing pictures: an
   // estimate.
   [[nodiscard]] std::optional<std::uint64_t> expected_frames(Clock::time_point now) const;

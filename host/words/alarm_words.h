@@ -14,7 +14,8 @@ namespace vexa::host {
 // "input", "output", "motion", "tampering" or "audio".
 [[nodiscard]] std::string kind_of(const SLibDPinInfo& pin);
 
-// Remembers the states of pins and tells which of a status call's are new. A pin not seen before counts as inactive.
+// Remembers the states of pins and returns those of a status call that have changed. A pin not seen before counts as
+// inactive.
 class PinStates {
  public:
   [[nodiscard]] std::vector<SLibDPinInfo> changed(const std::vector<SLibDPinInfo>& pins);

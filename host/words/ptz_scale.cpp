@@ -9,7 +9,7 @@ namespace vexa::host {
 namespace {
 
 constexpr double kHalfSpans = 2.0 * kLargestPosition;  // the driver's scale covers half the span
-constexpr double kStatusAngle = 1000;                  // a status tells pan and tilt in thousandths of a degree
+constexpr double kStatusAngle = 1000;                  // a status has pan and tilt in thousandths of a degree
 constexpr double kViewAngle = 10000;                   // and viewing angles in ten-thousandths
 
 std::optional<int> on_scale(double position) {

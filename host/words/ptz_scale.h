@@ -33,7 +33,7 @@ struct PtzAxis {
 // "1 to 18"
 [[nodiscard]] std::string zoom_range_text(const Profile& profile);
 
-// What a status says, in degrees.
+// A status in degrees.
 struct PtzView {
   double pan = 0;
   double tilt = 0;

@@ -98,7 +98,7 @@ Result<SettingChanges> parse_changes(const std::vector<std::string>& texts) {
     }
     const SettingKey* key = find_key(std::string_view(text).substr(0, equals));
     if (key == nullptr) {
-      return fail(usage("there is no setting of that name", fmt::format("Known are: {}.", known_keys())));
+      return fail(usage("unknown setting", fmt::format("The settings are: {}.", known_keys())));
     }
     if (std::find(seen.begin(), seen.end(), key->key) != seen.end()) {
       return fail(usage(fmt::format("{} is given twice", key->key), "Give each setting once."));

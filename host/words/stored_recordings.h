@@ -13,8 +13,8 @@ namespace vexa::host {
 
 using StoredRecordings = std::vector<SLibDEdgeStorageRecord>;
 
-// The name that a recording gives its file, with `end` behind it: no two names give the same one, and none leads out of
-// its folder.
+// The file name for a recording, `end` appended. Different recordings get different names, and none leads out of its
+// folder.
 [[nodiscard]] std::string file_name_of(const std::string& recording, const std::string& end);
 
 [[nodiscard]] std::chrono::seconds start_of(const SLibDEdgeStorageRecord& record);

@@ -142,7 +142,7 @@ TEST_F(EdgeByCommand, AMissingCardIsToldWhenRecordingIsSwitchedOn) {
   const ProgramResult result = edge({"mode", "on", "--watch", "10.0.0.1"});
   EXPECT_EQ(result.exit_code, 2);
   EXPECT_EQ(result.err,
-            "vexactl: the card has no free space, or there is none; recording is on\n"
+            "vexactl: the card is full or missing; recording is on\n"
             "  vexactl edge CAMERA delete makes room.\n");
   EXPECT_EQ(edge({"list"}).exit_code, 2);
 }
@@ -204,11 +204,11 @@ TEST_F(EdgeByCommand, WhatTheCardDoesNotHoldIsNotAskedFor) {
     const ProgramResult result = edge(arguments);
     EXPECT_EQ(result.exit_code, 1);
     EXPECT_EQ(result.err,
-              "vexactl: the card holds no recording of that name\n  vexactl edge CAMERA list shows those there are.\n");
+              "vexactl: the card has no recording of that name\n  vexactl edge CAMERA list shows what it has.\n");
   }
   const ProgramResult other = edge({"get", name, "--out", "a.m4v"});
   EXPECT_EQ(other.exit_code, 4);
-  EXPECT_EQ(other.err, "vexactl: the recording is of h264\n  Let --out end in .h264 or .mkv.\n");
+  EXPECT_EQ(other.err, "vexactl: the recording is of h264\n  End --out in .h264 or .mkv.\n");
   EXPECT_EQ(asked("DESCRIBE"), 0u);
   EXPECT_EQ(asked("DeletebyName"), 0u);
 }
@@ -250,7 +250,7 @@ TEST_F(EdgeByCommand, DeleteAsksFirstUnlessToldNotTo) {
   const ProgramResult no_answer = edge({"delete", names[0]});
   EXPECT_EQ(no_answer.exit_code, 1);
   EXPECT_EQ(no_answer.err, "Delete the recording " + names[0] +
-                               "? [y/N]\nvexactl: nothing was deleted: there is no answer\n"
+                               "? [y/N]\nvexactl: nothing was deleted: no answer was given\n"
                                "  Answer y, or give --yes.\n");
   for (const char* no : {"", "n", "Y es"}) {
     const ProgramResult result = answered(no, "--all");
@@ -320,7 +320,7 @@ TEST_F(EdgeByCommand, ModelsWithoutACardAreRefused) {
   EXPECT_EQ(result.exit_code, 1);
   EXPECT_EQ(result.err,
             "vexactl: cameras of model LMX-C100 have no card to record on\n"
-            "  vexactl profile show tells what a model has.\n");
+            "  vexactl profile show lists what a model has.\n");
 }
 
 TEST_F(EdgeByCommand, BackfillFetchesTheSecondsWithoutNetworkAndNothingElse) {

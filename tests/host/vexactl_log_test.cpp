@@ -151,7 +151,7 @@ TEST_F(LogCommand, ALogThatCannotBeWrittenEndsWithFive) {
 TEST_F(LogCommand, AFileThatIsNoLogEndsWithOne) {
   folder().make_file("empty");
   folder().make_file("garbage", std::string("\0\x1b\xff\r\n\n", 6) + std::string(1 << 20, 'x'));
-  const std::pair<const char*, const char*> cases[] = {{"empty", "is empty"}, {"garbage", "is no CGI log"}};
+  const std::pair<const char*, const char*> cases[] = {{"empty", "is empty"}, {"garbage", "is not a CGI log"}};
   for (const auto& [name, why] : cases) {
     const ProgramResult result = run({"log", name});
     EXPECT_EQ(result.exit_code, 1);
@@ -174,7 +174,7 @@ TEST_F(LogCommand, SaysHowManyLinesItLeftOut) {
   const ProgramResult result = run({"log", "cgi.log"});
   EXPECT_EQ(result.exit_code, 0);
   EXPECT_EQ(result.out, kHead + row("/a", "OK"));
-  EXPECT_EQ(result.err, "vexactl: left out what is no line of a CGI log: 2 in cgi.log\n");
+  EXPECT_EQ(result.err, "vexactl: skipped lines that are not of a CGI log: 2 in cgi.log\n");
 }
 
 TEST_F(LogCommand, FollowsWhatIsAppendedThroughRotationAndTruncationUntilCtrlC) {

@@ -117,8 +117,9 @@ TEST_F(PtzByCommand, WhatTheModelCannotDoIsRefused) {
   start_model("LMX-C100");
   EXPECT_EQ(act("ptz", {"focus", "auto"}).err,
             "vexactl: cameras of model LMX-C100 have no focus motor\n"
-            "  vexactl profile show tells what a model has.\n");
-  EXPECT_EQ(act("ptz", {"zoom", "19"}).err, "vexactl: the lens does not zoom so far\n  It magnifies 1 to 18 times.\n");
+            "  vexactl profile show lists what a model has.\n");
+  EXPECT_EQ(act("ptz", {"zoom", "19"}).err,
+            "vexactl: the zoom is out of the lens's range\n  It magnifies 1 to 18 times.\n");
   EXPECT_EQ(act("ptz", {"goto", "0", "0", "--zoom", "19"}).exit_code, 1);
   EXPECT_EQ(act("ptz", {"goto", "181", "0"}).exit_code, 1);
   EXPECT_EQ(act("ptz", {"goto", "0", "-91"}).exit_code, 1);
@@ -128,7 +129,7 @@ TEST_F(PtzByCommand, WhatTheModelCannotDoIsRefused) {
   EXPECT_EQ(act("tour", {"set", "1", "1,2", "--speed", "19"}).exit_code, 1);
   EXPECT_EQ(act("shadow", {"show"}).err,
             "vexactl: cameras of model LMX-C100 have no shadow tours\n"
-            "  vexactl profile show tells what a model has.\n");
+            "  vexactl profile show lists what a model has.\n");
   EXPECT_EQ(orders(), std::vector<std::string>());
 }
 
@@ -236,7 +237,7 @@ TEST_F(PtzByCommand, ATourIsSetStartedAndStopped) {
   EXPECT_EQ(act("tour", {"start", "1"}).err,
             "vexactl: tour 1 has no presets\n  Give it some: vexactl tour CAMERA set 1 1,2,3.\n");
   EXPECT_EQ(act("tour", {"stop"}).err,
-            "vexactl: no tour has presets, so none is under way\n"
+            "vexactl: no tour has presets, so none is running\n"
             "  vexactl tour CAMERA set gives a tour its presets.\n");
   EXPECT_EQ(orders(), std::vector<std::string>());
   EXPECT_EQ(act("tour", {"set", "1", "1,16,3", "--stay", "15", "--speed", "18", "--resume", "30"}).exit_code, 0);

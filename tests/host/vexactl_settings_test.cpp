@@ -252,7 +252,7 @@ TEST_F(SettingsOfACamera, DayNightShowsAndSets) {
   EXPECT_EQ(run({"daynight", place(), "--json"}).out, "{\n  \"day-night\": \"night\"\n}\n");
   const ProgramResult wrong = run({"daynight", place(), "dusk"});
   EXPECT_EQ(wrong.exit_code, 1);
-  EXPECT_EQ(wrong.err, "vexactl: there is no such day/night mode\n  It is auto, day or night.\n");
+  EXPECT_EQ(wrong.err, "vexactl: unknown day/night mode\n  Choose auto, day or night.\n");
 }
 
 TEST_F(SettingsOfACamera, AProfileOnTheCommandLineWins) {
@@ -289,7 +289,7 @@ TEST_F(ProfileCommands, ListShowAndCheck) {
   EXPECT_EQ(json["ptz"], "move");
   const ProgramResult check = run({"profile", "check", VEXA_SOURCE_DIR "/models/profiles/VX-2000.json"});
   EXPECT_EQ(check.exit_code, 0);
-  EXPECT_EQ(check.out, VEXA_SOURCE_DIR "/models/profiles/VX-2000.json: right\n");
+  EXPECT_EQ(check.out, VEXA_SOURCE_DIR "/models/profiles/VX-2000.json: valid\n");
 }
 
 TEST_F(ProfileCommands, CheckNamesFileLineAndKey) {

@@ -50,14 +50,13 @@ struct Refusal {
 
 TEST(CommandLine, EachMistakeEndsWithOneAndSaysWhatToDo) {
   const Refusal refusals[] = {
-      {{}, "vexactl: the first argument is not a command\n  See vexactl --help for the commands.\n"},
-      {{"inof", "cam"}, "vexactl: the first argument is not a command\n  See vexactl --help for the commands.\n"},
+      {{}, "vexactl: the command is missing or unknown\n  See vexactl --help for the commands.\n"},
+      {{"inof", "cam"}, "vexactl: the command is missing or unknown\n  See vexactl --help for the commands.\n"},
       {{"info"}, "vexactl: --camera is required\n  See vexactl info --help.\n"},
-      {{"info", "cam", "extra"}, "vexactl: there is an argument too many\n  See vexactl info --help.\n"},
-      {{"info", "cam", "--password=hunter2"}, "vexactl: there is no option --password\n  See vexactl info --help.\n"},
-      {{"info", "cam", "--password", "hunter2"},
-       "vexactl: there is no option --password\n  See vexactl info --help.\n"},
-      {{"info", "cam", "-phunter2"}, "vexactl: there is no option -p\n  See vexactl info --help.\n"},
+      {{"info", "cam", "extra"}, "vexactl: there are too many arguments\n  See vexactl info --help.\n"},
+      {{"info", "cam", "--password=hunter2"}, "vexactl: unknown option --password\n  See vexactl info --help.\n"},
+      {{"info", "cam", "--password", "hunter2"}, "vexactl: unknown option --password\n  See vexactl info --help.\n"},
+      {{"info", "cam", "-phunter2"}, "vexactl: unknown option -p\n  See vexactl info --help.\n"},
       {{"info", "cam", "--user"}, "vexactl: --user: 1 required NAME missing\n  See vexactl info --help.\n"},
       {{"info", "cam", "--timeout", "hunter2"},
        "vexactl: the value of --timeout cannot be used\n  See vexactl info --help.\n"},
@@ -97,7 +96,7 @@ TEST(CommandLine, EachMistakeEndsWithOneAndSaysWhatToDo) {
        "vexactl: the action is missing, or not one of the command's\n  See vexactl ptz --help.\n"},
       {{"ptz", "cam", "pan"}, "vexactl: direction is required\n  See vexactl ptz CAMERA pan --help.\n"},
       {{"ptz", "cam", "pan", "left", "--password=hunter2"},
-       "vexactl: there is no option --password\n  See vexactl ptz CAMERA pan --help.\n"},
+       "vexactl: unknown option --password\n  See vexactl ptz CAMERA pan --help.\n"},
       {{"profile", "show"}, "vexactl: profile is required\n  See vexactl profile show --help.\n"},
       {{"log"}, "vexactl: file is required\n  See vexactl log --help.\n"},
       {{"log", "missing"},
@@ -123,7 +122,7 @@ TEST(CommandLine, EachMistakeEndsWithOneAndSaysWhatToDo) {
       {{"record", "cam", "--out", "f", "--transport", "tcp"},
        "vexactl: --transport is neither udp nor http\n  udp when not given.\n"},
       {{"listen", "cam", "--out", "f", "--codec", "g711"},
-       "vexactl: --codec is none of g711_64, g726_40, g726_32, g726_24 and g726_16\n  For instance: --codec "
+       "vexactl: --codec must be g711_64, g726_40, g726_32, g726_24 or g726_16\n  For instance: --codec "
        "g711_64.\n"},
       {{"listen", "cam", "--out", "f", "--seconds", "0"},
        "vexactl: --seconds is not a number above 0\n  For instance: --seconds 10.\n"},

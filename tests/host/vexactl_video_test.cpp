@@ -78,7 +78,7 @@ TEST_F(VideoCommands, ANameOfAnotherCodecIsRefused) {
   EXPECT_EQ(result.exit_code, 4);
   EXPECT_EQ(result.err,
             "vexactl: video stream 1 of the camera is set to MPEG4\n"
-            "  Set it to JPEG on the camera, choose another with --stream, or let --out end in .m4v or .mkv.\n");
+            "  Set it to JPEG on the camera, choose another with --stream, or end --out in .m4v or .mkv.\n");
   EXPECT_FALSE(std::filesystem::exists(folder() / "live.mjpeg"));
 }
 
@@ -132,8 +132,8 @@ TEST_F(VideoCommands, SoundOfOtherCodecsIsKeptRawOnly) {
   result = run({"listen", place(), "--out", "live.wav"});
   EXPECT_EQ(result.exit_code, 1);
   EXPECT_EQ(result.err,
-            "vexactl: the camera's sound is G726, which a .wav here does not hold\n"
-            "  Give --out another ending for the sound as it comes, or switch to --codec g711_64.\n");
+            "vexactl: the camera's sound is G726, which vexactl does not write to .wav\n"
+            "  Give --out another extension for the sound as received, or switch to --codec g711_64.\n");
 }
 
 TEST_F(VideoCommands, SoundThatIsOffEndsWithFour) {
@@ -221,7 +221,7 @@ TEST_F(VideoCommands, WhatNeedsFfmpegsLibrariesIsRefusedBeforeAnythingIsAsked) {
   EXPECT_EQ(result.exit_code, 1);
   EXPECT_EQ(result.err,
             "vexactl: this vexactl was built without FFmpeg's libraries; a picture of H.264 video needs them\n"
-            "  Use one that was built with them, or record the video and let ffmpeg do it.\n");
+            "  Use a build that has them, or record the video and decode it with ffmpeg.\n");
   EXPECT_EQ(camera().journal().count("PLAY"), 0U);
 }
 
