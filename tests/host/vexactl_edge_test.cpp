@@ -208,7 +208,7 @@ TEST_F(EdgeByCommand, WhatTheCardDoesNotHoldIsNotAskedFor) {
   }
   const ProgramResult other = edge({"get", name, "--out", "a.m4v"});
   EXPECT_EQ(other.exit_code, 4);
-  EXPECT_EQ(other.err, "vexactl: the recording is of h264\n  Let --out end in .h264 or .mkv.\n");
+  EXPECT_EQ(other.err, "vexactl: the recording is of h264\n  End --out in .h264 or .mkv.\n");
   EXPECT_EQ(asked("DESCRIBE"), 0u);
   EXPECT_EQ(asked("DeletebyName"), 0u);
 }

@@ -86,7 +86,7 @@ TEST_F(RecordCommand, AStreamOfAnotherCodecEndsWithFour) {
   EXPECT_EQ(result.exit_code, 4);
   EXPECT_EQ(result.err,
             "vexactl: video stream 1 of the camera is set to JPEG\n"
-            "  Set it to H.264 on the camera, choose another with --stream, or let --out end in .mjpeg or .mkv.\n");
+            "  Set it to H.264 on the camera, choose another with --stream, or end --out in .mjpeg or .mkv.\n");
 }
 
 TEST_F(RecordCommand, WritesPicturesToStandardOutputAndTheSummaryBesideThem) {

@@ -78,7 +78,7 @@ TEST_F(VideoCommands, ANameOfAnotherCodecIsRefused) {
   EXPECT_EQ(result.exit_code, 4);
   EXPECT_EQ(result.err,
             "vexactl: video stream 1 of the camera is set to MPEG4\n"
-            "  Set it to JPEG on the camera, choose another with --stream, or let --out end in .m4v or .mkv.\n");
+            "  Set it to JPEG on the camera, choose another with --stream, or end --out in .m4v or .mkv.\n");
   EXPECT_FALSE(std::filesystem::exists(folder() / "live.mjpeg"));
 }
 
