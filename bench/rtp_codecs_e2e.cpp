@@ -14,7 +14,6 @@
 #include <vector>
 
 #include "device/driver_state.h"
-#include "vexa/vexa_common.h"
 #include "virtual_camera/options.h"
 #include "virtual_camera/rtp_stream.h"
 
@@ -78,7 +77,7 @@ class Reader : public CVexaCommon {
     m_ConnectionInfo.timeout = 200;
     m_RtpClockRate = 90000;
     m_StreamSocket = socket;
-    if (!AllocateRtpPackets()) std::abort();
+    if (!m_State->allocate_packets()) std::abort();
   }
   ~Reader() override {
     m_StreamSocket = -1;

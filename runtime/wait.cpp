@@ -1,6 +1,7 @@
 // Waiting on events with one poll; the signal stays in the pipe.
 #include <poll.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <chrono>
 #include <cstddef>
@@ -9,6 +10,7 @@
 #include <new>
 #include <optional>
 
+#include "runtime/base/deadline.h"
 #include "runtime/handle.h"
 
 namespace {
@@ -37,18 +39,12 @@ std::optional<Entries> entries_of(unsigned long count, typedHandle* const* handl
   return entries;
 }
 
-// Milliseconds left, rounded up so that no wait ends early.
-int left_until(Clock::time_point deadline) {
-  const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - Clock::now()).count();
-  return left > 0 ? static_cast<int>(left) : 0;
-}
-
 // One poll that a signal handler does not cut short; a negative time-out is none.
 void poll_through_signals(Entries& entries, int timeout_ms) {
   const auto deadline = Clock::now() + std::chrono::milliseconds(timeout_ms);
   // Kept: a poll that fails otherwise counts as one that found nothing; hosts see WAIT_TIMEOUT, not WAIT_FAILED.
   while (poll(entries.list.get(), entries.count, timeout_ms) < 0 && errno == EINTR) {
-    if (timeout_ms > 0) timeout_ms = left_until(deadline);
+    if (timeout_ms > 0) timeout_ms = std::max(vexa::milliseconds_until(deadline), 0);
   }
 }
 

@@ -51,7 +51,7 @@ WholeFrames take_from_queue(LiveCamera& camera, MediaDriver& driver) {
 WholeFrames take_from_assembly(LiveCamera& camera, MediaDriver& driver) {
   constexpr int kPatience = 500;  // milliseconds: longer than a picture is ever held back
   driver.use(camera->address(), camera->http_port(), kPatience);
-  EXPECT_TRUE(driver.OpenLiveRtp(1));
+  EXPECT_EQ(driver.state().open_live_rtp(1), LIBD_OK);
   std::vector<unsigned char> buffer(1200000);
   WholeFrames frames;
   for (;;) {
@@ -59,7 +59,7 @@ WholeFrames take_from_assembly(LiveCamera& camera, MediaDriver& driver) {
     CVexaCommon::VideoFrameInfo frame;
     frame.data = buffer.data();
     frame.capacity = static_cast<unsigned int>(buffer.size());
-    const ELibDReturnCode code = driver.GetRtpCurrentVideoFrame(driver.StreamCodec(), frame);
+    const ELibDReturnCode code = driver.GetRtpCurrentVideoFrame(driver.state().stream_codec(), frame);
     if (code == LIBD_OK) frames.emplace_back(buffer.begin(), buffer.begin() + frame.length);
     if (code != LIBD_OK && finished) return frames;
   }

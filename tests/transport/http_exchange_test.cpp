@@ -16,7 +16,7 @@ TEST_P(HttpExchange, GoesAsWritten) {
   const std::string argument = call.substr(call.find(' ') + 1);
   std::string answer = "untouched";
   const ELibDReturnCode result = call.starts_with("inquire ") ? driver_.SendInqCommand(argument, answer)
-                                                              : driver_.SendCommand("%s", argument.c_str());
+                                                              : driver_.camera().send("%s", argument.c_str());
   EXPECT_EQ(camera.finish(), "");
   expect_result("result", std::to_string(result));
   expect_result("answer", answer);
