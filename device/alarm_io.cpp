@@ -92,7 +92,7 @@ ELibDReturnCode CVexaCommon::StartIoStreaming() {
 ELibDReturnCode CVexaCommon::StopIoStreaming() {
   const bool was_open = m_State->alarms.stop();
   {
-    const vexa::Guard guard(m_IoStreamLock);
+    const vexa::TurnGuard guard(m_IoStreamLock, m_State->alarms.turn());
     m_PendingPins.clear();
   }
   return was_open ? m_State->camera.send("/command/system.cgi?AlarmData=off") : LIBD_OK;
