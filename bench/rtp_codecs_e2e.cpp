@@ -78,7 +78,7 @@ class Reader : public CVexaCommon {
     m_ConnectionInfo.timeout = 200;
     m_RtpClockRate = 90000;
     m_StreamSocket = socket;
-    if (!AllocateRtpPackets()) std::abort();
+    if (!m_State->allocate_packets()) std::abort();
   }
   ~Reader() override {
     m_StreamSocket = -1;

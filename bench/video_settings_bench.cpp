@@ -3,7 +3,7 @@
 
 #include <string>
 
-#include "vexa/vexa_common.h"
+#include "device/driver_state.h"
 
 namespace {
 
@@ -16,12 +16,11 @@ const std::string kAnswer =
 class Reader : public CVexaCommon {
  public:
   void read(const std::string& answer) {
-    StoreCameraInquiry({});
-    StoreCameraInquiry(answer);
-    m_ResolutionFilter.Initialize(m_FixedSystemInfo.modelName);
-    ReadCameraProperties(answer);
-    ReadStreamSettings(answer, 1);
-    ReadVideoPorts(answer);
+    m_State->store_camera_inquiry({});
+    m_State->store_camera_inquiry(answer);
+    SLibDCameraInfo info;
+    info.streamNumber = 1;
+    m_State->read_camera_answer(answer, info);
   }
 
   void forget() { m_CameraInfo = SLibDCameraInfo(); }

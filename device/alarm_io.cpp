@@ -1,21 +1,37 @@
 // Alarm pins: what the camera has, the polled stream of their states, and the outputs.
+#include <cerrno>
 #include <chrono>
-#include <new>
 #include <thread>
 #include <utility>
 
 #include "device/cgi/alarm_text.h"
+#include "device/cgi/input_part.h"
 #include "device/driver_state.h"
-#include "device/raised_timeout.h"
-#include "runtime/base/sync.h"
-#include "vexa/vexa_common.h"
+#include "transport/failure.h"
+#include "transport/http_receive.h"
+#include "transport/http_stream.h"
 
 namespace {
 
 constexpr int kAlarmRequestTimeout = 10000;  // milliseconds
 constexpr int kFailedStreamTimeout = 3000;   // milliseconds
+constexpr int kSilenceGrace = 15000;         // milliseconds
 constexpr std::chrono::milliseconds kAlarmDataSettles{100};
-constexpr int kSensorAnswer = 512;  // bytes
+
+ELibDReturnCode ask_tampering(vexa::CameraLink& camera, int number, SLibDIoBoxInfo& info) {
+  std::string answer;
+  if (const auto asked = camera.inquire("system", answer); asked != LIBD_OK) return asked;
+  info.pins.push_back(vexa::pin_of(number, PIN_TYPE_TAMPERING, vexa::detector_enabled(answer, "TamperingFunc=")));
+  info.tamperLevel = vexa::tamper_level_of(answer).value_or(info.tamperLevel);
+  return LIBD_OK;
+}
+
+ELibDReturnCode ask_audio_detection(vexa::CameraLink& camera, int number, SLibDIoBoxInfo& info) {
+  std::string answer;
+  if (const auto asked = camera.inquire("audiodetection", answer); asked != LIBD_OK) return asked;
+  info.pins.push_back(vexa::pin_of(number, PIN_TYPE_AUDIO_DETECTION, vexa::detector_enabled(answer, "ADFunc=")));
+  return LIBD_OK;
+}
 
 }  // namespace
 
@@ -25,128 +41,97 @@ ELibDReturnCode CVexaCommon::GetFixedIoboxInfo(SLibDFixedIoBoxInfo& info) {
   return LIBD_OK;
 }
 
-// Safe: pins that memory does not hold are a failure and not an exception; the stored record is whole all the same.
-ELibDReturnCode CVexaCommon::GetIoBoxInfo(SLibDIoBoxInfo& info) try {
-  // Kept: the list is not emptied first; hosts hand in an empty one.
-  vexa::append_pins(m_FixedIoBoxInfo, info.pins);
-  int number = vexa::first_detector_number(m_FixedIoBoxInfo);
-  if (m_FixedIoBoxInfo.tamperingDetection) {
-    const ELibDReturnCode asked = AskTampering(number++, info);
-    if (asked != LIBD_OK) return asked;
-  }
-  if (m_FixedIoBoxInfo.audioDetection) {
-    const ELibDReturnCode asked = AskAudioDetection(number, info);
-    if (asked != LIBD_OK) return asked;
-  }
-  SLibDIoBoxInfo stored = info;
-  const vexa::Guard guard(m_ConnectionLock);
-  info.vmdType = stored.vmdType = m_IoBoxInfo.vmdType;
-  std::swap(m_IoBoxInfo, stored);
-  return LIBD_OK;
-} catch (const std::bad_alloc&) {
-  return FailMemory();
+ELibDReturnCode CVexaCommon::GetIoBoxInfo(SLibDIoBoxInfo& info) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    // Kept: the list is not emptied first; hosts hand in an empty one.
+    vexa::append_pins(m_FixedIoBoxInfo, info.pins);
+    int number = vexa::first_detector_number(m_FixedIoBoxInfo);
+    if (m_FixedIoBoxInfo.tamperingDetection) {
+      const ELibDReturnCode asked = ask_tampering(m_State->camera, number++, info);
+      if (asked != LIBD_OK) return asked;
+    }
+    if (m_FixedIoBoxInfo.audioDetection) {
+      const ELibDReturnCode asked = ask_audio_detection(m_State->camera, number, info);
+      if (asked != LIBD_OK) return asked;
+    }
+    SLibDIoBoxInfo stored = info;
+    const vexa::Guard guard(m_ConnectionLock);
+    info.vmdType = stored.vmdType = m_IoBoxInfo.vmdType;
+    std::swap(m_IoBoxInfo, stored);
+    return LIBD_OK;
+  });
 }
 
-ELibDReturnCode CVexaCommon::AskTampering(int number, SLibDIoBoxInfo& info) {
-  std::string answer;
-  if (SendInqCommand("system", answer) != LIBD_OK) return LatestErrorCode();
-  info.pins.push_back(vexa::pin_of(number, PIN_TYPE_TAMPERING, vexa::detector_enabled(answer, "TamperingFunc=")));
-  info.tamperLevel = vexa::tamper_level_of(answer).value_or(info.tamperLevel);
-  return LIBD_OK;
-}
-
-ELibDReturnCode CVexaCommon::AskAudioDetection(int number, SLibDIoBoxInfo& info) {
-  std::string answer;
-  if (SendInqCommand("audiodetection", answer) != LIBD_OK) return LatestErrorCode();
-  info.pins.push_back(vexa::pin_of(number, PIN_TYPE_AUDIO_DETECTION, vexa::detector_enabled(answer, "ADFunc=")));
-  return LIBD_OK;
-}
-
-// Safe: as GetIoBoxInfo; a stream whose first states memory does not hold is stopped again.
-ELibDReturnCode CVexaCommon::StartIoStreaming() try {
+ELibDReturnCode CVexaCommon::StartIoStreaming() {
   StopIoStreaming();
   {
-    const vexa::RaisedTimeout slow(m_ConnectionInfo.timeout, m_ConnectionLock, {kAlarmRequestTimeout, m_SavedTimeout});
-    const ELibDReturnCode sent = SendCommand("/command/system.cgi?AlarmData=on");
+    const vexa::RaisedTimeout slow = m_State->connection.raised(kAlarmRequestTimeout);
+    const ELibDReturnCode sent = m_State->camera.send("/command/system.cgi?AlarmData=on");
     if (sent != LIBD_OK) return sent;
   }
   std::this_thread::sleep_for(kAlarmDataSettles);
-  const ELibDReturnCode opened = OpenIoStream();
+  const ELibDReturnCode opened = m_State->open_alarms();
   if (opened != LIBD_OK) return opened;
   std::string answer;
-  if (!AskSensors(answer)) {
-    // Kept: the stop has an exchange of its own, and its outcome is what is told.
-    StopIoStreaming();
-    return LatestErrorCode();
+  if (m_State->camera.inquire("sensor", answer) != LIBD_OK) {
+    // Kept: the stop has an exchange of its own, and its outcome is the one that is returned.
+    const ELibDReturnCode stopped = StopIoStreaming();
+    return stopped == LIBD_OK ? LIBD_FAILED : stopped;
   }
-  const vexa::TurnGuard guard(m_IoStreamLock, m_State->io_turn);
-  m_PendingPins = vexa::sensor_pins(answer);
+  std::vector<SLibDPinInfo> pins;
+  if (!vexa::within_memory([&] { pins = vexa::sensor_pins(answer); })) {
+    StopIoStreaming();
+    return m_State->errors.out_of_memory();
+  }
+  const vexa::TurnGuard guard(m_IoStreamLock, m_State->alarms.turn());
+  m_PendingPins = std::move(pins);
   m_LastIoDataTime = m_State->now();
   return LIBD_OK;
-} catch (const std::bad_alloc&) {
-  StopIoStreaming();
-  return FailMemory();
-}
-
-ELibDReturnCode CVexaCommon::OpenIoStream() {
-  const vexa::TurnGuard guard(m_IoStreamLock, m_State->io_turn);
-  // Safe: what a start in another thread has opened meanwhile is not lost open.
-  if (m_IoStreamSocket != -1) http_close(m_IoStreamSocket);
-  {
-    const vexa::RaisedTimeout slow(m_ConnectionInfo.timeout, m_ConnectionLock, {kAlarmRequestTimeout, m_SavedTimeout});
-    m_IoStreamSocket = http_open("/command/alarmdata.cgi?interval=1");
-  }
-  if (m_IoStreamSocket != -1) return LIBD_OK;
-  const vexa::Guard connection(m_ConnectionLock);
-  // Kept: a camera that takes no alarm stream is asked with this time-out until the connection is set anew.
-  m_ConnectionInfo.timeout = kFailedStreamTimeout;
-  return LatestErrorCode();
-}
-
-bool CVexaCommon::AskSensors(std::string& answer) {
-  const int socket = http_open("/command/inquiry.cgi?inq=sensor");
-  if (socket == -1) return false;
-  char bytes[kSensorAnswer + 1] = {};
-  const int received = http_recvn(socket, bytes, kSensorAnswer, ConnectionTimeout());
-  http_close(socket);
-  answer = bytes;
-  return received >= 0;
 }
 
 ELibDReturnCode CVexaCommon::StopIoStreaming() {
+  const bool was_open = m_State->alarms.stop();
   {
-    const vexa::TurnGuard guard(m_IoStreamLock, m_State->io_turn);
+    const vexa::TurnGuard guard(m_IoStreamLock, m_State->alarms.turn());
     m_PendingPins.clear();
-    if (m_IoStreamSocket == -1) return LIBD_OK;
-    http_close(m_IoStreamSocket);
-    m_IoStreamSocket = -1;
   }
-  return SendCommand("/command/system.cgi?AlarmData=off");
+  return was_open ? m_State->camera.send("/command/system.cgi?AlarmData=off") : LIBD_OK;
 }
 
-// Safe: as GetIoBoxInfo; room for the pins is there before a part is read, so that none is lost for the want of it.
-ELibDReturnCode CVexaCommon::GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>& pins) try {
-  const vexa::TurnGuard guard(m_IoStreamLock, m_State->io_turn);
-  if (m_IoStreamSocket == -1) return LIBD_FAILED;
-  if (!m_PendingPins.empty()) {
-    pins = std::exchange(m_PendingPins, {});
-    m_LastIoDataTime = m_State->now();
-    return LIBD_OK;
-  }
-  pins.reserve(vexa::kMostStatusPins);
-  unsigned int present = 0;
-  unsigned int state = 0;
-  const int read = http_multipart_input_recv(m_IoStreamSocket, present, state);
-  if (read < 0) return LatestErrorCode();
-  const std::time_t now = m_State->now();
-  if (read == 0) {
-    return vexa::alarm_stream_is_silent(now, m_LastIoDataTime, ConnectionTimeout()) ? LIBD_TIMEOUT : LIBD_NO_FRAME;
-  }
-  vexa::take_status_pins({present, state}, m_FixedIoBoxInfo, pins);
-  m_LastIoDataTime = now;
-  return pins.empty() ? LIBD_NO_FRAME : LIBD_OK;
-} catch (const std::bad_alloc&) {
-  return FailMemory();
+ELibDReturnCode CVexaCommon::GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>& pins) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    {
+      const vexa::TurnGuard guard(m_IoStreamLock, m_State->alarms.turn());
+      if (m_IoStreamSocket != -1 && !m_PendingPins.empty()) {
+        pins = std::exchange(m_PendingPins, {});
+        m_LastIoDataTime = m_State->now();
+        return LIBD_OK;
+      }
+    }
+    // Before a part is read, so that none is lost when memory runs out.
+    pins.reserve(vexa::kMostStatusPins);
+    const auto read = [&](int socket) -> vexa::Result<int> {
+      vexa::PinMasks masks;
+      const auto part = m_State->read_alarm_part(socket, masks);
+      if (part && *part > 0) vexa::take_status_pins(masks, m_FixedIoBoxInfo, pins);
+      return part;
+    };
+    const std::int64_t patience = vexa::whole_seconds(m_State->connection.timeout()) + kSilenceGrace;
+    const vexa::Outcome polled = m_State->alarms.poll(read, m_State->now, patience);
+    return polled && *polled == LIBD_OK && pins.empty() ? vexa::Outcome(LIBD_NO_FRAME) : polled;
+  });
+}
+
+int CVexaCommon::http_multipart_input_recv(int socket, unsigned int& mask, unsigned int& state) {
+  return m_State->errors.run([&] {
+    vexa::PinMasks masks;
+    const auto part = m_State->read_alarm_part(socket, masks);
+    if (part && *part > 0) {
+      mask = masks.present;
+      state = masks.state;
+    }
+    return part;
+  });
 }
 
 ELibDReturnCode CVexaCommon::GetCurrentIoStatus(std::vector<SLibDPinInfo>& pins) {
@@ -154,34 +139,55 @@ ELibDReturnCode CVexaCommon::GetCurrentIoStatus(std::vector<SLibDPinInfo>& pins)
   if (read != LIBD_OK) return read;
   for (const SLibDPinInfo& pin : pins) {
     if (pin.type != PIN_TYPE_TAMPERING) continue;
-    const ELibDReturnCode watched = WatchTampering(pin.state);
+    const ELibDReturnCode watched = m_State->watch_tampering(pin.state);
     if (watched != LIBD_OK) return watched;
   }
   return LIBD_OK;
 }
 
+ELibDReturnCode CVexaCommon::SetOutput(SLibDPinInfo& pin) {
+  return m_State->camera.send("/command/main.cgi?Trigger=alarmout%d%s", pin.number, pin.state != 0 ? "on" : "off");
+}
+
+namespace vexa {
+
+ELibDReturnCode DriverState::open_alarms() {
+  const ELibDReturnCode opened = errors.run([&] {
+    const RaisedTimeout slow = connection.raised(kAlarmRequestTimeout);
+    return alarms.start([&] { return camera.open("/command/alarmdata.cgi?interval=1"); }, now);
+  });
+  if (opened == LIBD_OK) return LIBD_OK;
+  const Guard guard(driver.m_ConnectionLock);
+  // Kept: a camera that takes no alarm stream is asked with this time-out until the connection is set anew.
+  driver.m_ConnectionInfo.timeout = kFailedStreamTimeout;
+  return opened;
+}
+
+Result<int> DriverState::read_alarm_part(int socket, PinMasks& masks) {
+  errors.clear();
+  char part[kPartHeaderRoom];
+  const auto length = receive_header(socket, part, connection.timeout());
+  if (!length || *length == 0) return length;
+  const MotionReport motion{vmd_type() != LIBD_VMD_WINDOW, driver.m_UseMotionDetection};
+  masks = parse_input_part({part, static_cast<std::size_t>(*length)}, motion);
+  return 1;
+}
+
 // The clearing is not sent under the lock, so that a stop waits for a read alone. Meanwhile the alarm counts as not
 // seen, which lets no other thread clear it too.
-ELibDReturnCode CVexaCommon::WatchTampering(int state) {
+ELibDReturnCode DriverState::watch_tampering(int state) {
   std::time_t since = 0;
   {
-    const vexa::Guard guard(m_IoStreamLock);
-    if (!vexa::tampering_is_due(state, m_State->now(), m_TamperingActiveSince)) return LIBD_OK;
-    since = std::exchange(m_TamperingActiveSince, 0);
+    const Guard guard(driver.m_IoStreamLock);
+    if (!tampering_is_due(state, now(), driver.m_TamperingActiveSince)) return LIBD_OK;
+    since = std::exchange(driver.m_TamperingActiveSince, 0);
   }
-  const vexa::RaisedTimeout slow(m_ConnectionInfo.timeout, m_ConnectionLock, {kAlarmRequestTimeout, m_SavedTimeout});
-  const ELibDReturnCode sent = SendCommand("/command/system.cgi?TamperingStatusClear=on");
+  const RaisedTimeout slow = connection.raised(kAlarmRequestTimeout);
+  const ELibDReturnCode sent = camera.send("/command/system.cgi?TamperingStatusClear=on");
   if (sent == LIBD_OK) return LIBD_OK;
-  const vexa::Guard guard(m_IoStreamLock);
-  m_TamperingActiveSince = since;
+  const Guard guard(driver.m_IoStreamLock);
+  driver.m_TamperingActiveSince = since;
   return sent;
 }
 
-ELibDReturnCode CVexaCommon::SetOutput(SLibDPinInfo& pin) {
-  return SendCommand("/command/main.cgi?Trigger=alarmout%d%s", pin.number, pin.state != 0 ? "on" : "off");
-}
-
-int CVexaCommon::StoredVmdType() {
-  const vexa::Guard guard(m_ConnectionLock);
-  return m_IoBoxInfo.vmdType;
-}
+}  // namespace vexa

@@ -1,30 +1,24 @@
 // Camera tours: sequences of presets.
-#include <cerrno>
-#include <new>
 
 #include "device/cgi/tour_text.h"
-#include "vexa/vexa_common.h"
+#include "device/driver_state.h"
 
-// Safe: an answer that memory does not hold is a failure and not an exception.
-ELibDReturnCode CVexaCommon::GetCameraTourInfo(SLibDCameraTourInfo& info) try {
-  std::string answer;
-  if (SendInqCommand("presetposition", answer) != LIBD_OK) return LatestErrorCode();
-  info = vexa::read_camera_tours(answer, m_FixedPTZControlInfo.tourCount);
-  return LIBD_OK;
-} catch (const std::bad_alloc&) {
-  FailSystem(ENOMEM);
-  return LIBD_FAILED;
+ELibDReturnCode CVexaCommon::GetCameraTourInfo(SLibDCameraTourInfo& info) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    std::string answer;
+    if (const auto asked = m_State->camera.inquire("presetposition", answer); asked != LIBD_OK) return asked;
+    info = vexa::read_camera_tours(answer, m_FixedPTZControlInfo.tourCount);
+    return LIBD_OK;
+  });
 }
 
-// Safe: a request that memory does not hold is a failure and not an exception.
-ELibDReturnCode CVexaCommon::SetCameraTourInfo(SLibDCameraTourInfo& info) try {
-  const auto request =
-      vexa::camera_tour_request(info, m_FixedPTZControlInfo.tourCount, m_FixedPTZControlInfo.presetCount);
-  if (!request) return LIBD_INVALID_ARGUMENT;
-  return SendCommand("/command/presetposition.cgi?%s", request->c_str());
-} catch (const std::bad_alloc&) {
-  FailSystem(ENOMEM);
-  return LIBD_FAILED;
+ELibDReturnCode CVexaCommon::SetCameraTourInfo(SLibDCameraTourInfo& info) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    const auto request =
+        vexa::camera_tour_request(info, m_FixedPTZControlInfo.tourCount, m_FixedPTZControlInfo.presetCount);
+    if (!request) return LIBD_INVALID_ARGUMENT;
+    return m_State->camera.send("/command/presetposition.cgi?%s", request->c_str());
+  });
 }
 
 bool CVexaCommon::GetTextByTourSequenceList(const std::vector<int>& sequence, std::string& text) {

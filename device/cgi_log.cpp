@@ -1,9 +1,7 @@
+// The switches of the CGI log.
 #include <cstring>
-#include <string>
 
-#include "runtime/base/sync.h"
-#include "vexa/real_time.h"
-#include "vexa/vexa_common.h"
+#include "device/driver_state.h"
 
 // The file is opened by the next SetCurrentConnectionInfo.
 ELibDReturnCode CVexaCommon::SetCGILogPath(const char* path) {
@@ -19,10 +17,7 @@ ELibDReturnCode CVexaCommon::SetCGILogLevel(bool on) {
   return LIBD_OK;
 }
 
-// A line begins with its line break, so that the file ends without one.
 void CVexaCommon::Log(const char* direction, const char* message) {
   if (direction == nullptr || message == nullptr) return;
-  std::string line = CRealTime::GetTheCurrentTime().Format("\r\n%D-%O-%Y\t%H:%M:%S.%03L\t", false);
-  line.append("CGI\t").append(direction).append("\t").append(message);
-  m_CGILogger.Log(line.c_str());
+  m_State->log.write(direction, message);
 }

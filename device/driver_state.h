@@ -1,13 +1,21 @@
-// What a driver object keeps besides the fields of its class.
+// What a driver object keeps besides the fields of its class, and the steps that several of its members share.
 #pragma once
 
-#include <atomic>
 #include <ctime>
 #include <memory>
+#include <span>
+#include <string>
 
+#include "device/camera_link.h"
+#include "device/cgi/input_part.h"
+#include "device/error_record.h"
+#include "device/polled_stream.h"
+#include "media/assembly/assembled_picture.h"
 #include "media/frame_store.h"
+#include "media/picture_reader.h"
 #include "media/rtp_reception.h"
-#include "vexa/simple_lock.h"
+#include "transport/rtsp_session.h"
+#include "vexa/vexa_common.h"
 
 namespace vexa {
 
@@ -16,24 +24,111 @@ using SecondsClock = std::time_t (*)();
 
 inline std::time_t system_seconds() { return std::time(nullptr); }
 
-/// A number that no other driver object of the process has had.
-inline unsigned next_driver_number() {
-  static std::atomic<unsigned> latest{0};
-  return ++latest;
+/// The room that a member is given as a pointer and a length; none for a negative length.
+inline std::span<char> room_of(char* buffer, int length) {
+  return {buffer, length < 0 ? 0 : static_cast<std::size_t>(length)};
 }
 
+/// Made by the driver's constructor and gone with it. The parts keep references to the driver's fields. Whose thread
+/// runs a step is said with the group it stands in.
 struct DriverState {
-  const unsigned number = next_driver_number();  ///< tells the driver from all others, also from those gone
-  CSimpleLock start_stop_lock;                   ///< held by a start or stop of video from begin to end; outermost
-  CSimpleLock error_lock;                        ///< guards m_LatestErrorCode and m_LatestErrorText; innermost
-  CSimpleLock filter_lock;  ///< guards m_ResolutionFilter and m_FixedCameraInfo; taken before m_ConnectionLock
-  CSimpleLock audio_turn;   ///< of m_AudioLock: a stop comes next, however soon a poll follows the last
-  CSimpleLock io_turn;      ///< of m_IoStreamLock likewise
-  CSimpleLock md_turn;      ///< of m_MdStreamLock likewise
+  explicit DriverState(CVexaCommon& owner);
+
+  CVexaCommon& driver;
+  ErrorRecord errors;
+  Connection connection;
+  CgiLog log;
+  CameraLink camera;
+  PolledStream audio;
+  PolledStream alarms;
+  PolledStream metadata;
+  CSimpleLock start_stop_lock;  ///< held by a start or stop of video from begin to end; outermost
   SecondsClock now = system_seconds;
   int teardown_timeout = 15000;       ///< milliseconds for the answer to a TEARDOWN; tests put less in its place
   std::unique_ptr<RtpReception> rtp;  ///< the streaming thread's; null while no RTP streams
-  FrameStore spare_frames;            ///< guarded by m_FrameQueueLock
+  FrameStore spare_frames VEXA_GUARDED_BY(driver.m_FrameQueueLock);
+
+  // Copies of settings, each under its lock; any thread: device/driver_state.cpp
+  std::string bright_mode();
+  std::string codec_name();
+  int rotation();
+  int rtsp_port();
+  int vmd_type();
+  ELibDVideoStandard video_standard();
+  bool takes_continuous_ptz();
+  bool takes_electronic_flip();
+  bool stop_is_requested();
+  bool wants_teardown();
+  int stream_socket();
+  /// The media socket together with the event of a stop.
+  StoppableSocket stream_source();
+  void set_stream_socket(int socket);
+
+  // The RTSP session; the starter's, then the streaming thread's, then the stopper's: device/rtsp_session.cpp
+  RtspSession session();
+  StreamClock stream_clock();
+  Result<int> open_rtp_over_udp(const std::string& url, int port);
+  Result<int> open_rtp_over_tcp(const std::string& url, int port);
+
+  // Starting and stopping video, with the start-stop lock held: device/video_streaming.cpp
+  ELibDReturnCode start_video(const SLibDEdgeStorageStreamingInfo* recording);
+  ELibDReturnCode start_live();
+  ELibDReturnCode start_playback(const SLibDEdgeStorageStreamingInfo& recording);
+  ELibDReturnCode open_live_http(int stream);
+  ELibDReturnCode open_live_rtp(int stream);
+  ELibDReturnCode open_rtp_session(const std::string& path);
+  bool allocate_packets();
+  ELibDReturnCode start_thread(const std::string& codec);
+  ELibDReturnCode abandon_start(int error);
+  void end_thread();
+
+  // Reading frames; the streaming thread: device/video_streaming.cpp, device/rtp_frames.cpp, device/http_frames.cpp
+  bool plays_rtp() const;
+  std::string stream_codec();
+  void take_frame(CVexaCommon::VideoFrameInfo& frame);
+  ELibDReturnCode read_frame(CVexaCommon::VideoFrameInfo& frame);
+  /// LIBD_TIMEOUT once the stream is silent, LIBD_NO_FRAME before.
+  ELibDReturnCode nothing_yet();
+  ELibDReturnCode begin_rtp_frame(CVexaCommon::VideoFrameInfo& frame, const Codec& codec);
+  ELibDReturnCode collect_picture(PacketRunPlace& run);
+  ELibDReturnCode finish_rtp_frame(CVexaCommon::VideoFrameInfo& frame, PacketRunPlace run,
+                                   const AssembledPicture& picture);
+  void stamp_picture(CVexaCommon::VideoFrameInfo& frame, std::uint32_t timestamp);
+  ELibDReturnCode read_elementary_frame(CVexaCommon::VideoFrameInfo& frame, const Codec& codec, int& received);
+  bool reset_stream_buffer();
+  void release_stream_buffer();
+  StreamWindow stream_window();
+  /// Looks for the camera's position in the whole data; true when it is there and stored.
+  bool store_position(Bytes data);
+
+  // The frame queue; the streaming thread and the host's: device/frame_queue.cpp
+  void queue_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key, ELibDReturnCode result);
+  void append_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key) VEXA_REQUIRES(driver.m_FrameQueueLock);
+  ELibDReturnCode take_oldest_frame(SLibDVideoFrameInfo& frame);
+  void free_frame(CVexaCommon::VideoFrameInfo& frame) VEXA_REQUIRES(driver.m_FrameQueueLock);
+  void clear_frame_queue();
+
+  // Settings and the cached inquiry; any thread: device/video_settings.cpp, device/image_controls.cpp
+  void store_camera_inquiry(const std::string& answer);
+  ELibDReturnCode camera_inquiry(std::string& answer);
+  ELibDReturnCode after_image_change(ELibDReturnCode sent);
+  /// Takes an answer to the "camera" inquiry into the settings and the offer, then hands the settings out in `info`.
+  void read_camera_answer(const std::string& answer, SLibDCameraInfo& info);
+  bool read_camera_properties(const std::string& answer) VEXA_REQUIRES(driver.m_ConnectionLock);
+  void read_stream_settings(const std::string& answer, int stream) VEXA_REQUIRES(driver.m_ConnectionLock);
+  void read_video_ports(const std::string& answer) VEXA_REQUIRES(driver.m_ConnectionLock);
+  void filter_by(const char* item, const std::string& value);
+
+  // Alarms; any thread: device/alarm_io.cpp
+  ELibDReturnCode open_alarms();
+  /// 1 when a part came and `masks` is filled, 0 when none did.
+  Result<int> read_alarm_part(int socket, PinMasks& masks);
+  ELibDReturnCode watch_tampering(int state);
+
+  // Models that give their picture out elsewhere; any thread: device/model_variants.cpp
+  ELibDReturnCode bring_video_to_network(const std::string& system_answer);
+  ELibDReturnCode read_system_bringing_video(SLibDSystemInfo& info);
+  ELibDReturnCode ask_video_out_mode(ELibVideoOutMode& mode);
 };
 
 }  // namespace vexa

@@ -1,11 +1,10 @@
 // Exposure and image controls. Setters send one request; getters read the cached answer of the camera inquiry.
-#include <new>
 
 #include "device/cgi/image_text.h"
+#include "device/driver_state.h"
 #include "runtime/base/sync.h"
 #include "runtime/base/text.h"
 #include "transport/wire/cgi_answer.h"
-#include "vexa/vexa_common.h"
 
 namespace {
 
@@ -54,37 +53,36 @@ ELibDReturnCode CVexaCommon::SetBrightMode(std::string& mode) {
   const char* word = vexa::exposure_word_of(mode);
   if (word == nullptr) return LIBD_FAILED;
   // Kept: the stored mode stays; the host stores it with SetPTZControlInfo once the camera has taken it.
-  return SendCommand("/command/camera.cgi?ExpMode=%s", word);
+  return m_State->camera.send("/command/camera.cgi?ExpMode=%s", word);
 }
 
 ELibDReturnCode CVexaCommon::SetBackLightCompMode(bool on) {
-  return SendCommand("/command/camera.cgi?BLComp=%s", on ? "on" : "off");
+  return m_State->camera.send("/command/camera.cgi?BLComp=%s", on ? "on" : "off");
 }
 
-// Safe: as GetIRIlluminator.
-ELibDReturnCode CVexaCommon::Bright(int step) try {
-  const ELibDReturnCode amount = CheckAmountOfBrightness(step);
-  if (amount != LIBD_OK) return amount;
-  const ELibDReturnCode mode = CheckCurrentBrightMode();
-  if (mode != LIBD_OK) return mode;
-  std::string answer;
-  // Kept: what the camera says here does not enter the cache; the getters' values stay those of one moment.
-  if (SendInqCommand("camera", answer) != LIBD_OK) return LatestErrorCode();
-  int value = 0;
-  unsigned entry = 0;
-  // Another thread may have stored a mode without a control while the camera answered.
-  const auto control = vexa::exposure_control_of(StoredBrightMode());
-  if (!control) return LIBD_INVALID_MODE;
-  if (*control == vexa::ExposureControl::kShutter) {
+ELibDReturnCode CVexaCommon::Bright(int step) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    const ELibDReturnCode amount = CheckAmountOfBrightness(step);
+    if (amount != LIBD_OK) return amount;
+    const ELibDReturnCode mode = CheckCurrentBrightMode();
+    if (mode != LIBD_OK) return mode;
+    std::string answer;
+    // Kept: what the camera says here does not enter the cache; the getters' values stay those of one moment.
+    if (const auto asked = m_State->camera.inquire("camera", answer); asked != LIBD_OK) return asked;
+    int value = 0;
+    unsigned entry = 0;
+    // Another thread may have stored a mode without a control while the camera answered.
+    const auto control = vexa::exposure_control_of(m_State->bright_mode());
+    if (!control) return LIBD_INVALID_MODE;
+    if (*control == vexa::ExposureControl::kShutter) {
+      const bool moves = GetShutterSpeedFromCameraData(answer, value, entry) &&
+                         GetShutterSpeedFromShutterSpeedList(step, value, entry);
+      return moves ? m_State->camera.send("/command/camera.cgi?Shutter=%d", value) : LIBD_OK;
+    }
     const bool moves =
-        GetShutterSpeedFromCameraData(answer, value, entry) && GetShutterSpeedFromShutterSpeedList(step, value, entry);
-    return moves ? SendCommand("/command/camera.cgi?Shutter=%d", value) : LIBD_OK;
-  }
-  const bool moves =
-      GetIrisPositionFromCameraData(answer, value, entry) && GetIrisPositionFromIrisList(step, value, entry);
-  return moves ? SendCommand("/command/camera.cgi?Iris=%d", value) : LIBD_OK;
-} catch (const std::bad_alloc&) {
-  return FailMemory();
+        GetIrisPositionFromCameraData(answer, value, entry) && GetIrisPositionFromIrisList(step, value, entry);
+    return moves ? m_State->camera.send("/command/camera.cgi?Iris=%d", value) : LIBD_OK;
+  });
 }
 
 ELibDReturnCode CVexaCommon::CheckAmountOfBrightness(int step) {
@@ -92,12 +90,7 @@ ELibDReturnCode CVexaCommon::CheckAmountOfBrightness(int step) {
 }
 
 ELibDReturnCode CVexaCommon::CheckCurrentBrightMode() {
-  return vexa::exposure_control_of(StoredBrightMode()) ? LIBD_OK : LIBD_INVALID_MODE;
-}
-
-std::string CVexaCommon::StoredBrightMode() {
-  const vexa::Guard guard(m_ConnectionLock);
-  return m_PTZControlInfo.brightMode;
+  return vexa::exposure_control_of(m_State->bright_mode()) ? LIBD_OK : LIBD_INVALID_MODE;
 }
 
 void CVexaCommon::GetShutterAndIrisMode(int& shutterEntry, int& irisEntry) {
@@ -129,112 +122,120 @@ bool CVexaCommon::GetIrisPositionFromIrisList(int step, int& value, unsigned ent
   return entry < modes.size() && step_along(modes[entry].irisPositions, step, value);
 }
 
-// Safe: as GetIRIlluminator.
-ELibDReturnCode CVexaCommon::BrightAbsolute(int level) try {
-  if (static_cast<unsigned>(level) > kLargestLevel) return LIBD_INVALID_ARGUMENT;
-  const std::string mode = StoredBrightMode();
-  const auto control = vexa::exposure_control_of(mode);
-  if (!control) return LIBD_INVALID_MODE;
-  const vexa::ExposureModes& modes = m_FixedPTZControlInfo.brightModes;
-  unsigned entry = 0;
-  if (!take_entry(vexa::exposure_entry(modes, mode), entry)) return LIBD_OK;
-  const bool shutter = *control == vexa::ExposureControl::kShutter;
-  const vexa::ExposureSteps& steps = shutter ? modes[entry].shutterSpeeds : modes[entry].irisPositions;
-  // Safe: a list without steps has no largest value to read.
-  if (steps.empty()) return LIBD_OK;
-  const int value = vexa::exposure_value(level, steps.back().value);
-  return shutter ? SendCommand("/command/camera.cgi?Shutter=%d", value)
-                 : SendCommand("/command/camera.cgi?Iris=%d", value);
-} catch (const std::bad_alloc&) {
-  return FailMemory();
+ELibDReturnCode CVexaCommon::BrightAbsolute(int level) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    if (static_cast<unsigned>(level) > kLargestLevel) return LIBD_INVALID_ARGUMENT;
+    const std::string mode = m_State->bright_mode();
+    const auto control = vexa::exposure_control_of(mode);
+    if (!control) return LIBD_INVALID_MODE;
+    const vexa::ExposureModes& modes = m_FixedPTZControlInfo.brightModes;
+    unsigned entry = 0;
+    if (!take_entry(vexa::exposure_entry(modes, mode), entry)) return LIBD_OK;
+    const bool shutter = *control == vexa::ExposureControl::kShutter;
+    const vexa::ExposureSteps& steps = shutter ? modes[entry].shutterSpeeds : modes[entry].irisPositions;
+    // Safe: a list without steps has no largest value to read.
+    if (steps.empty()) return LIBD_OK;
+    const int value = vexa::exposure_value(level, steps.back().value);
+    return shutter ? m_State->camera.send("/command/camera.cgi?Shutter=%d", value)
+                   : m_State->camera.send("/command/camera.cgi?Iris=%d", value);
+  });
 }
 
-// Safe: an answer that memory does not hold is a failure and not an exception.
-bool CVexaCommon::CameraInquiry(std::string& answer) try {
+namespace vexa {
+
+// Asks the camera only when no answer is cached.
+ELibDReturnCode DriverState::camera_inquiry(std::string& answer) {
   {
-    const vexa::Guard guard(m_CameraInquiryLock);
-    answer = m_CameraInquiryCache;
+    const Guard guard(driver.m_CameraInquiryLock);
+    answer = driver.m_CameraInquiryCache;
   }
-  if (!answer.empty()) return true;
-  if (SendInqCommand("camera", answer) != LIBD_OK) return false;
-  StoreCameraInquiry(answer);
-  return true;
-} catch (const std::bad_alloc&) {
-  FailMemory();
-  return false;
-}
-
-// Kept: the cached answer outlives the change, so getters tell the value before it until GetCameraInfo asks anew. A
-// getter that is storing an answer finishes first.
-ELibDReturnCode CVexaCommon::AfterImageChange(ELibDReturnCode sent) {
-  if (sent != LIBD_OK) return sent;
-  const vexa::Guard guard(m_CameraInquiryLock);
+  if (!answer.empty()) return LIBD_OK;
+  if (const auto asked = camera.inquire("camera", answer); asked != LIBD_OK) return asked;
+  store_camera_inquiry(answer);
   return LIBD_OK;
 }
 
+// Kept: the cached answer outlives the change, so getters return the value before it until GetCameraInfo asks anew. The
+// lock is only waited for: a getter that is storing an answer finishes first.
+ELibDReturnCode DriverState::after_image_change(ELibDReturnCode sent) {
+  if (sent != LIBD_OK) return sent;
+  const Guard guard(driver.m_CameraInquiryLock);
+  return LIBD_OK;
+}
+
+}  // namespace vexa
+
 ELibDReturnCode CVexaCommon::GetDayNightMode(ELibDDayNightType& mode) {
-  std::string answer;
-  if (!CameraInquiry(answer)) return LatestErrorCode();
-  const auto read = vexa::day_night_of(answer);
-  if (!read) return LIBD_FAILED;
-  mode = *read;
-  return mode == LIBD_DAYNIGHT_UNKNOWN ? LIBD_FAILED : LIBD_OK;
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    std::string answer;
+    if (const auto asked = m_State->camera_inquiry(answer); asked != LIBD_OK) return asked;
+    const auto read = vexa::day_night_of(answer);
+    if (!read) return LIBD_FAILED;
+    mode = *read;
+    return mode == LIBD_DAYNIGHT_UNKNOWN ? LIBD_FAILED : LIBD_OK;
+  });
 }
 
 ELibDReturnCode CVexaCommon::SetDayNightMode(ELibDDayNightType mode) {
   const char* request = vexa::word_of(vexa::kDayNightRequests, mode);
   if (request == nullptr) return LIBD_INVALID_ARGUMENT;
-  return SendCommand("/command/camera.cgi?DayNightMode=%s", request);
+  return m_State->camera.send("/command/camera.cgi?DayNightMode=%s", request);
 }
 
 ELibDReturnCode CVexaCommon::GetVisibilityEnhancerMode(ELibDVisibilityEnhancerType& mode) {
-  std::string answer;
-  if (!CameraInquiry(answer)) return LatestErrorCode();
-  return read_word(answer, "&VisibilityEnhancer=", vexa::kVisibilityWords, mode);
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    std::string answer;
+    if (const auto asked = m_State->camera_inquiry(answer); asked != LIBD_OK) return asked;
+    return read_word(answer, "&VisibilityEnhancer=", vexa::kVisibilityWords, mode);
+  });
 }
 
 ELibDReturnCode CVexaCommon::SetVisibilityEnhancerMode(ELibDVisibilityEnhancerType mode) {
   const char* word = vexa::word_of(vexa::kVisibilityWords, mode);
   if (word == nullptr) return LIBD_INVALID_ARGUMENT;
-  return AfterImageChange(SendCommand("/command/camera.cgi?VisibilityEnhancer=%s", word));
+  return m_State->after_image_change(m_State->camera.send("/command/camera.cgi?VisibilityEnhancer=%s", word));
 }
 
 ELibDReturnCode CVexaCommon::GetXdnrMode(ELibDXdnrType& mode) {
-  std::string answer;
-  if (!CameraInquiry(answer)) return LatestErrorCode();
-  return read_word(answer, "&XDNR=", vexa::kXdnrWords, mode);
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    std::string answer;
+    if (const auto asked = m_State->camera_inquiry(answer); asked != LIBD_OK) return asked;
+    return read_word(answer, "&XDNR=", vexa::kXdnrWords, mode);
+  });
 }
 
 ELibDReturnCode CVexaCommon::SetXdnrMode(ELibDXdnrType mode) {
   const char* word = vexa::word_of(vexa::kXdnrWords, mode);
   if (word == nullptr) return LIBD_INVALID_ARGUMENT;
-  return AfterImageChange(SendCommand("/command/camera.cgi?XDNR=%s", word));
+  return m_State->after_image_change(m_State->camera.send("/command/camera.cgi?XDNR=%s", word));
 }
 
 ELibDReturnCode CVexaCommon::GetViewDR(ELibDViewDRMode& mode) {
-  std::string answer;
-  if (!CameraInquiry(answer)) return LatestErrorCode();
-  return read_word(answer, "&ViewDR=", vexa::kViewDrWords, mode);
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    std::string answer;
+    if (const auto asked = m_State->camera_inquiry(answer); asked != LIBD_OK) return asked;
+    return read_word(answer, "&ViewDR=", vexa::kViewDrWords, mode);
+  });
 }
 
 ELibDReturnCode CVexaCommon::SetViewDR(ELibDViewDRMode mode) {
   const char* word = vexa::word_of(vexa::kViewDrWords, mode);
   if (word == nullptr) return LIBD_INVALID_ARGUMENT;
-  return AfterImageChange(SendCommand("/command/camera.cgi?ViewDR=%s", word));
+  return m_State->after_image_change(m_State->camera.send("/command/camera.cgi?ViewDR=%s", word));
 }
 
-// Safe: a number that memory does not hold is a failure and not an exception.
-ELibDReturnCode CVexaCommon::GetIRIlluminator(ELibIRIlluminatorMode& mode, int& strength) try {
-  std::string answer;
-  if (!CameraInquiry(answer)) return LatestErrorCode();
-  if (read_word(answer, "&IRLed=", vexa::kIlluminatorWords, mode) != LIBD_OK) return LIBD_FAILED;
-  return read_number(answer, "&IRLedMaxStrength=", strength) ? LIBD_OK : LIBD_FAILED;
-} catch (const std::bad_alloc&) {
-  return FailMemory();
+ELibDReturnCode CVexaCommon::GetIRIlluminator(ELibIRIlluminatorMode& mode, int& strength) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    std::string answer;
+    if (const auto asked = m_State->camera_inquiry(answer); asked != LIBD_OK) return asked;
+    if (read_word(answer, "&IRLed=", vexa::kIlluminatorWords, mode) != LIBD_OK) return LIBD_FAILED;
+    return read_number(answer, "&IRLedMaxStrength=", strength) ? LIBD_OK : LIBD_FAILED;
+  });
 }
 
 // Kept: any mode that is not day/night switches the illuminator off; there is no wrong mode.
 ELibDReturnCode CVexaCommon::SetIRIlluminator(ELibIRIlluminatorMode mode, int strength) {
   const char* word = mode == LIB_IR_DAYNIGHT ? "daynight" : "off";
-  return AfterImageChange(SendCommand("/command/camera.cgi?IRLed=%s&IRLedMaxStrength=%d", word, strength));
+  return m_State->after_image_change(
+      m_State->camera.send("/command/camera.cgi?IRLed=%s&IRLedMaxStrength=%d", word, strength));
 }

@@ -1,8 +1,7 @@
 // Motion metadata: the polled stream of detection values.
 #include "device/cgi/metadata_frame.h"
 #include "device/driver_state.h"
-#include "runtime/base/sync.h"
-#include "vexa/vexa_common.h"
+#include "transport/http_stream.h"
 
 namespace {
 
@@ -12,33 +11,25 @@ constexpr int kMetadataRoom = 65;  // bytes: a part and its terminator
 
 ELibDReturnCode CVexaCommon::StartModRawData() {
   StopModRawData();
-  const vexa::TurnGuard guard(m_MdStreamLock, m_State->md_turn);
-  // Safe: what a start in another thread has opened meanwhile is not lost open.
-  if (m_MdStreamSocket != -1) http_close(m_MdStreamSocket);
-  m_MdStreamSocket = http_open("/mddata.cgi");
-  if (m_MdStreamSocket == -1) return LatestErrorCode();
-  m_LastMdDataTime = m_State->now();
-  return LIBD_OK;
+  return m_State->errors.run(
+      [&] { return m_State->metadata.start([&] { return m_State->camera.open("/mddata.cgi"); }, m_State->now); });
 }
 
 ELibDReturnCode CVexaCommon::GetCurrentPosition(SLibDRawMDFrameInfo& frame) {
-  const vexa::TurnGuard guard(m_MdStreamLock, m_State->md_turn);
-  if (m_MdStreamSocket == -1) return LIBD_FAILED;
-  char body[kMetadataRoom];
-  const int read = http_multipart_mddata_recv(m_MdStreamSocket, body, kMetadataRoom, ConnectionTimeout());
-  if (read < 0) return LatestErrorCode();
-  const std::time_t now = m_State->now();
-  if (read == 0) {
-    return vexa::metadata_stream_is_silent(now, m_LastMdDataTime, ConnectionTimeout()) ? LIBD_TIMEOUT : LIBD_NO_FRAME;
-  }
-  vexa::take_metadata({body, static_cast<std::size_t>(read)}, frame);
-  m_LastMdDataTime = now;
-  return LIBD_OK;
+  return m_State->errors.run([&] {
+    const int timeout = m_State->connection.timeout();
+    const auto read = [&](int socket) {
+      char body[kMetadataRoom];
+      m_State->errors.clear();
+      const auto received = vexa::receive_metadata_part(socket, body, timeout);
+      if (received && *received > 0) vexa::take_metadata({body, static_cast<std::size_t>(*received)}, frame);
+      return received;
+    };
+    return m_State->metadata.poll(read, m_State->now, timeout);
+  });
 }
 
 ELibDReturnCode CVexaCommon::StopModRawData() {
-  const vexa::TurnGuard guard(m_MdStreamLock, m_State->md_turn);
-  if (m_MdStreamSocket != -1) http_close(m_MdStreamSocket);
-  m_MdStreamSocket = -1;
+  m_State->metadata.stop();
   return LIBD_OK;
 }

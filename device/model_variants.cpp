@@ -1,9 +1,9 @@
 // What the model variants do in their own way: exposure modes, and the output that the picture goes to.
 #include <algorithm>
-#include <new>
 #include <string_view>
 
 #include "device/cgi/image_text.h"
+#include "device/driver_state.h"
 #include "transport/wire/cgi_answer.h"
 #include "vexa/vexa_variants.h"
 
@@ -26,47 +26,50 @@ CVexaMarlinCommon::~CVexaMarlinCommon() = default;
 CVexaSimpleHDCommon::~CVexaSimpleHDCommon() = default;
 CVexaSimplePTZCommon::~CVexaSimplePTZCommon() = default;
 
-ELibDReturnCode CVexaCommon::BringVideoToNetwork(const std::string& systemAnswer) {
-  const auto output = vexa::cgi_value(systemAnswer, "VideoOutMode=");
+namespace vexa {
+
+ELibDReturnCode DriverState::bring_video_to_network(const std::string& system_answer) {
+  const auto output = cgi_value(system_answer, "VideoOutMode=");
   if (!output || output->find("ip") != std::string_view::npos) return LIBD_OK;
-  return SendCommand("/command/system.cgi?VideoOutMode=ip");
+  return camera.send("/command/system.cgi?VideoOutMode=ip");
 }
 
-// Safe: as CVexaCommon::GetCurrentSystemInfo.
-ELibDReturnCode CVexaCommon::ReadSystemBringingVideo(SLibDSystemInfo& info) try {
-  std::string answer;
-  if (SendInqCommand("system", answer) != LIBD_OK) return LatestErrorCode();
-  GetCommonSystemInfo(info, answer);
-  const ELibDReturnCode brought = BringVideoToNetwork(answer);
-  if (brought != LIBD_OK) return brought;
-  if (SendInqCommand("network", answer) != LIBD_OK) return LatestErrorCode();
-  return GetCommonNetworkInfo(info, answer);
-} catch (const std::bad_alloc&) {
-  return FailMemory();
+ELibDReturnCode DriverState::read_system_bringing_video(SLibDSystemInfo& info) {
+  return errors.run([&]() -> Outcome {
+    std::string answer;
+    if (const auto asked = camera.inquire("system", answer); asked != LIBD_OK) return asked;
+    driver.GetCommonSystemInfo(info, answer);
+    if (const auto brought = bring_video_to_network(answer); brought != LIBD_OK) return brought;
+    if (const auto asked = camera.inquire("network", answer); asked != LIBD_OK) return asked;
+    return driver.GetCommonNetworkInfo(info, answer);
+  });
 }
 
-ELibDReturnCode CVexaCommon::AskVideoOutMode(ELibVideoOutMode& mode) {
-  std::string answer;
-  if (SendInqCommand("system", answer) != LIBD_OK) return LatestErrorCode();
-  const auto word = vexa::cgi_value(answer, "VideoOutMode=");
-  if (!word) return LIBD_FAILED;
-  const auto read = vexa::value_of(vexa::kVideoOutWords, *word);
-  if (!read) return LIBD_FAILED;
-  mode = *read;
-  return LIBD_OK;
+ELibDReturnCode DriverState::ask_video_out_mode(ELibVideoOutMode& mode) {
+  return errors.run([&]() -> Outcome {
+    std::string answer;
+    if (const auto asked = camera.inquire("system", answer); asked != LIBD_OK) return asked;
+    const auto word = cgi_value(answer, "VideoOutMode=");
+    if (!word) return LIBD_FAILED;
+    const auto read = value_of(kVideoOutWords, *word);
+    if (!read) return LIBD_FAILED;
+    mode = *read;
+    return LIBD_OK;
+  });
 }
 
-// Safe: as CVexaCommon::GetCurrentSystemInfo.
-ELibDReturnCode CVexaHeronCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) try {
-  std::string system;
-  if (SendInqCommand("system", system) != LIBD_OK) return LatestErrorCode();
-  GetCommonSystemInfo(info, system);
-  std::string network;
-  if (SendInqCommand("network", network) != LIBD_OK) return LatestErrorCode();
-  GetCommonNetworkInfo(info, network);
-  return BringVideoToNetwork(system);
-} catch (const std::bad_alloc&) {
-  return FailMemory();
+}  // namespace vexa
+
+ELibDReturnCode CVexaHeronCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    std::string system;
+    if (const auto asked = m_State->camera.inquire("system", system); asked != LIBD_OK) return asked;
+    GetCommonSystemInfo(info, system);
+    std::string network;
+    if (const auto asked = m_State->camera.inquire("network", network); asked != LIBD_OK) return asked;
+    GetCommonNetworkInfo(info, network);
+    return m_State->bring_video_to_network(system);
+  });
 }
 
 ELibDReturnCode CVexaHeronCommon::SetBrightMode(std::string&) { return LIBD_NOT_SUPPORTED; }
@@ -75,8 +78,8 @@ ELibDReturnCode CVexaMarlinCommon::SetBrightMode(std::string& mode) {
   constexpr char kRequest[] = "/command/camera.cgi?ExpMode=%s&AutoShutter=%s&AutoSlowShutter=%s";
   if (mode.empty()) return LIBD_INVALID_ARGUMENT;
   // Kept: full automation goes with the manual iris lens: such a camera regulates by its shutter alone.
-  if (mode == vexa::kFullAuto) return SendCommand(kRequest, "manualirislens", "on", "on");
-  if (mode == vexa::kShutterPriority) return SendCommand(kRequest, "autoirislens", "off", "off");
+  if (mode == vexa::kFullAuto) return m_State->camera.send(kRequest, "manualirislens", "on", "on");
+  if (mode == vexa::kShutterPriority) return m_State->camera.send(kRequest, "autoirislens", "off", "off");
   return LIBD_FAILED;
 }
 
@@ -85,13 +88,13 @@ ELibDReturnCode CVexaSimpleHDCommon::GetCurrentSystemInfo(SLibDSystemInfo& info)
 }
 
 ELibDReturnCode CVexaSimpleHDCommon::GetCurrentSystemInfo(SLibDSystemInfo& info, bool probe) {
-  return probe ? ReadSystemBringingVideo(info) : CVexaCommon::GetCurrentSystemInfo(info);
+  return probe ? m_State->read_system_bringing_video(info) : CVexaCommon::GetCurrentSystemInfo(info);
 }
 
 ELibDReturnCode CVexaSimpleHDCommon::SetBrightMode(std::string&) { return LIBD_NOT_SUPPORTED; }
 
 ELibDReturnCode CVexaSimpleHDCommon::GetVideoOutMode(ELibVideoOutMode& mode) {
-  if (is_one_of(kSimpleHdAskedModels, m_FixedSystemInfo.modelName)) return AskVideoOutMode(mode);
+  if (is_one_of(kSimpleHdAskedModels, m_FixedSystemInfo.modelName)) return m_State->ask_video_out_mode(mode);
   mode = LIB_VIDEO_OUT_IP;
   return LIBD_OK;
 }
@@ -101,11 +104,11 @@ ELibDReturnCode CVexaSimplePTZCommon::GetCurrentSystemInfo(SLibDSystemInfo& info
 }
 
 ELibDReturnCode CVexaSimplePTZCommon::GetCurrentSystemInfo(SLibDSystemInfo& info, bool probe) {
-  return probe ? ReadSystemBringingVideo(info) : CVexaCommon::GetCurrentSystemInfo(info);
+  return probe ? m_State->read_system_bringing_video(info) : CVexaCommon::GetCurrentSystemInfo(info);
 }
 
 ELibDReturnCode CVexaSimplePTZCommon::GetVideoOutMode(ELibVideoOutMode& mode) {
-  if (is_one_of(kSimplePtzModels, m_FixedSystemInfo.modelName)) return AskVideoOutMode(mode);
+  if (is_one_of(kSimplePtzModels, m_FixedSystemInfo.modelName)) return m_State->ask_video_out_mode(mode);
   mode = LIB_VIDEO_OUT_IP;
   return LIBD_OK;
 }

@@ -1,12 +1,10 @@
 // Where the camera looks, and what is known of its motion.
-#include <cerrno>
-#include <new>
 #include <optional>
 #include <utility>
 
 #include "device/cgi/position_text.h"
+#include "device/driver_state.h"
 #include "runtime/base/sync.h"
-#include "vexa/vexa_common.h"
 
 namespace {
 
@@ -23,7 +21,7 @@ ELibDReturnCode CVexaCommon::GetCurrentPosition(SLibDPTZStatus& status) {
   if (!position) return LIBD_FAILED;
   // Kept: the flag is set and never cleared, as the host clears it when it has seen it.
   if (position->moving) status.moving = true;
-  const int flip = ImageRotation() == kUpsideDown ? -1 : 1;
+  const int flip = m_State->rotation() == kUpsideDown ? -1 : 1;
   if (!GetViewingAngles(position->zoom_valid ? position->zoom : 0, status.horizontalAngle, status.verticalAngle)) {
     return LIBD_FAILED;
   }
@@ -36,11 +34,6 @@ ELibDReturnCode CVexaCommon::GetCurrentPosition(SLibDPTZStatus& status) {
   return LIBD_OK;
 }
 
-int CVexaCommon::ImageRotation() {
-  const vexa::Guard guard(m_ConnectionLock);
-  return m_CameraInfo.rotation;
-}
-
 bool CVexaCommon::GetViewingAngles(int zoom, int& horizontal, int& vertical) {
   const auto angles = vexa::viewing_angles(m_ZoomRatios, m_FixedPTZControlInfo.panTilt, zoom);
   if (!angles) return false;
@@ -49,31 +42,27 @@ bool CVexaCommon::GetViewingAngles(int zoom, int& horizontal, int& vertical) {
   return true;
 }
 
-// Safe: here and below, a record that memory does not hold is a failure and not an exception.
-ELibDReturnCode CVexaCommon::GetPTZControlInfo(SLibDPTZControlInfo& info) try {
-  const vexa::Guard guard(m_ConnectionLock);
-  info = m_PTZControlInfo;
-  return LIBD_OK;
-} catch (const std::bad_alloc&) {
-  FailSystem(ENOMEM);
-  return LIBD_FAILED;
+ELibDReturnCode CVexaCommon::GetPTZControlInfo(SLibDPTZControlInfo& info) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    const vexa::Guard guard(m_ConnectionLock);
+    info = m_PTZControlInfo;
+    return LIBD_OK;
+  });
 }
 
-ELibDReturnCode CVexaCommon::SetPTZControlInfo(SLibDPTZControlInfo& info) try {
-  SLibDPTZControlInfo stored = info;
-  const vexa::Guard guard(m_ConnectionLock);
-  m_PTZControlInfo = std::move(stored);
-  return LIBD_OK;
-} catch (const std::bad_alloc&) {
-  FailSystem(ENOMEM);
-  return LIBD_FAILED;
+ELibDReturnCode CVexaCommon::SetPTZControlInfo(SLibDPTZControlInfo& info) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    SLibDPTZControlInfo stored = info;
+    const vexa::Guard guard(m_ConnectionLock);
+    m_PTZControlInfo = std::move(stored);
+    return LIBD_OK;
+  });
 }
 
-ELibDReturnCode CVexaCommon::GetFixedPTZControlInfo(SLibDFixedPTZControlInfo& info) try {
-  if (!m_FixedPTZControlInfoAvailable) return LIBD_NOT_SUPPORTED;
-  info = m_FixedPTZControlInfo;
-  return LIBD_OK;
-} catch (const std::bad_alloc&) {
-  FailSystem(ENOMEM);
-  return LIBD_FAILED;
+ELibDReturnCode CVexaCommon::GetFixedPTZControlInfo(SLibDFixedPTZControlInfo& info) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    if (!m_FixedPTZControlInfoAvailable) return LIBD_NOT_SUPPORTED;
+    info = m_FixedPTZControlInfo;
+    return LIBD_OK;
+  });
 }

@@ -1,11 +1,9 @@
 // What the camera says it is.
-#include <cerrno>
-#include <new>
 
+#include "device/driver_state.h"
 #include "runtime/base/sync.h"
 #include "runtime/base/text.h"
 #include "transport/wire/cgi_answer.h"
-#include "vexa/vexa_common.h"
 
 namespace {
 
@@ -18,32 +16,28 @@ void take_value(std::string_view answer, std::string_view key, std::string& text
 
 }  // namespace
 
-// Safe: here and below, what memory does not hold is a failure and not an exception.
-ELibDReturnCode CVexaCommon::GetFixedSystemInfo(SLibDFixedSystemInfo& info) try {
-  info = m_FixedSystemInfo;
-  return LIBD_OK;
-} catch (const std::bad_alloc&) {
-  FailSystem(ENOMEM);
-  return LIBD_FAILED;
+ELibDReturnCode CVexaCommon::GetFixedSystemInfo(SLibDFixedSystemInfo& info) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    info = m_FixedSystemInfo;
+    return LIBD_OK;
+  });
 }
 
-ELibDReturnCode CVexaCommon::GetFixedConnectionInfo(SLibDFixedConnectionInfo& info) try {
-  info = m_FixedConnectionInfo;
-  return LIBD_OK;
-} catch (const std::bad_alloc&) {
-  FailSystem(ENOMEM);
-  return LIBD_FAILED;
+ELibDReturnCode CVexaCommon::GetFixedConnectionInfo(SLibDFixedConnectionInfo& info) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    info = m_FixedConnectionInfo;
+    return LIBD_OK;
+  });
 }
 
-ELibDReturnCode CVexaCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) try {
-  std::string answer;
-  if (SendInqCommand("system", answer) != LIBD_OK) return LatestErrorCode();
-  GetCommonSystemInfo(info, answer);
-  if (SendInqCommand("network", answer) != LIBD_OK) return LatestErrorCode();
-  return GetCommonNetworkInfo(info, answer);
-} catch (const std::bad_alloc&) {
-  FailSystem(ENOMEM);
-  return LIBD_FAILED;
+ELibDReturnCode CVexaCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) {
+  return m_State->errors.run([&]() -> vexa::Outcome {
+    std::string answer;
+    if (const auto asked = m_State->camera.inquire("system", answer); asked != LIBD_OK) return asked;
+    GetCommonSystemInfo(info, answer);
+    if (const auto asked = m_State->camera.inquire("network", answer); asked != LIBD_OK) return asked;
+    return GetCommonNetworkInfo(info, answer);
+  });
 }
 
 ELibDReturnCode CVexaCommon::GetCommonSystemInfo(SLibDSystemInfo& info, const std::string& answer) {

@@ -1,23 +1,16 @@
-// RTSP sessions: opening, reading answers, closing.
-#include <netinet/in.h>
+#include "transport/rtsp_session.h"
+
 #include <sys/socket.h>
 
 #include <algorithm>
-#include <cerrno>
 #include <chrono>
-#include <cstdarg>
 #include <cstdio>
-#include <new>
+#include <cstring>
 #include <thread>
 #include <utility>
-#include <vector>
 
-#include "device/driver_state.h"
 #include "runtime/base/base64.h"
-#include "runtime/base/sync.h"
-#include "runtime/base/text.h"
 #include "transport/failure.h"
-#include "transport/socket.h"
 #include "transport/tcp_connect.h"
 #include "transport/wait_budget.h"
 #include "transport/wire/http_answer.h"
@@ -25,256 +18,201 @@
 #include "transport/wire/range_clock.h"
 #include "transport/wire/rtsp_answer.h"
 #include "transport/wire/rtsp_request.h"
-#include "vexa/vexa_common.h"
 
+namespace vexa {
 namespace {
 
 constexpr int kMediaReceiveBuffer = 524288;
+constexpr int kSharedReceiveBuffer = 131072;  // of a connection that carries media too
 constexpr int kAnswerRoom = 1023;
 constexpr int kMillisecondsPerSecond = 1000;
+constexpr int kKeepAliveAnswerTimeout = 1000;  // milliseconds
 
 constexpr int kRtspOk = 200;
 constexpr int kRtspUnauthorized = 401;
 
 /// A non-blocking socket whose single reads and sends end after whole seconds of the time-out; invalid with errno.
-vexa::Socket make_control_socket(int timeout) {
-  vexa::Socket control = vexa::make_socket(SOCK_STREAM);
-  if (!control.valid() || !vexa::make_nonblocking(control.get())) return vexa::Socket();
+Socket make_control_socket(int timeout) {
+  Socket control = make_socket(SOCK_STREAM);
+  if (!control.valid() || !make_nonblocking(control.get())) return {};
   const timeval limit{timeout / kMillisecondsPerSecond, 0};
   setsockopt(control.get(), SOL_SOCKET, SO_RCVTIMEO, &limit, sizeof limit);
   setsockopt(control.get(), SOL_SOCKET, SO_SNDTIMEO, &limit, sizeof limit);
   return control;
 }
 
-}  // namespace
-
-int CVexaCommon::rtp_over_udp_open(const char* format, ...) {
-  va_list arguments;
-  va_start(arguments, format);
-  const std::string url = vexa::vformat_within(vexa::kRequestRoom, format, arguments).text;
-  va_end(arguments);
-  const SLibDConnectionInfo info = ConnectionInfo();
-  sockaddr_in address{};
-  vexa::Socket control(MakeRtspSocket(info, address));
-  if (!control.valid()) return -1;
-  const int port = BindMediaSocket();
-  if (port == -1 || !ConnectRtsp(control.get(), address, info)) return -1;
-  std::string description;
-  if (!DescribeRtsp(control.get(), url, description)) return -1;
-  if (!TakeRangeClock(description) || !TakeClockRate(description)) return -1;
-  int session = 0;
-  const vexa::RtspHead set_up{url, ++m_RtspCSeq, m_BasicCredentials};
-  if (!SetUpRtsp(control.get(), vexa::rtsp_setup_udp(set_up, port), session)) return -1;
-  if (!PlayRtsp(control.get(), url, session)) return -1;
-  // Kept: the time of the last keep-alive is not reset; a new session's first one waits for the rest of the interval.
-  m_RtspUrl = url;
-  m_RtspSession = session;
-  return control.release();
+Result<> connect_rtsp(const RtspServer& server, int timeout) {
+  const int connected = connect_within(server.socket.get(), server.address, timeout);
+  if (connected != 1) return wait_failure(connected, kConnectTimedOut);
+  if (!make_blocking(server.socket.get())) return system_failure();
+  return {};
 }
 
-// What every open begins with: the camera's address, and a socket to connect.
-int CVexaCommon::MakeRtspSocket(const SLibDConnectionInfo& info, sockaddr_in& address) {
-  ClearLatestError();
-  m_RtspCSeq = 0;
-  const vexa::ResolvedHost host = vexa::resolve_host(info.host, RtspPort());
-  if (!host.address) return FailSystem(host.error);
-  address = *host.address;
-  const int socket = make_control_socket(info.timeout).release();
-  return socket == -1 ? FailSystem() : socket;
-}
-
-int CVexaCommon::RtspPort() {
-  const vexa::Guard guard(m_ConnectionLock);
-  return m_CameraInfo.rtspPort;
-}
-
-// Kept: the media socket stays open when the open fails later on; its caller tells by it how far the open came.
-int CVexaCommon::BindMediaSocket() {
-  SetStreamSocket(vexa::make_socket(SOCK_DGRAM).release());
-  if (m_StreamSocket == -1) return FailSystem();
-  vexa::set_receive_buffer(m_StreamSocket, kMediaReceiveBuffer);
-  sockaddr_in address{};
-  address.sin_family = AF_INET;
-  socklen_t length = sizeof address;
-  if (bind(m_StreamSocket, reinterpret_cast<sockaddr*>(&address), length) != 0) return FailSystem();
-  // Safe: reusable only once it is bound; two sessions with reusable sockets could be given the same free port.
-  const int reuse = 1;
-  setsockopt(m_StreamSocket, SOL_SOCKET, SO_REUSEADDR, &reuse, sizeof reuse);
-  if (getsockname(m_StreamSocket, reinterpret_cast<sockaddr*>(&address), &length) != 0) return FailSystem();
-  return ntohs(address.sin_port);
-}
-
-bool CVexaCommon::ConnectRtsp(int socket, const sockaddr_in& address, const SLibDConnectionInfo& info) {
-  const int connected = vexa::connect_within(socket, address, info.timeout);
-  if (connected != 1) {
-    FailWait(connected, vexa::kConnectTimedOut);
-    return false;
-  }
-  if (!vexa::make_blocking(socket)) {
-    FailSystem();
-    return false;
-  }
-  base64Encode(vexa::joined_credentials(info.userName, info.password).c_str(), m_BasicCredentials);
-  return true;
-}
-
-bool CVexaCommon::SendRtsp(int socket, const std::string& request) {
+bool send_rtsp(int socket, const std::string& request) {
   // Kept: the trace shows each request whole, credentials included; support reads it from the host's console.
   std::printf("send <%s>\n", request.c_str());
-  return vexa::send_once(socket, request.data(), request.size());
+  return send_once(socket, request.data(), request.size());
 }
 
-bool CVexaCommon::ReceiveRtsp(int socket, int timeout, std::string& answer) {
-  char text[kAnswerRoom + 1];
-  const int length = rtp_over_tcp_header_recv(socket, text, kAnswerRoom, timeout);
-  if (length < 0) return false;
-  answer.assign(text, static_cast<std::size_t>(length));
-  const auto line = vexa::parse_status_line(answer, "RTSP/");
-  if (!line) {
-    Fail(vexa::kStatusNotFound);
-    return false;
-  }
-  if (line->status == kRtspOk) return true;
-  Fail({line->status == kRtspUnauthorized ? LIBD_UNAUTHORIZED : LIBD_FAILED, line->reason.c_str()});
-  return false;
+Result<std::string> receive_accepted(int socket, int timeout) {
+  char text[kAnswerRoom];
+  const auto length = receive_rtsp_answer(socket, text, timeout);
+  if (!length) return length.failure();
+  std::string answer(text, static_cast<std::size_t>(*length));
+  const auto line = parse_status_line(answer, "RTSP/");
+  if (!line) return kStatusNotFound;
+  if (line->status == kRtspOk) return answer;
+  return Failure{line->status == kRtspUnauthorized ? LIBD_UNAUTHORIZED : LIBD_FAILED, line->reason};
 }
 
-bool CVexaCommon::ExchangeRtsp(int socket, const vexa::Formatted& request, std::string& answer) {
-  if (request.cut) {
-    Fail(vexa::kUrlTooLong);
-    return false;
-  }
-  if (SendRtsp(socket, request.text)) return ReceiveRtsp(socket, ConnectionTimeout(), answer);
-  FailSystem();
-  return false;
-}
-
-bool CVexaCommon::DescribeRtsp(int socket, const std::string& url, std::string& description) {
-  const vexa::RtspHead head{url, ++m_RtspCSeq, m_BasicCredentials};
-  return ExchangeRtsp(socket, vexa::rtsp_describe(head), description);
-}
-
-// Kept: a description without a clock opens over UDP; live cameras send none.
-bool CVexaCommon::TakeRangeClock(const std::string& answer) {
-  const auto text = vexa::range_clock_text(answer);
-  if (!text || parse_clock(std::string(*text).c_str())) return true;
-  Fail(vexa::kUnknownClock);
-  return false;
-}
-
-bool CVexaCommon::TakeClockRate(const std::string& answer) {
-  const vexa::RtpClock clock = vexa::rtp_clock(answer);
+Result<int> clock_rate_of(const std::string& description) {
+  const RtpClock clock = rtp_clock(description);
   switch (clock.found) {
-    case vexa::RtpClock::Found::kRate:
-      m_RtpClockRate = clock.rate;
-      return true;
-    case vexa::RtpClock::Found::kNoRtpmap:
-      Fail(vexa::kRtpmapNotFound);
-      return false;
-    case vexa::RtpClock::Found::kNoSlash:
-      Fail(vexa::kRtpmapSlashNotFound);
-      return false;
-    case vexa::RtpClock::Found::kNoNumber:
-      Fail(vexa::kClockUnitNotFound);
-      return false;
+    case RtpClock::Found::kRate:
+      return clock.rate;
+    case RtpClock::Found::kNoRtpmap:
+      return kRtpmapNotFound;
+    case RtpClock::Found::kNoSlash:
+      return kRtpmapSlashNotFound;
+    case RtpClock::Found::kNoNumber:
+      return kClockUnitNotFound;
   }
-  return false;
+  return kNoReason;
 }
 
-bool CVexaCommon::SetUpRtsp(int socket, const vexa::Formatted& request, int& session) {
-  std::string answer;
-  if (!ExchangeRtsp(socket, request, answer)) return false;
-  const auto number = vexa::session_number(answer);
-  if (!number) {
-    Fail(vexa::kSessionNotFound);
-    return false;
-  }
-  session = *number;
-  return true;
+}  // namespace
+
+bool take_range_clock(std::string_view text, StreamClock clock) {
+  const RangeClock read = parse_range_clock(text);
+  if (read.seconds) clock.range_seconds = *read.seconds;
+  if (read.understood) clock.range_micros = read.micros;
+  return read.understood;
 }
 
-bool CVexaCommon::PlayRtsp(int socket, const std::string& url, int session) {
-  const int scale = m_EdgeStoragePlayback ? m_PlaybackScale : 1;
-  const vexa::RtspHead head{url, ++m_RtspCSeq, m_BasicCredentials};
-  std::string answer;
-  return ExchangeRtsp(socket, vexa::rtsp_play(head, {session, scale}), answer);
-}
-
-// Kept: every look is put behind the one before, and the answer is read behind the last look, as far as there is room.
+// Kept: every look is appended to the one before, and the answer is read after the last look, as far as there is room.
 // An answer that comes in one piece and fills no more than half the buffer stands whole at the buffer's beginning; of a
 // longer one, or one that came in pieces, only a part is seen.
-int CVexaCommon::rtp_over_tcp_header_recv(int socket, char* buffer, int size, int timeout) {
-  ClearLatestError();
-  const int ready = vexa::WaitBudget(timeout).wait_readable(socket);
-  if (ready != 1) return FailWait(ready, vexa::kReceiveTimedOut);
+Result<int> receive_rtsp_answer(int socket, std::span<char> room, int timeout) {
+  const int ready = WaitBudget(timeout).wait_readable(socket);
+  if (ready != 1) return wait_failure(ready, kReceiveTimedOut);
   // Safe: nothing that stood in the buffer before is taken for the camera's.
-  const std::size_t room = static_cast<std::size_t>(std::max(size, 0));
-  std::fill_n(buffer, room, '\0');
+  std::fill(room.begin(), room.end(), '\0');
   // Kept: one look a second, for whole seconds; a time-out below a second sees no answer.
   const int looks = timeout / kMillisecondsPerSecond;
   std::size_t filled = 0;
   int looked = 0;
   while (looked < looks) {
-    const ssize_t peeked = recv(socket, buffer + filled, room - filled, MSG_PEEK);
-    if (peeked < 0) return FailSystem();
+    const ssize_t peeked = recv(socket, room.data() + filled, room.size() - filled, MSG_PEEK);
+    if (peeked < 0) return system_failure();
     const std::size_t latest = std::exchange(filled, filled + static_cast<std::size_t>(peeked));
-    if (vexa::rtsp_header_complete({buffer, filled}, latest)) break;
+    if (rtsp_header_complete({room.data(), filled}, latest)) break;
     ++looked;
     std::this_thread::sleep_for(std::chrono::seconds(1));
   }
-  if (looked == looks) return Fail(vexa::kReceiveTimedOut);
-  const ssize_t received = recv(socket, buffer + filled, room - filled, 0);
-  return received < 0 ? FailSystem() : static_cast<int>(received);
+  if (looked == looks) return kReceiveTimedOut;
+  const ssize_t received = recv(socket, room.data() + filled, room.size() - filled, 0);
+  if (received < 0) return system_failure();
+  return static_cast<int>(received);
 }
 
-bool CVexaCommon::parse_clock(const char* text) {
-  if (text == nullptr) return false;
-  const vexa::RangeClock clock = vexa::parse_range_clock(text);
-  if (clock.seconds) m_RangeClockSeconds = *clock.seconds;
-  if (clock.understood) m_RangeClockMicros = clock.micros;
-  return clock.understood;
+Socket make_media_socket() { return make_socket(SOCK_DGRAM); }
+
+Result<int> bind_media_socket(int socket) {
+  set_receive_buffer(socket, kMediaReceiveBuffer);
+  sockaddr_in address{};
+  address.sin_family = AF_INET;
+  socklen_t length = sizeof address;
+  if (bind(socket, reinterpret_cast<sockaddr*>(&address), length) != 0) return system_failure();
+  // Safe: reusable only once it is bound; two sessions with reusable sockets could be given the same free port.
+  const int reuse = 1;
+  setsockopt(socket, SOL_SOCKET, SO_REUSEADDR, &reuse, sizeof reuse);
+  if (getsockname(socket, reinterpret_cast<sockaddr*>(&address), &length) != 0) return system_failure();
+  return ntohs(address.sin_port);
 }
 
-void CVexaCommon::rtp_over_udp_close() {
-  if (m_RtspSocket == -1 && m_StreamSocket == -1) return;
-  // Kept: the switch that recordings are played with holds for live sessions too.
-  if (WantsTearDown()) {
-    try {
-      TearDown();
-    } catch (const std::bad_alloc&) {
-      FailSystem(ENOMEM);
-    }
+Result<RtspServer> RtspSession::begin(const std::string& host, int port, int timeout) {
+  fields_.cseq = 0;
+  const ResolvedHost resolved = resolve_host(host, port);
+  if (!resolved.address) return system_failure(resolved.error);
+  RtspServer server{make_control_socket(timeout), *resolved.address};
+  if (!server.socket.valid()) return system_failure();
+  return server;
+}
+
+Result<int> RtspSession::open(const RtspServer& server, const Opening& opening) {
+  const SLibDConnectionInfo& info = opening.connection;
+  if (opening.media_port == kInterleaved) set_receive_buffer(server.socket.get(), kSharedReceiveBuffer);
+  if (const auto connected = connect_rtsp(server, info.timeout); !connected) return connected.failure();
+  socket_ = server.socket.get();
+  const std::string encoded = base64_encode(joined_credentials(info.userName, info.password));
+  std::memcpy(fields_.credentials, encoded.c_str(), encoded.size() + 1);
+  const RtspHead describe{opening.url, ++fields_.cseq, fields_.credentials};
+  const auto description = exchange(rtsp_describe(describe), opening);
+  if (!description) return description.failure();
+  if (const auto taken = take_clocks(*description, opening); !taken) return taken.failure();
+  const auto session = set_up(opening);
+  if (!session) return session;
+  const RtspHead play{opening.url, ++fields_.cseq, fields_.credentials};
+  const auto played = exchange(rtsp_play(play, {*session, opening.scale}), opening);
+  if (!played) return played.failure();
+  return session;
+}
+
+Result<std::string> RtspSession::exchange(const Formatted& request, const Opening& opening) {
+  if (request.cut) return kUrlTooLong;
+  if (!send_rtsp(socket_, request.text)) return system_failure();
+  return receive_accepted(socket_, opening.connection.timeout);
+}
+
+Result<> RtspSession::take_clocks(const std::string& description, const Opening& opening) const {
+  const auto range = range_clock_text(description);
+  // Kept: over UDP a description needs no clock, as live cameras send none; inside the connection it does.
+  if (!range && opening.media_port == kInterleaved) return kClockNotFound;
+  if (range && !take_range_clock(*range, opening.clock)) return kUnknownClock;
+  const auto rate = clock_rate_of(description);
+  if (!rate) return rate.failure();
+  opening.clock.rtp_rate = *rate;
+  return {};
+}
+
+Result<int> RtspSession::set_up(const Opening& opening) {
+  const RtspHead head{opening.url, ++fields_.cseq, fields_.credentials};
+  const auto answer = exchange(
+      opening.media_port == kInterleaved ? rtsp_setup_interleaved(head) : rtsp_setup_udp(head, opening.media_port),
+      opening);
+  if (!answer) return answer.failure();
+  const auto number = session_number(*answer);
+  if (!number) return kSessionNotFound;
+  return *number;
+}
+
+Result<> RtspSession::keep_alive(int socket) {
+  const RtspHead head{fields_.url, ++fields_.cseq, fields_.credentials};
+  const Formatted request = rtsp_get_parameter(head, fields_.session);
+  const bool sent = send_rtsp(socket, request.text);
+  std::puts(sent ? "successfully sending getparameter" : "error sending getparameter");
+  char answer[kAnswerRoom];
+  const auto received = receive_rtsp_answer(socket, answer, kKeepAliveAnswerTimeout);
+  if (!received) {
+    std::puts("error receiving getparameter");
+    return received.failure();
   }
-  rtp_stream_socket_close_all();
+  // Kept: a keep-alive that is too long is sent cut; the text of the error ends in a line break, which hosts compare.
+  if (request.cut) return kKeepAliveTooLong;
+  return {};
 }
 
-// The host may change its mind at any time.
-bool CVexaCommon::WantsTearDown() {
-  const vexa::Guard guard(m_VideoStateLock);
-  return !m_NoTearDown;
+Result<> RtspSession::tear_down(int socket, int timeout) {
+  const RtspHead head{fields_.url, ++fields_.cseq, fields_.credentials};
+  const Formatted request = rtsp_teardown(head, fields_.session);
+  // Kept: a text that is too long is sent cut, for the camera to refuse. The answer is read whatever came before, and
+  // the last failure is the one that is reported.
+  Result<> result;
+  if (request.cut) result = kUrlTooLong;
+  if (!send_rtsp(socket, request.text)) result = system_failure();
+  const auto answer = receive_accepted(socket, timeout);
+  if (!answer) return answer.failure();
+  return result;
 }
 
-void CVexaCommon::TearDown() {
-  const vexa::RtspHead head{m_RtspUrl, ++m_RtspCSeq, m_BasicCredentials};
-  const vexa::Formatted request = vexa::rtsp_teardown(head, m_RtspSession);
-  // Kept: a text that is too long is sent cut, for the camera to refuse.
-  if (request.cut) Fail(vexa::kUrlTooLong);
-  if (!SendRtsp(m_RtspSocket, request.text)) FailSystem();
-  std::string answer;
-  ReceiveRtsp(m_RtspSocket, m_State->teardown_timeout, answer);
-}
-
-void CVexaCommon::rtp_stream_socket_close_all() {
-  vexa::shutdown_and_close(std::exchange(m_RtspSocket, -1));
-  vexa::shutdown_and_close(m_StreamSocket);
-  SetStreamSocket(-1);
-}
-
-unsigned char* CVexaCommon::base64Decode(const char* text, unsigned int& size, bool trim) {
-  std::vector<unsigned char> bytes = vexa::base64_decode(text == nullptr ? "" : text);
-  while (trim && !bytes.empty() && bytes.back() == 0) bytes.pop_back();
-  size = static_cast<unsigned int>(bytes.size());
-  auto* copy = new unsigned char[bytes.size()];
-  std::copy(bytes.begin(), bytes.end(), copy);
-  return copy;
-}
+}  // namespace vexa

@@ -27,6 +27,12 @@ class Socket {
   int descriptor_ = -1;
 };
 
+/// A connection that is read until the host stops the stream.
+struct StoppableSocket {
+  int socket;
+  int stop;  ///< becomes readable when the stream is to end; -1: never
+};
+
 /// One send; true when all bytes went. A peer that has closed gives EPIPE, never a signal.
 bool send_once(int socket, const char* bytes, std::size_t length);
 

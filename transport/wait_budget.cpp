@@ -5,20 +5,12 @@
 #include <algorithm>
 #include <cerrno>
 
+#include "runtime/base/deadline.h"
+
 namespace vexa {
-namespace {
-
-using Clock = std::chrono::steady_clock;
-
-int remaining_milliseconds(Clock::time_point deadline) {
-  const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - Clock::now()).count();
-  return static_cast<int>(std::max<std::int64_t>(left, 0));
-}
-
-}  // namespace
 
 WaitBudget::WaitBudget(int milliseconds)
-    : deadline_(Clock::now() + std::chrono::milliseconds(std::max(milliseconds, 0))) {}
+    : deadline_(std::chrono::steady_clock::now() + std::chrono::milliseconds(std::max(milliseconds, 0))) {}
 
 int WaitBudget::wait_readable(int descriptor) const { return wait(descriptor, POLLIN, -1); }
 
@@ -34,7 +26,7 @@ int WaitBudget::wait(int descriptor, short events, int stop) const {
   }
   pollfd entries[] = {{descriptor, events, 0}, {stop, POLLIN, 0}};
   for (;;) {
-    const int count = poll(entries, 2, remaining_milliseconds(deadline_));
+    const int count = poll(entries, 2, std::max(milliseconds_until(deadline_), 0));
     if (count < 0 && errno == EINTR) continue;
     if (count <= 0) return count;
     if ((entries[1].revents & POLLIN) != 0) return 0;

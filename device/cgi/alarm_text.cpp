@@ -7,38 +7,12 @@ namespace vexa {
 namespace {
 
 constexpr std::int64_t kLongestTampering = 59;  // seconds
-constexpr std::int64_t kSilenceGrace = 15;      // seconds
 
 constexpr Word<bool> kDetectorWords[] = {{true, "on"}, {false, "off"}};
 
 std::int64_t seconds_between(std::time_t earlier, std::time_t later) {
   return std::int64_t{later} - std::int64_t{earlier};
 }
-
-/// Hands out the types of the pins behind the inputs, each the first time it is asked for.
-class DetectorTypes {
- public:
-  explicit DetectorTypes(const SLibDFixedIoBoxInfo& fixed)
-      : video_(fixed.videoDetection), tampering_(fixed.tamperingDetection), audio_(fixed.audioDetection) {}
-
-  ELibDPinType next() {
-    if (take(video_)) return PIN_TYPE_DETECTION;
-    if (take(tampering_)) return PIN_TYPE_TAMPERING;
-    // Kept: all further pins are audio, or inputs of a camera without it.
-    return audio_ ? PIN_TYPE_AUDIO_DETECTION : PIN_TYPE_SENSOR_INPUT;
-  }
-
- private:
-  static bool take(bool& left) {
-    const bool had = left;
-    left = false;
-    return had;
-  }
-
-  bool video_;
-  bool tampering_;
-  bool audio_;
-};
 
 }  // namespace
 
@@ -89,26 +63,11 @@ std::vector<SLibDPinInfo> sensor_pins(std::string_view answer) {
   return pins;
 }
 
-void take_status_pins(PinMasks masks, const SLibDFixedIoBoxInfo& fixed, std::vector<SLibDPinInfo>& pins) {
-  pins.clear();
-  DetectorTypes detectors(fixed);
-  for (int bit = 0; bit < static_cast<int>(kMostStatusPins); ++bit) {
-    if ((masks.present >> bit & 1) == 0) continue;
-    const std::int32_t number = bit + 1;
-    pins.push_back(pin_of(number, number > fixed.inputCount ? detectors.next() : PIN_TYPE_SENSOR_INPUT));
-    pins.back().state = static_cast<std::int32_t>(masks.state >> bit & 1);
-  }
-}
-
 bool tampering_is_due(std::int32_t state, std::time_t now, std::time_t& since) {
   if (state == 0) since = 0;
   if (state != 1) return false;
   if (since == 0) since = now;
   return seconds_between(since, now) > kLongestTampering;
-}
-
-bool alarm_stream_is_silent(std::time_t now, std::time_t last, int timeout_ms) {
-  return seconds_between(last, now) > timeout_ms / 1000 + kSilenceGrace;
 }
 
 }  // namespace vexa

@@ -33,23 +33,8 @@ std::optional<std::int32_t> tamper_level_of(std::string_view answer);
 /// The inputs that the answer of the "sensor" inquiry names, in its order, with their states.
 std::vector<SLibDPinInfo> sensor_pins(std::string_view answer);
 
-/// Bit N - 1 stands for pin N.
-struct PinMasks {
-  std::uint32_t present;  ///< the camera spoke of the pin
-  std::uint32_t state;
-};
-
-inline constexpr std::size_t kMostStatusPins = 32;
-
-/// Replaces `pins` by those that the camera spoke of, in order. Behind the inputs stand the detectors it has: video
-/// detection, tampering, audio. Allocates nothing when there is room for kMostStatusPins.
-void take_status_pins(PinMasks masks, const SLibDFixedIoBoxInfo& fixed, std::vector<SLibDPinInfo>& pins);
-
 /// A tampering pin of `state` was reported at `now`. True when it has been active for a minute and is to be cleared on
 /// the camera. `since` is when it was first seen active, 0 when it is not.
 bool tampering_is_due(std::int32_t state, std::time_t now, std::time_t& since);
-
-/// Whether nothing for so long is a stream that has died: longer than the time-out and 15 seconds.
-bool alarm_stream_is_silent(std::time_t now, std::time_t last, int timeout_ms);
 
 }  // namespace vexa

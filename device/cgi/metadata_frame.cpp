@@ -1,7 +1,5 @@
 #include "device/cgi/metadata_frame.h"
 
-#include <cstdint>
-
 #include "runtime/base/text.h"
 
 namespace vexa {
@@ -21,11 +19,6 @@ void take_metadata(std::string_view body, SLibDRawMDFrameInfo& frame) {
   take_window(text, "Window2=", frame.window2);
   take_window(text, "Window3=", frame.window3);
   take_window(text, "Window4=", frame.window4);
-}
-
-bool metadata_stream_is_silent(std::time_t now, std::time_t last, int timeout_ms) {
-  constexpr std::int64_t kMillisecondsPerSecond = 1000;
-  return (std::int64_t{now} - std::int64_t{last}) * kMillisecondsPerSecond > timeout_ms;
 }
 
 }  // namespace vexa

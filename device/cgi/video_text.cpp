@@ -2,23 +2,23 @@
 
 #include <algorithm>
 
+#include "media/assembly/codec.h"
 #include "runtime/base/text.h"
 
 namespace vexa {
 namespace {
 
-constexpr VideoCodec kJpeg{"JPEG", 0};
-constexpr VideoCodec kMpeg4{"MPEG4", 1};
-constexpr VideoCodec kH264{"H.264", 2};
-
 struct CodecWord {
   const char* word;
-  const VideoCodec* codec;
+  const Codec* codec;
 };
 
 // A camera with two encoders names the codec of the stream first.
-constexpr CodecWord kCodecWords[] = {
-    {"jpeg", &kJpeg}, {"jpeg-mpeg4", &kJpeg}, {"mpeg4", &kMpeg4}, {"mpeg4-jpeg", &kMpeg4}, {"h264", &kH264}};
+constexpr CodecWord kCodecWords[] = {{"jpeg", &kJpegCodec},
+                                     {"jpeg-mpeg4", &kJpegCodec},
+                                     {"mpeg4", &kMpeg4Codec},
+                                     {"mpeg4-jpeg", &kMpeg4Codec},
+                                     {"h264", &kH264Codec}};
 
 struct ClassicSize {
   int width;
@@ -48,7 +48,7 @@ PlacedValue value_behind(std::string_view answer, std::size_t key_at, std::size_
 
 std::string stream_key(const char* name, int stream) { return name + std::to_string(stream) + "="; }
 
-const VideoCodec* video_codec_of(std::string_view word) {
+const Codec* video_codec_of(std::string_view word) {
   for (const CodecWord& row : kCodecWords) {
     if (row.word == word) return row.codec;
   }
@@ -71,9 +71,9 @@ StreamSize read_stream_size(std::string_view value) {
 }
 
 CodecRequest codec_request(const SLibDCameraInfo& info) {
-  if (info.codecName == kMpeg4.name) return {"mpeg4", "BitRate", info.bitRate};
-  if (info.codecName == kH264.name) return {"h264", "BitRate", info.bitRate};
-  return {"jpeg", "Quality", info.quality};
+  const Codec* named = codec_named(info.codecName);
+  const Codec& codec = named == nullptr ? kJpegCodec : *named;
+  return {codec.word, codec.rate_key, codec.kind == CodecKind::kJpeg ? info.quality : info.bitRate};
 }
 
 }  // namespace vexa

@@ -6,6 +6,7 @@
 #include <string>
 #include <string_view>
 
+#include "media/assembly/codec.h"
 #include "vexa/video_info.h"
 
 namespace vexa {
@@ -23,14 +24,8 @@ PlacedValue value_behind(std::string_view answer, std::size_t key_at, std::size_
 /// The key of one stream's setting: ("ImageCodec", 1) is "ImageCodec1=".
 std::string stream_key(const char* name, int stream);
 
-/// A video codec as the host knows it.
-struct VideoCodec {
-  const char* name;        ///< "JPEG", "MPEG4" or "H.264"
-  std::int32_t codecType;  ///< 0, 1 or 2
-};
-
 /// The codec a stream sends in a camera's mode `word`; null for an unknown word.
-const VideoCodec* video_codec_of(std::string_view word);
+const Codec* video_codec_of(std::string_view word);
 
 /// The video standard that the value names; PAL when it names none.
 ELibDVideoStandard video_standard_of(std::string_view value);

@@ -18,18 +18,10 @@
 #include "vexa/resolution_filter.h"
 #include "vexa/simple_lock.h"
 
-struct sockaddr_in;
 struct typedHandle;
 
 namespace vexa {
 struct DriverState;
-class StreamWindow;
-struct ElementaryCodec;
-struct AssembledPicture;
-struct PacketRunPlace;
-struct PictureRules;
-struct Failure;
-struct Formatted;
 }  // namespace vexa
 
 /// Drives one camera over HTTP CGI, RTSP/RTP and HTTP streams.
@@ -58,17 +50,14 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   CVexaCommon(const CVexaCommon&) = delete;
   CVexaCommon& operator=(const CVexaCommon&) = delete;
   ~CVexaCommon() override;
-
   // device/vexa_common.cpp
   ELibDReturnCode GetLatestErrorText(std::string& text) override;
   ELibDReturnCode GetCameraType(ELibCameraType type) override;
   ELibDReturnCode SetCameraInfoFromID(unsigned int id) override;
-
   // device/system_info.cpp
   ELibDReturnCode GetFixedSystemInfo(SLibDFixedSystemInfo& info) override;
   ELibDReturnCode GetFixedConnectionInfo(SLibDFixedConnectionInfo& info) override;
   ELibDReturnCode GetCurrentSystemInfo(SLibDSystemInfo& info) override;
-
   // device/video_settings.cpp
   ELibDReturnCode GetFixedCameraInfo(SLibDFixedCameraInfo& info) override;
   ELibDReturnCode SetVideoStandard(ELibDVideoStandard standard) override;
@@ -77,7 +66,6 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode SetImageMaxSize(int width, int height, ELibDVideoStandard standard) override;
   ELibDReturnCode GetCameraInfo(SLibDCameraInfo& info) override;
   ELibDReturnCode SetCameraInfo(SLibDCameraInfo& info) override;
-
   // device/image_controls.cpp
   ELibDReturnCode SetBrightMode(std::string& mode) override;
   ELibDReturnCode SetBackLightCompMode(bool on) override;
@@ -93,7 +81,6 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode SetViewDR(ELibDViewDRMode mode) override;
   ELibDReturnCode GetIRIlluminator(ELibIRIlluminatorMode& mode, int& strength) override;
   ELibDReturnCode SetIRIlluminator(ELibIRIlluminatorMode mode, int strength) override;
-
   // device/ptz_motion.cpp
   ELibDReturnCode PanTilt(int pan, int tilt) override;
   ELibDReturnCode PanTiltAbsolute(int pan, int tilt) override;
@@ -105,23 +92,19 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode SetFocusMode(bool automatic) override;
   ELibDReturnCode Focus(int speed) override;
   ELibDReturnCode FocusAbsolute(int position) override;
-
   // device/ptz_position.cpp
   ELibDReturnCode GetCurrentPosition(SLibDPTZStatus& status) override;
   ELibDReturnCode GetPTZControlInfo(SLibDPTZControlInfo& info) override;
   ELibDReturnCode SetPTZControlInfo(SLibDPTZControlInfo& info) override;
   ELibDReturnCode GetFixedPTZControlInfo(SLibDFixedPTZControlInfo& info) override;
-
   // device/presets.cpp
   ELibDReturnCode GetPresets(std::vector<SLibDPresetInfo>& presets) override;
   ELibDReturnCode ClearPreset(int index) override;
   ELibDReturnCode SetPreset(SLibDPresetInfo& preset) override;
   ELibDReturnCode RecallPreset(int index) override;
-
   // device/camera_tours.cpp
   ELibDReturnCode GetCameraTourInfo(SLibDCameraTourInfo& info) override;
   ELibDReturnCode SetCameraTourInfo(SLibDCameraTourInfo& info) override;
-
   // device/shadow_tours.cpp
   ELibDReturnCode GetShadowTourInfo(SLibDShadowTourInfo& info) override;
   ELibDReturnCode SetShadowTourInfo(SLibDShadowTourInfo& info) override;
@@ -131,28 +114,24 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode StopRecordShadowTour() override;
   ELibDReturnCode StartPreviewShadowTour(int number) override;
   ELibDReturnCode StopPreviewShadowTour() override;
-
   // device/connection.cpp
   ELibDReturnCode GetCurrentConnectionInfo(SLibDConnectionInfo& info) override;
   ELibDReturnCode SetCurrentConnectionInfo(SLibDConnectionInfo& info) override;
-
   // device/cgi_log.cpp
   ELibDReturnCode SetCGILogLevel(bool on) override;
   ELibDReturnCode SetCGILogPath(const char* path) override;
-
-  // media/streaming_thread.cpp, media/frame_queue.cpp
+  // device/video_streaming.cpp
   ELibDReturnCode StartVideoStreaming() override;
   ELibDReturnCode StopVideoStreaming() override;
+  // device/frame_queue.cpp
   ELibDReturnCode GetCurrentVideoFrame(SLibDVideoFrameInfo& frame) override;
-
-  // media/audio.cpp
+  // device/audio.cpp
   ELibDReturnCode GetFixedAudioInfo(SLibDFixedAudioInfo& info) override;
   ELibDReturnCode GetAudioInfo(SLibDAudioInfo& info) override;
   ELibDReturnCode SetAudioInfo(SLibDAudioInfo& info) override;
   ELibDReturnCode StartAudioStreaming() override;
   ELibDReturnCode StopAudioStreaming() override;
   ELibDReturnCode GetCurrentAudioFrame(SLibDAudioFrameInfo& frame) override;
-
   // device/alarm_io.cpp
   ELibDReturnCode GetFixedIoboxInfo(SLibDFixedIoBoxInfo& info) override;
   ELibDReturnCode GetIoBoxInfo(SLibDIoBoxInfo& info) override;
@@ -160,7 +139,6 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode StopIoStreaming() override;
   ELibDReturnCode GetCurrentIoStatus(std::vector<SLibDPinInfo>& pins) override;
   ELibDReturnCode SetOutput(SLibDPinInfo& pin) override;
-
   // device/detection.cpp
   ELibDReturnCode GetObjectDetectionSetting(std::vector<SLibDDetectionParam>& params, ELibDPositionMode& mode) override;
   ELibDReturnCode SetDetectionParam(SLibDDetectionParam& param) override;
@@ -168,12 +146,10 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode SetTamperingAlarm(bool on, ELibDTamperLevel level) override;
   ELibDReturnCode SetAudioDetection(bool on) override;
   ELibDReturnCode SetVMDtype(ELibDVMDType type) override;
-
   // device/metadata_stream.cpp
   ELibDReturnCode StartModRawData() override;
   ELibDReturnCode GetCurrentPosition(SLibDRawMDFrameInfo& frame) override;
   ELibDReturnCode StopModRawData() override;
-
   // device/edge_storage.cpp
   ELibDReturnCode GetEdgeStorageMode(SLibDEdgeStorageMode& mode) override;
   ELibDReturnCode SetEdgeStorageMode(const SLibDEdgeStorageMode& mode) override;
@@ -181,14 +157,16 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode DeleteAllEdgeStorageRecord() override;
   ELibDReturnCode DeleteEdgeStorageRecordByName(const SLibDEdgeStorageStreamingInfo& info) override;
   ELibDReturnCode SetEdgeStorageNoTearDown(bool noTearDown) override;
-  // media/streaming_thread.cpp
+  // device/video_streaming.cpp
   ELibDReturnCode StartEdgeStorageVideoStreaming(const SLibDEdgeStorageStreamingInfo& info) override;
-
-  /// Hook of model classes, called when standard or capture size change (-1: no size is given). LIBD_OK.
+  // device/vexa_common.cpp
+  /// Hook of model classes, called when standard or capture size change (-1: no size is given), by the thread that runs
+  /// the operation and with no lock held: it may send commands, and changes m_FixedCameraInfo under m_ConnectionLock.
+  /// The result is not used. LIBD_OK.
   virtual ELibDReturnCode InitializeFixedVideoParams(ELibDVideoStandard standard, int width, int height);
 
  protected:
-  // The HTTP CGI client: transport/http_client.cpp
+  // The HTTP CGI client and HTTP streams: device/http_client.cpp
   int http_open(const char* format, ...) __attribute__((format(printf, 2, 3)));
   int http_header_recv(int socket, char* buffer, int length, int timeout);
   int http_recv(int socket, char* buffer, int length, int timeout);
@@ -199,28 +177,17 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   bool GetUrlParameter(const std::string& answer, std::string key, std::string& value);
   bool GetUrlParameter(const std::string& answer, std::string key, int& value);
   ELibDReturnCode SendInqCommand(const std::string& name, std::string& answer);
-  /// One request whose answer body is not read: LIBD_OK, or the latest error's code.
-  ELibDReturnCode SendCommand(const char* format, ...) __attribute__((format(printf, 2, 3)));
   void base64Encode(const char* text, char* output);
-  // Its steps: a socket or -1; false with the latest error set.
-  int ConnectHttp(const SLibDConnectionInfo& info);
-  bool RequestHttp(int socket, const SLibDConnectionInfo& info, const std::string& path);
-  bool ReadHttpStatus(int socket, int timeout);
-
-  // HTTP streams: transport/http_streams.cpp
   /// Where the next start code begins in `length` bytes; null when there is none.
   using StartCodeFinder = const unsigned char* (*)(const unsigned char* data, unsigned int length);
   int http_multipart_jpeg_recv(int socket, char* buffer, int capacity, int timeout);
-  int http_multipart_input_recv(int socket, unsigned int& mask, unsigned int& state);
   int http_multipart_mddata_recv(int socket, char* buffer, int capacity, int timeout);
   /// The first byte of the first 00 00 00 01 in the data; null when there is none. Reads nothing outside the data.
   static const unsigned char* find_start_code_h264(const unsigned char* data, unsigned int length);
   /// The same for 00 00 01; of more zeros the last two belong to it.
   static const unsigned char* find_start_code_mpeg4(const unsigned char* data, unsigned int length);
   int http_stream_recv(int socket, char* buffer, int capacity, StartCodeFinder finder, int codeLength, int timeout);
-  bool ReceiveStream(int socket, vexa::StreamWindow& window);
-
-  // The RTSP session: transport/rtsp_session.cpp, transport/keep_alive.cpp
+  // RTSP sessions and their packets, over UDP and inside the connection: device/rtsp_session.cpp
   int rtp_over_udp_open(const char* format, ...) __attribute__((format(printf, 2, 3)));
   int rtp_over_tcp_header_recv(int socket, char* buffer, int size, int timeout);
   bool parse_clock(const char* text);
@@ -228,131 +195,66 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   void rtp_stream_socket_close_all();
   unsigned char* base64Decode(const char* text, unsigned int& size, bool trim);
   void KeepAlive();
-  // Its steps: a port, a socket or -1; false with the latest error set (SendRtsp: with errno).
-  int RtspPort();
-  int MakeRtspSocket(const SLibDConnectionInfo& info, sockaddr_in& address);
-  int BindMediaSocket();
-  bool ConnectRtsp(int socket, const sockaddr_in& address, const SLibDConnectionInfo& info);
-  bool SendRtsp(int socket, const std::string& request);
-  bool ReceiveRtsp(int socket, int timeout, std::string& answer);
-  bool ExchangeRtsp(int socket, const vexa::Formatted& request, std::string& answer);
-  bool DescribeRtsp(int socket, const std::string& url, std::string& description);
-  bool SetUpRtsp(int socket, const vexa::Formatted& request, int& session);
-  bool PlayRtsp(int socket, const std::string& url, int session);
-  bool WantsTearDown();
-  void TearDown();
-  bool TakeRangeClock(const std::string& answer);
-  bool TakeClockRate(const std::string& answer);
-
-  // RTP inside the RTSP connection: transport/rtp_over_tcp.cpp
+  bool InitEdgeStorageKeepAlivePeriod();
   int rtp_over_tcp_open(const char* format, ...) __attribute__((format(printf, 2, 3)));
   void rtp_over_tcp_close(int socket);
   int rtp_over_tcp_recvn(int socket, char* buffer, int length, int timeout);
   int rtp_over_tcp_payload_recv(int socket, char* buffer, int size, bool* marker, unsigned char* payloadType,
                                 int timeout, unsigned int* timestamp);
-
-  // RTP over UDP: transport/rtp_over_udp.cpp
   int rtp_over_udp_recvn(int socket, char* buffer, int length, int timeout);
   int rtp_over_udp_payload_recv(int socket, char* buffer, int size, int timeout, SPacketInfo& packet);
   int rtp_over_udp_payload_recv_h264(int socket, char* buffer, int size, int timeout, SPacketInfo& packet);
   int rtp_over_udp_payload_recv(int socket, char* buffer, int size, bool* marker, unsigned char* payloadType,
                                 int timeout, unsigned int* timestamp, unsigned short* sequence);
-
-  // The streaming thread and the frame queue: media/streaming_thread.cpp, media/frame_queue.cpp
+  // The streaming thread: device/video_streaming.cpp
   static unsigned int StreamingThread(void* driver);
+  ELibDReturnCode StopRtpVideoStreaming();
+  void ReleaseRtpPacketsPtr();
+  // The frame queue: device/frame_queue.cpp
   static void ProcessCurrentFrameData(CVexaCommon* driver, VideoFrameInfo& frame, bool& waitKey,
                                       ELibDReturnCode result);
   static void PropulateFrameInfoList(CVexaCommon* driver, VideoFrameInfo& frame, bool& waitKey)
       VEXA_REQUIRES(driver->m_FrameQueueLock);
-  ELibDReturnCode GetRtpCurrentVideoFrame(const std::string& codec, VideoFrameInfo& frame);
-  ELibDReturnCode StopRtpVideoStreaming();
-  void ReleaseRtpPacketsPtr();
-  ELibDReturnCode StartVideo(const SLibDEdgeStorageStreamingInfo* recording);
-  ELibDReturnCode StartLiveVideo();
-  ELibDReturnCode StartPlayback(const SLibDEdgeStorageStreamingInfo& recording);
-  ELibDReturnCode AbandonStart(int error);
-  SLibDCameraInfo PrepareCamera();
-  bool OpenLiveHttp(int stream);
-  bool OpenLiveRtp(int stream);
-  bool OpenPlayback(const SLibDEdgeStorageStreamingInfo& recording);
-  void OpenRtpSession(const std::string& path);
-  bool AllocateRtpPackets();
-  ELibDReturnCode StartStreamingThread(const std::string& codec);
-  bool NextReadWaits(ELibDReturnCode result) const;
-  void TakeFrame(VideoFrameInfo& frame);
-  ELibDReturnCode ReadFrame(VideoFrameInfo& frame);
-  std::string StreamCodec();
-  bool IsStopRequested();
-  void SetStreamSocket(int socket);
-  void EndStreamingThread();
-  void FreeFrame(VideoFrameInfo& frame) VEXA_REQUIRES(m_FrameQueueLock);
-  void ClearFrameQueue();
-
-  // The camera-position text in user data: media/user_data.cpp
-  /// Looks for it in the first 256 bytes; true when it is there and stored.
-  bool GetUserDataFromStream(const unsigned char* data, unsigned int length);
-  /// The same over the whole data.
-  bool TakeCameraPosition(const unsigned char* data, unsigned int length);
-
-  // Frames from the HTTP image stream: media/http_frames.cpp
+  // Frames from the HTTP image stream: device/http_frames.cpp
   ELibDReturnCode GetCurrentFrameData(VideoFrameInfo& frame);
   ELibDReturnCode GetCurrentJPEGFrameData(VideoFrameInfo& frame, int& received);
   ELibDReturnCode GetCurrentH264FrameData(VideoFrameInfo& frame, int& received);
   ELibDReturnCode GetCurrentMPEGFrameData(VideoFrameInfo& frame, int& received);
-  bool ResetStreamBuffer();
-  void ReleaseStreamBuffer();
-  ELibDReturnCode GetElementaryFrame(VideoFrameInfo& frame, const vexa::ElementaryCodec& codec, int& received);
-  bool TakeUnit(VideoFrameInfo& frame, const vexa::ElementaryCodec& codec, unsigned int length);
-
-  // Pictures from RTP: media/rtp_pictures.cpp, media/rtp_frames.cpp
+  // Frames from the pictures of an RTP session: device/rtp_frames.cpp
+  ELibDReturnCode GetRtpCurrentVideoFrame(const std::string& codec, VideoFrameInfo& frame);
   ELibDReturnCode GetRtpCurrentVideoFrameH264(VideoFrameInfo& frame);
   ELibDReturnCode GetRtpCurrentVideoFrameMPEG4(VideoFrameInfo& frame);
   ELibDReturnCode GetRtpCurrentVideoFrameJPEG(VideoFrameInfo& frame);
   /// `out` has room for 4096 bytes: the JFIF header and the first payload's scan data. False leaves it undefined.
   bool RTPJpegToJIF(unsigned char* out, unsigned int* outLength, unsigned char* payload, unsigned int length);
-  ELibDReturnCode BeginRtpFrame(VideoFrameInfo& frame, const vexa::PictureRules& rules);
-  ELibDReturnCode FinishRtpFrame(VideoFrameInfo& frame, vexa::PacketRunPlace run,
-                                 const vexa::AssembledPicture& picture);
-  ELibDReturnCode CollectJpegPicture(vexa::PacketRunPlace& run);
-
-  ELibDReturnCode CollectPicture(vexa::PacketRunPlace& run);
-  int ReceivePacket(int timeout);
-  bool PacketWaits(int timeout);
-  ELibDReturnCode NothingYet();
-  void StampPicture(VideoFrameInfo& frame, std::uint32_t timestamp);
-
-  // Sound: media/audio.cpp
-  SLibDAudioInfo AudioInfo();
-
-  // Shared with model classes: device/system_info.cpp, device/edge_storage.cpp
+  /// Looks for the camera's position in the first 256 bytes of user data; true when it is there and stored.
+  bool GetUserDataFromStream(const unsigned char* data, unsigned int length);
+  // Shared with model classes: device/system_info.cpp
   ELibDReturnCode GetCommonSystemInfo(SLibDSystemInfo& info, const std::string& answer);
   ELibDReturnCode GetCommonNetworkInfo(SLibDSystemInfo& info, const std::string& answer);
-  bool InitEdgeStorageKeepAlivePeriod();
+  // device/edge_storage.cpp
   /// Free kilobytes on the card; 0 when the camera names none, -1 when it cannot be asked.
   int CheckEdgeStorageFreeSize();
   std::int64_t _ld_mkgmtime(std::tm* time);
   bool _ld_is_leap_year(int year);
-
-  // Video settings, read with m_ConnectionLock held: device/video_settings.cpp
+  // Video settings out of an answer: device/video_settings.cpp
   // `pos` is in the place of the key in the answer, out the end of its value; `changed` is set, never cleared.
-  void ParseVideoStandardFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed);
-  void ParseVideoCapSizeFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed);
-  void ParseSolidPTZFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed);
-  void ParseImageMaxSizeFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed);
+  void ParseVideoStandardFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed)
+      VEXA_REQUIRES(m_ConnectionLock);
+  void ParseVideoCapSizeFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed)
+      VEXA_REQUIRES(m_ConnectionLock);
+  void ParseSolidPTZFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed)
+      VEXA_REQUIRES(m_ConnectionLock);
+  void ParseImageMaxSizeFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed)
+      VEXA_REQUIRES(m_ConnectionLock);
   void SetCurrentStreamMode(const std::string& answer, std::size_t& pos, std::int32_t& codecType,
-                            const std::string& key);
-  void SetCurrentResolution(const std::string& answer, std::size_t& pos, const std::string& key);
-  void SetCurrentFrameRate(const std::string& answer, std::size_t& pos, const std::string& key);
+                            const std::string& key) VEXA_REQUIRES(m_ConnectionLock);
+  void SetCurrentResolution(const std::string& answer, std::size_t& pos, const std::string& key)
+      VEXA_REQUIRES(m_ConnectionLock);
+  void SetCurrentFrameRate(const std::string& answer, std::size_t& pos, const std::string& key)
+      VEXA_REQUIRES(m_ConnectionLock);
   void SetCurrentQualityBitrate(const std::string& answer, std::size_t& pos, std::int32_t codecType,
-                                const std::string& key);
-  void ReadCameraProperties(const std::string& answer);
-  void ReadStreamSettings(const std::string& answer, int stream);
-  void ReadVideoPorts(const std::string& answer);
-  void StoreCameraInquiry(const std::string& answer);
-  bool TakesElectronicFlip();
-  ELibDVideoStandard StoredVideoStandard();
-  void FilterBy(const char* item, const std::string& value);
-
+                                const std::string& key) VEXA_REQUIRES(m_ConnectionLock);
   // Exposure and image controls: device/image_controls.cpp
   ELibDReturnCode CheckAmountOfBrightness(int step);
   ELibDReturnCode CheckCurrentBrightMode();
@@ -363,69 +265,44 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   bool GetIrisPositionFromCameraData(std::string& answer, int& value, unsigned& entry);
   bool GetShutterSpeedFromShutterSpeedList(int step, int& value, unsigned entry);
   bool GetIrisPositionFromIrisList(int step, int& value, unsigned entry);
-  std::string StoredBrightMode();
-  bool CameraInquiry(std::string& answer);
-  ELibDReturnCode AfterImageChange(ELibDReturnCode sent);
-
   // Alarm pins: device/alarm_io.cpp
   ELibDReturnCode GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>& pins);
-  ELibDReturnCode AskTampering(int number, SLibDIoBoxInfo& info);
-  ELibDReturnCode AskAudioDetection(int number, SLibDIoBoxInfo& info);
-  ELibDReturnCode OpenIoStream();
-  bool AskSensors(std::string& answer);
-  ELibDReturnCode WatchTampering(int state);
-  int StoredVmdType();
-
+  int http_multipart_input_recv(int socket, unsigned int& mask, unsigned int& state);
   // Detection settings: device/detection.cpp
   /// Sends what an object-detection camera keeps of a setting; `socket` is set to each request's, which is closed.
   ELibDReturnCode SetObjectDetectionParameter(SLibDDetectionParam& param, int& socket);
   ELibDReturnCode ConverObjectWidthValueToString(SLibDDetectionParam& param, std::string& text);
   ELibDReturnCode CheckDetectionParamSensitivity(SLibDDetectionParam& param);
   ELibDReturnCode CheckDetectionParamDetectionArea(SLibDDetectionParam& param);
-  ELibDReturnCode AskLodDetection(std::vector<SLibDDetectionParam>& params);
-  ELibDReturnCode AskObjectDetection(std::vector<SLibDDetectionParam>& params, ELibDPositionMode& mode);
-
-  // Motion and position: device/ptz_motion.cpp, device/ptz_position.cpp
+  // Motion: device/ptz_motion.cpp
   void GetDirectionFromPanTiltSpeed(int pan, int tilt, ELibDPanTiltDirection& direction);
   // 0, or 1 when the request cannot be opened.
   int SendPTZCommands(int pan, int tilt, const ELibDPanTiltDirection& direction);
   int SendPTZCommandForCenterDirection();
+  // device/ptz_position.cpp
   /// False leaves both angles: no zoom ratios are known, or an angle or ratio is 0.
   bool GetViewingAngles(int zoom, int& horizontal, int& vertical);
-  bool TakesContinuousPtz();
-  int ImageRotation();
-
-  // Presets and tours: device/presets.cpp, device/camera_tours.cpp
-  bool IsPreset(int index) const;
+  // Tours: device/camera_tours.cpp
   bool GetTextByTourSequenceList(const std::vector<int>& sequence, std::string& text);
   bool GetTourSequenceListByText(std::string text, std::vector<int>& sequence);
-
-  // Shared by model variants: device/model_variants.cpp
-  /// Sends the picture to the network when the answer of the "system" inquiry names another output.
-  ELibDReturnCode BringVideoToNetwork(const std::string& systemAnswer);
-  ELibDReturnCode ReadSystemBringingVideo(SLibDSystemInfo& info);
-  ELibDReturnCode AskVideoOutMode(ELibVideoOutMode& mode);
-
   // The CGI log: device/cgi_log.cpp
   void Log(const char* direction, const char* message);
-
   // Identity, capabilities and current settings
   SLibDFixedSystemInfo m_FixedSystemInfo;
   SLibDFixedConnectionInfo m_FixedConnectionInfo;
-  SLibDFixedCameraInfo m_FixedCameraInfo;
-  SLibDFixedAudioInfo m_FixedAudioInfo;
+  SLibDFixedCameraInfo m_FixedCameraInfo VEXA_GUARDED_BY(m_ConnectionLock);
+  SLibDFixedAudioInfo m_FixedAudioInfo VEXA_GUARDED_BY(m_ConnectionLock);
   SLibDFixedPTZControlInfo m_FixedPTZControlInfo;
-  SLibDCameraInfo m_CameraInfo;  ///< guarded by m_ConnectionLock
-  CResolutionFilterFacade m_ResolutionFilter;
-  SLibDAudioInfo m_AudioInfo;            ///< guarded by m_ConnectionLock
-  SLibDPTZControlInfo m_PTZControlInfo;  ///< guarded by m_ConnectionLock
-  SLibDIoBoxInfo m_IoBoxInfo;            ///< guarded by m_ConnectionLock
-  std::string m_LatestErrorText;         ///< written and read through Fail, ClearLatestError and LatestErrorCode
-  bool m_ContinuousPTZ = false;          ///< the camera takes signed continuous speeds; guarded by m_ConnectionLock
-  int m_ChannelId = 0;                   ///< guarded by m_ConnectionLock
-  SLibDConnectionInfo m_ConnectionInfo;  ///< guarded by m_ConnectionLock
+  SLibDCameraInfo m_CameraInfo VEXA_GUARDED_BY(m_ConnectionLock);
+  CResolutionFilterFacade m_ResolutionFilter VEXA_GUARDED_BY(m_ConnectionLock);
+  SLibDAudioInfo m_AudioInfo VEXA_GUARDED_BY(m_ConnectionLock);
+  SLibDPTZControlInfo m_PTZControlInfo VEXA_GUARDED_BY(m_ConnectionLock);
+  SLibDIoBoxInfo m_IoBoxInfo VEXA_GUARDED_BY(m_ConnectionLock);
+  std::string m_LatestErrorText;                                   ///< as vexa::ErrorRecord keeps it
+  bool m_ContinuousPTZ VEXA_GUARDED_BY(m_ConnectionLock) = false;  ///< the camera takes signed continuous speeds
+  int m_ChannelId VEXA_GUARDED_BY(m_ConnectionLock) = 0;
+  SLibDConnectionInfo m_ConnectionInfo VEXA_GUARDED_BY(m_ConnectionLock);
   ELibDReturnCode m_LatestErrorCode = LIBD_FAILED;
-
   // What the model class says of the camera
   bool m_FixedCameraInfoAvailable = false;
   bool m_FixedPTZControlInfoAvailable = false;
@@ -436,11 +313,10 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   std::uint32_t m_CameraType = 0;               ///< bit set asked by GetCameraType
   std::vector<SLibDZoomRatioInt> m_ZoomRatios;  ///< ascending by position
   SLibDFixedIoBoxInfo m_FixedIoBoxInfo;
-
   // The RTSP session
-  int m_SavedTimeout = 0;  ///< milliseconds; what the connection's time-out is put back to
+  int m_SavedTimeout VEXA_GUARDED_BY(m_ConnectionLock) = 0;  ///< milliseconds; put back after a raised time-out
   int m_RtspSocket = -1;
-  int m_StreamSocket = -1;  ///< the media socket: RTP over UDP, or the HTTP image stream
+  int m_StreamSocket VEXA_GUARDED_BY(m_VideoStateLock) = -1;  ///< media: RTP over UDP, or the HTTP image stream
   std::string m_RtspUrl;
   int m_RtspSession = 0;
   int m_RtspCSeq = 0;
@@ -450,33 +326,30 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   int m_RtpClockRate = 0;  ///< ticks a second
   bool m_EdgeStoragePlayback = false;
   int m_PlaybackScale = 1;
-  bool m_NoTearDown = false;  ///< guarded by m_VideoStateLock
+  bool m_NoTearDown VEXA_GUARDED_BY(m_VideoStateLock) = false;
   int m_KeepAlivePeriod = 1;  ///< seconds
   std::time_t m_LastKeepAliveTime = 0;
   bool m_FirstPlaybackFrame = false;
   std::uint32_t m_PlaybackBaseTimestamp = 0;
   std::string m_EdgeStorageCodec;  ///< of the playback under way
 
-  SLibDEdgeStorageMode m_EdgeStorageMode;  ///< as last sent; guarded by m_ConnectionLock
-
+  SLibDEdgeStorageMode m_EdgeStorageMode VEXA_GUARDED_BY(m_ConnectionLock);  ///< as last sent
   // RTP packets: the streaming thread's
   std::vector<SPacketInfo> m_RtpPackets;       ///< sorted; the data lie in m_RtpPacketBuffer
   unsigned char* m_RtpPacketBuffer = nullptr;  ///< 2097152 bytes from malloc while RTP streams
-
   // The bytes of an elementary HTTP stream: the streaming thread's
   unsigned char* m_StreamBuffer = nullptr;
   std::size_t m_StreamBufferSize = 0;
   unsigned char* m_StreamFrameStart = nullptr;  ///< first byte of the frame not handed out yet
   unsigned char* m_StreamSearchPos = nullptr;   ///< where the next start code is looked for
   unsigned char* m_StreamWriteEnd = nullptr;    ///< end of the bytes received
-
   // The streaming thread and the frame queue
   CSimpleLock m_VideoStateLock;
   bool m_StopVideoRequested VEXA_GUARDED_BY(m_VideoStateLock) = false;
   CSimpleLock m_FrameQueueLock;
   std::deque<VideoFrameInfo> m_FrameQueue VEXA_GUARDED_BY(m_FrameQueueLock);
   bool m_VideoTimedOut VEXA_GUARDED_BY(m_FrameQueueLock) = false;
-  bool m_LargeFrameBuffers = false;  ///< guarded by m_FrameQueueLock while a thread runs
+  bool m_LargeFrameBuffers VEXA_GUARDED_BY(m_FrameQueueLock) = false;
   unsigned char* m_StagingBuffer = nullptr;
   std::size_t m_StagingBufferSize = 0;
   std::time_t m_LastFrameTime = 0;
@@ -486,7 +359,6 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   bool m_RtpLiveMode = false;
   CSimpleLock m_CamPosLock;
   std::string m_CamPosText VEXA_GUARDED_BY(m_CamPosLock);
-
   // The polled streams and the cached camera inquiry
   CSimpleLock m_CameraInquiryLock;
   std::string m_CameraInquiryCache VEXA_GUARDED_BY(m_CameraInquiryLock);
@@ -504,23 +376,10 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
 
   std::map<std::string, int> m_InquirySizes;  ///< answer buffer in bytes by inquiry name
   CFileLogger m_CGILogger;
-  char m_CGILogPath[1024] = {};  ///< guarded by m_ConnectionLock
+  char m_CGILogPath[1024] VEXA_GUARDED_BY(m_ConnectionLock) = {};
   CSimpleLock m_ConnectionLock;
   std::atomic<bool> m_CGILogEnabled{false};
 
-  // device/vexa_common.cpp
-  int Fail(const vexa::Failure& failure);
-  int FailSystem();
-  int FailSystem(int error);
-  /// Records that memory does not hold what an operation needs; LIBD_FAILED.
-  ELibDReturnCode FailMemory();
-  /// Records a wait that did not answer 1; -1.
-  int FailWait(int answer, const vexa::Failure& expired);
-  void ClearLatestError();
-  ELibDReturnCode LatestErrorCode();
-  std::string LatestErrorText();
-  SLibDConnectionInfo ConnectionInfo();
-  int ConnectionTimeout();
-
-  std::unique_ptr<vexa::DriverState> m_State;  ///< the rest of its state
+  friend struct vexa::DriverState;
+  std::unique_ptr<vexa::DriverState> m_State;  ///< the rest of its state, and the steps that members share
 };

@@ -4,7 +4,6 @@
 
 #include "media/assembly/camera_position.h"
 #include "media/assembly/start_code.h"
-#include "vexa/video_info.h"
 
 namespace vexa {
 namespace {
@@ -46,16 +45,9 @@ UnitKind ElementaryCodec::kind_of(Bytes unit) const {
 
 Bytes ElementaryCodec::text_of(Bytes unit) const { return unit.subspan(std::min(text_offset, unit.size())); }
 
-const ElementaryCodec kH264Elementary = {{find_start_code_h264, kStartCodeLengthH264},
-                                         h264_kind,
-                                         kSeiTextOffset,
-                                         VIDEO_FRAME_H264_KEY,
-                                         VIDEO_FRAME_H264_DELTA};
+const ElementaryCodec kH264Elementary = {{find_start_code_h264, kStartCodeLengthH264}, h264_kind, kSeiTextOffset};
 
-const ElementaryCodec kMpeg4Elementary = {{find_start_code_mpeg4, kStartCodeLengthMpeg4},
-                                          mpeg4_kind,
-                                          kMpeg4UserDataTextOffset,
-                                          VIDEO_FRAME_MPEG4_KEY,
-                                          VIDEO_FRAME_MPEG4_DELTA};
+const ElementaryCodec kMpeg4Elementary = {
+    {find_start_code_mpeg4, kStartCodeLengthMpeg4}, mpeg4_kind, kMpeg4UserDataTextOffset};
 
 }  // namespace vexa

@@ -21,8 +21,6 @@ struct ElementaryCodec {
   StartCode start_code;
   UnitKind (*kind_of_code)(std::uint8_t code);  ///< by the byte behind the start code
   std::size_t text_offset;                      ///< of user data, from the start code
-  std::int32_t key_frame;                       ///< ELibDVideoFrameType values
-  std::int32_t delta_frame;
 
   UnitKind kind_of(Bytes unit) const;
   /// The part of a user-data unit that is text.

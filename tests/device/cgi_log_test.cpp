@@ -40,7 +40,7 @@ class LoggingDriver : public vexa_test::TestDriver {
 
   /// What the host does to open the log; the connection stays as it is.
   void reopen() {
-    SLibDConnectionInfo info = ConnectionInfo();
+    SLibDConnectionInfo info = m_State->connection.copy();
     SetCurrentConnectionInfo(info);
   }
 

@@ -64,13 +64,14 @@ class Settings : public Driver {
   /// Points to where nobody listens and leaves an error that any exchange would clear.
   void expect_no_exchange() {
     use(own_loopback_address(), refusing_port());
-    this->Fail({LIBD_BUFFER_TOO_SMALL, "from before"});
+    this->m_State->errors.record({LIBD_BUFFER_TOO_SMALL, "from before"});
   }
 
   /// True when no exchange began since expect_no_exchange.
-  bool had_no_exchange() {
-    return this->LatestErrorCode() == LIBD_BUFFER_TOO_SMALL && this->LatestErrorText() == "from before";
-  }
+  bool had_no_exchange() { return LatestErrorCode() == LIBD_BUFFER_TOO_SMALL && LatestErrorText() == "from before"; }
+
+  ELibDReturnCode LatestErrorCode() { return this->m_State->errors.code(); }
+  std::string LatestErrorText() { return this->m_State->errors.text(); }
 
   std::string cached_inquiry() {
     const vexa::Guard guard(this->m_CameraInquiryLock);
@@ -97,8 +98,6 @@ class Settings : public Driver {
   using Driver::m_PTZControlInfo;
   using Driver::m_ResolutionFilter;
 
-  using Driver::LatestErrorCode;
-  using Driver::LatestErrorText;
   using Driver::ParseImageMaxSizeFromCameraProperty;
   using Driver::ParseSolidPTZFromCameraProperty;
   using Driver::ParseVideoCapSizeFromCameraProperty;

@@ -208,7 +208,7 @@ TEST(ShortMemory, FailsACommandBeforeTheCameraIsAsked) {
   ELibDReturnCode result = LIBD_OK;
   {
     AllocationFailure failure(0);
-    result = driver.SendCommand("/command/%s", name.c_str());
+    result = driver.camera().send("/command/%s", name.c_str());
     EXPECT_TRUE(failure.happened());
   }
   EXPECT_EQ(result, LIBD_FAILED);

@@ -1,6 +1,7 @@
 // The driver's own operations and its latest error.
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <cerrno>
 #include <thread>
 #include <vector>
@@ -20,8 +21,8 @@ TEST(LatestError, OfAFreshDriverIsEmpty) {
 
 TEST(LatestError, KeepsItsCodeWhenAFailureHasNone) {
   TestDriver driver;
-  EXPECT_EQ(driver.Fail(vexa::kReceiveTimedOut), -1);
-  EXPECT_EQ(driver.Fail(vexa::kUrlTooLong), -1);
+  driver.Fail(vexa::kReceiveTimedOut);
+  driver.Fail(vexa::kUrlTooLong);
   EXPECT_EQ(driver.LatestErrorCode(), LIBD_TIMEOUT);
   EXPECT_EQ(text_of_latest_error(driver), "URL too long");
 }
@@ -34,13 +35,18 @@ TEST(LatestError, KeepsItsTextWhenItsCodeIsCleared) {
   EXPECT_EQ(text_of_latest_error(driver), "Receive timed out");
 }
 
-TEST(LatestError, TellsTheSystemsText) {
+TEST(LatestError, KeepsItsTextWhenAFailureHasNone) {
   TestDriver driver;
+  driver.Fail(vexa::kReceiveTimedOut);
+  driver.Fail(vexa::kNoReason);
+  EXPECT_EQ(driver.latest_error(), "-200 Receive timed out");
+}
+
+TEST(SystemFailure, HasTheSystemsText) {
   errno = ENOENT;
-  EXPECT_EQ(driver.FailSystem(), -1);
-  EXPECT_EQ(text_of_latest_error(driver), "No such file or directory");
-  EXPECT_EQ(driver.FailSystem(ECONNREFUSED), -1);
-  EXPECT_EQ(text_of_latest_error(driver), "Connection refused");
+  EXPECT_EQ(vexa::system_failure().text, "No such file or directory");
+  EXPECT_EQ(vexa::system_failure(ECONNREFUSED).text, "Connection refused");
+  EXPECT_EQ(vexa::system_failure(ECONNREFUSED).code, LIBD_FAILED);
 }
 
 TEST(LatestError, IsWholeWhenSeveralThreadsFailAtOnce) {
@@ -50,7 +56,7 @@ TEST(LatestError, IsWholeWhenSeveralThreadsFailAtOnce) {
   for (int host = 0; host < 4; ++host) {
     hosts.emplace_back([&driver] {
       for (int i = 0; i < 50; ++i) {
-        EXPECT_EQ(driver.SendCommand("/x"), LIBD_FAILED);
+        EXPECT_EQ(driver.camera().send("/x"), LIBD_FAILED);
         EXPECT_EQ(text_of_latest_error(driver), "Connection refused");
         SLibDSystemInfo info;
         driver.GetCommonSystemInfo(info, "ContinuousPanTiltZoomFunc=1&ChannelId=3");
@@ -100,20 +106,24 @@ TEST(SetCameraInfoFromId, GivesTheLatestErrorsCode) {
   EXPECT_EQ(camera.finish(), "");
 }
 
-TEST(LatestError, KeepsEachThreadsCodeOfItsOwnExchange) {
+TEST(LatestError, OfOtherThreadsDoesNotChangeAnOperationsResult) {
+  constexpr int kCalls = 50;
+  Script script;
+  for (int i = 0; i < kCalls; ++i) script.push_back(refusal("/command/camera.cgi?BLComp=on"));
+  ScriptedCamera camera(script);
   TestDriver driver;
-  driver.ClearLatestError();
-  driver.Fail({LIBD_UNAUTHORIZED, "refused"});
-  std::thread([&] {
-    EXPECT_EQ(driver.LatestErrorCode(), LIBD_UNAUTHORIZED) << "a thread without an exchange sees the latest of all";
-    driver.ClearLatestError();
-    EXPECT_EQ(driver.LatestErrorCode(), LIBD_FAILED);
-    driver.Fail({LIBD_TIMEOUT, "silent"});
-    EXPECT_EQ(driver.LatestErrorCode(), LIBD_TIMEOUT);
-  }).join();
-  EXPECT_EQ(driver.LatestErrorCode(), LIBD_UNAUTHORIZED);
-  EXPECT_EQ(driver.m_LatestErrorCode, LIBD_TIMEOUT);
-  EXPECT_EQ(driver.LatestErrorText(), "silent");
+  driver.use(camera.host(), camera.port(), kPatientTimeout);
+  std::atomic<bool> done{false};
+  std::thread other([&] {
+    while (!done) {
+      driver.ClearLatestError();
+      driver.Fail({LIBD_TIMEOUT, "silent"});
+    }
+  });
+  for (int i = 0; i < kCalls; ++i) EXPECT_EQ(driver.SetBackLightCompMode(true), LIBD_UNAUTHORIZED);
+  done = true;
+  other.join();
+  EXPECT_EQ(camera.finish(), "");
 }
 
 TEST(LatestError, OfOneDriverIsNotAnothers) {
@@ -124,14 +134,6 @@ TEST(LatestError, OfOneDriverIsNotAnothers) {
   second.Fail({LIBD_UNAUTHORIZED, "refused"});
   EXPECT_EQ(first.LatestErrorCode(), LIBD_TIMEOUT);
   EXPECT_EQ(second.LatestErrorCode(), LIBD_UNAUTHORIZED);
-}
-
-TEST(LatestError, OfADriverThatIsGoneIsNotThatOfTheNextInItsPlace) {
-  for (int i = 0; i < 3; ++i) {
-    TestDriver driver;
-    EXPECT_EQ(driver.LatestErrorCode(), LIBD_FAILED);
-    driver.Fail({LIBD_TIMEOUT, "silent"});
-  }
 }
 
 }  // namespace

@@ -2,6 +2,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <chrono>
+#include <future>
 #include <string>
 #include <vector>
 
@@ -122,6 +124,42 @@ TEST_F(VideoProperties, AreHandedOutWhole) {
   EXPECT_TRUE(info.flag1 && !info.flag2 && info.flag3 && !info.flag4 && info.flag5 && !info.flag6);
   EXPECT_THAT((std::vector<int>{info.value1, info.value2, info.value3, info.value4, info.value5}),
               ElementsAre(11, 12, 13, 14, 15));
+}
+
+/// A model class whose hook has another thread use what the driver's locks guard.
+class AskingModel : public vexa_test::Settings<CVexaCommon> {
+ public:
+  ELibDReturnCode InitializeFixedVideoParams(ELibDVideoStandard, int, int) override {
+    answers_.push_back(std::async(std::launch::async, [this] {
+      SLibDFixedCameraInfo fixed;
+      GetFixedCameraInfo(fixed);
+      SLibDConnectionInfo connection;
+      GetCurrentConnectionInfo(connection);
+      std::string text;
+      GetLatestErrorText(text);
+    }));
+    if (answers_.back().wait_for(std::chrono::seconds(20)) == std::future_status::ready) ++answered;
+    return LIBD_OK;
+  }
+
+  int answered = 0;
+
+ private:
+  std::vector<std::future<void>> answers_;
+};
+
+TEST(VideoHook, RunsWithNoLockHeld) {
+  vexa_test::ScriptedCamera camera({vexa_test::inquiry("camera", "VideoStd=ntsc&VidCapSize=1280,960")});
+  AskingModel model;
+  model.use(camera.host(), camera.port());
+  SLibDCameraInfo info;
+  EXPECT_EQ(model.GetCameraInfo(info), LIBD_OK);
+  EXPECT_EQ(model.answered, 1);
+  model.SetVideoStandard(LIBD_VIDEO_PAL);
+  model.SetVidCapSize(1280, 720);
+  model.SetSolidPTZState(true);
+  model.SetImageMaxSize(640, 480, LIBD_VIDEO_PAL);
+  EXPECT_EQ(model.answered, 5);
 }
 
 }  // namespace

@@ -68,7 +68,7 @@ TEST_F(FrameQueue, EveryResultHasItsEffectOnTimeOutQueueAndBuffers) {
     EXPECT_EQ(driver_.m_VideoTimedOut, c.timed_out_after) << c.result;
     EXPECT_EQ(driver_.m_FrameQueue.size(), c.queued) << c.result;
     EXPECT_EQ(driver_.m_LargeFrameBuffers, c.large_buffers) << c.result;
-    driver_.ClearFrameQueue();
+    driver_.state().clear_frame_queue();
   }
 }
 
@@ -154,7 +154,7 @@ TEST_F(FrameQueue, AFrameThatFindsNoMemoryInTheQueueIsFreedAsATimeOut) {
     }
     EXPECT_TRUE(failed) << c.type;
     EXPECT_EQ(wait_key_, c.waits_for_key) << c.type;
-    driver_.ClearFrameQueue();
+    driver_.state().clear_frame_queue();
   }
 }
 

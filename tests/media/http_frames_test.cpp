@@ -21,7 +21,7 @@ class HttpDriver : public MediaDriver {
     http_frames_now = 1000;
     state().now = [] { return http_frames_now; };
     soil_latest_error();
-    EXPECT_TRUE(ResetStreamBuffer());
+    EXPECT_TRUE(state().reset_stream_buffer());
   }
   ~HttpDriver() override { m_StreamSocket = -1; }
 
@@ -44,8 +44,6 @@ class HttpDriver : public MediaDriver {
   using CVexaCommon::GetCurrentMPEGFrameData;
   using CVexaCommon::m_StreamBuffer;
   using CVexaCommon::m_StreamBufferSize;
-  using CVexaCommon::ReleaseStreamBuffer;
-  using CVexaCommon::ResetStreamBuffer;
 };
 
 class HttpFrames : public testing::Test {
@@ -170,7 +168,7 @@ TEST_F(HttpFrames, OfElementaryStreamsEndWithThePicture) {
        VIDEO_FRAME_MPEG4_KEY},
   };
   for (const ElementaryCase& c : cases) {
-    ASSERT_TRUE(driver_.ResetStreamBuffer());
+    ASSERT_TRUE(driver_.state().reset_stream_buffer());
     pair_.left();
     pair_.say(c.stream + c.stream.substr(0, 5) + "beginning of the next");
     driver_.m_LastFrameTime = 0;
@@ -212,7 +210,7 @@ TEST_F(HttpFrames, TakeTheCamerasPositionFromUserData) {
                {"MPEG4", vop(0xb2, std::string(249, 'x') + "CamPos: 1"), "before"},
                {"MPEG4", vop(0xb6, "CamPos: in a picture"), "before"}};
   for (const auto& c : cases) {
-    ASSERT_TRUE(driver_.ResetStreamBuffer());
+    ASSERT_TRUE(driver_.state().reset_stream_buffer());
     pair_.left();
     {
       const vexa::Guard guard(driver_.m_CamPosLock);
@@ -292,7 +290,7 @@ TEST_F(HttpFrames, AreTheSameHoweverTheBytesCome) {
 
 TEST_F(HttpFrames, BeginWithWhatStandsBeforeTheFirstStartCode) {
   for (const std::string front : {"x", "xyz", "wxyz"}) {
-    ASSERT_TRUE(driver_.ResetStreamBuffer());
+    ASSERT_TRUE(driver_.state().reset_stream_buffer());
     pair_.left();
     pair_.say(front + kSlice + kSlice);
     EXPECT_EQ(read("H.264"), LIBD_OK);
@@ -312,7 +310,7 @@ TEST_F(HttpFrames, OfAFailingSocketHaveTheSystemsText) {
 TEST(StreamBuffer, HoldsTheLargestFrameAndMore) {
   HttpDriver driver;
   EXPECT_GE(driver.m_StreamBufferSize, 2000000U + 65536U);
-  driver.ReleaseStreamBuffer();
+  driver.state().release_stream_buffer();
   EXPECT_EQ(driver.m_StreamBuffer, nullptr);
   EXPECT_EQ(driver.m_StreamBufferSize, 0U);
 }

@@ -52,7 +52,8 @@ WholeFrames take_from_queue(LiveCamera& camera, MediaDriver& driver) {
 
 /// Without the frame queue, which drops JPEG pictures of a host that is slow for a moment.
 WholeFrames take_from_assembly(LiveCamera& camera, MediaDriver& driver) {
-  EXPECT_TRUE(driver.OpenLiveRtp(1));
+  driver.use(camera->address(), camera->http_port(), 20000);
+  EXPECT_EQ(driver.state().open_live_rtp(1), LIBD_OK);
   driver.use(camera->address(), camera->http_port(), 500);  // of a read: longer than a picture is ever held back
   std::vector<unsigned char> buffer(1200000);
   WholeFrames frames;
@@ -60,7 +61,7 @@ WholeFrames take_from_assembly(LiveCamera& camera, MediaDriver& driver) {
     CVexaCommon::VideoFrameInfo frame;
     frame.data = buffer.data();
     frame.capacity = static_cast<unsigned int>(buffer.size());
-    const ELibDReturnCode code = driver.GetRtpCurrentVideoFrame(driver.StreamCodec(), frame);
+    const ELibDReturnCode code = driver.GetRtpCurrentVideoFrame(driver.state().stream_codec(), frame);
     if (code == LIBD_OK) frames.emplace_back(buffer.begin(), buffer.begin() + frame.length);
     return code;
   };

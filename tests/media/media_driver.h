@@ -77,8 +77,6 @@ class MediaDriver : public TestDriver {
   }
   void use_live_h264() { use_live("H.264"); }
 
-  using CVexaCommon::AllocateRtpPackets;
-  using CVexaCommon::ClearFrameQueue;
   using CVexaCommon::GetRtpCurrentVideoFrame;
   using CVexaCommon::GetRtpCurrentVideoFrameH264;
   using CVexaCommon::GetRtpCurrentVideoFrameJPEG;
@@ -103,7 +101,6 @@ class MediaDriver : public TestDriver {
   using CVexaCommon::m_StreamWaitMs;
   using CVexaCommon::m_VideoStateLock;
   using CVexaCommon::m_VideoTimedOut;
-  using CVexaCommon::OpenLiveRtp;
   using CVexaCommon::ProcessCurrentFrameData;
   using CVexaCommon::PropulateFrameInfoList;
   using CVexaCommon::ReleaseRtpPacketsPtr;
@@ -113,11 +110,7 @@ class MediaDriver : public TestDriver {
   using CVexaCommon::rtp_over_udp_payload_recv_h264;
   using CVexaCommon::rtp_over_udp_recvn;
   using CVexaCommon::RTPJpegToJIF;
-  using CVexaCommon::StampPicture;
-  using CVexaCommon::StartStreamingThread;
-  using CVexaCommon::StreamCodec;
   using CVexaCommon::StreamingThread;
-  using CVexaCommon::TakeCameraPosition;
 
  private:
   std::vector<std::shared_ptr<KeptPace>> paces_;

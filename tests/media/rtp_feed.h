@@ -45,7 +45,7 @@ class RtpFeed : public testing::Test {
     driver_.use("127.0.0.1", 1, 50);
     driver_.state().now = [] { return clock_now; };
     driver_.m_LastFrameTime = clock_now = 1000;
-    EXPECT_TRUE(driver_.AllocateRtpPackets());
+    EXPECT_TRUE(driver_.state().allocate_packets());
     frame_.data = buffer_.data();
     frame_.capacity = static_cast<unsigned int>(buffer_.size());
   }

@@ -42,7 +42,7 @@ TEST_F(RtpFrames, APictureArrivesWithItsTypeAndMovesTheLastFrameTime) {
 TEST_F(RtpFrames, AnIdrSliceAloneIsAFirstPictureInOnePacketAndInMany) {
   const std::vector<Payload> pictures[] = {{{0x65, 0x88}}, {{0x7c, 0x85, 1}, {0x7c, 0x05, 2}, {0x7c, 0x45, 3}}};
   for (const std::vector<Payload>& picture : pictures) {
-    ASSERT_TRUE(driver_.AllocateRtpPackets());
+    ASSERT_TRUE(driver_.state().allocate_packets());
     send_picture(picture);
     EXPECT_EQ(read(), LIBD_OK);
     EXPECT_EQ(frame_.frameType, VIDEO_FRAME_H264_KEY);
@@ -286,7 +286,7 @@ TEST_F(RtpFrames, PlayedBackPicturesCarryTheRecordingsClock) {
       {"then it counts from there", 86304, 1706745600, 290000, 82704, 1706745600},
   };
   for (const StampCase& c : cases) {
-    driver_.StampPicture(frame_, c.timestamp);
+    driver_.state().stamp_picture(frame_, c.timestamp);
     EXPECT_EQ(frame_.seconds, c.seconds) << c.what;
     EXPECT_EQ(frame_.microseconds, c.microseconds) << c.what;
     EXPECT_EQ(driver_.m_PlaybackBaseTimestamp, c.base_after) << c.what;
@@ -298,7 +298,7 @@ TEST_F(RtpFrames, APictureBeforeTheBaseMovesItAfterItsOwnStamp) {
   driver_.m_EdgeStoragePlayback = true;
   driver_.m_PlaybackBaseTimestamp = 90000;
   driver_.m_RangeClockSeconds = 1000;
-  driver_.StampPicture(frame_, 86400);
+  driver_.state().stamp_picture(frame_, 86400);
   // 86400 - 90000 is 4294963696 modulo 2^32: 47721 seconds and 73696 ticks.
   EXPECT_EQ(frame_.seconds, 48721);
   EXPECT_EQ(frame_.microseconds, 818844);
@@ -310,11 +310,11 @@ TEST_F(RtpFrames, APictureBeforeTheBaseMovesItAfterItsOwnStamp) {
 TEST_F(RtpFrames, LivePicturesAndClocksWithoutARateAreStampedZero) {
   driver_.m_RangeClockSeconds = 1000;
   driver_.m_PlaybackBaseTimestamp = 5;
-  driver_.StampPicture(frame_, 86400);
+  driver_.state().stamp_picture(frame_, 86400);
   EXPECT_EQ(frame_.seconds, 0);
   driver_.m_EdgeStoragePlayback = true;
   driver_.m_RtpClockRate = 0;
-  driver_.StampPicture(frame_, 86400);
+  driver_.state().stamp_picture(frame_, 86400);
   EXPECT_EQ(frame_.seconds, 0);
   EXPECT_EQ(frame_.microseconds, 0);
 }

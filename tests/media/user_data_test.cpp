@@ -31,10 +31,10 @@ TEST(GetUserDataFromStream, LeavesTheStoredPositionWhenThereIsNone) {
   EXPECT_EQ(stored_position(driver), "CamPos: 7");
 }
 
-TEST(TakeCameraPosition, SearchesTheWholeData) {
+TEST(StorePosition, SearchesTheWholeData) {
   MediaDriver driver;
   const std::string data = std::string(100000, 'C') + "CamPos: 000100020003aabbcc and what follows";
-  EXPECT_TRUE(driver.TakeCameraPosition(as_data(data), static_cast<unsigned int>(data.size())));
+  EXPECT_TRUE(driver.state().store_position({as_data(data), data.size()}));
   EXPECT_EQ(stored_position(driver), "CamPos: 000100020003aabb");
 }
 

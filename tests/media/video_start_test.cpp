@@ -195,7 +195,7 @@ TEST(VideoStart, SetsAsideAZeroedStagingBufferAndKeepsLargeFramesForJpegAlone) {
     OpenedDriver driver;
     driver.m_LargeFrameBuffers = c.large_before;
     driver.m_StreamWaitMs = 600000;
-    ASSERT_EQ(driver.StartStreamingThread(c.codec), LIBD_OK);
+    ASSERT_EQ(driver.state().start_thread(c.codec), LIBD_OK);
     {
       const vexa::Guard guard(driver.m_FrameQueueLock);
       EXPECT_EQ(driver.m_LargeFrameBuffers, c.large_after) << c.codec;
@@ -235,7 +235,7 @@ TEST(VideoStart, WithoutAThreadFailsWithTheSystemsTextAndClosesTheStream) {
   ELibDReturnCode code = LIBD_OK;
   {
     const AllocationFailure failure(1);  // the staging buffer is had, the thread's record is not
-    code = driver.StartStreamingThread(codec);
+    code = driver.state().start_thread(codec);
     EXPECT_TRUE(failure.happened());
   }
   EXPECT_EQ(code, LIBD_FAILED);

@@ -52,7 +52,7 @@ class InterleavedReader {
       driver_.m_StreamSocket = ends[0];
     }
     assembly_ = ends[1];
-    return driver_.AllocateRtpPackets();
+    return driver_.state().allocate_packets();
   }
 
   /// The next picture; empty when none came.
@@ -92,7 +92,7 @@ inline std::vector<std::string> frames_by(VideoWay way, LiveCamera& camera, std:
     InterleavedReader reader(driver);
     EXPECT_TRUE(reader.open(camera)) << driver.latest_error();
     while (frames.size() < count) {
-      frames.push_back(reader.next(driver.StreamCodec()));
+      frames.push_back(reader.next(driver.state().stream_codec()));
       if (frames.back().empty()) break;
     }
     return frames;

@@ -28,24 +28,29 @@ class TestDriver : public CVexaCommon {
 
   /// The latest error as tests compare it: "CODE TEXT".
   std::string latest_error() { return std::to_string(LatestErrorCode()) + " " + LatestErrorText(); }
+  ELibDReturnCode LatestErrorCode() { return m_State->errors.code(); }
+  std::string LatestErrorText() { return m_State->errors.text(); }
+  void Fail(const vexa::Failure& failure) { m_State->errors.record(failure); }
+  void ClearLatestError() { m_State->errors.clear(); }
 
   /// The latest error as it stands from a failure long before, so that a test sees what a call sets.
   void soil_latest_error() { Fail({LIBD_INVALID_MODE, "from before"}); }
 
   vexa::DriverState& state() { return *m_State; }
+  vexa::CameraLink& camera() { return m_State->camera; }
+  int ConnectionTimeout() { return m_State->connection.timeout(); }
+  /// A media socket as an open makes it: its port.
+  int bind_media_socket() {
+    m_State->set_stream_socket(vexa::make_media_socket().release());
+    const auto port = vexa::bind_media_socket(m_StreamSocket);
+    return port ? *port : -1;
+  }
 
   using CVexaCommon::_ld_is_leap_year;
   using CVexaCommon::_ld_mkgmtime;
   using CVexaCommon::AddUrlEncoding;
   using CVexaCommon::base64Decode;
   using CVexaCommon::base64Encode;
-  using CVexaCommon::BindMediaSocket;
-  using CVexaCommon::ClearLatestError;
-  using CVexaCommon::ConnectionInfo;
-  using CVexaCommon::ConnectionTimeout;
-  using CVexaCommon::Fail;
-  using CVexaCommon::FailSystem;
-  using CVexaCommon::FailWait;
   using CVexaCommon::find_start_code_h264;
   using CVexaCommon::find_start_code_mpeg4;
   using CVexaCommon::GetCommonNetworkInfo;
@@ -58,15 +63,12 @@ class TestDriver : public CVexaCommon {
   using CVexaCommon::http_recvn;
   using CVexaCommon::InitEdgeStorageKeepAlivePeriod;
   using CVexaCommon::KeepAlive;
-  using CVexaCommon::LatestErrorCode;
-  using CVexaCommon::LatestErrorText;
   using CVexaCommon::parse_clock;
   using CVexaCommon::rtp_over_tcp_close;
   using CVexaCommon::rtp_over_tcp_header_recv;
   using CVexaCommon::rtp_over_udp_close;
   using CVexaCommon::rtp_over_udp_open;
   using CVexaCommon::rtp_stream_socket_close_all;
-  using CVexaCommon::SendCommand;
   using CVexaCommon::SendInqCommand;
 
   using CVexaCommon::m_AudioLock;

@@ -309,7 +309,7 @@ TEST(SendCommand, GivesTheLatestErrorsCode) {
   TestDriver driver;
   driver.soil_latest_error();
   driver.use(own_loopback_address(), refusing_port(), 5000);
-  EXPECT_EQ(driver.SendCommand("/command/x.cgi?a=%d", 1), LIBD_FAILED);
+  EXPECT_EQ(driver.camera().send("/command/x.cgi?a=%d", 1), LIBD_FAILED);
   EXPECT_EQ(driver.latest_error(), "0 Connection refused");
 }
 

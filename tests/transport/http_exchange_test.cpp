@@ -18,7 +18,7 @@ TEST_P(HttpExchange, GoesAsWritten) {
   const bool inquires = call.starts_with("inquire ");
   ASSERT_TRUE(inquires || call.starts_with("command ")) << "no such call: " << call;
   const ELibDReturnCode result =
-      inquires ? driver_.SendInqCommand(argument, answer) : driver_.SendCommand("%s", argument.c_str());
+      inquires ? driver_.SendInqCommand(argument, answer) : driver_.camera().send("%s", argument.c_str());
   EXPECT_EQ(camera.finish(), "");
   expect_result("result", std::to_string(result));
   expect_result("answer", answer);

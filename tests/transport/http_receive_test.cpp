@@ -298,18 +298,17 @@ TEST(Base64Encode, EndsItsOutputWithANul) {
   EXPECT_EQ(output[9], '#');
 }
 
-TEST(FailWait, GivesEachEndOfAWaitItsText) {
-  TestDriver driver;
-  driver.ClearLatestError();
+TEST(WaitFailure, GivesEachEndOfAWaitItsText) {
   errno = EINVAL;
-  EXPECT_EQ(driver.FailWait(-1, vexa::kReceiveTimedOut), -1);
-  EXPECT_EQ(driver.LatestErrorText(), "Invalid argument");
-  EXPECT_EQ(driver.FailWait(2, vexa::kReceiveTimedOut), -1);
-  EXPECT_EQ(driver.LatestErrorText(), "Strange status");
-  EXPECT_EQ(driver.LatestErrorCode(), LIBD_FAILED);
-  EXPECT_EQ(driver.FailWait(0, vexa::kConnectTimedOut), -1);
-  EXPECT_EQ(driver.LatestErrorText(), "Connection timed out");
-  EXPECT_EQ(driver.LatestErrorCode(), LIBD_TIMEOUT);
+  const vexa::Failure broken = vexa::wait_failure(-1, vexa::kReceiveTimedOut);
+  EXPECT_EQ(broken.text, "Invalid argument");
+  EXPECT_EQ(broken.code, LIBD_FAILED);
+  const vexa::Failure strange = vexa::wait_failure(2, vexa::kReceiveTimedOut);
+  EXPECT_EQ(strange.text, "Strange status");
+  EXPECT_EQ(strange.code, LIBD_FAILED);
+  const vexa::Failure expired = vexa::wait_failure(0, vexa::kConnectTimedOut);
+  EXPECT_EQ(expired.text, "Connection timed out");
+  EXPECT_EQ(expired.code, LIBD_TIMEOUT);
 }
 
 }  // namespace

@@ -60,7 +60,7 @@ TEST_F(RtspSession, KeepsWhatTheSessionNeeds) {
 }
 
 TEST_F(RtspSession, BindsAMediaSocketToAnyAddress) {
-  const int port = driver_.BindMediaSocket();
+  const int port = driver_.bind_media_socket();
   sockaddr_in address{};
   socklen_t length = sizeof address;
   ASSERT_EQ(getsockname(driver_.m_StreamSocket, reinterpret_cast<sockaddr*>(&address), &length), 0);
@@ -86,7 +86,7 @@ TEST_F(RtspSession, GivesEachSessionAPortOfItsOwn) {
   std::set<int> ports;
   std::set<int> sockets;
   for (std::size_t i = 0; i < kSessions; ++i) {
-    ports.insert(driver_.BindMediaSocket());
+    ports.insert(driver_.bind_media_socket());
     sockets.insert(driver_.m_StreamSocket);
   }
   driver_.m_StreamSocket = -1;
@@ -311,7 +311,7 @@ TEST_F(RtspClose, SendsATooLongTeardownCut) {
 
 TEST_F(RtspClose, SendsNothingWhenTheHostWantsNoTeardown) {
   driver_.m_NoTearDown = true;
-  ASSERT_NE(driver_.BindMediaSocket(), -1);
+  ASSERT_NE(driver_.bind_media_socket(), -1);
   EXPECT_EQ(close(), "");
   EXPECT_EQ(heard(), "");
   EXPECT_EQ(driver_.m_RtspSocket, -1);
@@ -328,7 +328,7 @@ TEST_F(RtspClose, DoesNothingWhenBothSocketsAreClosed) {
 
 TEST_F(RtspClose, WithoutAControlSocketFailsAtOnceAndClosesTheMediaSocket) {
   driver_.rtp_stream_socket_close_all();
-  ASSERT_NE(driver_.BindMediaSocket(), -1);
+  ASSERT_NE(driver_.bind_media_socket(), -1);
   EXPECT_EQ(close(), "send <TEARDOWN rtsp://camera/ RTSP/1.0\r\nCSeq: 4\r\nSession: 7\r\n\r\n\r\n>\n");
   EXPECT_EQ(driver_.latest_error(), "0 Bad file descriptor");
   EXPECT_EQ(driver_.m_StreamSocket, -1);
@@ -338,7 +338,7 @@ TEST_F(RtspClose, WaitsFifteenSecondsForTheAnswer) { EXPECT_EQ(driver_.state().t
 
 TEST_F(RtspClose, OfASilentCameraTimesOutAndClosesBothSockets) {
   driver_.state().teardown_timeout = 1000;
-  ASSERT_NE(driver_.BindMediaSocket(), -1);
+  ASSERT_NE(driver_.bind_media_socket(), -1);
   close();
   EXPECT_EQ(driver_.latest_error(), "-200 Receive timed out");
   EXPECT_EQ(driver_.m_RtspSocket, -1);

@@ -52,18 +52,5 @@ TEST(MetadataFrame, IsReadAtEveryLength) {
   }
 }
 
-TEST(MetadataSilence, BeginsBehindTheTimeOutWithoutGrace) {
-  const struct {
-    std::time_t now;
-    int timeout;
-    bool silent;
-  } rows[] = {{100, 0, false},          {101, 0, true},      {101, 999, true},   {101, 1000, false},
-              {102, 1999, true},        {110, 10000, false}, {111, 10000, true}, {105, 10000, false},
-              {INT_MAX, INT_MAX, true}, {99, 0, false},      {100, -1, true}};
-  for (const auto& row : rows) {
-    EXPECT_EQ(metadata_stream_is_silent(row.now, 100, row.timeout), row.silent) << row.now << ' ' << row.timeout;
-  }
-}
-
 }  // namespace
 }  // namespace vexa

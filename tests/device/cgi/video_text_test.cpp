@@ -50,10 +50,10 @@ struct CodecRow {
 class CodecWords : public testing::TestWithParam<CodecRow> {};
 
 TEST_P(CodecWords, NameTheFirstEncodersCodec) {
-  const vexa::VideoCodec* codec = vexa::video_codec_of(GetParam().word);
+  const vexa::Codec* codec = vexa::video_codec_of(GetParam().word);
   ASSERT_NE(codec, nullptr);
   EXPECT_STREQ(codec->name, GetParam().name);
-  EXPECT_EQ(codec->codecType, GetParam().type);
+  EXPECT_EQ(static_cast<int>(codec->kind), GetParam().type);
 }
 
 INSTANTIATE_TEST_SUITE_P(Rows, CodecWords,

@@ -1,4 +1,4 @@
-#include "transport/wire/input_part.h"
+#include "device/cgi/input_part.h"
 
 #include <gtest/gtest.h>
 
@@ -21,7 +21,7 @@ struct PartCase {
 
 void expect_all(std::initializer_list<PartCase> cases) {
   for (const PartCase& c : cases) {
-    const InputBits bits = parse_input_part(c.part, c.motion);
+    const PinMasks bits = parse_input_part(c.part, c.motion);
     EXPECT_EQ(bits.present, c.present) << c.part;
     EXPECT_EQ(bits.state, c.state) << c.part;
   }
@@ -142,7 +142,7 @@ TEST(InputPart, IsReadAtEveryLength) {
   const std::string part = "Sensor1=1&Sensor2=0&OdWin1=1&MdWin1=1&VMF=1&Tampering=1&Audio=1";
   for (const MotionReport motion : {kOdWindows, kMdWindows, kFlag, kFlagOnBit0}) {
     for (std::size_t length = 0; length <= part.size(); ++length) {
-      const InputBits bits = parse_input_part(part.substr(0, length), motion);
+      const PinMasks bits = parse_input_part(part.substr(0, length), motion);
       EXPECT_EQ(bits.state & ~bits.present, 0U) << length;
     }
   }

@@ -1,0 +1,77 @@
+#include "device/camera_link.h"
+
+#include <cstdarg>
+#include <utility>
+
+#include "runtime/base/text.h"
+#include "transport/failure.h"
+#include "transport/wire/http_request.h"
+#include "vexa/real_time.h"
+
+namespace vexa {
+
+RaisedTimeout::RaisedTimeout(int& timeout, int& saved, CSimpleLock& lock, int milliseconds)
+    : lock_(lock), timeout_(timeout), restored_([&] {
+        const Guard guard(lock);
+        timeout = milliseconds;
+        return saved;
+      }()) {}
+
+RaisedTimeout::~RaisedTimeout() {
+  const Guard guard(lock_);
+  timeout_ = restored_;
+}
+
+SLibDConnectionInfo Connection::copy() {
+  const Guard guard(lock_);
+  return info_;
+}
+
+int Connection::timeout() {
+  const Guard guard(lock_);
+  return info_.timeout;
+}
+
+RaisedTimeout Connection::raised(int milliseconds) {
+  const Guard guard(lock_);
+  return {info_.timeout, saved_timeout_, lock_, milliseconds};
+}
+
+// A line begins with its line break, so that the file ends without one.
+void CgiLog::write(const char* direction, const char* message) {
+  std::string line = CRealTime::GetTheCurrentTime().Format("\r\n%D-%O-%Y\t%H:%M:%S.%03L\t", false);
+  line.append("CGI\t").append(direction).append("\t").append(message);
+  file_.Log(line.c_str());
+}
+
+Result<Socket> CameraLink::open(const std::string& path) {
+  errors_.clear();
+  return open_http({connection_.copy(), log_}, path);
+}
+
+ELibDReturnCode CameraLink::send(const char* format, ...) {
+  va_list arguments;
+  va_start(arguments, format);
+  const ELibDReturnCode sent = errors_.run([&]() -> Outcome {
+    auto socket = open(vformat_within(kRequestRoom, format, arguments).text);
+    if (!socket) return socket.failure();
+    shutdown_and_close(socket->release());
+    return LIBD_OK;
+  });
+  va_end(arguments);
+  return sent;
+}
+
+ELibDReturnCode CameraLink::inquire(const std::string& name, std::string& answer) {
+  errors_.clear();
+  return errors_.run([&]() -> Outcome {
+    const auto size = inquiry_sizes_.find(name);
+    if (size == inquiry_sizes_.end()) return LIBD_FAILED;
+    auto received = vexa::inquire({connection_.copy(), log_}, name, size->second);
+    if (!received) return received.failure();
+    answer = std::move(*received);
+    return LIBD_OK;
+  });
+}
+
+}  // namespace vexa

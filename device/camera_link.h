@@ -1,0 +1,86 @@
+// How the members reach the camera: the shared connection settings, the CGI log, one request at a time.
+#pragma once
+
+#include <atomic>
+#include <map>
+#include <string>
+
+#include "device/error_record.h"
+#include "runtime/base/sync.h"
+#include "transport/http_exchange.h"
+#include "vexa/file_logger.h"
+#include "vexa/system_info.h"
+
+namespace vexa {
+
+/// A longer time-out of the connection for as long as a slow request takes; the saved one is put back at its end.
+///
+/// Kept: it stands in the shared settings, so requests of other threads have it too meanwhile; of two that overlap, the
+/// first to end puts the saved time-out back for both.
+class RaisedTimeout {
+ public:
+  RaisedTimeout(int& timeout, int& saved, CSimpleLock& lock, int milliseconds);
+  ~RaisedTimeout();
+  RaisedTimeout(const RaisedTimeout&) = delete;
+  RaisedTimeout& operator=(const RaisedTimeout&) = delete;
+
+ private:
+  CSimpleLock& lock_;
+  int& timeout_ VEXA_GUARDED_BY(lock_);
+  const int restored_;
+};
+
+/// The connection settings, which are fields of the driver. Any thread.
+class Connection {
+ public:
+  Connection(SLibDConnectionInfo& info, int& saved_timeout, CSimpleLock& lock)
+      : lock_(lock), info_(info), saved_timeout_(saved_timeout) {}
+
+  SLibDConnectionInfo copy();
+  int timeout();
+  /// The time-out is `milliseconds` for the life of what this returns.
+  RaisedTimeout raised(int milliseconds) VEXA_EXCLUDES(lock_);
+
+ private:
+  CSimpleLock& lock_;
+  SLibDConnectionInfo& info_ VEXA_GUARDED_BY(lock_);
+  int& saved_timeout_ VEXA_GUARDED_BY(lock_);
+};
+
+/// Writes the CGI log while it is switched on. Any thread.
+class CgiLog final : public ExchangeLog {
+ public:
+  CgiLog(CFileLogger& file, const std::atomic<bool>& enabled) : file_(file), enabled_(enabled) {}
+
+  bool is_on() const override { return enabled_; }
+  void write(const char* direction, const char* message) override;
+
+ private:
+  CFileLogger& file_;
+  const std::atomic<bool>& enabled_;
+};
+
+/// Sends requests and inquiries, and records why one failed. Any thread; each blocks for the connection's time-out at
+/// most twice.
+class CameraLink {
+ public:
+  CameraLink(Connection& connection, CgiLog& log, ErrorRecord& errors, const std::map<std::string, int>& inquiry_sizes)
+      : connection_(connection), log_(log), errors_(errors), inquiry_sizes_(inquiry_sizes) {}
+
+  /// Requests a path; a new exchange begins. Not recorded: the member that asks does.
+  Result<Socket> open(const std::string& path);
+
+  /// One request whose answer is not read: LIBD_OK, or the code of its own failure.
+  ELibDReturnCode send(const char* format, ...) __attribute__((format(printf, 2, 3)));
+
+  /// One inquiry; a failure leaves `answer`. An inquiry that is not known is LIBD_FAILED, and nothing is sent.
+  ELibDReturnCode inquire(const std::string& name, std::string& answer);
+
+ private:
+  Connection& connection_;
+  CgiLog& log_;
+  ErrorRecord& errors_;
+  const std::map<std::string, int>& inquiry_sizes_;
+};
+
+}  // namespace vexa

@@ -1,0 +1,123 @@
+// Frames from the camera's HTTP image stream.
+#include <sys/time.h>
+
+#include <new>
+#include <utility>
+
+#include "device/driver_state.h"
+#include "media/elementary_reader.h"
+#include "transport/failure.h"
+#include "transport/http_stream.h"
+
+namespace {
+
+/// Twice the largest frame and more, so that a frame under work is seldom moved.
+constexpr std::size_t kStreamBuffer = std::size_t{4} << 20;
+
+void stamp_now(CVexaCommon::VideoFrameInfo& frame) {
+  timeval now{};
+  gettimeofday(&now, nullptr);
+  frame.seconds = static_cast<std::int32_t>(now.tv_sec);
+  frame.microseconds = static_cast<std::int32_t>(now.tv_usec);
+}
+
+}  // namespace
+
+ELibDReturnCode CVexaCommon::GetCurrentFrameData(VideoFrameInfo& frame) {
+  if (m_State->stream_socket() == -1) return LIBD_FAILED;
+  const vexa::Codec* codec = vexa::codec_named(m_State->stream_codec());
+  if (codec == nullptr) return LIBD_FAILED;
+  int received = 0;
+  switch (codec->kind) {
+    case vexa::CodecKind::kJpeg:
+      return GetCurrentJPEGFrameData(frame, received);
+    case vexa::CodecKind::kMpeg4:
+      return GetCurrentMPEGFrameData(frame, received);
+    case vexa::CodecKind::kH264:
+      return GetCurrentH264FrameData(frame, received);
+  }
+  return LIBD_FAILED;
+}
+
+ELibDReturnCode CVexaCommon::GetCurrentJPEGFrameData(VideoFrameInfo& frame, int& received) {
+  frame.frameType = VIDEO_FRAME_JPEG;
+  m_State->errors.clear();
+  received = -1;
+  const auto part = vexa::receive_picture_part(
+      m_State->stream_socket(), {reinterpret_cast<char*>(frame.data), frame.capacity}, m_State->connection.timeout());
+  if (!part) {
+    m_State->errors.record(part.failure());
+    return part.failure().code;
+  }
+  if (part->kind == vexa::PicturePart::Kind::kTooLarge) {
+    m_State->errors.record({LIBD_BUFFER_TOO_SMALL, vexa::kBufferTooSmall.text});
+    m_LastFrameTime = m_State->now();
+    return LIBD_BUFFER_TOO_SMALL;
+  }
+  received = part->length;
+  if (received == 0) return m_State->nothing_yet();
+  frame.length = static_cast<unsigned int>(received);
+  m_State->store_position({frame.data, frame.length});
+  m_LastFrameTime = m_State->now();
+  return LIBD_OK;
+}
+
+ELibDReturnCode CVexaCommon::GetCurrentH264FrameData(VideoFrameInfo& frame, int& received) {
+  return m_State->read_elementary_frame(frame, vexa::kH264Codec, received);
+}
+
+ELibDReturnCode CVexaCommon::GetCurrentMPEGFrameData(VideoFrameInfo& frame, int& received) {
+  return m_State->read_elementary_frame(frame, vexa::kMpeg4Codec, received);
+}
+
+namespace vexa {
+
+bool DriverState::reset_stream_buffer() {
+  if (driver.m_StreamBuffer == nullptr) driver.m_StreamBuffer = new (std::nothrow) unsigned char[kStreamBuffer];
+  driver.m_StreamBufferSize = driver.m_StreamBuffer == nullptr ? 0 : kStreamBuffer;
+  driver.m_StreamFrameStart = driver.m_StreamSearchPos = driver.m_StreamWriteEnd = driver.m_StreamBuffer;
+  return driver.m_StreamBuffer != nullptr;
+}
+
+void DriverState::release_stream_buffer() {
+  delete[] std::exchange(driver.m_StreamBuffer, nullptr);
+  driver.m_StreamBufferSize = 0;
+  driver.m_StreamFrameStart = driver.m_StreamSearchPos = driver.m_StreamWriteEnd = nullptr;
+}
+
+StreamWindow DriverState::stream_window() {
+  return {{driver.m_StreamBuffer, driver.m_StreamBufferSize},
+          {driver.m_StreamFrameStart, driver.m_StreamSearchPos, driver.m_StreamWriteEnd}};
+}
+
+// Kept: units in front of a picture are lost when the stream falls silent after them; the next read begins anew.
+ELibDReturnCode DriverState::read_elementary_frame(CVexaCommon::VideoFrameInfo& frame, const Codec& codec,
+                                                   int& received) {
+  frame.frameType = VIDEO_FRAME_INVALID;
+  frame.length = 0;
+  errors.clear();
+  StreamWindow window = stream_window();
+  const StoppableSocket source = stream_source();
+  const auto user_data = [this](Bytes text) {
+    driver.GetUserDataFromStream(text.data(), static_cast<unsigned int>(text.size()));
+  };
+  while (frame.length < frame.capacity) {
+    const auto unit = read_unit(source, window, codec, {{frame.data, frame.capacity}, frame.length, frame.frameType},
+                                connection.timeout(), user_data);
+    received = unit ? unit->length : -1;
+    if (!unit) {
+      errors.record(unit.failure());
+      return unit.failure().code;
+    }
+    if (unit->kind == UnitRead::Kind::kSilence) return nothing_yet();
+    if (unit->kind == UnitRead::Kind::kPicture) {
+      stamp_now(frame);
+      driver.m_LastFrameTime = now();
+      return LIBD_OK;
+    }
+    if (nothing_yet() == LIBD_TIMEOUT) return LIBD_TIMEOUT;
+  }
+  return LIBD_FAILED;
+}
+
+}  // namespace vexa

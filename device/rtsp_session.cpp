@@ -1,0 +1,207 @@
+// The RTSP members: opening a session, keeping it alive, closing it, reading packets.
+#include "transport/rtsp_session.h"
+
+#include <algorithm>
+#include <cstdarg>
+#include <cstring>
+#include <utility>
+#include <vector>
+
+#include "device/driver_state.h"
+#include "runtime/base/base64.h"
+#include "transport/failure.h"
+#include "transport/interleaved_stream.h"
+#include "transport/rtp_socket.h"
+#include "transport/wire/http_request.h"
+#include "transport/wire/keep_alive_schedule.h"
+
+namespace vexa {
+
+RtspSession DriverState::session() {
+  return RtspSession({driver.m_RtspCSeq, driver.m_BasicCredentials, driver.m_RtspUrl, driver.m_RtspSession});
+}
+
+StreamClock DriverState::stream_clock() {
+  return {driver.m_RangeClockSeconds, driver.m_RangeClockMicros, driver.m_RtpClockRate};
+}
+
+// Kept: the media socket stays open when the open fails after it; its caller finds out by it how far the open came.
+Result<int> DriverState::open_rtp_over_udp(const std::string& url, int port) {
+  errors.clear();
+  const SLibDConnectionInfo info = connection.copy();
+  RtspSession session = this->session();
+  auto server = session.begin(info.host, port, info.timeout);
+  if (!server) return server.failure();
+  set_stream_socket(make_media_socket().release());
+  const int media = stream_socket();
+  if (media == -1) return system_failure();
+  const auto media_port = bind_media_socket(media);
+  if (!media_port) return media_port;
+  const int scale = driver.m_EdgeStoragePlayback ? driver.m_PlaybackScale : 1;
+  const auto number = session.open(*server, {info, url, scale, *media_port, stream_clock()});
+  if (!number) return number;
+  // Kept: the time of the last keep-alive is not reset; a new session's first one waits for the rest of the interval.
+  driver.m_RtspUrl = url;
+  driver.m_RtspSession = *number;
+  return server->socket.release();
+}
+
+Result<int> DriverState::open_rtp_over_tcp(const std::string& url, int port) {
+  errors.clear();
+  const SLibDConnectionInfo info = connection.copy();
+  RtspSession session = this->session();
+  auto server = session.begin(info.host, port, info.timeout);
+  if (!server) return server.failure();
+  const int scale = driver.m_EdgeStoragePlayback ? driver.m_PlaybackScale : 1;
+  const auto number = session.open(*server, {info, url, scale, kInterleaved, stream_clock()});
+  if (!number) return number;
+  set_stream_socket(server->socket.get());
+  return server->socket.release();
+}
+
+}  // namespace vexa
+
+int CVexaCommon::rtp_over_udp_open(const char* format, ...) {
+  va_list arguments;
+  va_start(arguments, format);
+  const int opened = m_State->errors.run([&] {
+    const std::string url = vexa::vformat_within(vexa::kRequestRoom, format, arguments).text;
+    return m_State->open_rtp_over_udp(url, m_State->rtsp_port());
+  });
+  va_end(arguments);
+  return opened;
+}
+
+// For model classes whose cameras send RTP inside the connection; the driver's own streams come over UDP.
+int CVexaCommon::rtp_over_tcp_open(const char* format, ...) {
+  va_list arguments;
+  va_start(arguments, format);
+  const int opened = m_State->errors.run([&] {
+    const std::string url = vexa::vformat_within(vexa::kRequestRoom, format, arguments).text;
+    return m_State->open_rtp_over_tcp(url, m_State->rtsp_port());
+  });
+  va_end(arguments);
+  return opened;
+}
+
+int CVexaCommon::rtp_over_tcp_header_recv(int socket, char* buffer, int size, int timeout) {
+  m_State->errors.clear();
+  return m_State->errors.run([&] { return vexa::receive_rtsp_answer(socket, vexa::room_of(buffer, size), timeout); });
+}
+
+bool CVexaCommon::parse_clock(const char* text) {
+  return text != nullptr && vexa::take_range_clock(text, m_State->stream_clock());
+}
+
+void CVexaCommon::KeepAlive() {
+  // Kept: only 0 stops it. A closed session, -1, goes on: its send fails harmlessly and shows in the trace.
+  if (m_RtspSocket == 0) return;
+  const std::time_t now = m_State->now();
+  if (!vexa::keep_alive_due(now, m_LastKeepAliveTime, vexa::keep_alive_interval(m_KeepAlivePeriod))) return;
+  m_LastKeepAliveTime = now;
+  m_State->errors.clear();
+  m_State->errors.run([&]() -> vexa::Outcome {
+    const auto kept = m_State->session().keep_alive(m_RtspSocket);
+    if (!kept) return kept.failure();
+    return LIBD_OK;
+  });
+}
+
+bool CVexaCommon::InitEdgeStorageKeepAlivePeriod() {
+  if (m_State->camera.send("/command/camera.cgi?RTSPTimeout=60") != LIBD_OK) return false;
+  if (m_State->camera.send("/command/edgestorage.cgi?EsRTSPRec1Timeout=60") != LIBD_OK) return false;
+  return m_State->errors.run([&]() -> vexa::Result<bool> {
+    std::string answer;
+    if (m_State->camera.inquire("edgestorage", answer) != LIBD_OK) return false;
+    int period = 0;
+    if (GetUrlParameter(answer, "EsRTSPRec1Timeout=", period) && period != 0) m_KeepAlivePeriod = period;
+    return true;
+  });
+}
+
+void CVexaCommon::rtp_over_udp_close() {
+  if (m_RtspSocket == -1 && m_State->stream_socket() == -1) return;
+  // Kept: the switch that recordings are played with holds for live sessions too.
+  if (m_State->wants_teardown()) {
+    m_State->errors.clear();
+    m_State->errors.run([&]() -> vexa::Outcome {
+      const auto ended = m_State->session().tear_down(m_RtspSocket, m_State->teardown_timeout);
+      if (!ended) return ended.failure();
+      return LIBD_OK;
+    });
+  }
+  rtp_stream_socket_close_all();
+}
+
+void CVexaCommon::rtp_over_tcp_close(int socket) { vexa::shutdown_and_close(socket); }
+
+void CVexaCommon::rtp_stream_socket_close_all() {
+  vexa::shutdown_and_close(std::exchange(m_RtspSocket, -1));
+  vexa::shutdown_and_close(m_State->stream_socket());
+  m_State->set_stream_socket(-1);
+}
+
+unsigned char* CVexaCommon::base64Decode(const char* text, unsigned int& size, bool trim) {
+  std::vector<unsigned char> bytes = vexa::base64_decode(text == nullptr ? "" : text);
+  while (trim && !bytes.empty() && bytes.back() == 0) bytes.pop_back();
+  size = static_cast<unsigned int>(bytes.size());
+  auto* copy = new unsigned char[bytes.size()];
+  std::copy(bytes.begin(), bytes.end(), copy);
+  return copy;
+}
+
+int CVexaCommon::rtp_over_tcp_recvn(int socket, char* buffer, int length, int timeout) {
+  m_State->errors.clear();
+  return m_State->errors.run([&]() -> vexa::Result<int> {
+    const auto read = vexa::receive_exactly(socket, vexa::room_of(buffer, length), timeout);
+    if (!read) return read.failure();
+    return 0;
+  });
+}
+
+int CVexaCommon::rtp_over_tcp_payload_recv(int socket, char* buffer, int size, bool* marker, unsigned char* payloadType,
+                                           int timeout, unsigned int* timestamp) {
+  m_State->errors.clear();
+  return m_State->errors.run([&]() -> vexa::Result<int> {
+    const auto packet = vexa::receive_interleaved(socket, vexa::room_of(buffer, size), timeout);
+    if (!packet) return packet.failure();
+    if (!*packet) return 0;
+    const vexa::RtpHeader& header = (*packet)->header;
+    if (marker != nullptr) *marker = header.marker;
+    if (payloadType != nullptr) *payloadType = header.payload_type;
+    if (timestamp != nullptr) *timestamp = header.timestamp;
+    return (*packet)->length;
+  });
+}
+
+int CVexaCommon::rtp_over_udp_recvn(int socket, char* buffer, int length, int timeout) {
+  return m_State->errors.run([&] {
+    return vexa::receive_datagram({socket, m_State->stream_source().stop}, vexa::room_of(buffer, length), timeout, {});
+  });
+}
+
+int CVexaCommon::rtp_over_udp_payload_recv(int socket, char* buffer, int size, int timeout, SPacketInfo& packet) {
+  m_State->errors.clear();
+  return m_State->errors.run([&] {
+    return vexa::receive_packet({socket, m_State->stream_source().stop}, vexa::room_of(buffer, size), timeout, {},
+                                packet);
+  });
+}
+
+int CVexaCommon::rtp_over_udp_payload_recv_h264(int socket, char* buffer, int size, int timeout, SPacketInfo& packet) {
+  return rtp_over_udp_payload_recv(socket, buffer, size, timeout, packet);
+}
+
+int CVexaCommon::rtp_over_udp_payload_recv(int socket, char* buffer, int size, bool* marker, unsigned char* payloadType,
+                                           int timeout, unsigned int* timestamp, unsigned short* sequence) {
+  SPacketInfo packet;
+  const int length = rtp_over_udp_payload_recv(socket, buffer, size, timeout, packet);
+  if (length < static_cast<int>(vexa::kRtpHeaderSize)) return length;
+  if (marker != nullptr) *marker = packet.marker;
+  if (payloadType != nullptr) *payloadType = packet.payloadType;
+  if (timestamp != nullptr) *timestamp = packet.timestamp;
+  if (sequence != nullptr) *sequence = packet.sequence;
+  const int payload = length - static_cast<int>(vexa::kRtpHeaderSize);
+  std::memmove(buffer, buffer + vexa::kRtpHeaderSize, static_cast<std::size_t>(payload));
+  return payload;
+}

@@ -1,0 +1,71 @@
+#include "media/picture_reader.h"
+
+#include <algorithm>
+#include <chrono>
+#include <utility>
+
+#include "runtime/base/deadline.h"
+#include "transport/rtp_socket.h"
+#include "transport/wait_budget.h"
+#include "transport/wire/rtp_header.h"
+
+namespace vexa {
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+/// What has arrived is read for at least as long, whatever the time-out.
+constexpr std::chrono::milliseconds kLeastReading{100};
+
+}  // namespace
+
+Result<std::optional<PacketRunPlace>> PictureReader::next() {
+  const auto give_up = Clock::now() + std::max(std::chrono::milliseconds(source_.timeout), kLeastReading);
+  for (;;) {
+    const auto now = Clock::now();
+    if (const auto place = rtp_.collector.next_picture(now)) return place;
+    // Packets that never make a picture must not keep the thread from its keep-alive and its stop.
+    if (now > give_up || source_.is_stopped()) return std::optional<PacketRunPlace>();
+    const auto deadline = rtp_.collector.deadline();
+    const int until_look = deadline ? milliseconds_until(*deadline) : source_.timeout;
+    // A look at what stands complete falls due before the read would time out: that is no silence of the camera's.
+    if (until_look < source_.timeout && !packet_waits(until_look)) continue;
+    if (const auto received = receive(source_.timeout); !received) return received.failure();
+  }
+}
+
+// Kept: a picture whose first packet is too long is reported damaged while it stays listed, and is taken out when it is
+// met again, one read later.
+Result<std::optional<PacketRunPlace>> PictureReader::next_jpeg() {
+  const auto refused = std::exchange(rtp_.refused, std::nullopt);
+  if (refused) (void)receive(0);
+  auto place = next();
+  if (!place || !*place || !refused) return place;
+  if (name_of(rtp_.collector.packets(**place).front()) != *refused) return place;
+  rtp_.collector.abandon(**place);
+  return next();
+}
+
+// Also true when the read would fail at once.
+bool PictureReader::packet_waits(int timeout) const {
+  return WaitBudget(timeout).wait_readable_unless(source_.socket.socket, source_.socket.stop) != 0;
+}
+
+Result<int> PictureReader::receive(int timeout) {
+  if (rtp_.collector.is_empty()) rtp_.ring.restart();
+  auto* place = reinterpret_cast<char*>(source_.buffer + rtp_.ring.next_offset());
+  SPacketInfo packet;
+  const auto length = receive_packet(source_.socket, {place, PacketRing::kDatagramRoom}, timeout,
+                                     {&rtp_.gather, !rtp_.collector.is_empty()}, packet);
+  if (!length) return length;
+  rtp_.overwritten.clear();
+  rtp_.ring.written(static_cast<std::uint32_t>(*length), rtp_.overwritten);
+  if (!rtp_.overwritten.empty()) rtp_.collector.drop_overwritten(rtp_.overwritten);
+  if (packet.length < kRtpHeaderSize || !rtp_.takes(packet)) return length;
+  // Its bytes are its own before it is listed: should memory run out in between, it is lost like one on the wire.
+  rtp_.ring.keep(packet);
+  if (!rtp_.collector.add(packet, source_.clock_rate, Clock::now())) rtp_.ring.take_back();
+  return length;
+}
+
+}  // namespace vexa

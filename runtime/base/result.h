@@ -1,0 +1,63 @@
+// What a step that can fail returns: its value, or why it failed.
+#pragma once
+
+#include <optional>
+#include <string>
+#include <utility>
+#include <variant>
+
+#include "vexa/return_codes.h"
+
+namespace vexa {
+
+/// Why a step failed. The text is for people and its own; no decision is made by it.
+struct Failure {
+  ELibDReturnCode code = LIBD_FAILED;
+  std::string text;  ///< empty where there is nothing to report but the failure itself
+};
+
+/// A failure whose text is a constant. Costs no memory until it happens.
+struct KnownFailure {
+  ELibDReturnCode code = LIBD_FAILED;
+  const char* text = "";
+
+  operator Failure() const { return {code, text}; }  // NOLINT(google-explicit-constructor): the same thing, owned
+};
+
+/// A value or a failure. Reading the one that is not there is an error of the caller.
+template <typename Value = void>
+class [[nodiscard]] Result {
+ public:
+  using value_type = Value;
+
+  Result(Value value) : content_(std::in_place_index<0>, std::move(value)) {}         // NOLINT
+  Result(Failure failure) : content_(std::in_place_index<1>, std::move(failure)) {}   // NOLINT
+  Result(const KnownFailure& failure) : content_(std::in_place_index<1>, failure) {}  // NOLINT
+
+  explicit operator bool() const { return content_.index() == 0; }
+  Value& operator*() { return *std::get_if<0>(&content_); }
+  const Value& operator*() const { return *std::get_if<0>(&content_); }
+  Value* operator->() { return std::get_if<0>(&content_); }
+  const Value* operator->() const { return std::get_if<0>(&content_); }
+  const Failure& failure() const { return *std::get_if<1>(&content_); }
+
+ private:
+  std::variant<Value, Failure> content_;
+};
+
+/// Success, or a failure.
+template <>
+class [[nodiscard]] Result<void> {
+ public:
+  Result() = default;
+  Result(Failure failure) : failure_(std::move(failure)) {}            // NOLINT(google-explicit-constructor)
+  Result(const KnownFailure& failure) : failure_(Failure(failure)) {}  // NOLINT(google-explicit-constructor)
+
+  explicit operator bool() const { return !failure_; }
+  const Failure& failure() const { return *failure_; }
+
+ private:
+  std::optional<Failure> failure_;
+};
+
+}  // namespace vexa
