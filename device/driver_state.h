@@ -72,6 +72,7 @@ struct DriverState {
 
   // Starting and stopping video, with the start-stop lock held: device/video_streaming.cpp
   ELibDReturnCode start_video(const SLibDEdgeStorageStreamingInfo* recording);
+  void store_rtsp_port();
   ELibDReturnCode start_live();
   ELibDReturnCode start_playback(const SLibDEdgeStorageStreamingInfo& recording);
   ELibDReturnCode open_live_http(int stream);

@@ -53,12 +53,17 @@ Result<LiveCamera::Identity> LiveCamera::identify(int stream) {
   Identity identity;
   ELibDReturnCode result = GetCurrentSystemInfo(identity.system);
   if (result != LIBD_OK) return fail(explain(result));
+  m_ConnectionLock.Lock();
   m_CameraInfo.streamNumber = stream;
+  m_ConnectionLock.Unlock();
   identity.video.streamNumber = stream;
   result = GetCameraInfo(identity.video);
   if (result != LIBD_OK) return fail(explain(result));
+  std::string codec = identity.video.codecName;
+  m_ConnectionLock.Lock();
   m_CameraInfo.codecType = identity.video.codecType;
-  m_CameraInfo.codecName = identity.video.codecName;
+  m_CameraInfo.codecName.swap(codec);
+  m_ConnectionLock.Unlock();
   return identity;
 }
 
