@@ -150,7 +150,7 @@ Result<int> RtspSession::open(const RtspServer& server, const Opening& opening) 
   const auto description = exchange(rtsp_describe(describe), opening);
   if (!description) return description.failure();
   if (const auto taken = take_clocks(*description, opening); !taken) return taken.failure();
-  const auto session = set_up(opening);
+  auto session = set_up(opening);
   if (!session) return session;
   const RtspHead play{opening.url, ++fields_.cseq, fields_.credentials};
   const auto played = exchange(rtsp_play(play, {*session, opening.scale}), opening);
