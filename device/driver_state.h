@@ -53,6 +53,7 @@ struct DriverState {
   std::string codec_name();
   int rotation();
   int rtsp_port();
+  void store_rtsp_port(int port);
   int vmd_type();
   ELibDVideoStandard video_standard();
   bool takes_continuous_ptz();
@@ -72,7 +73,6 @@ struct DriverState {
 
   // Starting and stopping video, with the start-stop lock held: device/video_streaming.cpp
   ELibDReturnCode start_video(const SLibDEdgeStorageStreamingInfo* recording);
-  void store_rtsp_port();
   ELibDReturnCode start_live();
   ELibDReturnCode start_playback(const SLibDEdgeStorageStreamingInfo& recording);
   ELibDReturnCode open_live_http(int stream);

@@ -38,17 +38,11 @@ ELibDReturnCode DriverState::start_video(const SLibDEdgeStorageStreamingInfo* re
   const Guard guard(start_stop_lock);
   driver.StopVideoStreaming();
   if (stop_is_requested()) return LIBD_FAILED;  // another thread's, which waits for the lock
-  store_rtsp_port();
+  store_rtsp_port(kRtspPort);
   ELibDReturnCode started = LIBD_FAILED;
   const bool fitted =
       within_memory([&] { started = recording == nullptr ? start_live() : start_playback(*recording); });
   return fitted ? started : abandon_start(ENOMEM);
-}
-
-// Hosts read from the camera's settings which port the session is opened at.
-void DriverState::store_rtsp_port() {
-  const Guard settings(driver.m_ConnectionLock);
-  driver.m_CameraInfo.rtspPort = kRtspPort;
 }
 
 ELibDReturnCode DriverState::start_live() {
@@ -91,8 +85,8 @@ ELibDReturnCode DriverState::open_live_rtp(int stream) {
 
 // Opens the session at a path of the camera's, or leaves both sockets closed.
 ELibDReturnCode DriverState::open_rtp_session(const std::string& path) {
+  store_rtsp_port(kRtspPort);  // an inquiry of the host's may have stored another meanwhile
   const std::string host = connection.copy().host;
-  store_rtsp_port();  // an inquiry of the host's may have stored another meanwhile
   const std::string url = format_within(kRequestRoom, "rtsp://%s:%d%s", host.c_str(), kRtspPort, path.c_str()).text;
   const auto control = open_rtp_over_udp(url, kRtspPort);
   driver.m_RtspSocket = control ? *control : -1;
