@@ -34,6 +34,11 @@ int DriverState::rtsp_port() {
   return driver.m_CameraInfo.rtspPort;
 }
 
+void DriverState::store_rtsp_port(int port) {
+  const Guard guard(driver.m_ConnectionLock);
+  driver.m_CameraInfo.rtspPort = port;
+}
+
 int DriverState::vmd_type() {
   const Guard guard(driver.m_ConnectionLock);
   return driver.m_IoBoxInfo.vmdType;

@@ -53,6 +53,7 @@ struct DriverState {
   std::string codec_name();
   int rotation();
   int rtsp_port();
+  void store_rtsp_port(int port);
   int vmd_type();
   ELibDVideoStandard video_standard();
   bool takes_continuous_ptz();

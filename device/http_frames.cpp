@@ -95,13 +95,13 @@ ELibDReturnCode DriverState::read_elementary_frame(CVexaCommon::VideoFrameInfo& 
                                                    int& received) {
   frame.frameType = VIDEO_FRAME_INVALID;
   frame.length = 0;
-  errors.clear();
   StreamWindow window = stream_window();
   const StoppableSocket source = stream_source();
   const auto user_data = [this](Bytes text) {
     driver.GetUserDataFromStream(text.data(), static_cast<unsigned int>(text.size()));
   };
   while (frame.length < frame.capacity) {
+    errors.clear();
     const auto unit = read_unit(source, window, codec, {{frame.data, frame.capacity}, frame.length, frame.frameType},
                                 connection.timeout(), user_data);
     received = unit ? unit->length : -1;

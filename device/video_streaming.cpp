@@ -38,10 +38,7 @@ ELibDReturnCode DriverState::start_video(const SLibDEdgeStorageStreamingInfo* re
   const Guard guard(start_stop_lock);
   driver.StopVideoStreaming();
   if (stop_is_requested()) return LIBD_FAILED;  // another thread's, which waits for the lock
-  {
-    const Guard settings(driver.m_ConnectionLock);
-    driver.m_CameraInfo.rtspPort = kRtspPort;
-  }
+  store_rtsp_port(kRtspPort);
   ELibDReturnCode started = LIBD_FAILED;
   const bool fitted =
       within_memory([&] { started = recording == nullptr ? start_live() : start_playback(*recording); });
@@ -88,6 +85,7 @@ ELibDReturnCode DriverState::open_live_rtp(int stream) {
 
 // Opens the session at a path of the camera's, or leaves both sockets closed.
 ELibDReturnCode DriverState::open_rtp_session(const std::string& path) {
+  store_rtsp_port(kRtspPort);  // an inquiry of the host's may have stored another meanwhile
   const std::string host = connection.copy().host;
   const std::string url = format_within(kRequestRoom, "rtsp://%s:%d%s", host.c_str(), kRtspPort, path.c_str()).text;
   const auto control = open_rtp_over_udp(url, kRtspPort);
