@@ -18,8 +18,8 @@ void read_value(std::string_view answer, std::size_t at, std::size_t length) {
   check(value.end <= answer.size());
   check(value.text.find('&') == std::string_view::npos);
   check(value.text.empty() || value.text.data() + value.text.size() == answer.data() + value.end);
-  const vexa::VideoCodec* codec = vexa::video_codec_of(value.text);
-  check(codec == nullptr || (codec->codecType >= 0 && codec->codecType <= 2));
+  const vexa::Codec* codec = vexa::video_codec_of(value.text);
+  check(codec == nullptr || vexa::codec_named(codec->name) == codec);
   const ELibDVideoStandard standard = vexa::video_standard_of(value.text);
   check(standard == LIBD_VIDEO_PAL || standard == LIBD_VIDEO_NTSC);
   const vexa::StreamSize size = vexa::read_stream_size(value.text);
