@@ -34,8 +34,11 @@ void* operator new(std::size_t size, const std::nothrow_t&) noexcept { return al
 void* operator new[](std::size_t size, const std::nothrow_t&) noexcept { return allocate(size); }
 void operator delete(void* block) noexcept { std::free(block); }
 void operator delete[](void* block) noexcept { std::free(block); }
+// Clang declares these nowhere, and would hide them from the C++ library.
+#pragma GCC visibility push(default)
 void operator delete(void* block, std::size_t) noexcept { std::free(block); }
 void operator delete[](void* block, std::size_t) noexcept { std::free(block); }
+#pragma GCC visibility pop
 void operator delete(void* block, const std::nothrow_t&) noexcept { std::free(block); }
 void operator delete[](void* block, const std::nothrow_t&) noexcept { std::free(block); }
 
