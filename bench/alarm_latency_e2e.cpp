@@ -57,7 +57,7 @@ Nanoseconds clock_now() { return steady_clock::now().time_since_epoch().count();
     board.changed_at[camera][count] = clock_now();
     ++count;
     const bool is_taken = cameras.camera(camera).alarms().happen(
-        {{}, vexa::camera::AlarmEvent::Kind::kContact, 1, static_cast<int>(count % 2)});
+        {vexa::camera::AlarmEvent::Kind::kContact, 1, static_cast<int>(count % 2)});
     if (!is_taken) _exit(1);
   }
 }
