@@ -46,7 +46,9 @@ void CgiLog::write(const char* direction, const char* message) {
 
 Result<Socket> CameraLink::open(const std::string& path) {
   errors_.clear();
-  return open_http({connection_.copy(), log_}, path);
+  auto socket = open_http({connection_.copy(), log_}, path);
+  exchanges_.http(1, socket ? nullptr : &socket.failure());
+  return socket;
 }
 
 ELibDReturnCode CameraLink::send(const char* format, ...) {
@@ -68,6 +70,7 @@ ELibDReturnCode CameraLink::inquire(const std::string& name, std::string& answer
     const auto size = inquiry_sizes_.find(name);
     if (size == inquiry_sizes_.end()) return LIBD_FAILED;
     auto received = vexa::inquire({connection_.copy(), log_}, name, size->second);
+    exchanges_.http(1, received ? nullptr : &received.failure());
     if (!received) return received.failure();
     answer = std::move(*received);
     return LIBD_OK;

@@ -4,7 +4,9 @@
 #include <functional>
 #include <optional>
 
+#include "media/frame_chronicle.h"
 #include "media/rtp_reception.h"
+#include "media/stream_ledger.h"
 #include "runtime/base/result.h"
 #include "transport/socket.h"
 
@@ -22,9 +24,11 @@ class PictureReader {
     int clock_rate;         ///< ticks a second
     int timeout;            ///< milliseconds that a read may take
     std::function<bool()> is_stopped;
+    bool strict;  ///< takes packets of the camera's address and of the stream's SSRC alone
   };
 
-  PictureReader(RtpReception& rtp, Source source) : rtp_(rtp), source_(std::move(source)) {}
+  PictureReader(RtpReception& rtp, StreamLedger& ledger, FrameChronicle& chronicle, Source source)
+      : rtp_(rtp), ledger_(ledger), chronicle_(chronicle), source_(std::move(source)) {}
 
   /// The next picture. None when there is none yet and the stream goes on: packets have come that made no picture, or
   /// it is to end. LIBD_TIMEOUT when no datagram came in time.
@@ -35,9 +39,18 @@ class PictureReader {
 
  private:
   Result<int> receive(int timeout);
+  struct Datagram {
+    std::uint32_t length;
+    std::uint32_t sender;  ///< with strict reception alone
+    StreamLedger::Instant arrival;
+  };
+  void take(const SPacketInfo& packet, const Datagram& datagram);
+  std::optional<StreamLedger::Refusal> refusal_of(const SPacketInfo& packet, const Datagram& datagram) const;
   bool packet_waits(int timeout) const;
 
   RtpReception& rtp_;
+  StreamLedger& ledger_;
+  FrameChronicle& chronicle_;
   Source source_;
 };
 

@@ -80,6 +80,9 @@ class RtspSession {
   /// One TEARDOWN. `timeout` is that of the answer.
   Result<> tear_down(int socket, int timeout);
 
+  /// Requests that were sent, or tried to be.
+  std::uint64_t requests() const { return requests_; }
+
  private:
   Result<std::string> exchange(const Formatted& request, const Opening& opening);
   Result<> take_clocks(const std::string& description, const Opening& opening) const;
@@ -87,6 +90,7 @@ class RtspSession {
 
   Fields fields_;
   int socket_ = -1;  ///< of the session being opened
+  std::uint64_t requests_ = 0;
 };
 
 }  // namespace vexa

@@ -15,6 +15,9 @@ inline constexpr int kRtpVersionNumber = 2;
 /// Bytes of the packet that follows; nothing when the prefix does not begin with "$". Whatever the channel.
 std::optional<std::uint16_t> interleaved_length(Bytes prefix);
 
+/// Control packets (RTCP) go on the odd channels.
+inline bool is_control_channel(Bytes prefix) { return (prefix[1] & 1) != 0; }
+
 /// What the first byte of an RTP header (RFC 3550, 5.1) tells on this way.
 struct RtpFront {
   int version;

@@ -17,6 +17,11 @@ struct RtpHeader {
   std::uint32_t timestamp = 0;
 };
 
+/// The SSRC of a packet of at least kRtpHeaderSize bytes.
+inline std::uint32_t source_of(Bytes packet) {
+  return std::uint32_t{packet[8]} << 24 | std::uint32_t{packet[9]} << 16 | std::uint32_t{packet[10]} << 8 | packet[11];
+}
+
 /// None when the datagram is shorter than the header.
 std::optional<RtpHeader> parse_rtp_header(Bytes datagram);
 
