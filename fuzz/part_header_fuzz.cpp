@@ -3,7 +3,7 @@
 #include <cstdint>
 #include <cstdlib>
 
-#include "transport/wire/part_header.h"
+#include "transport/wire/http_answer.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size);
 

@@ -3,7 +3,7 @@
 #include <cstdint>
 #include <cstdlib>
 
-#include "transport/wire/range_clock.h"
+#include "transport/wire/rtsp_answer.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   const std::string_view text(reinterpret_cast<const char*>(data), size);

@@ -4,7 +4,6 @@
 #include <cstdlib>
 
 #include "transport/wire/http_answer.h"
-#include "transport/wire/range_clock.h"
 #include "transport/wire/rtsp_answer.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {

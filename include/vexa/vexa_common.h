@@ -117,7 +117,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   // device/connection.cpp
   ELibDReturnCode GetCurrentConnectionInfo(SLibDConnectionInfo& info) override;
   ELibDReturnCode SetCurrentConnectionInfo(SLibDConnectionInfo& info) override;
-  // device/cgi_log.cpp
+  // device/connection.cpp
   ELibDReturnCode SetCGILogLevel(bool on) override;
   ELibDReturnCode SetCGILogPath(const char* path) override;
   // device/video_streaming.cpp
@@ -285,7 +285,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   // Tours: device/camera_tours.cpp
   bool GetTextByTourSequenceList(const std::vector<int>& sequence, std::string& text);
   bool GetTourSequenceListByText(std::string text, std::vector<int>& sequence);
-  // The CGI log: device/cgi_log.cpp
+  // The CGI log: device/connection.cpp
   void Log(const char* direction, const char* message);
   // Identity, capabilities and current settings
   SLibDFixedSystemInfo m_FixedSystemInfo;

@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "device/cgi/preset_text.h"
+#include "device/cgi/ptz_text.h"
 #include "tests/device/ptz_reach.h"
 
 namespace {
