@@ -19,6 +19,7 @@
 namespace vexa::models {
 
 /// One value of the profile with its path. A part that is missing reads as empty, false and 0.
+/// A plain value that points into the parsed text, which outlives it; one thread reads a profile.
 class Part {
  public:
   Part(const Node* node, std::string path) : node_(node), path_(std::move(path)) {}

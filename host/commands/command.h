@@ -13,6 +13,7 @@ class App;
 
 namespace vexa::host {
 
+// The command line owns all commands and runs the one that was typed, on the program's main thread.
 class Command {
  public:
   Command() = default;

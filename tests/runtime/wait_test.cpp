@@ -11,7 +11,7 @@
 #include <vector>
 
 #include "runtime/handle.h"
-#include "tests/runtime/event_owner.h"
+#include "tests/runtime/thread_routines.h"
 #include "tests/support/failing_new.h"
 #include "tests/support/interruptions.h"
 #include "tests/support/process_state.h"

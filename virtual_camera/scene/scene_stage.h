@@ -11,6 +11,7 @@
 namespace vexa::camera {
 
 // Any thread.
+// A camera owns one: its watch sends the walker in, its painters look.
 class SceneStage {
  public:
   using Time = std::chrono::steady_clock::time_point;

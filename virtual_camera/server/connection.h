@@ -22,6 +22,7 @@ namespace vexa::camera {
 
 struct CameraState;
 
+// Owned by the operations that wait for its socket, and ends with them. On the loop's thread.
 class Connection : public std::enable_shared_from_this<Connection> {
  public:
   Connection(asio::ip::tcp::socket socket, std::shared_ptr<CameraState> state);

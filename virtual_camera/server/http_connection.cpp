@@ -11,7 +11,6 @@
 #include "virtual_camera/server/http_commands.h"
 #include "virtual_camera/server/media_stream.h"
 #include "virtual_camera/values/number_text.h"
-#include "virtual_camera/wire/credentials.h"
 #include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {

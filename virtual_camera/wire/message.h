@@ -1,4 +1,5 @@
-// HTTP (RFC 1945) as the camera reads and writes it: request heads, answers, percent-encoded texts (RFC 3986, 2.1).
+// HTTP (RFC 1945) as the camera reads and writes it: request heads, answers, Basic credentials, percent-encoded texts
+// (RFC 3986, 2.1).
 #ifndef VIRTUAL_CAMERA_WIRE_MESSAGE_H_
 #define VIRTUAL_CAMERA_WIRE_MESSAGE_H_
 
@@ -48,6 +49,11 @@ struct Answer {
 [[nodiscard]] std::optional<std::string> percent_decoded(std::string_view text);
 // The text with its "%", ",", "&" and control characters percent-encoded, so that a list can hold it.
 [[nodiscard]] std::string percent_encoded_for_list(std::string_view text);
+
+[[nodiscard]] std::string base64_text(std::string_view bytes);
+
+// Whether an Authorization header value lets its sender in. Empty user and password let everyone in.
+[[nodiscard]] bool credentials_match(std::string_view authorization, std::string_view user, std::string_view password);
 
 }  // namespace vexa::camera
 
