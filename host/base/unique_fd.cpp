@@ -1,4 +1,4 @@
-#include "host/base/write_all.h"
+#include "host/base/unique_fd.h"
 
 #include <poll.h>
 #include <unistd.h>
