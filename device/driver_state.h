@@ -12,7 +12,7 @@
 #include "device/error_record.h"
 #include "device/polled_stream.h"
 #include "device/readiness.h"
-#include "media/assembly/assembled_picture.h"
+#include "media/assembly/picture_rules.h"
 #include "media/frame_store.h"
 #include "media/picture_reader.h"
 #include "media/rtp_reception.h"
