@@ -14,7 +14,8 @@
 #include "device/exchange_ledger.h"
 #include "device/polled_stream.h"
 #include "device/queue_counts.h"
-#include "media/assembly/assembled_picture.h"
+#include "device/readiness.h"
+#include "media/assembly/picture_rules.h"
 #include "media/frame_store.h"
 #include "media/picture_reader.h"
 #include "media/rtp_reception.h"
@@ -26,9 +27,6 @@
 namespace vexa {
 
 class FrameChronicle;
-
-/// The time of day in whole seconds; tests put their own in its place.
-using SecondsClock = std::time_t (*)();
 
 inline std::time_t system_seconds() { return std::time(nullptr); }
 
@@ -45,7 +43,7 @@ struct DriverState {
   DriverState& operator=(const DriverState&) = delete;
   ~DriverState();
 
-  /// Of a driver, for what stands outside its class.
+  /// For functions of the interface that are not the class's.
   static DriverState& of(CVexaCommon& driver) { return *driver.m_State; }
 
   CVexaCommon& driver;
@@ -54,11 +52,13 @@ struct DriverState {
   CgiLog log;
   ExchangeLedger exchanges;
   CameraLink camera;
+  Readiness readiness;
   PolledStream audio;
   PolledStream alarms;
   PolledStream metadata;
   CSimpleLock start_stop_lock;  ///< held by a start or stop of video from begin to end; outermost
   SecondsClock now = system_seconds;
+  std::atomic<bool> prompt_frames{false};
   int teardown_timeout = 15000;       ///< milliseconds for the answer to a TEARDOWN; tests put less in its place
   std::unique_ptr<RtpReception> rtp;  ///< the streaming thread's; null while no RTP streams
   StreamLedger ledger;                ///< the streaming thread's, or a starter's or stopper's while there is none
@@ -153,6 +153,8 @@ struct DriverState {
   QueuedFacts leave_front() VEXA_REQUIRES(driver.m_FrameQueueLock);
   void free_frame(CVexaCommon::VideoFrameInfo& frame) VEXA_REQUIRES(driver.m_FrameQueueLock);
   void clear_frame_queue();
+  /// Ends each step that changes the queue or the report of a silence.
+  void note_video() VEXA_REQUIRES(driver.m_FrameQueueLock);
 
   // Settings and the cached inquiry; any thread: device/video_settings.cpp, device/image_controls.cpp
   void store_camera_inquiry(const std::string& answer);

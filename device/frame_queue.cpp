@@ -24,6 +24,7 @@ void CVexaCommon::PropulateFrameInfoList(CVexaCommon* driver, VideoFrameInfo& fr
   vexa::DriverState& state = *driver->m_State;
   const vexa::Guard guard(state.driver.m_FrameQueueLock);  // the caller's already
   state.append_frame(frame, waitKey, false);
+  state.note_video();
 }
 
 ELibDReturnCode CVexaCommon::GetCurrentVideoFrame(SLibDVideoFrameInfo& frame) {
@@ -41,7 +42,7 @@ void DriverState::queue_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key
     case LIBD_FRAME_DAMAGED:
       driver.m_VideoTimedOut = false;
       append_frame(frame, wait_key, result == LIBD_FRAME_DAMAGED);
-      return;
+      break;
     case LIBD_BUFFER_TOO_SMALL:
       driver.m_LargeFrameBuffers = true;
       driver.m_VideoTimedOut = false;
@@ -62,7 +63,8 @@ void DriverState::queue_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key
     case LIBD_UNAUTHORIZED:
       break;
   }
-  free_frame(frame);
+  free_frame(frame);  // unless it is the queue's now
+  note_video();
 }
 
 QueuedFacts DriverState::arrived_at_queue(const CVexaCommon::VideoFrameInfo& frame, bool is_notice) {
@@ -136,6 +138,7 @@ ELibDReturnCode DriverState::take_oldest_frame(SLibDVideoFrameInfo& frame, Frame
   const Guard guard(driver.m_FrameQueueLock);
   if (driver.m_FrameQueue.empty()) {
     const bool timed_out = std::exchange(driver.m_VideoTimedOut, false);
+    note_video();
     return timed_out ? LIBD_TIMEOUT : LIBD_NO_FRAME;
   }
   const CVexaCommon::VideoFrameInfo& oldest = driver.m_FrameQueue.front();
@@ -147,8 +150,11 @@ ELibDReturnCode DriverState::take_oldest_frame(SLibDVideoFrameInfo& frame, Frame
   facts = known.facts;
   if (!known.is_notice) ++queue.handed_out;
   published_queue.publish(queue);
+  note_video();
   return LIBD_OK;
 }
+
+void DriverState::note_video() { readiness.set_video(!driver.m_FrameQueue.empty() || driver.m_VideoTimedOut); }
 
 void DriverState::free_frame(CVexaCommon::VideoFrameInfo& frame) {
   spare_frames.give_back(frame.data, frame.capacity);
@@ -167,6 +173,7 @@ void DriverState::clear_frame_queue() {
   delete[] std::exchange(driver.m_StagingBuffer, nullptr);
   driver.m_StagingBufferSize = 0;
   driver.m_VideoTimedOut = false;
+  note_video();
 }
 
 }  // namespace vexa

@@ -4,11 +4,9 @@
 #include <utility>
 
 #include "device/driver_state.h"
-#include "media/assembly/camera_position.h"
-#include "media/assembly/h264_units.h"
-#include "media/assembly/mpeg4_units.h"
+#include "media/assembly/elementary_unit.h"
 #include "media/assembly/picture_clock.h"
-#include "media/assembly/rtp_jpeg.h"
+#include "media/assembly/rtp_pictures.h"
 #include "media/frame_chronicle.h"
 #include "transport/wire/rtp_header.h"
 
@@ -145,6 +143,7 @@ void DriverState::frame_is_ready(const CVexaCommon::VideoFrameInfo& frame, const
 
 ELibDReturnCode DriverState::collect_picture(PacketRunPlace& run) {
   errors.clear();
+  rtp->gather.limit(prompt_frames ? BurstGather::kPrompt : BurstGather::kLongest);
   PictureReader reader(*rtp, ledger, *chronicle,
                        {stream_source(), driver.m_RtpPacketBuffer, driver.m_RtpClockRate, connection.timeout(),
                         [this] { return stop_is_requested(); }, strict_reception});
