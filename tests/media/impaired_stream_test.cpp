@@ -7,6 +7,7 @@
 #include <thread>
 #include <vector>
 
+#include "tests/media/statistics_equations.h"
 #include "tests/media/whole_stream.h"
 
 namespace vexa_test {
@@ -62,6 +63,7 @@ WholeFrames take_from_assembly(LiveCamera& camera, MediaDriver& driver) {
     frame.data = buffer.data();
     frame.capacity = static_cast<unsigned int>(buffer.size());
     const ELibDReturnCode code = driver.GetRtpCurrentVideoFrame(driver.state().stream_codec(), frame);
+    expect_equations(statistics_of(driver));
     if (code == LIBD_OK) frames.emplace_back(buffer.begin(), buffer.begin() + frame.length);
     return code;
   };
@@ -95,6 +97,10 @@ class Impaired : public testing::TestWithParam<Impairment> {
     MediaDriver driver;
     camera.introduce(driver);
     const WholeFrames frames = stream.take(camera, driver);
+    const vexa::StreamStatistics counted = statistics_of(driver);
+    expect_equations(counted);
+    EXPECT_EQ(counted.packetsReceived + counted.packetsDroppedByKernel, camera->sent().sent());
+    EXPECT_EQ(counted.framesHandedOut + counted.framesHeldInQueue, frames.size());
     const std::vector<std::uint64_t> wanted = predicted(camera, camera->sent().snapshot());
     ASSERT_EQ(frames.size(), wanted.size()) << stream.clip << " " << stream.index;
     for (std::size_t i = 0; i < frames.size(); ++i) {

@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "tests/media/live_camera.h"
+#include "tests/media/statistics_equations.h"
 
 namespace vexa_test {
 
@@ -37,6 +38,7 @@ inline std::vector<TakenFrame> take_whole_stream(LiveCamera& camera, MediaDriver
   const auto take_more = [&](std::size_t count, std::chrono::milliseconds patience) {
     const auto more = host.take_all(driver, count, patience);
     frames.insert(frames.end(), more.begin(), more.end());
+    expect_equations(statistics_of(driver));
   };
   while (camera->sent().finished_streams() == 0) take_more(frames.max_size(), std::chrono::milliseconds(50));
   wanted = predicted(camera, camera->sent().snapshot());
