@@ -54,8 +54,6 @@ TEST(TourSelector, HoldsTheLettersInOrder) {
   EXPECT_EQ(letters, "A|B|C|D|E|");
 }
 
-// ---- Setting ----
-
 TEST(SetCameraTourInfo, SendsAllToursAtOnce) {
   expect_tours_sent(tours_of(true, 30, {tour_of(true, {1, 2, 3}), tour_of(false, {4, 5}, 5, 12)}),
                     "Tour=on&TourResume=on&TourRsmTime=30"
@@ -146,8 +144,6 @@ TEST_F(CameraToursUnsent, BecauseANegativePresetIsAboveANegativeCount) {
   EXPECT_EQ(driver_.SetCameraTourInfo(info), LIBD_INVALID_ARGUMENT);
 }
 
-// ---- Reading ----
-
 SLibDCameraTourInfo asked_tours(const std::string& answer, int count, int result = 1) {
   PtzPlay play({inquiry("presetposition", answer)});
   with_tours(count)(play.driver);
@@ -221,8 +217,6 @@ TEST(GetCameraTourInfo, LeavesTheRecordWhenTheInquiryFails) {
   EXPECT_EQ(info.resumeTime, 77);
   EXPECT_EQ(info.tours.size(), 1U);
 }
-
-// ---- Sequences ----
 
 TEST(TourSequence, IsReadFromItsText) {
   const struct {

@@ -86,8 +86,6 @@ TEST(Presets, TellTheLatestErrorWhenTheyAreRefused) {
                       give_presets);
 }
 
-// ---- The time-out of storing ----
-
 TEST(SetPreset, PutsTheSavedTimeoutBackWhetherOrNotItSucceeded) {
   for (const bool taken : {true, false}) {
     const std::string path = presets_path("PresetSet=1,x,on");
@@ -110,8 +108,6 @@ TEST(SetPreset, WaitsLongerThanTheConnectionAllows) {
   EXPECT_EQ(set_preset(play.driver, 0, "x"), LIBD_OK);
 }
 
-// ---- Refusals ----
-
 using PresetsUnsent = PtzUnsent;
 
 TEST_F(PresetsUnsent, BecauseTheIndexIsNoPreset) {
@@ -130,8 +126,6 @@ TEST_F(PresetsUnsent, BecauseTheNameIsEmpty) {
   give_presets(driver_);
   EXPECT_EQ(set_preset(driver_, 0, ""), LIBD_INVALID_ARGUMENT);
 }
-
-// ---- The list ----
 
 struct PresetListRow {
   const char* answer;

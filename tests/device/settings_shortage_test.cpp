@@ -75,8 +75,6 @@ TEST(ShortMemory, FailsAReadingOutOfTheCache) {
   }
 }
 
-// ---- Calls that need no camera ----
-
 using ShortCall = ELibDReturnCode (*)(SettingsDriver&);
 
 struct ShortCallRow {

@@ -44,8 +44,6 @@ SentRow setting(const SLibDShadowTourInfo& info, const std::string& rest) {
       rest);
 }
 
-// ---- Starting and stopping ----
-
 const SentRow kStops[] = {shadow_row([](PtzDriver& d) { return d.StopShadowTour(); },
                                      "STour=off&STourA=off&STourB=off&STourC=off&STourD=off"),
                           shadow_row([](PtzDriver& d) { return d.StopRecordShadowTour(); }, "STourRecord=stop"),
@@ -122,8 +120,6 @@ TEST_F(ShadowToursUnsent, BecauseTheCameraHasNone) {
     EXPECT_EQ(info.resumeTime, 5);
   }
 }
-
-// ---- Settings ----
 
 TEST(SetShadowTourInfo, SendsAllShadowToursAtOnce) {
   expect_sent({setting(shadow_info(true, 30, {false, true}),

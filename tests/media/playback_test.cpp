@@ -180,8 +180,6 @@ TEST(PlaybackStream, IsNotTornDownWhenTheHostWantsItSo) {
   }
 }
 
-// ---- What goes wrong while it plays ----
-
 /// Moves the driver's clock until the host has been told of the silence.
 ELibDReturnCode code_of_silence(MediaDriver& driver, std::atomic<std::time_t>& now) {
   FrameTaker host;
@@ -253,8 +251,6 @@ TEST(PlaybackStart, ThatRunsOutOfMemoryAnywhereFailsAndLeavesNothingBehind) {
       19);
   EXPECT_TRUE(eventually([&] { return open_descriptors() == descriptors; }));
 }
-
-// ---- Back and forth ----
 
 /// Everything that names a session, with the URL that the session was set up for; true when all agree.
 std::size_t requests_within_sessions(LiveCamera& camera, const std::string& method) {
