@@ -1,11 +1,12 @@
 # vexa_manual(TARGET): a program's manual page and completions, made from its own command line, and their installation.
+# Sanitized programs are left out: not every system runs them just so.
 option(VEXA_BUILD_MANUALS "Make manual pages and completions of the programs (needs python3)" ON)
 if(VEXA_BUILD_MANUALS)
   find_package(Python3 COMPONENTS Interpreter)
 endif()
 
 function(vexa_manual target)
-  if(NOT VEXA_BUILD_MANUALS OR NOT Python3_FOUND)
+  if(NOT VEXA_BUILD_MANUALS OR NOT Python3_FOUND OR VEXA_SANITIZE)
     return()
   endif()
   set(out ${CMAKE_BINARY_DIR}/manuals)
