@@ -8,7 +8,7 @@
 
 #include "command_line/description.h"
 #include "host/commands/command.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 
 namespace vexa::host {
 namespace {

@@ -9,6 +9,7 @@
 namespace vexa {
 
 /// Owns a socket: closes it on every early exit, is released on success.
+/// Made where a connection is opened; one thread at a time has it.
 class Socket {
  public:
   Socket() = default;

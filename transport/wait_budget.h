@@ -8,6 +8,7 @@ namespace vexa {
 /// Milliseconds that one or several waits share: made before a loop it is shared by the loop's waits, made inside it is
 /// fresh for each. Every wait answers 1 (ready), 0 (the budget is used up) or -1 (errno says why); a signal does not
 /// end it, and a budget of 0 or less looks once. Waits by poll, so that any number of a descriptor will do.
+/// A value on the stack of the thread that waits; it holds no descriptor.
 class WaitBudget {
  public:
   explicit WaitBudget(int milliseconds);

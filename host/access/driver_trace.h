@@ -19,6 +19,7 @@ namespace vexa::host {
 [[nodiscard]] UniqueFd take_standard_output();
 
 // While it lives, the driver's trace is shown on standard error, line by line, redacted.
+// Owned by the command that asked for it. Its own thread reads the lines; made and ended by the main thread.
 class DriverTrace {
  public:
   // Null when the system refuses, with errno set.

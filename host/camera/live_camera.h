@@ -40,6 +40,8 @@ struct CardMode {
 };
 
 // A model class for any camera that streams video.
+// One for each camera that a command speaks to. Any thread may call it, as any driver; explain() only after a call on
+// the same thread.
 class LiveCamera final : public CVexaCommon {
  public:
   // Gives the driver the camera's address; contacts no camera.
