@@ -1,6 +1,7 @@
 // From the datagrams of an RTP stream to the packets of its next picture.
 #pragma once
 
+#include <chrono>
 #include <functional>
 #include <optional>
 #include <span>
@@ -12,6 +13,13 @@
 #include "transport/wire/stream_window.h"
 
 namespace vexa {
+
+/// Something that the reader's thread awaits besides media: what becomes readable when it comes (-1: none), and when it
+/// is too late.
+struct Errand {
+  int descriptor;
+  std::chrono::steady_clock::time_point deadline;
+};
 
 /// A picture is a run of packets in the list; a frame is what is assembled of them in a host's buffer.
 ///
@@ -25,6 +33,7 @@ class PictureReader {
     int clock_rate;         ///< ticks a second
     int timeout;            ///< milliseconds that a read may take
     std::function<bool()> is_stopped;
+    std::optional<Errand> errand = {};  ///< ends the wait for a datagram, with no picture yet
   };
 
   PictureReader(RtpReception& rtp, Source source) : rtp_(rtp), source_(std::move(source)) {}
@@ -39,6 +48,7 @@ class PictureReader {
  private:
   Result<int> receive(int timeout);
   bool packet_waits(int timeout) const;
+  bool errand_is_due() const;
 
   RtpReception& rtp_;
   Source source_;
