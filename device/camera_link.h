@@ -3,6 +3,7 @@
 
 #include <atomic>
 #include <map>
+#include <span>
 #include <string>
 
 #include "device/error_record.h"
@@ -39,6 +40,8 @@ class Connection {
 
   SLibDConnectionInfo copy();
   int timeout();
+  /// Writes "HOST:PORT", cut where it does not fit.
+  void write_name(std::span<char> room);
   /// The time-out is `milliseconds` for the life of what this returns.
   RaisedTimeout raised(int milliseconds) VEXA_EXCLUDES(lock_);
 
@@ -79,6 +82,8 @@ class CameraLink {
   ELibDReturnCode inquire(const std::string& name, std::string& answer);
 
  private:
+  HttpPeer peer();
+
   Connection& connection_;
   CgiLog& log_;
   ErrorRecord& errors_;

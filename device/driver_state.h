@@ -5,16 +5,20 @@
 #include <ctime>
 #include <deque>
 #include <memory>
+#include <optional>
 #include <span>
 #include <string>
 
 #include "device/camera_link.h"
+#include "device/cancellation.h"
 #include "device/cgi/input_part.h"
 #include "device/error_record.h"
 #include "device/exchange_ledger.h"
+#include "device/operation.h"
 #include "device/polled_stream.h"
 #include "device/queue_counts.h"
 #include "device/readiness.h"
+#include "device/request_echo.h"
 #include "media/assembly/picture_rules.h"
 #include "media/frame_store.h"
 #include "media/picture_reader.h"
@@ -47,6 +51,8 @@ struct DriverState {
   static DriverState& of(CVexaCommon& driver) { return *driver.m_State; }
 
   CVexaCommon& driver;
+  Cancellation cancellation;
+  RequestEcho echo;
   ErrorRecord errors;
   Connection connection;
   CgiLog log;
@@ -71,6 +77,15 @@ struct DriverState {
   std::deque<QueuedFacts> queued_facts VEXA_GUARDED_BY(driver.m_FrameQueueLock);  ///< in the queue's order
   Published<QueueCounts> published_queue;  ///< published under the lock, read without it
   const std::int64_t created;              ///< nanoseconds since 1970
+
+  /// A property has changed, and what is offered has not been filtered by it.
+  bool offer_is_stale VEXA_GUARDED_BY(driver.m_ConnectionLock) = false;
+
+  std::optional<AwaitedAnswer> keep_alive;  ///< sent and not answered yet; the RTSP session's owner's
+
+  /// The connection's time-out, or another time, for waits of the call that the calling thread makes.
+  WaitLimit limit() { return limit(connection.timeout()); }
+  WaitLimit limit(int milliseconds) { return {milliseconds, Operation::cancels_of(errors)}; }
 
   // Copies of settings, each under its lock; any thread: device/driver_state.cpp
   std::string bright_mode();
@@ -99,6 +114,12 @@ struct DriverState {
   /// Counts a datagram of `length` bytes that a model class reads itself.
   void count_passed_on(Bytes packet, std::size_t length);
   void count_interleaved(const InterleavedPacket& packet, const char* payload);
+  /// Sends a keep-alive when one is due and none is awaited.
+  void begin_keep_alive();
+  /// Takes the answer of a keep-alive if it has come or is too late. Waits for nothing.
+  void look_for_keep_alive();
+  /// Waits for the answer of a keep-alive that is awaited.
+  void finish_keep_alive();
 
   // Starting and stopping video, with the start-stop lock held: device/video_streaming.cpp
   ELibDReturnCode start_video(const SLibDEdgeStorageStreamingInfo* recording);
@@ -121,6 +142,8 @@ struct DriverState {
   ELibDReturnCode nothing_yet();
   ELibDReturnCode begin_rtp_frame(CVexaCommon::VideoFrameInfo& frame, const Codec& codec);
   ELibDReturnCode collect_picture(PacketRunPlace& run);
+  /// What the streaming thread awaits besides media.
+  std::optional<Errand> errand() const;
   ELibDReturnCode finish_rtp_frame(CVexaCommon::VideoFrameInfo& frame, PacketRunPlace run,
                                    const AssembledPicture& picture);
   /// The frame that was assembled before was read past the queue, if it is not in it.
@@ -164,7 +187,11 @@ struct DriverState {
   void read_camera_answer(const std::string& answer, SLibDCameraInfo& info);
   bool read_camera_properties(const std::string& answer) VEXA_REQUIRES(driver.m_ConnectionLock);
   void read_stream_settings(const std::string& answer, int stream) VEXA_REQUIRES(driver.m_ConnectionLock);
+  /// Makes `stream` the one that is played, with what the answer says of it.
+  ELibDReturnCode choose_stream(const std::string& answer, int stream);
   void read_video_ports(const std::string& answer) VEXA_REQUIRES(driver.m_ConnectionLock);
+  /// Offers what the filter leaves.
+  void offer_filtered() VEXA_REQUIRES(driver.m_ConnectionLock);
   void filter_by(const char* item, const std::string& value);
 
   // Alarms; any thread: device/alarm_io.cpp

@@ -45,8 +45,11 @@ ELibDReturnCode CVexaCommon::GetCurrentJPEGFrameData(VideoFrameInfo& frame, int&
   m_State->begin_frame();
   m_State->errors.clear();
   received = -1;
-  const auto part = vexa::receive_picture_part(
-      m_State->stream_socket(), {reinterpret_cast<char*>(frame.data), frame.capacity}, m_State->connection.timeout());
+  const vexa::StoppableSocket source = m_State->stream_source();
+  const vexa::WaitLimit limit{m_State->connection.timeout(), {nullptr, nullptr, source.stop}};
+  const auto part =
+      vexa::receive_picture_part(source.socket, {reinterpret_cast<char*>(frame.data), frame.capacity}, limit);
+  if (!part && m_State->stop_is_requested()) return LIBD_NO_FRAME;
   if (!part) {
     m_State->errors.record(part.failure());
     return part.failure().code;

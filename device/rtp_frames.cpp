@@ -141,12 +141,17 @@ void DriverState::frame_is_ready(const CVexaCommon::VideoFrameInfo& frame, const
   ledger.publish();
 }
 
+std::optional<Errand> DriverState::errand() const {
+  if (!keep_alive) return std::nullopt;
+  return Errand{keep_alive->begun ? -1 : driver.m_RtspSocket, keep_alive->give_up};
+}
+
 ELibDReturnCode DriverState::collect_picture(PacketRunPlace& run) {
   errors.clear();
   rtp->gather.limit(prompt_frames ? BurstGather::kPrompt : BurstGather::kLongest);
   PictureReader reader(*rtp, ledger, *chronicle,
                        {stream_source(), driver.m_RtpPacketBuffer, driver.m_RtpClockRate, connection.timeout(),
-                        [this] { return stop_is_requested(); }, strict_reception});
+                        [this] { return stop_is_requested(); }, strict_reception, errand()});
   const auto picture = rtp->codec.kind == CodecKind::kJpeg ? reader.next_jpeg() : reader.next();
   if (!picture) {
     const Failure& failure = picture.failure();

@@ -25,10 +25,14 @@ constexpr useconds_t kExitPoll = 100000;  // microseconds
 
 }  // namespace
 
-ELibDReturnCode CVexaCommon::StartVideoStreaming() { return m_State->start_video(nullptr); }
+ELibDReturnCode CVexaCommon::StartVideoStreaming() {
+  vexa::Operation operation(*m_State, __func__);
+  return operation.returns(m_State->start_video(nullptr));
+}
 
 ELibDReturnCode CVexaCommon::StartEdgeStorageVideoStreaming(const SLibDEdgeStorageStreamingInfo& info) {
-  return m_State->start_video(&info);
+  vexa::Operation operation(*m_State, __func__);
+  return operation.returns(m_State->start_video(&info));
 }
 
 namespace vexa {
@@ -170,11 +174,12 @@ void DriverState::take_frame(CVexaCommon::VideoFrameInfo& frame) {
   frame.data = spare_frames.take(frame.capacity);
 }
 
-// The keep-alive waits for its answer up to a second, between two pictures.
+// A keep-alive is awaited while media are received: its answer may take a second, or never come.
 ELibDReturnCode DriverState::read_frame(CVexaCommon::VideoFrameInfo& frame) {
   if (!plays_rtp()) return driver.GetCurrentFrameData(frame);
   const ELibDReturnCode result = driver.GetRtpCurrentVideoFrame(stream_codec(), frame);
-  driver.KeepAlive();
+  look_for_keep_alive();
+  begin_keep_alive();
   return result;
 }
 
@@ -203,6 +208,7 @@ unsigned int CVexaCommon::StreamingThread(void* driver) {
   vexa::DriverState& state = *self->m_State;
   bool wait_key = false;
   do {
+    const vexa::Operation reading(state, __func__);
     VideoFrameInfo frame;
     ELibDReturnCode result = LIBD_TIMEOUT;
     const bool fitted = vexa::within_memory([&] {
@@ -221,10 +227,11 @@ unsigned int CVexaCommon::StreamingThread(void* driver) {
 }
 
 ELibDReturnCode CVexaCommon::StopVideoStreaming() {
+  vexa::Operation operation(*m_State, __func__);
   {
     const vexa::Guard guard(m_VideoStateLock);
     if (m_StreamSocket == -1) return LIBD_OK;
-    if (m_StopVideoRequested) return LIBD_FAILED;
+    if (m_StopVideoRequested) return operation.returns(LIBD_FAILED);
     m_StopVideoRequested = true;
   }
   // A start in another thread is let finish: what it opens is its own until then.

@@ -30,9 +30,13 @@ Result<std::optional<PacketRunPlace>> PictureReader::next() {
     // Packets that never make a picture must not keep the thread from its keep-alive and its stop.
     if (now > give_up || source_.is_stopped()) return std::optional<PacketRunPlace>();
     const auto deadline = rtp_.collector.deadline();
-    const int until_look = deadline ? milliseconds_until(*deadline) : source_.timeout;
+    int until_look = deadline ? milliseconds_until(*deadline) : source_.timeout;
+    if (source_.errand) until_look = std::min(until_look, std::max(milliseconds_until(source_.errand->deadline), 0));
     // A look at what stands complete falls due before the read would time out: that is no silence of the camera's.
-    if (until_look < source_.timeout && !packet_waits(until_look)) continue;
+    if (until_look < source_.timeout && !packet_waits(until_look)) {
+      if (errand_is_due()) return std::optional<PacketRunPlace>();
+      continue;
+    }
     if (const auto received = receive(source_.timeout); !received) return received.failure();
   }
 }
@@ -51,7 +55,15 @@ Result<std::optional<PacketRunPlace>> PictureReader::next_jpeg() {
 
 // Also true when the read would fail at once.
 bool PictureReader::packet_waits(int timeout) const {
-  return WaitBudget(timeout).wait_readable_unless(source_.socket.socket, source_.socket.stop) != 0;
+  const int errand = source_.errand ? source_.errand->descriptor : -1;
+  const WaitBudget budget({timeout, {nullptr, nullptr, errand}});
+  return budget.wait_readable_unless(source_.socket.socket, source_.socket.stop) != 0;
+}
+
+bool PictureReader::errand_is_due() const {
+  if (!source_.errand) return false;
+  const auto& [descriptor, deadline] = *source_.errand;
+  return Clock::now() >= deadline || (descriptor >= 0 && WaitBudget(0).wait_readable(descriptor) != 0);
 }
 
 Result<int> PictureReader::receive(int timeout) {

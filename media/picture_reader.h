@@ -1,6 +1,7 @@
 // From the datagrams of an RTP stream to the packets of its next picture.
 #pragma once
 
+#include <chrono>
 #include <functional>
 #include <optional>
 #include <span>
@@ -15,6 +16,13 @@
 
 namespace vexa {
 
+/// Something that the reader's thread awaits besides media: what becomes readable when it comes (-1: none), and when it
+/// is too late.
+struct Errand {
+  int descriptor;
+  std::chrono::steady_clock::time_point deadline;
+};
+
 /// A picture is a run of packets in the list; a frame is what is assembled of them in a host's buffer.
 ///
 /// Collects one picture at a time into the reception that it is given. Holds nothing between two pictures. Made and
@@ -28,6 +36,7 @@ class PictureReader {
     int timeout;            ///< milliseconds that a read may take
     std::function<bool()> is_stopped;
     bool strict;  ///< takes packets of the camera's address and of the stream's SSRC alone
+    std::optional<Errand> errand = {};  ///< ends the wait for a datagram, with no picture yet
   };
 
   PictureReader(RtpReception& rtp, StreamLedger& ledger, FrameChronicle& chronicle, Source source)
@@ -50,6 +59,7 @@ class PictureReader {
   void take(const SPacketInfo& packet, const Datagram& datagram);
   std::optional<StreamLedger::Refusal> refusal_of(const SPacketInfo& packet, const Datagram& datagram) const;
   bool packet_waits(int timeout) const;
+  bool errand_is_due() const;
 
   RtpReception& rtp_;
   StreamLedger& ledger_;

@@ -5,7 +5,6 @@
 
 #include "transport/failure.h"
 #include "transport/socket.h"
-#include "transport/wait_budget.h"
 #include "transport/wire/rtp_header.h"
 
 namespace vexa {
@@ -40,12 +39,12 @@ ssize_t receive_after_nap(int socket, std::span<char> room, Gathering gathering)
 
 }  // namespace
 
-Result<int> receive_datagram(StoppableSocket source, std::span<char> room, int timeout, Gathering gathering) {
+Result<int> receive_datagram(StoppableSocket source, std::span<char> room, WaitLimit limit, Gathering gathering) {
   ssize_t count = read_waiting(source.socket, room, gathering);
   if (count < 0 && is_empty(errno)) count = receive_after_nap(source.socket, room, gathering);
   if (count < 0 && is_empty(errno)) {
     if (gathering.observer != nullptr) gathering.observer->about_to_wait();
-    const int ready = WaitBudget(timeout).wait_readable_unless(source.socket, source.stop);
+    const int ready = WaitBudget(limit).wait_readable_unless(source.socket, source.stop);
     if (ready == 0 && is_signalled(source.stop)) return kNoReason;
     if (ready == 0) return kReceiveTimedOut;
     if (ready < 0) return system_failure();
@@ -58,10 +57,10 @@ Result<int> receive_datagram(StoppableSocket source, std::span<char> room, int t
   return static_cast<int>(count);
 }
 
-Result<int> receive_packet(StoppableSocket source, std::span<char> room, int timeout, Gathering gathering,
+Result<int> receive_packet(StoppableSocket source, std::span<char> room, WaitLimit limit, Gathering gathering,
                            SPacketInfo& packet) {
   if (room.size() < kLeastRoom) return kInvalidArgument;
-  const auto length = receive_datagram(source, room, timeout, gathering);
+  const auto length = receive_datagram(source, room, limit, gathering);
   if (!length) return length;
   packet.received = true;
   auto* bytes = reinterpret_cast<unsigned char*>(room.data());

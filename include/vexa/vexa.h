@@ -2,8 +2,10 @@
 #pragma once
 
 #include "vexa/audio_info.h"
+#include "vexa/cancel.h"
 #include "vexa/common_types.h"
 #include "vexa/edge_storage_info.h"
+#include "vexa/failure.h"
 #include "vexa/file_logger.h"
 #include "vexa/frame_facts.h"
 #include "vexa/image_info.h"
@@ -17,7 +19,9 @@
 #include "vexa/runtime.h"
 #include "vexa/simple_lock.h"
 #include "vexa/statistics.h"
+#include "vexa/stream_choice.h"
 #include "vexa/system_info.h"
+#include "vexa/trace.h"
 #include "vexa/vexa_common.h"
 #include "vexa/vexa_variants.h"
 #include "vexa/video_info.h"

@@ -15,7 +15,11 @@ constexpr std::chrono::milliseconds kKeyPicturePatience{200};
 constexpr std::size_t kRestartProof = 3;
 
 /// 1.2 s in ticks.
-std::int64_t most_age(int clock_rate) { return static_cast<std::int64_t>(clock_rate) * 12 / 10; }
+constexpr std::int64_t most_age(int clock_rate) { return static_cast<std::int64_t>(clock_rate) * 12 / 10; }
+
+/// Faster than the clock of any camera. A rate beyond it, which a description may name, would take a restart for a
+/// latecomer: 1.2 s of it are half of all timestamps and more.
+constexpr int kFastestClock = 1'000'000;
 
 }  // namespace
 
@@ -78,7 +82,7 @@ bool PacketCollector::follows_last_used(std::uint16_t sequence) const {
 // A packet of a picture that was given up: a camera that restarts is not that close to its former timestamps.
 bool PacketCollector::is_latecomer(const SPacketInfo& packet, int clock_rate) const {
   const std::uint32_t age = last_used_timestamp_ - packet.timestamp;
-  return age != 0 && age <= most_age(clock_rate);
+  return age != 0 && age <= most_age(std::min(clock_rate, kFastestClock));
 }
 
 // Packets that go on behind the last one used are a camera that began its sequence again.

@@ -17,10 +17,11 @@ using Instant = PacketCollector::Instant;
 /// A collector on a clock of its own, and what it handed out.
 class Collection {
  public:
-  explicit Collection(const PictureRules& rules = kH264Rules) : collector_(packets_, rules) {}
+  explicit Collection(const PictureRules& rules = kH264Rules, int clock_rate = ModelStream::kClockRate)
+      : collector_(packets_, rules), clock_rate_(clock_rate) {}
 
   void arrive(const SPacketInfo& packet) {
-    collector_.add(packet, ModelStream::kClockRate, now_);
+    collector_.add(packet, clock_rate_, now_);
     ++given_;
     expect_counted();
     drain();
@@ -78,6 +79,7 @@ class Collection {
 
   std::vector<SPacketInfo> packets_;
   PacketCollector collector_;
+  const int clock_rate_;
   Instant now_{};
   std::uint64_t given_ = 0;
   std::vector<std::uint32_t> shown_;
@@ -426,6 +428,20 @@ INSTANTIATE_TEST_SUITE_P(
       std::erase_if(name, [](char c) { return c == ' ' || c == ','; });
       return name;
     });
+
+TEST(PacketCollector, ARestartIsFollowedWhateverClockRateTheCameraNames) {
+  for (const int rate : {-2147483647 - 1, 0, 1, 90000, 1'000'000, 100'000'000, 2147483647}) {
+    ModelStream before({.sequence = 30000, .timestamp = 2'000'000'000});
+    Collection collection(kH264Rules, rate);
+    const ModelPicture key = before.key_picture(3);
+    collection.arrive(key);
+    ModelStream after({.sequence = static_cast<std::uint16_t>(key.packets.back().sequence + 40000),
+                       .timestamp = timestamp_of(key) - (1U << 30)});
+    const ModelPicture new_key = after.key_picture(3);
+    collection.arrive(new_key);
+    EXPECT_EQ(collection.shown().back(), timestamp_of(new_key)) << rate;
+  }
+}
 
 TEST(PacketCollector, ARestartThatBeginsWithAKeyPictureLosesNoPictureOfIt) {
   ModelStream before({.sequence = 30000, .timestamp = 1'000'000'000});
