@@ -22,8 +22,9 @@ constexpr std::chrono::milliseconds kLeastReading{100};
 
 Result<std::optional<PacketRunPlace>> PictureReader::next() {
   ledger_.use_socket(source_.socket.socket);
-  chronicle_.tend_control(source_.clock_rate, Clock::now());
-  const auto give_up = Clock::now() + std::max(std::chrono::milliseconds(source_.timeout), kLeastReading);
+  const auto begin = Clock::now();
+  chronicle_.tend_control(source_.clock_rate, begin);
+  const auto give_up = begin + std::max(std::chrono::milliseconds(source_.timeout), kLeastReading);
   for (;;) {
     const auto now = Clock::now();
     if (const auto place = rtp_.collector.next_picture(now)) return place;
@@ -32,6 +33,7 @@ Result<std::optional<PacketRunPlace>> PictureReader::next() {
     const auto deadline = rtp_.collector.deadline();
     int until_look = deadline ? milliseconds_until(*deadline) : source_.timeout;
     if (source_.errand) until_look = std::min(until_look, std::max(milliseconds_until(source_.errand->deadline), 0));
+    if (until_look < source_.timeout) ledger_.about_to_wait();
     // A look at what stands complete falls due before the read would time out: that is no silence of the camera's.
     if (until_look < source_.timeout && !packet_waits(until_look)) {
       if (errand_is_due()) return std::optional<PacketRunPlace>();
