@@ -4,7 +4,7 @@
 #include <cerrno>
 #include <chrono>
 
-#include "runtime/base/within_memory.h"
+#include "runtime/base/result.h"
 #include "transport/wait_budget.h"
 
 namespace vexa {

@@ -8,7 +8,7 @@
 #include <chrono>
 
 #include "runtime/base/deadline.h"
-#include "runtime/base/within_memory.h"
+#include "runtime/base/result.h"
 
 namespace vexa {
 namespace {

@@ -2,7 +2,7 @@
 #include "vexa/waiting.h"
 
 #include "device/driver_state.h"
-#include "runtime/base/within_memory.h"
+#include "runtime/base/result.h"
 
 namespace vexa {
 
