@@ -1,5 +1,5 @@
 // A network camera in software: HTTP commands and RTSP/RTP video, with a journal of what it was asked and faults on
-// demand. It shares no code with the driver library, so that each checks the other.
+// demand. On the wire it shares no code with the driver library, so that each checks the other.
 #ifndef VIRTUAL_CAMERA_VIRTUAL_CAMERA_H_
 #define VIRTUAL_CAMERA_VIRTUAL_CAMERA_H_
 

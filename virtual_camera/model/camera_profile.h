@@ -125,9 +125,10 @@ struct CameraProfile {
   [[nodiscard]] const OfferedCodec* codec(std::string_view word) const;
 };
 
-// The profile, or what is wrong: "FILE:LINE: KEY: TEXT". `file` stands in that text only.
-[[nodiscard]] std::variant<CameraProfile, std::string> parse_camera_profile(std::string_view text,
+// The profile, or why the library's reader refuses it: "FILE:LINE: KEY: TEXT". `file` stands in that text only.
+[[nodiscard]] std::variant<CameraProfile, std::string> parse_camera_profile(const std::string& text,
                                                                             const std::string& file);
+// Of a file, or of the name of an installed profile (without "/" and ".json").
 [[nodiscard]] std::variant<CameraProfile, std::string> load_camera_profile(const std::string& path);
 
 }  // namespace vexa::camera
