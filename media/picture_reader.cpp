@@ -28,7 +28,7 @@ Result<std::optional<PacketRunPlace>> PictureReader::next() {
     if (now > give_up || source_.is_stopped()) return std::optional<PacketRunPlace>();
     const auto deadline = rtp_.collector.deadline();
     const int until_look = deadline ? milliseconds_until(*deadline) : source_.timeout;
-    // A look at what stands complete falls due before the read would time out: that is no silence of the camera's.
+    // The collector has to be asked again before the read would time out: that is no silence of the camera.
     if (until_look < source_.timeout && !packet_waits(until_look)) continue;
     if (const auto received = receive(source_.timeout); !received) return received.failure();
   }
@@ -62,7 +62,7 @@ Result<int> PictureReader::receive(int timeout) {
   rtp_.ring.written(static_cast<std::uint32_t>(*length), rtp_.overwritten);
   if (!rtp_.overwritten.empty()) rtp_.collector.drop_overwritten(rtp_.overwritten);
   if (packet.length < kRtpHeaderSize || !rtp_.takes(packet)) return length;
-  // Its bytes are its own before it is listed: should memory run out in between, it is lost like one on the wire.
+  // The ring keeps its bytes before it is listed: should memory run out in between, it is lost like one on the wire.
   rtp_.ring.keep(packet);
   if (!rtp_.collector.add(packet, source_.clock_rate, Clock::now())) rtp_.ring.take_back();
   return length;

@@ -23,10 +23,10 @@ using vexa::debug_line;
 using vexa::ErrorText;
 using vexa::FileHandle;
 
-/// A null path counts as the empty one, which names nothing.
+/// A null path counts as the empty one, which names no file.
 const char* or_empty(const char* path) { return path == nullptr ? "" : path; }
 
-/// A function's result: 1 when `result` is 0; else 0, and a line that tells `what` failed on `path`.
+/// A function's result: 1 when `result` is 0; else 0, and a line that reports `what` failed on `path`.
 int done_or_told(int result, const char* what, const char* path) {
   if (result == 0) return 1;
   debug_line("%s %s: %s", what, path, ErrorText(errno).c_str());
@@ -152,7 +152,7 @@ std::uint32_t GetFileSize(typedHandle* h, unsigned long* high) {
     debug_line("GetFileSize fstat: %s", ErrorText(errno).c_str());
     return INVALID_FILE_SIZE;
   }
-  // Kept: the size is cut to its low half; the high half is always told as 0.
+  // Kept: the size is cut to its low half; the high half is always reported as 0.
   if (high != nullptr) *high = 0;
   return static_cast<std::uint32_t>(status.st_size);
 }

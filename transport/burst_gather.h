@@ -8,10 +8,10 @@
 
 namespace vexa {
 
-/// A thread that wakes for every datagram pays for the wake-up, not for the work. On a stream that trickles, a nap of
-/// up to 2 ms after the first datagram makes one wake-up of many; on a stream that comes in bursts, the burst is there
-/// when the thread wakes, and the nap is a wake-up too many. This one measures both: datagrams taken for each wake-up
-/// at once and after a nap. The better way is taken, the other tried now and then.
+/// A thread that wakes for each datagram pays for the wake-up more than for the work. On a stream that trickles, a nap
+/// of up to 2 ms after the first datagram makes one wake-up of many; on a stream that comes in bursts, the burst is
+/// there when the thread wakes, and the nap is a wake-up too many. This one measures both: datagrams taken for each
+/// wake-up at once and after a nap. The better way is taken, the other tried now and then.
 class BurstGather {
  public:
   static constexpr std::chrono::microseconds kLongest{2000};

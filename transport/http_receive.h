@@ -8,10 +8,10 @@
 
 namespace vexa {
 
-// Time-outs are milliseconds; 0 or less looks once. The sockets stay the caller's.
+// Time-outs are in milliseconds; 0 or less does not wait. The sockets stay the caller's.
 
-/// Takes a header off the socket and nothing else, so that the body stays for its reader: the header's length; 0 when
-/// none came in time or it does not fit into `room`.
+/// Takes a header off the socket and no byte more, so that the body stays for its reader: the header's length; 0 when
+/// none came in time or it does not fit into `room`. Waits twice: for the first byte and for the rest.
 Result<int> receive_header(int socket, std::span<char> room, int timeout);
 
 /// One read: the bytes received; 0 when none came in time or the camera has closed.

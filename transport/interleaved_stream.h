@@ -9,7 +9,7 @@
 
 namespace vexa {
 
-/// Fills `room`, waiting `timeout` milliseconds in all. Reads first and waits only when nothing is there.
+/// Fills `room`, waiting `timeout` milliseconds in all. Reads first and waits only when no byte is there.
 Result<> receive_exactly(int socket, std::span<char> room, int timeout);
 
 struct InterleavedPacket {

@@ -24,7 +24,7 @@ void nap(std::chrono::microseconds length) {
   nanosleep(&duration, nullptr);  // a signal may cut it short: the datagrams are read all the same
 }
 
-/// What is there after a nap in the middle of a picture; as receive_waiting.
+/// Reads after a nap in the middle of a picture; returns as receive_waiting does.
 ssize_t receive_after_nap(int socket, std::span<char> room, Gathering gathering) {
   if (gathering.gather == nullptr || !gathering.in_picture) return -1;
   const std::chrono::microseconds pause = gathering.gather->goes_on();

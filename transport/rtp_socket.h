@@ -10,13 +10,13 @@
 
 namespace vexa {
 
-/// How a stream's reader lets datagrams gather.
+/// How long a stream's reader lets datagrams gather before it reads them.
 struct Gathering {
   BurstGather* gather = nullptr;  ///< null: reads each datagram as it comes
   bool in_picture = false;        ///< some packets of a picture are there and the others are on their way
 };
 
-/// Reads the next datagram into `room`: its length. Reads first and waits only when nothing is there, so that a
+/// Reads the next datagram into `room`: its length. Reads first and waits only when none is there, so that a
 /// datagram costs one system call while data keep coming. Fails without a text when the stream is to end.
 Result<int> receive_datagram(StoppableSocket source, std::span<char> room, int timeout, Gathering gathering);
 

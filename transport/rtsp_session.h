@@ -25,7 +25,7 @@ struct StreamClock {
   int& rtp_rate;  ///< ticks a second
 };
 
-/// Takes what `text` gives of the range clock; false when it is not understood to its end.
+/// Stores the range clock that `text` gives, as far as it can be read; false when that is not to its end.
 bool take_range_clock(std::string_view text, StreamClock clock);
 
 /// Takes an answer's header off the socket into `room`, and of what follows as much as has come: its length.
@@ -34,7 +34,7 @@ Result<int> receive_rtsp_answer(int socket, std::span<char> room, int timeout);
 /// Binds a datagram socket to a port of its own: the port. The socket stays the caller's, also on failure.
 Result<int> bind_media_socket(int socket);
 
-/// In the place of a media port: RTP comes inside the connection.
+/// Instead of a media port: RTP comes inside the connection.
 inline constexpr int kInterleaved = 0;
 
 /// A datagram socket for media; invalid with errno on failure.
@@ -46,8 +46,8 @@ struct RtspServer {
   sockaddr_in address;
 };
 
-/// Makes the requests of one session. Its state is in fields of its owner, which outlive it; used by the thread that
-/// owns them. Every request is traced to standard output.
+/// Makes the requests of one session. Holds no socket of its own between calls: its state is in fields of the driver,
+/// which outlive it. Used by the thread that owns these fields. Each request is traced to standard output.
 class RtspSession {
  public:
   struct Fields {
@@ -59,7 +59,8 @@ class RtspSession {
 
   explicit RtspSession(Fields fields) : fields_(fields) {}
 
-  /// What every open begins with. `timeout` in milliseconds is for single reads and sends, in whole seconds.
+  /// The first step of each open: resolves the host and makes the socket. `timeout` (milliseconds, used in whole
+  /// seconds) is that of single reads and sends.
   Result<RtspServer> begin(const std::string& host, int port, int timeout);
 
   struct Opening {
@@ -74,7 +75,7 @@ class RtspSession {
   /// inside the connection and taken over UDP.
   Result<int> open(const RtspServer& server, const Opening& opening);
 
-  /// One GET_PARAMETER, whose answer is taken off the socket and not read.
+  /// One GET_PARAMETER, whose answer is taken off the socket and ignored.
   Result<> keep_alive(int socket);
 
   /// One TEARDOWN. `timeout` is that of the answer.

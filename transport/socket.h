@@ -36,10 +36,10 @@ struct StoppableSocket {
 /// One send; true when all bytes went. A peer that has closed gives EPIPE, never a signal.
 bool send_once(int socket, const char* bytes, std::size_t length);
 
-/// What waits at the socket, one read; -1 with errno, EAGAIN when nothing does. A signal does not end it.
+/// One read of what waits at the socket; -1 with errno, EAGAIN when no byte does. A signal does not end it.
 ssize_t receive_waiting(int socket, char* buffer, std::size_t length);
 
-/// Shuts the socket down both ways and closes it; errors and -1 are passed over.
+/// Shuts the socket down both ways and closes it; errors and -1 are ignored.
 void shutdown_and_close(int socket);
 
 /// Set and clear O_NONBLOCK; false with errno on failure.

@@ -19,7 +19,7 @@ int WaitBudget::wait_writable(int descriptor) const { return wait(descriptor, PO
 int WaitBudget::wait_readable_unless(int descriptor, int stop) const { return wait(descriptor, POLLIN, stop); }
 
 int WaitBudget::wait(int descriptor, short events, int stop) const {
-  // Safe: poll would pass over -1 and wait in vain; a closed socket is an error at once.
+  // Safe: poll would ignore -1 and wait in vain; a closed socket is an error at once.
   if (descriptor < 0) {
     errno = EBADF;
     return -1;
@@ -31,7 +31,7 @@ int WaitBudget::wait(int descriptor, short events, int stop) const {
     if (count <= 0) return count;
     if ((entries[1].revents & POLLIN) != 0) return 0;
     if (entries[0].revents == 0) {
-      entries[1].fd = -1;  // closed or broken: it says nothing of stopping, now or later
+      entries[1].fd = -1;  // closed or broken: it cannot signal a stop, now or later
       continue;
     }
     if ((entries[0].revents & POLLNVAL) != 0) {

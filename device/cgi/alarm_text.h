@@ -21,7 +21,7 @@ SLibDPinInfo pin_of(std::int32_t number, ELibDPinType type, bool enabled = true)
 /// Appends the inputs, then the outputs; both are counted from 1.
 void append_pins(const SLibDFixedIoBoxInfo& fixed, std::vector<SLibDPinInfo>& pins);
 
-/// The number of the first detector: the one behind the inputs.
+/// The number of the first detector: the one after the inputs.
 std::int32_t first_detector_number(const SLibDFixedIoBoxInfo& fixed);
 
 /// Whether the detector of `key` ("TamperingFunc=") is switched on; also true when the answer does not tell.

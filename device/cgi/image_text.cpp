@@ -17,7 +17,7 @@ constexpr struct {
   const char* word;
 } kExposureWords[] = {{kFullAuto, "full"}, {kShutterPriority, "shutter"}, {kIrisPriority, "iris"}};
 
-/// The value behind the first one that equals `current`.
+/// The value after the first one that equals `current`.
 template <typename Iterator>
 std::optional<int> value_behind(Iterator begin, Iterator end, int current) {
   const Iterator found = std::find_if(begin, end, [current](const auto& step) { return step.value == current; });

@@ -25,7 +25,7 @@ inline constexpr Word<ELibDViewDRMode> kViewDrWords[] = {{LIBD_VIEWDR_OFF, "off"
 
 inline constexpr Word<ELibIRIlluminatorMode> kIlluminatorWords[] = {{LIB_IR_OFF, "off"}, {LIB_IR_DAYNIGHT, "daynight"}};
 
-/// What sets a day/night mode, behind "DayNightMode=".
+/// What sets a day/night mode, after "DayNightMode=".
 inline constexpr Word<ELibDDayNightType> kDayNightRequests[] = {{LIBD_DAYNIGHT_AUTO, "auto"},
                                                                 {LIBD_DAYNIGHT_DAY, "manual&DayNight=off"},
                                                                 {LIBD_DAYNIGHT_NIGHT, "manual&DayNight=on"}};

@@ -22,7 +22,7 @@ struct CameraPosition {
   bool moving = false;
 };
 
-/// Reads "CamPos: " with three flags and three numbers, and "M" behind them while the camera moves.
+/// Reads "CamPos: " with three flags and three numbers, and "M" after them while the camera moves.
 std::optional<CameraPosition> read_position_text(const std::string& text);
 
 /// The way from `offset` to `position` in thousandths of the unit of `angle_range`, which `span` units turn through;

@@ -8,7 +8,7 @@
 namespace vexa {
 namespace {
 
-/// Takes what stands before the next comma; `rest` is then what follows it, nothing behind the last piece.
+/// Takes what stands before the next comma; `rest` is then what follows it, nothing after the last piece.
 std::string_view take_piece(std::optional<std::string_view>& rest) {
   if (!rest) return {};
   const std::string_view piece = text_before(*rest, ',');

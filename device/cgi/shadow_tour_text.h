@@ -11,13 +11,13 @@ namespace vexa {
 /// Whether `number` is one of `count` shadow tours that have a letter.
 bool is_shadow_tour(int number, int count);
 
-/// What plays one shadow tour and none of the others, behind the "?".
+/// What plays one shadow tour and none of the others, after the "?".
 std::string shadow_tour_start(int number, int count);
 
 /// Reads the shadow tours 1 to `count`.
 SLibDShadowTourInfo read_shadow_tours(const std::string& answer, int count);
 
-/// What sets all shadow tours, behind the "?"; nothing when the record is not for exactly `count` of them or more than
+/// What sets all shadow tours, after the "?"; nothing when the record is not for exactly `count` of them or more than
 /// one is on.
 std::optional<std::string> shadow_tour_request(const SLibDShadowTourInfo& info, int count);
 

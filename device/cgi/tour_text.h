@@ -19,10 +19,10 @@ const char* tour_letter(int number);
 /// "on" or "off".
 const char* switch_word(bool on);
 
-/// True when the answer has the word "on" behind the key.
+/// True when the answer has the word "on" after the key.
 bool is_switched_on(std::string_view answer, std::string_view key);
 
-/// The number behind the key; nothing when the key or its value is missing.
+/// The number after the key; nothing when the key or its value is missing.
 std::optional<int> answered_number(std::string_view answer, std::string_view key);
 
 /// The seconds until tours resume, by the two keys; 0 when resuming is off or the time is missing.
@@ -37,7 +37,7 @@ std::optional<std::string> tour_sequence_text(const std::vector<int>& sequence, 
 /// Reads the tours 1 to `tour_count`.
 SLibDCameraTourInfo read_camera_tours(const std::string& answer, int tour_count);
 
-/// What sets all tours, behind the "?"; nothing when the record is not for exactly `tour_count` tours, a sequence is
+/// What sets all tours, after the "?"; nothing when the record is not for exactly `tour_count` tours, a sequence is
 /// missing or more than one tour is on.
 std::optional<std::string> camera_tour_request(const SLibDCameraTourInfo& info, int tour_count, int preset_count);
 

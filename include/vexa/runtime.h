@@ -25,7 +25,7 @@ constexpr std::int32_t HANDLE_TYPE_THREAD = 1;  ///< made by _beginthreadex
 constexpr std::int32_t HANDLE_TYPE_FILE = 2;    ///< made by CreateFile
 constexpr std::int32_t HANDLE_TYPE_FIND = 3;    ///< made by FindFirstFile
 
-// Kept: WAIT_TIMEOUT is not the Windows number; hosts were built with this one.
+// Kept: WAIT_TIMEOUT is not the Windows number; hosts compare with this one.
 constexpr unsigned long INFINITE = 0xFFFFFFFFUL;      ///< a time-out without limit
 constexpr unsigned long WAIT_TIMEOUT = 0xFFFFFFFEUL;  ///< a wait's result: nothing was signalled in time
 constexpr unsigned long WAIT_FAILED = 0xFFFFFFFFUL;   ///< a wait's result: it could not wait

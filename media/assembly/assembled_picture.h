@@ -1,4 +1,4 @@
-// What the assembly of a picture's packets comes to.
+// The result of assembling a picture's packets.
 #pragma once
 
 #include <algorithm>
@@ -22,7 +22,7 @@ struct AssembledPicture {
   std::int32_t frame_type = -1;  ///< an ELibDVideoFrameType value
 };
 
-/// What stands behind the RTP header.
+/// The packet's bytes after its RTP header.
 inline Bytes payload_of(const SPacketInfo& packet) {
   return Bytes(packet.data, packet.length).subspan(std::min<std::size_t>(kRtpHeaderSize, packet.length));
 }

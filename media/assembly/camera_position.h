@@ -1,4 +1,4 @@
-// The text in a picture's user data that tells where the camera looks.
+// The text in a picture's user data that holds the camera's position.
 #pragma once
 
 #include <optional>
@@ -8,7 +8,7 @@
 
 namespace vexa {
 
-/// Where the text of user data begins, counted from the unit's start code: behind a SEI unit's types and sizes and the
+/// Where the text of user data begins, counted from the unit's start code: after a SEI unit's types and sizes and the
 /// start code of an MPEG-4 user-data unit.
 constexpr std::size_t kSeiTextOffset = 11;
 constexpr std::size_t kMpeg4UserDataTextOffset = 4;

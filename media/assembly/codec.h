@@ -1,4 +1,4 @@
-// What the driver must know of a video codec, one row each.
+// What the driver has to know about each video codec: one row a codec.
 #pragma once
 
 #include <cstdint>

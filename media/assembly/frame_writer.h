@@ -1,4 +1,4 @@
-// A frame buffer that is filled from its start and never past its end.
+// A frame buffer that is filled from its start and never beyond its end.
 #pragma once
 
 #include <algorithm>

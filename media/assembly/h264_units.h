@@ -8,11 +8,11 @@
 
 namespace vexa {
 
-/// Writes the picture into `frame`, a 4-byte start code before each NAL unit. The last unit that tells a type gives the
+/// Writes the picture into `frame`, a 4-byte start code before each NAL unit. The last unit that has a type gives the
 /// frame's. Packets without a payload add nothing.
 AssembledPicture assemble_h264(PacketRun packets, std::span<unsigned char> frame);
 
-/// The packet's payload when it is a single unit of supplemental information (SEI), else nothing.
+/// The packet's payload when it is a single unit of supplemental information (SEI), else an empty one.
 Bytes supplemental_information(const SPacketInfo& packet);
 
 /// A key picture has an IDR slice. It opens with the type of its first NAL unit.

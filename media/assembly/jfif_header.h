@@ -14,7 +14,7 @@ struct JpegShape {
   std::uint16_t restart_interval;  ///< 0: no DRI
 };
 
-/// Appends SOI, DQT, DRI, SOF0, DHT and SOS (ITU-T T.81). `fits` of the writer tells whether there was room.
+/// Appends SOI, DQT, DRI, SOF0, DHT and SOS (ITU-T T.81). `fits` of the writer is false when there was no room.
 void append_jfif_header(FrameWriter& out, const JpegShape& shape, const QuantisationTables& tables);
 
 }  // namespace vexa

@@ -19,7 +19,7 @@ struct QuantisationTables {
 QuantisationTables quantisation_tables(std::uint8_t q);
 
 struct HuffmanTable {
-  unsigned char destination;  ///< as DHT says it: the class (0 DC, 1 AC) in the high half, the number in the low
+  unsigned char destination;  ///< as in DHT: the class (0 DC, 1 AC) in the high half, the number in the low
   std::array<unsigned char, 16> code_counts;
   Bytes symbols;
 };

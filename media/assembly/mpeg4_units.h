@@ -8,10 +8,10 @@
 
 namespace vexa {
 
-/// Writes the picture into `frame`. Its fourth byte, the one behind the first start code, tells the frame's type.
+/// Writes the picture into `frame`. Its fourth byte, the one after the first start code, gives the frame's type.
 AssembledPicture assemble_mpeg4(PacketRun packets, std::span<unsigned char> frame);
 
-/// A key picture is led by a visual object sequence or a group of pictures.
+/// A key picture begins with a visual object sequence or a group of pictures.
 extern const PictureRules kMpeg4Rules;
 
 }  // namespace vexa

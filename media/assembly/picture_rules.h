@@ -1,4 +1,4 @@
-// What the collection of pictures must know of a codec.
+// What the packet collector has to know about a codec.
 #pragma once
 
 #include <cstdint>
@@ -22,8 +22,8 @@ struct PictureRules {
   std::uint8_t (*opening)(const SPacketInfo& first);
   /// The packet holds what key pictures of this camera open with (parameter sets).
   bool (*is_preamble)(const SPacketInfo& packet);
-  /// Whether a key picture that opens this way is whole at its front, as far as it tells by itself; `preamble_seen`
-  /// says that the camera sends preambles.
+  /// Whether a key picture that opens this way is whole at its front, judged by itself alone; `preamble_seen`:
+  /// the camera sends preambles.
   bool (*opens_whole)(PacketRun run, bool preamble_seen);
 };
 

@@ -1,4 +1,4 @@
-// The packets that were used lately, so that a duplicate is known from a restarted sequence.
+// The packets that were used lately: they distinguish a duplicate from a restarted sequence.
 #pragma once
 
 #include <array>

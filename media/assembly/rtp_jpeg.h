@@ -15,11 +15,11 @@ constexpr std::size_t kJpegFirstPacketRoom = 4096;
 /// Whether the payload begins with a camera's block of user data instead of the JPEG header.
 bool leads_with_user_data(Bytes payload);
 
-/// Writes the header and the scan data of the picture's first payload into `out`: their length. Nothing for a payload
+/// Writes the header and the scan data of the picture's first payload into `out`: their length. Nullopt for a payload
 /// cut short, tables of another length than two, or when there is no room.
 std::optional<std::uint32_t> begin_jfif(std::span<unsigned char> out, Bytes payload);
 
-/// The picture: `beginning`, as begin_jfif made it, and what `others`, the packets behind the first, go on with.
+/// The picture: `beginning`, as begin_jfif made it, and the scan data of `others`, the packets after the first.
 AssembledPicture assemble_jpeg(Bytes beginning, PacketRun others, std::span<unsigned char> frame);
 
 /// Every picture is a key picture. One that opens at fragment offset 0 is whole at its front.

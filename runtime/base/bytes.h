@@ -9,7 +9,7 @@ namespace vexa {
 
 using Bytes = std::span<const unsigned char>;
 
-/// Reads big-endian numbers forward. Past the end every read gives 0 and `ok` stays false.
+/// Reads big-endian numbers forward. Beyond the end each read returns 0, and `ok` stays false.
 class ByteReader {
  public:
   explicit ByteReader(Bytes bytes) : bytes_(bytes) {}

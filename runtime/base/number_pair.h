@@ -11,8 +11,8 @@ struct NumberPair {
   int second;
 };
 
-/// The two numbers that a text begins with, as scanf reads "%d,%d": blanks and a sign may stand before each, the comma
-/// right behind the first, what follows the second is passed over. Nothing when either is missing. Values beyond int
+/// The two numbers that a text begins with, as scanf reads "%d,%d": blanks and a sign may come before each, the comma
+/// right after the first, what follows the second is ignored. Nullopt when either is missing. Values beyond int
 /// become its limits.
 std::optional<NumberPair> leading_pair(const std::string& text);
 

@@ -1,4 +1,4 @@
-// What a step that can fail returns: its value, or why it failed.
+// The result of a step that can fail: its value, or the reason why it failed.
 #pragma once
 
 #include <optional>
@@ -10,7 +10,7 @@
 
 namespace vexa {
 
-/// Why a step failed. The text is for people and its own; no decision is made by it.
+/// The reason why a step failed. Owns its text, which is for people: no decision is made by it.
 struct Failure {
   ELibDReturnCode code = LIBD_FAILED;
   std::string text;  ///< empty where there is nothing to report but the failure itself

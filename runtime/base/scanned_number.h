@@ -9,11 +9,11 @@
 namespace vexa {
 
 struct ScannedNumber {
-  std::uint32_t value;  ///< the largest value stands for any larger one and for every negative one
+  std::uint32_t value;  ///< larger and negative numbers become the largest value
   std::size_t length;   ///< characters read, spaces and sign among them
 };
 
-/// Reads spaces, a sign and digits; sign and digits are `width` characters at most. Nothing when there is no digit.
+/// Reads spaces, a sign and digits; sign and digits are `width` characters at most. Nullopt when there is no digit.
 std::optional<ScannedNumber> scan_number(std::string_view text, std::size_t width);
 
 }  // namespace vexa

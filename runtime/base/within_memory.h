@@ -1,4 +1,4 @@
-// Where running out of memory ends.
+// The one place that catches running out of memory.
 #pragma once
 
 #include <new>
@@ -6,7 +6,7 @@
 
 namespace vexa {
 
-/// Runs `work`; false when memory ran out in it. What it had made until then has undone itself.
+/// Runs `work`; false when memory ran out in it. Whatever it had made until then is destroyed.
 template <typename Work>
 [[nodiscard]] bool within_memory(Work&& work) {
   try {

@@ -6,7 +6,7 @@
 
 namespace vexa {
 
-/// The bytes that follow, as "DataLen:" announces them; nothing when it does not, or announces less than none.
+/// The bytes that follow, as "DataLen:" announces them; nullopt when it does not, or announces a negative number.
 std::optional<int> announced_length(std::string_view part_header);
 
 }  // namespace vexa

@@ -8,7 +8,7 @@
 namespace vexa {
 
 struct RangeClock {
-  bool understood = false;              ///< the clock came to its end
+  bool understood = false;              ///< the clock was read to its end
   std::optional<std::int64_t> seconds;  ///< since 1970-01-01 UTC, once a "." was reached, also when not understood
   int micros = 0;                       ///< with `understood`
 };

@@ -1,4 +1,4 @@
-// What the driver takes from a camera's RTSP answers and their SDP.
+// The values that the driver reads from a camera's RTSP answers and their SDP.
 #pragma once
 
 #include <cstddef>
@@ -7,11 +7,11 @@
 
 namespace vexa {
 
-/// Whether an answer's header end has come. `looked_at` is what the looks so far have put behind one another, each from
-/// the answer's beginning; the latest look begins at `latest`.
+/// Whether an answer's header end has come. `looked_at` is what the peeks so far have put after one another, each from
+/// the answer's beginning; the latest peek begins at `latest`.
 bool rtsp_header_complete(std::string_view looked_at, std::size_t latest);
 
-/// What the description says of the RTP clock.
+/// The description's rate of the RTP clock.
 struct RtpClock {
   enum class Found { kRate, kNoRtpmap, kNoSlash, kNoNumber };
   Found found;
@@ -24,7 +24,7 @@ RtpClock rtp_clock(std::string_view answer);
 /// What follows the first "clock=" of a DESCRIBE answer.
 std::optional<std::string_view> range_clock_text(std::string_view answer);
 
-/// The session number of a SETUP answer; nothing when it is missing or no decimal number.
+/// The session number of a SETUP answer; nullopt when it is missing or no decimal number.
 std::optional<int> session_number(std::string_view answer);
 
 }  // namespace vexa
