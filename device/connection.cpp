@@ -1,4 +1,4 @@
-// How the camera is reached.
+// The connection settings.
 #include <utility>
 
 #include "device/driver_state.h"

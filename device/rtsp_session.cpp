@@ -25,7 +25,7 @@ StreamClock DriverState::stream_clock() {
   return {driver.m_RangeClockSeconds, driver.m_RangeClockMicros, driver.m_RtpClockRate};
 }
 
-// Kept: the media socket stays open when the open fails after it; its caller finds out by it how far the open came.
+// Kept: the media socket stays open when the open fails after it; its caller sees by it how far the open came.
 Result<int> DriverState::open_rtp_over_udp(const std::string& url, int port) {
   errors.clear();
   const SLibDConnectionInfo info = connection.copy();
@@ -121,7 +121,7 @@ bool CVexaCommon::InitEdgeStorageKeepAlivePeriod() {
 
 void CVexaCommon::rtp_over_udp_close() {
   if (m_RtspSocket == -1 && m_State->stream_socket() == -1) return;
-  // Kept: the switch that recordings are played with holds for live sessions too.
+  // Kept: the host's switch for recordings holds for live sessions too.
   if (m_State->wants_teardown()) {
     m_State->errors.clear();
     m_State->errors.run([&]() -> vexa::Outcome {

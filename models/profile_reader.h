@@ -10,7 +10,7 @@
 
 namespace vexa::models {
 
-/// `root` obeys the schema; what the schema cannot say is checked here. The profile has no name yet.
+/// `root` obeys the schema; what the schema cannot express is checked here. The profile has no name yet.
 [[nodiscard]] std::variant<Profile, Complaint> read_profile(const Node& root);
 
 }  // namespace vexa::models

@@ -1,4 +1,4 @@
-// The profiles' schema as text. The build makes its .cpp from model_profile.schema.json, so both always say the same.
+// The profiles' schema as text. The build makes its .cpp from model_profile.schema.json, so both are always the same.
 #ifndef MODELS_SCHEMA_TEXT_H_
 #define MODELS_SCHEMA_TEXT_H_
 

@@ -16,7 +16,7 @@ constexpr std::size_t kLodSettings = 17;
 constexpr std::size_t kMostNumbers = 4;
 constexpr std::size_t kSettingRequestRoom = 1024;
 
-/// What stands after the key of an item.
+/// What follows the key of an item.
 struct ItemValue {
   std::string_view word;
   std::array<std::int32_t, kMostNumbers> numbers{};

@@ -125,7 +125,7 @@ void InputPartReader::read_tampering() {
   auto text = find("Tampering");
   if (!text) return;
   step_past(kAfterTampering);
-  // Kept: the bits after it move up although the item may have no value.
+  // Kept: the bits that follow move up although the item may have no value.
   ++number_;
   const auto value = take_value(*text);
   if (!value) return;

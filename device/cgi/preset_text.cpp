@@ -8,7 +8,7 @@
 namespace vexa {
 namespace {
 
-/// Takes what stands before the next comma; `rest` is then what follows it, nothing after the last piece.
+/// Takes the piece before the next comma; `rest` is then what follows it, nullopt after the last piece.
 std::string_view take_piece(std::optional<std::string_view>& rest) {
   if (!rest) return {};
   const std::string_view piece = text_before(*rest, ',');
@@ -20,7 +20,7 @@ std::string_view take_piece(std::optional<std::string_view>& rest) {
 
 std::vector<SLibDPresetInfo> unnamed_presets(int count) {
   std::vector<SLibDPresetInfo> presets;
-  // Safe: a negative count is no size.
+  // Safe: a negative count becomes no size.
   if (count > 0) presets.resize(static_cast<std::size_t>(count));
   for (std::size_t i = 0; i < presets.size(); ++i) presets[i].index = static_cast<std::int32_t>(i);
   return presets;

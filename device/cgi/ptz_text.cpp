@@ -14,7 +14,7 @@ constexpr int kHostScale = 10000;
 constexpr int kContinuousDivisor = 100;
 constexpr int kWholeZoomStep = 4096;
 
-/// Cut to 16 bits in two's complement and widened back with its sign.
+/// The value cut to 16 bits in two's complement and widened back with its sign.
 int cut_to_16_bits(long long value) { return static_cast<std::int16_t>(static_cast<std::uint16_t>(value)); }
 
 // Counted in 64 bits throughout, so that no profile can overflow a product.
@@ -31,7 +31,7 @@ bool has_size(const SLibDResolutionInfo& picture) { return picture.width > 0 && 
 int continuous_speed(int speed) { return speed / kContinuousDivisor; }
 
 int move_speed(int speed, int largest) {
-  // Safe: kept where its sign can be turned, also under a largest speed that no camera has.
+  // Safe: limited so that its sign can be changed, also for a largest speed that no camera has.
   return held_between(share(std::abs(speed), largest), -std::numeric_limits<int>::max(),
                       std::numeric_limits<int>::max());
 }

@@ -18,7 +18,7 @@ constexpr std::size_t kTimeWidth = 6;
 
 bool ends_value(char c) { return c == ',' || static_cast<unsigned char>(c) < ' '; }
 
-/// Reads the items of a record forward. A key that is not there, or an item after which no further one can stand,
+/// Reads the items of a record forward. A key that is not there, or an item that no further one can follow,
 /// fails it for good.
 class RecordItems {
  public:
@@ -112,7 +112,7 @@ std::vector<SLibDEdgeStorageRecord> read_recordings(std::string_view answer) {
 
 int free_kilobytes(std::string_view answer) {
   std::optional<std::string_view> size = cgi_value(answer, "ASlot=Free space : ");
-  // Kept: the unit is not looked at; cameras tell kilobytes.
+  // Kept: the unit is ignored; cameras report kilobytes.
   return size ? std::max(take_int(*size).value_or(0), 0) : 0;
 }
 

@@ -22,7 +22,7 @@ const char* switch_word(bool on);
 /// True when the answer has the word "on" after the key.
 bool is_switched_on(std::string_view answer, std::string_view key);
 
-/// The number after the key; nothing when the key or its value is missing.
+/// The number after the key; nullopt when the key or its value is missing.
 std::optional<int> answered_number(std::string_view answer, std::string_view key);
 
 /// The seconds until tours resume, by the two keys; 0 when resuming is off or the time is missing.
@@ -31,14 +31,14 @@ int resume_time_of(std::string_view answer, std::string_view switch_key, std::st
 /// Appends the numbers of a sequence. An empty text appends none. False for a text without a comma.
 bool read_tour_sequence(const std::string& text, std::vector<int>& sequence);
 
-/// Writes a sequence, numbers cut to 7 characters; nothing for a negative number above the preset count.
+/// Writes a sequence, numbers cut to 7 characters; nullopt for a negative number above the preset count.
 std::optional<std::string> tour_sequence_text(const std::vector<int>& sequence, int preset_count);
 
 /// Reads the tours 1 to `tour_count`.
 SLibDCameraTourInfo read_camera_tours(const std::string& answer, int tour_count);
 
-/// What sets all tours, after the "?"; nothing when the record is not for exactly `tour_count` tours, a sequence is
-/// missing or more than one tour is on.
+/// The request, after its "?", that sets all tours; nullopt when the record is not for exactly `tour_count` tours, a
+/// sequence is missing or more than one tour is on.
 std::optional<std::string> camera_tour_request(const SLibDCameraTourInfo& info, int tour_count, int preset_count);
 
 }  // namespace vexa
