@@ -42,13 +42,13 @@ class BurstGather {
  private:
   static constexpr double kWakeupsOfANap = 2;
   static constexpr unsigned kTrialInterval = 32;
-  static constexpr double kNews = 1.0 / 8;
+  static constexpr double kSmoothing = 1.0 / 8;
   static constexpr std::size_t kLargeBurst = 65536;  // a third of the smallest usual socket buffer
   static constexpr std::size_t kSmallBurst = 16384;
 
   void finish_burst() {
     double& taken = napped_ ? taken_after_nap_ : taken_at_once_;
-    taken += (static_cast<double>(datagrams_) - taken) * kNews;
+    taken += (static_cast<double>(datagrams_) - taken) * kSmoothing;
     if (napped_) fit_nap();
     datagrams_ = 0;
     bytes_ = 0;

@@ -33,7 +33,7 @@ class VirtualCamera {
   VirtualCamera(const VirtualCamera&) = delete;
   VirtualCamera& operator=(const VirtualCamera&) = delete;
 
-  // Opens both ports. On failure returns false, and error() says why.
+  // Opens both ports. On failure returns false, and error() has the reason.
   [[nodiscard]] bool start();
   // Closes every connection and session. The journal and the sent log stay readable. Harmless when not running.
   void stop();
@@ -53,9 +53,9 @@ class VirtualCamera {
   [[nodiscard]] SettingsStore& settings();
   [[nodiscard]] AlarmScene& alarms();
   [[nodiscard]] Card& card();
-  // Where it looks now; nothing for a camera that does not know.
+  // Its present direction; none for a camera that does not know it.
   [[nodiscard]] std::optional<CameraPose> pose() const;
-  [[nodiscard]] PtzHead* ptz();  // null: nothing moves
+  [[nodiscard]] PtzHead* ptz();  // null: the camera does not move
   [[nodiscard]] Journal& journal();
   [[nodiscard]] SentLog& sent();
   [[nodiscard]] const PacketisedClip* clip() const;  // the clip streamed; valid after start(), null when none

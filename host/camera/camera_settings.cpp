@@ -19,7 +19,7 @@ Json size_or_null(int width, int height) {
 Json number_or_null(int number) { return number > 0 ? Json(number) : Json(nullptr); }
 
 // Asks getters and keeps the first failure that is more than a setting which the camera does not report. A failure ends
-// the command, so that no earlier one's reason is in the way.
+// the command, so that an earlier failure's reason is not shown.
 class SettingReader {
  public:
   explicit SettingReader(CLibraryDevice& device) : device_(device) {}

@@ -31,7 +31,7 @@ class Terminal {
 
   [[nodiscard]] bool shows_progress() const { return shows_progress_; }
   void silence_progress() { shows_progress_ = false; }
-  // Replaces the progress line; does nothing without a terminal.
+  // Replaces the progress line; has no effect without a terminal.
   void progress(std::string_view line);
   void clear_progress();
 

@@ -38,8 +38,8 @@ class RecordingMeter {
   [[nodiscard]] double mean_bit_rate() const;
 
   // Pictures that a stream of the stated rate has sent from the first one received until now; nullopt when no rate is
-  // stated. One picture may be on its way. A camera that runs slower than it says counts as losing pictures: an
-  // estimate.
+  // stated. One picture may not have arrived yet. A camera that runs slower than its settings counts as losing
+  // pictures: an estimate.
   [[nodiscard]] std::optional<std::uint64_t> expected_frames(Clock::time_point now) const;
   // Of those, the ones that did not come.
   [[nodiscard]] std::optional<std::uint64_t> missing_frames(Clock::time_point now) const;

@@ -67,7 +67,7 @@ struct SettingChanges {
   [[nodiscard]] bool of_stream() const { return codec || size || frame_rate || bit_rate || quality || rotation; }
 };
 
-// Reads "KEY=VALUE" texts, each key once; a refusal says what the key takes.
+// Reads "KEY=VALUE" texts, each key once; a refusal names the values that the key takes.
 [[nodiscard]] Result<SettingChanges> parse_changes(const std::vector<std::string>& texts);
 
 // "on" or "off".

@@ -13,7 +13,7 @@
 #include <vector>
 
 #include "tests/media/media_driver.h"
-#include "tests/media/video_ways.h"
+#include "tests/media/video_transports.h"
 #include "tests/support/own_address.h"
 #include "tests/support/process_state.h"
 #include "tests/support/temporary_folder.h"

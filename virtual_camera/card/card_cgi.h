@@ -10,7 +10,7 @@
 
 namespace vexa::camera {
 
-// "/command/search?Order=oldest", and "/command/edgestorage.cgi?delete=all" or "?DeletebyName=NAME"; nothing for any
+// "/command/search?Order=oldest", and "/command/edgestorage.cgi?delete=all" or "?DeletebyName=NAME"; none for any
 // other request.
 [[nodiscard]] std::optional<Answer> answer_card(const RequestHead& request, Card& card);
 

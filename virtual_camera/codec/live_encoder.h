@@ -32,7 +32,7 @@ struct EncodedPicture {
   bool key = false;
 };
 
-// Whether this build has encoders: those for machines without FFmpeg's libraries do not, and open() then says so.
+// Whether this build has encoders: builds without FFmpeg's libraries do not, and open() then reports it.
 [[nodiscard]] bool has_live_encoders();
 
 // Belongs to one thread at a time.

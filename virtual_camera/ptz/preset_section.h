@@ -53,7 +53,7 @@ class PresetSection {
   // Takes the settings of tours that a command names, all of them or none: false. Of both kinds of tours one runs: the
   // kind switched on last.
   [[nodiscard]] bool set_tours(const Pairs& settings);
-  // What the inquiry says.
+  // The answer to the inquiry.
   [[nodiscard]] Pairs answer() const;
 
   // The tour that is to run; null when there is none.

@@ -39,7 +39,7 @@ struct PictureArea {
 struct PtzOrder {
   std::array<std::optional<MotorOrder>, kPtzMotors> motors;
   std::optional<PictureArea> area;
-  std::optional<double> zoom_by;  // share of the zoom's way
+  std::optional<double> zoom_by;  // share of the zoom's range
 
   std::optional<MotorOrder>& operator[](PtzMotor motor) { return motors[static_cast<std::size_t>(motor)]; }
 };

@@ -22,7 +22,7 @@
 
 namespace vexa::camera {
 
-// One datagram on its way out.
+// One datagram that is to leave.
 struct Outgoing {
   std::array<std::uint8_t, 12> header{};
   std::shared_ptr<const PacketisedPicture> picture;  // keeps the payload
@@ -63,7 +63,7 @@ class RtpStream {
   [[nodiscard]] const SourcePicture& loaded() const { return *loaded_; }
   [[nodiscard]] const SourceFormat& format() const { return source_->format(); }
   [[nodiscard]] std::uint64_t next_picture() const { return picture_; }  // its running index
-  // Appends the packets of the next picture, with the text in its user data where that is not empty; nothing when there
+  // Appends the packets of the next picture, with the text in its user data where that is not empty; none when there
   // is none.
   void take_picture(std::vector<Outgoing>& packets, const std::string& text = {});
 

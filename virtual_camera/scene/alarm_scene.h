@@ -40,7 +40,7 @@ class AlarmScene {
 
   // False for a contact or window that the camera does not have.
   bool happen(const AlarmEvent& event);
-  // Whether the detectors are switched on; off, they report nothing.
+  // Whether the detectors are switched on; off, they report no alarm.
   void switch_detectors(bool tampering, bool audio);
   // The camera forgets the tampering alarm until the lens is covered anew.
   void clear_tampering();

@@ -59,10 +59,10 @@ struct PictureBox {
   double bottom = 0;
 };
 
-// Where the figure stands in the picture, also where that is outside.
+// The place of the figure in the picture, also outside of it.
 [[nodiscard]] PictureBox box_of(const Intruder& intruder, const View& view);
 
-// A straight way through the scene.
+// A straight path through the scene.
 struct Walk {
   double from = 0;    // bearing at which it begins
   double turn = 0;    // degrees walked in all, clockwise above 0

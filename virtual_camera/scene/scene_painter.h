@@ -21,7 +21,7 @@ struct Area {
 inline constexpr int kLetterPitch = 6;
 inline constexpr int kLetterHeight = 7;
 
-// Rotated, it puts everything where it stands when the picture is turned by 180 degrees.
+// Rotated, it draws everything where it is in the picture turned by 180 degrees.
 class ScenePainter {
  public:
   ScenePainter(I420Picture& picture, bool rotated) : picture_(picture), rotated_(rotated) {}

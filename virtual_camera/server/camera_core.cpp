@@ -45,8 +45,8 @@ std::string bind_failure(const std::string& address, std::uint16_t port, const a
 
 }  // namespace
 
-// Parts of the alarm-data stream on their way to the loop's thread.
-class CameraCore::AlarmNews {
+// Parts of the alarm-data stream, queued for the loop's thread. Any thread adds them, the loop's takes them.
+class CameraCore::AlarmParts {
  public:
   void add(const std::string& part) {
     const std::lock_guard<std::mutex> lock(mutex_);
@@ -131,17 +131,17 @@ void CameraCore::take_calls() {
 // Changes may come from any thread; the connections live on the loop's. They wait in a queue of their own, because what
 // the loop's thread posts and what others post overtake each other.
 void CameraCore::spread_alarms() {
-  const auto news = std::make_shared<AlarmNews>();
+  const auto parts = std::make_shared<AlarmParts>();
   state_->alarm_part =
-      state_->alarms.listen([weak = weak_from_this(), news, &context = state_->context](const std::string& part) {
-        news->add(part);
-        asio::post(context, [weak, news] {
-          if (const std::shared_ptr<CameraCore> core = weak.lock()) core->tell(news->take());
+      state_->alarms.listen([weak = weak_from_this(), parts, &context = state_->context](const std::string& part) {
+        parts->add(part);
+        asio::post(context, [weak, parts] {
+          if (const std::shared_ptr<CameraCore> core = weak.lock()) core->send_alarm_parts(parts->take());
         });
       });
 }
 
-void CameraCore::tell(const std::deque<std::string>& parts) {
+void CameraCore::send_alarm_parts(const std::deque<std::string>& parts) {
   for (const std::string& part : parts) {
     state_->alarm_part = part;
     for (const std::weak_ptr<Connection>& connection : state_->connections) {

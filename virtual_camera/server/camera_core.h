@@ -33,7 +33,7 @@ class CameraCore : public std::enable_shared_from_this<CameraCore> {
   [[nodiscard]] std::uint16_t control_port() const { return control_->port(); }
 
  private:
-  class AlarmNews;
+  class AlarmParts;
 
   [[nodiscard]] std::string prepare();
   [[nodiscard]] std::string open_ports();
@@ -42,7 +42,7 @@ class CameraCore : public std::enable_shared_from_this<CameraCore> {
   void come_back();
   void spread_alarms();
   void take_calls();
-  void tell(const std::deque<std::string>& parts);
+  void send_alarm_parts(const std::deque<std::string>& parts);
 
   std::shared_ptr<CameraState> state_;
   std::shared_ptr<Listener> http_;

@@ -22,7 +22,7 @@ struct RecorderSettings {
   std::chrono::seconds after{0};  // recorded on when the watched address is back
 };
 
-// What the section "edgestorage" says; no stream while it is off or watches no address.
+// The settings in the section "edgestorage"; no stream while it is off or watches no address.
 [[nodiscard]] RecorderSettings recorder_settings(const SettingsStore& settings);
 
 // Lives on the loop's thread.

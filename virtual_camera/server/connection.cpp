@@ -198,7 +198,7 @@ void Connection::delivered() {
   });
 }
 
-// Whatever the peer says from here on is passed over.
+// Whatever the peer sends from here on is ignored.
 void Connection::begin_stream() {
   received_.clear();
   deadline_.expires_at(std::chrono::steady_clock::time_point::max());

@@ -25,7 +25,7 @@ class IntruderWatch : public std::enable_shared_from_this<IntruderWatch> {
 
  private:
   void look();
-  void tell(const std::array<bool, kDetectionWindows>& seen);
+  void report(const std::array<bool, kDetectionWindows>& seen);
 
   std::shared_ptr<CameraState> state_;
   asio::steady_timer pace_;

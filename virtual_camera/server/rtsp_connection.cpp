@@ -108,7 +108,7 @@ RtspConnection::MediaWay RtspConnection::open_udp(const AskedTransport& asked) {
   return {std::move(port), std::move(transport)};
 }
 
-// Channels that an earlier session of the connection had are not given again; the host is told which it gets.
+// Channels that an earlier session of the connection had are not given again; the answer names those it gets.
 RtspConnection::MediaWay RtspConnection::open_interleaved(const AskedTransport& asked) {
   constexpr std::uint16_t kChannels = 256;
   const bool free = asked.first >= next_channel_;

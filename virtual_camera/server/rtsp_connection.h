@@ -37,7 +37,7 @@ class RtspConnection : public Connection {
   void claim_socket(const std::function<void()>& ready) override;
   void release_socket() override;
 
-  // Where a session's packets are to go, and how SETUP's answer tells it; no port: it could not be opened.
+  // Where a session's packets are to go, and how SETUP's answer states it; no port: it could not be opened.
   struct MediaWay {
     std::unique_ptr<PacketPort> port;
     std::string transport;

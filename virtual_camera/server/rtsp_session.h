@@ -30,7 +30,7 @@ class RtspSession : public std::enable_shared_from_this<RtspSession> {
   void play();
   // A request named the session: its time starts over.
   void touch();
-  // Stops sending for good. The session leaves the camera's table, when it still stands there.
+  // Stops sending for good. The session leaves the camera's table, if it is still there.
   void end();
 
  private:

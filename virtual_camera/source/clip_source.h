@@ -10,7 +10,7 @@
 
 namespace vexa::camera {
 
-// Nothing is copied: what it hands out keeps the clip.
+// No picture is copied: those that it returns keep the clip alive.
 class ClipSource : public PictureSource {
  public:
   enum class AtEnd { kStop, kStartOver };

@@ -85,7 +85,7 @@ std::string HttpStream::unit_bytes(const std::string& content) const {
   return fmt::format("{}--picture\r\nContent-Type: image/jpeg\r\n{}\r\n{}\r\n", front, line, content);
 }
 
-// The faults that change what stands ready, or end the stream with it.
+// The faults that change the piece that is ready, or end the stream with it.
 void HttpStream::strike() {
   if (const HttpStreamFault* cut = fault(Action::kCut)) unit_ = unit_.substr(0, cut->bytes);
   for (const Action action : {Action::kClose, Action::kSilence}) {

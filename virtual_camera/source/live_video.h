@@ -36,7 +36,7 @@ class LiveVideo : public std::enable_shared_from_this<LiveVideo> {
   [[nodiscard]] const LiveEncoding& encoding() const { return encoding_; }
   // One more who watches: from when the source is first asked for a picture, beginning with a key picture, which is
   // made at once. One that is not asked for two seconds loses what it did not take, and goes on with a key picture. Its
-  // wait() calls `ready` on the thread, with a lock held: that may hand work over, and nothing else.
+  // wait() calls `ready` on the thread, with a lock held: that may post work to another thread, and no more.
   [[nodiscard]] std::unique_ptr<PictureSource> watch();
 
  private:

@@ -8,7 +8,7 @@
 
 namespace vexa::camera {
 
-// The bytes of a percent-encoded text; nothing when it is no such text.
+// The bytes of a percent-encoded text; none when it is no such text.
 [[nodiscard]] std::optional<std::string> percent_decoded(std::string_view text);
 // The text with its "%", ",", "&" and control characters percent-encoded, so that a list can hold it.
 [[nodiscard]] std::string percent_encoded_for_list(std::string_view text);

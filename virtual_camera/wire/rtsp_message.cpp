@@ -17,7 +17,7 @@ bool all_digits(std::string_view text) {
   return !text.empty() && text.find_first_not_of("0123456789") == std::string_view::npos;
 }
 
-// The numbers behind a name of a Transport field, such as "client_port=5000-5001".
+// The numbers after a name of a Transport field, such as "client_port=5000-5001".
 std::optional<std::pair<std::uint16_t, std::uint16_t>> number_pair(std::string_view alternative,
                                                                    std::string_view name) {
   const std::size_t found = alternative.find(name);

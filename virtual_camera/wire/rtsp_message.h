@@ -16,7 +16,7 @@ namespace vexa::camera {
 // Hosts read an answer in one piece of at most 1023 bytes, some in half of that; so no answer is longer than this.
 constexpr std::size_t kMaxRtspAnswer = 500;
 
-// Bytes of the first request: its head, its body, and empty lines right behind it; 0 when more must come.
+// Bytes of the first request: its head, its body, and empty lines right after it; 0 when more must come.
 [[nodiscard]] std::size_t rtsp_request_size(std::string_view received);
 
 // The CSeq of a request, when it is a plain number.
