@@ -30,7 +30,8 @@ class RaisedTimeout {
   const int restored_;
 };
 
-/// The connection settings, which are fields of the driver. Any thread.
+/// The connection settings, which are fields of the driver. Owned by DriverState; any thread. Hands out copies, never
+/// references, so that no exchange sees a setting change.
 class Connection {
  public:
   Connection(SLibDConnectionInfo& info, int& saved_timeout, CSimpleLock& lock)
@@ -47,7 +48,8 @@ class Connection {
   int& saved_timeout_ VEXA_GUARDED_BY(lock_);
 };
 
-/// Writes the CGI log while it is switched on. Any thread.
+/// Writes the CGI log while it is switched on. Owned by DriverState; any thread. Never fails: a line that cannot be
+/// written is lost.
 class CgiLog final : public ExchangeLog {
  public:
   CgiLog(CFileLogger& file, const std::atomic<bool>& enabled) : file_(file), enabled_(enabled) {}

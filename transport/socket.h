@@ -8,7 +8,8 @@
 
 namespace vexa {
 
-/// Owns a socket: closes it on every early exit, is released on success.
+/// Owns a socket, or none (-1): closes it on each early exit, is released on success. One thread at a time; closing
+/// never waits for the peer.
 class Socket {
  public:
   Socket() = default;

@@ -24,7 +24,8 @@ namespace vexa::camera {
 class CameraCore;
 class EventLoop;
 
-// All operations may be called from any thread but the camera's own (the journal's observer runs on that one).
+// One camera and the thread that serves it. All operations may be called from any thread but the camera's own (the
+// journal's observer runs on that one).
 class VirtualCamera {
  public:
   explicit VirtualCamera(CameraOptions options);                          // on a thread of its own

@@ -18,7 +18,8 @@ namespace vexa::host {
 // Call it once, before anything is printed. Invalid when the system refuses, with errno set.
 [[nodiscard]] UniqueFd take_standard_output();
 
-// While it lives, the driver's trace is shown on standard error, line by line, redacted.
+// While it lives, the driver's trace is shown on standard error, line by line, redacted. One a process, owned by the
+// command; reads on a thread of its own and outlives the drivers.
 class DriverTrace {
  public:
   // Null when the system refuses, with errno set.

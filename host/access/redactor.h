@@ -10,6 +10,7 @@
 
 namespace vexa::host {
 
+// Replaces the password in texts. Holds a copy of it; immutable after construction, so any thread may use it.
 class Redactor {
  public:
   Redactor() = default;

@@ -8,6 +8,7 @@
 
 namespace vexa::host {
 
+// Owns one descriptor, or none (-1); moving hands it on. Never closes a descriptor that it does not own.
 class UniqueFd {
  public:
   UniqueFd() = default;

@@ -46,7 +46,8 @@ struct CgiExchange {
   [[nodiscard]] std::optional<std::chrono::milliseconds> duration() const;
 };
 
-// Takes a log's bytes in pieces of any size, and passes on each exchange as soon as it is complete.
+// Takes a log's bytes in pieces of any size, and passes on each exchange as soon as it is complete. Used by one thread;
+// opens no file.
 class CgiLogReader {
  public:
   using Take = std::function<void(const CgiExchange&)>;

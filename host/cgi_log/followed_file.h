@@ -13,6 +13,8 @@
 
 namespace vexa::host {
 
+// Reads a log that another process is writing. Owned by one command and used on its thread; never writes and never
+// waits: the caller pauses between two reads.
 class FollowedFile {
  public:
   explicit FollowedFile(std::string path) : path_(std::move(path)) {}

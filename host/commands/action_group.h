@@ -12,6 +12,8 @@
 
 namespace vexa::host {
 
+// One action of such a command. Owned by its group; runs once, on the main thread, after the camera has been
+// identified.
 class CameraAction {
  public:
   CameraAction() = default;
@@ -43,6 +45,7 @@ struct ActionGroupText {
 // What all actions of a group need of a camera's model.
 using ModelCheck = std::optional<Problem> (*)(const ModelCamera&);
 
+// Declares the actions, opens the camera that they share, and runs the chosen one. Owned by the command line.
 class ActionGroup final : public Command {
  public:
   ActionGroup(ActionGroupText text, ModelCheck check_model, std::vector<std::unique_ptr<CameraAction>> actions)

@@ -13,6 +13,8 @@ class App;
 
 namespace vexa::host {
 
+// Owned by the command line; declared once, run at most once, on the main thread. Never ends the process itself: the
+// exit code is its result.
 class Command {
  public:
   Command() = default;

@@ -11,7 +11,8 @@
 
 namespace vexa::host {
 
-// Thread-safe: the driver's trace arrives on a thread of its own.
+// One a process, made by main(). Thread-safe, because the driver's trace arrives on a thread of its own. Never prints a
+// result on standard error.
 class Terminal {
  public:
   // Results go to `results`, which the terminal owns. Progress is shown when standard error is a terminal.

@@ -21,6 +21,8 @@ struct RecordedPicture {
   std::chrono::microseconds time{0};  // since 1970
 };
 
+// Writes pictures to one file. Owned by the command that records, used on its thread. Creates no file before the first
+// picture.
 class PictureTarget {
  public:
   PictureTarget() = default;

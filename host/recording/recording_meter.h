@@ -12,7 +12,8 @@
 
 namespace vexa::host {
 
-// Times are the host's, of a picture's arrival: live pictures carry no time stamps of their own.
+// Counts pictures, bytes and losses of one recording, on the recording's thread. Times are the host's, of a picture's
+// arrival: live pictures carry no time stamps of their own.
 class RecordingMeter {
  public:
   using Clock = std::chrono::steady_clock;

@@ -17,6 +17,7 @@ enum class SoundFormat { kRaw, kWave };
 // sound as it came.
 [[nodiscard]] SoundFormat sound_format_of(const std::string& file);
 
+// Writes sound with the header that its format needs. Used on the command's thread; does not own the file.
 class SoundFile {
  public:
   // `file` is opened with the first sound.

@@ -9,6 +9,8 @@
 
 namespace vexa {
 
+/// Appends payloads to a buffer of the caller's. Lives as long as the assembly of one picture, on its thread; never
+/// writes beyond the buffer and never allocates.
 class FrameWriter {
  public:
   explicit FrameWriter(std::span<unsigned char> room) : room_(room) {}

@@ -7,7 +7,8 @@
 
 namespace vexa {
 
-/// Remembers the pictures used last by timestamp and span of sequence numbers.
+/// Remembers the pictures used last by timestamp and span of sequence numbers. Owned by the packet collector, on its
+/// thread; of fixed size, so it never allocates.
 class RecentPictures {
  public:
   void add(std::uint32_t timestamp, std::uint16_t first, std::uint16_t last) {

@@ -56,7 +56,8 @@ struct Recording {
 
 enum class CardHealth { kGood, kMissing, kFailing };
 
-// Thread-safe. One recording is made at a time; what is full stays full until something is deleted.
+// The recordings of one camera, in memory. Owned by the camera's state; thread-safe. One recording is made at a time,
+// and what is full stays full until a recording is deleted.
 class Card {
  public:
   // 0 bytes: the slot is empty.

@@ -31,6 +31,7 @@ struct AccessUnit {
   [[nodiscard]] std::vector<std::uint8_t> as_delivered() const;
 };
 
+// Holds the whole clip in memory. Immutable after loading and shared by any number of streams.
 class Clip {
  public:
   Clip() = default;

@@ -16,7 +16,7 @@ struct Colour {
   bool operator==(const Colour&) const = default;
 };
 
-// Keeps its memory from picture to picture.
+// The canvas of one encoder, used on its thread. Keeps its memory from picture to picture.
 class I420Picture {
  public:
   I420Picture() = default;

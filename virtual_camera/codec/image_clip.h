@@ -13,7 +13,7 @@ namespace vexa::camera {
 
 class Clip;
 
-// A clip cut into pictures. Immutable, shared by any number of cameras.
+// A clip cut into pictures, held in memory. Immutable, shared by any number of cameras.
 class ImageClip {
  public:
   // Known by its extension: ".mjpeg" (JPEG pictures one after the other), ".h264" (Annex B) or ".m4v" (MPEG-4 Visual).

@@ -35,7 +35,7 @@ struct EncodedPicture {
 // Whether this build has encoders: builds without FFmpeg's libraries do not, and open() then reports it.
 [[nodiscard]] bool has_live_encoders();
 
-// Belongs to one thread at a time.
+// Owned by a LiveVideo and used on its thread. Keeps the state between pictures that delta pictures need.
 class LiveEncoder {
  public:
   // The encoder, or why there is none.

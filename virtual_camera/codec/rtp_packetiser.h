@@ -19,7 +19,8 @@
 
 namespace vexa::camera {
 
-// The payloads of one picture, in order, packed into one block.
+// The payloads of one picture, in order, packed into one block. Immutable once made; the headers are added as it
+// leaves.
 class PacketisedPicture {
  public:
   PacketisedPicture() = default;
@@ -54,7 +55,7 @@ class PacketisedPicture {
 [[nodiscard]] std::optional<PacketisedPicture> packetise(Codec codec, const std::string& picture,
                                                          const std::string& text, std::size_t max_payload);
 
-// A clip cut into packets once, for any number of cameras and clients. Immutable.
+// A clip cut into packets once, for any number of cameras and clients. Immutable and shared.
 class PacketisedClip {
  public:
   PacketisedClip(Clip clip, std::size_t max_payload);

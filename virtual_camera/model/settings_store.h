@@ -15,7 +15,8 @@ namespace vexa::camera {
 
 class SettingRules;
 
-// Thread-safe. Values are kept as they came, without decoding; keys keep the order in which they were first set.
+// The settings of one camera. Owned by its state; thread-safe. Values are kept as they came, without decoding; keys
+// keep the order in which they were first set.
 class SettingsStore {
  public:
   SettingsStore();  // with a plausible camera's defaults

@@ -44,6 +44,7 @@ struct TourSwitch {
   int resume = 0;
 };
 
+// The stored presets and tours of one camera. Owned by its PtzHead, whose lock guards it. Moves no motor.
 class PresetSection {
  public:
   using Pairs = std::vector<std::pair<std::string, std::string>>;  // key and value

@@ -8,6 +8,7 @@
 
 namespace vexa::camera {
 
+// One motor of a mechanism, which owns it; guarded as the mechanism is. Computes positions when asked and has no timer.
 class PtzAxis {
  public:
   struct Mechanics {

@@ -38,7 +38,7 @@ struct PtzRecording {
   ShadowTour made;
 };
 
-// Any thread.
+// Owned by the camera's state; thread-safe. Each operation first brings motors and tours up to its own moment.
 class PtzHead {
  public:
   using Time = std::chrono::steady_clock::time_point;

@@ -44,6 +44,8 @@ struct PtzOrder {
   std::optional<MotorOrder>& operator[](PtzMotor motor) { return motors[static_cast<std::size_t>(motor)]; }
 };
 
+// Carries out orders by running the four motors together. Owned by PtzHead, whose lock guards it; knows no presets and
+// no tours.
 class PtzMechanism {
  public:
   explicit PtzMechanism(PtzProfile profile);  // at rest, straight ahead, at the wide end

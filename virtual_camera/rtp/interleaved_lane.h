@@ -17,7 +17,8 @@
 
 namespace vexa::camera {
 
-// What the sessions of one connection send on it. Answers and packets take turns; neither is ever torn by the other.
+// What the sessions of one connection send on it. Held by the connection and its ports; on the loop's thread. Answers
+// and packets take turns, and neither is ever cut by the other.
 class InterleavedLane : public std::enable_shared_from_this<InterleavedLane> {
  public:
   // `socket` is the owner's. `reset` ends the owner's connection where writing fails, or the peer reads no byte for
@@ -53,7 +54,8 @@ class InterleavedLane : public std::enable_shared_from_this<InterleavedLane> {
   bool closed_ = false;
 };
 
-// One session's channel of a lane. A packet for which there is no room is lost, and the rest of its picture with it.
+// One session's channel of a lane; owned by the session's sender. A packet for which there is no room is lost, and the
+// rest of its picture with it.
 class InterleavedPort : public PacketPort {
  public:
   InterleavedPort(std::weak_ptr<InterleavedLane> lane, std::uint8_t channel)

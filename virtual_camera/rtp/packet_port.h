@@ -10,6 +10,8 @@
 
 namespace vexa::camera {
 
+// Datagrams or an RTSP connection, behind one interface for RtpSender, which owns it; on the loop's thread. Never
+// waits.
 class PacketPort {
  public:
   enum class Hashing { kOff, kOn };

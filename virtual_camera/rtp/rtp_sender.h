@@ -21,7 +21,8 @@
 
 namespace vexa::camera {
 
-// One for each session. Lives on the loop's thread.
+// One for each session, held by it and by its timer; on the loop's thread. Never drifts: each picture has a time of its
+// own, counted from PLAY.
 class RtpSender : public std::enable_shared_from_this<RtpSender> {
  public:
   // What a stream is played with.

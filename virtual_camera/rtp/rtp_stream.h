@@ -40,6 +40,7 @@ struct Outgoing {
 // The options' payload type; JPEG has a static one (RFC 3551, table 5).
 [[nodiscard]] std::uint8_t payload_type_of(const CameraOptions& options, Codec codec);
 
+// Turns pictures into packets. Owned by RtpSender, on the loop's thread; opens no socket and reads no clock.
 class RtpStream {
  public:
   // What makes a stream differ from those beside it.

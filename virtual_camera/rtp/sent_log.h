@@ -35,7 +35,8 @@ struct SentPacket {
   std::chrono::steady_clock::time_point time;
 };
 
-// Thread-safe. Entries appear right after the datagrams have left.
+// Kept for tests, which compare it with what the host received. Thread-safe. Entries appear right after the datagrams
+// have left.
 class SentLog {
  public:
   using Predicate = std::function<bool(const std::deque<SentPacket>&)>;

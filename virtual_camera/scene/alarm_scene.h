@@ -24,7 +24,7 @@ struct AlarmEvent {
   int value = 0;   // 0: open, free, quiet, still
 };
 
-// Thread-safe. Every change that happens makes one part; what stays as it is makes none.
+// Owned by the camera's state; thread-safe. Each change makes one part; a state that stays makes none.
 class AlarmScene {
  public:
   static constexpr std::size_t kWindows = 4;

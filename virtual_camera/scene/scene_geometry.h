@@ -20,7 +20,8 @@ struct View {
 // Degrees from `from` to `to` the shorter way: -180 to below 180, clockwise above 0.
 [[nodiscard]] double turn_between(double from, double to);
 
-// Angles that are no numbers count as 0, and a tilt ends at a full turn; the picture spans 0.1 to 360 degrees.
+// One view of the scene; a value. Angles that are no numbers count as 0, and a tilt ends at a full turn; the picture
+// spans 0.1 to 360 degrees.
 class Projection {
  public:
   explicit Projection(const View& view);

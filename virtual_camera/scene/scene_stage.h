@@ -10,7 +10,7 @@
 
 namespace vexa::camera {
 
-// Any thread.
+// Holds the intruder, if there is one. Owned by the camera's state; thread-safe.
 class SceneStage {
  public:
   using Time = std::chrono::steady_clock::time_point;

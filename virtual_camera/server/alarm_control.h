@@ -26,7 +26,8 @@ struct CameraState;
 // How long the intruder walks whom a path sends through the scene; none for another path.
 [[nodiscard]] std::optional<std::chrono::seconds> control_walk(std::string_view path);
 
-// Lives on the loop's thread.
+// Held by the camera's core; on the loop's thread. It takes no credentials, and so listens on the loopback address
+// alone.
 class AlarmControl : public std::enable_shared_from_this<AlarmControl> {
  public:
   explicit AlarmControl(std::shared_ptr<CameraState> state);

@@ -16,6 +16,8 @@
 
 namespace vexa::camera {
 
+// Starts, stops and reboots one camera. Held by VirtualCamera and by its own handlers; every operation runs on the
+// loop's thread, except that alarm parts may be added by any.
 class CameraCore : public std::enable_shared_from_this<CameraCore> {
  public:
   explicit CameraCore(std::shared_ptr<CameraState> state);

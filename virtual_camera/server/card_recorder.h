@@ -25,7 +25,7 @@ struct RecorderSettings {
 // The settings in the section "edgestorage"; no stream while it is off or watches no address.
 [[nodiscard]] RecorderSettings recorder_settings(const SettingsStore& settings);
 
-// Lives on the loop's thread.
+// Held by the camera's core and its timer; on the loop's thread. Writes pictures to the card, never reads any.
 class CardRecorder : public std::enable_shared_from_this<CardRecorder> {
  public:
   explicit CardRecorder(std::shared_ptr<CameraState> state);

@@ -22,6 +22,8 @@ namespace vexa::camera {
 
 struct CameraState;
 
+// Held by its own pending reads and writes, and gone once there are none; on the loop's thread. It never blocks:
+// deadlines are timers.
 class Connection : public std::enable_shared_from_this<Connection> {
  public:
   Connection(asio::ip::tcp::socket socket, std::shared_ptr<CameraState> state);

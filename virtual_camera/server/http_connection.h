@@ -12,6 +12,7 @@
 
 namespace vexa::camera {
 
+// Routes a request to settings, motors, card or streams. On the loop's thread; owns the body of a running stream.
 class HttpConnection : public Connection, private HttpBody::Line {
  public:
   using Connection::Connection;

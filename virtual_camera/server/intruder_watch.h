@@ -13,7 +13,7 @@ namespace vexa::camera {
 
 struct CameraState;
 
-// Lives on the loop's thread.
+// Held by the camera's core and its timer; on the loop's thread.
 class IntruderWatch : public std::enable_shared_from_this<IntruderWatch> {
  public:
   explicit IntruderWatch(std::shared_ptr<CameraState> state);

@@ -25,7 +25,7 @@ struct Request {
   std::string answer;  // the bytes the camera set out to send; a fault may have cut them
 };
 
-// Thread-safe. A request is in the journal before the first byte of its answer leaves.
+// Owned by the camera; thread-safe. A request is in the journal before the first byte of its answer leaves.
 class Journal {
  public:
   using Predicate = std::function<bool(const std::deque<Request>&)>;

@@ -97,7 +97,7 @@ Answer RtspConnection::describe(const RequestHead& request, std::uint32_t sequen
   return rtsp_answer({"200 OK", sequence, {}, description});
 }
 
-RtspConnection::MediaWay RtspConnection::open_udp(const AskedTransport& asked) {
+RtspConnection::MediaTransport RtspConnection::open_udp(const AskedTransport& asked) {
   asio::error_code error;
   const asio::ip::tcp::endpoint peer = socket().remote_endpoint(error);
   auto port = std::make_unique<UdpPort>(state().context);
@@ -109,7 +109,7 @@ RtspConnection::MediaWay RtspConnection::open_udp(const AskedTransport& asked) {
 }
 
 // Channels that an earlier session of the connection had are not given again; the answer names those it gets.
-RtspConnection::MediaWay RtspConnection::open_interleaved(const AskedTransport& asked) {
+RtspConnection::MediaTransport RtspConnection::open_interleaved(const AskedTransport& asked) {
   constexpr std::uint16_t kChannels = 256;
   const bool free = asked.first >= next_channel_;
   const std::uint16_t first = free ? asked.first : next_channel_;
@@ -131,7 +131,7 @@ Answer RtspConnection::setup(const RequestHead& request, std::uint32_t sequence)
   const AskedTransport asked = asked_transport(request.field("Transport"));
   if (asked.way == AskedTransport::Way::kNone) return status_only("461 Unsupported Transport", sequence);
   if (state().sessions.size() >= kMaxSessions) return status_only("453 Not Enough Bandwidth", sequence);
-  MediaWay way = asked.way == AskedTransport::Way::kUdp ? open_udp(asked) : open_interleaved(asked);
+  MediaTransport way = asked.way == AskedTransport::Way::kUdp ? open_udp(asked) : open_interleaved(asked);
   if (!way.port) return status_only("500 Internal Server Error", sequence);
   const auto session = std::make_shared<RtspSession>(shared_state(), state().next_session++, video_number(request.path),
                                                      std::move(way.port), way.pause);

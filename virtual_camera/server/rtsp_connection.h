@@ -21,6 +21,7 @@
 
 namespace vexa::camera {
 
+// Answers RTSP requests, and ends the sessions that it has set up when it ends. On the loop's thread.
 class RtspConnection : public Connection {
  public:
   using Connection::Connection;
@@ -38,13 +39,13 @@ class RtspConnection : public Connection {
   void release_socket() override;
 
   // Where a session's packets are to go, and how SETUP's answer states it; no port: it could not be opened.
-  struct MediaWay {
+  struct MediaTransport {
     std::unique_ptr<PacketPort> port;
     std::string transport;
     std::chrono::milliseconds pause{0};
   };
-  MediaWay open_udp(const AskedTransport& asked);
-  MediaWay open_interleaved(const AskedTransport& asked);
+  MediaTransport open_udp(const AskedTransport& asked);
+  MediaTransport open_interleaved(const AskedTransport& asked);
 
   Answer dispatch(const RequestHead& request, std::uint32_t sequence);
   std::optional<Recording> recording_at(std::string_view path, VideoUrl as);

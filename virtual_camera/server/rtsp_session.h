@@ -16,6 +16,8 @@ namespace vexa::camera {
 
 struct CameraState;
 
+// Owned by its connection and listed in the camera's table; on the loop's thread. Sends no answer itself: the
+// connection does.
 class RtspSession : public std::enable_shared_from_this<RtspSession> {
  public:
   // `video`: the number of the camera's video stream that it plays. `port` is open; the first picture leaves through

@@ -10,7 +10,7 @@
 
 namespace vexa::camera {
 
-// No picture is copied: those that it returns keep the clip alive.
+// Owned by one stream, on its thread. No picture is copied: those that it returns keep the clip alive.
 class ClipSource : public PictureSource {
  public:
   enum class AtEnd { kStop, kStartOver };

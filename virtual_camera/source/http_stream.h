@@ -29,6 +29,7 @@ struct HttpStreamOptions {
   std::vector<HttpStreamFault> faults;
 };
 
+// Owned by a MediaStream, which asks for each piece when it is due. One thread at a time.
 class HttpStream {
  public:
   struct Piece {

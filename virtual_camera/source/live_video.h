@@ -20,7 +20,8 @@
 
 namespace vexa::camera {
 
-// Its thread runs from the first picture asked for until the last source is gone; only its sources keep it.
+// Shared by the sources that watch it. Its thread runs from the first picture asked for until the last source is gone;
+// only its sources keep it.
 class LiveVideo : public std::enable_shared_from_this<LiveVideo> {
  public:
   // Fills the picture with what is to be seen at this moment. Called on the thread.

@@ -42,7 +42,8 @@ struct SourceFormat {
   std::string picture_parameters;
 };
 
-// Made for one taker: each begins with its own first picture, which is a key picture. One thread at a time.
+// Made for one receiver, which owns it: each begins with its own first picture, which is a key picture. One thread at a
+// time. It reads no clock: pictures carry the times they are due.
 class PictureSource {
  public:
   PictureSource() = default;
