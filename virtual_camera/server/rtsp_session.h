@@ -16,7 +16,7 @@ namespace vexa::camera {
 
 struct CameraState;
 
-// Owned by its connection and listed in the camera's table; on the loop's thread. Sends no answer itself: the
+// Owned by the camera's table of sessions; its connection takes it out. On the loop's thread. Sends no answer: the
 // connection does.
 class RtspSession : public std::enable_shared_from_this<RtspSession> {
  public:
