@@ -27,7 +27,7 @@ using vexa::FileHandle;
 const char* or_empty(const char* path) { return path == nullptr ? "" : path; }
 
 /// A function's result: 1 when `result` is 0; else 0, and a line that reports `what` failed on `path`.
-int done_or_told(int result, const char* what, const char* path) {
+int done_or_reported(int result, const char* what, const char* path) {
   if (result == 0) return 1;
   debug_line("%s %s: %s", what, path, ErrorText(errno).c_str());
   return 0;
@@ -100,14 +100,14 @@ int GetFileAttributesEx(const char* path, _GET_FILEEX_INFO_LEVELS level, void* d
     return 0;
   }
   struct stat64 status {};
-  if (done_or_told(stat64(or_empty(path), &status), "GetFileAttributesEx stat", or_empty(path)) == 0) return 0;
+  if (done_or_reported(stat64(or_empty(path), &status), "GetFileAttributesEx stat", or_empty(path)) == 0) return 0;
   if (data == nullptr) return 0;
   vexa::describe(status, *static_cast<WIN32_FILE_ATTRIBUTE_DATA*>(data));
   return 1;
 }
 
 int RemoveDirectory(const char* path) {
-  return done_or_told(rmdir(or_empty(path)), "RemoveDirectory rmdir", or_empty(path));
+  return done_or_reported(rmdir(or_empty(path)), "RemoveDirectory rmdir", or_empty(path));
 }
 
 int CreateDirectory(const char* path, _SECURITY_ATTRIBUTES* sa) {
@@ -115,7 +115,7 @@ int CreateDirectory(const char* path, _SECURITY_ATTRIBUTES* sa) {
     debug_line("CreateDirectory : no support for security attributes yet");
     return 0;
   }
-  return done_or_told(mkdir(or_empty(path), kDirectoryMode), "CreateDirectory mkdir", or_empty(path));
+  return done_or_reported(mkdir(or_empty(path), kDirectoryMode), "CreateDirectory mkdir", or_empty(path));
 }
 
 int MoveFile(const char* from, const char* to) {
@@ -124,7 +124,7 @@ int MoveFile(const char* from, const char* to) {
   return 0;
 }
 
-int DeleteFile(const char* path) { return done_or_told(unlink(or_empty(path)), "DeleteFile unlink", or_empty(path)); }
+int DeleteFile(const char* path) { return done_or_reported(unlink(or_empty(path)), "DeleteFile unlink", or_empty(path)); }
 
 typedHandle* CreateFile(const char* path, unsigned long access, unsigned long, _SECURITY_ATTRIBUTES*,
                         unsigned long creation, unsigned long, typedHandle*) {

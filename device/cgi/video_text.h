@@ -19,7 +19,7 @@ struct PlacedValue {
 
 /// The value of the key that begins at `key_at` and is `key_length` long, up to the next "&" or the end. Empty when the
 /// key is not within the answer.
-PlacedValue value_behind(std::string_view answer, std::size_t key_at, std::size_t key_length);
+PlacedValue value_after(std::string_view answer, std::size_t key_at, std::size_t key_length);
 
 /// The key of one stream's setting: ("ImageCodec", 1) is "ImageCodec1=".
 std::string stream_key(const char* name, int stream);

@@ -193,7 +193,7 @@ struct TypeCase {
   int answer;
 };
 
-TEST(DriverObject, SaysWhetherTheCameraHasABitOfTheTypeAskedFor) {
+TEST(DriverObject, ReportsWhetherTheCameraHasABitOfTheTypeAskedFor) {
   constexpr TypeCase kCases[] = {
       {0, 0, 0}, {0, 0xFFFFFFFF, 0},          {1, 1, 1},          {1, 2, 0},
       {6, 3, 1}, {0x80000000, 0x80000000, 1}, {0xFFFFFFFF, 0, 0}, {0x7FFFFFFF, 0x80000000, 0}};

@@ -93,7 +93,7 @@ TEST(SetCameraInfo, StoresNothingWhenTheRequestFails) {
   EXPECT_EQ(play.complaints(), "");
 }
 
-TEST(SetCameraInfo, TellsTheLatestErrorWhenNobodyListens) {
+TEST(SetCameraInfo, ReportsTheLatestErrorWhenNobodyListens) {
   SettingsDriver driver;
   driver.use(vexa_test::own_loopback_address(), vexa_test::refusing_port());
   SLibDCameraInfo info = settings("JPEG");

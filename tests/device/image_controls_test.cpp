@@ -78,7 +78,7 @@ TEST_P(ImageSetter, SendsOneRequest) {
   EXPECT_EQ(play.complaints(), "");
 }
 
-TEST_P(ImageSetter, TellsTheLatestErrorWhenItsRequestIsRefused) {
+TEST_P(ImageSetter, ReportsTheLatestErrorWhenItsRequestIsRefused) {
   Driver play({refusal(std::string("/command/camera.cgi?") + GetParam().path)});
   EXPECT_EQ(GetParam().set(play.driver), LIBD_UNAUTHORIZED);
   EXPECT_EQ(play.complaints(), "");
@@ -287,7 +287,7 @@ TEST(ImageGetters, AskAgainAfterAnEmptyAnswer) {
 
 // ---- The cache behind a change ----
 
-TEST(ImageCache, TellsTheValueBeforeTheChangeUntilTheCameraIsAskedAnew) {
+TEST(ImageCache, ReportsTheValueBeforeTheChangeUntilTheCameraIsAskedAnew) {
   Driver play({inquiry("camera", "A=1&ViewDR=off&XDNR=low&VisibilityEnhancer=low&IRLed=off&IRLedMaxStrength=3"),
                command("/command/camera.cgi?ViewDR=on"), command("/command/camera.cgi?XDNR=high"),
                command("/command/camera.cgi?VisibilityEnhancer=high"),

@@ -50,7 +50,7 @@ class PtzPosition : public PtzUnsent {
 
 constexpr PositionSaid kNothingSaid = {0, 7, 7, 7, 7, false};
 
-TEST_F(PtzPosition, IsToldInThousandthsWithTheAnglesOfItsZoom) {
+TEST_F(PtzPosition, IsReportedInThousandthsWithTheAnglesOfItsZoom) {
   EXPECT_EQ(said("CamPos: 111006400C81000"), (PositionSaid{1, 625, 1250, 290000, 170000, false}));
 }
 
@@ -69,7 +69,7 @@ TEST_F(PtzPosition, IsZeroWhereItsFlagIsNotOne) {
   EXPECT_EQ(said("CamPos: xX2006400C81000"), (PositionSaid{1, 0, 0, 580000, 340000, false}));
 }
 
-TEST_F(PtzPosition, MovesWhileAnMStandsBehindIt) {
+TEST_F(PtzPosition, MovesWhileAnMFollowsIt) {
   EXPECT_TRUE(said("CamPos: 111006400C81000M").moving);
   EXPECT_FALSE(said("CamPos: 111006400C81000m").moving);
   EXPECT_FALSE(said("CamPos: 111006400C81000 ").moving);

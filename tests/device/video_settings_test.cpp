@@ -53,7 +53,7 @@ void stays(SLibDCameraInfo&) {}
 
 class CameraAnswer : public testing::TestWithParam<AnswerRow> {};
 
-TEST_P(CameraAnswer, ChangesTheFieldsItSpeaksOfAndNoOthers) {
+TEST_P(CameraAnswer, ChangesTheFieldsItNamesAndNoOthers) {
   SLibDCameraInfo expected = before_answer();
   GetParam().change(expected);
   EXPECT_EQ(after_answer(before_answer(), GetParam().answer), expected) << GetParam().answer;
@@ -279,7 +279,7 @@ TEST(GetCameraInfo, LeavesAllButTheCacheWhenTheInquiryFails) {
   EXPECT_EQ(play.complaints(), "");
 }
 
-TEST(GetCameraInfo, TellsTheModelClassAChangedPropertyOnce) {
+TEST(GetCameraInfo, CallsTheModelClassOnceForAChangedProperty) {
   const std::string answer = "VideoStd=ntsc&VidCapSize=1280,960&SolidPTZ=on&ImageMaxSize=640,480";
   Driver play({inquiry("camera", answer), inquiry("camera", answer)});
   SLibDCameraInfo info;
@@ -292,7 +292,7 @@ TEST(GetCameraInfo, TellsTheModelClassAChangedPropertyOnce) {
   EXPECT_EQ(play.complaints(), "");
 }
 
-TEST(GetCameraInfo, TellsTheModelClassOfEachProperty) {
+TEST(GetCameraInfo, CallsTheModelClassForEachProperty) {
   for (const char* property :
        {"VideoStd=ntsc", "VidCapSize=1,0", "VidCapSize=0,1", "SolidPTZ=on", "ImageMaxSize=1,0", "ImageMaxSize=0,1"}) {
     Driver play({inquiry("camera", property)});

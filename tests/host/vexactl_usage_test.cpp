@@ -48,7 +48,7 @@ struct Refusal {
   const char* err;
 };
 
-TEST(CommandLine, EachMistakeEndsWithOneAndSaysWhatToDo) {
+TEST(CommandLine, EachMistakeEndsWithOneAndNamesWhatToDo) {
   const Refusal refusals[] = {
       {{}, "vexactl: the command is missing or unknown\n  See vexactl --help for the commands.\n"},
       {{"inof", "cam"}, "vexactl: the command is missing or unknown\n  See vexactl --help for the commands.\n"},

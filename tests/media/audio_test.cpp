@@ -246,7 +246,7 @@ TEST_F(AudioStream, GivesWhatOneReadGives) {
   EXPECT_EQ(driver_.latest_error(), "0 from before");
 }
 
-TEST_F(AudioStream, TellsTheCodecThatWasSet) {
+TEST_F(AudioStream, ReportsTheCodecThatWasSet) {
   const struct {
     const char* codec;
     std::int32_t type;

@@ -115,7 +115,7 @@ TEST(FileLoggerRotation, WithoutCopiesTheSameFileGrowsAndEveryLineRotatesAgain) 
   }
 }
 
-TEST(FileLoggerRotation, TheNumberStandsBeforeTheExtension) {
+TEST(FileLoggerRotation, TheNumberComesBeforeTheExtension) {
   const struct {
     const char* name;
     const char* copy;

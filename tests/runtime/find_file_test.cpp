@@ -119,7 +119,7 @@ TEST(FindFirstFile, FillsNothingWithoutARecord) {
   EXPECT_EQ(FindClose(search), 1);
 }
 
-TEST(FindFirstFile, TellsThatMemoryIsShortForTheHandle) {
+TEST(FindFirstFile, ReportsThatMemoryIsShortForTheHandle) {
   typedHandle* search = nullptr;
   EXPECT_EQ(stderr_of([&] {
               _WIN32_FIND_DATA data;
@@ -131,7 +131,7 @@ TEST(FindFirstFile, TellsThatMemoryIsShortForTheHandle) {
   EXPECT_EQ(search, nullptr);
 }
 
-TEST(FindFirstFile, TellsThatMemoryIsShortForTheMatches) {
+TEST(FindFirstFile, ReportsThatMemoryIsShortForTheMatches) {
   const TemporaryFolder folder;
   folder.make_file("a long name that needs memory of its own");
   const std::string pattern = folder / "*";
@@ -172,7 +172,7 @@ TEST(FindNextFile, GoesThroughTheMatchesInOrderAndEndsSilently) {
   EXPECT_EQ(FindClose(search), 1);
 }
 
-TEST(FindNextFile, TellsOfAMatchThatIsGoneAndGoesOnBehindIt) {
+TEST(FindNextFile, ReportsAMatchThatIsGoneAndGoesOnAfterIt) {
   const TemporaryFolder folder;
   for (const char* name : {"a", "b", "c"}) folder.make_file(name);
   _WIN32_FIND_DATA data = marked_data();
@@ -187,7 +187,7 @@ TEST(FindNextFile, TellsOfAMatchThatIsGoneAndGoesOnBehindIt) {
   EXPECT_EQ(FindClose(search), 1);
 }
 
-TEST(FindNextFile, NamesWhatStandsBehindTheLastSlash) {
+TEST(FindNextFile, NamesWhatFollowsTheLastSlash) {
   const TemporaryFolder folder;
   folder.make_folder("sub");
   _WIN32_FIND_DATA data = marked_data();

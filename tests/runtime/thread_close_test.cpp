@@ -175,7 +175,7 @@ TEST(CloseThreadHandle, ByTheThreadItselfDoesNotWaitForItselfAndLeavesNothingBeh
   EXPECT_TRUE(gives_threads_back(close_by_the_thread_itself));
 }
 
-TEST(CleanupThread, AnotherMakersThreadLeavesAnEntryThatTheNextOwnerReplaces) {
+TEST(CleanupThread, AForeignThreadLeavesAnEntryThatTheNextOwnerReplaces) {
   pthread_attr_t attributes;
   pthread_attr_init(&attributes);
   pthread_attr_setstacksize(&attributes, 524288);

@@ -48,7 +48,7 @@ class RtpOverTcp : public testing::Test {
   unsigned int timestamp_ = 2;
 };
 
-TEST_F(RtpOverTcp, GivesThePayloadAndWhatTheHeaderTells) {
+TEST_F(RtpOverTcp, GivesThePayloadAndTheHeadersFields) {
   pair_.say(interleaved(rtp_header() + "payload") + interleaved(rtp_header() + "next"));
   EXPECT_EQ(receive(), 7);
   EXPECT_EQ(payload(8), "payload#");

@@ -75,7 +75,7 @@ TEST(SendOnce, CountsAPartAsAFailure) {
   for (const int end : ends) close(end);
 }
 
-TEST(ShutdownAndClose, PassesOverNoSocketAndTellsThePeer) {
+TEST(ShutdownAndClose, IgnoresNoSocketAndNotifiesThePeer) {
   shutdown_and_close(-1);
   int ends[2];
   ASSERT_EQ(socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends), 0);

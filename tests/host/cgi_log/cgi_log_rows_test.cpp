@@ -25,7 +25,7 @@ TEST(CgiLogTable, AlignsItsColumns) {
             "2026-03-04 05:06:07.008       -       -  -                                         odd\n");
 }
 
-TEST(CgiLogTable, ARowIsOneLineWhateverTheCameraSays) {
+TEST(CgiLogTable, ARowIsOneLineWhateverTheCameraSends) {
   const std::string row = table_row(exchange("/\xff\xc2", "a\r\nb\x1b[2J\xc2\x9b"), Redactor());
   EXPECT_EQ(row.find('\n'), row.size() - 1);
   EXPECT_TRUE(row.ends_with("  a\\x0d\\x0ab\\x1b[2J\\xc2\x9b\n")) << row;

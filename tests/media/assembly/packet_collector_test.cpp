@@ -115,7 +115,7 @@ TEST(PacketCollector, ALostPacketCostsItsPictureAndThoseUpToTheNextKeyPicture) {
   EXPECT_EQ(collection.shown(), timestamps_of({key, next_key, after}));
 }
 
-TEST(PacketCollector, AKeyPictureBehindAGapIsHeldBackFor200MillisecondsAndNoLonger) {
+TEST(PacketCollector, AKeyPictureAfterAGapIsHeldBackFor200MillisecondsAndNoLonger) {
   ModelStream stream;
   const ModelPicture key = stream.key_picture(2);
   stream.delta_picture(2);  // never arrives
@@ -129,7 +129,7 @@ TEST(PacketCollector, AKeyPictureBehindAGapIsHeldBackFor200MillisecondsAndNoLong
   EXPECT_EQ(collection.shown(), timestamps_of({key, next_key}));
 }
 
-TEST(PacketCollector, WhatArrivesLateWithinThe200MillisecondsCostsNothing) {
+TEST(PacketCollector, WhatArrivesLateWithinThe200MillisecondsLosesNoPicture) {
   ModelStream stream;
   const ModelPicture key = stream.key_picture(2);
   const ModelPicture late = stream.delta_picture(3);
@@ -143,7 +143,7 @@ TEST(PacketCollector, WhatArrivesLateWithinThe200MillisecondsCostsNothing) {
   EXPECT_EQ(collection.shown(), timestamps_of({key, late, next_key}));
 }
 
-TEST(PacketCollector, ACompletePictureBehindAGapWaitsForWhatIsMissing) {
+TEST(PacketCollector, ACompletePictureAfterAGapWaitsForWhatIsMissing) {
   ModelStream stream;
   const ModelPicture key = stream.key_picture(2);
   const ModelPicture late = stream.delta_picture(1);
@@ -265,7 +265,7 @@ struct BareKeyBehindAGap {
   ModelPicture bare = source.bare_key_picture();
 };
 
-TEST(PacketCollector, ALatePacketProvesTheFrontOfAKeyPictureThatStandsBehindIt) {
+TEST(PacketCollector, ALatePacketProvesTheFrontOfTheKeyPictureThatFollowsIt) {
   BareKeyBehindAGap stream;
   Collection collection;
   collection.arrive(stream.key);
@@ -490,7 +490,7 @@ class PacketCollectorModel : public testing::TestWithParam<ChannelCase> {
   std::mt19937 random_{20260101};
 };
 
-TEST_P(PacketCollectorModel, EveryWholePictureBehindAKeyPictureIsHandedOutOnceAndInOrder) {
+TEST_P(PacketCollectorModel, EveryWholePictureAfterAKeyPictureIsHandedOutOnceAndInOrder) {
   ModelStream stream(GetParam().start);
   const std::vector<ModelPicture> pictures = stream.pictures(5000, 25, random_);
   std::vector<bool> whole(pictures.size(), true);

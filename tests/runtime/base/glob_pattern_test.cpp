@@ -116,7 +116,7 @@ TEST(GlobPattern, HyphenAtTheEdgesOfASetIsListed) {
               {"[!-]", "a", true}});
 }
 
-TEST(GlobPattern, ClosingBracketRightBehindTheOpeningIsListed) {
+TEST(GlobPattern, ClosingBracketRightAfterTheOpeningIsListed) {
   expect_all({{"[]]", "]", true},
               {"[]]", "a", false},
               {"[]a]", "a", true},

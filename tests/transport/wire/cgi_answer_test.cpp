@@ -20,7 +20,7 @@ TEST(CgiValue, GoesUpToTheNextPairOrTheEnd) {
   for (const auto& c : cases) EXPECT_EQ(cgi_value(c.answer, c.key), c.value) << c.answer << " " << c.key;
 }
 
-TEST(CgiValue, IsNothingWithoutTheKey) {
+TEST(CgiValue, IsNoneWithoutTheKey) {
   for (const char* answer : {"", "B=1", "a=1", "A", "&&&&"}) EXPECT_EQ(cgi_value(answer, "A="), std::nullopt) << answer;
 }
 

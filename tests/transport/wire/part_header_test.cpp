@@ -7,7 +7,7 @@
 namespace vexa {
 namespace {
 
-TEST(AnnouncedLength, IsTheNumberBehindItsKey) {
+TEST(AnnouncedLength, IsTheNumberAfterItsKey) {
   const struct {
     const char* header;
     std::optional<int> length;

@@ -42,7 +42,7 @@ TEST(ParseRangeClock, TakesALongerFractionAsItIs) {
   EXPECT_EQ(parse_range_clock("20240131T235959.99999999999Z").micros, INT_MAX);
 }
 
-TEST(ParseRangeClock, WithoutAFractionTellsNoSecondsAndTakesTheTimeForIt) {
+TEST(ParseRangeClock, WithoutAFractionGivesNoSecondsAndTakesTheTimeForIt) {
   const RangeClock clock = parse_range_clock("20240131T235959Z");
   EXPECT_TRUE(clock.understood);
   EXPECT_EQ(clock.seconds, std::nullopt);

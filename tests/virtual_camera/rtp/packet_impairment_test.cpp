@@ -130,7 +130,7 @@ TEST(PacketImpairment, BurstsLoseTheirLengthOfPacketsInARow) {
   EXPECT_GT(bursts, 10U);
 }
 
-TEST(PacketImpairment, ReorderedPacketsFallBehindAtMostTheDistanceOfLaterOnes) {
+TEST(PacketImpairment, ReorderedPacketsComeAfterAtMostTheDistanceOfLaterOnes) {
   PacketFaults faults;
   faults.reorder = 0.05;
   faults.reorder_distance = 20;
@@ -152,7 +152,7 @@ TEST(PacketImpairment, ReorderedPacketsFallBehindAtMostTheDistanceOfLaterOnes) {
   EXPECT_GT(distances[1], 10U);
 }
 
-TEST(PacketImpairment, DuplicatesFollowAtOnceOrBehindLaterPackets) {
+TEST(PacketImpairment, DuplicatesFollowAtOnceOrAfterLaterPackets) {
   PacketFaults faults;
   faults.duplicate = 0.01;
   std::vector<Outgoing> packets = through(faults, kMany);
@@ -232,7 +232,7 @@ TEST(PacketImpairment, AMissingMarkerIsClearedInTheHeader) {
   }
 }
 
-TEST(PacketImpairment, FaultsStrikeOnlyPicturesOfTheirWindow) {
+TEST(PacketImpairment, FaultsAffectOnlyPicturesOfTheirWindow) {
   PacketFaults faults;
   faults.loss = 1;
   faults.first_picture = 10;

@@ -44,7 +44,7 @@ TEST(RtpStream, HeadersHoldVersionTypeSequenceTimestampAndSource) {
   for (std::size_t i = 8; i < 12; ++i) EXPECT_EQ(first[i], second[i]);
 }
 
-TEST(RtpStream, MarkerStandsOnTheLastPacketOfEachPicture) {
+TEST(RtpStream, MarkerIsOnTheLastPacketOfEachPicture) {
   CameraOptions options = stream_options();
   RtpStream stream(options, {}, 7, 1);
   std::vector<bool> markers;

@@ -10,7 +10,7 @@
 namespace vexa::camera {
 namespace {
 
-TEST(RtspMessage, ARequestEndsBehindItsBodyAndTheEmptyLinesThatFollow) {
+TEST(RtspMessage, ARequestEndsAfterItsBodyAndTheEmptyLinesThatFollow) {
   const std::string head = "TEARDOWN rtsp://h/a RTSP/1.0\r\nCSeq: 5\r\n";
   const struct {
     std::string received;
@@ -153,7 +153,7 @@ TEST(SessionDescription, ParameterSetsAreNamedWhereTheyFit) {
   EXPECT_EQ(describe_session(options, format, whole.size() - 1).find("sprop"), std::string::npos);
 }
 
-TEST(RtspMessage, RecordingsAreNamedBehindMediaWhereNoVideoStreamIs) {
+TEST(RtspMessage, RecordingsAreNamedAfterMediaWhereNoVideoStreamIs) {
   const struct {
     const char* path;
     VideoUrl kind;
