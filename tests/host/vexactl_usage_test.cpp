@@ -77,7 +77,7 @@ TEST(CommandLine, EachMistakeEndsWithOneAndNamesWhatToDo) {
       {{"info", "cam:0"},
        "vexactl: the port in the camera's address is not a number from 1 to 65535\n  For instance: cam1:80.\n"},
       {{"info", "cam", "--user", "admin:hunter2"},
-       "vexactl: a user name cannot hold a colon\n  A password belongs into --password-file or --credentials.\n"},
+       "vexactl: a user name cannot hold a colon\n  A password goes into --password-file or --credentials.\n"},
       {{"info", "cam", "--password-file", "missing"},
        "vexactl: cannot read missing: No such file or directory\n"
        "  Check the file's name and that you may read it.\n"},

@@ -132,10 +132,10 @@ void FaultArguments::add_stream_faults(CLI::App& app) {
       ->type_name("N")
       ->allow_extra_args(false)
       ->group(kStreamGroup);
-  valued("--before-picture", before_picture_, "N TEXT: TEXT stands in front of it (\\r and \\n are known)");
+  valued("--before-picture", before_picture_, "N TEXT: TEXT comes before it (\\r and \\n are known)");
   valued("--cut-picture", cut_picture_, "N BYTES: only so many bytes of it are sent");
   valued("--close-stream", close_stream_, "N BYTES: the connection closes after so many bytes of it");
-  valued("--silence-stream", silence_, "N BYTES: nothing comes after so many bytes of it");
+  valued("--silence-stream", silence_, "N BYTES: it falls silent after so many bytes");
   valued("--pause-stream", pause_, "N MS: it comes later by this time, and so does all that follows");
   valued("--other-clip", other_clip_, "N FILE: from here on the stream sends this file");
 }
