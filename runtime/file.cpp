@@ -124,7 +124,9 @@ int MoveFile(const char* from, const char* to) {
   return 0;
 }
 
-int DeleteFile(const char* path) { return done_or_reported(unlink(or_empty(path)), "DeleteFile unlink", or_empty(path)); }
+int DeleteFile(const char* path) {
+  return done_or_reported(unlink(or_empty(path)), "DeleteFile unlink", or_empty(path));
+}
 
 typedHandle* CreateFile(const char* path, unsigned long access, unsigned long, _SECURITY_ATTRIBUTES*,
                         unsigned long creation, unsigned long, typedHandle*) {

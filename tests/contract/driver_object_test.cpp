@@ -1,4 +1,4 @@
-// A new driver object: its members, what it knows before it is told anything, and what its end gives back.
+// A new driver object: its members, their first values, and what its end releases.
 #include <arpa/inet.h>
 #include <gtest/gtest.h>
 #include <malloc.h>
@@ -317,7 +317,7 @@ TEST(DriverObject, ItsEndClosesTheStopEvent) {
 }
 
 #if !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
-// Under a sanitizer its own leak check says the same.
+// Under a sanitizer its own leak check shows the same.
 TEST(DriverObject, ItsEndFreesTheByteArray) {
   constexpr std::size_t kOwnMapping = std::size_t{40} << 20;
   const std::size_t before = mallinfo2().hblkhd;

@@ -142,7 +142,7 @@ TEST(SetBrightMode, LeavesTheStoredModeAsItWas) {
 
 // ---- Getters ----
 
-/// What a getter says: its result, and the numbers it hands out.
+/// What a getter returns: its result, and the numbers it fills.
 struct Said {
   int result;
   int value;
@@ -285,7 +285,7 @@ TEST(ImageGetters, AskAgainAfterAnEmptyAnswer) {
   EXPECT_EQ(play.complaints(), "");
 }
 
-// ---- The cache behind a change ----
+// ---- The cache after a change ----
 
 TEST(ImageCache, ReportsTheValueBeforeTheChangeUntilTheCameraIsAskedAnew) {
   Driver play({inquiry("camera", "A=1&ViewDR=off&XDNR=low&VisibilityEnhancer=low&IRLed=off&IRLedMaxStrength=3"),

@@ -153,7 +153,7 @@ TEST_P(VideoOutput, IsLeftAloneBySimplePtzOnItsModels) {
 
 INSTANTIATE_TEST_SUITE_P(Rows, VideoOutput, testing::ValuesIn(kOutputs));
 
-/// What GetCurrentSystemInfo says and has filled when an exchange of the script is refused.
+/// What GetCurrentSystemInfo returns and has filled when an exchange of the script is refused.
 template <typename Variant>
 SLibDSystemInfo info_of_refused(Script script) {
   Played<Variant> play(std::move(script));

@@ -1,4 +1,4 @@
-// Where the camera looks, as the text of its pictures tells; and the records of control.
+// The camera's position, read from the text of its pictures; and the records of control.
 #include <gtest/gtest.h>
 
 #include <climits>
@@ -11,7 +11,7 @@ namespace {
 using vexa_test::PtzDriver;
 using vexa_test::PtzUnsent;
 
-/// What GetCurrentPosition says, and what it leaves in a record that held other values.
+/// What GetCurrentPosition returns, and what it leaves in a record that held other values.
 struct PositionSaid {
   int result, pan, tilt, horizontal, vertical;
   bool moving;

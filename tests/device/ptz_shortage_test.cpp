@@ -59,7 +59,8 @@ void give_two_of_each(PtzDriver& driver) {
   driver.m_SavedTimeout = vexa_test::kPatientTimeout;
 }
 
-/// Lets each allocation of the call fail in turn; every failure is told. The camera says `step` when it is asked.
+/// Lets each allocation of the call fail in turn; every failure is reported. The camera answers `step` when it is
+/// asked.
 /// @return how many allocations there are.
 int failures_of(PtzCall call, const ScriptStep& step) {
   for (int nth = 0; nth < 1000; ++nth) {

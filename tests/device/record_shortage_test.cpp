@@ -38,7 +38,7 @@ const RecordRow kRecordRows[] = {
     {"GetCurrentConnectionInfo",
      [](TestDriver& d, HostRecords& host) { return d.GetCurrentConnectionInfo(host.connection); }}};
 
-/// How many allocations of the call there are; each that fails is told.
+/// How many allocations of the call there are; each that fails is reported.
 int failed_records(const RecordRow& row) {
   for (int nth = 0; nth < 1000; ++nth) {
     ScriptedCamera camera({inquiry("system", "ModelName=" + long_record_text() + "&Serial=" + long_record_text()),

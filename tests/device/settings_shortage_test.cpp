@@ -57,7 +57,7 @@ const ShortReadingRow kShortReadings[] = {
        return d.GetIRIlluminator(mode, strength);
      }}};
 
-/// What reading tells when the thread's allocation number `nth` fails; LIBD_OK, and `happened` false, when none did.
+/// What reading returns when the thread's allocation number `nth` fails; LIBD_OK, and `happened` false, when none did.
 ELibDReturnCode read_short_of_memory(const ShortReading read, int nth, const std::string& cached, bool& happened) {
   Played<CVexaCommon> play({inquiry("camera", kLongAnswer)});
   play.driver.cache_inquiry(cached);

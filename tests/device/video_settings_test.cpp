@@ -41,7 +41,7 @@ struct AnswerRow {
   Change change;  // from the marked record, its codec type 0
 };
 
-/// What stays when an answer says nothing of interest.
+/// What stays when an answer has no key of interest.
 SLibDCameraInfo before_answer() {
   SLibDCameraInfo info = marked_camera_info(3);
   info.streamNumber = 1;

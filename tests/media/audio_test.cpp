@@ -172,7 +172,7 @@ TEST_F(AudioSettings, ThatTheCameraRefusesAreNotStored) {
   EXPECT_EQ(fields_of(driver_.m_AudioInfo), fields_of(SLibDAudioInfo()));
 }
 
-/// Lets each allocation of `call` fail in turn, against a camera that plays `script`; every failure is told.
+/// Lets each allocation of `call` fail in turn, against a camera that plays `script`; every failure is reported.
 /// @return how many allocations there are.
 template <typename Call>
 int audio_calls_short_of_memory(const Script& script, Call call) {

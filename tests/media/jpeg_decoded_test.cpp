@@ -12,7 +12,7 @@
 namespace vexa_test {
 namespace {
 
-/// A decoded picture, and whether the decoder had anything to say of its data.
+/// A decoded picture, and whether the decoder complained.
 struct DecodedJpeg {
   unsigned width = 0;
   unsigned height = 0;

@@ -47,7 +47,7 @@ TEST_P(Playback, GivesEveryPictureAsItWasStoredWithItsStoredTime) {
   EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
 }
 
-// A second before the end of the clock's 32 bits; with it the base moves to the first picture behind the wrap.
+// A second before the end of the clock's 32 bits; with it the base moves to the first picture after the wrap.
 constexpr std::uint32_t kNearTheEnd = 0xFFFFFFFFU - 90000U;
 
 INSTANTIATE_TEST_SUITE_P(Clips, Playback,
@@ -129,7 +129,7 @@ TEST(PlaybackStream, IsNotTornDownWhenTheHostWantsItSo) {
 
 // ---- What goes wrong while it plays ----
 
-/// Moves the driver's clock until the host has been told of the silence.
+/// Moves the driver's clock until the silence is reported to the host.
 ELibDReturnCode code_of_silence(MediaDriver& driver, std::atomic<std::time_t>& now) {
   FrameTaker host;
   TakenFrame frame;

@@ -41,7 +41,7 @@ class RecordedCamera : public LiveCamera {
   }
 
   std::string record(std::uint64_t pictures) {
-    if ((*this)->clip() == nullptr) return {};  // the failure has been told
+    if ((*this)->clip() == nullptr) return {};  // the failure has been reported
     vexa::camera::Card& card = (*this)->card();
     vexa::camera::RecordingHead head;
     head.codec = (*this)->clip()->codec();

@@ -120,7 +120,7 @@ TEST_F(RtpJpegFrames, ADamagedPictureReachesTheHostEmpty) {
 }
 
 TEST_F(RtpJpegFrames, AFirstPacketOf4096BytesIsTakenWhenItFitsAfterTheHeader) {
-  // The JFIF header and what stands behind the RTP and JPEG headers make 4096 bytes at most.
+  // The JFIF header and what stands after the RTP and JPEG headers make 4096 bytes at most.
   send_picture({jpeg_packet(0, Payload(4096 - kJfifHeader, 7))});
   EXPECT_EQ(read(), LIBD_OK);
   EXPECT_EQ(frame_.length, 4096u);

@@ -10,7 +10,7 @@
 
 namespace vexa_test {
 
-/// What must arrive of the stream that the camera logged: a picture whose packets all left, behind a key picture
+/// What must arrive of the stream that the camera logged: a picture whose packets all left, after a key picture
 /// without a gap.
 inline std::vector<std::uint64_t> predicted(const LiveCamera& camera,
                                             const std::vector<vexa::camera::SentPacket>& sent) {

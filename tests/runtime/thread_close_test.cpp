@@ -56,7 +56,7 @@ TEST(CloseThreadHandle, MarksARunningThreadsHandleAsClosed) {
   EXPECT_TRUE(goes_through(gate));
 }
 
-// A host's thread-local object: when the thread is gone as far as its exit code tells, it still has work to do.
+// A host's thread-local object: it still has work to do when the thread's exit code is final.
 struct LateWork {
   struct Task {
     long closer;

@@ -33,7 +33,7 @@ ScriptStep step(const std::string& path, const std::string& answer, Then then = 
   return made;
 }
 
-/// What the latest error says, as "code text".
+/// The latest error as "code text".
 class HttpOpen : public testing::Test {
  protected:
   HttpOpen() { driver_.soil_latest_error(); }
@@ -75,7 +75,7 @@ TEST_F(HttpOpen, GivesASocketThatDoesNotBlockAndIsClosedInChildren) {
   int size = 0;
   socklen_t length = sizeof size;
   EXPECT_EQ(getsockopt(socket, SOL_SOCKET, SO_RCVBUF, &size, &length), 0);
-  EXPECT_EQ(size, 2 * 131072);  // Linux tells twice what was asked for
+  EXPECT_EQ(size, 2 * 131072);  // Linux reports twice what was asked for
   driver_.http_close(socket);
 }
 

@@ -18,7 +18,7 @@
 namespace vexa_test {
 namespace {
 
-/// An interleaved frame of channel 0 that says its packet is `length` bytes long.
+/// An interleaved frame of channel 0 that announces a packet of `length` bytes.
 std::string interleaved(std::string packet, std::size_t length) {
   return std::string("$\0", 2) + static_cast<char>(length >> 8) + static_cast<char>(length) + packet;
 }

@@ -72,7 +72,7 @@ TEST_F(RtspHeader, ReadsAfterTheLastPeek) {
     EXPECT_TRUE(eventually([thread] { return is_sleeping(thread); }));
     say(kAnswer.substr(21));
   });
-  // The second look puts the whole answer behind the first 21 bytes; the read goes behind that, and the caller, who
+  // The second peek puts the whole answer after the first 21 bytes; the read goes after that, and the caller, who
   // reads from the beginning, sees the first look and what fits of the second.
   EXPECT_EQ(receive(1023, 3000), static_cast<int>(kAnswer.size()));
   camera.join();

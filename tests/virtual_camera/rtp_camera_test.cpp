@@ -229,7 +229,7 @@ TEST(RtpCamera, AClientWhosePortIsClosedDisturbsNoOther) {
   options.pictures = 50;
   VirtualCamera camera(options);
   ASSERT_TRUE(camera.start()) << camera.error();
-  // Held, so that nobody else is given the port, by a socket that hears another peer alone.
+  // Held, so that nobody else is given the port, by a socket that receives from another peer alone.
   asio::io_context context;
   const auto loopback = asio::ip::make_address("127.0.0.1");
   asio::ip::udp::socket closed(context, asio::ip::udp::endpoint(loopback, 0));

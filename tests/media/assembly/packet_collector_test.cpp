@@ -437,7 +437,7 @@ TEST(PacketCollector, LatecomersOfAPictureThatWasGivenUpAreNoRestart) {
 struct Channel {
   const char* name;
   double loss = 0;
-  double reorder = 0;  // held back behind up to 20 packets
+  double reorder = 0;  // held back after up to 20 packets
   double duplicate = 0;
 };
 
@@ -454,7 +454,7 @@ class PacketCollectorModel : public testing::TestWithParam<ChannelCase> {
     double place;
   };
 
-  /// The packets as they arrive; `whole[i]` tells whether all of picture i do.
+  /// The packets as they arrive; `whole[i]`: whether all of picture i do.
   std::vector<Sent> through(const std::vector<ModelPicture>& pictures, std::vector<bool>& whole) {
     const Channel& channel = GetParam().channel;
     std::uniform_real_distribution<double> chance(0, 1);

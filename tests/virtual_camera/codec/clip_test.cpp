@@ -20,7 +20,7 @@ Buffer file_bytes(const std::string& path) {
   return {text.begin(), text.end()};
 }
 
-// Joins NAL units given by their bytes, each behind a start code of its own length.
+// Joins NAL units given by their bytes, each after a start code of its own length.
 Buffer stream_of(const std::vector<std::pair<int, Buffer>>& units) {
   Buffer stream;
   for (const auto& [zeros, unit] : units) {

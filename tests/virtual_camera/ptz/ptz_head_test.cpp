@@ -1,4 +1,4 @@
-// A moving head on a clock that the test sets: what it tells of itself, presets, tours.
+// A moving head on a clock that the test sets: its reports, presets, tours.
 #include "virtual_camera/ptz/ptz_head.h"
 #include "virtual_camera/wire/percent_text.h"
 

@@ -137,7 +137,7 @@ TEST(RtpStream, APictureTakesATextAndOneWithoutIsTheClipsOwn) {
 }
 
 TEST(RtpStream, TimestampsFollowTheStampsOfASourceThatRunsBackwards) {
-  /// Three pictures, one each 40 ms, told from the last to the first.
+  /// Three pictures, one each 40 ms, from the last to the first.
   class Backwards : public PictureSource {
    public:
     [[nodiscard]] const SourceFormat& format() const override { return format_; }
