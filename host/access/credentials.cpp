@@ -14,7 +14,7 @@
 namespace vexa::host {
 namespace {
 
-// The driver sends at most this much of "user:password" and would cut the rest without a word.
+// The driver sends at most this much of "user:password" and would cut the rest without a report.
 constexpr std::size_t kLongestCredentials = 255;
 constexpr std::size_t kLargestFile = 4096;
 

@@ -21,7 +21,7 @@ struct CgiLogLine {
   std::string message;  // the path of a request, or the status and reason of an answer
 };
 
-// `text` is a line without the line break that begins it. Nothing when it is not one that the driver writes.
+// `text` is a line without the line break that begins it. Nullopt when it is not one that the driver writes.
 [[nodiscard]] std::optional<CgiLogLine> parse_cgi_log_line(std::string_view text);
 
 struct CgiRequest {
@@ -42,7 +42,7 @@ struct CgiExchange {
   std::optional<CgiRequest> request;
   std::optional<CgiAnswer> answer;
 
-  // Nothing without both, nor when the clock was put back between them.
+  // Nullopt without both, and when the clock was put back between them.
   [[nodiscard]] std::optional<std::chrono::milliseconds> duration() const;
 };
 
@@ -61,7 +61,7 @@ class CgiLogReader {
   void settle();
   // Another file follows, whose answers may be those to the requests of this one.
   void begin_file();
-  // Nothing follows: a request that still waits has got no answer.
+  // The log ends: a request that still waits has got no answer.
   void finish();
 
   [[nodiscard]] std::size_t lines() const { return lines_; }

@@ -12,7 +12,7 @@ namespace vexa::host {
 [[nodiscard]] std::string table_head();
 // One line, with its end. The camera's own words come last, so that they can pass for no other column.
 [[nodiscard]] std::string table_row(const CgiExchange& exchange, const Redactor& redactor);
-// One line of JSON, with its end; null for what there is not. It is in ASCII, all control characters escaped.
+// One line of JSON, with its end; null for what is missing. It is in ASCII, all control characters escaped.
 [[nodiscard]] std::string json_row(const CgiExchange& exchange, const Redactor& redactor);
 
 }  // namespace vexa::host

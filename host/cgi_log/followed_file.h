@@ -21,10 +21,10 @@ class FollowedFile {
 
   [[nodiscard]] std::optional<Problem> open();
   [[nodiscard]] bool is_regular() const;
-  // How many bytes were read; 0 at the end, as it is now.
+  // The number of bytes read; 0 at the present end.
   [[nodiscard]] Result<std::size_t> read(std::span<char> room);
-  // At the end: whether there is another file of that name by now, or this one has been emptied. Reading goes on at
-  // its beginning then.
+  // At the end: whether the name now leads to another file, or this one has been emptied. Reading then goes on at the
+  // beginning.
   [[nodiscard]] bool begin_successor();
 
  private:

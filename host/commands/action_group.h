@@ -42,7 +42,7 @@ struct ActionGroupText {
   const char* footer;
 };
 
-// What all actions of a group need of a camera's model.
+// Checks what all actions of a group need of a camera's model.
 using ModelCheck = std::optional<Problem> (*)(const ModelCamera&);
 
 // Declares the actions, opens the camera that they share, and runs the chosen one. Owned by the command line.
@@ -67,7 +67,7 @@ class ActionGroup final : public Command {
 // The problem of a model without `part`, or of one that no profile describes.
 [[nodiscard]] Problem model_lacks(const ModelCamera& camera, const std::string& part);
 
-// What a change of `what` comes to.
+// Reports that `what` could not be changed, unless `result` is LIBD_OK; returns the exit code.
 ExitCode report_change(const ModelCamera& camera, Terminal& terminal, const std::string& what, ELibDReturnCode result);
 
 }  // namespace vexa::host

@@ -1,4 +1,4 @@
-// How a command writes its result.
+// Writing a command's result.
 #ifndef HOST_CONSOLE_RESULT_OUTPUT_H_
 #define HOST_CONSOLE_RESULT_OUTPUT_H_
 

@@ -13,8 +13,8 @@
 
 namespace vexa::host {
 
-// Opened with the first picture, so that a recording that never begins leaves no empty file, nor a former recording
-// emptied.
+// Opened with the first picture, so that a recording that never begins leaves no empty file and does not empty a former
+// recording. Owned by a command, used on its thread.
 class FrameFile final : public PictureTarget {
  public:
   explicit FrameFile(std::string path) : path_(std::move(path)) {}

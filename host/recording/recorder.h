@@ -1,4 +1,4 @@
-// Moves live pictures from a driver to their file.
+// Writes live pictures from a driver to a file.
 #ifndef HOST_RECORDING_RECORDER_H_
 #define HOST_RECORDING_RECORDER_H_
 

@@ -1,4 +1,4 @@
-// What a recording has amounted to so far.
+// The figures of a recording so far.
 #ifndef HOST_RECORDING_RECORDING_METER_H_
 #define HOST_RECORDING_RECORDING_METER_H_
 

@@ -24,7 +24,7 @@ class SoundFile {
   SoundFile(FrameFile& file, SoundFormat format) : file_(file), format_(format) {}
 
   [[nodiscard]] std::optional<Problem> write(const unsigned char* sound, std::size_t length);
-  // Tells the WAVE header how much there is.
+  // Writes the length into the WAVE header.
   [[nodiscard]] std::optional<Problem> close();
   [[nodiscard]] std::uint64_t bytes() const { return bytes_; }
 

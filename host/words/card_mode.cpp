@@ -7,7 +7,7 @@
 namespace vexa::host {
 namespace {
 
-// Takes the text up to `separator` off the front of `text`, and the separator with it.
+// Removes the text up to `separator` from the front of `text`, and the separator, and returns it.
 std::string_view take_until(std::string_view& text, char separator) {
   const std::string_view front = text.substr(0, text.find(separator));
   text.remove_prefix(front.size() < text.size() ? front.size() + 1 : front.size());

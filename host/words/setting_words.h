@@ -47,7 +47,7 @@ template <typename Words, typename Value>
   return std::nullopt;
 }
 
-// What `vexactl set` is asked to change.
+// The changes that `vexactl set` is to make.
 struct SettingChanges {
   std::optional<Codec> codec = {};
   std::optional<SLibDResolutionInfo> size = {};
