@@ -69,7 +69,7 @@ Nanoseconds clock_now() { return steady_clock::now().time_since_epoch().count();
   options.rtsp_port = 0;
   vexa::camera::CameraHost cameras(options, kCameras);
   if (!cameras.start()) _exit(1);
-  vexa_bench::say_ready(ready);
+  vexa_bench::report_ready(ready);
   change_contacts(cameras, board, changes);
 }
 

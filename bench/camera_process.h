@@ -43,7 +43,7 @@ class CameraProcess {
 };
 
 /// Says "ready" from the new process.
-inline void say_ready(int ready) {
+inline void report_ready(int ready) {
   if (write(ready, "r", 1) != 1) _exit(1);
 }
 

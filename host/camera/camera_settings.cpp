@@ -28,7 +28,7 @@ class SettingReader {
   template <typename Value, typename Words>
   Json word(ELibDReturnCode (CLibraryDevice::*get)(Value&), const Words& words) {
     Value value{};
-    if (!told((device_.*get)(value))) return nullptr;
+    if (!was_reported((device_.*get)(value))) return nullptr;
     const auto word = word_for(words, value);
     return word ? Json(*word) : Json(nullptr);
   }
@@ -36,7 +36,7 @@ class SettingReader {
   void add_infrared(Json& settings) {
     ELibIRIlluminatorMode mode = LIB_IR_OFF;
     int strength = 0;
-    const bool read = told(device_.GetIRIlluminator(mode, strength));
+    const bool read = was_reported(device_.GetIRIlluminator(mode, strength));
     const auto word = word_for(kInfraredWords, mode);
     settings["infrared"] = read && word ? Json(*word) : Json(nullptr);
     settings["infrared-strength"] = read ? Json(strength) : Json(nullptr);
@@ -46,7 +46,7 @@ class SettingReader {
   [[nodiscard]] ELibDReturnCode failure() const { return failure_; }
 
  private:
-  bool told(ELibDReturnCode result) {
+  bool was_reported(ELibDReturnCode result) {
     const bool unreported = result == LIBD_NOT_SUPPORTED || (result == LIBD_FAILED && !left_a_reason(device_));
     if (result != LIBD_OK && !unreported && failure_ == LIBD_OK) failure_ = result;
     return result == LIBD_OK;

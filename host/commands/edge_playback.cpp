@@ -112,7 +112,7 @@ class PlaybackAction : public CameraAction {
     return taken;
   }
 
-  ExitCode tell(const TakenRecording& taken, Terminal& terminal) const {
+  ExitCode report(const TakenRecording& taken, Terminal& terminal) const {
     const ExitCode written = write_result(terminal, json() ? to_text(object_of(taken)) : line_of(taken));
     return taken.problem ? terminal.report(*taken.problem) : written;
   }
@@ -150,7 +150,7 @@ class PlayRecordingAction final : public PlaybackAction {
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
     const Result<SLibDEdgeStorageRecord> found = find_recording(camera, name());
     if (!found) return terminal.report(found.error());
-    return tell(take(camera, *found, nullptr, terminal), terminal);
+    return report(take(camera, *found, nullptr, terminal), terminal);
   }
 };
 
@@ -181,7 +181,7 @@ class GetRecordingAction final : public PlaybackAction {
                               fmt::format("End --out in {} or .mkv.", usual_extension(*codec))});
     }
     const std::unique_ptr<PictureTarget> file = target().open();
-    return tell(take(camera, *record, file.get(), terminal), terminal);
+    return report(take(camera, *record, file.get(), terminal), terminal);
   }
 
  private:

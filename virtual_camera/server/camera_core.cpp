@@ -124,7 +124,7 @@ void CameraCore::take_calls() {
     if (const std::shared_ptr<CameraCore> core = weak.lock()) core->set_network(plugged);
   };
   state_->requests.settings_changed = [weak = std::weak_ptr<CardRecorder>(recorder_)] {
-    if (const std::shared_ptr<CardRecorder> recorder = weak.lock()) recorder->look();
+    if (const std::shared_ptr<CardRecorder> recorder = weak.lock()) recorder->update();
   };
 }
 
@@ -162,7 +162,7 @@ void CameraCore::stop() {
   running_ = false;
   state_->requests = {};
   plugged_ = true;
-  recorder_->see(true);
+  recorder_->set_reachable(true);
   recorder_->stop();
   back_.cancel();
   state_->alarms.listen(nullptr);
@@ -186,14 +186,14 @@ void CameraCore::vanish_for(std::chrono::milliseconds away) {
 
 void CameraCore::come_back() {
   constexpr std::chrono::milliseconds kRetry{50};
-  recorder_->look();
+  recorder_->update();
   if (plugged_ && !open_ports().empty()) vanish_for(kRetry);
 }
 
 void CameraCore::set_network(bool plugged) {
   if (!running_ || plugged == plugged_) return;
   plugged_ = plugged;
-  recorder_->see(plugged_);
+  recorder_->set_reachable(plugged_);
   back_.cancel();
   vanish();
   if (plugged_) come_back();

@@ -30,10 +30,10 @@ class CardRecorder : public std::enable_shared_from_this<CardRecorder> {
  public:
   explicit CardRecorder(std::shared_ptr<CameraState> state);
 
-  // The address to watch is there or not.
-  void see(bool reachable);
+  // Whether the camera reaches the address that it watches.
+  void set_reachable(bool reachable);
   // The settings may have changed.
-  void look();
+  void update();
   // Ends the recording at once.
   void stop();
 

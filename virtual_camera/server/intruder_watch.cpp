@@ -11,7 +11,7 @@ IntruderWatch::IntruderWatch(std::shared_ptr<CameraState> state) : state_(std::m
 void IntruderWatch::walk(std::chrono::milliseconds duration) {
   const auto now = std::chrono::steady_clock::now();
   state_->stage.enter(walk_through(state_->scene.main_view(now), duration), now);
-  look();
+  check();
 }
 
 void IntruderWatch::stop() {
@@ -28,14 +28,14 @@ void IntruderWatch::report(const std::array<bool, kDetectionWindows>& seen) {
   }
 }
 
-void IntruderWatch::look() {
+void IntruderWatch::check() {
   constexpr std::chrono::milliseconds kInterval{20};
   const auto now = std::chrono::steady_clock::now();
   report(state_->scene.alarmed_windows(now));
   if (!state_->stage.intruder(now)) return;
   pace_.expires_after(kInterval);
   pace_.async_wait([self = shared_from_this()](asio::error_code stopped) {
-    if (!stopped) self->look();
+    if (!stopped) self->check();
   });
 }
 

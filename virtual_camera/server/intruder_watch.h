@@ -24,7 +24,7 @@ class IntruderWatch : public std::enable_shared_from_this<IntruderWatch> {
   void stop();
 
  private:
-  void look();
+  void check();
   void report(const std::array<bool, kDetectionWindows>& seen);
 
   std::shared_ptr<CameraState> state_;

@@ -129,17 +129,17 @@ Answer RtspConnection::setup(const RequestHead& request, std::uint32_t sequence)
   const bool found = classify_url(request.path) == VideoUrl::kTrack || recording_at(request.path, VideoUrl::kTrack);
   if (!found) return status_only("404 Not Found", sequence);
   const AskedTransport asked = asked_transport(request.field("Transport"));
-  if (asked.way == AskedTransport::Way::kNone) return status_only("461 Unsupported Transport", sequence);
+  if (asked.kind == AskedTransport::Kind::kNone) return status_only("461 Unsupported Transport", sequence);
   if (state().sessions.size() >= kMaxSessions) return status_only("453 Not Enough Bandwidth", sequence);
-  MediaTransport way = asked.way == AskedTransport::Way::kUdp ? open_udp(asked) : open_interleaved(asked);
-  if (!way.port) return status_only("500 Internal Server Error", sequence);
+  MediaTransport media = asked.kind == AskedTransport::Kind::kUdp ? open_udp(asked) : open_interleaved(asked);
+  if (!media.port) return status_only("500 Internal Server Error", sequence);
   const auto session = std::make_shared<RtspSession>(shared_state(), state().next_session++, video_number(request.path),
-                                                     std::move(way.port), way.pause);
+                                                     std::move(media.port), media.pause);
   state().sessions[session->number()] = session;
   own_sessions_.push_back(session);
   session->touch();
   const std::string fields = fmt::format("Session: {};timeout={}\r\nTransport: {}\r\n", session->number(),
-                                         state().options.session_timeout.count(), way.transport);
+                                         state().options.session_timeout.count(), media.transport);
   return rtsp_answer({"200 OK", sequence, fields, {}});
 }
 

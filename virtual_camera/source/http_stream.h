@@ -68,7 +68,7 @@ class HttpStream {
   [[nodiscard]] std::string unit_bytes(const std::string& content) const;
   [[nodiscard]] const HttpStreamFault* fault(HttpStreamFault::Action action) const;
   void change_clip(const std::string& path);
-  void strike();
+  void apply_faults();
   [[nodiscard]] bool is_jpeg() const;
   [[nodiscard]] std::chrono::nanoseconds paced(std::chrono::nanoseconds time) const;
 

@@ -25,9 +25,9 @@ constexpr std::size_t kMaxRtspAnswer = 500;
 [[nodiscard]] std::uint32_t session_of(const RequestHead& request);
 // How a host wants its packets: in datagrams, or between the answers on the RTSP connection (RFC 2326, 10.12).
 struct AskedTransport {
-  enum class Way { kNone, kUdp, kInterleaved };
+  enum class Kind { kNone, kUdp, kInterleaved };
 
-  Way way = Way::kNone;
+  Kind kind = Kind::kNone;
   // The client's ports, or the channels; the second is the one after the first unless named.
   std::uint16_t first = 0;
   std::uint16_t second = 0;
