@@ -21,7 +21,7 @@ function(vexa_precompile target)
 endfunction()
 
 vexa_precompile(vexa_virtual_camera <asio.hpp> <fmt/format.h>)
-vexa_precompile(vexactl_parts <CLI/CLI.hpp> <fmt/format.h> <nlohmann/json.hpp>)
+vexa_precompile(vexactl_parts <fmt/format.h> <nlohmann/json.hpp>)
 vexa_precompile(vexactl <CLI/CLI.hpp> <fmt/format.h> <nlohmann/json.hpp>)
 foreach(folder runtime transport media device filter models virtual_camera host contract)
   vexa_precompile(${folder}_tests <gmock/gmock.h> <gtest/gtest.h>)
