@@ -63,7 +63,7 @@ class Mpeg4Picture {
   Mpeg4Picture(BitWriter& out, const SquareGrid& grid)
       : out_(out), brightness_(2 * grid.columns, 2 * grid.rows), blue_(grid.columns, grid.rows), red_(blue_) {}
 
-  // Behind the square's type: no prediction of coefficients, and none but the means.
+  // After the square's type: no prediction of coefficients, and none but the means.
   void put_square(std::uint32_t column, std::uint32_t row, const SquareColour& colour) {
     put_code(out_, "0");
     put_code(out_, "0011");

@@ -16,7 +16,7 @@
 namespace vexa::camera {
 namespace {
 
-// Far above what honest hosts open at once; more connections are closed at once.
+// Far above what well-behaved hosts open at once; more connections are closed at once.
 constexpr std::size_t kMaxConnections = 512;
 
 void keep(std::vector<std::weak_ptr<Connection>>& connections, const std::shared_ptr<Connection>& connection) {

@@ -12,7 +12,7 @@
 namespace vexa::camera {
 namespace {
 
-// Longer requests are refused: the longest honest one is 1023 bytes.
+// Longer requests are refused: a driver's longest is 1023 bytes.
 constexpr std::size_t kMaxRequest = 8192;
 // A held or half-closed connection waits this long for its peer to go.
 constexpr std::chrono::seconds kLingerLimit{60};

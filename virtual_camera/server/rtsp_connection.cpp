@@ -70,7 +70,7 @@ Answer RtspConnection::dispatch(const RequestHead& request, std::uint32_t sequen
   return rtsp_answer({"501 Not Implemented", sequence, kMethods, {}});
 }
 
-// Nothing for a path that names no recording, or one without a picture.
+// Nullopt for a path that names no recording, or one without a picture.
 std::optional<Recording> RtspConnection::recording_at(std::string_view path, VideoUrl as) {
   const RecordingUrl url = recording_url(path);
   if (url.kind != as) return std::nullopt;
