@@ -5,7 +5,7 @@
 #include "device/cgi/audio_text.h"
 #include "device/driver_state.h"
 #include "transport/http_receive.h"
-#include "transport/wire/cgi_answer.h"
+#include "transport/wire/http_answer.h"
 
 namespace {
 

@@ -10,7 +10,7 @@
 #include "device/cgi/input_part.h"
 #include "device/error_record.h"
 #include "device/polled_stream.h"
-#include "media/assembly/assembled_picture.h"
+#include "media/assembly/picture_rules.h"
 #include "media/frame_store.h"
 #include "media/picture_reader.h"
 #include "media/rtp_reception.h"

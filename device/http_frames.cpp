@@ -5,7 +5,7 @@
 #include <utility>
 
 #include "device/driver_state.h"
-#include "media/elementary_reader.h"
+#include "media/picture_reader.h"
 #include "transport/failure.h"
 #include "transport/http_stream.h"
 

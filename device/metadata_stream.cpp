@@ -1,5 +1,5 @@
 // Motion metadata: the polled stream of detection values.
-#include "device/cgi/metadata_frame.h"
+#include "device/cgi/input_part.h"
 #include "device/driver_state.h"
 #include "transport/http_stream.h"
 

@@ -3,11 +3,9 @@
 #include <utility>
 
 #include "device/driver_state.h"
-#include "media/assembly/camera_position.h"
-#include "media/assembly/h264_units.h"
-#include "media/assembly/mpeg4_units.h"
+#include "media/assembly/elementary_unit.h"
 #include "media/assembly/picture_clock.h"
-#include "media/assembly/rtp_jpeg.h"
+#include "media/assembly/rtp_pictures.h"
 #include "transport/wire/rtp_header.h"
 
 namespace {

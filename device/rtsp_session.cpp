@@ -13,7 +13,7 @@
 #include "transport/interleaved_stream.h"
 #include "transport/rtp_socket.h"
 #include "transport/wire/http_request.h"
-#include "transport/wire/keep_alive_schedule.h"
+#include "transport/wire/rtsp_request.h"
 
 namespace vexa {
 

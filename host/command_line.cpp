@@ -7,7 +7,7 @@
 #include <vector>
 
 #include "host/commands/command.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 
 namespace vexa::host {
 namespace {

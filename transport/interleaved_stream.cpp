@@ -5,7 +5,7 @@
 #include "transport/failure.h"
 #include "transport/socket.h"
 #include "transport/wait_budget.h"
-#include "transport/wire/interleaved.h"
+#include "transport/wire/rtp_header.h"
 
 namespace vexa {
 namespace {

@@ -15,7 +15,6 @@
 #include "transport/wait_budget.h"
 #include "transport/wire/http_answer.h"
 #include "transport/wire/http_request.h"
-#include "transport/wire/range_clock.h"
 #include "transport/wire/rtsp_answer.h"
 #include "transport/wire/rtsp_request.h"
 

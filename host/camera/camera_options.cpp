@@ -6,7 +6,7 @@
 #include <cerrno>
 #include <system_error>
 
-#include "host/cgi_log/cgi_log_target.h"
+#include "host/cgi_log/cgi_log.h"
 
 namespace vexa::host {
 namespace {

@@ -4,7 +4,7 @@
 
 #include <memory>
 
-#include "host/base/exit_code.h"
+#include "host/base/problem.h"
 #include "host/console/terminal.h"
 
 namespace CLI {

@@ -1,6 +1,7 @@
 // The result of a step that can fail: its value, or the reason why it failed.
 #pragma once
 
+#include <new>
 #include <optional>
 #include <string>
 #include <utility>
@@ -59,5 +60,16 @@ class [[nodiscard]] Result<void> {
  private:
   std::optional<Failure> failure_;
 };
+
+/// Runs `work`; false when memory ran out in it. Whatever it had made until then is destroyed.
+template <typename Work>
+[[nodiscard]] bool within_memory(Work&& work) {
+  try {
+    std::forward<Work>(work)();
+    return true;
+  } catch (const std::bad_alloc&) {
+    return false;
+  }
+}
 
 }  // namespace vexa

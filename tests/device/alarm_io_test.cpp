@@ -24,7 +24,7 @@ class StopIoStreaming : public testing::Test {
 };
 
 TEST_F(StopIoStreaming, WithoutAStreamSendsNothingAndForgetsPendingPins) {
-  driver_.use(own_loopback_address(), refusing_port(), kPatientTimeout);
+  driver_.use(own_loopback(0), refusing_port(), kPatientTimeout);
   EXPECT_EQ(driver_.StopIoStreaming(), LIBD_OK);
   EXPECT_TRUE(driver_.m_PendingPins.empty());
 }

@@ -11,13 +11,9 @@
 #include "tests/device/settings_exchange.h"
 #include "tests/support/process_state.h"
 
+namespace vexa_test {
 namespace {
 
-using vexa_test::command;
-using vexa_test::inquiry;
-using vexa_test::Played;
-using vexa_test::refusal;
-using vexa_test::SettingsDriver;
 using Driver = Played<CVexaCommon>;
 
 // ---- Setters ----
@@ -75,13 +71,11 @@ class ImageSetter : public testing::TestWithParam<SetterRow> {};
 TEST_P(ImageSetter, SendsOneRequest) {
   Driver play({command(std::string("/command/camera.cgi?") + GetParam().path)});
   EXPECT_EQ(GetParam().set(play.driver), LIBD_OK);
-  EXPECT_EQ(play.complaints(), "");
 }
 
 TEST_P(ImageSetter, ReportsTheLatestErrorWhenItsRequestIsRefused) {
   Driver play({refusal(std::string("/command/camera.cgi?") + GetParam().path)});
   EXPECT_EQ(GetParam().set(play.driver), LIBD_UNAUTHORIZED);
-  EXPECT_EQ(play.complaints(), "");
 }
 
 INSTANTIATE_TEST_SUITE_P(Rows, ImageSetter, testing::ValuesIn(kSetters));
@@ -90,7 +84,6 @@ TEST(SetIRIlluminator, SwitchesOffForAnyModeThatIsNotDayNight) {
   for (const int mode : {-1, 2, 3, INT_MAX, INT_MIN}) {
     Driver play({command("/command/camera.cgi?IRLed=off&IRLedMaxStrength=5")});
     EXPECT_EQ(play.driver.SetIRIlluminator(made<ELibIRIlluminatorMode>(mode), 5), LIBD_OK) << mode;
-    EXPECT_EQ(play.complaints(), "");
   }
 }
 
@@ -137,7 +130,6 @@ TEST(SetBrightMode, LeavesTheStoredModeAsItWas) {
   play.driver.m_PTZControlInfo.brightMode = "Full auto";
   EXPECT_EQ(set_bright_mode(play.driver, "Iris Priority"), LIBD_OK);
   EXPECT_EQ(play.driver.m_PTZControlInfo.brightMode, "Full auto");
-  EXPECT_EQ(play.complaints(), "");
 }
 
 // ---- Getters ----
@@ -194,7 +186,6 @@ TEST_P(ImageGetter, AsksTheCameraWhenNothingIsCachedAndCachesItsAnswer) {
   Driver play({inquiry("camera", GetParam().answer)});
   EXPECT_EQ(GetParam().get(play.driver), GetParam().said) << GetParam().answer;
   EXPECT_EQ(play.driver.cached_inquiry(), GetParam().answer);
-  EXPECT_EQ(play.complaints(), "");
 }
 
 constexpr GetterRow kDayNightRows[] = {{kDayNight, "A=1&DayNightMode=auto&DayNight=on", {1, 10}},
@@ -256,7 +247,6 @@ TEST(ImageGetters, TellTheLatestErrorWhenTheInquiryFails) {
     EXPECT_EQ(said.result, LIBD_UNAUTHORIZED);
     EXPECT_EQ(said.value, kUntouched);
     EXPECT_EQ(play.driver.cached_inquiry(), "");
-    EXPECT_EQ(play.complaints(), "");
   }
 }
 
@@ -282,7 +272,6 @@ TEST(ImageGetters, AskAgainAfterAnEmptyAnswer) {
   Driver play({inquiry("camera", ""), inquiry("camera", "A=1&XDNR=low")});
   EXPECT_EQ(kXdnr(play.driver), (Said{0, kUntouched}));
   EXPECT_EQ(kXdnr(play.driver), (Said{1, 2}));
-  EXPECT_EQ(play.complaints(), "");
 }
 
 // ---- The cache after a change ----
@@ -309,7 +298,6 @@ TEST(ImageCache, ReportsTheValueBeforeTheChangeUntilTheCameraIsAskedAnew) {
   EXPECT_EQ(kXdnr(driver), (Said{1, 0}));
   EXPECT_EQ(kVisibility(driver), (Said{1, 0}));
   EXPECT_EQ(kIlluminator(driver), (Said{1, 1, 9}));
-  EXPECT_EQ(play.complaints(), "");
 }
 
 TEST(ImageCache, LetsAReaderFinishBeforeASetterReturns) {
@@ -326,18 +314,17 @@ TEST(ImageCache, LetsAReaderFinishBeforeASetterReturns) {
     play.driver.m_CameraInquiryLock.Lock();
     std::atomic<long> setter{0};
     auto set = std::async(std::launch::async, [&] {
-      setter = vexa_test::kernel_thread_id();
+      setter = kernel_thread_id();
       return row.set(play.driver);
     });
     const auto has_returned = [&set] { return set.wait_for(std::chrono::seconds(0)) == std::future_status::ready; };
     // The camera has taken the command: what the setter waits for is the lock.
-    EXPECT_TRUE(
-        vexa_test::eventually([&] { return has_returned() || (play.played() && vexa_test::is_sleeping(setter)); }));
+    EXPECT_TRUE(eventually([&] { return has_returned() || (play.played() && is_sleeping(setter)); }));
     EXPECT_FALSE(has_returned()) << row.path;
     play.driver.m_CameraInquiryLock.Unlock();
     EXPECT_EQ(set.get(), LIBD_OK);
-    EXPECT_EQ(play.complaints(), "");
   }
 }
 
 }  // namespace
+}  // namespace vexa_test

@@ -53,7 +53,7 @@ TEST_F(IoBox, FixedPartIsHandedOutWhole) {
 }
 
 TEST_F(IoBox, WithoutDetectorsAsksNoCamera) {
-  driver_.use(own_loopback_address(), refusing_port(), kPatientTimeout);
+  driver_.use(own_loopback(0), refusing_port(), kPatientTimeout);
   SLibDIoBoxInfo info;
   info.tamperLevel = 3;
   EXPECT_EQ(driver_.GetIoBoxInfo(info), LIBD_OK);

@@ -10,14 +10,8 @@
 #include "device/cgi/ptz_text.h"
 #include "tests/device/ptz_reach.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::expect_refusal_told;
-using vexa_test::expect_sent;
-using vexa_test::PtzDriver;
-using vexa_test::PtzPlay;
-using vexa_test::PtzUnsent;
-using vexa_test::SentRow;
 
 // ---- The model: magnitudes without signs, digits made one by one ----
 
@@ -398,3 +392,4 @@ TEST(PtzRequests, TellTheLatestErrorWhenTheyAreRefused) {
 }
 
 }  // namespace
+}  // namespace vexa_test

@@ -6,10 +6,8 @@
 
 #include "tests/device/ptz_reach.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::PtzDriver;
-using vexa_test::PtzUnsent;
 
 /// What GetCurrentPosition returns, and what it leaves in a record that held other values.
 struct PositionSaid {
@@ -234,3 +232,4 @@ TEST_F(PtzUnsent, BecauseTheFixedRecordIsTheModels) {
 }
 
 }  // namespace
+}  // namespace vexa_test

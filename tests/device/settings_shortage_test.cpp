@@ -8,12 +8,8 @@
 #include "tests/support/test_driver.h"
 #include "vexa/vexa_variants.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::AllocationFailure;
-using vexa_test::inquiry;
-using vexa_test::Played;
-using vexa_test::SettingsDriver;
 
 // Values longer than what a text holds without memory.
 const char* const kLongAnswer =
@@ -57,46 +53,25 @@ const ShortReadingRow kShortReadings[] = {
        return d.GetIRIlluminator(mode, strength);
      }}};
 
-/// What reading returns when the thread's allocation number `nth` fails; LIBD_OK, and `happened` false, when none did.
-ELibDReturnCode read_short_of_memory(const ShortReading read, int nth, const std::string& cached, bool& happened) {
-  Played<CVexaCommon> play({inquiry("camera", kLongAnswer)});
-  play.driver.cache_inquiry(cached);
-  SLibDCameraInfo info;
-  ELibDReturnCode result = LIBD_OK;
-  {
-    AllocationFailure failure(nth);
-    result = read(play.driver, info);
-    happened = failure.happened();
-  }
-  if (happened) {
-    EXPECT_EQ(vexa_test::text_of_latest_error(play.driver), "Cannot allocate memory") << nth;
-  }
-  return result;
-}
-
-/// How many allocations of a reading there are; each that fails is a failure.
-int failed_readings(const ShortReadingRow& row, const std::string& cached) {
-  for (int nth = 0; nth < 1000; ++nth) {
-    bool happened = false;
-    const ELibDReturnCode result = read_short_of_memory(row.read, nth, cached, happened);
-    EXPECT_EQ(result, happened ? LIBD_FAILED : LIBD_OK) << row.name << nth;
-    if (!happened) return nth;
-  }
-  return 1000;
+void expect_failed_readings(const ShortReadingRow& row, const std::string& cached, int few) {
+  SCOPED_TRACE(row.name);
+  fails_at_every_allocation(
+      [&](Shortage& shortage) {
+        Played<CVexaCommon> play({inquiry("camera", kLongAnswer)}, Ends::kAnywhere);
+        play.driver.cache_inquiry(cached);
+        SLibDCameraInfo info;
+        expect_failure_told(shortage, play.driver, [&] { return row.read(play.driver, info); });
+      },
+      few);
 }
 
 TEST(ShortMemory, FailsAReadingThatAsksTheCamera) {
-  for (const ShortReadingRow& row : kShortReadings) {
-    const int failed = failed_readings(row, "");
-    EXPECT_GT(failed, 3) << row.name;
-    EXPECT_LT(failed, 1000) << row.name;
-  }
+  for (const ShortReadingRow& row : kShortReadings) expect_failed_readings(row, "", 3);
 }
 
 TEST(ShortMemory, FailsAReadingOutOfTheCache) {
   for (const ShortReadingRow& row : kShortReadings) {
-    if (std::string(row.name) == "CameraInfo") continue;
-    EXPECT_GT(failed_readings(row, kLongAnswer), 0) << row.name;
+    if (std::string(row.name) != "CameraInfo") expect_failed_readings(row, kLongAnswer, 0);
   }
 }
 
@@ -123,26 +98,14 @@ const ShortCallRow kShortCalls[] = {
 
 TEST(ShortMemory, FailsACallThatNeedsNoCamera) {
   for (const ShortCallRow& row : kShortCalls) {
-    for (int nth = 0;; ++nth) {
-      ASSERT_LT(nth, 1000) << row.name;
+    SCOPED_TRACE(row.name);
+    fails_at_every_allocation([&](Shortage& shortage) {
       SettingsDriver driver;
       driver.m_FixedCameraInfoAvailable = true;
       driver.m_PTZControlInfo.brightMode = "Shutter Priority";
       ASSERT_EQ(driver.SetSolidPTZState(false), LIBD_OK);
-      ELibDReturnCode result = LIBD_OK;
-      bool happened = false;
-      {
-        AllocationFailure failure(nth);
-        result = row.call(driver);
-        happened = failure.happened();
-      }
-      EXPECT_EQ(result, happened ? LIBD_FAILED : LIBD_OK) << row.name << nth;
-      if (!happened) {
-        EXPECT_GT(nth, 0) << row.name;
-        break;
-      }
-      EXPECT_EQ(vexa_test::text_of_latest_error(driver), "Cannot allocate memory") << row.name << nth;
-    }
+      expect_failure_told(shortage, driver, [&] { return row.call(driver); });
+    });
   }
 }
 
@@ -154,86 +117,56 @@ TEST(ShortMemory, LeavesTheRecordOfASettingThatFails) {
   set.imageHeight = 2;
   set.frameRate = 3;
   set.quality = 4;
-  for (int nth = 0;; ++nth) {
-    ASSERT_LT(nth, 1000);
-    Played<CVexaCommon> play({vexa_test::command(path)});
-    ELibDReturnCode result = LIBD_OK;
-    bool happened = false;
-    {
-      AllocationFailure failure(nth);
-      result = play.driver.SetCameraInfo(set);
-      happened = failure.happened();
-    }
-    EXPECT_EQ(result, happened ? LIBD_FAILED : LIBD_OK) << nth;
-    EXPECT_EQ(play.driver.m_CameraInfo.frameRate, happened ? 0 : 3) << nth;
-    EXPECT_EQ(play.driver.m_CameraInfo.codecName, happened ? "" : set.codecName) << nth;
-    if (!happened) break;
-  }
+  fails_at_every_allocation([&](Shortage& shortage) {
+    Played<CVexaCommon> play({command(path)}, Ends::kAnywhere);
+    expect_failure_told(shortage, play.driver, [&] { return play.driver.SetCameraInfo(set); });
+    EXPECT_EQ(play.driver.m_CameraInfo.frameRate, shortage.failed() ? 0 : 3);
+    EXPECT_EQ(play.driver.m_CameraInfo.codecName, shortage.failed() ? "" : set.codecName);
+  });
 }
 
 template <typename Driver>
-void fail_system_info(const vexa_test::Script& script) {
-  for (int nth = 0;; ++nth) {
-    ASSERT_LT(nth, 1000);
-    Played<Driver> play(script);
+void fail_system_info(const Script& script) {
+  fails_at_every_allocation([&](Shortage& shortage) {
+    Played<Driver> play(script, Ends::kAnywhere);
     SLibDSystemInfo info;
-    ELibDReturnCode result = LIBD_OK;
-    bool happened = false;
-    {
-      AllocationFailure failure(nth);
-      result = static_cast<CLibraryDevice&>(play.driver).GetCurrentSystemInfo(info);
-      happened = failure.happened();
-    }
-    EXPECT_EQ(result, happened ? LIBD_FAILED : LIBD_OK) << nth;
-    if (!happened) break;
-    EXPECT_EQ(vexa_test::text_of_latest_error(play.driver), "Cannot allocate memory") << nth;
-  }
+    CLibraryDevice& device = play.driver;
+    expect_failure_told(shortage, device, [&] { return device.GetCurrentSystemInfo(info); });
+  });
 }
 
 TEST(ShortMemory, FailsReadingWhatTheCameraIs) {
   const std::string name(600, 'N');
   const auto system = inquiry("system", "ModelName=" + name + "&SoftVersion=" + name + "&VideoOutMode=pal");
   const auto network = inquiry("network", "MacAddress=" + name);
-  const auto output = vexa_test::command("/command/system.cgi?VideoOutMode=ip");
+  const auto output = command("/command/system.cgi?VideoOutMode=ip");
   fail_system_info<CVexaCommon>({system, network});
   fail_system_info<CVexaHeronCommon>({system, network, output});
   fail_system_info<CVexaSimplePTZCommon>({system, output, network});
 }
 
 TEST(ShortMemory, FailsACommandBeforeTheCameraIsAsked) {
-  vexa_test::TestDriver driver;
+  TestDriver driver;
   driver.use("127.0.0.1", 1, 50);
   const std::string name(500, 'x');
   driver.soil_latest_error();
-  ELibDReturnCode result = LIBD_OK;
-  {
-    AllocationFailure failure(0);
-    result = driver.camera().send("/command/%s", name.c_str());
-    EXPECT_TRUE(failure.happened());
-  }
-  EXPECT_EQ(result, LIBD_FAILED);
+  Shortage shortage(0);
+  expect_failure_told(shortage, driver, [&] { return driver.camera().send("/command/%s", name.c_str()); });
+  EXPECT_TRUE(shortage.failed());
   EXPECT_EQ(driver.latest_error(), "0 Cannot allocate memory");
 }
 
 TEST(ShortMemory, FailsAStepOfBrightness) {
-  for (int nth = 0;; ++nth) {
-    ASSERT_LT(nth, 1000);
-    Played<CVexaCommon> play({inquiry("camera", "A=1&Shutter=0000000000000000000000033")});
+  fails_at_every_allocation([](Shortage& shortage) {
+    Played<CVexaCommon> play({inquiry("camera", "A=1&Shutter=0000000000000000000000033")}, Ends::kAnywhere);
     SLibDBrightModeInfo mode;
     mode.name = "Shutter Priority";
     mode.shutterSpeeds = {{"1/50", 4}, {"1/100", 33}};
     play.driver.m_FixedPTZControlInfo.brightModes = {mode};
     play.driver.m_PTZControlInfo.brightMode = mode.name;
-    bool happened = false;
-    ELibDReturnCode result = LIBD_OK;
-    {
-      AllocationFailure failure(nth);
-      result = play.driver.Bright(1);
-      happened = failure.happened();
-    }
-    EXPECT_EQ(result, happened ? LIBD_FAILED : LIBD_OK) << nth;
-    if (!happened) break;
-  }
+    EXPECT_EQ(shortage.run([&] { return play.driver.Bright(1); }), shortage.failed() ? LIBD_FAILED : LIBD_OK);
+  });
 }
 
 }  // namespace
+}  // namespace vexa_test

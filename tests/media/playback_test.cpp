@@ -183,28 +183,21 @@ TEST(PlaybackStream, ThatEndsOrWhoseRecordingIsDeletedOrWhoseCameraVanishesFalls
 TEST(PlaybackStart, ThatRunsOutOfMemoryAnywhereFailsAndLeavesNothingBehind) {
   RecordedCamera camera(camera_options(), 2);
   const std::size_t descriptors = open_descriptors();
-  bool failed = true;
-  int allocation = 0;
-  for (; failed && allocation < 2000; ++allocation) {
-    MediaDriver driver;
-    camera.introduce(driver);
-    driver.m_NoTearDown = true;  // only the start's own allocations are counted
-    const SLibDEdgeStorageStreamingInfo recording = camera.recording();
-    ELibDReturnCode code = LIBD_NOT_SUPPORTED;
-    {
-      const AllocationFailure failure(allocation);
-      code = driver.StartEdgeStorageVideoStreaming(recording);
-      failed = failure.happened();
-    }
-    EXPECT_EQ(code, failed ? LIBD_FAILED : LIBD_OK) << "allocation " << allocation;
-    EXPECT_EQ(driver.m_ConnectionInfo.timeout, 5000) << "allocation " << allocation;
-    if (!failed) continue;
-    EXPECT_EQ(driver.m_StreamSocket, -1) << "allocation " << allocation;
-    EXPECT_EQ(driver.m_RtspSocket, -1) << "allocation " << allocation;
-    EXPECT_EQ(driver.m_RtpPacketBuffer, nullptr) << "allocation " << allocation;
-  }
-  EXPECT_FALSE(failed);
-  EXPECT_GT(allocation, 20);
+  fails_at_every_allocation(
+      [&camera](Shortage& shortage) {
+        MediaDriver driver;
+        camera.introduce(driver);
+        driver.m_NoTearDown = true;  // only the start's own allocations are counted
+        const SLibDEdgeStorageStreamingInfo recording = camera.recording();
+        const auto start = [&] { return driver.StartEdgeStorageVideoStreaming(recording); };
+        EXPECT_EQ(shortage.run(start), shortage.failed() ? LIBD_FAILED : LIBD_OK);
+        EXPECT_EQ(driver.m_ConnectionInfo.timeout, 5000);
+        if (!shortage.failed()) return;
+        EXPECT_EQ(driver.m_StreamSocket, -1);
+        EXPECT_EQ(driver.m_RtspSocket, -1);
+        EXPECT_EQ(driver.m_RtpPacketBuffer, nullptr);
+      },
+      19);
   EXPECT_TRUE(eventually([&] { return open_descriptors() == descriptors; }));
 }
 

@@ -18,15 +18,14 @@
 
 namespace vexa::camera {
 
+using vexa_test::own_loopback;
+
 constexpr int kPatience = 20000;  // milliseconds for what must come
 constexpr const char* kBasicAdmin = "Authorization: Basic YWRtaW46YWRtaW4=\r\n";
 
-// An address of this process alone, as are the fourteen after it.
-inline std::string own_address() { return vexa_test::own_loopback(1); }
-
 inline CameraOptions test_options() {
   CameraOptions options;
-  options.address = own_address();
+  options.address = own_loopback(1);
   options.rtsp_port = 0;
   return options;
 }

@@ -1,6 +1,8 @@
-// The fixed header of an RTP packet (RFC 3550, 5.1).
+// What stands before the payload of an RTP packet: the fixed header (RFC 3550, 5.1), and the prefix of a packet inside
+// an RTSP connection (RFC 2326, 10.12).
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <optional>
 
@@ -19,5 +21,22 @@ struct RtpHeader {
 
 /// None when the datagram is shorter than the header.
 std::optional<RtpHeader> parse_rtp_header(Bytes datagram);
+
+inline constexpr std::size_t kInterleavedPrefixSize = 4;
+inline constexpr int kRtpVersionNumber = 2;
+
+/// Bytes of the packet that follows, on whatever channel; nullopt when the prefix does not begin with "$".
+std::optional<std::uint16_t> interleaved_length(Bytes prefix);
+
+/// The fields of an RTP header's first byte (RFC 3550, 5.1), as this transport reads them.
+struct RtpFront {
+  int version;
+  std::size_t csrc_bytes;  ///< of the contributing sources between header and payload
+};
+
+RtpFront rtp_front(std::uint8_t first_byte);
+
+/// Payload bytes of a packet of `length` bytes; nullopt when header and sources alone are longer.
+std::optional<std::size_t> interleaved_payload(std::uint16_t length, RtpFront front);
 
 }  // namespace vexa

@@ -16,7 +16,7 @@
 
 #include "virtual_camera/server/journal.h"
 #include "virtual_camera/server/request_faults.h"
-#include "virtual_camera/wire/answer.h"
+#include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {
 

@@ -5,7 +5,7 @@
 #include <map>
 #include <optional>
 
-#include "media/assembly/h264_units.h"
+#include "media/assembly/rtp_pictures.h"
 #include "stream_model.h"
 
 namespace vexa::test {

@@ -8,7 +8,6 @@
 #include <string>
 #include <vector>
 
-#include "virtual_camera/card/card_cgi.h"
 #include "virtual_camera/card/card_source.h"
 #include "virtual_camera/server/card_recorder.h"
 
