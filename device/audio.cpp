@@ -54,8 +54,10 @@ ELibDReturnCode CVexaCommon::SetAudioInfo(SLibDAudioInfo& info) {
 
 ELibDReturnCode CVexaCommon::StartAudioStreaming() {
   StopAudioStreaming();
-  return m_State->errors.run(
-      [&] { return m_State->audio.start([&] { return m_State->camera.open("/audio"); }, m_State->now); });
+  return m_State->errors.run([&] {
+    return m_State->audio.start([&] { return m_State->camera.open("/audio"); }, m_State->now,
+                                vexa::whole_seconds(m_State->connection.timeout()));
+  });
 }
 
 ELibDReturnCode CVexaCommon::StopAudioStreaming() {

@@ -10,9 +10,10 @@ DriverState::DriverState(CVexaCommon& owner)
       connection(owner.m_ConnectionInfo, owner.m_SavedTimeout, owner.m_ConnectionLock),
       log(owner.m_CGILogger, owner.m_CGILogEnabled),
       camera(connection, log, errors, owner.m_InquirySizes),
-      audio(owner.m_AudioLock, owner.m_AudioSocket, owner.m_LastAudioTime),
-      alarms(owner.m_IoStreamLock, owner.m_IoStreamSocket, owner.m_LastIoDataTime),
-      metadata(owner.m_MdStreamLock, owner.m_MdStreamSocket, owner.m_LastMdDataTime) {}
+      readiness(&owner, now),
+      audio({owner.m_AudioLock, owner.m_AudioSocket, owner.m_LastAudioTime}, {readiness, kAudioStream}),
+      alarms({owner.m_IoStreamLock, owner.m_IoStreamSocket, owner.m_LastIoDataTime}, {readiness, kAlarmStream}),
+      metadata({owner.m_MdStreamLock, owner.m_MdStreamSocket, owner.m_LastMdDataTime}, {readiness, kMetadataStream}) {}
 
 std::string DriverState::bright_mode() {
   const Guard guard(driver.m_ConnectionLock);

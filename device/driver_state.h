@@ -1,6 +1,7 @@
 // The state of a driver object besides the fields of its class, and the steps that several of its members share.
 #pragma once
 
+#include <atomic>
 #include <ctime>
 #include <memory>
 #include <span>
@@ -10,6 +11,7 @@
 #include "device/cgi/input_part.h"
 #include "device/error_record.h"
 #include "device/polled_stream.h"
+#include "device/readiness.h"
 #include "media/assembly/picture_rules.h"
 #include "media/frame_store.h"
 #include "media/picture_reader.h"
@@ -18,9 +20,6 @@
 #include "vexa/vexa_common.h"
 
 namespace vexa {
-
-/// The time of day in whole seconds; tests put their own in its place.
-using SecondsClock = std::time_t (*)();
 
 inline std::time_t system_seconds() { return std::time(nullptr); }
 
@@ -35,16 +34,21 @@ inline std::span<char> room_of(char* buffer, int length) {
 struct DriverState {
   explicit DriverState(CVexaCommon& owner);
 
+  /// For functions of the interface that are not the class's.
+  static DriverState& of(CVexaCommon& driver) { return *driver.m_State; }
+
   CVexaCommon& driver;
   ErrorRecord errors;
   Connection connection;
   CgiLog log;
   CameraLink camera;
+  Readiness readiness;
   PolledStream audio;
   PolledStream alarms;
   PolledStream metadata;
   CSimpleLock start_stop_lock;  ///< held by a start or stop of video from begin to end; outermost
   SecondsClock now = system_seconds;
+  std::atomic<bool> prompt_frames{false};
   int teardown_timeout = 15000;       ///< milliseconds for the answer to a TEARDOWN; tests put less in its place
   std::unique_ptr<RtpReception> rtp;  ///< the streaming thread's; null while no RTP streams
   FrameStore spare_frames VEXA_GUARDED_BY(driver.m_FrameQueueLock);
@@ -109,6 +113,8 @@ struct DriverState {
   ELibDReturnCode take_oldest_frame(SLibDVideoFrameInfo& frame);
   void free_frame(CVexaCommon::VideoFrameInfo& frame) VEXA_REQUIRES(driver.m_FrameQueueLock);
   void clear_frame_queue();
+  /// Ends each step that changes the queue or the report of a silence.
+  void note_video() VEXA_REQUIRES(driver.m_FrameQueueLock);
 
   // Settings and the cached inquiry; any thread: device/video_settings.cpp, device/image_controls.cpp
   void store_camera_inquiry(const std::string& answer);

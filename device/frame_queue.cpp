@@ -22,6 +22,7 @@ void CVexaCommon::PropulateFrameInfoList(CVexaCommon* driver, VideoFrameInfo& fr
   vexa::DriverState& state = *driver->m_State;
   const vexa::Guard guard(state.driver.m_FrameQueueLock);  // the caller's already
   state.append_frame(frame, waitKey);
+  state.note_video();
 }
 
 ELibDReturnCode CVexaCommon::GetCurrentVideoFrame(SLibDVideoFrameInfo& frame) {
@@ -38,7 +39,7 @@ void DriverState::queue_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key
     case LIBD_FRAME_DAMAGED:
       driver.m_VideoTimedOut = false;
       append_frame(frame, wait_key);
-      return;
+      break;
     case LIBD_BUFFER_TOO_SMALL:
       driver.m_LargeFrameBuffers = true;
       driver.m_VideoTimedOut = false;
@@ -59,7 +60,8 @@ void DriverState::queue_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key
     case LIBD_UNAUTHORIZED:
       break;
   }
-  free_frame(frame);
+  free_frame(frame);  // unless it is the queue's now
+  note_video();
 }
 
 void DriverState::append_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key) {
@@ -84,6 +86,7 @@ ELibDReturnCode DriverState::take_oldest_frame(SLibDVideoFrameInfo& frame) {
   const Guard guard(driver.m_FrameQueueLock);
   if (driver.m_FrameQueue.empty()) {
     const bool timed_out = std::exchange(driver.m_VideoTimedOut, false);
+    note_video();
     return timed_out ? LIBD_TIMEOUT : LIBD_NO_FRAME;
   }
   CVexaCommon::VideoFrameInfo& oldest = driver.m_FrameQueue.front();
@@ -93,8 +96,11 @@ ELibDReturnCode DriverState::take_oldest_frame(SLibDVideoFrameInfo& frame) {
   frame.microseconds = oldest.microseconds;
   free_frame(oldest);
   driver.m_FrameQueue.pop_front();
+  note_video();
   return LIBD_OK;
 }
+
+void DriverState::note_video() { readiness.set_video(!driver.m_FrameQueue.empty() || driver.m_VideoTimedOut); }
 
 void DriverState::free_frame(CVexaCommon::VideoFrameInfo& frame) {
   spare_frames.give_back(frame.data, frame.capacity);
@@ -109,6 +115,7 @@ void DriverState::clear_frame_queue() {
   delete[] std::exchange(driver.m_StagingBuffer, nullptr);
   driver.m_StagingBufferSize = 0;
   driver.m_VideoTimedOut = false;
+  note_video();
 }
 
 }  // namespace vexa

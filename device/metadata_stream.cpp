@@ -11,8 +11,10 @@ constexpr int kMetadataRoom = 65;  // bytes: a part and its terminator
 
 ELibDReturnCode CVexaCommon::StartModRawData() {
   StopModRawData();
-  return m_State->errors.run(
-      [&] { return m_State->metadata.start([&] { return m_State->camera.open("/mddata.cgi"); }, m_State->now); });
+  return m_State->errors.run([&] {
+    return m_State->metadata.start([&] { return m_State->camera.open("/mddata.cgi"); }, m_State->now,
+                                   m_State->connection.timeout());
+  });
 }
 
 ELibDReturnCode CVexaCommon::GetCurrentPosition(SLibDRawMDFrameInfo& frame) {

@@ -129,6 +129,7 @@ ELibDReturnCode DriverState::begin_rtp_frame(CVexaCommon::VideoFrameInfo& frame,
 
 ELibDReturnCode DriverState::collect_picture(PacketRunPlace& run) {
   errors.clear();
+  rtp->gather.limit(prompt_frames ? BurstGather::kPrompt : BurstGather::kLongest);
   PictureReader reader(*rtp, {stream_source(), driver.m_RtpPacketBuffer, driver.m_RtpClockRate, connection.timeout(),
                               [this] { return stop_is_requested(); }});
   const auto picture = rtp->codec.kind == CodecKind::kJpeg ? reader.next_jpeg() : reader.next();

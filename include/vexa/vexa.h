@@ -18,3 +18,4 @@
 #include "vexa/vexa_common.h"
 #include "vexa/vexa_variants.h"
 #include "vexa/video_info.h"
+#include "vexa/waiting.h"

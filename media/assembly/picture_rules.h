@@ -42,7 +42,7 @@ struct AssembledPicture {
   std::int32_t frame_type = -1;  ///< an ELibDVideoFrameType value
 };
 
-/// What stands after the RTP header.
+/// The packet's bytes after its RTP header.
 inline Bytes payload_of(const SPacketInfo& packet) {
   return Bytes(packet.data, packet.length).subspan(std::min<std::size_t>(kRtpHeaderSize, packet.length));
 }

@@ -18,7 +18,7 @@ const char* const kLongPresetAnswer =
 
 /// Reads into a record of the host's.
 template <typename Record, ELibDReturnCode (CVexaCommon::*kRead)(Record&)>
-ELibDReturnCode read(PtzDriver& driver) {
+ELibDReturnCode read_into(PtzDriver& driver) {
   Record record;
   return (driver.*kRead)(record);
 }
@@ -47,18 +47,18 @@ void expect_each_failure_told(PtzCall call, const ScriptStep& step, int few = 0)
 }
 
 TEST(PtzReading, FailsWhenAnyOneAllocationDoes) {
-  for (const PtzCall call : {read<std::vector<SLibDPresetInfo>, &CVexaCommon::GetPresets>,
-                             read<SLibDCameraTourInfo, &CVexaCommon::GetCameraTourInfo>,
-                             read<SLibDShadowTourInfo, &CVexaCommon::GetShadowTourInfo>}) {
+  const PtzCall calls[] = {read_into<std::vector<SLibDPresetInfo>, &CVexaCommon::GetPresets>,
+                           read_into<SLibDCameraTourInfo, &CVexaCommon::GetCameraTourInfo>,
+                           read_into<SLibDShadowTourInfo, &CVexaCommon::GetShadowTourInfo>};
+  for (const PtzCall call : calls) {
     expect_each_failure_told(call, inquiry("presetposition", kLongPresetAnswer), 5);
   }
 }
 
 TEST(PtzReading, OfTheDriversRecordsFailsWhenAnyOneAllocationDoes) {
-  for (const PtzCall call : {read<SLibDPTZControlInfo, &CVexaCommon::GetPTZControlInfo>,
-                             read<SLibDFixedPTZControlInfo, &CVexaCommon::GetFixedPTZControlInfo>}) {
-    expect_each_failure_told(call, {});
-  }
+  const PtzCall calls[] = {read_into<SLibDPTZControlInfo, &CVexaCommon::GetPTZControlInfo>,
+                           read_into<SLibDFixedPTZControlInfo, &CVexaCommon::GetFixedPTZControlInfo>};
+  for (const PtzCall call : calls) expect_each_failure_told(call, {});
 }
 
 // What is set is made before memory runs short.

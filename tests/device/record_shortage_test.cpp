@@ -11,7 +11,7 @@ namespace vexa_test {
 namespace {
 
 /// A text of more than a text holds by itself.
-std::string long_record_text() { return std::string(40, 't'); }
+std::string long_text() { return std::string(40, 't'); }
 
 /// The host's records, made before memory runs short.
 struct HostRecords {
@@ -21,12 +21,12 @@ struct HostRecords {
   SLibDConnectionInfo connection;
 };
 
-struct RecordRow {
+struct Row {
   const char* name;
   ELibDReturnCode (*call)(TestDriver& driver, HostRecords& host);
 };
 
-const RecordRow kRecordRows[] = {
+const Row kRows[] = {
     {"GetFixedSystemInfo", [](TestDriver& d, HostRecords& host) { return d.GetFixedSystemInfo(host.fixed_system); }},
     {"GetFixedConnectionInfo",
      [](TestDriver& d, HostRecords& host) { return d.GetFixedConnectionInfo(host.fixed_connection); }},
@@ -35,8 +35,8 @@ const RecordRow kRecordRows[] = {
      [](TestDriver& d, HostRecords& host) { return d.GetCurrentConnectionInfo(host.connection); }}};
 
 TEST(RecordsShortOfMemory, AreAFailure) {
-  const std::string text = long_record_text();
-  for (const RecordRow& row : kRecordRows) {
+  const std::string text = long_text();
+  for (const Row& row : kRows) {
     SCOPED_TRACE(row.name);
     fails_at_every_allocation([&](Shortage& shortage) {
       ScriptedCamera camera(
@@ -68,7 +68,7 @@ TEST(GetLatestErrorText, ShortOfMemoryFailsAndKeepsTheText) {
 TEST(SetCurrentConnectionInfo, ShortOfMemoryKeepsTheConnectionWholeAndThrowsNothing) {
   const TemporaryFolder folder;
   SLibDConnectionInfo given;
-  given.host = given.proxyHost = long_record_text();
+  given.host = given.proxyHost = long_text();
   given.timeout = 1234;
   fails_at_every_allocation(
       [&](Shortage& shortage) {

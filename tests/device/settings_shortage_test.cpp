@@ -18,14 +18,14 @@ const char* const kLongAnswer =
     "Quality1=0000000000000000000006&RTSPPort=00000000000000000554&DayNightMode=auto&XDNR=mid&ViewDR=off&"
     "VisibilityEnhancer=mid&IRLed=off&IRLedMaxStrength=0000000000000000000010";
 
-using ShortReading = ELibDReturnCode (*)(SettingsDriver&, SLibDCameraInfo&);
+using Reading = ELibDReturnCode (*)(SettingsDriver&, SLibDCameraInfo&);
 
-struct ShortReadingRow {
+struct ReadingRow {
   const char* name;
-  ShortReading read;
+  Reading read;
 };
 
-const ShortReadingRow kShortReadings[] = {
+const ReadingRow kReadings[] = {
     {"CameraInfo", [](SettingsDriver& d, SLibDCameraInfo& info) { return d.GetCameraInfo(info); }},
     {"DayNight",
      [](SettingsDriver& d, SLibDCameraInfo&) {
@@ -53,7 +53,7 @@ const ShortReadingRow kShortReadings[] = {
        return d.GetIRIlluminator(mode, strength);
      }}};
 
-void expect_failed_readings(const ShortReadingRow& row, const std::string& cached, int few) {
+void expect_failed_readings(const ReadingRow& row, const std::string& cached, int few) {
   SCOPED_TRACE(row.name);
   fails_at_every_allocation(
       [&](Shortage& shortage) {
@@ -66,25 +66,23 @@ void expect_failed_readings(const ShortReadingRow& row, const std::string& cache
 }
 
 TEST(ShortMemory, FailsAReadingThatAsksTheCamera) {
-  for (const ShortReadingRow& row : kShortReadings) expect_failed_readings(row, "", 3);
+  for (const ReadingRow& row : kReadings) expect_failed_readings(row, "", 3);
 }
 
 TEST(ShortMemory, FailsAReadingOutOfTheCache) {
-  for (const ShortReadingRow& row : kShortReadings) {
+  for (const ReadingRow& row : kReadings) {
     if (std::string(row.name) != "CameraInfo") expect_failed_readings(row, kLongAnswer, 0);
   }
 }
 
-// ---- Calls that need no camera ----
+using Call = ELibDReturnCode (*)(SettingsDriver&);
 
-using ShortCall = ELibDReturnCode (*)(SettingsDriver&);
-
-struct ShortCallRow {
+struct CallRow {
   const char* name;
-  ShortCall call;
+  Call call;
 };
 
-const ShortCallRow kShortCalls[] = {
+const CallRow kCalls[] = {
     {"VidCapSize", [](SettingsDriver& d) { return d.SetVidCapSize(1280, 720); }},
     {"SolidPTZ", [](SettingsDriver& d) { return d.SetSolidPTZState(true); }},
     {"ImageMaxSize", [](SettingsDriver& d) { return d.SetImageMaxSize(640, 480, LIBD_VIDEO_PAL); }},
@@ -97,7 +95,7 @@ const ShortCallRow kShortCalls[] = {
     {"BrightAbsolute", [](SettingsDriver& d) { return d.BrightAbsolute(5000); }}};
 
 TEST(ShortMemory, FailsACallThatNeedsNoCamera) {
-  for (const ShortCallRow& row : kShortCalls) {
+  for (const CallRow& row : kCalls) {
     SCOPED_TRACE(row.name);
     fails_at_every_allocation([&](Shortage& shortage) {
       SettingsDriver driver;

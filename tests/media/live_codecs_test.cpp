@@ -34,8 +34,7 @@ TEST_P(Codec, DeliversEveryPictureAcrossTheLoopOfTheClip) {
   options.start_timestamp = 4294900000;
   LiveCamera camera(options);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   const auto frames = FrameTaker().take_all(driver, 120);
   ASSERT_EQ(frames.size(), 120u);
   for (std::size_t i = 0; i < frames.size(); ++i) {
@@ -52,8 +51,7 @@ TEST_P(Codec, ReportsTheCamerasPositionAndLosesNoPicture) {
   options.user_data = "CamPos: 0123,4567,89ab,cdef and more";
   LiveCamera camera(options);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   const auto frames = FrameTaker().take_all(driver, 30);
   ASSERT_EQ(frames.size(), 30u);
   for (std::size_t i = 0; i < frames.size(); ++i) ASSERT_TRUE(camera.sent(i, frames[i].bytes)) << "picture " << i;
@@ -73,8 +71,7 @@ TEST(LiveH264, ReportsTheCamerasPosition) {
   options.user_data = "CamPos: 0123,4567";
   LiveCamera camera(options);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   const auto frames = FrameTaker().take_all(driver, 30);
   ASSERT_EQ(frames.size(), 30u);
   for (std::size_t i = 0; i < frames.size(); ++i) ASSERT_TRUE(camera.sent(i, frames[i].bytes)) << "picture " << i;

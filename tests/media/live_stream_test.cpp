@@ -26,8 +26,7 @@ TEST(LiveStream, EveryFrameEqualsTheEncodersAcrossTheLoopOfTheClip) {
   options.pictures = 300;
   LiveCamera camera(options);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   expect_clip(camera, FrameTaker().take_all(driver, 300), 300);
 }
 
@@ -37,8 +36,7 @@ TEST(LiveStream, PicturesOfSeveralSlicesArriveWhole) {
   options.pictures = 100;
   LiveCamera camera(options);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   expect_clip(camera, FrameTaker().take_all(driver, 100), 100);
 }
 
@@ -55,8 +53,7 @@ TEST(LiveStream, EightCamerasAtOnceLoseNothing) {
   for (auto& camera : cameras) {
     hosts.emplace_back([&camera] {
       MediaDriver driver;
-      camera->introduce(driver);
-      ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+      camera->play(driver);
       expect_clip(*camera, FrameTaker().take_all(driver, kPictures), kPictures);
     });
   }
@@ -76,8 +73,7 @@ TEST(LiveStream, AProcessWith5000OpenDescriptorsStreamsAsWellAsAny) {
   while (descriptors.size() < 5000) descriptors.push_back(open("/dev/null", O_RDONLY | O_CLOEXEC));
   ASSERT_GE(descriptors.back(), 5000);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   EXPECT_GT(driver.m_StreamSocket, 1023);
   expect_clip(camera, FrameTaker().take_all(driver, 50), 50);
   driver.StopVideoStreaming();
@@ -117,8 +113,7 @@ TEST_P(LiveStreamRestart, IsFollowedFromTheNextKeyPicture) {
   if (GetParam().timestamp) options.packet_faults.timestamp_restarts = {{kBefore, 50000000}};
   LiveCamera camera(options);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   const auto frames = take_to_the_end(camera, driver, kAll - 1);
   ASSERT_GE(frames.size(), kBefore + kLast);
   for (std::size_t i = 0; i < kBefore; ++i) ASSERT_EQ(frames[i].bytes, camera.picture(i)) << i;
@@ -141,8 +136,7 @@ TEST(LiveStream, CorruptedPacketsEndInNeitherCrashNorHang) {
   options.packet_faults.last_picture = 200;
   LiveCamera camera(options);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   const auto frames = take_to_the_end(camera, driver, 299);
   ASSERT_GE(frames.size(), 25u);
   for (std::size_t back = 1; back <= 25; ++back) {
