@@ -8,6 +8,9 @@
 
 namespace vexa {
 
+/// Decides whether, and how long, the reader of a stream naps before it reads. Owned by RtpReception, used by the
+/// streaming thread; holds no socket and no clock.
+///
 /// A thread that wakes for each datagram pays for the wake-up more than for the work. On a stream that trickles, a nap
 /// of up to 2 ms after the first datagram makes one wake-up of many; on a stream that comes in bursts, the burst is
 /// there when the thread wakes, and the nap is a wake-up too many. This one measures both: datagrams taken for each
