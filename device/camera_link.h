@@ -3,9 +3,11 @@
 
 #include <atomic>
 #include <map>
+#include <span>
 #include <string>
 
 #include "device/error_record.h"
+#include "device/exchange_ledger.h"
 #include "runtime/base/sync.h"
 #include "transport/http_exchange.h"
 #include "vexa/file_logger.h"
@@ -39,6 +41,8 @@ class Connection {
 
   SLibDConnectionInfo copy();
   int timeout();
+  /// Writes "HOST:PORT", cut where it does not fit.
+  void write_name(std::span<char> room);
   /// The time-out is `milliseconds` for the life of what this returns.
   RaisedTimeout raised(int milliseconds) VEXA_EXCLUDES(lock_);
 
@@ -66,8 +70,9 @@ class CgiLog final : public ExchangeLog {
 /// connection's time-out at most three times, an inquiry four times. Never reads the latest error back.
 class CameraLink {
  public:
-  CameraLink(Connection& connection, CgiLog& log, ErrorRecord& errors, const std::map<std::string, int>& inquiry_sizes)
-      : connection_(connection), log_(log), errors_(errors), inquiry_sizes_(inquiry_sizes) {}
+  CameraLink(Connection& connection, CgiLog& log, ErrorRecord& errors, ExchangeLedger& exchanges,
+             const std::map<std::string, int>& inquiry_sizes)
+      : connection_(connection), log_(log), errors_(errors), exchanges_(exchanges), inquiry_sizes_(inquiry_sizes) {}
 
   /// Requests a path; a new exchange begins. A failure is recorded by the member that asks, not here.
   Result<Socket> open(const std::string& path);
@@ -79,9 +84,12 @@ class CameraLink {
   ELibDReturnCode inquire(const std::string& name, std::string& answer);
 
  private:
+  HttpPeer peer();
+
   Connection& connection_;
   CgiLog& log_;
   ErrorRecord& errors_;
+  ExchangeLedger& exchanges_;
   const std::map<std::string, int>& inquiry_sizes_;
 };
 
