@@ -81,7 +81,8 @@ VEXA_API std::string ProfileFolder();
 VEXA_API std::vector<std::string> ProfileNames();
 
 /// A driver of the model's class with its capability records filled, as if the camera had been identified. It contacts
-/// no camera; the host gives it a connection next. Null when memory is short or `profile.driver` is none of its values.
+/// no camera; the host gives it a connection next. It is a CVexaCommon, so that static_cast reaches what takes one
+/// (vexa/waiting.h). Null when memory is short or `profile.driver` is none of its values.
 VEXA_API std::unique_ptr<CLibraryDevice> MakeDevice(const Profile& profile);
 
 }  // namespace vexa
