@@ -81,8 +81,9 @@ VEXA_API std::string ProfileFolder();
 VEXA_API std::vector<std::string> ProfileNames();
 
 /// A driver of the model's class with its capability records filled, as if the camera had been identified. It contacts
-/// no camera; the host sets its connection next and owns the driver. Null when out of memory or for a `profile.driver`
-/// that is not a DriverClass. Any thread; never blocks.
+/// no camera; the host sets its connection next and owns the driver. It is a CVexaCommon, so that static_cast reaches
+/// what takes one (vexa/waiting.h). Null when out of memory or for a `profile.driver` that is not a DriverClass. Any
+/// thread; never blocks.
 VEXA_API std::unique_ptr<CLibraryDevice> MakeDevice(const Profile& profile);
 
 }  // namespace vexa
