@@ -186,6 +186,7 @@ Result<int> RtspSession::open(const RtspServer& server, const Opening& opening) 
 
 Result<std::string> RtspSession::exchange(const Formatted& request, const Opening& opening) {
   if (request.cut) return kUrlTooLong;
+  ++requests_;
   if (!send(socket_, request.text)) return system_failure();
   return receive_accepted(socket_, {opening.connection.timeout, opening.cancels});
 }

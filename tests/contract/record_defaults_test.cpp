@@ -47,10 +47,8 @@ struct Field {
   std::string expected;
 };
 
-#define FIELD(name, expected)                                                                                      \
-  contract::Field {                                                                                                \
-#name, &record.name, sizeof record.name, alignof(decltype(record.name)), contract::show(record.name), expected \
-  }
+#define FIELD(name, expected) \
+  Field { #name, &record.name, sizeof record.name, alignof(decltype(record.name)), show(record.name), expected }
 
 /// A record made in memory that holds other bytes, so that a field nobody sets is seen.
 template <typename Record>

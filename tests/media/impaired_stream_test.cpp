@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "tests/media/live_camera.h"
+#include "tests/media/statistics_equations.h"
 
 namespace vexa_test {
 namespace {
@@ -39,6 +40,7 @@ std::vector<TakenFrame> take_whole_stream(LiveCamera& camera, MediaDriver& drive
   const auto take_more = [&](std::size_t count, std::chrono::milliseconds patience) {
     const auto more = host.take_all(driver, count, patience);
     frames.insert(frames.end(), more.begin(), more.end());
+    expect_equations(statistics_of(driver));
   };
   while (camera->sent().finished_streams() == 0) take_more(frames.max_size(), std::chrono::milliseconds(50));
   wanted = predicted(camera, camera->sent().snapshot());
@@ -97,6 +99,7 @@ WholeFrames take_from_assembly(LiveCamera& camera, MediaDriver& driver) {
     frame.data = buffer.data();
     frame.capacity = static_cast<unsigned int>(buffer.size());
     const ELibDReturnCode code = driver.GetRtpCurrentVideoFrame(driver.state().stream_codec(), frame);
+    expect_equations(statistics_of(driver));
     if (code == LIBD_OK) frames.emplace_back(buffer.begin(), buffer.begin() + frame.length);
     return code;
   };
@@ -130,6 +133,10 @@ class Impaired : public testing::TestWithParam<Impairment> {
     MediaDriver driver;
     camera.introduce(driver);
     const WholeFrames frames = stream.take(camera, driver);
+    const vexa::StreamStatistics counted = statistics_of(driver);
+    expect_equations(counted);
+    EXPECT_EQ(counted.packetsReceived + counted.packetsDroppedByKernel, camera->sent().sent());
+    EXPECT_EQ(counted.framesHandedOut + counted.framesHeldInQueue, frames.size());
     const std::vector<std::uint64_t> wanted = predicted(camera, camera->sent().snapshot());
     ASSERT_EQ(frames.size(), wanted.size()) << stream.clip << " " << stream.index;
     for (std::size_t i = 0; i < frames.size(); ++i) {
