@@ -7,7 +7,7 @@
 #include <optional>
 #include <vector>
 
-#include "host/base/json_text.h"
+#include "host/base/printable.h"
 #include "host/camera/model_camera.h"
 #include "host/commands/command.h"
 #include "host/commands/detection_picture.h"

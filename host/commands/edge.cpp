@@ -6,7 +6,6 @@
 #include <nlohmann/json.hpp>
 #include <optional>
 
-#include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/commands/edge_actions.h"
 #include "host/console/terminal.h"

@@ -7,7 +7,6 @@
 #include <filesystem>
 #include <nlohmann/json.hpp>
 
-#include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/commands/edge_actions.h"
 #include "host/console/interrupt.h"

@@ -6,7 +6,6 @@
 #include <chrono>
 #include <nlohmann/json.hpp>
 
-#include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/camera/camera_options.h"
 #include "host/camera/video_options.h"

@@ -5,7 +5,7 @@
 #include <nlohmann/json.hpp>
 #include <utility>
 
-#include "host/base/json_text.h"
+#include "host/base/printable.h"
 #include "host/camera/camera_settings.h"
 #include "host/commands/command.h"
 #include "host/console/terminal.h"

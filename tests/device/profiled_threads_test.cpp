@@ -7,7 +7,6 @@
 #include <vector>
 
 #include "tests/media/media_driver.h"
-#include "tests/media/pace.h"
 #include "tests/support/model_camera.h"
 
 namespace vexa_test {

@@ -4,7 +4,7 @@
 #include <nlohmann/json.hpp>
 
 #include "tests/host/camera_fixture.h"
-#include "tests/host/probed_file.h"
+#include "tests/host/program_run.h"
 
 namespace vexa_test {
 namespace {

@@ -3,7 +3,7 @@
 #include <nlohmann/json.hpp>
 
 #include "tests/host/camera_fixture.h"
-#include "tests/host/probed_file.h"
+#include "tests/host/program_run.h"
 #include "tests/support/decoder.h"
 #include "virtual_camera/codec/image_clip.h"
 

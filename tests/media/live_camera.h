@@ -9,7 +9,6 @@
 #include <utility>
 
 #include "tests/media/media_driver.h"
-#include "tests/media/pace.h"
 #include "tests/support/own_address.h"
 #include "virtual_camera/codec/jpeg_picture.h"
 #include "virtual_camera/codec/rtp_packetiser.h"

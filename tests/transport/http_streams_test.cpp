@@ -9,7 +9,7 @@
 #include "media/assembly/start_code.h"
 #include "tests/support/process_state.h"
 #include "tests/support/stream_pair.h"
-#include "tests/transport/stream_driver.h"
+#include "tests/support/test_driver.h"
 #include "vexa/runtime.h"
 
 namespace vexa_test {

@@ -13,7 +13,7 @@
 #include "tests/support/failing_new.h"
 #include "tests/support/process_state.h"
 #include "tests/support/stream_pair.h"
-#include "tests/transport/stream_driver.h"
+#include "tests/support/test_driver.h"
 
 namespace vexa_test {
 namespace {

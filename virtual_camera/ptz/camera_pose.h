@@ -8,6 +8,7 @@
 
 namespace vexa::camera {
 
+// A value: the pose at one moment.
 struct CameraPose {
   double pan = 0;                // degrees, clockwise seen from above
   double tilt = 0;               // degrees, upwards
