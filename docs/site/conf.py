@@ -17,5 +17,6 @@ html_theme_options = {
 }
 html_sidebars = {"**": ["about.html", "navigation.html", "searchbox.html"]}
 html_show_sourcelink = False
+html_copy_source = False
 html_last_updated_fmt = None
 nitpicky = True
