@@ -7,8 +7,8 @@
 #include <random>
 #include <vector>
 
-#include "media/assembly/h264_units.h"
 #include "media/assembly/packet_collector.h"
+#include "media/assembly/rtp_pictures.h"
 #include "transport/wire/packet_order.h"
 #include "transport/wire/rtp_header.h"
 

@@ -1,13 +1,13 @@
 # vexa_batch(TARGET): compiles several files of a target in one go, which makes whole builds several times faster. Files
 # that keep the same name to themselves never share a batch: scripts/batch_sources. An edit may bring such a name in;
 # configuring again puts the files into other batches.
-option(VEXA_BATCHES "Compile several files of a target in one go (needs python3)" OFF)
+set(VEXA_BATCHES OFF CACHE STRING "Compile several files of a target in one go (needs python3): OFF, ON, or TESTS alone")
 if(VEXA_BATCHES)
   find_package(Python3 REQUIRED COMPONENTS Interpreter)
 endif()
 
 function(vexa_batch target)
-  if(NOT VEXA_BATCHES)
+  if(NOT VEXA_BATCHES OR (VEXA_BATCHES STREQUAL TESTS AND NOT target MATCHES "_tests$"))
     return()
   endif()
   get_target_property(sources ${target} SOURCES)

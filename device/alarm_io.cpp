@@ -16,6 +16,10 @@ constexpr int kFailedStreamTimeout = 3000;   // milliseconds
 constexpr int kSilenceGrace = 15000;         // milliseconds
 constexpr int kAlarmDataSettles = 100;       // milliseconds
 
+std::int64_t patience_of(vexa::Connection& connection) {
+  return vexa::whole_seconds(connection.timeout()) + kSilenceGrace;
+}
+
 ELibDReturnCode ask_tampering(vexa::CameraLink& camera, int number, SLibDIoBoxInfo& info) {
   std::string answer;
   if (const auto asked = camera.inquire("system", answer); asked != LIBD_OK) return asked;
@@ -86,7 +90,7 @@ ELibDReturnCode CVexaCommon::StartIoStreaming() {
   }
   const vexa::TurnGuard guard(m_IoStreamLock, m_State->alarms.turn());
   m_PendingPins = std::move(pins);
-  m_LastIoDataTime = m_State->now();
+  m_State->alarms.note_other_data(!m_PendingPins.empty(), m_State->now, patience_of(m_State->connection));
   return LIBD_OK;
 }
 
@@ -106,7 +110,7 @@ ELibDReturnCode CVexaCommon::GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>&
       const vexa::TurnGuard guard(m_IoStreamLock, m_State->alarms.turn());
       if (m_IoStreamSocket != -1 && !m_PendingPins.empty()) {
         pins = std::exchange(m_PendingPins, {});
-        m_LastIoDataTime = m_State->now();
+        m_State->alarms.note_other_data(false, m_State->now, patience_of(m_State->connection));
         return LIBD_OK;
       }
     }
@@ -118,8 +122,7 @@ ELibDReturnCode CVexaCommon::GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>&
       if (part && *part > 0) vexa::take_status_pins(masks, m_FixedIoBoxInfo, pins);
       return part;
     };
-    const std::int64_t patience = vexa::whole_seconds(m_State->connection.timeout()) + kSilenceGrace;
-    const vexa::Outcome polled = m_State->alarms.poll(read, m_State->now, patience);
+    const vexa::Outcome polled = m_State->alarms.poll(read, m_State->now, patience_of(m_State->connection));
     return polled && *polled == LIBD_OK && pins.empty() ? vexa::Outcome(LIBD_NO_FRAME) : polled;
   });
 }
@@ -157,8 +160,9 @@ namespace vexa {
 
 ELibDReturnCode DriverState::open_alarms() {
   const ELibDReturnCode opened = errors.run([&] {
+    const std::int64_t patience = patience_of(connection);
     const RaisedTimeout slow = connection.raised(kAlarmRequestTimeout);
-    return alarms.start([&] { return camera.open("/command/alarmdata.cgi?interval=1"); }, now);
+    return alarms.start([&] { return camera.open("/command/alarmdata.cgi?interval=1"); }, now, patience);
   });
   if (opened == LIBD_OK) return LIBD_OK;
   const Guard guard(driver.m_ConnectionLock);

@@ -5,7 +5,7 @@
 #include "device/cgi/audio_text.h"
 #include "device/driver_state.h"
 #include "transport/http_receive.h"
-#include "transport/wire/cgi_answer.h"
+#include "transport/wire/http_answer.h"
 
 namespace {
 
@@ -61,8 +61,10 @@ ELibDReturnCode CVexaCommon::SetAudioInfo(SLibDAudioInfo& info) {
 ELibDReturnCode CVexaCommon::StartAudioStreaming() {
   vexa::Operation operation(*m_State, __func__);
   StopAudioStreaming();
-  return m_State->errors.run(
-      [&] { return m_State->audio.start([&] { return m_State->camera.open("/audio"); }, m_State->now); });
+  return m_State->errors.run([&] {
+    return m_State->audio.start([&] { return m_State->camera.open("/audio"); }, m_State->now,
+                                vexa::whole_seconds(m_State->connection.timeout()));
+  });
 }
 
 ELibDReturnCode CVexaCommon::StopAudioStreaming() {

@@ -5,8 +5,8 @@
 #include <utility>
 
 #include "device/operation.h"
+#include "runtime/base/result.h"
 #include "runtime/base/text.h"
-#include "runtime/base/within_memory.h"
 #include "transport/failure.h"
 #include "transport/wire/http_request.h"
 #include "vexa/real_time.h"
@@ -61,7 +61,9 @@ HttpPeer CameraLink::peer() { return {connection_.copy(), log_, Operation::cance
 
 Result<Socket> CameraLink::open(const std::string& path) {
   errors_.clear();
-  return open_http(peer(), path);
+  auto socket = open_http(peer(), path);
+  exchanges_.http(1, socket ? nullptr : &socket.failure());
+  return socket;
 }
 
 ELibDReturnCode CameraLink::send(const char* format, ...) {
@@ -83,6 +85,7 @@ ELibDReturnCode CameraLink::inquire(const std::string& name, std::string& answer
     const auto size = inquiry_sizes_.find(name);
     if (size == inquiry_sizes_.end()) return LIBD_FAILED;
     auto received = vexa::inquire(peer(), name, size->second);
+    exchanges_.http(1, received ? nullptr : &received.failure());
     if (!received) return received.failure();
     answer = std::move(*received);
     return LIBD_OK;

@@ -7,6 +7,7 @@
 #include <string>
 
 #include "device/error_record.h"
+#include "device/exchange_ledger.h"
 #include "runtime/base/sync.h"
 #include "transport/http_exchange.h"
 #include "vexa/file_logger.h"
@@ -67,8 +68,9 @@ class CgiLog final : public ExchangeLog {
 /// most twice.
 class CameraLink {
  public:
-  CameraLink(Connection& connection, CgiLog& log, ErrorRecord& errors, const std::map<std::string, int>& inquiry_sizes)
-      : connection_(connection), log_(log), errors_(errors), inquiry_sizes_(inquiry_sizes) {}
+  CameraLink(Connection& connection, CgiLog& log, ErrorRecord& errors, ExchangeLedger& exchanges,
+             const std::map<std::string, int>& inquiry_sizes)
+      : connection_(connection), log_(log), errors_(errors), exchanges_(exchanges), inquiry_sizes_(inquiry_sizes) {}
 
   /// Requests a path; a new exchange begins. Not recorded: the member that asks does.
   Result<Socket> open(const std::string& path);
@@ -85,6 +87,7 @@ class CameraLink {
   Connection& connection_;
   CgiLog& log_;
   ErrorRecord& errors_;
+  ExchangeLedger& exchanges_;
   const std::map<std::string, int>& inquiry_sizes_;
 };
 

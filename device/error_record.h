@@ -7,7 +7,6 @@
 
 #include "runtime/base/result.h"
 #include "runtime/base/sync.h"
-#include "runtime/base/within_memory.h"
 
 namespace vexa {
 

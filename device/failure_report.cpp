@@ -2,7 +2,7 @@
 #include <cstddef>
 
 #include "device/driver_state.h"
-#include "runtime/base/within_memory.h"
+#include "runtime/base/result.h"
 #include "vexa/failure.h"
 
 namespace vexa {

@@ -11,7 +11,7 @@
 #include "transport/failure.h"
 #include "transport/http_receive.h"
 #include "transport/http_stream.h"
-#include "transport/wire/cgi_answer.h"
+#include "transport/wire/http_answer.h"
 #include "transport/wire/http_request.h"
 
 namespace {

@@ -1,11 +1,12 @@
 // Frames from the camera's HTTP image stream.
 #include <sys/time.h>
 
+#include <chrono>
 #include <new>
 #include <utility>
 
 #include "device/driver_state.h"
-#include "media/elementary_reader.h"
+#include "media/picture_reader.h"
 #include "transport/failure.h"
 #include "transport/http_stream.h"
 
@@ -41,6 +42,7 @@ ELibDReturnCode CVexaCommon::GetCurrentFrameData(VideoFrameInfo& frame) {
 
 ELibDReturnCode CVexaCommon::GetCurrentJPEGFrameData(VideoFrameInfo& frame, int& received) {
   frame.frameType = VIDEO_FRAME_JPEG;
+  m_State->begin_frame();
   m_State->errors.clear();
   received = -1;
   const vexa::StoppableSocket source = m_State->stream_source();
@@ -53,6 +55,8 @@ ELibDReturnCode CVexaCommon::GetCurrentJPEGFrameData(VideoFrameInfo& frame, int&
     return part.failure().code;
   }
   if (part->kind == vexa::PicturePart::Kind::kTooLarge) {
+    m_State->ledger.part_begun();
+    m_State->ledger.part_too_large();
     m_State->errors.record({LIBD_BUFFER_TOO_SMALL, vexa::kBufferTooSmall.text});
     m_LastFrameTime = m_State->now();
     return LIBD_BUFFER_TOO_SMALL;
@@ -62,6 +66,7 @@ ELibDReturnCode CVexaCommon::GetCurrentJPEGFrameData(VideoFrameInfo& frame, int&
   frame.length = static_cast<unsigned int>(received);
   m_State->store_position({frame.data, frame.length});
   m_LastFrameTime = m_State->now();
+  m_State->part_is_ready(frame, vexa::kJpegCodec);
   return LIBD_OK;
 }
 
@@ -93,11 +98,32 @@ StreamWindow DriverState::stream_window() {
           {driver.m_StreamFrameStart, driver.m_StreamSearchPos, driver.m_StreamWriteEnd}};
 }
 
+void DriverState::part_is_ready(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec) {
+  ledger.part_begun();
+  ledger.bytes(frame.length, std::chrono::steady_clock::now());
+  ledger.part_assembled();
+  frame_is_ready(frame, codec, facts_of(frame, codec, {}));
+}
+
+// A frame that has begun and is not whole.
+void DriverState::part_is_lost(const CVexaCommon::VideoFrameInfo& frame) {
+  if (frame.length == 0) return;
+  ledger.part_begun();
+  ledger.bytes(frame.length, std::chrono::steady_clock::now());
+  if (frame.length >= frame.capacity) {
+    ledger.part_too_large();
+  } else {
+    ledger.part_incomplete();
+  }
+  ledger.publish();
+}
+
 // Kept: units in front of a picture are lost when the stream falls silent after them; the next read begins anew.
 ELibDReturnCode DriverState::read_elementary_frame(CVexaCommon::VideoFrameInfo& frame, const Codec& codec,
                                                    int& received) {
   frame.frameType = VIDEO_FRAME_INVALID;
   frame.length = 0;
+  begin_frame();
   StreamWindow window = stream_window();
   const StoppableSocket source = stream_source();
   const auto user_data = [this](Bytes text) {
@@ -109,17 +135,23 @@ ELibDReturnCode DriverState::read_elementary_frame(CVexaCommon::VideoFrameInfo& 
                                 connection.timeout(), user_data);
     received = unit ? unit->length : -1;
     if (!unit) {
+      part_is_lost(frame);
       errors.record(unit.failure());
       return unit.failure().code;
     }
-    if (unit->kind == UnitRead::Kind::kSilence) return nothing_yet();
     if (unit->kind == UnitRead::Kind::kPicture) {
       stamp_now(frame);
       driver.m_LastFrameTime = now();
+      part_is_ready(frame, codec);
       return LIBD_OK;
     }
-    if (nothing_yet() == LIBD_TIMEOUT) return LIBD_TIMEOUT;
+    const ELibDReturnCode waited = nothing_yet();
+    if (unit->kind == UnitRead::Kind::kSilence || waited == LIBD_TIMEOUT) {
+      part_is_lost(frame);
+      return waited;
+    }
   }
+  part_is_lost(frame);
   return LIBD_FAILED;
 }
 

@@ -1,5 +1,5 @@
 // Motion metadata: the polled stream of detection values.
-#include "device/cgi/metadata_frame.h"
+#include "device/cgi/input_part.h"
 #include "device/driver_state.h"
 #include "transport/http_stream.h"
 
@@ -12,8 +12,10 @@ constexpr int kMetadataRoom = 65;  // bytes: a part and its terminator
 ELibDReturnCode CVexaCommon::StartModRawData() {
   vexa::Operation operation(*m_State, __func__);
   StopModRawData();
-  return m_State->errors.run(
-      [&] { return m_State->metadata.start([&] { return m_State->camera.open("/mddata.cgi"); }, m_State->now); });
+  return m_State->errors.run([&] {
+    return m_State->metadata.start([&] { return m_State->camera.open("/mddata.cgi"); }, m_State->now,
+                                   m_State->connection.timeout());
+  });
 }
 
 ELibDReturnCode CVexaCommon::GetCurrentPosition(SLibDRawMDFrameInfo& frame) {

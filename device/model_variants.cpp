@@ -4,7 +4,7 @@
 
 #include "device/cgi/image_text.h"
 #include "device/driver_state.h"
-#include "transport/wire/cgi_answer.h"
+#include "transport/wire/http_answer.h"
 #include "vexa/vexa_variants.h"
 
 namespace {

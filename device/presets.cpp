@@ -1,10 +1,9 @@
 // Stored positions. The host counts them from 0, the camera from 1.
 
-#include "device/cgi/preset_text.h"
 #include "device/cgi/ptz_text.h"
 #include "device/driver_state.h"
 #include "runtime/base/sync.h"
-#include "transport/wire/cgi_answer.h"
+#include "transport/wire/http_answer.h"
 
 namespace {
 

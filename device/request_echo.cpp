@@ -3,8 +3,8 @@
 #include <cstdio>
 
 #include "device/driver_state.h"
+#include "runtime/base/result.h"
 #include "runtime/base/text.h"
-#include "runtime/base/within_memory.h"
 #include "vexa/trace.h"
 
 namespace vexa {

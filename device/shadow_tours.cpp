@@ -1,6 +1,5 @@
 // Shadow tours: movements that the camera records and plays back.
 
-#include "device/cgi/shadow_tour_text.h"
 #include "device/cgi/tour_text.h"
 #include "device/driver_state.h"
 

@@ -4,7 +4,7 @@
 #include "runtime/base/sync.h"
 #include "runtime/base/text.h"
 #include "runtime/base/undo.h"
-#include "transport/wire/cgi_answer.h"
+#include "transport/wire/http_answer.h"
 
 namespace {
 

@@ -2,7 +2,7 @@
 #include "vexa/vexa_common.h"
 
 #include "device/driver_state.h"
-#include "runtime/base/within_memory.h"
+#include "runtime/base/result.h"
 #include "vexa/runtime.h"
 
 namespace {

@@ -4,7 +4,7 @@
 
 #include "device/cgi/video_text.h"
 #include "device/driver_state.h"
-#include "runtime/base/number_pair.h"
+#include "runtime/base/scanned_number.h"
 #include "runtime/base/sync.h"
 #include "runtime/base/text.h"
 #include "runtime/base/undo.h"

@@ -7,6 +7,7 @@
 
 #include "device/driver_state.h"
 #include "media/assembly/codec.h"
+#include "media/frame_chronicle.h"
 #include "runtime/base/text.h"
 #include "transport/failure.h"
 #include "transport/wire/http_request.h"
@@ -68,6 +69,8 @@ ELibDReturnCode DriverState::open_live_http(int stream) {
   driver.m_RtpLiveMode = false;
   driver.m_EdgeStoragePlayback = false;
   if (!reset_stream_buffer()) return LIBD_FAILED;
+  ledger.begin_stream(StreamTransport::kHttp);
+  chronicle->begin_stream({}, 0);
   const ELibDReturnCode opened = errors.run([&]() -> Outcome {
     auto socket = camera.open(format_within(kRequestRoom, "/image%d", stream).text);
     set_stream_socket(socket ? socket->release() : -1);
@@ -135,7 +138,9 @@ bool DriverState::allocate_packets() {
   driver.m_RtpPacketBuffer = static_cast<unsigned char*>(std::malloc(PacketRing::kSize));
   if (driver.m_RtpPacketBuffer == nullptr) return false;
   driver.m_RtpPackets.clear();
-  rtp = std::make_unique<RtpReception>(driver.m_RtpPackets, kH264Codec);
+  rtp = std::make_unique<RtpReception>(driver.m_RtpPackets, kH264Codec, ledger.collection());
+  ledger.begin_stream(StreamTransport::kUdp);
+  chronicle->begin_stream({}, 0);
   return true;
 }
 
@@ -210,6 +215,7 @@ unsigned int CVexaCommon::StreamingThread(void* driver) {
       state.take_frame(frame);
       result = state.read_frame(frame);
     });
+    if (!fitted) state.ledger.settle_lost_packet();
     ProcessCurrentFrameData(self, frame, wait_key, fitted ? result : LIBD_TIMEOUT);
     // After a picture from RTP the next read waits for a datagram and for the stop event in one: a wait of its own
     // would cost a wake-up a picture, which is most of what a slow stream costs.
@@ -236,6 +242,7 @@ ELibDReturnCode CVexaCommon::StopVideoStreaming() {
   } else {
     http_close(m_State->stream_socket());
     m_State->release_stream_buffer();
+    m_State->ledger.end_stream();
     m_State->set_stream_socket(-1);
   }
   m_State->clear_frame_queue();
@@ -252,6 +259,9 @@ ELibDReturnCode CVexaCommon::StopRtpVideoStreaming() {
 }
 
 void CVexaCommon::ReleaseRtpPacketsPtr() {
+  if (m_State->rtp != nullptr) m_State->rtp->collector.discard_all();
+  m_State->ledger.end_stream();
+  m_State->chronicle->end_stream();
   m_State->rtp.reset();
   m_RtpPackets.clear();
   std::free(m_RtpPacketBuffer);

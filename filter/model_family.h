@@ -1,4 +1,4 @@
-// What the cameras of one family offer: the tables that the criteria narrow. One file of families/ holds one family.
+// What the cameras of one family offer: the tables that the criteria narrow.
 #pragma once
 
 #include <span>
@@ -25,13 +25,6 @@ struct ModelFamily {
   std::span<const CodecTable> codecs;
   Size largest_moving;  ///< the largest picture under solid PTZ, which is cut out of the captured one
 };
-
-extern const ModelFamily kGeneralFamily;
-extern const ModelFamily kHeronFamily;
-extern const ModelFamily kMarlinFamily;
-extern const ModelFamily kPtzFamily;
-extern const ModelFamily kSimpleHdFamily;
-extern const ModelFamily kSimplePtzFamily;
 
 /// The family of a model; the general one for a model that no family claims.
 const ModelFamily& family_of(std::string_view model);

@@ -3,7 +3,7 @@
 #include <cstdlib>
 #include <string_view>
 
-#include "media/assembly/camera_position.h"
+#include "media/assembly/elementary_unit.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size);
 

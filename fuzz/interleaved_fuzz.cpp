@@ -3,7 +3,6 @@
 #include <cstdint>
 #include <cstdlib>
 
-#include "transport/wire/interleaved.h"
 #include "transport/wire/rtp_header.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size);

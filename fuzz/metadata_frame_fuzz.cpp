@@ -4,7 +4,7 @@
 #include <cstdlib>
 #include <string_view>
 
-#include "device/cgi/metadata_frame.h"
+#include "device/cgi/input_part.h"
 
 namespace {
 

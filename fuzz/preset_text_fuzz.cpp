@@ -3,7 +3,7 @@
 #include <cstdlib>
 #include <string_view>
 
-#include "device/cgi/preset_text.h"
+#include "device/cgi/ptz_text.h"
 
 namespace {
 

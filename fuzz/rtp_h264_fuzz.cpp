@@ -1,6 +1,6 @@
 // Any datagrams: two bytes of length before each.
 #include "fuzz/datagram_feed.h"
-#include "media/assembly/h264_units.h"
+#include "media/assembly/rtp_pictures.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size);
 

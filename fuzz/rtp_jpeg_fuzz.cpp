@@ -2,7 +2,7 @@
 #include <cstdlib>
 
 #include "fuzz/datagram_feed.h"
-#include "media/assembly/rtp_jpeg.h"
+#include "media/assembly/rtp_pictures.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size);
 

@@ -1,7 +1,7 @@
 // Any datagrams: two bytes of length before each.
 #include "fuzz/datagram_feed.h"
-#include "media/assembly/camera_position.h"
-#include "media/assembly/mpeg4_units.h"
+#include "media/assembly/elementary_unit.h"
+#include "media/assembly/rtp_pictures.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size);
 

@@ -4,7 +4,6 @@
 #include <cstdlib>
 #include <string>
 
-#include "device/cgi/shadow_tour_text.h"
 #include "device/cgi/tour_text.h"
 
 namespace {

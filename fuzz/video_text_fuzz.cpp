@@ -5,7 +5,7 @@
 #include <string_view>
 
 #include "device/cgi/video_text.h"
-#include "runtime/base/number_pair.h"
+#include "runtime/base/scanned_number.h"
 
 namespace {
 

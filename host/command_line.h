@@ -2,7 +2,7 @@
 #ifndef HOST_COMMAND_LINE_H_
 #define HOST_COMMAND_LINE_H_
 
-#include "host/base/exit_code.h"
+#include "host/base/problem.h"
 #include "host/console/terminal.h"
 
 namespace vexa::host {

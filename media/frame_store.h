@@ -10,6 +10,7 @@ namespace vexa {
 
 /// Keeps a few frame buffers that are done with, so that a picture need not fetch fresh pages from the system.
 /// Its owner's lock guards it.
+/// The driver owns one. Frames of one size are the rule, so a buffer fits only a request for its own size.
 class FrameStore {
  public:
   FrameStore();

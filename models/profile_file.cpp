@@ -10,9 +10,8 @@
 #include <utility>
 
 #include "models/json_text.h"
-#include "models/profile_reader.h"
+#include "models/reading.h"
 #include "models/schema.h"
-#include "models/schema_text.h"
 #include "vexa/models.h"
 
 namespace vexa {

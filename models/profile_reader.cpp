@@ -1,12 +1,9 @@
-#include "models/profile_reader.h"
-
 #include <algorithm>
 #include <cstdint>
 #include <limits>
 #include <string_view>
 
 #include "models/reading.h"
-#include "models/video_reader.h"
 
 namespace vexa::models {
 namespace {

@@ -1,4 +1,5 @@
-// Reading a part of a profile that obeys the schema: values by key, and the first thing found that is wrong.
+// Reading a profile that obeys the schema into the records that a driver hands out: values by key, and the first thing
+// found that is wrong.
 #ifndef MODELS_READING_H_
 #define MODELS_READING_H_
 
@@ -7,15 +8,18 @@
 #include <string>
 #include <string_view>
 #include <utility>
+#include <variant>
 #include <vector>
 
 #include "models/json_text.h"
 #include "models/schema.h"
 #include "vexa/common_types.h"
+#include "vexa/models.h"
 
 namespace vexa::models {
 
 /// One value of the profile with its path. A part that is missing reads as empty, false and 0.
+/// A plain value that points into the parsed text, which outlives it; one thread reads a profile.
 class Part {
  public:
   Part(const Node* node, std::string path) : node_(node), path_(std::move(path)) {}
@@ -72,6 +76,12 @@ class Complaints {
 
 /// "1920x1080".
 [[nodiscard]] SLibDResolutionInfo read_size(const Part& size, Complaints& complaints);
+
+/// Fills codecs, streams, counts, flip and outputs from the "video" part: video_reader.cpp.
+void read_video(const Part& video, Profile& profile, Complaints& complaints);
+
+/// The whole profile, which has no name yet; what the schema cannot say is checked here: profile_reader.cpp.
+[[nodiscard]] std::variant<Profile, Complaint> read_profile(const Node& root);
 
 }  // namespace vexa::models
 

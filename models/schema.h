@@ -25,6 +25,9 @@ struct Complaint {
 /// a schema that comes from elsewhere the rest is not looked at.
 [[nodiscard]] std::optional<Complaint> check_against(const Node& schema, const Node& value);
 
+/// The profiles' schema. The build makes its .cpp of model_profile.schema.json, so that the two cannot differ.
+extern const char* const kSchemaText;
+
 }  // namespace vexa::models
 
 #endif  // MODELS_SCHEMA_H_

@@ -1,4 +1,4 @@
-#include "models/video_reader.h"
+#include "models/reading.h"
 
 #include <algorithm>
 

@@ -7,8 +7,8 @@
 #include <string_view>
 #include <utility>
 
+#include "runtime/base/result.h"
 #include "runtime/base/sync.h"
-#include "runtime/base/within_memory.h"
 #include "vexa/real_time.h"
 #include "vexa/runtime.h"
 

@@ -16,7 +16,7 @@
 #include <vector>
 
 #include "runtime/base/glob_pattern.h"
-#include "runtime/base/within_memory.h"
+#include "runtime/base/result.h"
 #include "vexa/runtime.h"
 
 namespace {

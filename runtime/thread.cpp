@@ -8,7 +8,7 @@
 #include <new>
 #include <utility>
 
-#include "runtime/base/within_memory.h"
+#include "runtime/base/result.h"
 #include "runtime/handle.h"
 
 namespace {

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cerrno>
+#include <cstring>
 
 #include "runtime/base/result.h"
 
@@ -31,9 +32,17 @@ inline constexpr KnownFailure kKeepAliveTooLong{LIBD_FAILED, "URL too long\n"};
 inline constexpr KnownFailure kNoReason{};
 
 /// The system's text for an error number.
-Failure system_failure(int error = errno);
+inline Failure system_failure(int error = errno) {
+  char text[256];
+  // The GNU form: returns where the text is.
+  return {LIBD_FAILED, strerror_r(error, text, sizeof text)};
+}
 
 /// Why a wait did not answer 1: `expired` for 0, errno's text for -1.
-Failure wait_failure(int answer, const KnownFailure& expired);
+inline Failure wait_failure(int answer, const KnownFailure& expired) {
+  if (answer == 0) return expired;
+  if (answer == -1) return system_failure();
+  return kStrangeStatus;
+}
 
 }  // namespace vexa

@@ -9,7 +9,8 @@
 
 #include "transport/failure.h"
 #include "transport/http_receive.h"
-#include "transport/wire/part_header.h"
+#include "transport/wait_budget.h"
+#include "transport/wire/http_answer.h"
 
 namespace vexa {
 namespace {

@@ -1,10 +1,13 @@
 #include "transport/interleaved_stream.h"
 
 #include <cerrno>
+#include <iterator>
+#include <utility>
 
 #include "transport/failure.h"
 #include "transport/socket.h"
-#include "transport/wire/interleaved.h"
+#include "transport/wait_budget.h"
+#include "transport/wire/rtp_header.h"
 
 namespace vexa {
 namespace {
@@ -49,11 +52,18 @@ Result<std::optional<InterleavedPacket>> receive_interleaved(int socket, std::sp
   if (front.version != kRtpVersionNumber) return kRtpVersion;
   // The contributing sources go where the payload will.
   if (const auto read = receive_exactly(socket, room.first(front.csrc_bytes), limit); !read) return read.failure();
+  std::vector<unsigned char> control_front;
+  if (is_control_channel(bytes_of(prefix))) {
+    control_front.assign(std::begin(fixed), std::end(fixed));
+    control_front.insert(control_front.end(), room.begin(),
+                         room.begin() + static_cast<std::ptrdiff_t>(front.csrc_bytes));
+  }
   const auto payload = interleaved_payload(*length, front);
   if (!payload) return kPayloadLength;
   if (const auto read = receive_exactly(socket, room.first(*payload), limit); !read) return read.failure();
-  return std::optional(
-      InterleavedPacket{static_cast<int>(*payload), parse_rtp_header(bytes_of(fixed)).value_or(RtpHeader{})});
+  const Bytes header = bytes_of(fixed);
+  return std::optional(InterleavedPacket{static_cast<int>(*payload), parse_rtp_header(header).value_or(RtpHeader{}),
+                                         source_of(header), std::move(control_front)});
 }
 
 }  // namespace vexa

@@ -1,6 +1,7 @@
 // Datagrams of an RTP stream over UDP.
 #pragma once
 
+#include <cstdint>
 #include <span>
 
 #include "runtime/base/result.h"
@@ -11,10 +12,24 @@
 
 namespace vexa {
 
+/// Learns when a reader waits. Called by the reading thread.
+class WaitObserver {
+ public:
+  /// No datagram is there: the thread is about to sleep until one comes, or the time is up.
+  virtual void about_to_wait() = 0;
+  /// A datagram has ended the wait.
+  virtual void woken() = 0;
+
+ protected:
+  ~WaitObserver() = default;
+};
+
 /// How a stream's reader lets datagrams gather.
 struct Gathering {
   BurstGather* gather = nullptr;  ///< null: reads each datagram as it comes
   bool in_picture = false;        ///< some packets of a picture are there and the others are on their way
+  WaitObserver* observer = nullptr;
+  std::uint32_t* sender = nullptr;  ///< out: the datagram's sender, an IPv4 address in network order; null: not asked
 };
 
 /// Reads the next datagram into `room`: its length. Reads first and waits only when nothing is there, so that a

@@ -13,7 +13,6 @@
 #include "transport/tcp_connect.h"
 #include "transport/wire/http_answer.h"
 #include "transport/wire/http_request.h"
-#include "transport/wire/range_clock.h"
 #include "transport/wire/rtsp_answer.h"
 #include "transport/wire/rtsp_request.h"
 
@@ -187,6 +186,7 @@ Result<int> RtspSession::open(const RtspServer& server, const Opening& opening) 
 
 Result<std::string> RtspSession::exchange(const Formatted& request, const Opening& opening) {
   if (request.cut) return kUrlTooLong;
+  ++requests_;
   if (!send(socket_, request.text)) return system_failure();
   return receive_accepted(socket_, {opening.connection.timeout, opening.cancels});
 }

@@ -107,6 +107,9 @@ class RtspSession {
   /// One TEARDOWN. The limit is that of the answer.
   Result<> tear_down(int socket, WaitLimit limit);
 
+  /// Requests that were sent, or tried to be.
+  std::uint64_t requests() const { return requests_; }
+
  private:
   bool send(int socket, const std::string& request);
   Result<std::string> exchange(const Formatted& request, const Opening& opening);
@@ -116,6 +119,7 @@ class RtspSession {
   Fields fields_;
   RequestTrace& trace_;
   int socket_ = -1;  ///< of the session being opened
+  std::uint64_t requests_ = 0;
 };
 
 }  // namespace vexa

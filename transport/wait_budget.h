@@ -23,6 +23,7 @@ struct WaitLimit {
 /// fresh for each. Every wait answers 1 (ready), 0 (the budget is used up, or the wait is cancelled) or -1 (errno says
 /// why); a signal does not end it, and a budget of 0 or less looks once. Waits by poll, so that any number of a
 /// descriptor will do.
+/// A value on the stack of the thread that waits; it holds no descriptor.
 class WaitBudget {
  public:
   explicit WaitBudget(WaitLimit limit);

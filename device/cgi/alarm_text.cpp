@@ -1,7 +1,7 @@
 #include "device/cgi/alarm_text.h"
 
 #include "runtime/base/text.h"
-#include "transport/wire/cgi_answer.h"
+#include "transport/wire/http_answer.h"
 
 namespace vexa {
 namespace {

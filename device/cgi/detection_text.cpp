@@ -6,7 +6,7 @@
 #include <iterator>
 
 #include "runtime/base/text.h"
-#include "transport/wire/cgi_answer.h"
+#include "transport/wire/http_answer.h"
 
 namespace vexa {
 namespace {

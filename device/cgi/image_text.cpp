@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <cstdint>
 
-#include "transport/wire/cgi_answer.h"
+#include "transport/wire/http_answer.h"
 
 namespace vexa {
 namespace {

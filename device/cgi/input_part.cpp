@@ -165,6 +165,12 @@ class DetectorTypes {
   std::size_t next_ = 0;
 };
 
+void take_window(std::string_view body, std::string_view key, std::int32_t& value) {
+  auto text = text_after(body, key);
+  if (!text) return;
+  if (const auto number = take_int(*text)) value = *number;
+}
+
 }  // namespace
 
 PinMasks parse_input_part(std::string_view part, MotionReport motion) { return InputPartReader(part, motion).read(); }
@@ -178,6 +184,14 @@ void take_status_pins(PinMasks masks, const SLibDFixedIoBoxInfo& fixed, std::vec
     pins.push_back(pin_of(number, number > fixed.inputCount ? detectors.next() : PIN_TYPE_SENSOR_INPUT));
     pins.back().state = static_cast<std::int32_t>(masks.state >> bit & 1);
   }
+}
+
+void take_metadata(std::string_view body, SLibDRawMDFrameInfo& frame) {
+  const std::string_view text = before_nul(body);
+  take_window(text, "Window1=", frame.window1);
+  take_window(text, "Window2=", frame.window2);
+  take_window(text, "Window3=", frame.window3);
+  take_window(text, "Window4=", frame.window4);
 }
 
 }  // namespace vexa

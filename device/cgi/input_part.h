@@ -35,4 +35,7 @@ inline constexpr std::size_t kMostStatusPins = 32;
 /// has, in kDetectorOrder. Allocates nothing when there is room for kMostStatusPins.
 void take_status_pins(PinMasks masks, const SLibDFixedIoBoxInfo& fixed, std::vector<SLibDPinInfo>& pins);
 
+/// Takes the values of a part's body. A value that it does not have stays as it is.
+void take_metadata(std::string_view body, SLibDRawMDFrameInfo& frame);
+
 }  // namespace vexa

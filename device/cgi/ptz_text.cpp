@@ -4,6 +4,8 @@
 #include <cstdint>
 #include <cstdlib>
 #include <limits>
+#include <optional>
+#include <string>
 
 #include "runtime/base/text.h"
 
@@ -19,6 +21,14 @@ int cut_to_16_bits(long long value) { return static_cast<std::int16_t>(static_ca
 
 // Counted in 64 bits throughout, so that no profile can overflow a product.
 long long share(long long amount, long long whole) { return amount * whole / kHostScale; }
+
+/// Takes what stands before the next comma; `rest` is then what follows it, nothing behind the last piece.
+std::string_view take_piece(std::optional<std::string_view>& rest) {
+  if (!rest) return {};
+  const std::string_view piece = text_before(*rest, ',');
+  rest = text_after(*rest, ",");
+  return piece;
+}
 
 }  // namespace
 
@@ -69,5 +79,28 @@ int zoom_step(int step) { return cut_to_16_bits(static_cast<long long>(step) * k
 int centre_offset(int coordinate, int size) { return held_between(share(coordinate, size), 0, size - 1) - size / 2; }
 
 int area_extent(int extent, int size) { return held_between(share(extent, size), 0, size); }
+
+std::vector<SLibDPresetInfo> unnamed_presets(int count) {
+  std::vector<SLibDPresetInfo> presets;
+  // Safe: a negative count is no size.
+  if (count > 0) presets.resize(static_cast<std::size_t>(count));
+  for (std::size_t i = 0; i < presets.size(); ++i) presets[i].index = static_cast<std::int32_t>(i);
+  return presets;
+}
+
+bool name_presets(std::string_view list, std::vector<SLibDPresetInfo>& presets) {
+  std::optional<std::string_view> rest = list;
+  while (rest) {
+    const std::string_view number = take_piece(rest);
+    const std::string_view name = take_piece(rest);
+    if (number.empty() || name.empty()) return false;
+    const long long index = leading_int(std::string(number)) - 1LL;
+    if (index < 0 || index >= static_cast<long long>(presets.size())) return false;
+    SLibDPresetInfo& preset = presets[static_cast<std::size_t>(index)];
+    preset.index = static_cast<std::int32_t>(index);
+    preset.name = name;
+  }
+  return true;
+}
 
 }  // namespace vexa

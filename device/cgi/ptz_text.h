@@ -1,6 +1,9 @@
 // Scales of motion: the host's speeds, positions and picture coordinates in the camera's units.
 #pragma once
 
+#include <string_view>
+#include <vector>
+
 #include "device/cgi/words.h"
 #include "vexa/ptz_info.h"
 
@@ -55,5 +58,12 @@ int centre_offset(int coordinate, int size);
 
 /// The width or height of an area in pixels.
 int area_extent(int extent, int size);
+
+/// `count` presets without names, in order; none for a negative count.
+std::vector<SLibDPresetInfo> unnamed_presets(int count);
+
+/// Names presets as "NUMBER,NAME,NUMBER,NAME" says, numbers counted from 1. False when the list ends within a pair, or
+/// at an empty piece or a number that no preset has; the names before it stand.
+bool name_presets(std::string_view list, std::vector<SLibDPresetInfo>& presets);
 
 }  // namespace vexa

@@ -7,7 +7,7 @@
 
 #include "runtime/base/calendar.h"
 #include "runtime/base/text.h"
-#include "transport/wire/cgi_answer.h"
+#include "transport/wire/http_answer.h"
 
 namespace vexa {
 namespace {

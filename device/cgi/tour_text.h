@@ -1,4 +1,4 @@
-// Camera tours as the camera writes them, and what shadow tours share with them.
+// Camera tours and shadow tours as the camera writes them.
 #pragma once
 
 #include <optional>
@@ -40,5 +40,18 @@ SLibDCameraTourInfo read_camera_tours(const std::string& answer, int tour_count)
 /// What sets all tours, behind the "?"; nothing when the record is not for exactly `tour_count` tours, a sequence is
 /// missing or more than one tour is on.
 std::optional<std::string> camera_tour_request(const SLibDCameraTourInfo& info, int tour_count, int preset_count);
+
+/// Whether `number` is one of `count` shadow tours that have a letter.
+bool is_shadow_tour(int number, int count);
+
+/// What plays one shadow tour and none of the others, behind the "?".
+std::string shadow_tour_start(int number, int count);
+
+/// Reads the shadow tours 1 to `count`.
+SLibDShadowTourInfo read_shadow_tours(const std::string& answer, int count);
+
+/// What sets all shadow tours, behind the "?"; nothing when the record is not for exactly `count` of them or more than
+/// one is on.
+std::optional<std::string> shadow_tour_request(const SLibDShadowTourInfo& info, int count);
 
 }  // namespace vexa

@@ -10,6 +10,8 @@
 
 namespace vexa::host {
 
+// Holds texts of its own and changes none of them once it is made: any thread may use one, and copies are independent.
+// Each part that prints for others owns a copy.
 class Redactor {
  public:
   Redactor() = default;

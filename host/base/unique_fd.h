@@ -1,13 +1,15 @@
-// A descriptor that closes itself.
+// A descriptor that closes itself, and writing all of something to one.
 #ifndef HOST_BASE_UNIQUE_FD_H_
 #define HOST_BASE_UNIQUE_FD_H_
 
 #include <unistd.h>
 
+#include <cstddef>
 #include <utility>
 
 namespace vexa::host {
 
+// Owns a descriptor: of a file, a pipe or a socket. No lock: one thread at a time has it.
 class UniqueFd {
  public:
   UniqueFd() = default;
@@ -30,6 +32,9 @@ class UniqueFd {
  private:
   int fd_ = -1;
 };
+
+// Writes every byte, across partial writes and signals. Returns 0, or the error's number.
+[[nodiscard]] int write_all(int fd, const void* data, std::size_t length);
 
 }  // namespace vexa::host
 

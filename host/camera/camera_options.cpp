@@ -5,7 +5,7 @@
 #include <CLI/CLI.hpp>
 #include <memory>
 
-#include "host/cgi_log/cgi_log_target.h"
+#include "host/cgi_log/cgi_log.h"
 
 namespace vexa::host {
 namespace {

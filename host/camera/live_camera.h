@@ -21,7 +21,7 @@ struct CameraConnection {
   Credentials credentials;
   int timeout_ms = 0;
   VideoTransport transport = VideoTransport::kUdp;
-  std::optional<std::string> cgi_log = {};           // the file that requests and statuses are appended to
+  std::optional<std::string> cgi_log = {};  // the file that requests and statuses are appended to
   // Takes what the driver traces of RTSP.
   std::function<void(const char* text)> trace = [](const char*) {};
 };
@@ -52,6 +52,8 @@ struct CardMode {
 };
 
 // A model class for any camera that streams video.
+// One for each camera that a command speaks to. Any thread may call it, as any driver; explain() only after a call on
+// the same thread.
 class LiveCamera final : public CVexaCommon {
  public:
   // Gives the driver the camera's address; contacts no camera.

@@ -11,6 +11,7 @@
 
 namespace vexa::host {
 
+// Made once by each command and owned by it; used by the command's thread alone.
 class ModelCamera {
  public:
   // Asks the camera for its model and makes that model's driver. A model without a profile gets the common driver.

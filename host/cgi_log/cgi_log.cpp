@@ -1,9 +1,18 @@
 #include "host/cgi_log/cgi_log.h"
 
+#include <fcntl.h>
+#include <fmt/format.h>
+#include <sys/stat.h>
+
 #include <algorithm>
+#include <cerrno>
+#include <nlohmann/json.hpp>
+#include <system_error>
 #include <utility>
 
 #include "host/base/number_text.h"
+#include "host/base/printable.h"
+#include "host/base/unique_fd.h"
 
 namespace vexa::host {
 namespace {
@@ -48,6 +57,46 @@ std::optional<LogTime> time_of(std::string_view stamp) {
 bool is_banner(std::string_view text) {
   if (text.starts_with("\n" + std::string(kRuleLength, '-'))) return true;
   return begins_like(text, kBannerStamp) && text.substr(kBannerStamp.size()).starts_with(kClosed);
+}
+
+using Json = nlohmann::ordered_json;
+
+struct Cells {
+  std::string_view time;
+  std::string_view duration;
+  std::string_view status;
+  std::string_view request;
+  std::string_view answer;
+};
+
+constexpr std::string_view kNone = "-";
+
+std::string to_line(const Cells& cells) {
+  return fmt::format("{:<23}  {:>6}  {:>6}  {:<40}  {}\n", cells.time, cells.duration, cells.status, cells.request,
+                     cells.answer);
+}
+
+std::string to_text(LogTime time, char separator) {
+  using namespace std::chrono;
+  const auto midnight = floor<days>(time);
+  const year_month_day date{midnight};
+  const hh_mm_ss clock{time - midnight};
+  return fmt::format("{:04}-{:02}-{:02}{}{:02}:{:02}:{:02}.{:03}", static_cast<int>(date.year()),
+                     static_cast<unsigned>(date.month()), static_cast<unsigned>(date.day()), separator,
+                     clock.hours().count(), clock.minutes().count(), clock.seconds().count(),
+                     clock.subseconds().count());
+}
+
+LogTime time_of(const CgiExchange& exchange) {
+  return exchange.request ? exchange.request->time : exchange.answer->time;
+}
+
+// The driver would cut a longer name, and write to another file.
+constexpr std::size_t kLongestPath = 1023;
+
+Problem unwritable(const std::string& path, const std::string& why) {
+  return {ExitCode::kCannotWrite, fmt::format("cannot write {}: {}", path, why),
+          "Give --cgi-log a file in a folder that exists and that you may write to."};
 }
 
 }  // namespace
@@ -143,6 +192,48 @@ void CgiLogReader::take_line(CgiLogLine line) {
   }
   if (waiting_) take_({std::exchange(waiting_, std::nullopt), std::nullopt});
   waiting_ = CgiRequest{line.time, std::move(line.message)};
+}
+
+std::string table_head() {
+  return to_line({.time = "Time", .duration = "ms", .status = "Status", .request = "Request", .answer = "Answer"});
+}
+
+std::string table_row(const CgiExchange& exchange, const Redactor& redactor) {
+  const auto& [request, answer] = exchange;
+  const auto duration = exchange.duration();
+  const std::string time = to_text(time_of(exchange), ' ');
+  const std::string milliseconds(duration ? fmt::format("{}", duration->count()) : kNone);
+  const std::string status(answer && answer->status ? fmt::format("{}", *answer->status) : kNone);
+  const std::string path(request ? printable(redactor(request->path)) : kNone);
+  const std::string reason = answer ? printable(redactor(answer->reason)) : "no answer";
+  return to_line({.time = time, .duration = milliseconds, .status = status, .request = path, .answer = reason});
+}
+
+std::string json_row(const CgiExchange& exchange, const Redactor& redactor) {
+  const auto& [request, answer] = exchange;
+  const auto duration = exchange.duration();
+  Json json;
+  json["time"] = to_text(time_of(exchange), 'T');
+  json["path"] = request ? Json(redactor(request->path)) : Json(nullptr);
+  json["status"] = answer && answer->status ? Json(*answer->status) : Json(nullptr);
+  json["reason"] = answer ? Json(redactor(answer->reason)) : Json(nullptr);
+  json["milliseconds"] = duration ? Json(duration->count()) : Json(nullptr);
+  return json.dump(-1, ' ', true, Json::error_handler_t::replace) + "\n";
+}
+
+std::optional<Problem> check_cgi_log_target(const std::string& path) {
+  if (path.empty()) return Problem{ExitCode::kUsage, "--cgi-log names no file", "For instance: --cgi-log cgi.log."};
+  if (path.size() > kLongestPath) {
+    return Problem{ExitCode::kUsage, fmt::format("the name of --cgi-log is longer than {} characters", kLongestPath),
+                   "Choose a shorter one."};
+  }
+  // Opening a pipe without a reader must not wait for one.
+  const UniqueFd file(open(path.c_str(), O_WRONLY | O_CREAT | O_APPEND | O_NONBLOCK | O_CLOEXEC, 0666));
+  if (!file.valid()) return unwritable(path, std::generic_category().message(errno));
+  struct stat status {};
+  if (fstat(file.get(), &status) != 0) return unwritable(path, std::generic_category().message(errno));
+  if (!S_ISREG(status.st_mode)) return unwritable(path, "not a regular file");
+  return std::nullopt;
 }
 
 }  // namespace vexa::host

@@ -9,6 +9,9 @@
 #include <string>
 #include <string_view>
 
+#include "host/access/redactor.h"
+#include "host/base/problem.h"
+
 namespace vexa::host {
 
 using LogTime = std::chrono::local_time<std::chrono::milliseconds>;
@@ -82,6 +85,15 @@ class CgiLogReader {
   std::size_t foreign_lines_ = 0;
   bool saw_banner_ = false;
 };
+
+[[nodiscard]] std::string table_head();
+// One line, with its end. The camera's own words come last, so that they can pass for no other column.
+[[nodiscard]] std::string table_row(const CgiExchange& exchange, const Redactor& redactor);
+// One line of JSON, with its end; null for what there is not. It is in ASCII, all control characters escaped.
+[[nodiscard]] std::string json_row(const CgiExchange& exchange, const Redactor& redactor);
+
+// The driver does not report a log that it cannot write, so this does. Creates the file.
+[[nodiscard]] std::optional<Problem> check_cgi_log_target(const std::string& path);
 
 }  // namespace vexa::host
 

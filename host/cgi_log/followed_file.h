@@ -13,6 +13,7 @@
 
 namespace vexa::host {
 
+// Owns the descriptor of the file that it reads. One thread: the one that prints the log.
 class FollowedFile {
  public:
   explicit FollowedFile(std::string path) : path_(std::move(path)) {}

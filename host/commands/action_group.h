@@ -12,6 +12,7 @@
 
 namespace vexa::host {
 
+// One action of such a command. Its group owns it and runs at most one, on the program's main thread.
 class CameraAction {
  public:
   CameraAction() = default;
@@ -43,6 +44,8 @@ struct ActionGroupText {
 // What all actions of a group need of a camera's model.
 using ModelCheck = std::optional<Problem> (*)(const ModelCamera&);
 
+// The command itself: reads which action was asked for, checks it, opens the camera and runs it. Owned by the command
+// line; main thread.
 class ActionGroup final : public Command {
  public:
   ActionGroup(ActionGroupText text, ModelCheck check_model, std::vector<std::unique_ptr<CameraAction>> actions)

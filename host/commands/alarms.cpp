@@ -12,7 +12,7 @@
 #include "host/commands/alarm_watch.h"
 #include "host/commands/command.h"
 #include "host/console/interrupt.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 #include "host/words/alarm_words.h"
 #include "host/words/setting_words.h"
 

@@ -4,7 +4,7 @@
 
 #include <memory>
 
-#include "host/base/exit_code.h"
+#include "host/base/problem.h"
 #include "host/console/terminal.h"
 
 namespace CLI {
@@ -13,6 +13,7 @@ class App;
 
 namespace vexa::host {
 
+// The command line owns all commands and runs the one that was typed, on the program's main thread.
 class Command {
  public:
   Command() = default;

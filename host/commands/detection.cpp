@@ -11,7 +11,7 @@
 #include "host/camera/model_camera.h"
 #include "host/commands/command.h"
 #include "host/commands/detection_picture.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 #include "host/words/setting_words.h"
 
 namespace vexa::host {

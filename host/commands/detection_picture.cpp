@@ -1,8 +1,8 @@
 #include "host/commands/detection_picture.h"
 
 #include "host/camera/live_pictures.h"
+#include "host/picture/picture.h"
 #include "host/picture/picture_file.h"
-#include "host/picture/window_drawing.h"
 #include "host/recording/frame_file.h"
 
 namespace vexa::host {

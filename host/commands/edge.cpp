@@ -9,7 +9,7 @@
 #include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/commands/edge_actions.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 #include "host/words/setting_words.h"
 
 namespace vexa::host {

@@ -12,7 +12,7 @@
 #include "host/commands/edge_actions.h"
 #include "host/console/interrupt.h"
 #include "host/console/progress.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 #include "host/picture/picture_decoder.h"
 #include "host/recording/playback_taker.h"
 #include "host/recording/recording_target.h"

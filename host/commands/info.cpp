@@ -9,7 +9,7 @@
 #include "host/base/printable.h"
 #include "host/camera/camera_options.h"
 #include "host/commands/command.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 
 namespace vexa::host {
 namespace {

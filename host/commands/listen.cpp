@@ -16,7 +16,7 @@
 #include "host/commands/command.h"
 #include "host/console/interrupt.h"
 #include "host/console/progress.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 #include "host/recording/sound_file.h"
 
 namespace vexa::host {

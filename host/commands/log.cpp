@@ -5,11 +5,11 @@
 #include <array>
 
 #include "host/access/credentials.h"
-#include "host/cgi_log/cgi_log_rows.h"
+#include "host/cgi_log/cgi_log.h"
 #include "host/cgi_log/followed_file.h"
 #include "host/commands/command.h"
 #include "host/console/interrupt.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 
 namespace vexa::host {
 namespace {

@@ -7,7 +7,7 @@
 #include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/commands/action_group.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 
 namespace vexa::host {
 namespace {

@@ -9,7 +9,7 @@
 #include "host/base/json_text.h"
 #include "host/camera/model_camera.h"
 #include "host/commands/command.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 
 namespace vexa::host {
 namespace {

@@ -10,7 +10,7 @@
 
 #include "host/camera/live_pictures.h"
 #include "host/console/interrupt.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 #include "host/words/alarm_words.h"
 #include "host/words/ptz_scale.h"
 #include "host/words/utc_time.h"

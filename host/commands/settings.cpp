@@ -8,7 +8,7 @@
 #include "host/base/json_text.h"
 #include "host/camera/camera_settings.h"
 #include "host/commands/command.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 
 namespace vexa::host {
 namespace {

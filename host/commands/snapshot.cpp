@@ -10,7 +10,7 @@
 #include "host/camera/live_pictures.h"
 #include "host/camera/video_options.h"
 #include "host/commands/command.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 #include "host/picture/picture_decoder.h"
 #include "host/picture/picture_file.h"
 #include "host/recording/frame_file.h"

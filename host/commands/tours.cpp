@@ -8,7 +8,7 @@
 #include "host/base/json_text.h"
 #include "host/base/number_text.h"
 #include "host/commands/action_group.h"
-#include "host/console/result_output.h"
+#include "host/console/terminal.h"
 #include "host/words/setting_words.h"
 #include "host/words/tour_words.h"
 

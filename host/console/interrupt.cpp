@@ -10,7 +10,7 @@
 #include <csignal>
 #include <string_view>
 
-#include "host/base/exit_code.h"
+#include "host/base/problem.h"
 
 namespace vexa::host {
 namespace {

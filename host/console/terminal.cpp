@@ -3,7 +3,9 @@
 #include <fmt/format.h>
 #include <unistd.h>
 
-#include "host/base/write_all.h"
+#include <system_error>
+
+#include "host/base/unique_fd.h"
 
 namespace vexa::host {
 namespace {
@@ -53,6 +55,15 @@ void Terminal::erase_progress_locked() {
   if (progress_.empty()) return;
   write_error_text(kEraseLine);
   progress_.clear();
+}
+
+ExitCode write_result(Terminal& terminal, std::string_view text) {
+  terminal.clear_progress();
+  const int error = terminal.write_result(text);
+  if (error == 0) return ExitCode::kOk;
+  return terminal.report({ExitCode::kCannotWrite,
+                          fmt::format("cannot write standard output: {}", std::generic_category().message(error)),
+                          "Check where it is redirected to."});
 }
 
 }  // namespace vexa::host

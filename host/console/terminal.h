@@ -44,6 +44,9 @@ class Terminal {
   std::string progress_;
 };
 
+// Writes it to standard output; reports a failure and returns its exit code.
+[[nodiscard]] ExitCode write_result(Terminal& terminal, std::string_view text);
+
 }  // namespace vexa::host
 
 #endif  // HOST_CONSOLE_TERMINAL_H_

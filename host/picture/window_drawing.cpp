@@ -1,4 +1,4 @@
-#include "host/picture/window_drawing.h"
+#include "host/picture/picture.h"
 
 #include <algorithm>
 #include <array>

@@ -8,7 +8,7 @@
 #include <cerrno>
 #include <system_error>
 
-#include "host/base/write_all.h"
+#include "host/base/unique_fd.h"
 
 namespace vexa::host {
 namespace {

@@ -21,6 +21,7 @@ struct RecordedPicture {
   std::chrono::microseconds time{0};  // since 1970
 };
 
+// A command owns one for each recording. The thread that records calls it; no two threads at a time.
 class PictureTarget {
  public:
   PictureTarget() = default;

@@ -36,6 +36,8 @@ class PictureBytes final : public CDataSink {
   std::vector<unsigned char> bytes;
 };
 
+// One for each recording, on the thread that polls the driver. Owns neither the driver nor the target, which outlive
+// it.
 class Recorder {
  public:
   using Clock = RecordingMeter::Clock;

@@ -13,6 +13,7 @@
 namespace vexa::host {
 
 // Times are the host's, of a picture's arrival: live pictures carry no time stamps of their own.
+// Owned by a recorder and used by its thread.
 class RecordingMeter {
  public:
   using Clock = std::chrono::steady_clock;

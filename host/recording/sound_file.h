@@ -17,6 +17,8 @@ enum class SoundFormat { kRaw, kWave };
 // sound as it came.
 [[nodiscard]] SoundFormat sound_format_of(const std::string& file);
 
+// Puts the sound behind a WAVE header, or as it comes where the format has none. Its command owns it and the file, and
+// writes from one thread.
 class SoundFile {
  public:
   // `file` is opened with the first sound.

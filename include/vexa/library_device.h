@@ -23,6 +23,10 @@
 /// otherwise. Records passed by reference are the caller's; no driver keeps a pointer to them. An operation that fails
 /// in the transport returns LIBD_FAILED, LIBD_TIMEOUT or LIBD_UNAUTHORIZED and leaves the reason in GetLatestErrorText;
 /// an argument out of its range gives LIBD_INVALID_ARGUMENT before anything is sent.
+///
+/// An operation that fails has changed neither the driver nor the caller's record, but for what its line names; memory
+/// that runs out is such a failure, and nothing is thrown. Whether the camera has carried out a request that was sent is
+/// not known then.
 class VEXA_API CLibraryDevice {
  public:
   CLibraryDevice() = default;
@@ -63,11 +67,13 @@ class VEXA_API CLibraryDevice {
   virtual ELibDReturnCode GetCurrentSystemInfo(SLibDSystemInfo& info);
   /// Hands out the connection record, the password included. LIBD_OK.
   virtual ELibDReturnCode GetCurrentConnectionInfo(SLibDConnectionInfo& info);
-  /// Asks the camera for the settings of the video stream named by `info.streamNumber`.
+  /// Asks the camera for the settings of the video stream named by `info.streamNumber`. A failure drops the answer that
+  /// the image controls read, and may have taken the video standard, the capture size and the like.
   virtual ELibDReturnCode GetCameraInfo(SLibDCameraInfo& info);
   /// Asks the camera for its audio input.
   virtual ELibDReturnCode GetAudioInfo(SLibDAudioInfo& info);
-  /// Appends the camera's pins to `info.pins` (which is not cleared) and reads the detectors' states.
+  /// Appends the camera's pins to `info.pins` (which is not cleared) and reads the detectors' states. What was appended
+  /// before a failure stays.
   virtual ELibDReturnCode GetIoBoxInfo(SLibDIoBoxInfo& info);
   /// Hands out the stored control settings. LIBD_OK.
   virtual ELibDReturnCode GetPTZControlInfo(SLibDPTZControlInfo& info);
@@ -99,7 +105,8 @@ class VEXA_API CLibraryDevice {
   virtual ELibDReturnCode SetShadowTourInfo(SLibDShadowTourInfo& info);
 
   // Live video
-  /// Stops a running stream, opens a new one and starts its thread. LIBD_FAILED while a stop is in progress.
+  /// Stops a running stream, opens a new one and starts its thread. LIBD_FAILED while a stop is in progress. A
+  /// failure leaves no stream open.
   virtual ELibDReturnCode StartVideoStreaming();
   /// Ends the stream and its thread. LIBD_OK also when nothing streams; LIBD_FAILED while another stop is in progress.
   virtual ELibDReturnCode StopVideoStreaming();
@@ -108,7 +115,7 @@ class VEXA_API CLibraryDevice {
   virtual ELibDReturnCode GetCurrentVideoFrame(SLibDVideoFrameInfo& frame);
 
   // Audio
-  /// Stops a running audio stream and opens a new one.
+  /// Stops a running audio stream and opens a new one. A failure leaves none open.
   virtual ELibDReturnCode StartAudioStreaming();
   /// Closes the audio stream; waits for a poll in progress. LIBD_OK.
   virtual ELibDReturnCode StopAudioStreaming();
@@ -122,17 +129,21 @@ class VEXA_API CLibraryDevice {
   virtual ELibDReturnCode SetAudioUploadFrame(SLibDAudioFrameInfo& frame);
 
   // Alarm pins
-  /// Stops a running alarm stream, switches the camera's alarm data on and opens a new stream.
+  /// Stops a running alarm stream, switches the camera's alarm data on and opens a new stream. A failure leaves none
+  /// open; the camera's alarm data may stay on.
   virtual ELibDReturnCode StartIoStreaming();
-  /// Closes the alarm stream and switches the camera's alarm data off; waits for a poll in progress.
+  /// Closes the alarm stream and switches the camera's alarm data off; waits for a poll in progress. The stream is
+  /// closed whatever the camera answers.
   virtual ELibDReturnCode StopIoStreaming();
-  /// Reads the pins that changed; clears a tampering alarm on the camera after a minute.
+  /// Reads the pins that changed; clears a tampering alarm on the camera after a minute. The pins stay read when the
+  /// clearing fails.
   virtual ELibDReturnCode GetCurrentIoStatus(std::vector<SLibDPinInfo>& pins);
   /// Switches the alarm output `pin.number` on (`pin.state` not 0) or off.
   virtual ELibDReturnCode SetOutput(SLibDPinInfo& pin);
 
   // Pan, tilt, zoom and focus
-  /// Says where the camera looks, as its latest picture told. LIBD_FAILED before any did.
+  /// Says where the camera looks, as its latest picture told. LIBD_FAILED before any did, and when no angles are known,
+  /// `status.moving` set all the same.
   virtual ELibDReturnCode GetCurrentPosition(SLibDPTZStatus& status);
   /// Moves at the speeds given, each -10000 to 10000; both 0 stops.
   virtual ELibDReturnCode PanTilt(int pan, int tilt);
@@ -166,7 +177,7 @@ class VEXA_API CLibraryDevice {
   virtual ELibDReturnCode BrightAbsolute(int level);
 
   // Presets
-  /// Fills `presets` with one entry a preset, named as the camera says.
+  /// Fills `presets` with one entry a preset, named as the camera says; a failure leaves them without names.
   virtual ELibDReturnCode GetPresets(std::vector<SLibDPresetInfo>& presets);
   /// Empties the list and all it holds. LIBD_OK.
   virtual ELibDReturnCode ClearCachedPresets(std::vector<SLibDPresetInfo>& presets);
@@ -194,7 +205,8 @@ class VEXA_API CLibraryDevice {
   virtual ELibDReturnCode GetViewDR(ELibDViewDRMode& mode);
   /// Sets the dynamic range.
   virtual ELibDReturnCode SetViewDR(ELibDViewDRMode mode);
-  /// Reads the infrared illuminator, from the last answer about the camera if there is one.
+  /// Reads the infrared illuminator, from the last answer about the camera if there is one. An answer without a strength
+  /// fails and has set the mode.
   virtual ELibDReturnCode GetIRIlluminator(ELibIRIlluminatorMode& mode, int& strength);
   /// Sets the infrared illuminator; the strength is sent unchanged.
   virtual ELibDReturnCode SetIRIlluminator(ELibIRIlluminatorMode mode, int strength);
@@ -230,7 +242,7 @@ class VEXA_API CLibraryDevice {
   virtual ELibDReturnCode GetCurrentPosition(SLibDRawMDFrameInfo& frame);
   /// Closes the metadata stream; waits for a poll in progress. LIBD_OK.
   virtual ELibDReturnCode StopModRawData();
-  /// Switches the tampering detector and sets its level.
+  /// Switches the tampering detector and sets its level. The driver keeps the level also when the camera refuses it.
   virtual ELibDReturnCode SetTamperingAlarm(bool on, ELibDTamperLevel level);
   /// Switches the audio detector; LIBD_NOT_SUPPORTED for a camera without one.
   virtual ELibDReturnCode SetAudioDetection(bool on);

@@ -2,7 +2,6 @@
 #pragma once
 
 #include <atomic>
-#include <cstdarg>
 #include <cstddef>
 #include <cstdint>
 #include <ctime>
@@ -33,7 +32,7 @@ struct DriverState;
 /// destroyed.
 ///
 /// Everything that is not an operation of CLibraryDevice is protected: model classes outside the library derive from
-/// this class and fill the capability records. Each block below names the file with its bodies.
+/// this class and fill the capability records. The bodies of a block are in the file that it names.
 class VEXA_API CVexaCommon : public CLibraryDevice {
  public:
   /// One assembled video frame. The frame queue owns the data of the frames in it.
@@ -50,24 +49,24 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   CVexaCommon(const CVexaCommon&) = delete;
   CVexaCommon& operator=(const CVexaCommon&) = delete;
   ~CVexaCommon() override;
-  // device/vexa_common.cpp
-  ELibDReturnCode GetLatestErrorText(std::string& text) override;
+  ELibDReturnCode GetLatestErrorText(std::string& text) override;  // device/vexa_common.cpp
   ELibDReturnCode GetCameraType(ELibCameraType type) override;
   ELibDReturnCode SetCameraInfoFromID(unsigned int id) override;
-  // device/system_info.cpp
-  ELibDReturnCode GetFixedSystemInfo(SLibDFixedSystemInfo& info) override;
+  /// Hook of model classes, called when standard or capture size change (-1: no size is given), by the thread that runs
+  /// the operation and with no lock held: it may send commands, and changes m_FixedCameraInfo under m_ConnectionLock.
+  /// The result is not used. LIBD_OK.
+  virtual ELibDReturnCode InitializeFixedVideoParams(ELibDVideoStandard standard, int width, int height);
+  ELibDReturnCode GetFixedSystemInfo(SLibDFixedSystemInfo& info) override;  // device/system_info.cpp
   ELibDReturnCode GetFixedConnectionInfo(SLibDFixedConnectionInfo& info) override;
   ELibDReturnCode GetCurrentSystemInfo(SLibDSystemInfo& info) override;
-  // device/video_settings.cpp
-  ELibDReturnCode GetFixedCameraInfo(SLibDFixedCameraInfo& info) override;
+  ELibDReturnCode GetFixedCameraInfo(SLibDFixedCameraInfo& info) override;  // device/video_settings.cpp
   ELibDReturnCode SetVideoStandard(ELibDVideoStandard standard) override;
   ELibDReturnCode SetVidCapSize(int width, int height) override;
   ELibDReturnCode SetSolidPTZState(bool on) override;
   ELibDReturnCode SetImageMaxSize(int width, int height, ELibDVideoStandard standard) override;
   ELibDReturnCode GetCameraInfo(SLibDCameraInfo& info) override;
   ELibDReturnCode SetCameraInfo(SLibDCameraInfo& info) override;
-  // device/image_controls.cpp
-  ELibDReturnCode SetBrightMode(std::string& mode) override;
+  ELibDReturnCode SetBrightMode(std::string& mode) override;  // device/image_controls.cpp
   ELibDReturnCode SetBackLightCompMode(bool on) override;
   ELibDReturnCode Bright(int step) override;
   ELibDReturnCode BrightAbsolute(int level) override;
@@ -81,8 +80,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode SetViewDR(ELibDViewDRMode mode) override;
   ELibDReturnCode GetIRIlluminator(ELibIRIlluminatorMode& mode, int& strength) override;
   ELibDReturnCode SetIRIlluminator(ELibIRIlluminatorMode mode, int strength) override;
-  // device/ptz_motion.cpp
-  ELibDReturnCode PanTilt(int pan, int tilt) override;
+  ELibDReturnCode PanTilt(int pan, int tilt) override;  // device/ptz_motion.cpp
   ELibDReturnCode PanTiltAbsolute(int pan, int tilt) override;
   ELibDReturnCode PanTiltDirect(int x, int y, const SLibDResolutionInfo& picture) override;
   ELibDReturnCode Zoom(int speed) override;
@@ -92,21 +90,17 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode SetFocusMode(bool automatic) override;
   ELibDReturnCode Focus(int speed) override;
   ELibDReturnCode FocusAbsolute(int position) override;
-  // device/ptz_position.cpp
-  ELibDReturnCode GetCurrentPosition(SLibDPTZStatus& status) override;
+  ELibDReturnCode GetCurrentPosition(SLibDPTZStatus& status) override;  // device/ptz_position.cpp
   ELibDReturnCode GetPTZControlInfo(SLibDPTZControlInfo& info) override;
   ELibDReturnCode SetPTZControlInfo(SLibDPTZControlInfo& info) override;
   ELibDReturnCode GetFixedPTZControlInfo(SLibDFixedPTZControlInfo& info) override;
-  // device/presets.cpp
-  ELibDReturnCode GetPresets(std::vector<SLibDPresetInfo>& presets) override;
+  ELibDReturnCode GetPresets(std::vector<SLibDPresetInfo>& presets) override;  // device/presets.cpp
   ELibDReturnCode ClearPreset(int index) override;
   ELibDReturnCode SetPreset(SLibDPresetInfo& preset) override;
   ELibDReturnCode RecallPreset(int index) override;
-  // device/camera_tours.cpp
-  ELibDReturnCode GetCameraTourInfo(SLibDCameraTourInfo& info) override;
+  ELibDReturnCode GetCameraTourInfo(SLibDCameraTourInfo& info) override;  // device/camera_tours.cpp
   ELibDReturnCode SetCameraTourInfo(SLibDCameraTourInfo& info) override;
-  // device/shadow_tours.cpp
-  ELibDReturnCode GetShadowTourInfo(SLibDShadowTourInfo& info) override;
+  ELibDReturnCode GetShadowTourInfo(SLibDShadowTourInfo& info) override;  // device/shadow_tours.cpp
   ELibDReturnCode SetShadowTourInfo(SLibDShadowTourInfo& info) override;
   ELibDReturnCode StartShadowTour(int number) override;
   ELibDReturnCode StopShadowTour() override;
@@ -114,56 +108,41 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   ELibDReturnCode StopRecordShadowTour() override;
   ELibDReturnCode StartPreviewShadowTour(int number) override;
   ELibDReturnCode StopPreviewShadowTour() override;
-  // device/connection.cpp
-  ELibDReturnCode GetCurrentConnectionInfo(SLibDConnectionInfo& info) override;
+  ELibDReturnCode GetCurrentConnectionInfo(SLibDConnectionInfo& info) override;  // device/connection.cpp
   ELibDReturnCode SetCurrentConnectionInfo(SLibDConnectionInfo& info) override;
-  // device/cgi_log.cpp
   ELibDReturnCode SetCGILogLevel(bool on) override;
   ELibDReturnCode SetCGILogPath(const char* path) override;
-  // device/video_streaming.cpp
-  ELibDReturnCode StartVideoStreaming() override;
+  ELibDReturnCode StartVideoStreaming() override;  // device/video_streaming.cpp
+  ELibDReturnCode StartEdgeStorageVideoStreaming(const SLibDEdgeStorageStreamingInfo& info) override;
   ELibDReturnCode StopVideoStreaming() override;
-  // device/frame_queue.cpp
-  ELibDReturnCode GetCurrentVideoFrame(SLibDVideoFrameInfo& frame) override;
-  // device/audio.cpp
-  ELibDReturnCode GetFixedAudioInfo(SLibDFixedAudioInfo& info) override;
+  ELibDReturnCode GetCurrentVideoFrame(SLibDVideoFrameInfo& frame) override;  // device/frame_queue.cpp
+  ELibDReturnCode GetFixedAudioInfo(SLibDFixedAudioInfo& info) override;      // device/audio.cpp
   ELibDReturnCode GetAudioInfo(SLibDAudioInfo& info) override;
   ELibDReturnCode SetAudioInfo(SLibDAudioInfo& info) override;
   ELibDReturnCode StartAudioStreaming() override;
   ELibDReturnCode StopAudioStreaming() override;
   ELibDReturnCode GetCurrentAudioFrame(SLibDAudioFrameInfo& frame) override;
-  // device/alarm_io.cpp
-  ELibDReturnCode GetFixedIoboxInfo(SLibDFixedIoBoxInfo& info) override;
+  ELibDReturnCode GetFixedIoboxInfo(SLibDFixedIoBoxInfo& info) override;  // device/alarm_io.cpp
   ELibDReturnCode GetIoBoxInfo(SLibDIoBoxInfo& info) override;
   ELibDReturnCode StartIoStreaming() override;
   ELibDReturnCode StopIoStreaming() override;
   ELibDReturnCode GetCurrentIoStatus(std::vector<SLibDPinInfo>& pins) override;
   ELibDReturnCode SetOutput(SLibDPinInfo& pin) override;
-  // device/detection.cpp
+  ELibDReturnCode SetPositionMode(ELibDPositionMode mode) override;  // device/detection.cpp
   ELibDReturnCode GetObjectDetectionSetting(std::vector<SLibDDetectionParam>& params, ELibDPositionMode& mode) override;
   ELibDReturnCode SetDetectionParam(SLibDDetectionParam& param) override;
-  ELibDReturnCode SetPositionMode(ELibDPositionMode mode) override;
   ELibDReturnCode SetTamperingAlarm(bool on, ELibDTamperLevel level) override;
   ELibDReturnCode SetAudioDetection(bool on) override;
   ELibDReturnCode SetVMDtype(ELibDVMDType type) override;
-  // device/metadata_stream.cpp
-  ELibDReturnCode StartModRawData() override;
+  ELibDReturnCode StartModRawData() override;  // device/metadata_stream.cpp
   ELibDReturnCode GetCurrentPosition(SLibDRawMDFrameInfo& frame) override;
   ELibDReturnCode StopModRawData() override;
-  // device/edge_storage.cpp
-  ELibDReturnCode GetEdgeStorageMode(SLibDEdgeStorageMode& mode) override;
+  ELibDReturnCode GetEdgeStorageMode(SLibDEdgeStorageMode& mode) override;  // device/edge_storage.cpp
   ELibDReturnCode SetEdgeStorageMode(const SLibDEdgeStorageMode& mode) override;
   ELibDReturnCode GetEdgeStorageRecordList(SLibDEdgeStorageRecordList& list) override;
   ELibDReturnCode DeleteAllEdgeStorageRecord() override;
   ELibDReturnCode DeleteEdgeStorageRecordByName(const SLibDEdgeStorageStreamingInfo& info) override;
   ELibDReturnCode SetEdgeStorageNoTearDown(bool noTearDown) override;
-  // device/video_streaming.cpp
-  ELibDReturnCode StartEdgeStorageVideoStreaming(const SLibDEdgeStorageStreamingInfo& info) override;
-  // device/vexa_common.cpp
-  /// Hook of model classes, called when standard or capture size change (-1: no size is given), by the thread that runs
-  /// the operation and with no lock held: it may send commands, and changes m_FixedCameraInfo under m_ConnectionLock.
-  /// The result is not used. LIBD_OK.
-  virtual ELibDReturnCode InitializeFixedVideoParams(ELibDVideoStandard standard, int width, int height);
 
  protected:
   // The HTTP CGI client and HTTP streams: device/http_client.cpp
@@ -206,13 +185,11 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   int rtp_over_udp_payload_recv_h264(int socket, char* buffer, int size, int timeout, SPacketInfo& packet);
   int rtp_over_udp_payload_recv(int socket, char* buffer, int size, bool* marker, unsigned char* payloadType,
                                 int timeout, unsigned int* timestamp, unsigned short* sequence);
-  // The streaming thread: device/video_streaming.cpp
-  static unsigned int StreamingThread(void* driver);
+  static unsigned int StreamingThread(void* driver);  // device/video_streaming.cpp
   ELibDReturnCode StopRtpVideoStreaming();
   void ReleaseRtpPacketsPtr();
   // The frame queue: device/frame_queue.cpp
-  static void ProcessCurrentFrameData(CVexaCommon* driver, VideoFrameInfo& frame, bool& waitKey,
-                                      ELibDReturnCode result);
+  static void ProcessCurrentFrameData(CVexaCommon* driver, VideoFrameInfo& frame, bool& waitKey, ELibDReturnCode code);
   static void PropulateFrameInfoList(CVexaCommon* driver, VideoFrameInfo& frame, bool& waitKey)
       VEXA_REQUIRES(driver->m_FrameQueueLock);
   // Frames from the HTTP image stream: device/http_frames.cpp
@@ -232,27 +209,21 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   // Shared with model classes: device/system_info.cpp
   ELibDReturnCode GetCommonSystemInfo(SLibDSystemInfo& info, const std::string& answer);
   ELibDReturnCode GetCommonNetworkInfo(SLibDSystemInfo& info, const std::string& answer);
-  // device/edge_storage.cpp
   /// Free kilobytes on the card; 0 when the camera names none, -1 when it cannot be asked.
-  int CheckEdgeStorageFreeSize();
+  int CheckEdgeStorageFreeSize();  // device/edge_storage.cpp
   std::int64_t _ld_mkgmtime(std::tm* time);
   bool _ld_is_leap_year(int year);
   // Video settings out of an answer: device/video_settings.cpp
-  // `pos` is in the place of the key in the answer, out the end of its value; `changed` is set, never cleared.
-  void ParseVideoStandardFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed)
-      VEXA_REQUIRES(m_ConnectionLock);
-  void ParseVideoCapSizeFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed)
-      VEXA_REQUIRES(m_ConnectionLock);
-  void ParseSolidPTZFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed)
-      VEXA_REQUIRES(m_ConnectionLock);
-  void ParseImageMaxSizeFromCameraProperty(const std::string& answer, std::size_t& pos, bool& changed)
-      VEXA_REQUIRES(m_ConnectionLock);
+  // Each takes the answer, then in the place of its key and out the end of its value; the flag, where there is one, is
+  // set by a change and never cleared.
+  void ParseVideoStandardFromCameraProperty(const std::string&, std::size_t&, bool&) VEXA_REQUIRES(m_ConnectionLock);
+  void ParseVideoCapSizeFromCameraProperty(const std::string&, std::size_t&, bool&) VEXA_REQUIRES(m_ConnectionLock);
+  void ParseSolidPTZFromCameraProperty(const std::string&, std::size_t&, bool&) VEXA_REQUIRES(m_ConnectionLock);
+  void ParseImageMaxSizeFromCameraProperty(const std::string&, std::size_t&, bool&) VEXA_REQUIRES(m_ConnectionLock);
   void SetCurrentStreamMode(const std::string& answer, std::size_t& pos, std::int32_t& codecType,
                             const std::string& key) VEXA_REQUIRES(m_ConnectionLock);
-  void SetCurrentResolution(const std::string& answer, std::size_t& pos, const std::string& key)
-      VEXA_REQUIRES(m_ConnectionLock);
-  void SetCurrentFrameRate(const std::string& answer, std::size_t& pos, const std::string& key)
-      VEXA_REQUIRES(m_ConnectionLock);
+  void SetCurrentResolution(const std::string&, std::size_t&, const std::string&) VEXA_REQUIRES(m_ConnectionLock);
+  void SetCurrentFrameRate(const std::string&, std::size_t&, const std::string&) VEXA_REQUIRES(m_ConnectionLock);
   void SetCurrentQualityBitrate(const std::string& answer, std::size_t& pos, std::int32_t codecType,
                                 const std::string& key) VEXA_REQUIRES(m_ConnectionLock);
   // Exposure and image controls: device/image_controls.cpp
@@ -265,8 +236,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   bool GetIrisPositionFromCameraData(std::string& answer, int& value, unsigned& entry);
   bool GetShutterSpeedFromShutterSpeedList(int step, int& value, unsigned entry);
   bool GetIrisPositionFromIrisList(int step, int& value, unsigned entry);
-  // Alarm pins: device/alarm_io.cpp
-  ELibDReturnCode GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>& pins);
+  ELibDReturnCode GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>& pins);  // device/alarm_io.cpp
   int http_multipart_input_recv(int socket, unsigned int& mask, unsigned int& state);
   // Detection settings: device/detection.cpp
   /// Sends what an object-detection camera keeps of a setting; `socket` is set to each request's, which is closed.
@@ -279,14 +249,14 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   // 0, or 1 when the request cannot be opened.
   int SendPTZCommands(int pan, int tilt, const ELibDPanTiltDirection& direction);
   int SendPTZCommandForCenterDirection();
-  // device/ptz_position.cpp
   /// False leaves both angles: no zoom ratios are known, or an angle or ratio is 0.
-  bool GetViewingAngles(int zoom, int& horizontal, int& vertical);
-  // Tours: device/camera_tours.cpp
-  bool GetTextByTourSequenceList(const std::vector<int>& sequence, std::string& text);
+  bool GetViewingAngles(int zoom, int& horizontal, int& vertical);                      // device/ptz_position.cpp
+  bool GetTextByTourSequenceList(const std::vector<int>& sequence, std::string& text);  // device/camera_tours.cpp
   bool GetTourSequenceListByText(std::string text, std::vector<int>& sequence);
-  // The CGI log: device/cgi_log.cpp
-  void Log(const char* direction, const char* message);
+  void Log(const char* direction, const char* message);  // device/connection.cpp
+  // What guards what: docs/architecture.md
+  CSimpleLock m_ConnectionLock, m_VideoStateLock, m_FrameQueueLock, m_CamPosLock;
+  CSimpleLock m_CameraInquiryLock, m_AudioLock, m_IoStreamLock, m_MdStreamLock;
   // Identity, capabilities and current settings
   SLibDFixedSystemInfo m_FixedSystemInfo;
   SLibDFixedConnectionInfo m_FixedConnectionInfo;
@@ -304,9 +274,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   SLibDConnectionInfo m_ConnectionInfo VEXA_GUARDED_BY(m_ConnectionLock);
   ELibDReturnCode m_LatestErrorCode = LIBD_FAILED;
   // What the model class says of the camera
-  bool m_FixedCameraInfoAvailable = false;
-  bool m_FixedPTZControlInfoAvailable = false;
-  bool m_FixedIoBoxInfoAvailable = false;
+  bool m_FixedCameraInfoAvailable = false, m_FixedPTZControlInfoAvailable = false, m_FixedIoBoxInfoAvailable = false;
   bool m_UseMotionDetection = false;            ///< detection windows report as "MdWin"
   bool m_LodDetection = false;                  ///< the camera has LOD detection
   bool m_EdgeStorageSupported = false;          ///< the camera has a card
@@ -318,21 +286,18 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   int m_RtspSocket = -1;
   int m_StreamSocket VEXA_GUARDED_BY(m_VideoStateLock) = -1;  ///< media: RTP over UDP, or the HTTP image stream
   std::string m_RtspUrl;
-  int m_RtspSession = 0;
-  int m_RtspCSeq = 0;
+  int m_RtspSession = 0, m_RtspCSeq = 0;
   char m_BasicCredentials[345] = {};     ///< Base64 of at most 255 characters
   std::int64_t m_RangeClockSeconds = 0;  ///< start of the range clock, seconds since 1970-01-01 UTC
   int m_RangeClockMicros = 0;
   int m_RtpClockRate = 0;  ///< ticks a second
-  bool m_EdgeStoragePlayback = false;
+  bool m_EdgeStoragePlayback = false, m_FirstPlaybackFrame = false, m_RtpLiveMode = false;
   int m_PlaybackScale = 1;
   bool m_NoTearDown VEXA_GUARDED_BY(m_VideoStateLock) = false;
   int m_KeepAlivePeriod = 1;  ///< seconds
   std::time_t m_LastKeepAliveTime = 0;
-  bool m_FirstPlaybackFrame = false;
   std::uint32_t m_PlaybackBaseTimestamp = 0;
-  std::string m_EdgeStorageCodec;  ///< of the playback under way
-
+  std::string m_EdgeStorageCodec;                                            ///< of the playback under way
   SLibDEdgeStorageMode m_EdgeStorageMode VEXA_GUARDED_BY(m_ConnectionLock);  ///< as last sent
   // RTP packets: the streaming thread's
   std::vector<SPacketInfo> m_RtpPackets;       ///< sorted; the data lie in m_RtpPacketBuffer
@@ -344,9 +309,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   unsigned char* m_StreamSearchPos = nullptr;   ///< where the next start code is looked for
   unsigned char* m_StreamWriteEnd = nullptr;    ///< end of the bytes received
   // The streaming thread and the frame queue
-  CSimpleLock m_VideoStateLock;
   bool m_StopVideoRequested VEXA_GUARDED_BY(m_VideoStateLock) = false;
-  CSimpleLock m_FrameQueueLock;
   std::deque<VideoFrameInfo> m_FrameQueue VEXA_GUARDED_BY(m_FrameQueueLock);
   bool m_VideoTimedOut VEXA_GUARDED_BY(m_FrameQueueLock) = false;
   bool m_LargeFrameBuffers VEXA_GUARDED_BY(m_FrameQueueLock) = false;
@@ -356,28 +319,20 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   typedHandle* m_StreamingThread = nullptr;
   typedHandle* m_StopVideoEvent = nullptr;
   int m_StreamWaitMs = 1;  ///< wait for the stop event after a read that did not wait for it itself
-  bool m_RtpLiveMode = false;
-  CSimpleLock m_CamPosLock;
   std::string m_CamPosText VEXA_GUARDED_BY(m_CamPosLock);
   // The polled streams and the cached camera inquiry
-  CSimpleLock m_CameraInquiryLock;
   std::string m_CameraInquiryCache VEXA_GUARDED_BY(m_CameraInquiryLock);
-  CSimpleLock m_AudioLock;
   int m_AudioSocket VEXA_GUARDED_BY(m_AudioLock) = -1;
   std::time_t m_LastAudioTime VEXA_GUARDED_BY(m_AudioLock) = 0;  ///< of the last data, or of the opening
-  CSimpleLock m_IoStreamLock;
   int m_IoStreamSocket VEXA_GUARDED_BY(m_IoStreamLock) = -1;
   std::vector<SLibDPinInfo> m_PendingPins VEXA_GUARDED_BY(m_IoStreamLock);
   std::time_t m_LastIoDataTime VEXA_GUARDED_BY(m_IoStreamLock) = 0;        ///< when pins were last handed out
   std::time_t m_TamperingActiveSince VEXA_GUARDED_BY(m_IoStreamLock) = 0;  ///< 0 while no tampering is reported
-  CSimpleLock m_MdStreamLock;
   int m_MdStreamSocket VEXA_GUARDED_BY(m_MdStreamLock) = -1;
   std::time_t m_LastMdDataTime VEXA_GUARDED_BY(m_MdStreamLock) = 0;  ///< of the last part, or of the opening
-
-  std::map<std::string, int> m_InquirySizes;  ///< answer buffer in bytes by inquiry name
+  std::map<std::string, int> m_InquirySizes;                         ///< answer buffer in bytes by inquiry name
   CFileLogger m_CGILogger;
   char m_CGILogPath[1024] VEXA_GUARDED_BY(m_ConnectionLock) = {};
-  CSimpleLock m_ConnectionLock;
   std::atomic<bool> m_CGILogEnabled{false};
 
   friend struct vexa::DriverState;

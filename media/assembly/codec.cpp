@@ -1,8 +1,6 @@
 #include "media/assembly/codec.h"
 
-#include "media/assembly/h264_units.h"
-#include "media/assembly/mpeg4_units.h"
-#include "media/assembly/rtp_jpeg.h"
+#include "media/assembly/rtp_pictures.h"
 
 namespace vexa {
 

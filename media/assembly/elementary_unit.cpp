@@ -2,7 +2,6 @@
 
 #include <algorithm>
 
-#include "media/assembly/camera_position.h"
 #include "media/assembly/start_code.h"
 
 namespace vexa {
@@ -35,6 +34,10 @@ UnitKind mpeg4_kind(std::uint8_t code) {
   }
 }
 
+constexpr std::string_view kPositionKey = "CamPos: ";
+constexpr std::size_t kPositionLength = 24;
+constexpr std::size_t kSearchedUserData = 256;
+
 }  // namespace
 
 UnitKind ElementaryCodec::kind_of(Bytes unit) const {
@@ -49,5 +52,14 @@ const ElementaryCodec kH264Elementary = {{find_start_code_h264, kStartCodeLength
 
 const ElementaryCodec kMpeg4Elementary = {
     {find_start_code_mpeg4, kStartCodeLengthMpeg4}, mpeg4_kind, kMpeg4UserDataTextOffset};
+
+std::optional<std::string_view> camera_position(Bytes data) {
+  const std::string_view text(reinterpret_cast<const char*>(data.data()), data.size());
+  const std::size_t place = text.find(kPositionKey);
+  if (place == std::string_view::npos) return std::nullopt;
+  return text.substr(place, kPositionLength);
+}
+
+Bytes front_of_user_data(Bytes data) { return data.first(std::min(data.size(), kSearchedUserData)); }
 
 }  // namespace vexa

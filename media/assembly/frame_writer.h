@@ -9,6 +9,7 @@
 
 namespace vexa {
 
+/// Made for one frame, over a buffer that it does not own; used by the thread that assembles the frame.
 class FrameWriter {
  public:
   explicit FrameWriter(std::span<unsigned char> room) : room_(room) {}

@@ -1,4 +1,4 @@
-#include "media/assembly/h264_units.h"
+#include "media/assembly/rtp_pictures.h"
 
 #include <algorithm>
 

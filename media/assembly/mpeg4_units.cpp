@@ -1,4 +1,4 @@
-#include "media/assembly/mpeg4_units.h"
+#include "media/assembly/rtp_pictures.h"
 
 #include <algorithm>
 
@@ -16,7 +16,7 @@ constexpr std::uint8_t kVideoObjectPlane = 0xb6;
 constexpr unsigned char kStartCodePrefix[] = {0, 0, 1};
 constexpr std::size_t kCodePlace = sizeof kStartCodePrefix;
 
-constexpr std::int32_t mpeg4_type(std::uint8_t code) {
+constexpr std::int32_t type_of_code(std::uint8_t code) {
   switch (code) {
     case kSecondVideoObject:
     case kVideoObjectPlane:
@@ -30,20 +30,20 @@ constexpr std::int32_t mpeg4_type(std::uint8_t code) {
 }
 
 /// The type told by the picture's fourth byte, in whatever packet that is.
-std::int32_t mpeg4_type_of(PacketRun run) {
+std::int32_t frame_type_of(PacketRun run) {
   std::size_t before = 0;
   for (const SPacketInfo& packet : run) {
     const Bytes payload = payload_of(packet);
-    if (payload.size() > kCodePlace - before) return mpeg4_type(payload[kCodePlace - before]);
+    if (payload.size() > kCodePlace - before) return type_of_code(payload[kCodePlace - before]);
     before += payload.size();
   }
   return VIDEO_FRAME_INVALID;
 }
 
-bool is_mpeg4_key(PacketRun run) { return mpeg4_type_of(run) == VIDEO_FRAME_MPEG4_KEY; }
+bool is_key(PacketRun run) { return frame_type_of(run) == VIDEO_FRAME_MPEG4_KEY; }
 
 /// The start code that the payload begins with; 0 when it begins with none.
-std::uint8_t mpeg4_opening(const SPacketInfo& first) {
+std::uint8_t opening(const SPacketInfo& first) {
   const Bytes payload = payload_of(first);
   if (payload.size() <= kCodePlace ||
       !std::equal(std::begin(kStartCodePrefix), std::end(kStartCodePrefix), payload.begin()))
@@ -51,11 +51,11 @@ std::uint8_t mpeg4_opening(const SPacketInfo& first) {
   return payload[kCodePlace];
 }
 
-bool is_sequence_header(const SPacketInfo& packet) { return mpeg4_opening(packet) == kVisualObjectSequence; }
+bool is_sequence_header(const SPacketInfo& packet) { return opening(packet) == kVisualObjectSequence; }
 
 /// A camera that sends sequence headers begins a key picture with one.
 bool opens_with_header(PacketRun run, bool preamble_seen) {
-  const std::uint8_t code = mpeg4_opening(run.front());
+  const std::uint8_t code = opening(run.front());
   return code == kVisualObjectSequence || (!preamble_seen && code == kGroupOfPictures);
 }
 
@@ -65,9 +65,9 @@ AssembledPicture assemble_mpeg4(PacketRun packets, std::span<unsigned char> fram
   FrameWriter writer(frame);
   for (const SPacketInfo& packet : packets) writer.append(payload_of(packet));
   return {writer.fits() ? Assembly::kWhole : Assembly::kTooLarge, static_cast<std::uint32_t>(writer.length()),
-          mpeg4_type_of(packets)};
+          frame_type_of(packets)};
 }
 
-const PictureRules kMpeg4Rules{kAnyPayloadType, is_mpeg4_key, mpeg4_opening, is_sequence_header, opens_with_header};
+const PictureRules kMpeg4Rules{kAnyPayloadType, is_key, opening, is_sequence_header, opens_with_header};
 
 }  // namespace vexa

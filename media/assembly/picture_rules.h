@@ -1,9 +1,12 @@
-// What the collection of pictures must know of a codec.
+// What is common to the codecs' pictures in RTP: what their collection must know, what their assembly comes to.
 #pragma once
 
+#include <algorithm>
 #include <cstdint>
 #include <span>
 
+#include "runtime/base/bytes.h"
+#include "transport/wire/rtp_header.h"
 #include "vexa/video_info.h"
 
 namespace vexa {
@@ -26,5 +29,22 @@ struct PictureRules {
   /// says that the camera sends preambles.
   bool (*opens_whole)(PacketRun run, bool preamble_seen);
 };
+
+enum class Assembly {
+  kWhole,
+  kUnsupported,  ///< a packet of a kind that is not offered (aggregation), or one cut short
+  kTooLarge      ///< the picture does not fit the frame
+};
+
+struct AssembledPicture {
+  Assembly outcome = Assembly::kWhole;
+  std::uint32_t length = 0;      ///< bytes of frame
+  std::int32_t frame_type = -1;  ///< an ELibDVideoFrameType value
+};
+
+/// What stands behind the RTP header.
+inline Bytes payload_of(const SPacketInfo& packet) {
+  return Bytes(packet.data, packet.length).subspan(std::min<std::size_t>(kRtpHeaderSize, packet.length));
+}
 
 }  // namespace vexa

@@ -8,6 +8,7 @@
 namespace vexa {
 
 /// Remembers the pictures used last by timestamp and span of sequence numbers.
+/// Part of a stream's packet collector; used by the thread that reads the stream.
 class RecentPictures {
  public:
   void add(std::uint32_t timestamp, std::uint16_t first, std::uint16_t last) {

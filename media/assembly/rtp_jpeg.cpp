@@ -1,4 +1,4 @@
-#include "media/assembly/rtp_jpeg.h"
+#include "media/assembly/rtp_pictures.h"
 
 #include "media/assembly/frame_writer.h"
 #include "media/assembly/jfif_header.h"

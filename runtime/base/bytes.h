@@ -10,6 +10,7 @@ namespace vexa {
 using Bytes = std::span<const unsigned char>;
 
 /// Reads big-endian numbers forward. Past the end every read gives 0 and `ok` stays false.
+/// Made on the stack for one parse; owns none of the bytes.
 class ByteReader {
  public:
   explicit ByteReader(Bytes bytes) : bytes_(bytes) {}

@@ -1,6 +1,7 @@
 // What a step that can fail returns: its value, or why it failed.
 #pragma once
 
+#include <new>
 #include <optional>
 #include <string>
 #include <utility>
@@ -59,5 +60,16 @@ class [[nodiscard]] Result<void> {
  private:
   std::optional<Failure> failure_;
 };
+
+/// Runs `work`; false when memory ran out in it. What it had made until then has undone itself.
+template <typename Work>
+[[nodiscard]] bool within_memory(Work&& work) {
+  try {
+    std::forward<Work>(work)();
+    return true;
+  } catch (const std::bad_alloc&) {
+    return false;
+  }
+}
 
 }  // namespace vexa

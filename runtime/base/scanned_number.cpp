@@ -2,6 +2,9 @@
 
 #include <algorithm>
 #include <limits>
+#include <string_view>
+
+#include "runtime/base/text.h"
 
 namespace vexa {
 namespace {
@@ -26,6 +29,16 @@ std::optional<ScannedNumber> scan_number(std::string_view text, std::size_t widt
   for (const char digit : number.substr(first_digit, end - first_digit)) value = with_digit(value, digit);
   if (negative && value != 0) value = kTooLarge;
   return ScannedNumber{value, spaces + end};
+}
+
+std::optional<NumberPair> leading_pair(const std::string& text) {
+  std::string_view rest = text;
+  const std::optional<int> first = take_int(rest);
+  if (!first || !rest.starts_with(',')) return std::nullopt;
+  rest.remove_prefix(1);
+  const std::optional<int> second = take_int(rest);
+  if (!second) return std::nullopt;
+  return NumberPair{*first, *second};
 }
 
 }  // namespace vexa

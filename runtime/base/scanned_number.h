@@ -4,6 +4,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <optional>
+#include <string>
 #include <string_view>
 
 namespace vexa {
@@ -15,5 +16,15 @@ struct ScannedNumber {
 
 /// Reads spaces, a sign and digits; sign and digits are `width` characters at most. Nothing when there is no digit.
 std::optional<ScannedNumber> scan_number(std::string_view text, std::size_t width);
+
+struct NumberPair {
+  int first;
+  int second;
+};
+
+/// The two numbers that a text begins with, as scanf reads "%d,%d": blanks and a sign may stand before each, the comma
+/// right behind the first, what follows the second is passed over. Nothing when either is missing. Values beyond int
+/// become its limits.
+std::optional<NumberPair> leading_pair(const std::string& text);
 
 }  // namespace vexa

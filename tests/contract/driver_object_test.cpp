@@ -19,9 +19,8 @@
 #include "vexa/runtime.h"
 #include "vexa/vexa_common.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::open_descriptors;
 
 /// A model class, as one outside the library: it sees the driver's members.
 class Model : public CVexaCommon {
@@ -294,7 +293,7 @@ TEST(DriverObject, SwitchingAStreamOffIsOneCommand) {
   for (const SwitchedOff& c : cases) {
     const std::string request = std::string("GET http://{host}:{port}/command/camera.cgi?") + c.command +
                                 " HTTP/1.0\r\nAuthorization: Basic Og==\r\n\r\n";
-    vexa_test::ScriptedCamera camera({{.expected = request, .answer = c.answer}});
+    ScriptedCamera camera({{.expected = request, .answer = c.answer}});
     Model driver;
     driver.m_ConnectionInfo.host = camera.host();
     driver.m_ConnectionInfo.port = camera.port();
@@ -349,3 +348,4 @@ TEST(DriverObject, ItsEndIsReachedThroughTheContract) {
 }
 
 }  // namespace
+}  // namespace vexa_test

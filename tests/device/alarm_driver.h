@@ -45,23 +45,6 @@ class AlarmDriver : public TestDriver {
   void forget_streams() { m_IoStreamSocket = m_MdStreamSocket = -1; }
 
   int timeout() { return ConnectionTimeout(); }
-
-  using CVexaCommon::CheckDetectionParamDetectionArea;
-  using CVexaCommon::CheckDetectionParamSensitivity;
-  using CVexaCommon::ConverObjectWidthValueToString;
-  using CVexaCommon::GetCurrentIoStatusDetail;
-  using CVexaCommon::http_multipart_input_recv;
-  using CVexaCommon::m_FixedIoBoxInfo;
-  using CVexaCommon::m_FixedIoBoxInfoAvailable;
-  using CVexaCommon::m_FixedPTZControlInfo;
-  using CVexaCommon::m_IoBoxInfo;
-  using CVexaCommon::m_LastIoDataTime;
-  using CVexaCommon::m_LastMdDataTime;
-  using CVexaCommon::m_LodDetection;
-  using CVexaCommon::m_MdStreamSocket;
-  using CVexaCommon::m_TamperingActiveSince;
-  using CVexaCommon::m_UseMotionDetection;
-  using CVexaCommon::SetObjectDetectionParameter;
 };
 
 inline std::string alarm_part(const std::string& items) { return "--part\r\n" + items + "\r\n\r\n"; }

@@ -12,27 +12,7 @@
 namespace vexa_test {
 namespace {
 
-using ShortAlarmCall = ELibDReturnCode (*)(AlarmDriver&);
-
-/// What a call gives when the thread's allocation number `nth` fails; `happened` is false when there was none.
-struct ShortOutcome {
-  ELibDReturnCode result = LIBD_OK;
-  bool happened = false;
-};
-
-ShortOutcome outcome_of(AlarmDriver& driver, ShortAlarmCall call, int nth) {
-  ShortOutcome outcome;
-  {
-    const AllocationFailure failure(nth);
-    outcome.result = call(driver);
-    outcome.happened = failure.happened();
-  }
-  EXPECT_EQ(outcome.result, outcome.happened ? LIBD_FAILED : LIBD_OK) << nth;
-  if (outcome.happened) {
-    EXPECT_EQ(text_of_latest_error(driver), "Cannot allocate memory") << nth;
-  }
-  return outcome;
-}
+using AlarmCall = ELibDReturnCode (*)(AlarmDriver&);
 
 class AlarmShortage : public testing::Test {
  protected:
@@ -52,23 +32,19 @@ class AlarmShortage : public testing::Test {
     box.tamperingDetection = box.audioDetection = true;
   }
 
-  /// Fails each allocation of the call once, each time with a driver of its own.
-  void fail_each(const char* name, ShortAlarmCall call) {
+  void fail_each(const char* name, AlarmCall call) {
     SCOPED_TRACE(name);
-    for (int nth = 0;; ++nth) {
-      ASSERT_LT(nth, 1000);
+    fails_at_every_allocation([&](Shortage& shortage) {
       AlarmDriver driver;
       prepare(driver);
-      if (outcome_of(driver, call, nth).happened) continue;
-      EXPECT_GT(nth, 0);
-      return;
-    }
+      expect_failure_told(shortage, driver, [&] { return call(driver); });
+    });
   }
 
   AlarmCamera camera_;
 };
 
-SLibDDetectionParam short_setting = marked_setting(1);
+SLibDDetectionParam setting = marked_setting(1);
 
 TEST_F(AlarmShortage, FailsEachRequest) {
   fail_each("GetIoBoxInfo", [](AlarmDriver& d) {
@@ -84,7 +60,7 @@ TEST_F(AlarmShortage, FailsEachRequest) {
     auto mode = LIBD_POSITION_PRESET;
     return d.GetObjectDetectionSetting(settings, mode);
   });
-  fail_each("SetDetectionParam", [](AlarmDriver& d) { return d.SetDetectionParam(short_setting); });
+  fail_each("SetDetectionParam", [](AlarmDriver& d) { return d.SetDetectionParam(setting); });
   fail_each("SetPositionMode", [](AlarmDriver& d) { return d.SetPositionMode(LIBD_POSITION_CURRENT); });
   fail_each("SetTamperingAlarm", [](AlarmDriver& d) { return d.SetTamperingAlarm(true, LIBD_TAMPER_LOW); });
   fail_each("SetAudioDetection", [](AlarmDriver& d) { return d.SetAudioDetection(true); });
@@ -96,9 +72,7 @@ TEST_F(AlarmShortage, FailsEachRequest) {
 }
 
 TEST_F(AlarmShortage, LeavesTheStoredRecordWhole) {
-  bool happened = true;
-  for (int nth = 0; happened; ++nth) {
-    ASSERT_LT(nth, 1000);
+  fails_at_every_allocation([this](Shortage& shortage) {
     AlarmDriver driver;
     prepare(driver);
     driver.m_IoBoxInfo.reserved1 = 7;
@@ -106,18 +80,12 @@ TEST_F(AlarmShortage, LeavesTheStoredRecordWhole) {
     SLibDIoBoxInfo info;
     info.reserved1 = 8;
     info.detections1 = {marked_setting(8), marked_setting(9)};
-    ELibDReturnCode result = LIBD_OK;
-    {
-      const AllocationFailure failure(nth);
-      result = driver.GetIoBoxInfo(info);
-      happened = failure.happened();
-    }
-    EXPECT_EQ(result, happened ? LIBD_FAILED : LIBD_OK) << nth;
+    expect_failure_told(shortage, driver, [&] { return driver.GetIoBoxInfo(info); });
     const SLibDIoBoxInfo& kept = driver.m_IoBoxInfo;
-    EXPECT_EQ(kept.reserved1, happened ? 7 : 8) << nth;
-    EXPECT_EQ(kept.pins.size(), happened ? 0U : 5U) << nth;
-    EXPECT_EQ(numbers_of(kept.detections1), happened ? (std::vector<int>{7}) : (std::vector<int>{8, 9})) << nth;
-  }
+    EXPECT_EQ(kept.reserved1, shortage.failed() ? 7 : 8);
+    EXPECT_EQ(kept.pins.size(), shortage.failed() ? 0U : 5U);
+    EXPECT_EQ(numbers_of(kept.detections1), shortage.failed() ? (std::vector<int>{7}) : (std::vector<int>{8, 9}));
+  });
 }
 
 // The starts wait for the camera to settle, hence all at once.
@@ -128,11 +96,11 @@ TEST_F(AlarmShortage, LeavesNoStreamThatFailedToStartOpen) {
     starts.push_back(std::async(std::launch::async, [this, nth] {
       AlarmDriver driver;
       prepare(driver);
-      const auto start = [](AlarmDriver& d) { return d.StartIoStreaming(); };
-      const ShortOutcome outcome = outcome_of(driver, start, nth);
-      EXPECT_EQ(driver.m_IoStreamSocket == -1, outcome.happened) << nth;
+      Shortage shortage(nth);
+      expect_failure_told(shortage, driver, [&] { return driver.StartIoStreaming(); });
+      EXPECT_EQ(driver.m_IoStreamSocket == -1, shortage.failed()) << nth;
       driver.StopIoStreaming();
-      return outcome.happened;
+      return shortage.failed();
     }));
   }
   int failed = 0;
@@ -147,12 +115,10 @@ TEST_F(AlarmShortage, LosesNoPartOfAStream) {
   prepare(driver);
   driver.read_alarms_from(pair, kPatientTimeout);
   pair.say(alarm_part("Sensor1=1&Sensor2=0"));
-  const auto read = [](AlarmDriver& d) {
-    std::vector<SLibDPinInfo> none;
-    return d.GetCurrentIoStatus(none);
-  };
-  EXPECT_TRUE(outcome_of(driver, read, 0).happened);
   std::vector<SLibDPinInfo> pins;
+  Shortage shortage(0);
+  expect_failure_told(shortage, driver, [&] { return driver.GetCurrentIoStatus(pins); });
+  EXPECT_TRUE(shortage.failed());
   EXPECT_EQ(driver.GetCurrentIoStatus(pins), LIBD_OK);
   EXPECT_EQ(rows_of(pins), (std::vector<PinRow>{{1, 0, 1, 1}, {2, 0, 1, 0}}));
   driver.forget_streams();

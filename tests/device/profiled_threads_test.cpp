@@ -2,22 +2,18 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
-#include <memory>
 #include <string>
 #include <thread>
 #include <vector>
 
 #include "tests/media/media_driver.h"
 #include "tests/media/pace.h"
-#include "tests/support/own_address.h"
-#include "tests/support/temporary_folder.h"
-#include "vexa/models.h"
-#include "virtual_camera/virtual_camera.h"
+#include "tests/support/model_camera.h"
 
 namespace vexa_test {
 namespace {
 
-constexpr std::size_t kProfiledPictures = 60;
+constexpr std::size_t kPictures = 60;
 constexpr int kSideStream = 2;  // the one that is set; the first one streams
 
 /// One of two records that differ in every field that is set.
@@ -64,29 +60,12 @@ int stored_mark(const SLibDCameraInfo& info) {
   return 0;
 }
 
-class ProfiledThreads : public testing::TestWithParam<const char*> {
+class ProfiledThreads : public testing::TestWithParam<const char*>, protected ModelCamera {
  protected:
   void start(const std::string& model) {
-    const std::string file = VEXA_SOURCE_DIR "/models/profiles/" + model + ".json";
-    vexa::Profile profile;
-    vexa::ProfileError error;
-    ASSERT_TRUE(vexa::LoadProfile(file, profile, error)) << error.Message();
     vexa::camera::CameraOptions options;
-    options.address = own_loopback(9);
-    options.profile_path = file;
     options.speed = kPace;
-    camera_ = std::make_unique<vexa::camera::VirtualCamera>(options);
-    ASSERT_TRUE(camera_->start()) << camera_->error();
-    device_ = vexa::MakeDevice(profile);
-    device_->SetCGILogPath((folder_ / "cgi.log").c_str());
-    SLibDConnectionInfo connection;
-    connection.streamTransport = 1;
-    connection.host = options.address;
-    connection.port = camera_->http_port();
-    connection.timeout = 20000;
-    connection.userName = options.user;
-    connection.password = options.password;
-    device_->SetCurrentConnectionInfo(connection);
+    ASSERT_NO_FATAL_FAILURE(start_model(model, options));
     SLibDCameraInfo first;
     ASSERT_EQ(device_->GetCameraInfo(first), LIBD_OK);
     ASSERT_EQ(first.codecName, "H.264");
@@ -125,10 +104,6 @@ class ProfiledThreads : public testing::TestWithParam<const char*> {
     control_image(mark == 1 ? LIBD_DAYNIGHT_AUTO : LIBD_DAYNIGHT_NIGHT);
     shape_offer();
   }
-
-  TemporaryFolder folder_;
-  std::unique_ptr<vexa::camera::VirtualCamera> camera_;
-  std::unique_ptr<CLibraryDevice> device_;
 };
 
 TEST_P(ProfiledThreads, SeeWholeRecordsWhileVideoStreams) {
@@ -141,10 +116,10 @@ TEST_P(ProfiledThreads, SeeWholeRecordsWhileVideoStreams) {
       for (; !over && !HasFatalFailure(); ++rounds) act(mark);
     });
   }
-  const auto frames = FrameTaker().take_all(*device_, kProfiledPictures);
+  const auto frames = FrameTaker().take_all(*device_, kPictures);
   over = true;
   for (std::thread& host : hosts) host.join();
-  EXPECT_EQ(frames.size(), kProfiledPictures);
+  EXPECT_EQ(frames.size(), kPictures);
   EXPECT_GT(rounds, 1);
   EXPECT_EQ(device_->StopVideoStreaming(), LIBD_OK);
 }

@@ -6,10 +6,8 @@
 
 #include "tests/device/ptz_reach.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::PtzDriver;
-using vexa_test::PtzUnsent;
 
 /// What GetCurrentPosition says, and what it leaves in a record that held other values.
 struct PositionSaid {
@@ -186,8 +184,6 @@ TEST_F(PtzPosition, LeavesTheAnglesOfACallerWhenItHasNone) {
   EXPECT_EQ(vertical, 6);
 }
 
-// ---- Records ----
-
 TEST_F(PtzUnsent, BecauseTheControlRecordIsTheDriversOwn) {
   SLibDPTZControlInfo stored;
   stored.reserved1 = 1;
@@ -234,3 +230,4 @@ TEST_F(PtzUnsent, BecauseTheFixedRecordIsTheModels) {
 }
 
 }  // namespace
+}  // namespace vexa_test

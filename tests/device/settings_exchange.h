@@ -1,6 +1,8 @@
 // Settings on the wire: scripts of commands and inquiries, and a driver whose settings are in reach.
 #pragma once
 
+#include <gtest/gtest.h>
+
 #include <string>
 #include <utility>
 #include <vector>
@@ -43,7 +45,7 @@ inline std::string text_of_latest_error(CLibraryDevice& driver) {
 
 /// A driver class, its settings in reach, that speaks to `host` as "admin" with the password "secret".
 template <typename Driver>
-class Settings : public Driver {
+class Settings : public Reach<Driver> {
  public:
   /// What an operation tells the model class about the video it will offer.
   struct VideoParams {
@@ -63,7 +65,7 @@ class Settings : public Driver {
 
   /// Points to where nobody listens and leaves an error that any exchange would clear.
   void expect_no_exchange() {
-    use(own_loopback_address(), refusing_port());
+    use(own_loopback(0), refusing_port());
     this->m_State->errors.record({LIBD_BUFFER_TOO_SMALL, "from before"});
   }
 
@@ -88,43 +90,25 @@ class Settings : public Driver {
     return LIBD_OK;
   }
 
-  using Driver::m_CameraInfo;
-  using Driver::m_CameraInquiryLock;
-  using Driver::m_ConnectionLock;
-  using Driver::m_FixedCameraInfo;
-  using Driver::m_FixedCameraInfoAvailable;
-  using Driver::m_FixedPTZControlInfo;
-  using Driver::m_FixedSystemInfo;
-  using Driver::m_PTZControlInfo;
-  using Driver::m_ResolutionFilter;
-
-  using Driver::ParseImageMaxSizeFromCameraProperty;
-  using Driver::ParseSolidPTZFromCameraProperty;
-  using Driver::ParseVideoCapSizeFromCameraProperty;
-  using Driver::ParseVideoStandardFromCameraProperty;
-  using Driver::SetCurrentFrameRate;
-  using Driver::SetCurrentQualityBitrate;
-  using Driver::SetCurrentResolution;
-  using Driver::SetCurrentStreamMode;
-
-  using Driver::CheckAmountOfBrightness;
-  using Driver::CheckCurrentBrightMode;
-  using Driver::GetIrisPositionFromCameraData;
-  using Driver::GetIrisPositionFromIrisList;
-  using Driver::GetShutterAndIrisMode;
-  using Driver::GetShutterSpeedFromCameraData;
-  using Driver::GetShutterSpeedFromShutterSpeedList;
-
   std::vector<VideoParams> told;
 };
 
 using SettingsDriver = Settings<CVexaCommon>;
 
-/// A camera that plays a script for a driver. Ends the play with the test.
+enum class Ends { kPlayed, kAnywhere };
+
+/// A camera that plays a script for a driver, and a test that fails unless all of it is played.
 template <typename Driver>
 class Played {
  public:
-  explicit Played(Script script) : camera_(std::move(script)) { driver.use(camera_.host(), camera_.port()); }
+  explicit Played(Script script, Ends ends = Ends::kPlayed) : camera_(std::move(script)), ends_(ends) {
+    driver.use(camera_.host(), camera_.port());
+  }
+  ~Played() {
+    if (ends_ == Ends::kPlayed) EXPECT_EQ(complaints(), "");
+  }
+  Played(const Played&) = delete;
+  Played& operator=(const Played&) = delete;
 
   /// Whether every request has been made and every connection closed.
   bool played() const { return camera_.played(); }
@@ -135,6 +119,7 @@ class Played {
 
  private:
   ScriptedCamera camera_;
+  const Ends ends_;
 };
 
 }  // namespace vexa_test

@@ -10,10 +10,8 @@
 #include "tests/device/camera_info_fields.h"
 #include "tests/media/live_camera.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::FrameTaker;
-using vexa_test::LiveCamera;
 
 constexpr std::size_t kPictures = 100;
 
@@ -32,14 +30,11 @@ SLibDCameraInfo read_record(int mark) {
 }
 
 /// A driver whose fixed video information a model class has filled.
-class ModelDriver : public vexa_test::MediaDriver {
- public:
-  using CVexaCommon::m_FixedCameraInfoAvailable;
-};
+using ModelDriver = MediaDriver;
 
 class SettingsThreads : public testing::Test {
  protected:
-  SettingsThreads() : camera_(vexa_test::camera_options()) {
+  SettingsThreads() : camera_(camera_options()) {
     camera_->settings().set_answer("camera", "A=1&XDNR=low&ViewDR=on");
     camera_.introduce(driver_, 20000);
     driver_.m_FixedSystemInfo.modelName = "LMX-P100";
@@ -119,3 +114,4 @@ TEST_F(SettingsThreads, ReadAndSetImageControls) {
 }
 
 }  // namespace
+}  // namespace vexa_test

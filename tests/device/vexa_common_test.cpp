@@ -51,7 +51,7 @@ TEST(SystemFailure, HasTheSystemsText) {
 
 TEST(LatestError, IsWholeWhenSeveralThreadsFailAtOnce) {
   TestDriver driver;
-  driver.use(own_loopback_address(), refusing_port(), kPatientTimeout);
+  driver.use(own_loopback(0), refusing_port(), kPatientTimeout);
   std::vector<std::thread> hosts;
   for (int host = 0; host < 4; ++host) {
     hosts.emplace_back([&driver] {
@@ -79,7 +79,7 @@ TEST(CameraType, IsAnyCommonBit) {
 
 TEST(SetCameraInfoFromId, OfASingleStreamCameraSendsNothing) {
   TestDriver driver;
-  driver.use(own_loopback_address(), refusing_port(), kPatientTimeout);
+  driver.use(own_loopback(0), refusing_port(), kPatientTimeout);
   for (const int count : {0, 1}) {
     driver.m_FixedCameraInfo.streamCount1 = driver.m_FixedCameraInfo.streamCount2 = count;
     EXPECT_EQ(driver.SetCameraInfoFromID(2), LIBD_OK);

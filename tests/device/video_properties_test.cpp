@@ -9,11 +9,11 @@
 
 #include "tests/device/settings_exchange.h"
 
+namespace vexa_test {
 namespace {
 
 using testing::ElementsAre;
 using testing::IsEmpty;
-using vexa_test::SettingsDriver;
 using VideoParams = SettingsDriver::VideoParams;
 
 /// A driver of a model with few sizes, in reach of no camera.
@@ -127,7 +127,7 @@ TEST_F(VideoProperties, AreHandedOutWhole) {
 }
 
 /// A model class whose hook has another thread use what the driver's locks guard.
-class AskingModel : public vexa_test::Settings<CVexaCommon> {
+class AskingModel : public Settings<CVexaCommon> {
  public:
   ELibDReturnCode InitializeFixedVideoParams(ELibDVideoStandard, int, int) override {
     answers_.push_back(std::async(std::launch::async, [this] {
@@ -149,7 +149,7 @@ class AskingModel : public vexa_test::Settings<CVexaCommon> {
 };
 
 TEST(VideoHook, RunsWithNoLockHeld) {
-  vexa_test::ScriptedCamera camera({vexa_test::inquiry("camera", "VideoStd=ntsc&VidCapSize=1280,960")});
+  ScriptedCamera camera({inquiry("camera", "VideoStd=ntsc&VidCapSize=1280,960")});
   AskingModel model;
   model.use(camera.host(), camera.port());
   SLibDCameraInfo info;
@@ -163,3 +163,4 @@ TEST(VideoHook, RunsWithNoLockHeld) {
 }
 
 }  // namespace
+}  // namespace vexa_test

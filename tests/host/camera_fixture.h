@@ -17,9 +17,6 @@
 
 namespace vexa_test {
 
-// Loopback addresses that no other process of a parallel test run uses.
-inline std::string own_address(unsigned index) { return own_loopback(index); }
-
 inline constexpr char kUser[] = "operator";
 inline constexpr char kPassword[] = "tr0ub4dor";
 inline constexpr char kBasicToken[] = "b3BlcmF0b3I6dHIwdWI0ZG9y";  // of both
@@ -29,7 +26,7 @@ inline const std::vector<std::string> kCredentials = {"VEXACTL_USER=operator", "
 class WithCamera : public testing::Test {
  protected:
   void start_camera(vexa::camera::CameraOptions options = {}) {
-    options.address = own_address(1);
+    options.address = own_loopback(1);
     options.user = kUser;
     options.password = kPassword;
     if (options.clip_path.empty()) options.clip_path = VEXA_CLIPS "/small.h264";

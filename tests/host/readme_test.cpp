@@ -15,12 +15,12 @@ TEST(Readme, ShowsTheHostThatIsBuilt) {
 
 TEST_F(FirstHost, RecordsLiveVideo) {
   vexa::camera::CameraOptions options = four_times_faster();
-  options.address = own_address(3);
+  options.address = own_loopback(3);
   options.http_port = 80;
   options.clip_path = VEXA_CLIPS "/small.h264";
   vexa::camera::VirtualCamera camera(options);
   ASSERT_TRUE(camera.start()) << camera.error();
-  ProgramRun program(folder(), {VEXA_BINARY_DIR "/bin/first-host", own_address(3)});
+  ProgramRun program(folder(), {VEXA_BINARY_DIR "/bin/first-host", own_loopback(3)});
   EXPECT_EQ(program.wait().exit_code, 0);
   EXPECT_TRUE(contents_of(folder() / "live.h264") == pictures(250));
 }
@@ -39,13 +39,13 @@ TEST_F(FirstHost, SaysWhyItEndsEarly) {
   for (const auto& row : cases) {
     SCOPED_TRACE(row.what);
     vexa::camera::CameraOptions options;
-    options.address = own_address(3);
+    options.address = own_loopback(3);
     options.http_port = 80;
     options.clip_path = VEXA_CLIPS "/small.h264";
     options.request_faults = {row.fault};
     vexa::camera::VirtualCamera camera(options);
     ASSERT_TRUE(camera.start()) << camera.error();
-    const ProgramResult result = ProgramRun(folder(), {VEXA_BINARY_DIR "/bin/first-host", own_address(3)}).wait();
+    const ProgramResult result = ProgramRun(folder(), {VEXA_BINARY_DIR "/bin/first-host", own_loopback(3)}).wait();
     EXPECT_EQ(result.exit_code, 1);
     EXPECT_EQ(result.err, row.message);
   }
@@ -53,14 +53,14 @@ TEST_F(FirstHost, SaysWhyItEndsEarly) {
 
 TEST_F(FirstHost, EndsWhenTheCameraFallsSilent) {
   vexa::camera::CameraOptions options;
-  options.address = own_address(3);
+  options.address = own_loopback(3);
   options.http_port = 80;
   options.clip_path = VEXA_CLIPS "/small.h264";
   options.packet_faults.loss = 1;
   options.packet_faults.first_picture = 10;
   vexa::camera::VirtualCamera camera(options);
   ASSERT_TRUE(camera.start()) << camera.error();
-  const ProgramResult result = ProgramRun(folder(), {VEXA_BINARY_DIR "/bin/first-host", own_address(3)}).wait();
+  const ProgramResult result = ProgramRun(folder(), {VEXA_BINARY_DIR "/bin/first-host", own_loopback(3)}).wait();
   EXPECT_EQ(result.exit_code, 1);
   EXPECT_THAT(result.err, testing::MatchesRegex("the video has ended early: .*\\(code -200\\)\n"));
 }

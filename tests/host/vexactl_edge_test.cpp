@@ -332,7 +332,7 @@ TEST_F(EdgeByCommand, BackfillFetchesTheSecondsWithoutNetworkAndNothingElse) {
   ASSERT_TRUE(eventually([this] { return held().size() == 2 && held()[1].pictures.size() >= 30; }));
   camera().plug();
   ASSERT_TRUE(eventually([this] { return held()[1].finished; }));
-  EXPECT_EQ(own_address(1) + ":" + std::to_string(camera().http_port()), http_place);
+  EXPECT_EQ(own_loopback(1) + ":" + std::to_string(camera().http_port()), http_place);
   const auto filled = edge_json({"backfill", "--since", "2024-02-01T00:01:00", "--out", "a/gap", "--scale", "4"});
   const Recording gap = held()[1];
   ASSERT_EQ(filled.size(), 1u);

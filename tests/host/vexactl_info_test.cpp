@@ -81,9 +81,9 @@ TEST_F(InfoCommand, APasswordThatTheCameraSendsBackIsHidden) {
 }
 
 TEST_F(InfoCommand, AnAddressWithoutACameraEndsWithTwo) {
-  const ProgramResult result = run({"info", own_address(2)});
+  const ProgramResult result = run({"info", own_loopback(2)});
   EXPECT_EQ(result.exit_code, 2);
-  EXPECT_EQ(result.err, "vexactl: the camera " + own_address(2) +
+  EXPECT_EQ(result.err, "vexactl: the camera " + own_loopback(2) +
                             ":80 cannot be used: Connection refused\n"
                             "  Check that address and HTTP port are the camera's.\n");
 }

@@ -141,7 +141,7 @@ TEST_F(LogCommand, ALogThatCannotBeWrittenEndsWithFive) {
   const std::pair<const char*, const char*> cases[] = {
       {"folder", "Is a directory"}, {"none/cgi.log", "No such file or directory"}, {"/dev/null", "not a regular file"}};
   for (const auto& [path, why] : cases) {
-    const ProgramResult result = run({"info", own_address(2), "--cgi-log", path});
+    const ProgramResult result = run({"info", own_loopback(2), "--cgi-log", path});
     EXPECT_EQ(result.exit_code, 5);
     EXPECT_EQ(result.err, std::string("vexactl: cannot write ") + path + ": " + why +
                               "\n  Give --cgi-log a file in a folder that exists and that you may write to.\n");

@@ -76,7 +76,7 @@ TEST_F(RecordCommand, AsksForTheStreamNamed) {
   start_camera(four_times_faster());
   camera().settings().set("camera", "ImageCodec2", "h264");
   run({"record", place(), "--stream", "2", "--frames", "5", "--out", "live.h264"});
-  EXPECT_GE(camera().journal().count("DESCRIBE rtsp://" + own_address(1) + ":554/media/video2 "), 1u);
+  EXPECT_GE(camera().journal().count("DESCRIBE rtsp://" + own_loopback(1) + ":554/media/video2 "), 1u);
 }
 
 TEST_F(RecordCommand, AStreamOfAnotherCodecEndsWithFour) {
@@ -176,7 +176,7 @@ TEST_F(RecordCommand, ARefusedSessionEndsWithThreeOrTwo) {
 
 TEST_F(RecordCommand, AFailedStartLeavesAFormerRecordingAlone) {
   folder().make_file("live.h264", "former");
-  const ProgramResult result = run({"record", own_address(2), "--out", "live.h264"});
+  const ProgramResult result = run({"record", own_loopback(2), "--out", "live.h264"});
   EXPECT_EQ(result.exit_code, 2);
   EXPECT_EQ(contents_of(folder() / "live.h264"), "former");
 }
@@ -239,7 +239,7 @@ TEST_F(RecordCommand, TheTraceShowsEveryRequestWithoutCredentials) {
   const ProgramResult result = run({"record", place(), "--frames", "5", "--out", "live.h264", "--trace"});
   EXPECT_EQ(result.exit_code, 0) << result.err;
   expect_no_password(result);
-  const std::string url = "rtsp://" + own_address(1) + ":554/media/video1";
+  const std::string url = "rtsp://" + own_loopback(1) + ":554/media/video1";
   EXPECT_THAT(result.err, testing::StartsWith("driver: send <DESCRIBE " + url +
                                               " RTSP/1.0\n"
                                               "driver: CSeq: 1\n"

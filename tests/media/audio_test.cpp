@@ -25,10 +25,6 @@ class AudioDriver : public TestDriver {
     state().now = [] { return audio_clock_now; };
     soil_latest_error();
   }
-
-  using CVexaCommon::m_AudioInfo;
-  using CVexaCommon::m_FixedAudioInfo;
-  using CVexaCommon::m_LastAudioTime;
 };
 
 /// Every field of the record.
@@ -173,49 +169,36 @@ TEST_F(AudioSettings, ThatTheCameraRefusesAreNotStored) {
 }
 
 /// Lets each allocation of `call` fail in turn, against a camera that plays `script`; every failure is told.
-/// @return how many allocations there are.
 template <typename Call>
-int audio_calls_short_of_memory(const Script& script, Call call) {
-  for (int nth = 0; nth < 1000; ++nth) {
-    AudioDriver driver;
-    ScriptedCamera camera(script);
-    driver.use(camera.host(), camera.port(), 5000);
-    driver.m_AudioInfo = any_record();
-    driver.m_AudioInfo.reserved3 = std::string(40, 'x');
-    driver.m_FixedSystemInfo.capability3 = 1;
-    driver.m_FixedAudioInfo.inputCodecs.resize(1);
-    ELibDReturnCode result = LIBD_OK;
-    bool happened = false;
-    {
-      const AllocationFailure failure(nth);
-      result = call(driver);
-      happened = failure.happened();
-    }
-    EXPECT_EQ(result, happened ? LIBD_FAILED : LIBD_OK) << nth;
-    if (!happened) return nth;
-    EXPECT_EQ(driver.LatestErrorText(), "Cannot allocate memory") << nth;
-  }
-  return 1000;
+void expect_each_failure_told(const Script& script, int few, Call call) {
+  fails_at_every_allocation(
+      [&](Shortage& shortage) {
+        AudioDriver driver;
+        ScriptedCamera camera(script);
+        driver.use(camera.host(), camera.port(), 5000);
+        driver.m_AudioInfo = any_record();
+        driver.m_AudioInfo.reserved3 = std::string(40, 'x');
+        driver.m_FixedSystemInfo.capability3 = 1;
+        driver.m_FixedAudioInfo.inputCodecs.resize(1);
+        expect_failure_told(shortage, driver, [&] { return call(driver); });
+      },
+      few);
 }
 
 TEST_F(AudioSettings, FailWhenAnyOneAllocationDoes) {
-  EXPECT_GT(audio_calls_short_of_memory({inquiry("camera", "AudInCodec=g711_64&" + std::string(40, 'x'))},
-                                        [](AudioDriver& driver) {
-                                          SLibDAudioInfo info;
-                                          return driver.GetAudioInfo(info);
-                                        }),
-            3);
+  expect_each_failure_told({inquiry("camera", "AudInCodec=g711_64&" + std::string(40, 'x'))}, 3,
+                           [](AudioDriver& driver) {
+                             SLibDAudioInfo info;
+                             return driver.GetAudioInfo(info);
+                           });
   SLibDAudioInfo set = any_record();
   set.reserved3 = std::string(40, 'x');
-  EXPECT_GT(audio_calls_short_of_memory({command("/command/camera.cgi?AudInCodec=g711_64&AudioIn=on")},
-                                        [&set](AudioDriver& driver) { return driver.SetAudioInfo(set); }),
-            3);
-  EXPECT_GT(audio_calls_short_of_memory({},
-                                        [](AudioDriver& driver) {
-                                          SLibDFixedAudioInfo info;
-                                          return driver.GetFixedAudioInfo(info);
-                                        }),
-            0);
+  expect_each_failure_told({command("/command/camera.cgi?AudInCodec=g711_64&AudioIn=on")}, 3,
+                           [&set](AudioDriver& driver) { return driver.SetAudioInfo(set); });
+  expect_each_failure_told({}, 0, [](AudioDriver& driver) {
+    SLibDFixedAudioInfo info;
+    return driver.GetFixedAudioInfo(info);
+  });
 }
 
 class AudioStream : public testing::Test {

@@ -37,13 +37,6 @@ class HttpDriver : public MediaDriver {
     const vexa::Guard guard(m_CamPosLock);
     return m_CamPosText;
   }
-
-  using CVexaCommon::GetCurrentFrameData;
-  using CVexaCommon::GetCurrentH264FrameData;
-  using CVexaCommon::GetCurrentJPEGFrameData;
-  using CVexaCommon::GetCurrentMPEGFrameData;
-  using CVexaCommon::m_StreamBuffer;
-  using CVexaCommon::m_StreamBufferSize;
 };
 
 class HttpFrames : public testing::Test {

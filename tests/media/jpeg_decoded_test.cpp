@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "media/assembly/jpeg_tables.h"
+#include "media/assembly/jfif_header.h"
 #include "tests/media/video_ways.h"
 
 namespace vexa_test {

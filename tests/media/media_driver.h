@@ -77,41 +77,6 @@ class MediaDriver : public TestDriver {
   }
   void use_live_h264() { use_live("H.264"); }
 
-  using CVexaCommon::GetRtpCurrentVideoFrame;
-  using CVexaCommon::GetRtpCurrentVideoFrameH264;
-  using CVexaCommon::GetRtpCurrentVideoFrameJPEG;
-  using CVexaCommon::GetRtpCurrentVideoFrameMPEG4;
-  using CVexaCommon::GetUserDataFromStream;
-  using CVexaCommon::m_CamPosLock;
-  using CVexaCommon::m_CamPosText;
-  using CVexaCommon::m_FirstPlaybackFrame;
-  using CVexaCommon::m_FrameQueue;
-  using CVexaCommon::m_FrameQueueLock;
-  using CVexaCommon::m_LargeFrameBuffers;
-  using CVexaCommon::m_LastFrameTime;
-  using CVexaCommon::m_PlaybackBaseTimestamp;
-  using CVexaCommon::m_RtpLiveMode;
-  using CVexaCommon::m_RtpPacketBuffer;
-  using CVexaCommon::m_RtpPackets;
-  using CVexaCommon::m_StagingBuffer;
-  using CVexaCommon::m_StagingBufferSize;
-  using CVexaCommon::m_StopVideoEvent;
-  using CVexaCommon::m_StopVideoRequested;
-  using CVexaCommon::m_StreamingThread;
-  using CVexaCommon::m_StreamWaitMs;
-  using CVexaCommon::m_VideoStateLock;
-  using CVexaCommon::m_VideoTimedOut;
-  using CVexaCommon::ProcessCurrentFrameData;
-  using CVexaCommon::PropulateFrameInfoList;
-  using CVexaCommon::ReleaseRtpPacketsPtr;
-  using CVexaCommon::rtp_over_tcp_open;
-  using CVexaCommon::rtp_over_tcp_payload_recv;
-  using CVexaCommon::rtp_over_udp_payload_recv;
-  using CVexaCommon::rtp_over_udp_payload_recv_h264;
-  using CVexaCommon::rtp_over_udp_recvn;
-  using CVexaCommon::RTPJpegToJIF;
-  using CVexaCommon::StreamingThread;
-
  private:
   std::vector<std::shared_ptr<KeptPace>> paces_;
 };

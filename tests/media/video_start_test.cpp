@@ -87,42 +87,30 @@ TEST(VideoStart, AsksPort554AlsoWhenTheHostReadsAnotherFromTheCameraMeanwhile) {
 TEST(VideoStart, ThatRunsOutOfMemoryAnywhereFailsAndLeavesNothingBehind) {
   LiveCamera camera(camera_options());
   const std::size_t descriptors = open_descriptors();
-  bool failed = true;
-  int allocation = 0;
-  for (; failed && allocation < 2000; ++allocation) {
-    MediaDriver driver;
-    camera.introduce(driver);
-    driver.m_NoTearDown = true;  // only the start's own allocations are counted
-    ELibDReturnCode code = LIBD_NOT_SUPPORTED;
-    {
-      const AllocationFailure failure(allocation);
-      code = driver.StartVideoStreaming();
-      failed = failure.happened();
-    }
-    EXPECT_EQ(code, failed ? LIBD_FAILED : LIBD_OK) << "allocation " << allocation;
-    EXPECT_EQ(driver.m_ConnectionInfo.timeout, 5000) << "allocation " << allocation;
-    if (failed) expect_stopped(driver);
-  }
-  EXPECT_FALSE(failed);
-  EXPECT_GT(allocation, 20);
+  fails_at_every_allocation(
+      [&camera](Shortage& shortage) {
+        MediaDriver driver;
+        camera.introduce(driver);
+        driver.m_NoTearDown = true;  // only the start's own allocations are counted
+        const auto start = [&] { return driver.StartVideoStreaming(); };
+        EXPECT_EQ(shortage.run(start), shortage.failed() ? LIBD_FAILED : LIBD_OK);
+        EXPECT_EQ(driver.m_ConnectionInfo.timeout, 5000);
+        if (shortage.failed()) expect_stopped(driver);
+      },
+      19);
   EXPECT_TRUE(eventually([&] { return open_descriptors() == descriptors; }));
 }
 
 TEST(VideoStop, ThatRunsOutOfMemoryClosesEverythingAllTheSame) {
   LiveCamera camera(camera_options());
-  bool failed = true;
-  for (int allocation = 0; failed && allocation < 100; ++allocation) {
-    MediaDriver driver;
-    camera.introduce(driver);
-    ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
-    {
-      const AllocationFailure failure(allocation);
-      EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
-      failed = failure.happened();
-    }
-    expect_stopped(driver);
-  }
-  EXPECT_FALSE(failed);
+  fails_at_every_allocation(
+      [&camera](Shortage& shortage) {
+        MediaDriver driver;
+        camera.play(driver);
+        EXPECT_EQ(shortage.run([&] { return driver.StopVideoStreaming(); }), LIBD_OK);
+        expect_stopped(driver);
+      },
+      -1);
 }
 
 TEST(VideoStart, HasFortySecondsForTheOpenAloneAndPutsTheTimeOutBack) {

@@ -3,15 +3,11 @@
 #include <poll.h>
 
 #include <chrono>
-#include <memory>
 #include <string>
 #include <vector>
 
 #include "tests/support/decoder.h"
-#include "tests/support/own_address.h"
-#include "tests/support/temporary_folder.h"
-#include "vexa/models.h"
-#include "virtual_camera/virtual_camera.h"
+#include "tests/support/model_camera.h"
 
 namespace vexa_test {
 namespace {
@@ -42,28 +38,13 @@ class FrameBytes : public CDataSink {
   std::size_t frames = 0;
 };
 
-class CodecChange : public testing::Test {
+class CodecChange : public testing::Test, protected ModelCamera {
  protected:
   void start(const std::string& model) {
-    vexa::ProfileError error;
-    ASSERT_TRUE(vexa::LoadProfile(model, profile_, error)) << error.Message();
     vexa::camera::CameraOptions options;
-    options.address = own_loopback(9);
-    options.profile_path = vexa::ProfileFolder() + "/" + model + ".json";
     options.speed = 5;
     options.hash_packets = false;
-    camera_ = std::make_unique<vexa::camera::VirtualCamera>(options);
-    ASSERT_TRUE(camera_->start()) << camera_->error();
-    device_ = vexa::MakeDevice(profile_);
-    device_->SetCGILogPath((folder_ / "cgi.log").c_str());
-    SLibDConnectionInfo connection;
-    connection.streamTransport = 1;
-    connection.host = options.address;
-    connection.port = camera_->http_port();
-    connection.timeout = 10000;
-    connection.userName = options.user;
-    connection.password = options.password;
-    device_->SetCurrentConnectionInfo(connection);
+    start_model(model, options);
   }
 
   /// Every size of every codec that the camera streams, with rates that differ from one to the next.
@@ -116,11 +97,6 @@ class CodecChange : public testing::Test {
     EXPECT_EQ(device_->StopVideoStreaming(), LIBD_OK);
     return sink;
   }
-
-  TemporaryFolder folder_;
-  vexa::Profile profile_;
-  std::unique_ptr<vexa::camera::VirtualCamera> camera_;
-  std::unique_ptr<CLibraryDevice> device_;
 };
 
 TEST_F(CodecChange, FiftyTimesInARowADecoderFindsWhatWasAskedFor) {

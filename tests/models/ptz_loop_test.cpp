@@ -6,14 +6,10 @@
 #include <array>
 #include <chrono>
 #include <cmath>
-#include <memory>
 #include <string>
 #include <vector>
 
-#include "tests/support/own_address.h"
-#include "tests/support/temporary_folder.h"
-#include "vexa/models.h"
-#include "virtual_camera/virtual_camera.h"
+#include "tests/support/model_camera.h"
 
 namespace vexa_test {
 namespace {
@@ -27,32 +23,16 @@ class NoPicture : public CDataSink {
 };
 
 /// Camera and driver of a model; what moves is there at once.
-class ModelAtWork {
+class ModelAtWork : private ModelCamera {
  public:
   explicit ModelAtWork(const std::string& model) {
-    vexa::ProfileError error;
-    EXPECT_TRUE(vexa::LoadProfile(model, profile_, error)) << error.Message();
     vexa::camera::CameraOptions options;
-    options.address = own_loopback(11);
     options.rtsp_port = 0;
-    options.profile_path = vexa::ProfileFolder() + "/" + model + ".json";
     options.image_path = VEXA_CLIPS "/small.mjpeg";
     options.frames_per_second = 50;
     options.ptz_speed = 1e6;
-    camera_ = std::make_unique<vexa::camera::VirtualCamera>(options);
-    EXPECT_TRUE(camera_->start()) << camera_->error();
-    device_ = vexa::MakeDevice(profile_);
-    device_->SetCGILogPath((folder_ / "cgi.log").c_str());
-    SLibDConnectionInfo connection;
-    connection.host = options.address;
-    connection.port = camera_->http_port();
-    connection.timeout = 10000;
-    connection.userName = options.user;
-    connection.password = options.password;
-    device_->SetCurrentConnectionInfo(connection);
+    start_model(model, options, 0);
   }
-  ModelAtWork(const ModelAtWork&) = delete;
-  ModelAtWork& operator=(const ModelAtWork&) = delete;
 
   CLibraryDevice* operator->() { return device_.get(); }
   vexa::camera::VirtualCamera& camera() { return *camera_; }
@@ -112,11 +92,6 @@ class ModelAtWork {
            std::abs(status.horizontalAngle - pose.horizontal_angle * 10000) <
                1 + pose.horizontal_angle;  // the driver cuts the magnification to four digits
   }
-
-  TemporaryFolder folder_;
-  vexa::Profile profile_;
-  std::unique_ptr<vexa::camera::VirtualCamera> camera_;
-  std::unique_ptr<CLibraryDevice> device_;
 };
 
 std::vector<std::string> moving_models() {

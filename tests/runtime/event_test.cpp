@@ -13,14 +13,12 @@
 #include <vector>
 
 #include "runtime/handle.h"
-#include "tests/runtime/event_owner.h"
+#include "tests/runtime/thread_routines.h"
 #include "tests/support/failing_new.h"
 #include "tests/support/process_state.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::Event;
-using vexa_test::make_event;
 
 vexa::EventHandle& record(const Event& event) { return *vexa::record_of<vexa::EventHandle>(event.get()); }
 
@@ -31,14 +29,14 @@ typedHandle thread_handle = {HANDLE_TYPE_THREAD};
 
 TEST(CreateEvent, RefusesWhatIsNotAPlainManualResetEvent) {
   _SECURITY_ATTRIBUTES attributes = {};
-  const std::size_t before = vexa_test::open_descriptors();
+  const std::size_t before = open_descriptors();
   EXPECT_EQ(CreateEvent(&attributes, 1, 0, nullptr), nullptr);
   EXPECT_EQ(CreateEvent(nullptr, 0, 0, nullptr), nullptr);
   EXPECT_EQ(CreateEvent(nullptr, 2, 0, nullptr), nullptr);
   EXPECT_EQ(CreateEvent(nullptr, -1, 0, nullptr), nullptr);
   EXPECT_EQ(CreateEvent(nullptr, 1, 0, "name"), nullptr);
   EXPECT_EQ(CreateEvent(nullptr, 1, 0, ""), nullptr);
-  EXPECT_EQ(vexa_test::open_descriptors(), before);
+  EXPECT_EQ(open_descriptors(), before);
 }
 
 TEST(CreateEvent, IgnoresTheInitialState) {
@@ -57,7 +55,7 @@ TEST(CreateEvent, MakesAReadEndThatDoesNotBlock) {
 }
 
 TEST(CreateEvent, GivesNullWithoutDescriptors) {
-  const std::size_t before = vexa_test::open_descriptors();
+  const std::size_t before = open_descriptors();
   rlimit limit = {};
   ASSERT_EQ(getrlimit(RLIMIT_NOFILE, &limit), 0);
   const int next = dup(0);
@@ -68,15 +66,15 @@ TEST(CreateEvent, GivesNullWithoutDescriptors) {
   typedHandle* event = CreateEvent(nullptr, 1, 0, nullptr);
   ASSERT_EQ(setrlimit(RLIMIT_NOFILE, &limit), 0);
   EXPECT_EQ(event, nullptr);
-  EXPECT_EQ(vexa_test::open_descriptors(), before);
+  EXPECT_EQ(open_descriptors(), before);
 }
 
 TEST(CreateEvent, GivesNullWithoutMemory) {
-  const std::size_t before = vexa_test::open_descriptors();
-  const vexa_test::AllocationFailure failure(0);
+  const std::size_t before = open_descriptors();
+  const AllocationFailure failure(0);
   EXPECT_EQ(CreateEvent(nullptr, 1, 0, nullptr), nullptr);
   EXPECT_TRUE(failure.happened());
-  EXPECT_EQ(vexa_test::open_descriptors(), before);
+  EXPECT_EQ(open_descriptors(), before);
 }
 
 bool child_sees(int fd) {
@@ -249,3 +247,4 @@ TEST(CloseEventHandle, ClosesTheWriteEndEvenWhenTheReadEndCannotBe) {
 }
 
 }  // namespace
+}  // namespace vexa_test

@@ -12,18 +12,8 @@
 #include "tests/support/temporary_folder.h"
 #include "vexa/file_logger.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::closing_banner;
-using vexa_test::contents_of;
-using vexa_test::in_child;
-using vexa_test::is_there;
-using vexa_test::log_text;
-using vexa_test::opening_banner;
-using vexa_test::stderr_of;
-using vexa_test::TemporaryFolder;
-using vexa_test::text_up_to;
-using vexa_test::without_times;
 
 class RotatingLogger : public CFileLogger {
  public:
@@ -243,3 +233,4 @@ TEST(FileLoggerRotation, OpeningAFileThatIsOpenKeepsIt) {
 }
 
 }  // namespace
+}  // namespace vexa_test

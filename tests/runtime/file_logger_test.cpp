@@ -20,19 +20,8 @@
 #include "tests/support/temporary_folder.h"
 #include "vexa/real_time.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::become_unprivileged;
-using vexa_test::closing_banner;
-using vexa_test::contents_of;
-using vexa_test::in_child;
-using vexa_test::is_there;
-using vexa_test::log_text;
-using vexa_test::opening_banner;
-using vexa_test::stderr_of;
-using vexa_test::TemporaryFolder;
-using vexa_test::text_up_to;
-using vexa_test::without_times;
 
 /// A logger whose inside is open.
 class OpenLogger : public CFileLogger {
@@ -207,11 +196,11 @@ TEST(FileLogger, OpeningLeavesTheFormerFile) {
 
 TEST(FileLogger, DestructionClosesItsShare) {
   const TemporaryFolder folder;
-  const std::size_t before = vexa_test::open_descriptors();
+  const std::size_t before = open_descriptors();
   { const OpenLogger logger(folder / "Log.txt"); }
   EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + closing_banner());
   EXPECT_TRUE(OpenLogger::m_FileInfoList.empty());
-  EXPECT_EQ(vexa_test::open_descriptors(), before);
+  EXPECT_EQ(open_descriptors(), before);
 }
 
 TEST(FileLogger, ALoggerInAStaticMayOutliveAllElse) {
@@ -325,3 +314,4 @@ TEST(FileLogger, IsDestroyedThroughItsBase) {
 }
 
 }  // namespace
+}  // namespace vexa_test

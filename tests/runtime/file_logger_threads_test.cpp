@@ -13,11 +13,8 @@
 #include "tests/support/temporary_folder.h"
 #include "vexa/file_logger.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::contents_of;
-using vexa_test::memory_folder;
-using vexa_test::TemporaryFolder;
 
 constexpr int kThreads = 16;
 constexpr int kLoggers = 4;
@@ -97,7 +94,7 @@ class LineCheck {
   }
 
   static bool is_banner(std::string_view line) {
-    return line.empty() || line == vexa_test::banner_rule() || line.ends_with(" LogFile Opened. ") ||
+    return line.empty() || line == banner_rule() || line.ends_with(" LogFile Opened. ") ||
            line.ends_with("\tLogFile Closed");
   }
 
@@ -157,9 +154,10 @@ TEST(FileLoggerThreads, AReopeningLosesNoLineAndLeavesNoShareBehind) {
   for (const char* name : {"a", "b"}) {
     const std::string text = contents_of(folder / name);
     for (std::size_t at = 0; (at = text.find(" end", at)) != std::string::npos; ++at) ++lines;
-    EXPECT_TRUE(text.empty() || text.ends_with(vexa_test::banner_rule() + "\n")) << name;
+    EXPECT_TRUE(text.empty() || text.ends_with(banner_rule() + "\n")) << name;
   }
   EXPECT_EQ(lines, kWriters * kLinesEach);
 }
 
 }  // namespace
+}  // namespace vexa_test

@@ -9,14 +9,8 @@
 #include "tests/support/temporary_folder.h"
 #include "vexa/runtime.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::become_unprivileged;
-using vexa_test::contents_of;
-using vexa_test::in_child;
-using vexa_test::is_there;
-using vexa_test::stderr_of;
-using vexa_test::TemporaryFolder;
 
 TEST(CreateDirectory, MakesADirectoryOfMode0755) {
   const TemporaryFolder folder;
@@ -121,3 +115,4 @@ TEST(FileNames, AnUnprivilegedUserIsToldWhatItMayNotDo) {
 }
 
 }  // namespace
+}  // namespace vexa_test

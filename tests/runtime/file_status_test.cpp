@@ -13,12 +13,8 @@
 #include "tests/support/temporary_folder.h"
 #include "vexa/runtime.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::become_unprivileged;
-using vexa_test::in_child;
-using vexa_test::stderr_of;
-using vexa_test::TemporaryFolder;
 
 constexpr std::uint32_t kFailed = 0xFFFFFFFF;
 constexpr uid_t kOtherUser = 54321;
@@ -261,3 +257,4 @@ TEST(GetDiskFreeSpaceEx, TellsItsFailureAndKeepsErrno) {
 }
 
 }  // namespace
+}  // namespace vexa_test

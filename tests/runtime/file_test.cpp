@@ -16,13 +16,8 @@
 #include "tests/support/temporary_folder.h"
 #include "vexa/runtime.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::become_unprivileged;
-using vexa_test::contents_of;
-using vexa_test::in_child;
-using vexa_test::stderr_of;
-using vexa_test::TemporaryFolder;
 
 constexpr char kInvalidHandle[] = "checkFileHandle : called with invalid handle\n";
 constexpr std::uint32_t kNoSize = 0xFFFFFFFF;
@@ -141,7 +136,7 @@ TEST(CreateFile, IgnoresWhatItDoesNotKnow) {
 }
 
 TEST(CreateFile, TellsWhyItFailsAndKeepsNoDescriptor) {
-  const std::size_t before = vexa_test::open_descriptors();
+  const std::size_t before = open_descriptors();
   const std::string long_name(4096, 'n');
   const struct {
     std::string path, error;
@@ -156,7 +151,7 @@ TEST(CreateFile, TellsWhyItFailsAndKeepsNoDescriptor) {
   }
   EXPECT_EQ(stderr_of([] { EXPECT_EQ(CreateFile(nullptr, 1, 0, nullptr, OPEN_EXISTING, 0, nullptr), nullptr); }),
             "CreateFile fopen : No such file or directory\n");
-  EXPECT_EQ(vexa_test::open_descriptors(), before);
+  EXPECT_EQ(open_descriptors(), before);
 }
 
 TEST(CreateFile, TellsThatAFileIsReadOnly) {
@@ -175,7 +170,7 @@ TEST(CreateFile, TellsThatMemoryIsShort) {
   typedHandle* file = nullptr;
   EXPECT_EQ(stderr_of([&] {
               errno = ENOMEM;
-              const vexa_test::AllocationFailure failure(0);
+              const AllocationFailure failure(0);
               file = CreateFile("/dev/null", 1, 0, nullptr, OPEN_EXISTING, 0, nullptr);
             }),
             "CreateFile new: Cannot allocate memory\n");
@@ -371,3 +366,4 @@ TEST(ReadFile, RefusesAnOverlappedTransfer) {
 }
 
 }  // namespace
+}  // namespace vexa_test

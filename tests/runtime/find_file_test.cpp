@@ -16,12 +16,8 @@
 #include "tests/support/temporary_folder.h"
 #include "vexa/runtime.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::AllocationFailure;
-using vexa_test::in_child;
-using vexa_test::stderr_of;
-using vexa_test::TemporaryFolder;
 
 constexpr char kInvalidFindHandle[] = "checkFindFirstFileHandle : called with invalid handle\n";
 
@@ -119,37 +115,24 @@ TEST(FindFirstFile, FillsNothingWithoutARecord) {
   EXPECT_EQ(FindClose(search), 1);
 }
 
-TEST(FindFirstFile, TellsThatMemoryIsShortForTheHandle) {
-  typedHandle* search = nullptr;
-  EXPECT_EQ(stderr_of([&] {
-              _WIN32_FIND_DATA data;
-              errno = ENOMEM;
-              const AllocationFailure failure(0);
-              search = FindFirstFile("/tmp", &data);
-            }),
-            "FindFirstFile new: Cannot allocate memory\n");
-  EXPECT_EQ(search, nullptr);
-}
-
-TEST(FindFirstFile, TellsThatMemoryIsShortForTheMatches) {
+TEST(FindFirstFile, TellsThatMemoryIsShortForTheHandleOrTheMatches) {
   const TemporaryFolder folder;
   folder.make_file("a long name that needs memory of its own");
   const std::string pattern = folder / "*";
-  bool failed = true;
-  int nth = 1;
-  for (; failed; ++nth) {
-    typedHandle* search = nullptr;
-    _WIN32_FIND_DATA data;
-    const std::string text = stderr_of([&] {
-      const AllocationFailure failure(nth);
-      search = FindFirstFile(pattern.c_str(), &data);
-      failed = failure.happened();
-    });
-    EXPECT_EQ(text, failed ? "FindFirstFile pathglob: Cannot allocate memory\n" : "") << nth;
-    EXPECT_EQ(search == nullptr, failed) << nth;
-    EXPECT_TRUE(search == nullptr || FindClose(search) == 1);
-  }
-  EXPECT_GT(nth, 5);
+  fails_at_every_allocation(
+      [&pattern](Shortage& shortage) {
+        typedHandle* search = nullptr;
+        _WIN32_FIND_DATA data;
+        const std::string text = stderr_of([&] {
+          errno = ENOMEM;
+          search = shortage.run([&] { return FindFirstFile(pattern.c_str(), &data); });
+        });
+        const std::string step = shortage.nth() == 0 ? "new" : "pathglob";
+        EXPECT_EQ(text, shortage.failed() ? "FindFirstFile " + step + ": Cannot allocate memory\n" : "");
+        EXPECT_EQ(search == nullptr, shortage.failed());
+        EXPECT_TRUE(search == nullptr || FindClose(search) == 1);
+      },
+      4);
 }
 
 TEST(FindNextFile, GoesThroughTheMatchesInOrderAndEndsSilently) {
@@ -239,11 +222,12 @@ TEST(FindFile, RefusesNullAndOtherKinds) {
 TEST(FindFile, KeepsNoDescriptorWhileItIsOpen) {
   const TemporaryFolder folder;
   folder.make_file("a");
-  const std::size_t before = vexa_test::open_descriptors();
+  const std::size_t before = open_descriptors();
   _WIN32_FIND_DATA data;
   typedHandle* search = FindFirstFile((folder / "*").c_str(), &data);
-  EXPECT_EQ(vexa_test::open_descriptors(), before);
+  EXPECT_EQ(open_descriptors(), before);
   EXPECT_EQ(FindClose(search), 1);
 }
 
 }  // namespace
+}  // namespace vexa_test

@@ -17,12 +17,8 @@
 #include "tests/support/temporary_folder.h"
 #include "vexa/runtime.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::become_unprivileged;
-using vexa_test::in_child;
-using vexa_test::stderr_of;
-using vexa_test::TemporaryFolder;
 
 using Paths = std::vector<std::string>;
 
@@ -382,3 +378,4 @@ TEST(PathGlob, FreeingTwiceIsHarmless) {
 }
 
 }  // namespace
+}  // namespace vexa_test

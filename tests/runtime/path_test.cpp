@@ -8,11 +8,8 @@
 #include "tests/support/temporary_folder.h"
 #include "vexa/runtime.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::in_child;
-using vexa_test::stderr_of;
-using vexa_test::TemporaryFolder;
 
 struct Pieces {
   std::string drive, dir, name, ext;
@@ -214,3 +211,4 @@ TEST(MakePath, StopsAtThePieceThatWouldPass4095Characters) {
 }
 
 }  // namespace
+}  // namespace vexa_test

@@ -13,9 +13,8 @@
 #include "runtime/base/sync.h"
 #include "tests/support/process_state.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::eventually;
 
 TEST(SimpleLock, IsOnePolymorphicMutex) {
   static_assert(std::has_virtual_destructor<CSimpleLock>::value, "deleted through a base");
@@ -29,7 +28,7 @@ class Contender {
  public:
   explicit Contender(CSimpleLock& lock)
       : thread_([this, &lock] {
-          id_ = vexa_test::kernel_thread_id();
+          id_ = kernel_thread_id();
           lock.Lock();
           passed_ = true;
           lock.Unlock();
@@ -37,7 +36,7 @@ class Contender {
   ~Contender() { thread_.join(); }
 
   bool is_kept_out() {
-    return eventually([this] { return id_ != 0 && vexa_test::is_sleeping(id_); }) && !passed_;
+    return eventually([this] { return id_ != 0 && is_sleeping(id_); }) && !passed_;
   }
   bool passes() {
     return eventually([this] { return passed_.load(); });
@@ -121,3 +120,4 @@ TEST(SimpleLock, IsDestroyedThroughItsBase) {
 }
 
 }  // namespace
+}  // namespace vexa_test

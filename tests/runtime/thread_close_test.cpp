@@ -13,18 +13,8 @@
 #include "tests/support/process_state.h"
 #include "vexa/runtime.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::eventually;
-using vexa_test::exit_code;
-using vexa_test::finishes;
-using vexa_test::Gate;
-using vexa_test::goes_through;
-using vexa_test::is_running;
-using vexa_test::return_argument;
-using vexa_test::return_nothing;
-using vexa_test::start;
-using vexa_test::wait_at_gate;
 
 TEST(GetExitCodeThread, RefusesAMissingResult) {
   typedHandle* thread = start(return_nothing);
@@ -68,7 +58,7 @@ struct LateWork {
 
   ~LateWork() {
     if (task == nullptr) return;
-    eventually([this] { return task->closing && vexa_test::is_sleeping(task->closer); });
+    eventually([this] { return task->closing && is_sleeping(task->closer); });
     unsigned long code = 0;
     task->done = GetExitCodeThread(task->other, &code) == 1;
   }
@@ -84,7 +74,7 @@ unsigned int leave_late_work(void* argument) {
 TEST(CloseThreadHandle, OfAFinishedThreadJoinsItWithoutHoldingTheLock) {
   Gate gate;
   typedHandle* other = start(wait_at_gate, &gate);
-  LateWork::Task task = {vexa_test::kernel_thread_id(), other};
+  LateWork::Task task = {kernel_thread_id(), other};
   typedHandle* thread = start(leave_late_work, &task);
   ASSERT_NE(thread, nullptr);
   EXPECT_TRUE(finishes(thread));
@@ -97,7 +87,7 @@ TEST(CloseThreadHandle, OfAFinishedThreadJoinsItWithoutHoldingTheLock) {
 }
 
 unsigned int return_259(void* argument) {
-  *static_cast<std::atomic<long>*>(argument) = vexa_test::kernel_thread_id();
+  *static_cast<std::atomic<long>*>(argument) = kernel_thread_id();
   return 259;
 }
 
@@ -153,7 +143,7 @@ struct OwnHandle {
 
 unsigned int close_own_handle_after_the_end(void* argument) {
   auto* own = static_cast<OwnHandle*>(argument);
-  own->id = vexa_test::kernel_thread_id();
+  own->id = kernel_thread_id();
   eventually([own] { return own->handle != nullptr; });
   cleanup_thread_internal(5);
   own->closed = CloseThreadHandle(own->handle);
@@ -215,7 +205,7 @@ int start_and_close_many(unsigned int seed) {
     unsigned int result = seed * 1000 + i;
     std::atomic<long> id{0};
     typedHandle* finished = start(return_argument, &result);
-    typedHandle* running = start(vexa_test::store_identifier, &id);
+    typedHandle* running = start(store_identifier, &id);
     if (finished == nullptr || running == nullptr) return wrong + 1;
     wrong += CloseThreadHandle(running) == 1 ? 0 : 1;
     wrong += finishes(finished) && exit_code(finished) == result ? 0 : 1;
@@ -287,3 +277,4 @@ TEST(ThreadHandleDeathTest, AThreadThatEndsWhileTheProcessExitsIsStillKnown) {
 }
 
 }  // namespace
+}  // namespace vexa_test

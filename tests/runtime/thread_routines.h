@@ -8,7 +8,16 @@
 #include "tests/support/process_state.h"
 #include "vexa/runtime.h"
 
+#include <memory>
+
 namespace vexa_test {
+
+struct CloseEvent {
+  void operator()(typedHandle* h) const { CloseEventHandle(h); }
+};
+using Event = std::unique_ptr<typedHandle, CloseEvent>;
+
+inline Event make_event() { return Event(CreateEvent(nullptr, 1, 0, nullptr)); }
 
 using Routine = unsigned int (*)(void*);
 

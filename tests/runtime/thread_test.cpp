@@ -12,16 +12,8 @@
 #include "tests/support/process_state.h"
 #include "vexa/runtime.h"
 
+namespace vexa_test {
 namespace {
-
-using vexa_test::eventually;
-using vexa_test::exit_code;
-using vexa_test::finishes;
-using vexa_test::Gate;
-using vexa_test::return_argument;
-using vexa_test::return_nothing;
-using vexa_test::start;
-using vexa_test::wait_at_gate;
 
 unsigned int count_run(void* argument) {
   ++*static_cast<std::atomic<int>*>(argument);
@@ -170,7 +162,7 @@ TEST(BeginThread, GivesNullAtEachAllocationThatFails) {
   int failures = 0;
   for (bool failed = true; failed; failures += failed ? 1 : 0) {
     EXPECT_EQ(thread, nullptr) << failures;
-    const vexa_test::AllocationFailure failure(failures);
+    const AllocationFailure failure(failures);
     thread = start(count_run, &runs);
     failed = failure.happened();
   }
@@ -229,3 +221,4 @@ TEST(ThreadHandle, OperationsRefuseNullAndOtherKinds) {
 }
 
 }  // namespace
+}  // namespace vexa_test

@@ -11,18 +11,15 @@
 #include <vector>
 
 #include "runtime/handle.h"
-#include "tests/runtime/event_owner.h"
+#include "tests/runtime/thread_routines.h"
 #include "tests/support/failing_new.h"
 #include "tests/support/interruptions.h"
 #include "tests/support/process_state.h"
 
+namespace vexa_test {
 namespace {
 
 using Clock = std::chrono::steady_clock;
-using vexa_test::eventually;
-
-using vexa_test::Event;
-using vexa_test::make_event;
 
 Event make_signalled_event() {
   Event event = make_event();
@@ -101,7 +98,7 @@ TEST(WaitForMultipleObjects, RefusesAMissingList) {
 TEST(WaitForMultipleObjects, FailsWithoutMemory) {
   const Event set = make_signalled_event();
   typedHandle* handle = set.get();
-  const vexa_test::AllocationFailure failure(0);
+  const AllocationFailure failure(0);
   EXPECT_EQ(WaitForMultipleObjects(1, &handle, 0, INFINITE), WAIT_FAILED);
   EXPECT_TRUE(failure.happened());
 }
@@ -130,14 +127,14 @@ class Waiter {
  public:
   Waiter(typedHandle* event, unsigned long timeout_ms)
       : thread_([this, event, timeout_ms] {
-          id_ = vexa_test::kernel_thread_id();
+          id_ = kernel_thread_id();
           result_ = WaitForSingleObject(event, timeout_ms);
           ended_ = true;
         }) {}
   ~Waiter() { join(); }
 
   bool is_waiting() {
-    return eventually([this] { return id_ != 0 && vexa_test::is_sleeping(id_); });
+    return eventually([this] { return id_ != 0 && is_sleeping(id_); });
   }
   bool ended() const { return ended_; }
   void interrupt() { pthread_kill(thread_.native_handle(), SIGUSR1); }
@@ -225,7 +222,7 @@ TEST(WaitForMultipleObjects, WithoutAnEventEndsWhenASignalHandlerRuns) {
 }
 
 TEST(WaitForSingleObject, FindsAnEventThatIsSignalledWhateverSignalsRun) {
-  const vexa_test::Interruptions interruptions;
+  const Interruptions interruptions;
   const Event event = make_signalled_event();
   EXPECT_TRUE(interruptions.come_during([&] { EXPECT_EQ(WaitForSingleObject(event.get(), INFINITE), 0U); }));
 }
@@ -287,10 +284,10 @@ TEST(WaitForMultipleObjects, TouchesNoHandleAfterTheWait) {
   std::atomic<long> id{0};
   std::atomic<unsigned long> result{12345};
   std::thread waiter([&] {
-    id = vexa_test::kernel_thread_id();
+    id = kernel_thread_id();
     result = WaitForMultipleObjects(2, handles, 0, INFINITE);
   });
-  EXPECT_TRUE(eventually([&] { return id != 0 && vexa_test::is_sleeping(id); }));
+  EXPECT_TRUE(eventually([&] { return id != 0 && is_sleeping(id); }));
   EXPECT_EQ(CloseEventHandle(closed.release()), 1);
   EXPECT_EQ(SetEvent(set.get()), 1);
   waiter.join();
@@ -299,3 +296,4 @@ TEST(WaitForMultipleObjects, TouchesNoHandleAfterTheWait) {
 }
 
 }  // namespace
+}  // namespace vexa_test

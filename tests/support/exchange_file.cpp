@@ -4,9 +4,12 @@
 #include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <optional>
+#include <set>
 #include <sstream>
 #include <stdexcept>
 #include <string_view>
+#include <utility>
 
 namespace vexa_test {
 namespace {
@@ -70,18 +73,21 @@ constexpr std::string_view kKnownResults[] = {"result",  "answer",  "code",   "t
 
 /// A line that no test looks at would promise what nobody holds.
 template <std::size_t kCount>
-void take_entry(const std::string& line, const std::string_view (&known)[kCount],
+void take_entry(const std::string& line, const std::string_view (&known)[kCount], std::set<std::string>& taken,
                 std::map<std::string, std::string>& entries) {
   if (line.empty()) return;
   const auto entry = key_and_value(line);
   if (std::find(std::begin(known), std::end(known), entry.first) == std::end(known)) {
     throw std::runtime_error("unknown key <" + entry.first + ">");
   }
-  if (!entries.insert(entry).second) throw std::runtime_error("<" + entry.first + "> twice");
+  if (!taken.insert(entry.first).second) throw std::runtime_error("<" + entry.first + "> twice");
+  entries[entry.first] = entry.second;
 }
 
 class Reader {
  public:
+  explicit Reader(std::filesystem::path folder) : folder_(std::move(folder)) {}
+
   ExchangeFile read(std::istream& file) {
     for (std::string line; std::getline(file, line);) {
       if (!line.starts_with('#')) take(line);
@@ -94,23 +100,52 @@ class Reader {
   enum class Section { kBefore, kExpected, kAnswer, kResults };
 
   void take(const std::string& line) {
-    if (line.starts_with(">>>")) {
+    if (section_ == Section::kBefore && line.starts_with("after ")) {
+      take_beginning(line);
+    } else if (line.starts_with(">>>")) {
       section_ = Section::kExpected;
+      const auto model = model_of(line);
+      const std::size_t place = exchange_.script.size();
       exchange_.script.emplace_back().new_connection = line == ">>> another";
+      if (model) exchange_.script.back().expected = model->script.at(place).expected;
     } else if (line.starts_with("<<<")) {
       section_ = Section::kAnswer;
-      take_options(line.substr(3), exchange_.script.at(exchange_.script.size() - 1));
-    } else if (line == "===") {
+      const auto model = model_of(line);
+      ScriptStep& step = exchange_.script.at(exchange_.script.size() - 1);
+      if (!model) return take_options(line.substr(3), step);
+      const std::string expected = std::exchange(step, model->script.at(exchange_.script.size() - 1)).expected;
+      step.expected = expected;
+    } else if (line.starts_with("===")) {
       section_ = Section::kResults;
+      if (const auto model = model_of(line)) exchange_.results = model->results;
     } else {
       take_content(line);
     }
   }
 
+  ExchangeFile named(const std::string& name) const { return read_exchange(folder_ / (name + ".txt")); }
+
+  /// The exchange that a line names after three marks and "as"; none for any other line.
+  std::optional<ExchangeFile> model_of(const std::string& line) const {
+    constexpr std::string_view kAs = " as ";
+    if (line.compare(3, kAs.size(), kAs) != 0) return std::nullopt;
+    return named(line.substr(3 + kAs.size()));
+  }
+
+  void take_beginning(const std::string& line) {
+    std::istringstream words(line.substr(line.find(' ')));
+    std::string name;
+    std::ptrdiff_t count = 0;
+    if (!(words >> name >> count)) throw std::runtime_error("no name and number in <" + line + ">");
+    const Script other = named(name).script;
+    if (count < 1 || count > std::ssize(other)) throw std::runtime_error("<" + name + "> has fewer requests");
+    exchange_.script.assign(other.begin(), other.begin() + count);
+  }
+
   void take_content(const std::string& line) {
     switch (section_) {
       case Section::kBefore:
-        return take_entry(line, kKnownConditions, exchange_.before);
+        return take_entry(line, kKnownConditions, taken_, exchange_.before);
       case Section::kExpected:
         exchange_.script.back().expected += unescaped(line);
         return;
@@ -118,11 +153,13 @@ class Reader {
         exchange_.script.back().answer += unescaped(line);
         return;
       case Section::kResults:
-        return take_entry(line, kKnownResults, exchange_.results);
+        return take_entry(line, kKnownResults, taken_, exchange_.results);
     }
   }
 
+  const std::filesystem::path folder_;
   Section section_ = Section::kBefore;
+  std::set<std::string> taken_;
   ExchangeFile exchange_;
 };
 
@@ -132,7 +169,7 @@ ExchangeFile read_exchange(const std::string& path) {
   std::ifstream file(path);
   if (!file) throw std::runtime_error("cannot read " + path);
   try {
-    return Reader().read(file);
+    return Reader(std::filesystem::path(path).parent_path()).read(file);
   } catch (const std::exception& error) {
     throw std::runtime_error(path + ": " + error.what());
   }

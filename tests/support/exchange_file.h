@@ -10,7 +10,11 @@
 //   result 1             what must come of it
 //
 // Bytes stand as they are; the line ends of the file do not count, "\r", "\n", "\\" and "\x00" stand for bytes. Lines
-// that begin with "#" say what is odd.
+// that begin with "#" say what is odd. What another file of the folder has already:
+//
+//   after live_session 2    that file's first 2 requests and answers come first
+//   >>> as live_session     its request at the same place; "<<< as live_session" its answer
+//   === as live_session     its results, but for those that follow
 #pragma once
 
 #include <map>
@@ -27,7 +31,7 @@ struct ExchangeFile {
   std::map<std::string, std::string> results;
 };
 
-/// Reads a file of tests/data; throws when it is not written as above, or has a key that no test knows.
+/// Reads a file; throws when it is not written as above, or has a key that no test knows.
 ExchangeFile read_exchange(const std::string& path);
 
 /// The names of the exchange files in a folder, sorted, without ".txt".

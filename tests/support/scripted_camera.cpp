@@ -62,13 +62,7 @@ std::string with_ports_named(std::string text) {
 
 }  // namespace
 
-std::string own_loopback_address() {
-  const auto pid = static_cast<unsigned>(getpid());
-  return "127." + std::to_string(64 + (pid >> 16 & 63)) + "." + std::to_string(pid >> 8 & 255) + "." +
-         std::to_string(pid & 255);
-}
-
-ScriptedCamera::ScriptedCamera(Script script) : script_(std::move(script)), host_(own_loopback_address()) {
+ScriptedCamera::ScriptedCamera(Script script) : script_(std::move(script)), host_(own_loopback(0)) {
   listener_ = bound_socket(host_, port_);
   if (listen(listener_, 16) != 0 || pipe2(stop_, O_CLOEXEC) != 0) throw std::runtime_error("no listener for a test");
   thread_ = std::thread([this] { play(); });
@@ -164,7 +158,7 @@ std::string ScriptedCamera::filled_in(std::string text) const {
   return text;
 }
 
-FullListener::FullListener() : host_(own_loopback_address()) {
+FullListener::FullListener() : host_(own_loopback(0)) {
   const int listener = bound_socket(host_, port_);
   sockets_.push_back(listener);
   if (listen(listener, 0) != 0) throw std::runtime_error("no listener for a test");
@@ -186,7 +180,7 @@ void FullListener::vanish() {
 
 int refusing_port() {
   int port = 0;
-  close(bound_socket(own_loopback_address(), port));
+  close(bound_socket(own_loopback(0), port));
   return port;
 }
 

@@ -9,6 +9,8 @@
 #include <thread>
 #include <vector>
 
+#include "tests/support/own_address.h"
+
 namespace vexa_test {
 
 /// What becomes of a connection when its last answer is out.
@@ -69,9 +71,6 @@ class ScriptedCamera {
   std::atomic<bool> played_{false};
   std::thread thread_;
 };
-
-/// A loopback address that no other process of a parallel test run uses.
-std::string own_loopback_address();
 
 /// A listener whose queue is full, so that connecting to it is never answered.
 class FullListener {

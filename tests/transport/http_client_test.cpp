@@ -145,7 +145,7 @@ TEST_F(HttpOpen, RefusesALongerRequestAfterConnectingWithNothingSent) {
 }
 
 TEST_F(HttpOpen, TellsThatTheConnectionWasRefused) {
-  driver_.use(own_loopback_address(), refusing_port(), 5000);
+  driver_.use(own_loopback(0), refusing_port(), 5000);
   EXPECT_EQ(driver_.http_open("/x"), -1);
   EXPECT_EQ(driver_.latest_error(), "0 Connection refused");
   EXPECT_EQ(open_descriptors(), descriptors_);
@@ -171,7 +171,7 @@ TEST_F(HttpOpen, ShowsTheResolversNumberAsASystemError) {
 }
 
 TEST_F(HttpOpen, TellsThatThereIsNoDescriptorLeft) {
-  driver_.use(own_loopback_address(), refusing_port(), 5000);
+  driver_.use(own_loopback(0), refusing_port(), 5000);
   EXPECT_EQ(in_child([&driver = driver_] {
               driver.http_open("/x");  // sanitizers look at new types with a descriptor
               const rlimit none{0, 0};
@@ -308,7 +308,7 @@ TEST(SendInqCommand, DoesNotWaitForTheCloseOfAFullAnswer) {
 TEST(SendCommand, GivesTheLatestErrorsCode) {
   TestDriver driver;
   driver.soil_latest_error();
-  driver.use(own_loopback_address(), refusing_port(), 5000);
+  driver.use(own_loopback(0), refusing_port(), 5000);
   EXPECT_EQ(driver.camera().send("/command/x.cgi?a=%d", 1), LIBD_FAILED);
   EXPECT_EQ(driver.latest_error(), "0 Connection refused");
 }

@@ -266,25 +266,21 @@ TEST_F(RtpOverTcpOpen, GivesABlockingSocketWithRoomWhoseSingleReadsEndAfterWhole
 TEST_F(RtpOverTcpOpen, FailsWhenAnyOneAllocationDoesAndLeavesNoSocket) {
   const std::size_t descriptors = open_descriptors();
   testing::internal::CaptureStdout();
-  bool happened = true;
-  int failures = 0;
-  for (; happened && failures < 1000; ++failures) {
-    ScriptedCamera camera(inside_the_connection("live_session"));
-    driver_.use(camera.host(), camera.port(), 20000);
-    int socket = -1;
-    {
-      const AllocationFailure failure(failures);
-      socket = driver_.rtp_over_tcp_open("rtsp://%s:%d/media/video%d", camera.host().c_str(), camera.port(), 1);
-      happened = failure.happened();
-    }
-    EXPECT_EQ(socket == -1, happened) << failures;
-    EXPECT_EQ(driver_.m_StreamSocket, socket);
-    EXPECT_EQ(driver_.LatestErrorText(), happened || failures > 0 ? "Cannot allocate memory" : "from before");
-    driver_.rtp_over_tcp_close(std::exchange(driver_.m_StreamSocket, -1));
-  }
+  fails_at_every_allocation(
+      [this](Shortage& shortage) {
+        ScriptedCamera camera(inside_the_connection("live_session"));
+        driver_.use(camera.host(), camera.port(), 20000);
+        const int socket = shortage.run([&] {
+          return driver_.rtp_over_tcp_open("rtsp://%s:%d/media/video%d", camera.host().c_str(), camera.port(), 1);
+        });
+        EXPECT_EQ(socket == -1, shortage.failed());
+        EXPECT_EQ(driver_.m_StreamSocket, socket);
+        EXPECT_EQ(driver_.LatestErrorText(),
+                  shortage.failed() || shortage.nth() > 0 ? "Cannot allocate memory" : "from before");
+        driver_.rtp_over_tcp_close(std::exchange(driver_.m_StreamSocket, -1));
+      },
+      4);
   testing::internal::GetCapturedStdout();
-  EXPECT_GT(failures, 5);
-  EXPECT_LT(failures, 1000);
   EXPECT_EQ(open_descriptors(), descriptors);
 }
 

@@ -161,7 +161,7 @@ TEST_F(RtspSession, IsNotEndedBySignals) {
 }
 
 TEST_F(RtspSession, LeavesTheMediaSocketOpenWhenTheOpenFails) {
-  driver_.use(own_loopback_address(), refusing_port(), 1000);
+  driver_.use(own_loopback(0), refusing_port(), 1000);
   open("rtsp://camera/");
   EXPECT_EQ(driver_.m_RtspSocket, -1);
   EXPECT_EQ(driver_.latest_error(), "0 Connection refused");

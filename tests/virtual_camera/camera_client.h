@@ -3,6 +3,7 @@
 #define TESTS_VIRTUAL_CAMERA_CAMERA_CLIENT_H_
 
 #include <fmt/format.h>
+#include <gtest/gtest.h>
 #include <poll.h>
 #include <sys/socket.h>
 #include <unistd.h>
@@ -14,22 +15,27 @@
 #include <vector>
 
 #include "tests/support/own_address.h"
-#include "virtual_camera/values/options.h"
+#include "virtual_camera/virtual_camera.h"
 
 namespace vexa::camera {
+
+using vexa_test::own_loopback;
 
 constexpr int kPatience = 20000;  // milliseconds for what must come
 constexpr const char* kBasicAdmin = "Authorization: Basic YWRtaW46YWRtaW4=\r\n";
 
-// An address of this process alone, as are the fourteen after it.
-inline std::string own_address() { return vexa_test::own_loopback(1); }
-
 inline CameraOptions test_options() {
   CameraOptions options;
-  options.address = own_address();
+  options.address = own_loopback(1);
   options.rtsp_port = 0;
   return options;
 }
+
+/// A camera that runs as long as its test.
+class StartedCamera : public VirtualCamera {
+ public:
+  explicit StartedCamera(const CameraOptions& options) : VirtualCamera(options) { EXPECT_TRUE(start()) << error(); }
+};
 
 enum class Ended { kNot, kClosed, kReset };
 

@@ -50,4 +50,17 @@ std::optional<StatusLine> parse_status_line(std::string_view text, std::string_v
   return StatusLine{clamp_to_int(status), reason};
 }
 
+std::optional<int> announced_length(std::string_view part_header) {
+  auto text = text_after(part_header, "DataLen:");
+  const auto length = text ? take_int(*text) : std::nullopt;
+  return length >= 0 ? length : std::nullopt;
+}
+
+std::optional<std::string_view> cgi_value(std::string_view answer, std::string_view key) {
+  // Kept: no word boundary. "Zoom=" is also found inside "DigitalZoom="; callers order their keys by it.
+  const std::optional<std::string_view> rest = text_after(answer, key);
+  if (!rest) return std::nullopt;
+  return text_before(*rest, '&');
+}
+
 }  // namespace vexa

@@ -1,4 +1,5 @@
-// How a camera's answer begins: the end of its header, its status line.
+// What a camera's HTTP answers are made of: header end, status line, the small header before each picture of a
+// multipart stream, the key=value pairs of an inquiry.
 #pragma once
 
 #include <cstddef>
@@ -18,5 +19,11 @@ struct StatusLine {
 
 /// Reads the status line that `text` begins with, `protocol` being "HTTP/" or "RTSP/".
 std::optional<StatusLine> parse_status_line(std::string_view text, std::string_view protocol);
+
+/// The bytes that follow, as "DataLen:" announces them; nothing when it does not, or announces less than none.
+std::optional<int> announced_length(std::string_view part_header);
+
+/// The value of the first `key` (which carries its "="), up to the next "&" or the end; not decoded, perhaps empty.
+std::optional<std::string_view> cgi_value(std::string_view answer, std::string_view key);
 
 }  // namespace vexa

@@ -1,6 +1,7 @@
 // The order in which received RTP packets are kept.
 #pragma once
 
+#include <algorithm>
 #include <cstdint>
 #include <vector>
 
@@ -32,10 +33,19 @@ static_assert(timestamp_is_after(0, 0xffffffff) && !timestamp_is_after(0xfffffff
 
 /// `a` stands before `b` in the list: by timestamp, then by sequence. A search key that is marked keyOnly stands after
 /// every packet of its timestamp; equal packets are not ordered, and so keep their arrival order.
-bool ordered_before(const SPacketInfo& a, const SPacketInfo& b);
+inline bool ordered_before(const SPacketInfo& a, const SPacketInfo& b) {
+  const std::uint32_t time_a = order_timestamp(a.timestamp);
+  const std::uint32_t time_b = order_timestamp(b.timestamp);
+  if (time_a != time_b) return time_a < time_b;
+  if (a.keyOnly || b.keyOnly) return !a.keyOnly;
+  return a.sequence != b.sequence && !sequence_is_ahead(a.sequence, b.sequence);
+}
 
 /// Where `packet` belongs in the ordered list: behind all that it does not precede. Looks at the newest packet first,
 /// so that packets in order cost the same however many are listed.
-std::vector<SPacketInfo>::iterator place_of(std::vector<SPacketInfo>& packets, const SPacketInfo& packet);
+inline std::vector<SPacketInfo>::iterator place_of(std::vector<SPacketInfo>& packets, const SPacketInfo& packet) {
+  if (packets.empty() || !ordered_before(packet, packets.back())) return packets.end();
+  return std::upper_bound(packets.begin(), packets.end(), packet, ordered_before);
+}
 
 }  // namespace vexa

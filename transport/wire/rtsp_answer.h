@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <optional>
 #include <string_view>
 
@@ -26,5 +27,14 @@ std::optional<std::string_view> range_clock_text(std::string_view answer);
 
 /// The session number of a SETUP answer; nothing when it is missing or no decimal number.
 std::optional<int> session_number(std::string_view answer);
+
+struct RangeClock {
+  bool understood = false;              ///< the clock came to its end
+  std::optional<std::int64_t> seconds;  ///< since 1970-01-01 UTC, once a "." was reached, also when not understood
+  int micros = 0;                       ///< with `understood`
+};
+
+/// Reads date "T" time "." fraction, up to a "Z" or the end of the line; the text ends at a NUL.
+RangeClock parse_range_clock(std::string_view text);
 
 }  // namespace vexa

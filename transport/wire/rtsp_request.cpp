@@ -3,6 +3,13 @@
 #include "transport/wire/http_request.h"
 
 namespace vexa {
+namespace {
+
+constexpr int kLongestInterval = 30;
+constexpr int kLongestHalvedTimeout = 60;
+constexpr int kShortestHalvedTimeout = 3;
+
+}  // namespace
 
 Formatted rtsp_describe(const RtspHead& head) {
   return format_within(kRequestRoom,
@@ -43,6 +50,15 @@ Formatted rtsp_teardown(const RtspHead& head, int session) {
   // Kept: no credentials, and one blank line more than the other requests; cameras end sessions on exactly this.
   return format_within(kRequestRoom, "TEARDOWN %s RTSP/1.0\r\nCSeq: %d\r\nSession: %d\r\n\r\n\r\n", head.url.c_str(),
                        head.cseq, session);
+}
+
+int keep_alive_interval(int session_timeout) {
+  if (session_timeout > kLongestHalvedTimeout) return kLongestInterval;
+  return session_timeout < kShortestHalvedTimeout ? 1 : session_timeout / 2;
+}
+
+bool keep_alive_due(std::time_t now, std::time_t last, int interval) {
+  return last == 0 || last > now || now - last >= interval;
 }
 
 }  // namespace vexa

@@ -1,6 +1,7 @@
 // What the driver says over RTSP (RFC 2326), each request as cameras have always been sent it.
 #pragma once
 
+#include <ctime>
 #include <string>
 
 #include "runtime/base/text.h"
@@ -29,5 +30,11 @@ Formatted rtsp_setup_interleaved(const RtspHead& head);
 Formatted rtsp_play(const RtspHead& head, const RtspPlay& play);
 Formatted rtsp_get_parameter(const RtspHead& head, int session);
 Formatted rtsp_teardown(const RtspHead& head, int session);
+
+/// Seconds between two keep-alives of a session that the camera ends after `session_timeout` idle seconds.
+int keep_alive_interval(int session_timeout);
+
+/// Whether one is due at `now`; `last` is 0 before the first, and one from the future does not count.
+bool keep_alive_due(std::time_t now, std::time_t last, int interval);
 
 }  // namespace vexa

@@ -4,7 +4,11 @@
 
 #include <algorithm>
 #include <ctime>
+#include <string>
+#include <string_view>
 #include <utility>
+
+#include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {
 namespace {
@@ -18,6 +22,17 @@ std::string clock_text(microseconds moment) {
   const auto tenths = moment % std::chrono::seconds(1) / kTenth;
   return fmt::format("{}.{:04}Z", second_text(moment), tenths);
 }
+
+constexpr std::string_view kDeleteByName = "DeletebyName=";
+
+Answer search(std::string_view query, const Card& card) {
+  if (query != "Order=oldest" && query != "Order=newest") return http_answer("400 Bad Request", "");
+  const std::optional<std::string> lines =
+      card.search(query == "Order=oldest" ? Card::Order::kOldest : Card::Order::kNewest);
+  return lines ? http_answer("200 OK", *lines) : http_answer("503 Service Unavailable", "");
+}
+
+Answer deleted(bool done) { return done ? no_content() : http_answer("400 Bad Request", ""); }
 
 }  // namespace
 
@@ -154,6 +169,17 @@ bool Card::erase_all() {
   if (health_ != CardHealth::kGood) return false;
   recordings_.clear();
   return true;
+}
+
+std::optional<Answer> answer_card(const RequestHead& request, Card& card) {
+  if (request.method != "GET") return std::nullopt;
+  if (request.path == "/command/search") return search(request.query, card);
+  if (request.path != "/command/edgestorage.cgi") return std::nullopt;
+  const std::string_view query = request.query;
+  if (query == "delete=all") return deleted(card.erase_all());
+  if (!query.starts_with(kDeleteByName)) return std::nullopt;
+  const std::optional<std::string> name = percent_decoded(query.substr(kDeleteByName.size()));
+  return deleted(name && card.erase(*name));
 }
 
 }  // namespace vexa::camera

@@ -13,6 +13,7 @@
 #include <vector>
 
 #include "virtual_camera/codec/image_clip.h"
+#include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {
 
@@ -98,6 +99,10 @@ class Card {
   std::vector<Recording> recordings_;  // the one being made is last, while it is not finished
   std::uint64_t made_ = 0;
 };
+
+// "/command/search?Order=oldest", and "/command/edgestorage.cgi?delete=all" or "?DeletebyName=NAME"; nothing for any
+// other request.
+[[nodiscard]] std::optional<Answer> answer_card(const RequestHead& request, Card& card);
 
 }  // namespace vexa::camera
 

@@ -31,6 +31,7 @@ struct AccessUnit {
   [[nodiscard]] std::vector<std::uint8_t> as_delivered() const;
 };
 
+// Immutable once loaded, and shared by any number of cameras and threads.
 class Clip {
  public:
   Clip() = default;

@@ -17,6 +17,7 @@ struct Colour {
 };
 
 // Keeps its memory from picture to picture.
+// A value; whoever paints it owns it.
 class I420Picture {
  public:
   I420Picture() = default;

@@ -36,6 +36,7 @@ struct EncodedPicture {
 [[nodiscard]] bool has_live_encoders();
 
 // Belongs to one thread at a time.
+// A stream's LiveVideo owns it.
 class LiveEncoder {
  public:
   // The encoder, or why there is none.

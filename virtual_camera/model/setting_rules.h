@@ -13,6 +13,7 @@
 namespace vexa::camera {
 
 // Immutable; any thread.
+// Shared by the store that obeys it and the camera that reads its profile.
 class SettingRules {
  public:
   using Pairs = std::vector<std::pair<std::string, std::string>>;  // key and value

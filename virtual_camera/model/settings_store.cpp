@@ -1,9 +1,15 @@
 #include "virtual_camera/model/settings_store.h"
 
+#include <fmt/format.h>
+
 #include <algorithm>
+#include <optional>
+#include <string>
+#include <string_view>
 #include <utility>
 
 #include "virtual_camera/model/setting_rules.h"
+#include "virtual_camera/values/number_text.h"
 #include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {
@@ -56,6 +62,18 @@ constexpr Default kDefaults[] = {
     {"a-slot", "Status", "none"},
     {"audiodetection", "ADFunc", "off"},
 };
+
+int number_in(std::string_view text) { return leading_number(text).value_or(0); }
+
+constexpr std::string_view kFolder = "/command/";
+constexpr std::string_view kExtension = ".cgi";
+
+Answer answer_inquiry(std::string_view query, const SettingsStore& settings) {
+  constexpr std::string_view kKey = "inq=";
+  if (!query.starts_with(kKey) || query.size() == kKey.size()) return http_answer("400 Bad Request", "");
+  const std::optional<std::string> text = settings.answer(query.substr(kKey.size()));
+  return text ? http_answer("200 OK", *text) : http_answer("404 Not Found", "");
+}
 
 }  // namespace
 
@@ -145,6 +163,35 @@ void SettingsStore::obey(std::shared_ptr<const SettingRules> rules) {
   for (auto& [section, pairs] : rules->factory()) sections_[section].pairs = std::move(pairs);
   for (const std::string& section : rules->lacking()) sections_.erase(section);
   rules_ = std::move(rules);
+}
+
+std::optional<StreamSettings> stream_settings(const SettingsStore& settings, int number) {
+  const auto value = [&](const char* name) { return settings.get("camera", fmt::format("{}{}", name, number)); };
+  const auto codec = value("ImageCodec");
+  if (!codec) return std::nullopt;
+  StreamSettings stream;
+  stream.codec = codec_of(*codec);
+  const std::string size = value("ImageSize").value_or("");
+  stream.width = number_in(size);
+  stream.height = number_in(std::string_view(size).substr(std::min(size.find(',') + 1, size.size())));
+  stream.frame_rate = number_in(value("FrameRate").value_or(""));
+  stream.bit_rate = number_in(value("BitRate").value_or(""));
+  stream.quality = number_in(value("Quality").value_or(""));
+  return stream;
+}
+
+Answer answer_command(const RequestHead& request, SettingsStore& settings) {
+  if (!request.version.starts_with("HTTP/")) return http_answer("400 Bad Request", "");
+  if (request.method != "GET") return http_answer("501 Not Implemented", "");
+  std::string_view name = request.path;
+  if (!name.starts_with(kFolder) || !name.ends_with(kExtension)) return http_answer("404 Not Found", "");
+  name.remove_prefix(kFolder.size());
+  name.remove_suffix(kExtension.size());
+  if (name.empty() || name.find('/') != std::string_view::npos) return http_answer("404 Not Found", "");
+  if (name == "inquiry") return answer_inquiry(request.query, settings);
+  if (request.query.find('=') == std::string::npos) return http_answer("400 Bad Request", "");
+  if (!settings.apply(name, request.query)) return http_answer("400 Bad Request", "");
+  return no_content();
 }
 
 }  // namespace vexa::camera

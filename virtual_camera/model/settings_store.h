@@ -11,6 +11,9 @@
 #include <utility>
 #include <vector>
 
+#include "virtual_camera/values/codec.h"
+#include "virtual_camera/wire/message.h"
+
 namespace vexa::camera {
 
 class SettingRules;
@@ -48,6 +51,23 @@ class SettingsStore {
   std::map<std::string, Section, std::less<>> sections_;
   std::shared_ptr<const SettingRules> rules_;
 };
+
+// How hosts have set one video stream.
+struct StreamSettings {
+  std::optional<Codec> codec;  // nullopt: the stream is switched off
+  int width = 0;
+  int height = 0;
+  int frame_rate = 0;
+  int bit_rate = 0;  // kbit/s
+  int quality = 0;   // JPEG's
+};
+
+// The settings of stream `number`, counted from 1; nullopt when the camera has no such stream.
+[[nodiscard]] std::optional<StreamSettings> stream_settings(const SettingsStore& settings, int number);
+
+// "/command/inquiry.cgi?inq=NAME" reads a section, "/command/NAME.cgi?KEY=VALUE&..." changes one; 400 for what
+// the camera does not take.
+[[nodiscard]] Answer answer_command(const RequestHead& request, SettingsStore& settings);
 
 }  // namespace vexa::camera
 

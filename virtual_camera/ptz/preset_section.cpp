@@ -6,7 +6,7 @@
 #include <cmath>
 
 #include "virtual_camera/ptz/ptz_command.h"
-#include "virtual_camera/wire/percent_text.h"
+#include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {
 namespace {

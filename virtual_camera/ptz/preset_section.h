@@ -44,6 +44,7 @@ struct TourSwitch {
   int resume = 0;
 };
 
+// Part of a camera's head, which guards it by its lock.
 class PresetSection {
  public:
   using Pairs = std::vector<std::pair<std::string, std::string>>;  // key and value

@@ -8,6 +8,7 @@
 
 namespace vexa::camera {
 
+// Part of a mechanism; what uses the mechanism guards it.
 class PtzAxis {
  public:
   struct Mechanics {

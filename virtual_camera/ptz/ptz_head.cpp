@@ -6,7 +6,7 @@
 #include <cstdint>
 #include <utility>
 
-#include "virtual_camera/wire/percent_text.h"
+#include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {
 namespace {

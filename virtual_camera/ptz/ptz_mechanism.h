@@ -44,6 +44,7 @@ struct PtzOrder {
   std::optional<MotorOrder>& operator[](PtzMotor motor) { return motors[static_cast<std::size_t>(motor)]; }
 };
 
+// Part of a camera's head, which guards it by its lock.
 class PtzMechanism {
  public:
   explicit PtzMechanism(PtzProfile profile);  // at rest, straight ahead, at the wide end

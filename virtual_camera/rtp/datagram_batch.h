@@ -14,6 +14,7 @@
 
 namespace vexa::camera {
 
+// Part of a session's port; used on the loop's thread.
 class DatagramBatch {
  public:
   // Sends the packets on a connected socket, in order, without those marked lost. Returns a record for each; a packet

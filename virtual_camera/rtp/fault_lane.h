@@ -16,6 +16,7 @@
 
 namespace vexa::camera {
 
+// Part of a session's RTP stream; used on the loop's thread.
 class FaultLane {
  public:
   using Time = std::chrono::nanoseconds;  // since the stream's start, as scheduled

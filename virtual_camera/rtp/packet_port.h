@@ -10,6 +10,7 @@
 
 namespace vexa::camera {
 
+// A session owns its port and calls it on the loop's thread: a UdpPort of its own, or its channel of a shared lane.
 class PacketPort {
  public:
   enum class Hashing { kOff, kOn };

@@ -40,6 +40,7 @@ struct Outgoing {
 // The options' payload type; JPEG has a static one (RFC 3551, table 5).
 [[nodiscard]] std::uint8_t payload_type_of(const CameraOptions& options, Codec codec);
 
+// A session's sender owns it; used on the loop's thread.
 class RtpStream {
  public:
   // What makes a stream differ from those beside it.

@@ -12,6 +12,7 @@
 
 namespace vexa::camera {
 
+// Owns the socket. Used on the loop's thread.
 class UdpPort : public PacketPort {
  public:
   explicit UdpPort(asio::io_context& context) : socket_(context) {}

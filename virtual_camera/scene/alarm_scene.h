@@ -11,7 +11,7 @@
 #include <string_view>
 #include <vector>
 
-#include "virtual_camera/values/alarm_layout.h"
+#include "virtual_camera/values/options.h"
 
 namespace vexa::camera {
 

@@ -2,7 +2,7 @@
 
 #include <cmath>
 
-#include "virtual_camera/model/stream_settings.h"
+#include "virtual_camera/model/settings_store.h"
 
 namespace vexa::camera {
 

@@ -22,6 +22,7 @@ inline constexpr int kLetterPitch = 6;
 inline constexpr int kLetterHeight = 7;
 
 // Rotated, it puts everything where it stands when the picture is turned by 180 degrees.
+// Made for one picture by the thread that paints it.
 class ScenePainter {
  public:
   ScenePainter(I420Picture& picture, bool rotated) : picture_(picture), rotated_(rotated) {}

@@ -11,14 +11,22 @@
 namespace vexa::camera {
 
 // Any thread.
+// A camera owns one: its watch sends the walker in, its painters look.
 class SceneStage {
  public:
   using Time = std::chrono::steady_clock::time_point;
 
   // Somebody walks; whoever walked before is gone.
-  void enter(const Walk& walk, Time begin);
+  void enter(const Walk& walk, Time begin) {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    walk_ = walk;
+    begin_ = begin;
+  }
   // Nobody before a walk begins and after it ends.
-  [[nodiscard]] std::optional<Intruder> intruder(Time now) const;
+  [[nodiscard]] std::optional<Intruder> intruder(Time now) const {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    return walker(walk_, std::chrono::duration_cast<std::chrono::milliseconds>(now - begin_));
+  }
 
  private:
   mutable std::mutex mutex_;

@@ -16,6 +16,7 @@
 
 namespace vexa::camera {
 
+// The public VirtualCamera holds it and calls it on the loop's thread; ports and connections hold the state, not this.
 class CameraCore : public std::enable_shared_from_this<CameraCore> {
  public:
   explicit CameraCore(std::shared_ptr<CameraState> state);

@@ -5,7 +5,7 @@
 
 #include "virtual_camera/model/camera_profile.h"
 #include "virtual_camera/model/setting_rules.h"
-#include "virtual_camera/server/settings_report.h"
+#include "virtual_camera/server/http_commands.h"
 
 namespace vexa::camera {
 namespace {

@@ -6,7 +6,7 @@
 #include <string_view>
 #include <utility>
 
-#include "virtual_camera/model/stream_settings.h"
+#include "virtual_camera/model/settings_store.h"
 #include "virtual_camera/server/camera_state.h"
 #include "virtual_camera/values/number_text.h"
 

@@ -16,12 +16,13 @@
 
 #include "virtual_camera/server/journal.h"
 #include "virtual_camera/server/request_faults.h"
-#include "virtual_camera/wire/answer.h"
+#include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {
 
 struct CameraState;
 
+// Owned by the operations that wait for its socket, and ends with them. On the loop's thread.
 class Connection : public std::enable_shared_from_this<Connection> {
  public:
   Connection(asio::ip::tcp::socket socket, std::shared_ptr<CameraState> state);

@@ -10,9 +10,7 @@
 #include "virtual_camera/server/camera_state.h"
 #include "virtual_camera/server/http_commands.h"
 #include "virtual_camera/server/media_stream.h"
-#include "virtual_camera/server/settings_report.h"
 #include "virtual_camera/values/number_text.h"
-#include "virtual_camera/wire/credentials.h"
 #include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {

@@ -12,6 +12,7 @@
 
 namespace vexa::camera {
 
+// Owned and run as any Connection.
 class HttpConnection : public Connection, private HttpBody::Line {
  public:
   using Connection::Connection;

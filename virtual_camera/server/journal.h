@@ -26,6 +26,7 @@ struct Request {
 };
 
 // Thread-safe. A request stands here before the first byte of its answer leaves.
+// Part of a camera's state; tests read it while the camera runs.
 class Journal {
  public:
   using Predicate = std::function<bool(const std::deque<Request>&)>;

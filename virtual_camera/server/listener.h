@@ -12,6 +12,7 @@
 namespace vexa::camera {
 
 // Lives on the loop's thread.
+// A camera's core owns one for each port.
 class Listener : public std::enable_shared_from_this<Listener> {
  public:
   // Takes a connection that has been accepted.

@@ -14,6 +14,7 @@ namespace vexa::camera {
 
 struct CameraState;
 
+// Owned by the connection whose answer it is; on the loop's thread.
 class MediaStream : public HttpBody {
  public:
   MediaStream(HttpStream stream, std::function<bool()> holds_pictures);

@@ -10,7 +10,7 @@
 #include "virtual_camera/rtp/udp_port.h"
 #include "virtual_camera/server/camera_state.h"
 #include "virtual_camera/server/session_description.h"
-#include "virtual_camera/wire/credentials.h"
+#include "virtual_camera/wire/message.h"
 #include "virtual_camera/wire/rtsp_message.h"
 
 namespace vexa::camera {

@@ -21,6 +21,7 @@
 
 namespace vexa::camera {
 
+// Owned and run as any Connection.
 class RtspConnection : public Connection {
  public:
   using Connection::Connection;

@@ -16,6 +16,7 @@ namespace vexa::camera {
 
 struct CameraState;
 
+// Its connection owns it; on the loop's thread.
 class RtspSession : public std::enable_shared_from_this<RtspSession> {
  public:
   // `video`: the number of the camera's video stream that it plays. `port` is open; the first picture leaves through

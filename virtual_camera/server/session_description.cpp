@@ -5,7 +5,7 @@
 #include <string_view>
 
 #include "virtual_camera/rtp/rtp_stream.h"
-#include "virtual_camera/wire/credentials.h"
+#include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {
 namespace {

@@ -11,6 +11,7 @@
 namespace vexa::camera {
 
 // Nothing is copied: what it hands out keeps the clip.
+// Owned by the session or the HTTP answer that shows it, and used on its thread.
 class ClipSource : public PictureSource {
  public:
   enum class AtEnd { kStop, kStartOver };

@@ -11,6 +11,7 @@
 namespace vexa::camera {
 
 // Draws each picture when it is asked for.
+// Owned by the session or the HTTP answer that shows it, and used on its thread.
 class DrawnSource : public PictureSource {
  public:
   DrawnSource(Codec codec, const DrawnVideo& video);

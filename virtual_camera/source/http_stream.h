@@ -29,6 +29,7 @@ struct HttpStreamOptions {
   std::vector<HttpStreamFault> faults;
 };
 
+// Owned by the answer that it is sent in; one thread at a time.
 class HttpStream {
  public:
   struct Piece {

@@ -8,7 +8,6 @@
 #include <string>
 
 #include "virtual_camera/model/settings_store.h"
-#include "virtual_camera/model/stream_settings.h"
 #include "virtual_camera/scene/live_scene.h"
 #include "virtual_camera/source/picture_source.h"
 #include "virtual_camera/values/options.h"

@@ -10,10 +10,17 @@
 #include <string>
 #include <vector>
 
-#include "virtual_camera/values/alarm_layout.h"
 #include "virtual_camera/values/faults.h"
 
 namespace vexa::camera {
+
+// Which sensors and detectors a camera has.
+struct AlarmLayout {
+  int inputs = 2;
+  std::string detection = "object";  // "object", "motion" (both by window), "lod" (one item); empty: none
+  bool tampering = true;
+  bool audio = true;
+};
 
 class ImageClip;
 class PacketisedClip;

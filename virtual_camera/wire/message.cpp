@@ -1,7 +1,14 @@
 #include "virtual_camera/wire/message.h"
 
+#include <fmt/format.h>
+
 #include <algorithm>
 #include <cctype>
+#include <charconv>
+#include <cstddef>
+#include <cstdint>
+
+#include "virtual_camera/values/number_text.h"
 
 namespace vexa::camera {
 namespace {
@@ -99,6 +106,72 @@ std::vector<std::pair<std::string, std::string>> query_pairs(std::string_view qu
     pairs.emplace_back(pair.substr(0, equals), pair.substr(equals + 1));
   }
   return pairs;
+}
+
+Answer http_answer(std::string_view status, std::string_view body) {
+  Answer answer;
+  std::from_chars(status.data(), status.data() + status.size(), answer.status);
+  const std::string_view challenge = answer.status == 401 ? "WWW-Authenticate: Basic realm=\"camera\"\r\n" : "";
+  answer.bytes = fmt::format("HTTP/1.0 {}\r\n{}Content-Type: text/plain\r\nContent-Length: {}\r\n\r\n{}", status,
+                             challenge, body.size(), body);
+  return answer;
+}
+
+Answer no_content() { return {204, "HTTP/1.0 204 No Content\r\n\r\n"}; }
+
+std::optional<std::string> percent_decoded(std::string_view text) {
+  std::string bytes;
+  while (!text.empty()) {
+    std::size_t length = 1;
+    unsigned value = static_cast<unsigned char>(text.front());
+    if (text.front() == '%') {
+      length = 3;
+      if (text.size() < length) return std::nullopt;
+      const auto code = whole_number<unsigned>(text.substr(1, 2), 16);
+      if (!code) return std::nullopt;
+      value = *code;
+    }
+    bytes += static_cast<char>(value);
+    text.remove_prefix(length);
+  }
+  return bytes;
+}
+
+std::string percent_encoded_for_list(std::string_view text) {
+  constexpr std::string_view kMarks = "%,&";
+  std::string encoded;
+  for (const char c : text) {
+    const auto byte = static_cast<unsigned char>(c);
+    const bool plain = byte >= ' ' && byte != 0x7F && kMarks.find(c) == std::string_view::npos;
+    encoded += plain ? std::string(1, c) : fmt::format("%{:02X}", byte);
+  }
+  return encoded;
+}
+
+std::string base64_text(std::string_view bytes) {
+  static constexpr std::string_view kAlphabet = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
+  std::string text;
+  std::uint32_t bits = 0;
+  unsigned held = 0;
+  for (const char byte : bytes) {
+    bits = (bits << 8U) | static_cast<unsigned char>(byte);
+    held += 8;
+    while (held >= 6) {
+      held -= 6;
+      text += kAlphabet[(bits >> held) & 63U];
+    }
+  }
+  if (held > 0) text += kAlphabet[(bits << (6 - held)) & 63U];
+  while (text.size() % 4 != 0) text += '=';
+  return text;
+}
+
+bool credentials_match(std::string_view authorization, std::string_view user, std::string_view password) {
+  if (user.empty() && password.empty()) return true;
+  std::string pair(user);
+  pair += ':';
+  pair += password;
+  return authorization == "Basic " + base64_text(pair);
 }
 
 }  // namespace vexa::camera

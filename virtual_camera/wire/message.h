@@ -1,4 +1,5 @@
-// The head of a request: a request line and header fields, the same in HTTP (RFC 1945) and RTSP (RFC 2326).
+// HTTP (RFC 1945) as the camera reads and writes it: request heads, answers, Basic credentials, percent-encoded texts
+// (RFC 3986, 2.1).
 #ifndef VIRTUAL_CAMERA_WIRE_MESSAGE_H_
 #define VIRTUAL_CAMERA_WIRE_MESSAGE_H_
 
@@ -32,6 +33,27 @@ struct RequestHead {
 
 // "K=V&K=V" as pairs, undecoded; what has no key or no "=" is left out.
 [[nodiscard]] std::vector<std::pair<std::string, std::string>> query_pairs(std::string_view query);
+
+struct Answer {
+  int status = 0;
+  std::string bytes;
+};
+
+// `status` as in "404 Not Found".
+[[nodiscard]] Answer http_answer(std::string_view status, std::string_view body);
+
+// The command was obeyed.
+[[nodiscard]] Answer no_content();
+
+// The bytes of a percent-encoded text; nothing when it is no such text.
+[[nodiscard]] std::optional<std::string> percent_decoded(std::string_view text);
+// The text with its "%", ",", "&" and control characters percent-encoded, so that a list can hold it.
+[[nodiscard]] std::string percent_encoded_for_list(std::string_view text);
+
+[[nodiscard]] std::string base64_text(std::string_view bytes);
+
+// Whether an Authorization header value lets its sender in. Empty user and password let everyone in.
+[[nodiscard]] bool credentials_match(std::string_view authorization, std::string_view user, std::string_view password);
 
 }  // namespace vexa::camera
 

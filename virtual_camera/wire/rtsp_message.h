@@ -8,7 +8,6 @@
 #include <string>
 #include <string_view>
 
-#include "virtual_camera/wire/answer.h"
 #include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {

@@ -1,5 +1,5 @@
 // Detection windows drawn on a picture.
-#include "host/picture/window_drawing.h"
+#include "host/picture/picture.h"
 
 #include <gtest/gtest.h>
 

@@ -1,4 +1,4 @@
-#include "media/assembly/mpeg4_units.h"
+#include "media/assembly/rtp_pictures.h"
 
 #include <gtest/gtest.h>
 

@@ -4,8 +4,6 @@
 
 #include <memory>
 
-#include "runtime/base/within_memory.h"
-
 namespace vexa {
 namespace {
 

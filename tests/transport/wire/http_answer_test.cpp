@@ -120,5 +120,66 @@ TEST(ParseStatusLine, ReadsTheVersionWhateverTheHostsDecimalPoint) {
   EXPECT_EQ(line->reason, "OK");
 }
 
+TEST(CgiValue, GoesUpToTheNextPairOrTheEnd) {
+  const struct {
+    std::string_view answer, key, value;
+  } cases[] = {{"ModelName=X1&Serial=7", "ModelName=", "X1"},
+               {"ModelName=X1&Serial=7", "Serial=", "7"},
+               {"A=&B=1", "A=", ""},
+               {"A=", "A=", ""},
+               {"A=1&A=2", "A=", "1"},
+               {"A=x=y&B=1", "A=", "x=y"},
+               {"A=b%20c", "A=", "b%20c"},
+               {"A= b ", "A=", " b "},
+               {"A=1\r\n&B=2", "A=", "1\r\n"}};
+  for (const auto& c : cases) EXPECT_EQ(cgi_value(c.answer, c.key), c.value) << c.answer << " " << c.key;
+}
+
+TEST(CgiValue, IsNothingWithoutTheKey) {
+  for (const char* answer : {"", "B=1", "a=1", "A", "&&&&"}) EXPECT_EQ(cgi_value(answer, "A="), std::nullopt) << answer;
+}
+
+TEST(CgiValue, FindsAKeyInsideALongerOne) {
+  EXPECT_EQ(cgi_value("DigitalZoom=on&Zoom=2", "Zoom="), "on");
+  EXPECT_EQ(cgi_value("Zoom=2&DigitalZoom=on", "Zoom="), "2");
+}
+
+TEST(CgiValue, IsEveryPrefixOfACutAnswer) {
+  constexpr std::string_view kAnswer = "Serial=1234&MacAddress=00:11";
+  for (std::size_t length = 0; length <= kAnswer.size(); ++length) {
+    const std::string_view cut = kAnswer.substr(0, length);
+    if (length < 7) {
+      EXPECT_EQ(cgi_value(cut, "Serial="), std::nullopt) << length;
+    } else {
+      EXPECT_EQ(cgi_value(cut, "Serial="), kAnswer.substr(7, std::min<std::size_t>(length - 7, 4))) << length;
+    }
+  }
+}
+
+TEST(AnnouncedLength, IsTheNumberBehindItsKey) {
+  const struct {
+    const char* header;
+    std::optional<int> length;
+  } cases[] = {{"DataLen: 1234\r\n\r\n", 1234},
+               {"--part\r\nContent-Type: image/jpeg\r\nDataLen:1234\r\n\r\n", 1234},
+               {"DataLen: \r\n\t 7 bytes", 7},
+               {"DataLen: +8", 8},
+               {"DataLen: 0", 0},
+               {"DataLen: 2147483647", INT_MAX},
+               {"DataLen: 99999999999999999999", INT_MAX},
+               {"XDataLen: 5", 5},
+               {"DataLen: 5 DataLen: 6", 5},
+               {"DataLen: x DataLen: 6", std::nullopt},
+               {"DataLen: -1", std::nullopt},
+               {"DataLen: -99999999999999999999", std::nullopt},
+               {"DataLen:", std::nullopt},
+               {"DataLen: -", std::nullopt},
+               {"DataLen", std::nullopt},
+               {"datalen: 5", std::nullopt},
+               {"Content-Length: 5", std::nullopt},
+               {"", std::nullopt}};
+  for (const auto& c : cases) EXPECT_EQ(announced_length(c.header), c.length) << c.header;
+}
+
 }  // namespace
 }  // namespace vexa

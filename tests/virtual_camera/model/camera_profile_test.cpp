@@ -6,7 +6,6 @@
 #include <filesystem>
 #include <string>
 
-#include "virtual_camera/model/cgi.h"
 #include "virtual_camera/model/setting_rules.h"
 #include "virtual_camera/model/settings_store.h"
 #include "virtual_camera/wire/message.h"

@@ -256,15 +256,15 @@ TEST(Program, AnnouncesItsCamerasServesJournalsAndEndsOnASignal) {
   const int file = ::mkstemp(journal.data());
   ASSERT_GE(file, 0);
   ::close(file);
-  Program program({"--address", own_address(), "--count", "2", "--http-port", "0", "--rtsp-port", "0", "--journal",
+  Program program({"--address", own_loopback(1), "--count", "2", "--http-port", "0", "--rtsp-port", "0", "--journal",
                    journal, "--password", "secret"});
   const std::string first = program.line();
   const std::string second = program.line();
-  ASSERT_EQ(first.substr(0, 7 + own_address().size()), "http://" + own_address());
-  EXPECT_NE(first.find(" rtsp://" + own_address() + ":"), std::string::npos);
+  ASSERT_EQ(first.substr(0, 7 + own_loopback(1).size()), "http://" + own_loopback(1));
+  EXPECT_NE(first.find(" rtsp://" + own_loopback(1) + ":"), std::string::npos);
   EXPECT_EQ(first.substr(first.size() - 13), "/media/video1");
   ASSERT_EQ(second.substr(0, 7), "http://");
-  Client client(own_address(), http_port_of(first));
+  Client client(own_loopback(1), http_port_of(first));
   client.send("GET /command/inquiry.cgi?inq=system HTTP/1.0\r\nAuthorization: Basic YWRtaW46c2VjcmV0\r\n\r\n");
   EXPECT_EQ(client.read_to_end().substr(0, 15), "HTTP/1.0 200 OK");
   EXPECT_EQ(program.end_by(SIGINT), 0);
@@ -276,7 +276,7 @@ TEST(Program, AnnouncesItsCamerasServesJournalsAndEndsOnASignal) {
 }
 
 TEST(Program, EndsByItselfAfterItsDuration) {
-  Program program({"--address", own_address(), "--http-port", "0", "--rtsp-port", "0", "--duration", "0.05"});
+  Program program({"--address", own_loopback(1), "--http-port", "0", "--rtsp-port", "0", "--duration", "0.05"});
   EXPECT_NE(program.line(), "");
   EXPECT_EQ(program.end_by(0), 0);
 }
@@ -290,7 +290,7 @@ TEST(Program, AnAddressThatIsNotOursEndsWithOne) {
 TEST(Program, AWrongProfileEndsWithOneAndNamesFileLineAndKey) {
   const vexa_test::TemporaryFolder folder;
   const std::string wrong = folder.make_file("wrong.json", "{\n\"model\": \"T-1\",\n\"description\": 1}\n");
-  Program program({"--address", own_address(), "--http-port", "0", "--rtsp-port", "0", "--profile", wrong},
+  Program program({"--address", own_loopback(1), "--http-port", "0", "--rtsp-port", "0", "--profile", wrong},
                   STDERR_FILENO);
   EXPECT_EQ(program.line(), "vexa-camera: " + wrong + ":3: description: must be a text");
   EXPECT_EQ(program.end_by(0), 1);

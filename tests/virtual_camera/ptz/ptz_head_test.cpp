@@ -1,6 +1,6 @@
 // A moving head on a clock that the test sets: what it tells of itself, presets, tours.
 #include "virtual_camera/ptz/ptz_head.h"
-#include "virtual_camera/wire/percent_text.h"
+#include "virtual_camera/wire/message.h"
 
 #include <gtest/gtest.h>
 
@@ -9,7 +9,6 @@
 #include <string>
 
 #include "tests/virtual_camera/ptz/ptz_models.h"
-#include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {
 namespace {

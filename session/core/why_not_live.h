@@ -1,0 +1,15 @@
+// A session's state as one sentence for a person.
+#pragma once
+
+#include <string>
+
+#include "session/core/moment.h"
+#include "vexa/session_status.h"
+
+namespace vexa {
+
+/// For instance "No answer from the camera (Connection refused): attempt 3 failed, the next is in 4 s." A live session
+/// has "Live.". The text of the camera is cut to one line of 200 characters.
+std::string why_not_live(const SessionStatus& status, Moment now);
+
+}  // namespace vexa
