@@ -25,8 +25,8 @@
 /// an argument out of its range gives LIBD_INVALID_ARGUMENT before anything is sent.
 ///
 /// An operation that fails has changed neither the driver nor the caller's record, but for what its line names; memory
-/// that runs out is such a failure, and nothing is thrown. Whether the camera has carried out a request that was sent is
-/// not known then.
+/// that runs out is such a failure, and nothing is thrown. Whether the camera has carried out a request that was sent
+/// is not known then.
 class VEXA_API CLibraryDevice {
  public:
   CLibraryDevice() = default;
@@ -205,8 +205,8 @@ class VEXA_API CLibraryDevice {
   virtual ELibDReturnCode GetViewDR(ELibDViewDRMode& mode);
   /// Sets the dynamic range.
   virtual ELibDReturnCode SetViewDR(ELibDViewDRMode mode);
-  /// Reads the infrared illuminator, from the last answer about the camera if there is one. An answer without a strength
-  /// fails and has set the mode.
+  /// Reads the infrared illuminator, from the last answer about the camera if there is one. An answer without a
+  /// strength fails and has set the mode.
   virtual ELibDReturnCode GetIRIlluminator(ELibIRIlluminatorMode& mode, int& strength);
   /// Sets the infrared illuminator; the strength is sent unchanged.
   virtual ELibDReturnCode SetIRIlluminator(ELibIRIlluminatorMode mode, int strength);
