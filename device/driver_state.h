@@ -191,8 +191,6 @@ struct DriverState {
   /// Makes `stream` the one that is played, with what the answer says of it.
   ELibDReturnCode choose_stream(const std::string& answer, int stream);
   void read_video_ports(const std::string& answer) VEXA_REQUIRES(driver.m_ConnectionLock);
-  /// Offers what the filter leaves.
-  void offer_filtered() VEXA_REQUIRES(driver.m_ConnectionLock);
   void filter_by(const char* item, const std::string& value);
 
   // Alarms; any thread: device/alarm_io.cpp
