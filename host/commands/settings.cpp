@@ -1,4 +1,4 @@
-// vexactl settings, set and daynight: how a camera is set, and changing it.
+// vexactl settings, set and daynight: shows and changes a camera's settings.
 #include <fmt/format.h>
 
 #include <CLI/CLI.hpp>

@@ -9,13 +9,11 @@
 //   - Never read, write or close the descriptor. The driver makes it when it is first asked for and closes it.
 //   - A descriptor may be readable although nothing is left to take: another thread was faster, or the report is over.
 //   - Descriptors are close-on-exec. A child made by fork may only end or exec: it must neither read the descriptors
-//   nor
-//     use or destroy drivers and wait sets, whose threads it does not have.
+//     nor use or destroy drivers and wait sets, whose threads it does not have.
 //   - Remove a driver's descriptor from the loop before the driver is destroyed. What still polls it afterwards meets
-//   no
-//     memory of the driver: a poll under way sleeps until its own time-out, epoll forgets the descriptor by itself, and
-//     a later poll reports POLLNVAL, until the system gives the number to another file. A WaitSet forgets a destroyed
-//     driver by itself.
+//     no memory of the driver: a poll under way sleeps until its own time-out, epoll forgets the descriptor by itself,
+//     and a later poll reports POLLNVAL, until the system gives the number to another file. A WaitSet forgets a
+//     destroyed driver by itself.
 //
 // Any thread may call any function, while streams start and stop too, for a driver that is not being destroyed. A
 // driver that is never asked costs nothing. Nothing is thrown, and the driver's latest error stays as it is.

@@ -136,7 +136,7 @@ TEST_F(JpegPart, OfAClosedSocketIsASystemFailure) {
   EXPECT_EQ(driver_.latest_error(), "0 Bad file descriptor");
 }
 
-TEST_F(JpegPart, TellsTheCamerasPosition) {
+TEST_F(JpegPart, GivesTheCamerasPosition) {
   const struct {
     std::string image;
     std::string position;
@@ -213,7 +213,7 @@ TEST_F(AlarmPart, ThatDoesNotComeLeavesTheBits) {
   EXPECT_EQ(state_, 78U);
 }
 
-TEST_F(AlarmPart, ThatSaysNothingClearsTheBits) {
+TEST_F(AlarmPart, WithoutItemsClearsTheBits) {
   pair_.say("--part\r\n\r\n");
   EXPECT_EQ(receive(), 1);
   EXPECT_EQ(mask_, 0U);
