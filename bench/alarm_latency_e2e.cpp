@@ -1,4 +1,4 @@
-// How long after a contact closes the status call that tells of it returns: one host process watches 16 cameras over
+// How long after a contact closes the status call that reports it returns: one host process watches 16 cameras over
 // loopback, each with a thread of its own.
 //   alarm_latency_e2e [CHANGES]     200 changes a camera; ends with 1 when one was lost
 #include <sys/mman.h>
@@ -34,7 +34,7 @@ constexpr int kHttpPort = 8080;
 constexpr int kTimeout = 1000;  // milliseconds
 constexpr int kQuietReads = 5;
 
-/// What both processes see: the cameras write when each contact changed, the host says how many it has seen. The next
+/// What both processes see: the cameras write when each contact changed, the host how many it has seen. The next
 /// change of a camera comes when the one before it was seen.
 struct Board {
   std::atomic<bool> watching{false};
@@ -69,7 +69,7 @@ Nanoseconds clock_now() { return steady_clock::now().time_since_epoch().count();
   options.rtsp_port = 0;
   vexa::camera::CameraHost cameras(options, kCameras);
   if (!cameras.start()) _exit(1);
-  vexa_bench::say_ready(ready);
+  vexa_bench::report_ready(ready);
   change_contacts(cameras, board, changes);
 }
 

@@ -31,7 +31,7 @@ constexpr int kRounds = 5;
   options.rtsp_port = 0;
   vexa::camera::VirtualCamera camera(options);
   if (!camera.start()) _exit(1);
-  vexa_bench::say_ready(ready);
+  vexa_bench::report_ready(ready);
   for (;;) pause();
 }
 

@@ -13,8 +13,8 @@ namespace vexa_bench {
 
 class CameraProcess {
  public:
-  /// `serve` runs in the new process: it says that the cameras are ready by writing one byte to the descriptor, and
-  /// does not return. Ends the program when it says nothing.
+  /// `serve` runs in the new process: it reports that the cameras are ready by writing one byte to the descriptor, and
+  /// does not return. Ends the program when no byte comes.
   explicit CameraProcess(const std::function<void(int)>& serve) {
     int ready[2];
     if (pipe(ready) != 0) std::exit(1);
@@ -43,7 +43,7 @@ class CameraProcess {
 };
 
 /// Says "ready" from the new process.
-inline void say_ready(int ready) {
+inline void report_ready(int ready) {
   if (write(ready, "r", 1) != 1) _exit(1);
 }
 

@@ -1,4 +1,4 @@
-// How soon a command to move is on its way: from the call to the request's last byte at a camera on this machine.
+// The latency of a command to move: from the call to the request's last byte at a camera on this machine.
 //   ptz_latency_e2e [CALLS]
 #include <arpa/inet.h>
 #include <netinet/in.h>

@@ -87,7 +87,7 @@ std::uint64_t read_alone(const Stream& stream) {
 
 using FfmpegSearch = const std::uint8_t* (*)(const std::uint8_t*, const std::uint8_t*, std::uint32_t*);
 
-/// FFmpeg's own, where its library is there; it tells the byte behind 00 00 01 and what follows.
+/// FFmpeg's own, where its library is there; it returns the byte after 00 00 01 and what follows.
 FfmpegSearch ffmpeg_search() {
   void* library = dlopen("libavcodec.so.59", RTLD_NOW);
   if (library == nullptr) return nullptr;

@@ -197,7 +197,7 @@ Result run_driver(const Load& load, std::uint64_t pictures) {
   return result;
 }
 
-/// The least that a client must say to a camera to get a stream; answers the media socket.
+/// The fewest requests by which a client gets a stream from a camera; returns the media socket.
 int open_bare_stream(const std::string& address) {
   const int control = socket(AF_INET, SOCK_STREAM, 0);
   const int media = socket(AF_INET, SOCK_DGRAM, 0);

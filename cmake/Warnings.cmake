@@ -1,6 +1,6 @@
 # One place for the warnings that every target of ours compiles with. They are errors where CMAKE_COMPILE_WARNING_AS_ERROR
-# says so: in the presets, not in a user's build. GCC's sanitizers bring false alarms with them, so builds with them warn of
-# nothing.
+# is on: in the presets, not in a user's build. GCC's sanitizers bring false alarms with them, so builds with them give no
+# warnings.
 add_library(vexa_warnings INTERFACE)
 target_compile_options(vexa_warnings INTERFACE
   -Wall -Wextra -Wpedantic -Wconversion -Wshadow -Wformat=2 -Wformat-nonliteral)

@@ -1,4 +1,4 @@
-// How the members reach the camera: the shared connection settings, the CGI log, one request at a time.
+// What members reach the camera with: the shared connection settings, the CGI log, one request at a time.
 #pragma once
 
 #include <atomic>
@@ -15,7 +15,7 @@
 
 namespace vexa {
 
-/// A longer time-out of the connection for as long as a slow request takes; the saved one is put back at its end.
+/// Raises the connection's time-out for as long as a slow request takes; the saved one is put back at its end.
 ///
 /// Kept: it stands in the shared settings, so requests of other threads have it too meanwhile; of two that overlap, the
 /// first to end puts the saved time-out back for both.
@@ -32,7 +32,8 @@ class RaisedTimeout {
   const int restored_;
 };
 
-/// The connection settings, which are fields of the driver. Any thread.
+/// The connection settings, which are fields of the driver. Owned by DriverState; any thread. Hands out copies, never
+/// references, so that no exchange sees a setting change.
 class Connection {
  public:
   Connection(SLibDConnectionInfo& info, int& saved_timeout, CSimpleLock& lock)
@@ -51,7 +52,8 @@ class Connection {
   int& saved_timeout_ VEXA_GUARDED_BY(lock_);
 };
 
-/// Writes the CGI log while it is switched on. Any thread.
+/// Writes the CGI log while it is switched on. Owned by DriverState; any thread. Never fails: a line that cannot be
+/// written is lost.
 class CgiLog final : public ExchangeLog {
  public:
   CgiLog(CFileLogger& file, const std::atomic<bool>& enabled) : file_(file), enabled_(enabled) {}
@@ -64,15 +66,15 @@ class CgiLog final : public ExchangeLog {
   const std::atomic<bool>& enabled_;
 };
 
-/// Sends requests and inquiries, and records why one failed. Any thread; each blocks for the connection's time-out at
-/// most twice.
+/// Sends requests and inquiries, and records why one failed. Owned by DriverState; any thread. A request blocks for the
+/// connection's time-out at most three times, an inquiry four times. Never reads the latest error back.
 class CameraLink {
  public:
   CameraLink(Connection& connection, CgiLog& log, ErrorRecord& errors, ExchangeLedger& exchanges,
              const std::map<std::string, int>& inquiry_sizes)
       : connection_(connection), log_(log), errors_(errors), exchanges_(exchanges), inquiry_sizes_(inquiry_sizes) {}
 
-  /// Requests a path; a new exchange begins. Not recorded: the member that asks does.
+  /// Requests a path; a new exchange begins. A failure is recorded by the member that asks, not here.
   Result<Socket> open(const std::string& path);
 
   /// One request whose answer is not read: LIBD_OK, or the code of its own failure.

@@ -1,4 +1,4 @@
-// How the camera is reached, and the switches of the log of what is exchanged with it.
+// The connection settings, and the switches of the CGI log.
 #include <cstring>
 #include <utility>
 

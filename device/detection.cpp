@@ -53,7 +53,7 @@ ELibDReturnCode CVexaCommon::SetDetectionParam(SLibDDetectionParam& param) {
 
 ELibDReturnCode CVexaCommon::SetObjectDetectionParameter(SLibDDetectionParam& param, int& socket) {
   return m_State->errors.run([&]() -> vexa::Outcome {
-    // Safe: a model class may bring areas that nobody has looked at; corners that are not there are not read.
+    // Safe: a model class may bring areas that were not checked; missing corners are not read.
     if (CheckDetectionParamDetectionArea(param) != LIBD_OK) return LIBD_INVALID_ARGUMENT;
     const vexa::RaisedTimeout slow = m_State->connection.raised(kDetectionTimeout);
     for (const auto request : {vexa::object_size_request, vexa::first_windows_request, vexa::last_windows_request}) {

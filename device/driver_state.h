@@ -1,4 +1,4 @@
-// What a driver object keeps besides the fields of its class, and the steps that several of its members share.
+// The state of a driver object besides the fields of its class, and the steps that several of its members share.
 #pragma once
 
 #include <atomic>
@@ -39,8 +39,9 @@ inline std::span<char> room_of(char* buffer, int length) {
   return {buffer, length < 0 ? 0 : static_cast<std::size_t>(length)};
 }
 
-/// Made by the driver's constructor and gone with it. The parts keep references to the driver's fields. Whose thread
-/// runs a step is said with the group it stands in.
+/// Everything that a driver keeps and does without its class header showing it. Made by the driver's constructor and
+/// destroyed with it; its parts refer to the driver's fields. The heading of each group names the thread that runs its
+/// steps and the file with their bodies.
 struct DriverState {
   explicit DriverState(CVexaCommon& owner);
   DriverState(const DriverState&) = delete;
@@ -183,7 +184,7 @@ struct DriverState {
   void store_camera_inquiry(const std::string& answer);
   ELibDReturnCode camera_inquiry(std::string& answer);
   ELibDReturnCode after_image_change(ELibDReturnCode sent);
-  /// Takes an answer to the "camera" inquiry into the settings and the offer, then hands the settings out in `info`.
+  /// Stores the settings of a "camera" answer, narrows what is offered by them, and copies the settings to `info`.
   void read_camera_answer(const std::string& answer, SLibDCameraInfo& info);
   bool read_camera_properties(const std::string& answer) VEXA_REQUIRES(driver.m_ConnectionLock);
   void read_stream_settings(const std::string& answer, int stream) VEXA_REQUIRES(driver.m_ConnectionLock);
@@ -200,7 +201,7 @@ struct DriverState {
   Result<int> read_alarm_part(int socket, PinMasks& masks);
   ELibDReturnCode watch_tampering(int state);
 
-  // Models that give their picture out elsewhere; any thread: device/model_variants.cpp
+  // Models with an analog output; any thread: device/model_variants.cpp
   ELibDReturnCode bring_video_to_network(const std::string& system_answer);
   ELibDReturnCode read_system_bringing_video(SLibDSystemInfo& info);
   ELibDReturnCode ask_video_out_mode(ELibVideoOutMode& mode);

@@ -10,7 +10,7 @@
 
 namespace vexa {
 
-/// What most members' work comes to: the code to return, or a failure to record.
+/// The result of most members' work: the code to return, or a failure to record.
 using Outcome = Result<ELibDReturnCode>;
 
 /// What a member returns for a failure.
@@ -47,7 +47,7 @@ class ErrorRecord {
   std::string text();
 
   /// Runs a member's work, which returns a Result. A failure is recorded and becomes its code, -1 or false. So does
-  /// running out of memory, with LIBD_FAILED and the system's text, whatever the work was: nothing is thrown further.
+  /// running out of memory, with LIBD_FAILED and the system's text, whatever the work was: no exception passes.
   template <typename Work>
   auto run(Work&& work) {
     using Value = typename std::invoke_result_t<Work>::value_type;

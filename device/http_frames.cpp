@@ -12,7 +12,7 @@
 
 namespace {
 
-/// Twice the largest frame and more, so that a frame under work is seldom moved.
+/// Twice the largest frame and more, so that an unfinished frame is seldom moved.
 constexpr std::size_t kStreamBuffer = std::size_t{4} << 20;
 
 void stamp_now(CVexaCommon::VideoFrameInfo& frame) {

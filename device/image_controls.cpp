@@ -70,7 +70,7 @@ ELibDReturnCode CVexaCommon::Bright(int step) {
     const ELibDReturnCode mode = CheckCurrentBrightMode();
     if (mode != LIBD_OK) return mode;
     std::string answer;
-    // Kept: what the camera says here does not enter the cache; the getters' values stay those of one moment.
+    // Kept: this answer does not enter the cache; the getters' values stay those of one moment.
     if (const auto asked = m_State->camera.inquire("camera", answer); asked != LIBD_OK) return asked;
     int value = 0;
     unsigned entry = 0;

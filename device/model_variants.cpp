@@ -1,4 +1,4 @@
-// What the model variants do in their own way: exposure modes, and the output that the picture goes to.
+// The members that model variants override: exposure modes, and the output that the picture goes to.
 #include <algorithm>
 #include <string_view>
 

@@ -12,7 +12,7 @@
 
 namespace vexa {
 
-/// Whether no data since `last` mean that a stream has died: more than `patience` milliseconds.
+/// Whether a stream without data since `last` counts as dead: after more than `patience` milliseconds.
 inline bool is_silent(std::time_t now, std::time_t last, std::int64_t patience) {
   return (std::int64_t{now} - std::int64_t{last}) * 1000 > patience;
 }
@@ -23,11 +23,12 @@ inline std::int64_t silent_from(std::time_t last, std::int64_t patience) {
   return std::int64_t{last} + whole + 1;
 }
 
-/// Milliseconds without the fraction of a second. Only below 0 does a silence tell the difference.
+/// Milliseconds without the fraction of a second, by which silences are measured.
 inline std::int64_t whole_seconds(int milliseconds) { return std::int64_t{milliseconds / 1000} * 1000; }
 
-/// One polled stream, over fields of the driver. Any thread; a poll holds the stream's lock while it waits for data,
-/// and a start or stop waits for it in turn, so that it comes next however soon polls follow each other.
+/// One of the driver's polled streams; socket and time are fields of the driver. Any thread. A poll holds the stream's
+/// lock while it waits for data; a start or stop waits for the lock in turn, so that it is next however soon polls
+/// follow each other. Has no thread of its own.
 class PolledStream {
  public:
   struct Fields {
@@ -35,7 +36,7 @@ class PolledStream {
     int& socket;
     std::time_t& last;
   };
-  /// Where those who wait for the stream are found.
+  /// The threads that wait for the stream.
   struct Waiters {
     Readiness& readiness;
     StreamBits stream;
@@ -44,8 +45,9 @@ class PolledStream {
   PolledStream(Fields fields, Waiters waiters)
       : lock_(fields.lock), socket_(fields.socket), last_(fields.last), waiters_(waiters) {}
 
-  /// Opens the stream by `open`, which returns a Result<Socket>, and counts its silence from `now()` on: who waits for
-  /// the stream is woken after `patience` milliseconds of it. What another thread has opened meanwhile is closed.
+  /// Opens the stream by `open`, which returns a Result<Socket>, and counts its silence from `now()` on: threads that
+  /// wait for the stream are woken after `patience` milliseconds of it. Closes the
+  /// stream that another thread may have opened meanwhile.
   template <typename Open, typename Now>
   Outcome start(Open&& open, Now&& now, std::int64_t patience) {
     const TurnGuard guard(lock_, turn_);
@@ -68,7 +70,7 @@ class PolledStream {
 
   /// Reads by `read`, which takes the socket and returns a Result<int>, 0 when no data came: LIBD_OK when some did,
   /// else LIBD_TIMEOUT once the stream has been silent for `patience` milliseconds and LIBD_NO_FRAME before.
-  /// LIBD_FAILED, without a reading, when it is closed.
+  /// LIBD_FAILED, without a read, when it is closed.
   template <typename Read, typename Now>
   Outcome poll(Read&& read, Now&& now, std::int64_t patience) {
     const TurnGuard guard(lock_, turn_);

@@ -1,4 +1,4 @@
-// Where the camera looks, and what is known of its motion.
+// The camera's position, and the stored control settings.
 #include <optional>
 #include <utility>
 

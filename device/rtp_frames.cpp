@@ -70,7 +70,7 @@ ELibDReturnCode CVexaCommon::GetRtpCurrentVideoFrameMPEG4(VideoFrameInfo& frame)
   return finished;
 }
 
-// Kept: a damaged picture is an empty frame of type 0, by which the host learns of it.
+// Kept: a damaged picture is an empty frame of type 0, by which the host notices it.
 ELibDReturnCode CVexaCommon::GetRtpCurrentVideoFrameJPEG(VideoFrameInfo& frame) {
   const ELibDReturnCode begun = m_State->begin_rtp_frame(frame, vexa::kJpegCodec);
   if (begun != LIBD_OK) return begun;

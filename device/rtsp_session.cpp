@@ -34,7 +34,7 @@ Failure DriverState::count_rtsp(std::uint64_t requests, const Failure& failure) 
   return failure;
 }
 
-// Kept: the media socket stays open when the open fails after it; its caller finds out by it how far the open came.
+// Kept: the media socket stays open when the open fails after it; its caller sees by it how far the open came.
 Result<int> DriverState::open_rtp_over_udp(const std::string& url, int port) {
   errors.clear();
   const SLibDConnectionInfo info = connection.copy();
@@ -210,7 +210,7 @@ bool CVexaCommon::InitEdgeStorageKeepAlivePeriod() {
 void CVexaCommon::rtp_over_udp_close() {
   vexa::Operation operation(*m_State, __func__);
   if (m_RtspSocket == -1 && m_State->stream_socket() == -1) return;
-  // Kept: the switch that recordings are played with holds for live sessions too.
+  // Kept: the host's switch for recordings holds for live sessions too.
   if (m_State->wants_teardown()) {
     m_State->finish_keep_alive();  // its answer is not taken for that of the TEARDOWN
     m_State->errors.clear();

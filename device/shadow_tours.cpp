@@ -33,7 +33,7 @@ ELibDReturnCode CVexaCommon::StartShadowTour(int number) {
   });
 }
 
-// Kept: four shadow tours are named, however many there are; cameras pass over those they lack.
+// Kept: four shadow tours are named, however many there are; cameras ignore those they lack.
 ELibDReturnCode CVexaCommon::StopShadowTour() {
   vexa::Operation operation(*m_State, __func__);
   return m_State->camera.send("/command/presetposition.cgi?STour=off&STourA=off&STourB=off&STourC=off&STourD=off");

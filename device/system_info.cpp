@@ -1,4 +1,4 @@
-// What the camera says it is.
+// The camera's identity.
 
 #include "device/driver_state.h"
 #include "runtime/base/sync.h"

@@ -1,4 +1,4 @@
-// The driver object: its construction and end, its latest error, what belongs to no family.
+// The driver object: its construction and end, its latest error, and members that belong to no family.
 #include "vexa/vexa_common.h"
 
 #include "device/driver_state.h"
@@ -45,7 +45,7 @@ CVexaCommon::~CVexaCommon() {
   CloseHandle(m_StopVideoEvent);
 }
 
-// Running out of memory is not recorded here: the text that was asked for stays the latest one.
+// Running out of memory is not recorded here: it would replace the text that was asked for.
 ELibDReturnCode CVexaCommon::GetLatestErrorText(std::string& text) {
   return vexa::within_memory([&] { text = m_State->errors.text(); }) ? LIBD_OK : LIBD_FAILED;
 }

@@ -27,13 +27,13 @@ constexpr std::size_t kMaxSizeRoom = 64;
 /// Takes a fixed key's value; `pos` moves from the key to the value's end.
 template <std::size_t kSize>
 std::string value_at(const std::string& answer, std::size_t& pos, const char (&)[kSize]) {
-  const vexa::PlacedValue value = vexa::value_behind(answer, pos, kSize - 1);
+  const vexa::PlacedValue value = vexa::value_after(answer, pos, kSize - 1);
   pos = value.end;
   return std::string(value.text);
 }
 
 std::string value_at(const std::string& answer, std::size_t& pos, const std::string& key) {
-  const vexa::PlacedValue value = vexa::value_behind(answer, pos, key.size());
+  const vexa::PlacedValue value = vexa::value_after(answer, pos, key.size());
   pos = value.end;
   return std::string(value.text);
 }

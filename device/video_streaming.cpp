@@ -92,7 +92,7 @@ ELibDReturnCode DriverState::open_live_rtp(int stream) {
 
 // Opens the session at a path of the camera's, or leaves both sockets closed.
 ELibDReturnCode DriverState::open_rtp_session(const std::string& path) {
-  store_rtsp_port(kRtspPort);  // an inquiry of the host's may have stored another meanwhile
+  store_rtsp_port(kRtspPort);  // an inquiry by the host may have stored another meanwhile
   const std::string host = connection.copy().host;
   const std::string url = format_within(kRequestRoom, "rtsp://%s:%d%s", host.c_str(), kRtspPort, path.c_str()).text;
   const auto control = open_rtp_over_udp(url, kRtspPort);
@@ -114,7 +114,7 @@ ELibDReturnCode DriverState::start_playback(const SLibDEdgeStorageStreamingInfo&
   const std::string name = as_one_word(recording.streamName, "");
   const std::string path = format_within(kPathRoom, "/media/%s", name.c_str()).text;
   if (!allocate_packets()) return LIBD_FAILED;
-  driver.m_RtpLiveMode = true;  // pictures from RTP; m_EdgeStoragePlayback tells a playback from live video
+  driver.m_RtpLiveMode = true;  // pictures from RTP; m_EdgeStoragePlayback distinguishes a playback from live video
   driver.m_EdgeStoragePlayback = true;
   driver.m_FirstPlaybackFrame = true;
   driver.m_PlaybackScale = recording.scale;
@@ -159,7 +159,7 @@ ELibDReturnCode DriverState::start_thread(const std::string& codec) {
 }
 
 ELibDReturnCode DriverState::abandon_start(int error) {
-  // No session stands that could be ended.
+  // There is no session to end.
   if (plays_rtp() && driver.m_RtspSocket == -1) driver.rtp_stream_socket_close_all();
   driver.CVexaCommon::StopVideoStreaming();
   driver.ReleaseRtpPacketsPtr();
@@ -234,7 +234,7 @@ ELibDReturnCode CVexaCommon::StopVideoStreaming() {
     if (m_StopVideoRequested) return operation.returns(LIBD_FAILED);
     m_StopVideoRequested = true;
   }
-  // A start in another thread is let finish: what it opens is its own until then.
+  // A start in another thread finishes first: what it opens is its own until then.
   const vexa::Guard turn(m_State->start_stop_lock);
   m_State->end_thread();
   if (m_State->plays_rtp()) {

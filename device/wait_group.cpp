@@ -22,7 +22,7 @@ static_assert(kPolledCount <= kStreamMask + 1);
 
 constexpr int kEventsAtOnce = 64;  // the others follow with the next wait
 
-/// The clock that polls read is behind the timer's by up to a tick.
+/// The clock that polls read lags up to a tick after the timer's.
 constexpr long kClockLag = 10'000'000;  // nanoseconds
 
 std::uint64_t event_of(WaitGroup::Key key, std::size_t stream) { return key << kStreamBits | stream; }

@@ -24,13 +24,13 @@ SLibDResolutionInfo resolution_of(Size size) {
 
 struct LabelText {
   const char* before;
-  const char* behind;
+  const char* after;
 };
 
 std::vector<SLibDCommonParameterInt> labelled(std::span<const int> values, LabelText label) {
   std::vector<SLibDCommonParameterInt> items;
   items.reserve(values.size());
-  for (const int value : values) items.emplace_back(label.before + std::to_string(value) + label.behind, value);
+  for (const int value : values) items.emplace_back(label.before + std::to_string(value) + label.after, value);
   return items;
 }
 

@@ -8,7 +8,7 @@ namespace {
 bool fits(Size size, Size limit) { return size.width <= limit.width && size.height <= limit.height; }
 
 /// Takes the size that the value names. A value that does not read leaves the criterion as it is; a side that is not
-/// above 0 says that no size is given.
+/// above 0 means that no size is given.
 void take_size(const std::string& value, std::optional<Size>& criterion) {
   Size size{};
   if (std::sscanf(value.c_str(), "%9d,%9d", &size.width, &size.height) != 2) return;

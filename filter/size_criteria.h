@@ -12,7 +12,7 @@ namespace vexa::filter {
 /// True for pictures at least 8:5: 16:9 and what encoders round it to. All others count as 4:3.
 bool is_wide(Size size);
 
-/// The criteria that a facade was given, which add up. A facade owns its own; the thread that holds the facade uses it.
+/// Decides which sizes are offered under the criteria set so far. Owned by a resolution filter; one thread at a time.
 class SizeCriteria {
  public:
   /// Forgets all criteria; `largest_moving` bounds pictures once solid PTZ is on.

@@ -1,5 +1,5 @@
-// The alarm stream of any bytes, polled by the driver; the first byte says what the camera has. Also the answers about
-// its pins.
+// The alarm stream of any bytes, polled by the driver; the first byte decides what the camera has. Also the answers
+// about its pins.
 #include <fcntl.h>
 #include <sys/socket.h>
 #include <unistd.h>

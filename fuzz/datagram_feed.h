@@ -1,4 +1,4 @@
-// Datagrams of a fuzz input on their way through the collection of pictures: two bytes of length before each. They are
+// Passes the datagrams of a fuzz input to the packet collector: two bytes of length before each. They are
 // placed as in the packet buffer of a running stream, where later ones overwrite earlier ones.
 #pragma once
 
@@ -42,7 +42,7 @@ class DatagramFeed {
     if (const auto header = vexa::parse_rtp_header(datagram)) list(*header, offset, datagram);
   }
 
-  /// Hands every picture that stands complete to `assemble`, which tells whether it is whole.
+  /// Passes each complete picture to `assemble`, which returns whether it is whole.
   template <typename Assemble>
   void take_pictures(Assemble assemble) {
     now_ += std::chrono::milliseconds(7);

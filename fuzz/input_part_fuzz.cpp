@@ -1,4 +1,4 @@
-// Alarm parts, under every way in which cameras report motion; the first byte chooses.
+// Alarm parts, for all forms in which cameras report motion; the first byte chooses.
 #include <cstddef>
 #include <cstdint>
 #include <cstdlib>

@@ -1,4 +1,4 @@
-// Packets inside an RTSP connection, one behind the other.
+// Packets inside an RTSP connection, one after the other.
 #include <cstddef>
 #include <cstdint>
 #include <cstdlib>

@@ -20,7 +20,7 @@ namespace {
 // Cutting a file at every length costs the square of its size; longer files are cut at this many lengths.
 constexpr std::size_t kCuts = 4096;
 
-/// Memory with a forbidden page behind it.
+/// Memory with a forbidden page after it.
 class GuardedMemory {
  public:
   explicit GuardedMemory(std::size_t capacity) : page_(static_cast<std::size_t>(sysconf(_SC_PAGESIZE))) {

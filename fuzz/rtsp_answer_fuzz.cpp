@@ -1,4 +1,4 @@
-// Everything read from RTSP answers: header end after any look, status line, clock rate, session, range clock.
+// Everything read from RTSP answers: header end after any peek, status line, clock rate, session, range clock.
 #include <cstddef>
 #include <cstdint>
 #include <cstdlib>

@@ -1,5 +1,5 @@
-// Any bytes, from any place in a block on: the finders give what a search byte by byte gives. The first byte tells how
-// much is left out at the front.
+// Any bytes, from any place in a block on: the finders return what a search byte by byte returns. The first byte
+// decides how much is left out at the front.
 #include <algorithm>
 #include <cstdlib>
 #include <vector>

@@ -1,4 +1,4 @@
-// An elementary stream in pieces: a byte of length before each. However they come, nothing of the stream is lost.
+// An elementary stream in pieces: a byte of length before each. However they come, no byte of the stream is lost.
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>

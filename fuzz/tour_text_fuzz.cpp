@@ -1,4 +1,4 @@
-// Camera tours and shadow tours: what any answer says can be read, and what was read is either refused or set again in
+// Camera tours and shadow tours: any answer can be read, and what was read is either refused or set again in
 // a request that holds no other command.
 #include <cstdint>
 #include <cstdlib>

@@ -14,7 +14,7 @@ void check(bool holds) {
 }
 
 void read_value(std::string_view answer, std::size_t at, std::size_t length) {
-  const vexa::PlacedValue value = vexa::value_behind(answer, at, length);
+  const vexa::PlacedValue value = vexa::value_after(answer, at, length);
   check(value.end <= answer.size());
   check(value.text.find('&') == std::string_view::npos);
   check(value.text.empty() || value.text.data() + value.text.size() == answer.data() + value.end);

@@ -6,7 +6,7 @@
 namespace vexa {
 namespace {
 
-/// One frame under work, one with the host, and a few between: more only costs memory.
+/// One frame that is being filled, one with the host, and a few between: more only costs memory.
 constexpr std::size_t kMostSpares = 4;
 
 }  // namespace
@@ -14,7 +14,7 @@ constexpr std::size_t kMostSpares = 4;
 FrameStore::FrameStore() { spares_.reserve(kMostSpares); }
 
 unsigned char* FrameStore::take(std::size_t capacity) {
-  // The one given back last, whose memory is still at hand.
+  // The one given back last, whose memory is still in the cache.
   const auto found =
       std::find_if(spares_.rbegin(), spares_.rend(), [&](const Spare& spare) { return spare.first == capacity; });
   if (found == spares_.rend()) return new unsigned char[capacity];

@@ -32,7 +32,7 @@ Result<std::optional<PacketRunPlace>> PictureReader::next() {
     const auto deadline = rtp_.collector.deadline();
     int until_look = deadline ? milliseconds_until(*deadline) : source_.timeout;
     if (source_.errand) until_look = std::min(until_look, std::max(milliseconds_until(source_.errand->deadline), 0));
-    // A look at what stands complete falls due before the read would time out: that is no silence of the camera's.
+    // The collector has to be asked again before the read would time out: that is no silence of the camera.
     if (until_look < source_.timeout && !packet_waits(until_look)) {
       if (errand_is_due()) return std::optional<PacketRunPlace>();
       continue;
@@ -103,7 +103,7 @@ void PictureReader::take(const SPacketInfo& packet, const Datagram& datagram) {
   if (!rtp_.takes(packet)) return ledger_.refuse(StreamLedger::Refusal::kWrongPayloadType);
   ledger_.media(packet.timestamp, source_.clock_rate, datagram.arrival);
   chronicle_.arrived(packet, source_.socket.socket, datagram.arrival);
-  // Its bytes are its own before it is listed: should memory run out in between, it is lost like one on the wire.
+  // The ring keeps its bytes before it is listed: should memory run out in between, it is lost like one on the wire.
   rtp_.ring.keep(packet);
   const std::uint64_t restarts = rtp_.collector.counts().restarts;
   if (!rtp_.collector.add(packet, source_.clock_rate, datagram.arrival, arrival)) rtp_.ring.take_back();

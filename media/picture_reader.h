@@ -23,7 +23,7 @@ struct Errand {
   std::chrono::steady_clock::time_point deadline;
 };
 
-/// A picture is a run of packets in the list; a frame is what is assembled of them in a host's buffer.
+/// A picture is a run of packets in the list; a frame is the bytes assembled from them in a buffer.
 ///
 /// Collects one picture at a time into the reception that it is given. Holds nothing between two pictures. Made and
 /// used by the streaming thread; waits for datagrams and for the stop event together.
@@ -35,7 +35,7 @@ class PictureReader {
     int clock_rate;         ///< ticks a second
     int timeout;            ///< milliseconds that a read may take
     std::function<bool()> is_stopped;
-    bool strict;  ///< takes packets of the camera's address and of the stream's SSRC alone
+    bool strict;                        ///< takes packets of the camera's address and of the stream's SSRC alone
     std::optional<Errand> errand = {};  ///< ends the wait for a datagram, with no picture yet
   };
 

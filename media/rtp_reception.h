@@ -21,7 +21,7 @@ struct PictureName {
 
 inline PictureName name_of(const SPacketInfo& first) { return {first.timestamp, first.sequence}; }
 
-/// Made anew for every stream and every change of codec; the streaming thread's.
+/// Made anew for each stream and each change of codec, owned by DriverState; used by the streaming thread alone.
 struct RtpReception {
   RtpReception(std::vector<SPacketInfo>& packets, const Codec& stream_codec, CollectionCounts& counts)
       : codec(stream_codec), collector(packets, stream_codec.rules, counts) {

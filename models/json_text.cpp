@@ -13,7 +13,7 @@ namespace {
 
 constexpr std::size_t kDeepest = 16;
 
-// Lets the parser read characters and tells on which line the last one stands.
+// Lets the parser read characters and counts the lines up to the last one.
 class CountedText {
  public:
   using iterator_category = std::input_iterator_tag;
@@ -134,7 +134,7 @@ class TreeBuilder {
     return true;
   }
 
-  // What is open lies in lists that grow at their ends only, behind which nothing is open: the pointers hold.
+  // Open objects are in lists that grow at their ends only, and none is open after the end: the pointers stay valid.
   bool open(Node value) {
     if (open_.size() == kDeepest) return refuse("nested too deeply");
     open_.push_back(&put_node(std::move(value)));

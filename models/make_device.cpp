@@ -14,7 +14,7 @@ class Model final : public Driver {
  public:
   explicit Model(const Profile& profile) {
     this->m_FixedSystemInfo.modelName = profile.model;
-    // Which of the two is which the driver leaves open: the first tells of sound from the camera, the second to it.
+    // The driver does not define which of the two is which: here the first is sound from the camera, the second to it.
     this->m_FixedSystemInfo.capability3 = profile.audio.inputCodecs.empty() ? 0 : 1;
     this->m_FixedSystemInfo.capability4 = profile.audio.outputCodecs.empty() ? 0 : 1;
     this->m_FixedCameraInfo = profile.camera;

@@ -115,7 +115,7 @@ void demand_range(const Part& axis, Complaints& complaints) {
   constexpr std::int32_t kMost = std::numeric_limits<std::int16_t>::max();
   const std::int32_t origin = axis["origin"].number();
   const std::int32_t end = origin + axis["span"].number() / 2;
-  complaints.demand(!axis || axis["span"].number() != 0, axis["span"], "must not be 0: positions are angles by it");
+  complaints.demand(!axis || axis["span"].number() != 0, axis["span"], "must not be 0: angles are computed with it");
   complaints.demand(std::min(origin, end) >= kLeast && std::max(origin, end) <= kMost, axis["origin"],
                     "must keep both ends within -32768 to 32767");
 }

@@ -18,8 +18,8 @@
 
 namespace vexa::models {
 
-/// One value of the profile with its path. A part that is missing reads as empty, false and 0.
-/// A plain value that points into the parsed text, which outlives it; one thread reads a profile.
+/// One value of the profile with its path. A part that is missing reads as empty, false and 0. Refers to the parsed
+/// document, which outlives it; one thread.
 class Part {
  public:
   Part(const Node* node, std::string path) : node_(node), path_(std::move(path)) {}
@@ -55,7 +55,7 @@ class Part {
   std::string path_;
 };
 
-/// Keeps the first complaint; what is read after it does not matter.
+/// Keeps the first complaint of one profile; those after it are dropped. One thread.
 class Complaints {
  public:
   void add(Complaint complaint) {

@@ -23,11 +23,11 @@ using vexa::debug_line;
 using vexa::ErrorText;
 using vexa::FileHandle;
 
-/// A null path counts as the empty one, which names nothing.
+/// A null path counts as the empty one, which names no file.
 const char* or_empty(const char* path) { return path == nullptr ? "" : path; }
 
-/// A function's result: 1 when `result` is 0; else 0, and a line that tells `what` failed on `path`.
-int done_or_told(int result, const char* what, const char* path) {
+/// A function's result: 1 when `result` is 0; else 0, and a line that reports `what` failed on `path`.
+int done_or_reported(int result, const char* what, const char* path) {
   if (result == 0) return 1;
   debug_line("%s %s: %s", what, path, ErrorText(errno).c_str());
   return 0;
@@ -100,14 +100,14 @@ int GetFileAttributesEx(const char* path, _GET_FILEEX_INFO_LEVELS level, void* d
     return 0;
   }
   struct stat64 status {};
-  if (done_or_told(stat64(or_empty(path), &status), "GetFileAttributesEx stat", or_empty(path)) == 0) return 0;
+  if (done_or_reported(stat64(or_empty(path), &status), "GetFileAttributesEx stat", or_empty(path)) == 0) return 0;
   if (data == nullptr) return 0;
   vexa::describe(status, *static_cast<WIN32_FILE_ATTRIBUTE_DATA*>(data));
   return 1;
 }
 
 int RemoveDirectory(const char* path) {
-  return done_or_told(rmdir(or_empty(path)), "RemoveDirectory rmdir", or_empty(path));
+  return done_or_reported(rmdir(or_empty(path)), "RemoveDirectory rmdir", or_empty(path));
 }
 
 int CreateDirectory(const char* path, _SECURITY_ATTRIBUTES* sa) {
@@ -115,7 +115,7 @@ int CreateDirectory(const char* path, _SECURITY_ATTRIBUTES* sa) {
     debug_line("CreateDirectory : no support for security attributes yet");
     return 0;
   }
-  return done_or_told(mkdir(or_empty(path), kDirectoryMode), "CreateDirectory mkdir", or_empty(path));
+  return done_or_reported(mkdir(or_empty(path), kDirectoryMode), "CreateDirectory mkdir", or_empty(path));
 }
 
 int MoveFile(const char* from, const char* to) {
@@ -124,7 +124,9 @@ int MoveFile(const char* from, const char* to) {
   return 0;
 }
 
-int DeleteFile(const char* path) { return done_or_told(unlink(or_empty(path)), "DeleteFile unlink", or_empty(path)); }
+int DeleteFile(const char* path) {
+  return done_or_reported(unlink(or_empty(path)), "DeleteFile unlink", or_empty(path));
+}
 
 typedHandle* CreateFile(const char* path, unsigned long access, unsigned long, _SECURITY_ATTRIBUTES*,
                         unsigned long creation, unsigned long, typedHandle*) {
@@ -152,7 +154,7 @@ std::uint32_t GetFileSize(typedHandle* h, unsigned long* high) {
     debug_line("GetFileSize fstat: %s", ErrorText(errno).c_str());
     return INVALID_FILE_SIZE;
   }
-  // Kept: the size is cut to its low half; the high half is always told as 0.
+  // Kept: the size is cut to its low half; the high half is always reported as 0.
   if (high != nullptr) *high = 0;
   return static_cast<std::uint32_t>(status.st_size);
 }

@@ -42,7 +42,7 @@ struct LogCloser {
 };
 using OpenLog = std::unique_ptr<typedHandle, LogCloser>;
 
-/// The file, at its end, behind an opening banner; null when it cannot be opened.
+/// The file, at its end, after an opening banner; null when it cannot be opened.
 OpenLog open_log(const std::string& name) {
   OpenLog file(
       CreateFile(name.c_str(), GENERIC_WRITE, FILE_SHARE_WRITE, nullptr, OPEN_ALWAYS, FILE_ATTRIBUTE_NORMAL, nullptr));
@@ -115,7 +115,7 @@ void CFileLogger::SetFileName(const char* name) {
 }
 
 // Safe: the lock is held from leaving the old file to having the new one, so that a thread that logs or opens meanwhile
-// neither loses its line nor leaves a share behind.
+// neither loses its line nor leaves a share of the old file.
 void CFileLogger::OpenFile() {
   (void)vexa::within_memory([this] {
     const vexa::Guard guard(m_FileListLock);
@@ -179,7 +179,7 @@ void CFileLogger::CycleCloseFile() {
   const vexa::Guard guard(m_FileListLock);
   FileInfo* entry = FindEntry();
   if (entry == nullptr) return;
-  // Safe: nothing uses the closed handle again.
+  // Safe: the closed handle is not used again.
   close_log(std::exchange(entry->fileHandle, nullptr));
 }
 

@@ -1,4 +1,4 @@
-// What the system tells about a file, in the values of this layer.
+// What the system reports about a file, in the values of this layer.
 #pragma once
 
 #include <sys/stat.h>
@@ -15,7 +15,7 @@ namespace vexa {
 
 /// FILE_ATTRIBUTE_... for the calling process.
 // Kept: one write bit decides, the owner's, the group's or the others'. Further groups, access lists and what a
-// superuser may do besides are not looked at.
+// superuser may do besides are not considered.
 inline std::uint32_t attributes_of(const struct stat64& status) {
   const mode_t others_or_group = status.st_gid == getegid() ? S_IWGRP : S_IWOTH;
   const mode_t write_bit = status.st_uid == geteuid() ? S_IWUSR : others_or_group;
@@ -54,7 +54,7 @@ struct DiskSpace {
   ULARGE_INTEGER free;
 };
 
-/// Nothing when the system tells no block size.
+/// Nullopt when the system reports no block size.
 inline std::optional<DiskSpace> space_of(const struct statvfs64& system) {
   if (system.f_frsize == 0) return std::nullopt;
   return DiskSpace{bytes_of(system, system.f_bavail), bytes_of(system, system.f_blocks),

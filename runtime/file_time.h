@@ -21,7 +21,7 @@ constexpr std::int64_t kUnixEpochSeconds = 11644473600;
 std::uint64_t ticks_of(const _FILETIME& time);
 _FILETIME file_time_of(std::uint64_t ticks);
 
-/// The tick count of seconds since 1970 plus `more` ticks; nothing before 1601 or beyond 64 bits.
+/// The tick count of seconds since 1970 plus `more` ticks; nullopt before 1601 or beyond 64 bits.
 std::optional<std::uint64_t> ticks_of_unix(std::int64_t seconds, std::uint64_t more);
 
 }  // namespace vexa

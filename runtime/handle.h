@@ -1,4 +1,4 @@
-// The records behind a typedHandle. Each names the kind it stands for, so that one function tells them apart.
+// The records that typedHandle pointers lead to. Each names its kind, so that one function tells them apart.
 #pragma once
 
 #include <pthread.h>
@@ -45,7 +45,7 @@ struct FindHandle : typedHandle {
   std::size_t index = 0;  // of the match that was returned last
 };
 
-/// The record behind `h`; null when `h` is null or of another kind.
+/// The record of `h`; null when `h` is null or of another kind.
 template <typename Record>
 Record* record_of(typedHandle* h) {
   return h != nullptr && h->kind == Record::kKind ? static_cast<Record*>(h) : nullptr;
@@ -59,7 +59,7 @@ Record* new_record() {
   return record;
 }
 
-/// As record_of<FileHandle>; a refusal is told on standard error.
+/// As record_of<FileHandle>; a refusal is reported on standard error.
 FileHandle* check_file_handle(typedHandle* h);
 
 }  // namespace vexa

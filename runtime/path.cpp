@@ -72,8 +72,7 @@ void _makepath(char* path, const char* drive, const char* dir, const char* fname
   }
 }
 
-// Kept: the pieces are copied whatever their length. The guards on the directory (4094), the name and the extension
-// (253) never rejected one, and hosts bring room for it.
+// Kept: the pieces are copied whatever their length; hosts provide outputs as large as the whole path.
 void _splitpath(const char* path, char* drive, char* dir, char* fname, char* ext) {
   const std::string_view whole = view_of(path);
   const std::string_view root = whole.substr(0, whole.size() >= 2 && whole[1] == ':' ? 2 : 0);

@@ -56,7 +56,7 @@ std::string expand_tilde(std::string_view pattern) {
   return *home + std::string(pattern.substr(1 + user.size()));
 }
 
-/// A piece of a pattern: a path taken as it is, and the component behind it whose names are to be found.
+/// A piece of a pattern: a path that is used as it is, then a component whose matching names are searched for.
 struct Step {
   std::string path;
   vexa::GlobPattern names;
@@ -87,7 +87,7 @@ class Search {
     tail_ = std::move(path);
   }
 
-  /// Follows the pattern from `step` on, behind the path found so far. Returns 0 or PATHGLOB_ABORTED.
+  /// Follows the pattern from `step` on, after the path found so far. Returns 0 or PATHGLOB_ABORTED.
   int follow(const std::string& found, std::size_t step) {
     if (step == steps_.size()) {
       add_match(found + tail_);
@@ -125,7 +125,7 @@ class Search {
     if (directory == nullptr) return errno == ENOTDIR || goes_on_after(path, errno);
     // NOLINTNEXTLINE(concurrency-mt-unsafe): the directory is this thread's alone
     while (const dirent64* entry = readdir64(directory.get())) {
-      if (goes_deeper && entry->d_type == DT_REG) continue;  // nothing lies in a file
+      if (goes_deeper && entry->d_type == DT_REG) continue;  // a file has no entries
       if (pattern.matches(entry->d_name)) names.emplace_back(entry->d_name);
     }
     return true;
@@ -139,7 +139,7 @@ class Search {
   int flags_;
   ErrorCallback on_error_;
   std::vector<Step> steps_;
-  std::string tail_;  // what is taken as it is behind the last step
+  std::string tail_;  // used as it is after the last step
   std::vector<std::string> matches_;
 };
 

@@ -53,7 +53,7 @@ std::optional<std::string_view> name_of(char letter, const _SYSTEMTIME& fields) 
   }
 }
 
-// Kept: hundredths are rounded but never carried into the second, so the last one stands for 985 to 999 ms.
+// Kept: hundredths are rounded but never carried into the second, so 99 covers 985 to 999 ms.
 int hundredths(const _SYSTEMTIME& fields) { return std::min((fields.wMilliseconds + 5) / 10, 99); }
 
 /// The letters of fixed width.

@@ -16,10 +16,10 @@ struct TimeParts {
   int day_of_year;
 };
 
-/// What stands for `format` in CRealTime::Format.
+/// The text of `format` in CRealTime::Format.
 std::string format_time(const char* format, const TimeParts& parts);
 
-/// What stands for `format` in CRealTimeSpan::Format.
+/// The text of `format` in CRealTimeSpan::Format.
 std::string format_span(const char* format, std::int64_t ticks);
 
 }  // namespace vexa

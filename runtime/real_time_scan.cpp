@@ -73,7 +73,7 @@ FieldResult read_field(const ScanField& field, const ScannedText& text, _SYSTEMT
   return FieldResult::kRead;
 }
 
-/// Takes flags and letter of a directive from the front of `format`; null for a letter that reads nothing.
+/// Takes flags and letter of a directive from the front of `format`; null for a letter that reads no number.
 const ScanField* take_field(std::string_view& format) {
   format.remove_prefix(std::min(format.find_first_not_of("#-.0123456789"), format.size()));
   if (format.empty()) return nullptr;

@@ -30,7 +30,7 @@ constexpr unsigned char kLastNonTrail = 0xA0;
 // Length of the EUC-JP character at the head of `left` readable bytes, at least one.
 std::ptrdiff_t euc_length(const unsigned char* character, std::ptrdiff_t left) {
   if (character[0] <= kLastSingleByte) return 1;
-  // Safe: the last readable byte is never looked past; two or three bytes both step over the position asked for.
+  // Safe: no byte after the last readable one is read; two or three bytes both step over the position asked for.
   const bool three = character[0] == kThreeByteLead && left > 1 && character[1] > kLastNonTrail;
   return three ? 3 : 2;
 }

@@ -61,10 +61,11 @@ ThreadMap::node_type entry_for(ThreadHandle* handle) {
   return fitted ? std::move(entry) : ThreadMap::node_type();
 }
 
-// The calling thread's handle; null for a thread of other making.
+// The calling thread's handle; null for a thread that _beginthreadex did not start.
 ThreadHandle* handle_of_caller() VEXA_REQUIRES(thread_lock) {
   try {
-    // Kept: a thread of other making gets an entry with a null handle, which stays until its identifier is used again.
+    // Kept: a thread that _beginthreadex did not start gets an entry with a null handle, which stays until its
+    // identifier is used again.
     return threads()[pthread_self()];
   } catch (const std::bad_alloc&) {
     return nullptr;

@@ -17,7 +17,7 @@ struct Entries {
   nfds_t count = 0;
 };
 
-// Nothing when a handle is not an event or memory is short.
+// Nullopt when a handle is not an event or memory is short.
 std::optional<Entries> entries_of(unsigned long count, typedHandle* const* handles) {
   Entries entries;
   if (count == 0) return entries;

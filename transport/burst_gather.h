@@ -8,10 +8,13 @@
 
 namespace vexa {
 
-/// A thread that wakes for every datagram pays for the wake-up, not for the work. On a stream that trickles, a nap of
-/// up to 2 ms after the first datagram makes one wake-up of many; on a stream that comes in bursts, the burst is there
-/// when the thread wakes, and the nap is a wake-up too many. This one measures both: datagrams taken for each wake-up
-/// at once and after a nap. The better way is taken, the other tried now and then.
+/// Decides whether, and how long, the reader of a stream naps before it reads. Owned by RtpReception, used by the
+/// streaming thread; holds no socket and no clock.
+///
+/// A thread that wakes for each datagram pays for the wake-up more than for the work. On a stream that trickles, a nap
+/// of up to 2 ms after the first datagram makes one wake-up of many; on a stream that comes in bursts, the burst is
+/// there when the thread wakes, and the nap is a wake-up too many. This one measures both: datagrams taken for each
+/// wake-up at once and after a nap. The better way is taken, the other tried now and then.
 class BurstGather {
  public:
   static constexpr std::chrono::microseconds kLongest{2000};
@@ -49,13 +52,13 @@ class BurstGather {
  private:
   static constexpr double kWakeupsOfANap = 2;
   static constexpr unsigned kTrialInterval = 32;
-  static constexpr double kNews = 1.0 / 8;
+  static constexpr double kSmoothing = 1.0 / 8;
   static constexpr std::size_t kLargeBurst = 65536;  // a third of the smallest usual socket buffer
   static constexpr std::size_t kSmallBurst = 16384;
 
   void finish_burst() {
     double& taken = napped_ ? taken_after_nap_ : taken_at_once_;
-    taken += (static_cast<double>(datagrams_) - taken) * kNews;
+    taken += (static_cast<double>(datagrams_) - taken) * kSmoothing;
     if (napped_) fit_nap();
     datagrams_ = 0;
     bytes_ = 0;

@@ -10,7 +10,7 @@
 
 namespace vexa {
 
-/// Takes the lines of the CGI log. Used by any thread that speaks to the camera.
+/// Receives the lines of the CGI log. Used by any thread that sends requests to the camera.
 class ExchangeLog {
  public:
   virtual bool is_on() const = 0;
@@ -21,7 +21,7 @@ class ExchangeLog {
   ~ExchangeLog() = default;
 };
 
-/// Whom to ask, as whom, for how long; a copy, so that no setting changes in the middle of an exchange.
+/// The camera, the user and the time-out of an exchange; a copy, so that no setting changes in the middle of it.
 struct HttpPeer {
   SLibDConnectionInfo connection;
   ExchangeLog& log;
@@ -29,8 +29,8 @@ struct HttpPeer {
 };
 
 /// Requests `path` and reads the header of the answer: the non-blocking socket with the body left on it. An answer
-/// other than 200 and 204 is a failure with the camera's reason, LIBD_UNAUTHORIZED for 401. Connecting and reading may
-/// each block for the connection's time-out.
+/// other than 200 and 204 is a failure with the camera's reason, LIBD_UNAUTHORIZED for 401. Blocks for
+/// the connection's time-out at most three times: for connecting, the answer's first byte and the rest of its header.
 Result<Socket> open_http(const HttpPeer& peer, const std::string& path);
 
 /// Sends the inquiry `name`: the answer's body up to its first NUL, at most `most` bytes of it.

@@ -11,7 +11,7 @@
 namespace vexa {
 namespace {
 
-constexpr int kHeaderPause = 10;  // milliseconds between two looks at a header that is not complete
+constexpr int kHeaderPause = 10;  // milliseconds between two peeks at a header that is not complete
 constexpr std::size_t kPieceRoom = 4096;
 constexpr std::size_t kEndlessAnswer = std::size_t{32} << 20;
 

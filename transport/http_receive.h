@@ -11,7 +11,7 @@ namespace vexa {
 
 // A limit of 0 milliseconds or less looks once. The sockets stay the caller's.
 
-/// Takes a header off the socket and nothing else, so that the body stays for its reader: the header's length; 0 when
+/// Takes a header off the socket and no byte more, so that the body stays for its reader: the header's length; 0 when
 /// none came in time, the camera has closed, or it does not fit into `room`.
 Result<int> receive_header(int socket, std::span<char> room, WaitLimit limit);
 

@@ -1,4 +1,4 @@
-// Endless HTTP streams, one unit a call: pictures, text parts, elementary video.
+// HTTP streams without an end, read one unit at a time: pictures, text parts, elementary video.
 #pragma once
 
 #include <span>

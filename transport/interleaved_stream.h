@@ -12,7 +12,7 @@
 
 namespace vexa {
 
-/// Fills `room`; all its waits share the limit. Reads first and waits only when nothing is there.
+/// Fills `room`; all its waits share the limit. Reads first and waits only when no byte is there.
 Result<> receive_exactly(int socket, std::span<char> room, WaitLimit limit);
 
 struct InterleavedPacket {

@@ -28,7 +28,7 @@ ssize_t read_waiting(int socket, std::span<char> room, const Gathering& gatherin
   return receive_waiting_from(socket, room.data(), room.size(), *gathering.sender);
 }
 
-/// What is there after a nap in the middle of a picture; as receive_waiting.
+/// Reads after a nap in the middle of a picture; returns as receive_waiting does.
 ssize_t receive_after_nap(int socket, std::span<char> room, Gathering gathering) {
   if (gathering.gather == nullptr || !gathering.in_picture) return -1;
   const std::chrono::microseconds pause = gathering.gather->goes_on();

@@ -24,7 +24,7 @@ class WaitObserver {
   ~WaitObserver() = default;
 };
 
-/// How a stream's reader lets datagrams gather.
+/// How long a stream's reader lets datagrams gather before it reads them.
 struct Gathering {
   BurstGather* gather = nullptr;  ///< null: reads each datagram as it comes
   bool in_picture = false;        ///< some packets of a picture are there and the others are on their way
@@ -32,7 +32,7 @@ struct Gathering {
   std::uint32_t* sender = nullptr;  ///< out: the datagram's sender, an IPv4 address in network order; null: not asked
 };
 
-/// Reads the next datagram into `room`: its length. Reads first and waits only when nothing is there, so that a
+/// Reads the next datagram into `room`: its length. Reads first and waits only when none is there, so that a
 /// datagram costs one system call while data keep coming. Fails without a text when the stream is to end.
 Result<int> receive_datagram(StoppableSocket source, std::span<char> room, WaitLimit limit, Gathering gathering);
 

@@ -106,15 +106,15 @@ bool take_range_clock(std::string_view text, StreamClock clock) {
   return read.understood;
 }
 
-// Kept: every look is appended to the one before, and the answer is read after the last look, as far as there is room.
-// An answer that comes in one piece and fills no more than half the buffer stands whole at the buffer's beginning; of a
+// Kept: each peek is appended to the one before, and the answer is read after the last peek, as far as there is room.
+// An answer that comes in one piece and fills no more than half the buffer is whole at the buffer's beginning; of a
 // longer one, or one that came in pieces, only a part is seen.
 Result<int> receive_rtsp_answer(int socket, std::span<char> room, WaitLimit limit) {
   const int ready = WaitBudget(limit).wait_readable(socket);
   if (ready != 1) return wait_failure(ready, kReceiveTimedOut);
-  // Safe: nothing that stood in the buffer before is taken for the camera's.
+  // Safe: no byte that was in the buffer before is taken for the camera's.
   std::fill(room.begin(), room.end(), '\0');
-  // Kept: one look a second, for whole seconds; a time-out below a second sees no answer.
+  // Kept: one peek a second, for whole seconds; a time-out below a second sees no answer.
   const int looks = limit.milliseconds / kMillisecondsPerSecond;
   std::size_t filled = 0;
   int looked = 0;

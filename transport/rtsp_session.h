@@ -28,7 +28,7 @@ struct StreamClock {
   int& rtp_rate;  ///< ticks a second
 };
 
-/// Takes what `text` gives of the range clock; false when it is not understood to its end.
+/// Stores the range clock that `text` gives, as far as it can be read; false when that is not to its end.
 bool take_range_clock(std::string_view text, StreamClock clock);
 
 /// Takes an answer's header off the socket into `room`, and of what follows as much as has come: its length.
@@ -38,7 +38,7 @@ Result<int> receive_rtsp_answer(int socket, std::span<char> room, WaitLimit limi
 /// Binds a datagram socket to a port of its own: the port. The socket stays the caller's, also on failure.
 Result<int> bind_media_socket(int socket);
 
-/// In the place of a media port: RTP comes inside the connection.
+/// Instead of a media port: RTP comes inside the connection.
 inline constexpr int kInterleaved = 0;
 
 /// A datagram socket for media; invalid with errno on failure.
@@ -67,7 +67,7 @@ class RequestTrace {
   ~RequestTrace() = default;
 };
 
-/// Makes the requests of one session. Its state is in fields of its owner, which outlive it; used by the thread that
+/// Makes the requests of one session. Holds no socket of its own between calls: its state is in fields of the driver,
 /// owns them. Every request is traced.
 class RtspSession {
  public:

@@ -9,8 +9,8 @@
 
 namespace vexa {
 
-/// Owns a socket: closes it on every early exit, is released on success.
-/// Made where a connection is opened; one thread at a time has it.
+/// Owns a socket, or none (-1): closes it on each early exit, is released on success. One thread at a time; closing
+/// never waits for the peer.
 class Socket {
  public:
   Socket() = default;
@@ -38,13 +38,13 @@ struct StoppableSocket {
 /// One send; true when all bytes went. A peer that has closed gives EPIPE, never a signal.
 bool send_once(int socket, const char* bytes, std::size_t length);
 
-/// What waits at the socket, one read; -1 with errno, EAGAIN when nothing does. A signal does not end it.
+/// One read of what waits at the socket; -1 with errno, EAGAIN when no byte does. A signal does not end it.
 ssize_t receive_waiting(int socket, char* buffer, std::size_t length);
 
 /// The same for a datagram, with the IPv4 address that sent it, in network order; 0 where it has none.
 ssize_t receive_waiting_from(int socket, char* buffer, std::size_t length, std::uint32_t& sender);
 
-/// Shuts the socket down both ways and closes it; errors and -1 are passed over.
+/// Shuts the socket down both ways and closes it; errors and -1 are ignored.
 void shutdown_and_close(int socket);
 
 /// Set and clear O_NONBLOCK; false with errno on failure.

@@ -37,7 +37,7 @@ int WaitBudget::wait_closed(int descriptor) const { return wait(descriptor, POLL
 void WaitBudget::pause() const { wait_for(-1, 0, -1); }  // poll passes over -1
 
 int WaitBudget::wait(int descriptor, short events, int stop) const {
-  // Safe: poll would pass over -1 and wait in vain; a closed socket is an error at once.
+  // Safe: poll would ignore -1 and wait in vain; a closed socket is an error at once.
   if (descriptor < 0) {
     errno = EBADF;
     return -1;

@@ -19,7 +19,7 @@ struct WaitLimit {
   Cancels cancels{};
 };
 
-/// Milliseconds that one or several waits share: made before a loop it is shared by the loop's waits, made inside it is
+/// A time-out that one or several waits share: made before a loop it is shared by the loop's waits, made inside it is
 /// fresh for each. Every wait answers 1 (ready), 0 (the budget is used up, or the wait is cancelled) or -1 (errno says
 /// why); a signal does not end it, and a budget of 0 or less looks once. Waits by poll, so that any number of a
 /// descriptor will do.

@@ -23,7 +23,7 @@ class CameraHost {
   CameraHost(const CameraHost&) = delete;
   CameraHost& operator=(const CameraHost&) = delete;
 
-  // Starts all cameras, or none; then error() says why.
+  // Starts all cameras, or none; then error() has the reason.
   [[nodiscard]] bool start();
   void stop();
 

@@ -1,5 +1,5 @@
 // A network camera in software: HTTP commands and RTSP/RTP video, with a journal of what it was asked and faults on
-// demand. It shares no code with the driver library, so that each checks the other.
+// demand. On the wire it shares no code with the driver library, so that each checks the other.
 #ifndef VIRTUAL_CAMERA_VIRTUAL_CAMERA_H_
 #define VIRTUAL_CAMERA_VIRTUAL_CAMERA_H_
 
@@ -24,7 +24,8 @@ namespace vexa::camera {
 class CameraCore;
 class EventLoop;
 
-// All operations may be called from any thread but the camera's own (the journal's observer runs on that one).
+// One camera and the thread that serves it. All operations may be called from any thread but the camera's own (the
+// journal's observer runs on that one).
 class VirtualCamera {
  public:
   explicit VirtualCamera(CameraOptions options);                          // on a thread of its own
@@ -33,7 +34,7 @@ class VirtualCamera {
   VirtualCamera(const VirtualCamera&) = delete;
   VirtualCamera& operator=(const VirtualCamera&) = delete;
 
-  // Opens both ports. On failure returns false, and error() says why.
+  // Opens both ports. On failure returns false, and error() has the reason.
   [[nodiscard]] bool start();
   // Closes every connection and session. The journal and the sent log stay readable. Harmless when not running.
   void stop();
@@ -53,9 +54,9 @@ class VirtualCamera {
   [[nodiscard]] SettingsStore& settings();
   [[nodiscard]] AlarmScene& alarms();
   [[nodiscard]] Card& card();
-  // Where it looks now; nothing for a camera that does not know.
+  // Its present direction; none for a camera that does not know it.
   [[nodiscard]] std::optional<CameraPose> pose() const;
-  [[nodiscard]] PtzHead* ptz();  // null: nothing moves
+  [[nodiscard]] PtzHead* ptz();  // null: the camera does not move
   [[nodiscard]] Journal& journal();
   [[nodiscard]] SentLog& sent();
   [[nodiscard]] const PacketisedClip* clip() const;  // the clip streamed; valid after start(), null when none

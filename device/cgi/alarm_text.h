@@ -1,4 +1,4 @@
-// Alarm pins: the list a camera's inputs, outputs and detectors make, what answers and parts say of them, and when a
+// Alarm pins: the list of a camera's inputs, outputs and detectors, their states in the camera's answers, and when a
 // tampering alarm is cleared.
 #pragma once
 
@@ -21,13 +21,13 @@ SLibDPinInfo pin_of(std::int32_t number, ELibDPinType type, bool enabled = true)
 /// Appends the inputs, then the outputs; both are counted from 1.
 void append_pins(const SLibDFixedIoBoxInfo& fixed, std::vector<SLibDPinInfo>& pins);
 
-/// The number of the first detector: the one behind the inputs.
+/// The number of the first detector: the one after the inputs.
 std::int32_t first_detector_number(const SLibDFixedIoBoxInfo& fixed);
 
-/// Whether the detector of `key` ("TamperingFunc=") is switched on; also true when the answer does not tell.
+/// Whether the detector of `key` ("TamperingFunc=") is switched on; also true when the answer lacks the key.
 bool detector_enabled(std::string_view answer, std::string_view key);
 
-/// The tamper level that an answer tells, 0 for a word that is not known; nothing when it does not speak of it.
+/// The tamper level in an answer, 0 for an unknown word; nullopt when the answer lacks it.
 std::optional<std::int32_t> tamper_level_of(std::string_view answer);
 
 /// The inputs that the answer of the "sensor" inquiry names, in its order, with their states.

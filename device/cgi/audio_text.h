@@ -9,7 +9,8 @@
 
 namespace vexa {
 
-/// Puts codec, bit rate and frame size of an "AudInCodec=" value into the record; an unknown one changes nothing.
+/// Puts codec, bit rate and frame size of an "AudInCodec=" value into the record; an unknown one leaves the record as
+/// it is.
 void take_audio_codec(std::string_view value, SLibDAudioInfo& info);
 
 /// The "AudInCodec=" value that asks for the record's codec. Whatever is not "G726" asks for G.711.

@@ -16,7 +16,7 @@ constexpr std::size_t kLodSettings = 17;
 constexpr std::size_t kMostNumbers = 4;
 constexpr std::size_t kSettingRequestRoom = 1024;
 
-/// What stands behind the key of an item.
+/// What follows the key of an item.
 struct ItemValue {
   std::string_view word;
   std::array<std::int32_t, kMostNumbers> numbers{};
@@ -70,10 +70,10 @@ constexpr SettingForm kSettingForms[] = {{"Mode=", 0, store_nothing},           
                                          {"MinObjectSize=", 2, store_smallest}, {"MaxObjectSize=", 2, store_largest},
                                          {"CandidateFrame=", 1, store_nothing}};
 
-/// Behind "Win1" to "Win4".
+/// After "Win1" to "Win4".
 constexpr WindowForm kWindowForms[] = {{"=", 0, store_enabled}, {"Area=", 4, store_area}, {"Mode=", 0, store_mode}};
 
-/// The word that `text` begins with behind blanks, as scanf's "%s" takes it.
+/// The word that `text` begins with after blanks, as scanf's "%s" takes it.
 std::optional<ItemValue> read_word_value(std::string_view text) {
   constexpr char kBlanks[] = " \t\n\v\f\r";
   const std::size_t begin = text.find_first_not_of(kBlanks);

@@ -20,10 +20,10 @@ bool has_sensitivity(const SLibDDetectionParam& param);
 /// Whether the area of each window is two corners.
 bool has_areas(const SLibDDetectionParam& param);
 
-/// The settings that the answer of an LOD camera tells; empty when it lacks a known size or a sensitivity.
+/// The settings in an LOD camera's answer; empty when it lacks a known size or a sensitivity.
 std::vector<SLibDDetectionParam> lod_settings(std::string_view answer);
 
-/// Whether an answer says that detection follows the current view; nothing when it does not tell.
+/// Whether detection follows the presets or the current view; nullopt when the answer lacks it.
 std::optional<ELibDPositionMode> position_mode_of(std::string_view answer);
 
 /// The settings that an object-detection camera's answer lists. `has_presets`: one a detection number.

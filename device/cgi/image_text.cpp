@@ -17,9 +17,9 @@ constexpr struct {
   const char* word;
 } kExposureWords[] = {{kFullAuto, "full"}, {kShutterPriority, "shutter"}, {kIrisPriority, "iris"}};
 
-/// The value behind the first one that equals `current`.
+/// The value after the first one that equals `current`.
 template <typename Iterator>
-std::optional<int> value_behind(Iterator begin, Iterator end, int current) {
+std::optional<int> value_after(Iterator begin, Iterator end, int current) {
   const Iterator found = std::find_if(begin, end, [current](const auto& step) { return step.value == current; });
   if (found == end || std::next(found) == end) return std::nullopt;
   return std::next(found)->value;
@@ -61,8 +61,8 @@ int exposure_value(int level, int largest) {
 }
 
 std::optional<int> next_exposure_value(const ExposureSteps& steps, int current, int step) {
-  if (step > 0) return value_behind(steps.begin(), steps.end(), current);
-  return value_behind(steps.rbegin(), steps.rend(), current);
+  if (step > 0) return value_after(steps.begin(), steps.end(), current);
+  return value_after(steps.rbegin(), steps.rend(), current);
 }
 
 }  // namespace vexa

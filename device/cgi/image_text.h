@@ -25,7 +25,7 @@ inline constexpr Word<ELibDViewDRMode> kViewDrWords[] = {{LIBD_VIEWDR_OFF, "off"
 
 inline constexpr Word<ELibIRIlluminatorMode> kIlluminatorWords[] = {{LIB_IR_OFF, "off"}, {LIB_IR_DAYNIGHT, "daynight"}};
 
-/// What sets a day/night mode, behind "DayNightMode=".
+/// The text after "DayNightMode=" that sets a day/night mode.
 inline constexpr Word<ELibDDayNightType> kDayNightRequests[] = {{LIBD_DAYNIGHT_AUTO, "auto"},
                                                                 {LIBD_DAYNIGHT_DAY, "manual&DayNight=off"},
                                                                 {LIBD_DAYNIGHT_NIGHT, "manual&DayNight=on"}};
@@ -33,8 +33,7 @@ inline constexpr Word<ELibDDayNightType> kDayNightRequests[] = {{LIBD_DAYNIGHT_A
 inline constexpr Word<ELibVideoOutMode> kVideoOutWords[] = {
     {LIB_VIDEO_OUT_IP, "ip"}, {LIB_VIDEO_OUT_PAL, "pal"}, {LIB_VIDEO_OUT_NTSC, "ntsc"}};
 
-/// The day/night mode that an answer tells: LIBD_DAYNIGHT_UNKNOWN for words that are not known, nothing when the answer
-/// does not speak of it.
+/// The day/night mode in an answer: LIBD_DAYNIGHT_UNKNOWN for unknown words, nullopt when the answer lacks it.
 std::optional<ELibDDayNightType> day_night_of(std::string_view answer);
 
 /// The host's names of the exposure modes.
@@ -48,7 +47,7 @@ const char* exposure_word_of(std::string_view mode);
 /// What sets the brightness in an exposure mode.
 enum class ExposureControl { kShutter, kIris };
 
-/// The control of the exposure mode; nothing when the mode leaves none to the host.
+/// The control of the exposure mode; nullopt when the mode leaves none to the host.
 std::optional<ExposureControl> exposure_control_of(std::string_view mode);
 
 using ExposureModes = std::vector<SLibDBrightModeInfo>;
@@ -60,7 +59,7 @@ int exposure_entry(const ExposureModes& modes, std::string_view name);
 /// The value for a level of 0 to 10000 under the largest value, rounded half up, within 0 to 10000.
 int exposure_value(int level, int largest);
 
-/// The value one step on from `current`, up for `step` above 0, else down; nothing at the end of the list or when the
+/// The value one step from `current`, up for `step` above 0, else down; nullopt at the end of the list or when the
 /// list does not hold the value.
 std::optional<int> next_exposure_value(const ExposureSteps& steps, int current, int step);
 

@@ -74,7 +74,7 @@ std::optional<int> take_value(std::string_view& text) {
 void InputPartReader::read_sensors() {
   while (auto text = find("Sensor")) {
     step_past(kAfterSensor);
-    // Kept: a sensor's number counts as soon as it is read, with no value behind it and beyond the bits as well.
+    // Kept: a sensor's number counts as soon as it is read, with no value after it and beyond the bits as well.
     const auto number = take_int(*text);
     if (!number) continue;
     number_ = *number;
@@ -125,7 +125,7 @@ void InputPartReader::read_tampering() {
   auto text = find("Tampering");
   if (!text) return;
   step_past(kAfterTampering);
-  // Kept: the bits behind it move up although the item may have no value.
+  // Kept: the bits that follow move up although the item may have no value.
   ++number_;
   const auto value = take_value(*text);
   if (!value) return;

@@ -16,7 +16,7 @@ constexpr char kValid = '1';
 constexpr char kMoving = 'M';
 constexpr std::int64_t kRatioUnit = 10000;
 
-// Safe: a product that 64 bits do not hold stays at their limit, whatever a profile says.
+// Safe: a product that 64 bits cannot hold becomes their limit, whatever numbers a profile has.
 std::int64_t times(std::int64_t a, std::int64_t b) {
   constexpr std::int64_t kMost = std::numeric_limits<std::int64_t>::max();
   std::int64_t product = 0;
@@ -24,12 +24,12 @@ std::int64_t times(std::int64_t a, std::int64_t b) {
   return (a < 0) == (b < 0) ? kMost : -kMost;
 }
 
-/// A ratio of 0 says nothing.
+/// A ratio of 0 is not known.
 std::optional<std::int64_t> unless_zero(std::int64_t ratio) {
   return ratio == 0 ? std::nullopt : std::optional<std::int64_t>(ratio);
 }
 
-/// The magnification at a zoom position in units of 1/10000 of the table's; nothing when a ratio in question is 0.
+/// The magnification at a zoom position in units of 1/10000; nullopt when a ratio that is needed is 0.
 std::optional<std::int64_t> magnification(const std::vector<SLibDZoomRatioInt>& ratios, int zoom) {
   if (zoom <= ratios.front().position) return unless_zero(ratios.front().ratio * kRatioUnit);
   if (zoom >= ratios.back().position) return unless_zero(ratios.back().ratio * kRatioUnit);
@@ -68,7 +68,7 @@ std::optional<CameraPosition> read_position_text(const std::string& text) {
 
 int axis_angle(int position, int span, int angle_range, std::int64_t offset) {
   if (span == 0) return position;
-  // Safe: kept where its sign can be turned, as a picture upside down asks for.
+  // Safe: limited so that its sign can be changed, as for a picture upside down.
   return std::max(clamp_to_int(times(times(position - offset, angle_range), 1000) / span),
                   -std::numeric_limits<int>::max());
 }

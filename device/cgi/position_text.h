@@ -1,4 +1,4 @@
-// Where a camera looks: the text in its pictures, positions as angles, viewing angles by zoom.
+// A camera's position: the text in its pictures, positions as angles, viewing angles by zoom.
 #pragma once
 
 #include <cstdint>
@@ -11,7 +11,7 @@
 
 namespace vexa {
 
-/// What a position text says, in the camera's units.
+/// The contents of a position text, in the camera's units.
 struct CameraPosition {
   bool pan_valid = false;
   bool tilt_valid = false;
@@ -22,10 +22,10 @@ struct CameraPosition {
   bool moving = false;
 };
 
-/// Reads "CamPos: " with three flags and three numbers, and "M" behind them while the camera moves.
+/// Reads "CamPos: " with three flags and three numbers, and "M" after them while the camera moves.
 std::optional<CameraPosition> read_position_text(const std::string& text);
 
-/// The way from `offset` to `position` in thousandths of the unit of `angle_range`, which `span` units turn through;
+/// The angle from `offset` to `position` in thousandths of a degree, where `span` steps are `angle_range` degrees;
 /// the position itself for a span of 0.
 int axis_angle(int position, int span, int angle_range, std::int64_t offset);
 
@@ -34,8 +34,8 @@ struct ViewingAngles {
   int vertical;
 };
 
-/// The viewing angles at a zoom position, in ten-thousandths of the wide-end angles' unit where ratios count
-/// magnifications. Nothing without zoom ratios, or when a wide-end angle or a ratio in question is 0.
+/// The viewing angles at a zoom position, in ten-thousandths of a degree. Nullopt without zoom ratios, or when a
+/// wide-end angle or a ratio that is needed is 0.
 std::optional<ViewingAngles> viewing_angles(const std::vector<SLibDZoomRatioInt>& ratios,
                                             const SLibDFixedPanTiltInfo& camera, int zoom);
 

@@ -16,13 +16,13 @@ constexpr int kHostScale = 10000;
 constexpr int kContinuousDivisor = 100;
 constexpr int kWholeZoomStep = 4096;
 
-/// Cut to 16 bits in two's complement and widened back with its sign.
+/// The value cut to 16 bits in two's complement and widened back with its sign.
 int cut_to_16_bits(long long value) { return static_cast<std::int16_t>(static_cast<std::uint16_t>(value)); }
 
 // Counted in 64 bits throughout, so that no profile can overflow a product.
 long long share(long long amount, long long whole) { return amount * whole / kHostScale; }
 
-/// Takes what stands before the next comma; `rest` is then what follows it, nothing behind the last piece.
+/// Takes the piece before the next comma; `rest` is then what follows it, nullopt after the last piece.
 std::string_view take_piece(std::optional<std::string_view>& rest) {
   if (!rest) return {};
   const std::string_view piece = text_before(*rest, ',');
@@ -41,7 +41,7 @@ bool has_size(const SLibDResolutionInfo& picture) { return picture.width > 0 && 
 int continuous_speed(int speed) { return speed / kContinuousDivisor; }
 
 int move_speed(int speed, int largest) {
-  // Safe: kept where its sign can be turned, also under a largest speed that no camera has.
+  // Safe: limited so that its sign can be changed, also for a largest speed that no camera has.
   return held_between(share(std::abs(speed), largest), -std::numeric_limits<int>::max(),
                       std::numeric_limits<int>::max());
 }
@@ -82,7 +82,7 @@ int area_extent(int extent, int size) { return held_between(share(extent, size),
 
 std::vector<SLibDPresetInfo> unnamed_presets(int count) {
   std::vector<SLibDPresetInfo> presets;
-  // Safe: a negative count is no size.
+  // Safe: a negative count becomes no size.
   if (count > 0) presets.resize(static_cast<std::size_t>(count));
   for (std::size_t i = 0; i < presets.size(); ++i) presets[i].index = static_cast<std::int32_t>(i);
   return presets;

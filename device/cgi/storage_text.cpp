@@ -18,7 +18,7 @@ constexpr std::size_t kTimeWidth = 6;
 
 bool ends_value(char c) { return c == ',' || static_cast<unsigned char>(c) < ' '; }
 
-/// Reads the items of a record forward. A key that is not there, or an item behind which no further one can stand,
+/// Reads the items of a record forward. A key that is not there, or an item that no further one can follow,
 /// fails it for good.
 class RecordItems {
  public:
@@ -28,7 +28,7 @@ class RecordItems {
   std::string_view rest() const { return rest_; }
   bool next_is(std::string_view key) const { return rest_.starts_with(key); }
 
-  /// The value behind the key, from which another item follows.
+  /// The value after the key, from which another item follows.
   std::string_view take(std::string_view key) {
     const std::string_view value = take_last(key);
     if (!rest_.starts_with(',')) ok_ = false;
@@ -39,7 +39,7 @@ class RecordItems {
   std::string take_text(std::string_view key) { return std::string(take(key)); }
   int take_number(std::string_view key) { return leading_int(take_text(key)); }
 
-  /// The value behind the key, whatever ends it.
+  /// The value after the key, whatever ends it.
   std::string_view take_last(std::string_view key) {
     if (!rest_.starts_with(key)) ok_ = false;
     if (!ok_) return {};
@@ -112,7 +112,7 @@ std::vector<SLibDEdgeStorageRecord> read_recordings(std::string_view answer) {
 
 int free_kilobytes(std::string_view answer) {
   std::optional<std::string_view> size = cgi_value(answer, "ASlot=Free space : ");
-  // Kept: the unit is not looked at; cameras tell kilobytes.
+  // Kept: the unit is ignored; cameras report kilobytes.
   return size ? std::max(take_int(*size).value_or(0), 0) : 0;
 }
 

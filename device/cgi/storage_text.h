@@ -1,4 +1,4 @@
-// Recordings as the camera writes about them.
+// Recordings as the camera lists them.
 #pragma once
 
 #include <string_view>
@@ -8,7 +8,7 @@
 
 namespace vexa {
 
-/// The recordings of a search answer, in its order, up to the first one that is not as it must be.
+/// The recordings of a search answer, in its order, up to the first one that cannot be read.
 std::vector<SLibDEdgeStorageRecord> read_recordings(std::string_view answer);
 
 /// The free space of the card in kilobytes; 0 when the answer names none.

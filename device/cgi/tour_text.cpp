@@ -61,7 +61,7 @@ int resume_time_of(std::string_view answer, std::string_view switch_key, std::st
 
 bool read_tour_sequence(const std::string& text, std::vector<int>& sequence) {
   if (text.empty()) return true;
-  // Kept: a single preset is no sequence; cameras list at least two.
+  // Kept: a single preset does not count as a sequence; cameras list at least two.
   if (text.find(',') == std::string::npos) return false;
   for (std::optional<std::string_view> rest = text; rest; rest = text_after(*rest, ",")) {
     sequence.push_back(leading_int(std::string(text_before(*rest, ','))));

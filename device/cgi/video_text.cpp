@@ -38,8 +38,8 @@ StreamSize classic_size(int width) {
 
 }  // namespace
 
-PlacedValue value_behind(std::string_view answer, std::size_t key_at, std::size_t key_length) {
-  // Safe: a key said to lie beyond the answer has an empty value and no bytes are read.
+PlacedValue value_after(std::string_view answer, std::size_t key_at, std::size_t key_length) {
+  // Safe: a place beyond the answer gives an empty value, and no bytes are read.
   if (key_at > answer.size() || key_length > answer.size() - key_at) return {{}, answer.size()};
   const std::size_t start = key_at + key_length;
   const std::string_view value = text_before(answer.substr(start), '&');

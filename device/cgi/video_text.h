@@ -17,9 +17,9 @@ struct PlacedValue {
   std::size_t end;
 };
 
-/// The value of the key that stands at `key_at` and is `key_length` long, up to the next "&" or the end. Empty when the
-/// key does not lie in the answer.
-PlacedValue value_behind(std::string_view answer, std::size_t key_at, std::size_t key_length);
+/// The value of the key that begins at `key_at` and is `key_length` long, up to the next "&" or the end. Empty when the
+/// key is not within the answer.
+PlacedValue value_after(std::string_view answer, std::size_t key_at, std::size_t key_length);
 
 /// The key of one stream's setting: ("ImageCodec", 1) is "ImageCodec1=".
 std::string stream_key(const char* name, int stream);
@@ -34,13 +34,13 @@ ELibDVideoStandard video_standard_of(std::string_view value);
 struct StreamSize {
   int width;
   int height;
-  std::optional<std::string> text;  ///< nothing for a size that has no name
+  std::optional<std::string> text;  ///< nullopt for a size that has no name
 };
 
-/// Reads "width,height". A height of 0 stands for the classic height of the width.
+/// Reads "width,height". A height of 0 means the usual height of that width.
 StreamSize read_stream_size(std::string_view value);
 
-/// How a request names a codec and what bounds its data.
+/// How a request names a codec and what limits its data rate.
 struct CodecRequest {
   const char* word;     ///< the camera's word of the codec
   const char* rateKey;  ///< "BitRate" or "Quality"

@@ -22,7 +22,7 @@ constexpr const char* word_of(const Word<Value> (&table)[kRows], Value value) {
   return nullptr;
 }
 
-/// The value of a word; nothing for an unknown one.
+/// The value of a word; nullopt for an unknown one.
 template <typename Value, std::size_t kRows>
 constexpr std::optional<Value> value_of(const Word<Value> (&table)[kRows], std::string_view word) {
   for (const Word<Value>& row : table) {

@@ -14,7 +14,7 @@
 namespace vexa::host {
 namespace {
 
-// The driver sends at most this much of "user:password" and would cut the rest without a word.
+// The driver sends at most this much of "user:password" and would cut the rest without a report.
 constexpr std::size_t kLongestCredentials = 255;
 constexpr std::size_t kLargestFile = 4096;
 
@@ -56,7 +56,7 @@ std::optional<Problem> apply_password_file(const std::string& path, Credentials&
 
 std::optional<Problem> check(const Credentials& credentials) {
   if (credentials.user.find(':') != std::string::npos) {
-    return usage("a user name cannot hold a colon", "A password belongs into --password-file or --credentials.");
+    return usage("a user name cannot hold a colon", "A password goes into --password-file or --credentials.");
   }
   const std::string_view nul("\0", 1);
   if (credentials.user.find(nul) != std::string::npos || credentials.password.find(nul) != std::string::npos) {

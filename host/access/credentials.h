@@ -29,7 +29,7 @@ struct CredentialSources {
 // Fills the two environment sources from a process environment ("NAME=value" texts, null at the end).
 void read_environment(CredentialSources& sources, const char* const* environment);
 
-// Options win over the environment; what nobody gives is empty. Refusals name files and options, never their contents.
+// Options win over the environment; what neither gives is empty. Refusals name files and options, never their contents.
 [[nodiscard]] Result<Credentials> load_credentials(const CredentialSources& sources);
 
 }  // namespace vexa::host

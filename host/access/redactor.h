@@ -10,8 +10,7 @@
 
 namespace vexa::host {
 
-// Holds texts of its own and changes none of them once it is made: any thread may use one, and copies are independent.
-// Each part that prints for others owns a copy.
+// Replaces the password in texts. Holds a copy of it; immutable after construction, so any thread may use it.
 class Redactor {
  public:
   Redactor() = default;

@@ -9,7 +9,7 @@
 namespace vexa::host {
 
 // Whether a file's name ends with this extension, in capitals too. `extension` is in small letters, as ".mkv"; a name
-// that is nothing else does not have it.
+// that is only an extension does not have it.
 [[nodiscard]] inline bool has_extension(std::string_view file, std::string_view extension) {
   if (file.size() <= extension.size()) return false;
   const auto small = [](char letter) {

@@ -2,6 +2,8 @@
 
 #include <fmt/format.h>
 
+#include <nlohmann/json.hpp>
+
 namespace vexa::host {
 namespace {
 
@@ -24,6 +26,11 @@ std::string printable(std::string_view text) {
     }
   }
   return out;
+}
+
+std::string to_text(const nlohmann::ordered_json& json) {
+  constexpr int kIndent = 2;
+  return json.dump(kIndent, ' ', false, nlohmann::ordered_json::error_handler_t::replace) + "\n";
 }
 
 }  // namespace vexa::host

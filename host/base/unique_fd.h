@@ -9,7 +9,7 @@
 
 namespace vexa::host {
 
-// Owns a descriptor: of a file, a pipe or a socket. No lock: one thread at a time has it.
+// Owns one descriptor, or none (-1); moving hands it on. Never closes a descriptor that it does not own.
 class UniqueFd {
  public:
   UniqueFd() = default;

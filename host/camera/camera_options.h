@@ -1,4 +1,4 @@
-// The options that every command takes which speaks to a camera.
+// The options that all commands with a camera share.
 #ifndef HOST_CAMERA_CAMERA_OPTIONS_H_
 #define HOST_CAMERA_CAMERA_OPTIONS_H_
 
@@ -40,7 +40,7 @@ struct ModelOptions {
   int stream = 1;
 };
 
-// The options of every command that speaks to a camera, and those that name its profile and video stream.
+// The same, with those that name the camera's profile and video stream.
 void add_model_options(CLI::App& command, ModelOptions& options, const char* const* environment);
 
 // A driver that knows its camera; no camera has been contacted yet.

@@ -19,7 +19,7 @@ Json size_or_null(int width, int height) {
 Json number_or_null(int number) { return number > 0 ? Json(number) : Json(nullptr); }
 
 // Asks getters and keeps the first failure that is more than a setting which the camera does not report. A failure ends
-// the command, so that no earlier one's reason is in the way.
+// the command, so that an earlier failure's reason is not shown.
 class SettingReader {
  public:
   explicit SettingReader(CLibraryDevice& device) : device_(device) {}
@@ -28,7 +28,7 @@ class SettingReader {
   template <typename Value, typename Words>
   Json word(ELibDReturnCode (CLibraryDevice::*get)(Value&), const Words& words) {
     Value value{};
-    if (!told((device_.*get)(value))) return nullptr;
+    if (!was_reported((device_.*get)(value))) return nullptr;
     const auto word = word_for(words, value);
     return word ? Json(*word) : Json(nullptr);
   }
@@ -36,7 +36,7 @@ class SettingReader {
   void add_infrared(Json& settings) {
     ELibIRIlluminatorMode mode = LIB_IR_OFF;
     int strength = 0;
-    const bool read = told(device_.GetIRIlluminator(mode, strength));
+    const bool read = was_reported(device_.GetIRIlluminator(mode, strength));
     const auto word = word_for(kInfraredWords, mode);
     settings["infrared"] = read && word ? Json(*word) : Json(nullptr);
     settings["infrared-strength"] = read ? Json(strength) : Json(nullptr);
@@ -46,7 +46,7 @@ class SettingReader {
   [[nodiscard]] ELibDReturnCode failure() const { return failure_; }
 
  private:
-  bool told(ELibDReturnCode result) {
+  bool was_reported(ELibDReturnCode result) {
     const bool unreported = result == LIBD_NOT_SUPPORTED || (result == LIBD_FAILED && !left_a_reason(device_));
     if (result != LIBD_OK && !unreported && failure_ == LIBD_OK) failure_ = result;
     return result == LIBD_OK;

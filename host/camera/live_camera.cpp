@@ -6,13 +6,12 @@
 #include <algorithm>
 #include <atomic>
 #include <cstring>
-#include <string_view>
 
 #include "host/access/redactor.h"
-#include "host/base/number_text.h"
 #include "host/base/printable.h"
 #include "host/base/unique_fd.h"
 #include "host/console/interrupt.h"
+#include "host/words/card_mode.h"
 #include "vexa/cancel.h"
 #include "vexa/failure.h"
 #include "vexa/trace.h"
@@ -106,19 +105,7 @@ Result<CardMode> LiveCamera::card_mode() {
   const ELibDReturnCode result = SendInqCommand("edgestorage", answer);
   if (result != LIBD_OK) return fail(explain(result));
   CardMode mode;
-  SLibDEdgeStorageMode& recording = mode.recording;
-  std::string text;
-  recording.enabled = GetUrlParameter(answer, "Edgestorage=", text) && text == "on";
-  recording.imageNumber = 1;
-  GetUrlParameter(answer, "EsRec1=image", recording.imageNumber);
-  GetUrlParameter(answer, "EsAlmRec1WatchAddress=", recording.watchAddress);
-  if (GetUrlParameter(answer, "EsAlmRec1Time=", text)) {
-    std::string_view times = text;
-    recording.alarmTime1 = take_number<int>(times).value_or(0);
-    const std::size_t comma = times.find(',');
-    times.remove_prefix(comma == std::string_view::npos ? times.size() : comma + 1);
-    recording.alarmTime2 = take_number<int>(times).value_or(0);
-  }
+  mode.recording = read_card_mode(answer);
   mode.free_kilobytes = std::max(CheckEdgeStorageFreeSize(), 0);
   return mode;
 }

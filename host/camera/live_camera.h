@@ -51,9 +51,8 @@ struct CardMode {
   int free_kilobytes = 0;  // 0 also when no card is there
 };
 
-// A model class for any camera that streams video.
-// One for each camera that a command speaks to. Any thread may call it, as any driver; explain() only after a call on
-// the same thread.
+// A driver for any camera that streams video, whatever its model. Owned by a command; its operations may be called from
+// any thread, as the driver's.
 class LiveCamera final : public CVexaCommon {
  public:
   // Gives the driver the camera's address; contacts no camera.

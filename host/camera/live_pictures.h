@@ -18,7 +18,8 @@ struct PictureGroup {
   std::vector<FrameBytes> frames;  // from a key frame to the picture's own
 };
 
-// Keeps what it takes to decode the newest picture. One thread polls; any may ask for the newest.
+// Keeps the pictures that are needed to decode the newest one. Owned by a command; one thread polls, any may ask for
+// the newest.
 class LivePictures final : private CDataSink {
  public:
   enum class Polled { kPicture, kNone, kSilent };

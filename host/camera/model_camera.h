@@ -11,7 +11,8 @@
 
 namespace vexa::host {
 
-// Made once by each command and owned by it; used by the command's thread alone.
+// Owns the driver of one camera for the length of a command, and a second driver for video. One thread, that of the
+// command; the drivers themselves may be used by any. Never shows the password: failures are worded by explain().
 class ModelCamera {
  public:
   // Asks the camera for its model and makes that model's driver. A model without a profile gets the common driver.

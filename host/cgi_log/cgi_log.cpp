@@ -19,7 +19,7 @@ namespace {
 
 using Direction = CgiLogLine::Direction;
 
-// "0" stands for a digit.
+// "0" is any digit.
 constexpr std::string_view kStamp = "00-00-0000\t00:00:00.000\tCGI\t";
 constexpr std::string_view kBannerStamp = "\n00-00-0000 00:00:00.000";
 constexpr std::string_view kTo = "To\t";

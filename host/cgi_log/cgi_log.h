@@ -24,7 +24,7 @@ struct CgiLogLine {
   std::string message;  // the path of a request, or the status and reason of an answer
 };
 
-// `text` is a line without the line break that begins it. Nothing when it is not one that the driver writes.
+// `text` is a line without the line break that begins it. Nullopt when it is not one that the driver writes.
 [[nodiscard]] std::optional<CgiLogLine> parse_cgi_log_line(std::string_view text);
 
 struct CgiRequest {
@@ -45,11 +45,12 @@ struct CgiExchange {
   std::optional<CgiRequest> request;
   std::optional<CgiAnswer> answer;
 
-  // Nothing without both, nor when the clock was put back between them.
+  // Nullopt without both, and when the clock was put back between them.
   [[nodiscard]] std::optional<std::chrono::milliseconds> duration() const;
 };
 
-// Takes a log's bytes in pieces of any size, and passes on each exchange as soon as it is complete.
+// Takes a log's bytes in pieces of any size, and passes on each exchange as soon as it is complete. Used by one thread;
+// opens no file.
 class CgiLogReader {
  public:
   using Take = std::function<void(const CgiExchange&)>;
@@ -63,7 +64,7 @@ class CgiLogReader {
   void settle();
   // Another file follows, whose answers may be those to the requests of this one.
   void begin_file();
-  // Nothing follows: a request that still waits has got no answer.
+  // The log ends: a request that still waits has got no answer.
   void finish();
 
   [[nodiscard]] std::size_t lines() const { return lines_; }
@@ -89,7 +90,7 @@ class CgiLogReader {
 [[nodiscard]] std::string table_head();
 // One line, with its end. The camera's own words come last, so that they can pass for no other column.
 [[nodiscard]] std::string table_row(const CgiExchange& exchange, const Redactor& redactor);
-// One line of JSON, with its end; null for what there is not. It is in ASCII, all control characters escaped.
+// One line of JSON, with its end; null for what is missing. It is in ASCII, all control characters escaped.
 [[nodiscard]] std::string json_row(const CgiExchange& exchange, const Redactor& redactor);
 
 // The driver does not report a log that it cannot write, so this does. Creates the file.

@@ -13,17 +13,18 @@
 
 namespace vexa::host {
 
-// Owns the descriptor of the file that it reads. One thread: the one that prints the log.
+// Reads a log that another process is writing. Owned by one command and used on its thread; never writes and never
+// waits: the caller pauses between two reads.
 class FollowedFile {
  public:
   explicit FollowedFile(std::string path) : path_(std::move(path)) {}
 
   [[nodiscard]] std::optional<Problem> open();
   [[nodiscard]] bool is_regular() const;
-  // How many bytes were read; 0 at the end, as it is now.
+  // The number of bytes read; 0 at the present end.
   [[nodiscard]] Result<std::size_t> read(std::span<char> room);
-  // At the end: whether there is another file of that name by now, or this one has been emptied. Reading goes on at
-  // its beginning then.
+  // At the end: whether the name now leads to another file, or this one has been emptied. Reading then goes on at the
+  // beginning.
   [[nodiscard]] bool begin_successor();
 
  private:

@@ -37,7 +37,7 @@ CameraAction& ActionGroup::chosen() const {
 Problem model_lacks(const ModelCamera& camera, const std::string& part) {
   const Profile& profile = camera.profile();
   if (profile.name.empty()) {
-    return usage(fmt::format("no profile says what cameras of model {} can do", printable(profile.model)),
+    return usage(fmt::format("there is no profile for cameras of model {}", printable(profile.model)),
                  "Name one with --profile; vexactl profile list shows those installed.");
   }
   return usage(fmt::format("cameras of model {} have no {}", printable(profile.model), part),

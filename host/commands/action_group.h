@@ -12,7 +12,8 @@
 
 namespace vexa::host {
 
-// One action of such a command. Its group owns it and runs at most one, on the program's main thread.
+// One action of such a command. Owned by its group; runs once, on the main thread, after the camera has been
+// identified.
 class CameraAction {
  public:
   CameraAction() = default;
@@ -41,11 +42,10 @@ struct ActionGroupText {
   const char* footer;
 };
 
-// What all actions of a group need of a camera's model.
+// Checks what all actions of a group need of a camera's model.
 using ModelCheck = std::optional<Problem> (*)(const ModelCamera&);
 
-// The command itself: reads which action was asked for, checks it, opens the camera and runs it. Owned by the command
-// line; main thread.
+// Declares the actions, opens the camera that they share, and runs the chosen one. Owned by the command line.
 class ActionGroup final : public Command {
  public:
   ActionGroup(ActionGroupText text, ModelCheck check_model, std::vector<std::unique_ptr<CameraAction>> actions)
@@ -67,7 +67,7 @@ class ActionGroup final : public Command {
 // The problem of a model without `part`, or of one that no profile describes.
 [[nodiscard]] Problem model_lacks(const ModelCamera& camera, const std::string& part);
 
-// What a change of `what` comes to.
+// Reports that `what` could not be changed, unless `result` is LIBD_OK; returns the exit code.
 ExitCode report_change(const ModelCamera& camera, Terminal& terminal, const std::string& what, ELibDReturnCode result);
 
 }  // namespace vexa::host

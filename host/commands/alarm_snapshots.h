@@ -12,7 +12,8 @@
 
 namespace vexa::host {
 
-// Plays a camera's video beside its alarms, on a thread of its own, so that the newest picture is at hand.
+// Plays a camera's video beside its alarms, on a thread of its own, so that the newest picture is ready. Owned by the
+// watch; writes files on the caller's thread.
 class AlarmSnapshots {
  public:
   // Pictures go into `folder`, which exists.
@@ -21,7 +22,7 @@ class AlarmSnapshots {
   AlarmSnapshots(const AlarmSnapshots&) = delete;
   AlarmSnapshots& operator=(const AlarmSnapshots&) = delete;
 
-  // Comes back once a picture is at hand. `camera` outlives this.
+  // Returns once there is a picture. `camera` outlives this.
   [[nodiscard]] std::optional<Problem> start(const ModelCamera& camera);
 
   // Writes the newest picture as "FOLDER/MOMENT-KIND-NUMBER.jpg".

@@ -6,7 +6,7 @@
 #include <optional>
 #include <vector>
 
-#include "host/base/json_text.h"
+#include "host/base/printable.h"
 #include "host/camera/model_camera.h"
 #include "host/commands/alarm_snapshots.h"
 #include "host/commands/alarm_watch.h"

@@ -5,7 +5,6 @@
 #include <nlohmann/json.hpp>
 #include <utility>
 
-#include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/camera/model_camera.h"
 #include "host/commands/command.h"

@@ -13,7 +13,8 @@ class App;
 
 namespace vexa::host {
 
-// The command line owns all commands and runs the one that was typed, on the program's main thread.
+// Owned by the command line; declared once, run at most once, on the main thread. Never ends the process itself: the
+// exit code is its result.
 class Command {
  public:
   Command() = default;

@@ -7,7 +7,7 @@
 #include <optional>
 #include <vector>
 
-#include "host/base/json_text.h"
+#include "host/base/printable.h"
 #include "host/camera/model_camera.h"
 #include "host/commands/command.h"
 #include "host/commands/detection_picture.h"
@@ -124,7 +124,7 @@ class DetectionCommand final : public Command {
     return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera.explain_change("detection", result));
   }
 
-  // The setting as the camera reports it; a new one, whole, where it reports none of that number.
+  // The setting as the camera reports it; a new one, with its windows off, where it reports none of that number.
   SLibDDetectionParam chosen(const ModelCamera& camera, const std::vector<SLibDDetectionParam>& settings) const {
     if (camera.profile().lodDetection && !settings.empty()) return settings.front();
     for (const SLibDDetectionParam& setting : settings) {

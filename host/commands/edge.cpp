@@ -6,7 +6,6 @@
 #include <nlohmann/json.hpp>
 #include <optional>
 
-#include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/commands/edge_actions.h"
 #include "host/console/terminal.h"
@@ -154,7 +153,7 @@ class DeleteRecordingsAction final : public CameraAction {
     return found ? std::nullopt : std::optional(found.error());
   }
 
-  // Nothing when nobody is there to answer.
+  // Nullopt when there is no one to answer.
   [[nodiscard]] std::optional<std::string> ask(Terminal& terminal) const {
     terminal.say(all_ ? "Delete all recordings? [y/N]"
                       : fmt::format("Delete the recording {}? [y/N]", printable(name_)));

@@ -7,7 +7,6 @@
 #include <filesystem>
 #include <nlohmann/json.hpp>
 
-#include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/commands/edge_actions.h"
 #include "host/console/interrupt.h"
@@ -23,7 +22,7 @@ namespace {
 
 using Json = nlohmann::ordered_json;
 
-// What came of a recording.
+// The result of playing a recording.
 struct TakenRecording {
   std::string name;
   std::string file;  // empty: only counted
@@ -83,7 +82,7 @@ class PlaybackAction : public CameraAction {
 
   [[nodiscard]] const std::string& name() const { return name_; }
 
-  // Takes the recording to its end, or as far as it comes.
+  // Plays the recording to its end, or as far as it comes.
   TakenRecording take(const ModelCamera& camera, const SLibDEdgeStorageRecord& record, PictureTarget* target,
                       Terminal& terminal) const {
     TakenRecording taken{record.streamName, target != nullptr ? target->path() : "", RecordingEnd::kSilent, {}, {}};
@@ -112,14 +111,14 @@ class PlaybackAction : public CameraAction {
     return taken;
   }
 
-  ExitCode tell(const TakenRecording& taken, Terminal& terminal) const {
+  ExitCode report(const TakenRecording& taken, Terminal& terminal) const {
     const ExitCode written = write_result(terminal, json() ? to_text(object_of(taken)) : line_of(taken));
     return taken.problem ? terminal.report(*taken.problem) : written;
   }
 
  private:
   [[nodiscard]] PlaybackLimits limits(const ModelCamera& camera, const SLibDEdgeStorageRecord& record) const {
-    // Recordings of a picture a second are no silent ones.
+    // A recording with a picture a second is not silent.
     const std::chrono::milliseconds two_pictures(2000 / std::clamp(record.frameRate, 1, 1000));
     return {end_of(record), scale_, std::max(two_pictures, std::chrono::milliseconds(camera.timeout_ms()))};
   }
@@ -150,7 +149,7 @@ class PlayRecordingAction final : public PlaybackAction {
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
     const Result<SLibDEdgeStorageRecord> found = find_recording(camera, name());
     if (!found) return terminal.report(found.error());
-    return tell(take(camera, *found, nullptr, terminal), terminal);
+    return report(take(camera, *found, nullptr, terminal), terminal);
   }
 };
 
@@ -181,11 +180,11 @@ class GetRecordingAction final : public PlaybackAction {
                               fmt::format("End --out in {} or .mkv.", usual_extension(*codec))});
     }
     const std::unique_ptr<PictureTarget> file = target().open();
-    return tell(take(camera, *record, file.get(), terminal), terminal);
+    return report(take(camera, *record, file.get(), terminal), terminal);
   }
 
  private:
-  // A file always: "./-" for one that is named "-".
+  // Always a file: "./-" for one that is named "-".
   [[nodiscard]] RecordingTarget target() const { return RecordingTarget(out_ == "-" ? "./-" : out_, -1); }
 
   std::string out_;

@@ -5,7 +5,6 @@
 #include <nlohmann/json.hpp>
 
 #include "host/base/codec.h"
-#include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/camera/camera_options.h"
 #include "host/commands/command.h"

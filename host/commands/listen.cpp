@@ -10,7 +10,6 @@
 #include <iterator>
 #include <nlohmann/json.hpp>
 
-#include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/camera/camera_options.h"
 #include "host/commands/command.h"

@@ -4,7 +4,6 @@
 #include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
-#include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/commands/action_group.h"
 #include "host/console/terminal.h"
@@ -106,7 +105,7 @@ class ListPresetsAction final : public CameraAction {
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
     std::vector<SLibDPresetInfo> presets;
     const ELibDReturnCode result = camera.device().GetPresets(presets);
-    // A camera that names no preset is no failure; the driver leaves the list unnamed.
+    // A camera without preset names is no failure; the driver leaves the list unnamed.
     if (result != LIBD_OK && !(result == LIBD_FAILED && !left_a_reason(camera.device()))) {
       return terminal.report(camera.explain(result));
     }

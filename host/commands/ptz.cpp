@@ -36,7 +36,7 @@ struct MoveOptions {
   }
 };
 
-// Some cameras have so few speeds that the slowest percents come to none.
+// Some cameras have so few speeds that the lowest percentages give speed 0.
 std::optional<Problem> check_speed(const ModelCamera& camera, int percent, int highest) {
   if (camera.profile().continuousPtz || percent * highest >= 100) return std::nullopt;
   return usage(
@@ -317,7 +317,7 @@ class StopAction final : public CameraAction {
     return group.add_subcommand("stop", "Stop every motion: pan, tilt, zoom and focus");
   }
 
-  // What can be stopped is, also when something else could not.
+  // Stops everything that can be stopped, also when one stop fails.
   ExitCode run(const ModelCamera& camera, Terminal& terminal) override {
     CLibraryDevice& device = camera.device();
     ExitCode code = report_change(camera, terminal, "pan and tilt", device.PanTilt(0, 0));

@@ -6,7 +6,6 @@
 #include <chrono>
 #include <nlohmann/json.hpp>
 
-#include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/camera/camera_options.h"
 #include "host/camera/video_options.h"
@@ -138,7 +137,7 @@ class RecordCommand final : public Command {
   }
 
  private:
-  // Cameras that send a picture a second are no silent ones.
+  // A camera that sends a picture a second is not silent.
   [[nodiscard]] std::chrono::milliseconds silence() const {
     return std::max(kShortestSilence, std::chrono::milliseconds(options_.camera.timeout_ms));
   }

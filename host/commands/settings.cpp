@@ -1,11 +1,11 @@
-// vexactl settings, set and daynight: how a camera is set, and changing it.
+// vexactl settings, set and daynight: shows and changes a camera's settings.
 #include <fmt/format.h>
 
 #include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 #include <utility>
 
-#include "host/base/json_text.h"
+#include "host/base/printable.h"
 #include "host/camera/camera_settings.h"
 #include "host/commands/command.h"
 #include "host/console/terminal.h"

@@ -4,8 +4,8 @@
 #include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
-#include "host/base/json_text.h"
 #include "host/base/number_text.h"
+#include "host/base/printable.h"
 #include "host/commands/action_group.h"
 #include "host/console/terminal.h"
 #include "host/words/setting_words.h"

@@ -4,7 +4,6 @@
 #include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
-#include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/camera/camera_options.h"
 #include "host/camera/live_pictures.h"

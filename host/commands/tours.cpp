@@ -5,8 +5,8 @@
 #include <algorithm>
 #include <nlohmann/json.hpp>
 
-#include "host/base/json_text.h"
 #include "host/base/number_text.h"
+#include "host/base/printable.h"
 #include "host/commands/action_group.h"
 #include "host/console/terminal.h"
 #include "host/words/setting_words.h"

@@ -8,7 +8,7 @@
 
 namespace vexa::host {
 
-// Redraws the line four times a second at most, however often it is asked to.
+// Redraws the line four times a second at most, however often it is asked to. Used by the thread that does the work.
 class Progress {
  public:
   // The terminal outlives this.

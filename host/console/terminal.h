@@ -11,7 +11,8 @@
 
 namespace vexa::host {
 
-// Thread-safe: the driver's trace arrives on a thread of its own.
+// One a process, made by main(). Thread-safe, because the driver's trace arrives on a thread of its own. Never prints a
+// result on standard error.
 class Terminal {
  public:
   // Results go to `results`, which the terminal owns. Progress is shown when standard error is a terminal.
@@ -31,7 +32,7 @@ class Terminal {
 
   [[nodiscard]] bool shows_progress() const { return shows_progress_; }
   void silence_progress() { shows_progress_ = false; }
-  // Replaces the progress line; does nothing without a terminal.
+  // Replaces the progress line; has no effect without a terminal.
   void progress(std::string_view line);
   void clear_progress();
 

@@ -1,5 +1,6 @@
-#include <poll.h>
 #include <vexa/models.h>
+#include <vexa/vexa_common.h>
+#include <vexa/waiting.h>
 
 #include <fstream>
 #include <iostream>
@@ -28,12 +29,13 @@ std::string reason(CLibraryDevice& camera, ELibDReturnCode code) {
 }
 
 // Takes frames until there are enough; the stream is open.
-ELibDReturnCode record(CLibraryDevice& camera, Recording& recording, int frames) {
+ELibDReturnCode record(CVexaCommon& camera, Recording& recording, int frames) {
   SLibDVideoFrameInfo frame;
   frame.sink = &recording;
   while (recording.frames < frames && recording.file) {
     const ELibDReturnCode result = camera.GetCurrentVideoFrame(frame);
-    if (result == LIBD_NO_FRAME) poll(nullptr, 0, 3);  // milliseconds; none waits yet
+    // Sleeps until a frame comes or a silence of the camera is to be reported.
+    if (result == LIBD_NO_FRAME) vexa::WaitForVideoFrame(camera, -1);
     // LIBD_TIMEOUT: the camera has been silent for longer than the connection's time-out.
     if (result != LIBD_OK && result != LIBD_NO_FRAME) return result;
   }
@@ -66,7 +68,7 @@ int main(int argc, char** argv) {
   Recording recording;
   result = camera->StartVideoStreaming();
   if (result != LIBD_OK) return failed("cannot open the video", reason(*camera, result));
-  result = record(*camera, recording, 250);
+  result = record(static_cast<CVexaCommon&>(*camera), recording, 250);  // every driver of MakeDevice is one
   const std::string why = reason(*camera, result);
   camera->StopVideoStreaming();
   if (result != LIBD_OK) return failed("the video has ended early", why);

@@ -13,8 +13,8 @@
 
 namespace vexa::host {
 
-// Opened with the first picture, so that a recording that never begins leaves no empty file, nor a former recording
-// emptied.
+// Opened with the first picture, so that a recording that never begins leaves no empty file and does not empty a former
+// recording. Owned by a command, used on its thread.
 class FrameFile final : public PictureTarget {
  public:
   explicit FrameFile(std::string path) : path_(std::move(path)) {}
@@ -26,7 +26,7 @@ class FrameFile final : public PictureTarget {
   [[nodiscard]] std::optional<Problem> write(const RecordedPicture& picture) override {
     return write(picture.data, picture.length);
   }
-  // Writes over what stands in a file of its own, `at` bytes from its beginning.
+  // Overwrites a part of a file of its own, `at` bytes from its beginning.
   [[nodiscard]] std::optional<Problem> overwrite(std::size_t at, const unsigned char* data, std::size_t length);
   [[nodiscard]] std::optional<Problem> close() override;
   [[nodiscard]] const std::string& path() const override { return path_; }

@@ -151,7 +151,7 @@ class MediaContainer::Muxer {
   AVStream* stream_ = nullptr;  // the context's
   std::optional<std::chrono::microseconds> began_;
   std::int64_t last_ = -1;
-  bool begun_ = false;  // the header stands in the file
+  bool begun_ = false;  // the header is written
 };
 
 std::optional<Problem> MediaContainer::check() const { return FrameFile(path_).check(); }

@@ -21,7 +21,8 @@ struct RecordedPicture {
   std::chrono::microseconds time{0};  // since 1970
 };
 
-// A command owns one for each recording. The thread that records calls it; no two threads at a time.
+// Writes pictures to one file. Owned by the command that records, used on its thread. Creates no file before the first
+// picture.
 class PictureTarget {
  public:
   PictureTarget() = default;

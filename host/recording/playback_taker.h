@@ -19,7 +19,7 @@ struct PlaybackLimits {
   std::chrono::milliseconds silence{5000};  // longest wait for a picture before the end
 };
 
-// What has come of a playback so far. Times are those of the pictures as they were recorded, since 1970.
+// The figures of a playback so far. Times are those of the pictures as they were recorded, since 1970.
 struct PlaybackProgress {
   std::uint64_t frames = 0;
   std::uint64_t bytes = 0;

@@ -1,4 +1,4 @@
-// Moves live pictures from a driver to their file.
+// Writes live pictures from a driver to a file.
 #ifndef HOST_RECORDING_RECORDER_H_
 #define HOST_RECORDING_RECORDER_H_
 
@@ -29,15 +29,15 @@ enum class RecordingEnd { kComplete, kInterrupted, kSilent, kNoKeyPicture, kCann
 // Its word in JSON, such as "complete".
 [[nodiscard]] const char* name_of(RecordingEnd end);
 
-// Copies and returns, as the driver asks: it holds its queue meanwhile.
+// Receives one frame from the driver. Copies and returns, because the driver holds its queue meanwhile.
 class PictureBytes final : public CDataSink {
  public:
   void Write(const unsigned char* data, unsigned int length) override { bytes.assign(data, data + length); }
   std::vector<unsigned char> bytes;
 };
 
-// One for each recording, on the thread that polls the driver. Owns neither the driver nor the target, which outlive
-// it.
+// Polls one driver and passes its frames to the target. Made by a command and used on its thread; owns neither driver
+// nor target. Never starts or stops the video.
 class Recorder {
  public:
   using Clock = RecordingMeter::Clock;

@@ -1,4 +1,4 @@
-// What a recording has amounted to so far.
+// The figures of a recording so far.
 #ifndef HOST_RECORDING_RECORDING_METER_H_
 #define HOST_RECORDING_RECORDING_METER_H_
 
@@ -12,8 +12,8 @@
 
 namespace vexa::host {
 
-// Times are the host's, of a picture's arrival: live pictures carry no time stamps of their own.
-// Owned by a recorder and used by its thread.
+// Counts pictures, bytes and losses of one recording, on the recording's thread. Times are the host's, of a picture's
+// arrival: live pictures carry no time stamps of their own.
 class RecordingMeter {
  public:
   using Clock = std::chrono::steady_clock;
@@ -39,8 +39,8 @@ class RecordingMeter {
   [[nodiscard]] double mean_bit_rate() const;
 
   // Pictures that a stream of the stated rate has sent from the first one received until now; nullopt when no rate is
-  // stated. One picture may be on its way. A camera that runs slower than it says counts as losing pictures: an
-  // estimate.
+  // stated. One picture may not have arrived yet. A camera that runs slower than its settings counts as losing
+  // pictures: an estimate.
   [[nodiscard]] std::optional<std::uint64_t> expected_frames(Clock::time_point now) const;
   // Of those, the ones that did not come.
   [[nodiscard]] std::optional<std::uint64_t> missing_frames(Clock::time_point now) const;

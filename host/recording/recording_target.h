@@ -18,9 +18,9 @@ class RecordingTarget {
   RecordingTarget(std::string out, int standard_output) : out_(std::move(out)), standard_output_(standard_output) {}
 
   [[nodiscard]] bool is_standard_output() const { return out_ == "-"; }
-  // Reports early that nothing could be written.
+  // Reports early that the target cannot be written.
   [[nodiscard]] std::optional<Problem> check() const;
-  // The codec that the name stands for; nullopt when any can go there.
+  // The codec that the name implies; nullopt when any can go there.
   [[nodiscard]] std::optional<Codec> codec() const;
   [[nodiscard]] std::unique_ptr<PictureTarget> open() const;
 

@@ -17,15 +17,14 @@ enum class SoundFormat { kRaw, kWave };
 // sound as it came.
 [[nodiscard]] SoundFormat sound_format_of(const std::string& file);
 
-// Puts the sound behind a WAVE header, or as it comes where the format has none. Its command owns it and the file, and
-// writes from one thread.
+// Writes sound with the header that its format needs. Used on the command's thread; does not own the file.
 class SoundFile {
  public:
   // `file` is opened with the first sound.
   SoundFile(FrameFile& file, SoundFormat format) : file_(file), format_(format) {}
 
   [[nodiscard]] std::optional<Problem> write(const unsigned char* sound, std::size_t length);
-  // Tells the WAVE header how much there is.
+  // Writes the length into the WAVE header.
   [[nodiscard]] std::optional<Problem> close();
   [[nodiscard]] std::uint64_t bytes() const { return bytes_; }
 

@@ -24,14 +24,14 @@ std::string kind_of(const SLibDPinInfo& pin) {
 }
 
 std::vector<SLibDPinInfo> PinStates::changed(const std::vector<SLibDPinInfo>& pins) {
-  std::vector<SLibDPinInfo> news;
+  std::vector<SLibDPinInfo> result;
   for (const SLibDPinInfo& pin : pins) {
     int& state = states_[{pin.type, pin.number}];
     if (state == pin.state) continue;
     state = pin.state;
-    news.push_back(pin);
+    result.push_back(pin);
   }
-  return news;
+  return result;
 }
 
 std::string alarm_line(const SLibDPinInfo& pin, const std::string& moment, WatchFormat format) {

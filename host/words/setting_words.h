@@ -47,7 +47,7 @@ template <typename Words, typename Value>
   return std::nullopt;
 }
 
-// What `vexactl set` is asked to change.
+// The changes that `vexactl set` is to make.
 struct SettingChanges {
   std::optional<Codec> codec = {};
   std::optional<SLibDResolutionInfo> size = {};
@@ -67,7 +67,7 @@ struct SettingChanges {
   [[nodiscard]] bool of_stream() const { return codec || size || frame_rate || bit_rate || quality || rotation; }
 };
 
-// Reads "KEY=VALUE" texts, each key once; a refusal says what the key takes.
+// Reads "KEY=VALUE" texts, each key once; a refusal names the values that the key takes.
 [[nodiscard]] Result<SettingChanges> parse_changes(const std::vector<std::string>& texts);
 
 // "on" or "off".

@@ -4,7 +4,6 @@
 
 #include <nlohmann/json.hpp>
 
-#include "host/base/json_text.h"
 #include "host/base/printable.h"
 #include "host/words/utc_time.h"
 

@@ -13,13 +13,13 @@ struct SLibDCommonParameterInt {
       : label(std::move(itemLabel)), value(itemValue) {}
 
   std::string label;       ///< as shown to an operator
-  std::int32_t value = 0;  ///< as sent to the camera; unit as the list's
+  std::int32_t value = 0;  ///< as sent to the camera, in the unit of the list
 };
 
-/// One point of a camera's zoom curve.
+/// One point of a camera's zoom curve; between two points the magnification grows evenly.
 struct SLibDZoomRatioInt {
-  std::int32_t ratio = 0;     ///< magnification, in steps of the camera's table
-  std::int32_t position = 0;  ///< zoom position in camera units
+  std::int32_t ratio = 0;     ///< magnification against the wide end: 18 is 18 times; 0: not known
+  std::int32_t position = 0;  ///< zoom position, in steps of the camera's lens
 };
 
 /// One day/night mode that a camera offers.
@@ -30,8 +30,8 @@ struct SLibDDayNightModeInfo {
 /// One exposure mode and the steps it offers, each list ascending by value.
 struct SLibDBrightModeInfo {
   std::string name;                                    ///< "Full auto", "Shutter Priority", "Iris Priority"
-  std::vector<SLibDCommonParameterInt> shutterSpeeds;  ///< shutter steps in camera units
-  std::vector<SLibDCommonParameterInt> irisPositions;  ///< iris steps in camera units
+  std::vector<SLibDCommonParameterInt> shutterSpeeds;  ///< shutter steps, in the camera's numbers
+  std::vector<SLibDCommonParameterInt> irisPositions;  ///< iris steps, in the camera's numbers
   std::vector<SLibDCommonParameterInt> reserved4;      ///< copied through
 };
 

@@ -8,10 +8,10 @@
 /// How a camera records on its card.
 struct SLibDEdgeStorageMode {
   bool enabled = false;
-  std::int32_t imageNumber = 0;  ///< which video stream is recorded
-  std::int32_t alarmTime1 = 0;   ///< seconds; sent only when imageNumber is 1
-  std::int32_t alarmTime2 = 0;   ///< seconds
-  std::string watchAddress;      ///< recording starts when this address becomes unreachable
+  std::int32_t imageNumber = 0;  ///< the video stream that is recorded, from 1
+  std::int32_t alarmTime1 = 0;   ///< seconds recorded from before the alarm; sent as 0 unless imageNumber is 1
+  std::int32_t alarmTime2 = 0;   ///< seconds recorded after the alarm
+  std::string watchAddress;      ///< recording starts when the camera no longer reaches this address
 };
 
 /// One recording.
@@ -25,7 +25,7 @@ struct SLibDEdgeStorageRecord {
   std::int32_t bitRate = 0;    ///< kbit/s; 0 for a recording with a quality
   std::int32_t quality = 0;    ///< JPEG quality level
   std::string audioCodec;
-  std::int32_t size = 0;  ///< as the camera reports it
+  std::int32_t size = 0;  ///< as the camera reports it, with no unit given
   std::string status;
 };
 
@@ -37,5 +37,5 @@ struct SLibDEdgeStorageRecordList {
 struct SLibDEdgeStorageStreamingInfo {
   std::string streamName;
   std::string codecName;   ///< "JPEG", "MPEG4" or "H.264"
-  std::int32_t scale = 1;  ///< speed of the playback, as RTSP's Scale (RFC 2326, 12.34)
+  std::int32_t scale = 1;  ///< pace, as RTSP's Scale (RFC 2326, 12.34); below 0: backwards
 };

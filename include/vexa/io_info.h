@@ -16,7 +16,8 @@ enum ELibDPinType : std::int32_t {
   PIN_TYPE_AUDIO_DETECTION = 5  ///< the audio detector
 };
 
-/// Whether detection settings belong to presets or to the current view. Any value but 0 is sent as "current".
+/// Whether detection settings belong to presets or to the current view. Any value but LIBD_POSITION_PRESET is sent as
+/// "current".
 enum ELibDPositionMode : std::int32_t { LIBD_POSITION_PRESET = 0, LIBD_POSITION_CURRENT = 99 };
 
 enum ELibDTamperLevel : std::int32_t { LIBD_TAMPER_LOW = 1, LIBD_TAMPER_MIDDLE = 2, LIBD_TAMPER_HIGH = 3 };
@@ -48,9 +49,9 @@ struct VEXA_API SLibDDetectionWindow {
   std::int32_t sensitivity = -1;          ///< 1 to 100
 };
 
-/// One detection setting: object sizes and sensitivity are sent from the first window.
+/// One detection setting. Object sizes and sensitivity are those of the first window; the other windows' are not sent.
 struct SLibDDetectionParam {
-  std::int32_t number = -1;  ///< 99: the current view
+  std::int32_t number = -1;  ///< of the preset, from 1; 99: the current view
   std::int32_t reserved2 = -1;
   SLibDDetectionWindow windows[4];
 };
@@ -73,7 +74,7 @@ struct SLibDIoBoxInfo {
   std::int32_t vmdType = 0;      ///< an ELibDVMDType value
 };
 
-/// What a camera's I/O can do: thirteen 32-bit words, handed out whole; filled by a model class.
+/// What a camera's I/O can do; filled by a model class. The driver copies all thirteen 32-bit words to the host.
 struct SLibDFixedIoBoxInfo {
   std::int32_t inputCount = 0;
   std::int32_t outputCount = 0;

@@ -18,7 +18,7 @@ namespace vexa {
 /// Which driver class serves a model.
 enum class DriverClass : std::int32_t { kCommon, kHeron, kMarlin, kSimpleHD, kSimplePTZ };
 
-/// Bits that GetCameraType answers for, once MakeDevice has made the driver.
+/// Bits that GetCameraType knows, once MakeDevice has made the driver.
 enum CameraTypeBits : std::uint32_t {
   kFixedCamera = 1U << 0,
   kPtzCamera = 1U << 1,
@@ -47,8 +47,8 @@ struct Profile {
   std::vector<SLibDZoomRatioInt> zoomRatios;    ///< ascending by position
   SLibDFixedAudioInfo audio;                    ///< available: 1 when the camera has audio
   SLibDFixedIoBoxInfo ioBox;
-  bool hasControl = false;       ///< GetFixedPTZControlInfo answers
-  bool hasIoBox = false;         ///< GetFixedIoboxInfo answers
+  bool hasControl = false;       ///< GetFixedPTZControlInfo returns LIBD_OK
+  bool hasIoBox = false;         ///< GetFixedIoboxInfo returns LIBD_OK
   bool continuousPtz = false;    ///< motion by signed speeds, also before the camera has been asked
   bool motionDetection = false;  ///< detection windows report motion
   bool lodDetection = false;     ///< detection is set by one object size and one sensitivity
@@ -57,7 +57,7 @@ struct Profile {
 
 /// Why a profile was refused.
 struct ProfileError {
-  std::string file;  ///< as given, or where it was looked for
+  std::string file;  ///< as given, or the path that was tried
   int line = 0;      ///< counted from 1; 0: the file as a whole
   std::string key;   ///< for instance "video.codecs[1].sizes[0]"; empty: no particular one
   std::string text;  ///< what is wrong, and what would be right
@@ -68,20 +68,22 @@ struct ProfileError {
 
 /// Reads a profile file. `file` is a path, or the name of an installed profile (without "/" and ".json"), for instance
 /// "LMX-P200". A profile that is wrong in any way is refused whole: false, `error` filled, `profile` as it was.
-/// Any thread; files above 1 MiB are refused.
+/// Any thread; blocks only to read the file. Files above 1 MiB are refused.
 VEXA_API bool LoadProfile(const std::string& file, Profile& profile, ProfileError& error);
 
-/// The same for a text; `name` stands for the file.
+/// The same for a text; `name` is used as the file's name. Any thread; never blocks.
 VEXA_API bool ParseProfile(const std::string& text, const std::string& name, Profile& profile, ProfileError& error);
 
-/// The folder of the installed profiles; empty when there is none.
+/// The folder of the installed profiles, found relative to this library; empty when there is none. Any thread.
 VEXA_API std::string ProfileFolder();
 
-/// The names of the installed profiles in alphabetical order.
+/// The names of the installed profiles in alphabetical order; none when the folder cannot be read. Any thread.
 VEXA_API std::vector<std::string> ProfileNames();
 
 /// A driver of the model's class with its capability records filled, as if the camera had been identified. It contacts
-/// no camera; the host gives it a connection next. Null when memory is short or `profile.driver` is none of its values.
+/// no camera; the host sets its connection next and owns the driver. It is a CVexaCommon, so that static_cast reaches
+/// what takes one (vexa/waiting.h). Null when out of memory or for a `profile.driver` that is not a DriverClass. Any
+/// thread; never blocks.
 VEXA_API std::unique_ptr<CLibraryDevice> MakeDevice(const Profile& profile);
 
 }  // namespace vexa

@@ -1,4 +1,10 @@
 // Pan, tilt, zoom and focus; presets, camera tours and shadow tours.
+//
+// Three kinds of units meet here. The host's are fixed: speeds -10000 to 10000, positions 0 to 10000. The camera's are
+// steps of its motors, different for each model: the SLibDFixed... records translate between both. Angles are degrees.
+//
+// Signs: pan grows to the right and tilt upwards, in the host's units and, for a camera that stands upright, in the
+// camera's. Zoom grows towards tele, focus towards near.
 #pragma once
 
 #include <cstdint>
@@ -22,64 +28,70 @@ enum ELibDPanTiltDirection : std::int32_t {
   LIBD_DIRECTION_DOWN_RIGHT = 8
 };
 
-/// Pan and tilt of a camera, in its own units. Places without a meaning to the driver are copied through.
+/// Pan and tilt of a camera. Places without a meaning to the driver are copied through.
+///
+/// The host's position p, 0 to 10000, is the camera's position origin + p * span / 20000: *half* of the span is the way
+/// from one end to the other, so panSpan and panAngleRange describe twice the model's travel. A camera that turns full
+/// circle in 160 steps a degree, from -28800 to 28800, has panSpan 115200, panAngleRange 720 and panOrigin -28800.
 struct SLibDFixedPanTiltInfo {
   std::int32_t reserved1 = 0;
-  std::int32_t panMaxSpeed = 0;  ///< camera speed units
+  std::int32_t panMaxSpeed = 0;  ///< the camera's speed for the host's 10000; above 0
   std::int32_t reserved3 = 0;
   std::int32_t reserved4 = 0;
-  std::int32_t tiltMaxSpeed = 0;  ///< camera speed units
+  std::int32_t tiltMaxSpeed = 0;  ///< the camera's speed for the host's 10000; above 0
   std::int32_t reserved6 = 0;
   std::int32_t reserved7 = 0;
-  std::int32_t horizontalWideAngle = 0;  ///< viewing angle at the wide end
+  std::int32_t horizontalWideAngle = 0;  ///< degrees that the picture spans at the wide end; 0: not known
   std::int32_t reserved9 = 0;
   std::int32_t reserved10 = 0;
-  std::int32_t verticalWideAngle = 0;  ///< viewing angle at the wide end
+  std::int32_t verticalWideAngle = 0;  ///< degrees that the picture spans at the wide end; 0: not known
   std::int32_t reserved12 = 0;
   std::int32_t reserved13 = 0;
-  std::int32_t panSpan = 0;  ///< camera position units over the whole pan range
+  std::int32_t panSpan = 0;  ///< camera steps in panAngleRange degrees; 0: not known
   std::int32_t reserved15 = 0;
   std::int32_t reserved16 = 0;
-  std::int32_t panAngleRange = 0;  ///< angle of panSpan
+  std::int32_t panAngleRange = 0;  ///< degrees, twice the model's travel
   std::int32_t reserved18 = 0;
-  std::int32_t panOrigin = 0;  ///< camera position of the left end
+  std::int32_t panOrigin = 0;  ///< camera position of the left end, in steps; -32768 to 32767
   std::int32_t reserved20 = 0;
-  std::int32_t tiltSpan = 0;  ///< camera position units over the whole tilt range
+  std::int32_t tiltSpan = 0;  ///< camera steps in tiltAngleRange degrees; 0: not known
   std::int32_t reserved22 = 0;
   std::int32_t reserved23 = 0;
-  std::int32_t tiltAngleRange = 0;  ///< angle of tiltSpan
+  std::int32_t tiltAngleRange = 0;  ///< degrees, twice the model's travel
   std::int32_t reserved25 = 0;
-  std::int32_t tiltOrigin = 0;  ///< camera position of the low end
-  std::int32_t tiltOffset = 0;  ///< camera position of the horizon
+  std::int32_t tiltOrigin = 0;  ///< camera position of the low end, in steps; -32768 to 32767
+  std::int32_t tiltOffset = 0;  ///< camera position of the horizon, in steps
 };
 
-/// Zoom of a camera, in its own units. Places without a meaning to the driver are copied through.
+/// Zoom of a camera, in steps of its lens: from minPosition (wide end) to maxPosition (tele end). Speeds are the
+/// camera's for the host's smallest and greatest. Places without a meaning to the driver are copied through.
 struct SLibDFixedZoomInfo {
-  std::int32_t minSpeed = 0;  ///< camera speed units
-  std::int32_t maxSpeed = 0;  ///< camera speed units
+  std::int32_t minSpeed = 0;  ///< the camera's slowest
+  std::int32_t maxSpeed = 0;  ///< the camera's fastest
   std::int32_t reserved3 = 0;
-  std::int32_t minPosition = 0;  ///< camera position units
+  std::int32_t minPosition = 0;  ///< wide end
   std::int32_t reserved5 = 0;
   std::int32_t reserved6 = 0;
   std::int32_t reserved7 = 0;
-  std::int32_t maxPosition = 0;  ///< camera position units
+  std::int32_t maxPosition = 0;  ///< tele end
   std::int32_t reserved9 = 0;
 };
 
-/// Focus of a camera, in its own units. Places without a meaning to the driver are copied through.
+/// Focus of a camera, in steps of its lens. Speeds are the camera's for the host's smallest and greatest; the host's
+/// positions 0 and 10000 are minPosition and maxPosition. Places without a meaning to the driver are copied through.
 struct SLibDFixedFocusInfo {
-  std::int32_t minSpeed = 0;  ///< camera speed units
-  std::int32_t maxSpeed = 0;  ///< camera speed units
+  std::int32_t minSpeed = 0;  ///< the camera's slowest
+  std::int32_t maxSpeed = 0;  ///< the camera's fastest
   std::int32_t reserved3 = 0;
-  std::int32_t minPosition = 0;  ///< camera position units
-  std::int32_t maxPosition = 0;  ///< camera position units
+  std::int32_t minPosition = 0;  ///< where the host's 0 is
+  std::int32_t maxPosition = 0;  ///< where the host's 10000 is
   std::int32_t reserved6 = 0;
 };
 
 /// What the camera's PTZ can do; filled by a model class.
 struct SLibDFixedPTZControlInfo {
   std::vector<SLibDCommonParameterInt> reserved1;
-  bool noMoveSpeed = false;  ///< the move dialect sends speed 0 for pan and tilt
+  bool noMoveSpeed = false;  ///< pan and tilt are sent with speed 0, which leaves the pace to the camera
   bool reserved3 = false;
   SLibDFixedPanTiltInfo panTilt;
   std::int32_t reserved5 = 0;
@@ -92,18 +104,19 @@ struct SLibDFixedPTZControlInfo {
   bool reserved12 = false;
   bool reserved13 = false;
   std::vector<SLibDDayNightModeInfo> dayNightModes;
-  std::int32_t presetCount = 0;
-  std::int32_t tourCount = 0;        ///< at most five have letters
-  std::int32_t shadowTourCount = 0;  ///< at most five have letters
+  std::int32_t presetCount = 0;      ///< 0: the camera has no presets
+  std::int32_t tourCount = 0;        ///< tours beyond the fifth cannot be named in requests
+  std::int32_t shadowTourCount = 0;  ///< likewise
 };
 
-/// Where the camera looks, as its pictures say.
+/// Where the camera looks, as its latest picture reports it. With the picture upside down (SLibDCameraInfo::rotation
+/// 180) pan and tilt change their signs, as right and up do in the picture.
 struct SLibDPTZStatus {
-  std::int32_t panPosition = 0;   ///< thousandths of the unit of the pan angle range; as the camera's if it has no span
-  std::int32_t tiltPosition = 0;  ///< the same for tilt
-  std::int32_t horizontalAngle = 0;  ///< viewing angle, in the unit of the wide-end angle
-  std::int32_t verticalAngle = 0;    ///< viewing angle, in the unit of the wide-end angle
-  bool moving = false;               ///< set while the camera moves; never cleared by the driver
+  std::int32_t panPosition = 0;      ///< thousandths of a degree from the camera's position 0; steps while panSpan is 0
+  std::int32_t tiltPosition = 0;     ///< thousandths of a degree above the horizon; steps while tiltSpan is 0
+  std::int32_t horizontalAngle = 0;  ///< what the picture spans, in ten-thousandths of a degree
+  std::int32_t verticalAngle = 0;    ///< the same vertically
+  bool moving = false;               ///< set by the driver while the camera moves; the host clears it
 };
 
 /// Control settings that the driver stores and hands back; it reads the exposure mode.
@@ -133,9 +146,9 @@ struct SLibDPresetInfo {
 struct SLibDCameraTourEachSetting {
   bool enabled = false;
   std::vector<int> sequence;   ///< camera preset numbers, counted from 1
-  std::int32_t stayTime = 10;  ///< seconds at each preset
+  std::int32_t stayTime = 10;  ///< seconds at each preset; not checked
   std::int32_t reserved4 = 0;  ///< 0 when read, never sent
-  std::int32_t speed = 24;     ///< camera speed units
+  std::int32_t speed = 24;     ///< of the moves between presets, in the camera's unit; not checked
 };
 
 /// All camera tours.
@@ -149,14 +162,14 @@ struct SLibDCameraTourInfo {
 struct SLibDShadowTourEachSetting {
   bool enabled = false;
   std::int32_t reserved2 = 0;     ///< 0 when read, never sent
-  std::int32_t recordedTime = 0;  ///< as the camera reports it; read only
+  std::int32_t recordedTime = 0;  ///< as the camera reports it, with no unit given; read only
 };
 
 /// All shadow tours.
 struct SLibDShadowTourInfo {
   bool enabled = false;
   std::int32_t resumeTime = 0;                      ///< seconds; 0: no resuming
-  std::int32_t maxRecordTime = 0;                   ///< as the camera reports it; read only
+  std::int32_t maxRecordTime = 0;                   ///< as the camera reports it, with no unit given; read only
   std::map<int, SLibDShadowTourEachSetting> tours;  ///< by number, counted from 1
 };
 

@@ -128,7 +128,7 @@ class VEXA_API CRealTime {
 
   /// Reads a time from `text` by `format`, in UTC or (`utc` false) local time.
   ///
-  /// A character of the format is searched forward in the text, and reading goes on behind it; behind the text's end
+  /// A character of the format is searched forward in the text, and reading goes on after it; after the text's end
   /// when it is not there. A directive reads a number where reading stands (spaces before it are skipped; only the
   /// next 256 characters are looked at) but does not move on, so two directives need a character between them. Flags
   /// between "%" and the letter are skipped.
@@ -193,7 +193,7 @@ class VEXA_API CRealTimeSpan {
   /// since 1970-01-01 UTC.
   std::time_t GetTimeTime() const;
 
-  /// Writes the span by `format`, whose directives are built as those of CRealTime::Format. Upper-case letters tell the
+  /// Writes the span by `format`, whose directives are built as those of CRealTime::Format. Upper-case letters give the
   /// whole span, lower-case letters a part of it:
   ///
   ///   %%             "%"

@@ -9,7 +9,8 @@
 #include "vexa/export.h"
 
 /// Narrows a camera model's codecs and sizes by criteria that the camera reports. A library of its own
-/// (libVexaCommonFilter.so.1), so that a host can put another in its place. One thread at a time may use an object.
+/// (libVexaCommonFilter.so.1), so that a host can put another in its place. One thread at a time may use an object. No
+/// operation blocks or reports a failure; what cannot be used is ignored. Running out of memory throws std::bad_alloc.
 class VEXA_API CResolutionFilterFacade {
  public:
   CResolutionFilterFacade();
@@ -20,9 +21,9 @@ class VEXA_API CResolutionFilterFacade {
   /// Forgets all criteria and takes the table of `model`; an unknown model gets the general table.
   void Initialize(const std::string& model);
   /// Sets one criterion: "ImageMaxSizeFilter" and "VideoCapSizeFilter" take "width,height" in pixels,
-  /// "SolidPTZFilter" takes "on" or "off". Unknown items and values that do not read are ignored.
+  /// "SolidPTZFilter" takes "on" or "off". Unknown items and values that cannot be read are ignored.
   void SetFilterItemCriteria(const std::string& item, const std::string& value);
-  /// Replaces `out` by what remains, sizes from the largest to the smallest.
+  /// Replaces `out` by the codecs and sizes that all criteria leave, sizes from the largest to the smallest.
   void GetFilteredResolutionList(std::vector<SLibDVideoCodecInfo>& out);
 
  private:

@@ -1,4 +1,4 @@
-// What every operation of a device answers.
+// The results of a device's operations.
 #pragma once
 
 #include <cstdint>
@@ -7,7 +7,7 @@
 /// LIBD_NO_FRAME is no error.
 enum ELibDReturnCode : std::int32_t {
   LIBD_OK = 1,                     ///< success
-  LIBD_FAILED = 0,                 ///< failure with no more particular code: GetLatestErrorText says why
+  LIBD_FAILED = 0,                 ///< any other failure; GetLatestErrorText returns the reason
   LIBD_NOT_SUPPORTED = -100,       ///< the driver does not offer the operation
   LIBD_INVALID_ARGUMENT = -101,    ///< an argument is out of its range; nothing was sent
   LIBD_INVALID_MODE = -102,        ///< not allowed in the camera's present mode; nothing was sent

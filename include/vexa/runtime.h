@@ -15,7 +15,7 @@
 #include "vexa/export.h"
 #include "vexa/real_time.h"
 
-/// What every handle points to; the record behind it is the library's own and goes by `kind`.
+/// What each handle points to: the front of a record of the library's own, whose type `kind` names.
 struct typedHandle {
   std::int32_t kind;  ///< one of HANDLE_TYPE_...
 };
@@ -25,7 +25,7 @@ constexpr std::int32_t HANDLE_TYPE_THREAD = 1;  ///< made by _beginthreadex
 constexpr std::int32_t HANDLE_TYPE_FILE = 2;    ///< made by CreateFile
 constexpr std::int32_t HANDLE_TYPE_FIND = 3;    ///< made by FindFirstFile
 
-// Kept: WAIT_TIMEOUT is not the Windows number; hosts were built with this one.
+// Kept: WAIT_TIMEOUT is not the Windows number; hosts compare with this one.
 constexpr unsigned long INFINITE = 0xFFFFFFFFUL;      ///< a time-out without limit
 constexpr unsigned long WAIT_TIMEOUT = 0xFFFFFFFEUL;  ///< a wait's result: nothing was signalled in time
 constexpr unsigned long WAIT_FAILED = 0xFFFFFFFFUL;   ///< a wait's result: it could not wait
@@ -216,7 +216,7 @@ VEXA_API int GetExitCodeThread(typedHandle* h, unsigned long* code);
 VEXA_API int CloseThreadHandle(typedHandle* h);
 
 /// Records `code` as the calling thread's exit code and, when its handle is closed, frees that handle. The routine of
-/// every thread ends in this call; a host has no need of it. A thread of other making is left alone.
+/// every thread ends in this call; a host has no need of it. A thread that _beginthreadex did not start is left alone.
 VEXA_API void cleanup_thread_internal(unsigned int code);
 
 /// The routine given to the system for every thread. Takes over and frees `startBlock`, as made by _beginthreadex.
@@ -224,7 +224,7 @@ VEXA_API void cleanup_thread_internal(unsigned int code);
 VEXA_API void* thread_func_internal(void* startBlock);
 
 /// Makes `m` a recursive mutex. Enter, leave and delete it with pthread_mutex_lock, _unlock and _destroy. On failure,
-/// which includes a null `m`, prints the reason to standard error behind "pthread_mutex_init".
+/// which includes a null `m`, prints "pthread_mutex_init" and the reason to standard error.
 VEXA_API void InitializeCriticalSection(pthread_mutex_t* m);
 
 // ---- Small helpers -------------------------------------------------------------------------------------------------
@@ -270,7 +270,7 @@ VEXA_API void OutputDebugStringA(const char* text);
 VEXA_API unsigned int GetDriveType(const char* root);
 
 // ---- Directories and paths -----------------------------------------------------------------------------------------
-// From here on, each failure writes one line with its reason to standard error, except where "silent" is said.
+// From here on, each failure writes one line with its reason to standard error, except where it is "silent".
 
 /// Copies the path of the working directory to `buf`, `len` bytes large.
 /// @return the path's length; when path and terminator do not fit, the room they need, with `buf` untouched; 0 on

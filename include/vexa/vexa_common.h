@@ -27,9 +27,9 @@ struct DriverState;
 ///
 /// Construction contacts no camera. Operations may be called from any of the host's threads; one streaming thread runs
 /// while video plays. The connection is changed only while no stream and no command is in flight. Destruction stops
-/// video, audio and the alarm stream; the motion-metadata stream is the host's to stop. Starts and stops of video from
-/// several threads take turns, but a start or stop during a stop is refused. Only a driver that no other thread uses is
-/// destroyed.
+/// video, audio and the alarm stream, and may block as their stops do; the host stops the motion-metadata stream
+/// itself. Starts and stops of video from several threads take turns, but a start or stop during a stop is refused. A
+/// driver may be destroyed only when no other thread uses it.
 ///
 /// Everything that is not an operation of CLibraryDevice is protected: model classes outside the library derive from
 /// this class and fill the capability records. The bodies of a block are in the file that it names.
@@ -161,7 +161,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   using StartCodeFinder = const unsigned char* (*)(const unsigned char* data, unsigned int length);
   int http_multipart_jpeg_recv(int socket, char* buffer, int capacity, int timeout);
   int http_multipart_mddata_recv(int socket, char* buffer, int capacity, int timeout);
-  /// The first byte of the first 00 00 00 01 in the data; null when there is none. Reads nothing outside the data.
+  /// The first byte of the first 00 00 00 01 in the data; null when there is none. Reads no byte outside the data.
   static const unsigned char* find_start_code_h264(const unsigned char* data, unsigned int length);
   /// The same for 00 00 01; of more zeros the last two belong to it.
   static const unsigned char* find_start_code_mpeg4(const unsigned char* data, unsigned int length);
@@ -273,7 +273,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   int m_ChannelId VEXA_GUARDED_BY(m_ConnectionLock) = 0;
   SLibDConnectionInfo m_ConnectionInfo VEXA_GUARDED_BY(m_ConnectionLock);
   ELibDReturnCode m_LatestErrorCode = LIBD_FAILED;
-  // What the model class says of the camera
+  // What the model class states about the camera
   bool m_FixedCameraInfoAvailable = false, m_FixedPTZControlInfoAvailable = false, m_FixedIoBoxInfoAvailable = false;
   bool m_UseMotionDetection = false;            ///< detection windows report as "MdWin"
   bool m_LodDetection = false;                  ///< the camera has LOD detection

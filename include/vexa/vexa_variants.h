@@ -11,7 +11,8 @@ class VEXA_API CVexaHeronCommon : public CVexaCommon {
  public:
   ~CVexaHeronCommon() override;
 
-  /// Puts the camera's picture back onto the network when an analog output has it, after both inquiries.
+  /// As CVexaCommon's, in three requests at most: after both questions it moves the picture back to the network when an
+  /// analog output has it. When that fails, its result is returned and `info` is filled.
   ELibDReturnCode GetCurrentSystemInfo(SLibDSystemInfo& info) override;
   /// LIBD_NOT_SUPPORTED: these cameras choose their exposure themselves.
   ELibDReturnCode SetBrightMode(std::string& mode) override;
@@ -22,7 +23,8 @@ class VEXA_API CVexaMarlinCommon : public CVexaCommon {
  public:
   ~CVexaMarlinCommon() override;
 
-  /// Sets the exposure for "Full auto" and "Shutter Priority"; LIBD_FAILED for any other mode, and nothing is sent.
+  /// Sends the exposure for "Full auto" and "Shutter Priority"; LIBD_FAILED for any other mode, and nothing is sent.
+  /// LIBD_INVALID_ARGUMENT for an empty one.
   ELibDReturnCode SetBrightMode(std::string& mode) override;
 };
 
@@ -31,11 +33,13 @@ class VEXA_API CVexaSimpleHDCommon : public CVexaCommon {
  public:
   ~CVexaSimpleHDCommon() override;
 
-  /// Puts the camera's picture back onto the network when an analog output has it, unless the model has such an output.
+  /// As CVexaCommon's. For a model without an analog output it also moves the picture back to the network, between the
+  /// two questions; when that fails, its result is returned and only the fields of the first are filled.
   ELibDReturnCode GetCurrentSystemInfo(SLibDSystemInfo& info) override;
   /// LIBD_NOT_SUPPORTED: these cameras choose their exposure themselves.
   ELibDReturnCode SetBrightMode(std::string& mode) override;
-  /// Asks a model with an analog output; LIB_VIDEO_OUT_IP for any other model.
+  /// Asks a model with an analog output; LIBD_FAILED when its answer lacks a known mode, and `mode` stays. For any
+  /// other model LIB_VIDEO_OUT_IP, and nothing is sent.
   ELibDReturnCode GetVideoOutMode(ELibVideoOutMode& mode) override;
 
  protected:
@@ -47,9 +51,11 @@ class VEXA_API CVexaSimplePTZCommon : public CVexaCommon {
  public:
   ~CVexaSimplePTZCommon() override;
 
-  /// Puts the camera's picture back onto the network when an analog output has it, unless the model has such an output.
+  /// As CVexaCommon's. For a model without an analog output it also moves the picture back to the network, between the
+  /// two questions; when that fails, its result is returned and only the fields of the first are filled.
   ELibDReturnCode GetCurrentSystemInfo(SLibDSystemInfo& info) override;
-  /// Asks a model with an analog output; LIB_VIDEO_OUT_IP for any other model.
+  /// Asks a model with an analog output; LIBD_FAILED when its answer lacks a known mode, and `mode` stays. For any
+  /// other model LIB_VIDEO_OUT_IP, and nothing is sent.
   ELibDReturnCode GetVideoOutMode(ELibVideoOutMode& mode) override;
 
  protected:

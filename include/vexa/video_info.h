@@ -10,7 +10,7 @@
 
 enum ELibDVideoStandard : std::int32_t { LIBD_VIDEO_PAL = 0, LIBD_VIDEO_NTSC = 1 };
 
-/// Where a camera puts its picture: on the network only, or on an analog output as well.
+/// Where a camera sends its picture: to the network only, or to an analog output as well.
 enum ELibVideoOutMode : std::int32_t { LIB_VIDEO_OUT_IP = 0, LIB_VIDEO_OUT_PAL = 1, LIB_VIDEO_OUT_NTSC = 2 };
 
 /// A set of camera-type bits; model classes and hosts agree on their meaning.
@@ -18,7 +18,7 @@ enum ELibCameraType : std::uint32_t {};
 
 /// What a frame holds (SLibDVideoFrameInfo::frameType).
 enum ELibDVideoFrameType : std::int32_t {
-  VIDEO_FRAME_INVALID = -1,      ///< not (yet) a picture; never handed out
+  VIDEO_FRAME_INVALID = -1,      ///< not a picture, or not one yet; no frame of this type reaches a host
   VIDEO_FRAME_JPEG = 0,          ///< a JPEG picture
   VIDEO_FRAME_MPEG4_KEY = 10,    ///< an MPEG-4 picture led by a visual-object-sequence (or group) header
   VIDEO_FRAME_MPEG4_DELTA = 11,  ///< another MPEG-4 picture
@@ -32,7 +32,7 @@ struct VEXA_API SLibDCameraInfo {
 
   std::int32_t codecType = 1;          ///< 0 JPEG, 1 MPEG-4, 2 H.264
   std::string codecName;               ///< "JPEG", "MPEG4" or "H.264"
-  std::int32_t streamNumber = 1;       ///< the camera's video stream: in of GetCameraInfo, number behind its keys
+  std::int32_t streamNumber = 1;       ///< the camera's video stream, from 1: the number at the end of its keys
   std::string imageSizeText = "none";  ///< for instance "640x480"
   std::int32_t imageWidth = 0;         ///< pixels
   std::int32_t imageHeight = 0;        ///< pixels

@@ -1,4 +1,4 @@
-// What the driver must know of a video codec, one row each.
+// What the driver has to know about each video codec: one row a codec.
 #pragma once
 
 #include <cstdint>
@@ -17,7 +17,7 @@ struct Codec {
   CodecKind kind;
   const char* name;                   ///< as hosts know it: "JPEG", "MPEG4", "H.264"
   const char* word;                   ///< how a request names it
-  const char* rate_key;               ///< what bounds its data: "Quality" or "BitRate"
+  const char* rate_key;               ///< what limits its data rate: "Quality" or "BitRate"
   const PictureRules& rules;          ///< of its pictures in RTP
   const ElementaryCodec* elementary;  ///< of its HTTP stream; null where each part of the stream is a picture
   ELibDVideoFrameType key_frame;

@@ -1,4 +1,4 @@
-// Elementary streams over HTTP: what each unit between two start codes is to a picture.
+// Elementary streams over HTTP: the part that each unit between two start codes plays in a picture.
 #pragma once
 
 #include <cstddef>
@@ -12,16 +12,16 @@
 namespace vexa {
 
 enum class UnitKind {
-  kKeyHeader,  ///< what key pictures are led by
-  kUserData,   ///< may tell where the camera looks; no part of the picture
+  kKeyHeader,  ///< what key pictures begin with
+  kUserData,   ///< may hold the camera's position; not a part of the picture
   kPicture,    ///< ends the picture
   kOther       ///< part of the picture, and so is a unit cut short
 };
 
-/// What a reader must know of a codec.
+/// What a reader has to know about a codec.
 struct ElementaryCodec {
   StartCode start_code;
-  UnitKind (*kind_of_code)(std::uint8_t code);  ///< by the byte behind the start code
+  UnitKind (*kind_of_code)(std::uint8_t code);  ///< by the byte after the start code
   std::size_t text_offset;                      ///< of user data, from the start code
 
   UnitKind kind_of(Bytes unit) const;
@@ -32,7 +32,7 @@ struct ElementaryCodec {
 extern const ElementaryCodec kH264Elementary;
 extern const ElementaryCodec kMpeg4Elementary;
 
-/// Where the text of user data begins, counted from the unit's start code: behind a SEI unit's types and sizes and the
+/// Where the text of user data begins, counted from the unit's start code: after a SEI unit's types and sizes and the
 /// start code of an MPEG-4 user-data unit.
 constexpr std::size_t kSeiTextOffset = 11;
 constexpr std::size_t kMpeg4UserDataTextOffset = 4;

@@ -1,4 +1,4 @@
-// A frame buffer that is filled from its start and never past its end.
+// A frame buffer that is filled from its start and never beyond its end.
 #pragma once
 
 #include <algorithm>
@@ -9,7 +9,8 @@
 
 namespace vexa {
 
-/// Made for one frame, over a buffer that it does not own; used by the thread that assembles the frame.
+/// Appends payloads to a buffer of the caller's. Lives as long as the assembly of one picture, on its thread; never
+/// writes beyond the buffer and never allocates.
 class FrameWriter {
  public:
   explicit FrameWriter(std::span<unsigned char> room) : room_(room) {}

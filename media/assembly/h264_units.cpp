@@ -58,8 +58,8 @@ bool is_preamble(const SPacketInfo& packet) {
   return unit == kSequenceParameterSet || unit == kPictureParameterSet;
 }
 
-/// A camera that sends parameter sets begins a key picture with them, or with a delimiter: what else comes first may
-/// have lost one before it.
+/// A camera that sends parameter sets begins a key picture with them, or with a delimiter: one that begins otherwise
+/// may have lost them.
 bool opens_whole(PacketRun run, bool preamble_seen) {
   const std::uint8_t unit = beginning_unit(payload_of(run.front()));
   if (!preamble_seen) return unit != 0;

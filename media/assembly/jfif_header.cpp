@@ -25,7 +25,7 @@ void append_restart_interval(FrameWriter& out, std::uint16_t interval) {
   out.append(segment);
 }
 
-// Kept: whatever the RTP type says of the sampling, it is 4:2:0; these cameras send no other.
+// Kept: whatever sampling the RTP type names, it is 4:2:0; these cameras send no other.
 void append_frame(FrameWriter& out, const JpegShape& shape) {
   const std::size_t width = std::size_t{shape.width_in_8} * 8;
   const std::size_t height = std::size_t{shape.height_in_8} * 8;

@@ -20,7 +20,7 @@ struct QuantisationTables {
 QuantisationTables quantisation_tables(std::uint8_t q);
 
 struct HuffmanTable {
-  unsigned char destination;  ///< as DHT says it: the class (0 DC, 1 AC) in the high half, the number in the low
+  unsigned char destination;  ///< as in DHT: the class (0 DC, 1 AC) in the high half, the number in the low
   std::array<unsigned char, 16> code_counts;
   Bytes symbols;
 };
@@ -34,7 +34,7 @@ struct JpegShape {
   std::uint16_t restart_interval;  ///< 0: no DRI
 };
 
-/// Appends SOI, DQT, DRI, SOF0, DHT and SOS (ITU-T T.81). `fits` of the writer tells whether there was room.
+/// Appends SOI, DQT, DRI, SOF0, DHT and SOS (ITU-T T.81). `fits` of the writer is false when there was no room.
 void append_jfif_header(FrameWriter& out, const JpegShape& shape, const QuantisationTables& tables);
 
 }  // namespace vexa

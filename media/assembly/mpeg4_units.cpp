@@ -29,7 +29,7 @@ constexpr std::int32_t type_of_code(std::uint8_t code) {
   }
 }
 
-/// The type told by the picture's fourth byte, in whatever packet that is.
+/// The type that the picture's fourth byte gives, in whichever packet that is.
 std::int32_t frame_type_of(PacketRun run) {
   std::size_t before = 0;
   for (const SPacketInfo& packet : run) {

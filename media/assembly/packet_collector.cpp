@@ -11,7 +11,7 @@ namespace {
 /// How long a complete key picture waits for what is missing before it.
 constexpr std::chrono::milliseconds kKeyPicturePatience{200};
 
-/// Consecutive packets behind the last one used that prove a restarted sequence.
+/// So many consecutive packets that are not ahead of the last one used prove a restarted sequence.
 constexpr std::size_t kRestartProof = 3;
 
 /// 1.2 s in ticks.
@@ -50,14 +50,15 @@ void PacketCollector::drop_strays() {
   strays_.clear();
 }
 
-// A rate that is no rate sets no age.
+// Without a clock rate no packet is too old.
 void PacketCollector::remove_too_old(const SPacketInfo& newest, int clock_rate) {
   if (packets_.empty() || clock_rate <= 0) return;
   const std::int64_t limit = order_timestamp(newest.timestamp) - most_age(clock_rate);
   const auto within = [limit](const SPacketInfo& packet) { return order_timestamp(packet.timestamp) <= limit; };
   if (!within(packets_.front())) return;
   const auto end = std::partition_point(packets_.begin(), packets_.end(), within);
-  // Where the order of timestamps turns (at 2^32 and at the lift), newer packets stand first: they are not old.
+  // Where the order of timestamps wraps (at 2^32 and at the lift), newer packets are first in the list: they are not
+  // old.
   const auto old = std::remove_if(packets_.begin(), end, [&](const SPacketInfo& packet) {
     return timestamp_is_after(newest.timestamp, packet.timestamp);
   });
@@ -79,13 +80,13 @@ bool PacketCollector::follows_last_used(std::uint16_t sequence) const {
   return last_used_ && sequence == static_cast<std::uint16_t>(*last_used_ + 1);
 }
 
-// A packet of a picture that was given up: a camera that restarts is not that close to its former timestamps.
+// A packet of a picture that was given up. A restarted camera's timestamps are further away than that.
 bool PacketCollector::is_latecomer(const SPacketInfo& packet, int clock_rate) const {
   const std::uint32_t age = last_used_timestamp_ - packet.timestamp;
   return age != 0 && age <= most_age(std::min(clock_rate, kFastestClock));
 }
 
-// Packets that go on behind the last one used are a camera that began its sequence again.
+// Consecutive packets that are not ahead of the last one used: the camera began its sequence again.
 void PacketCollector::take_stray(const SPacketInfo& packet, Instant now) {
   const bool goes_on = !strays_.empty() && packet.sequence == static_cast<std::uint16_t>(strays_.back().sequence + 1);
   if (!goes_on) drop_strays();
@@ -164,7 +165,7 @@ void PacketCollector::discard_all() {
   forget_sequence();
 }
 
-// A late packet may be the one right before a picture that stands complete already.
+// A late packet may be the last one of the picture before a complete one.
 void PacketCollector::note_proven_follower(std::size_t index, Instant now) {
   const std::size_t next = index + 1;
   if (next == packets_.size() || packets_[next].timestamp == packets_[index].timestamp) return;
@@ -207,7 +208,7 @@ bool PacketCollector::front_is_proven(Run run) const {
   return run.first > 0 && static_cast<std::uint16_t>(packets_[run.first - 1].sequence + 1) == first;
 }
 
-// Behind a gap nothing says that the picture's first packet is there, but the packet itself.
+// After a gap only the packet itself can show that it is the picture's first.
 bool PacketCollector::is_trusted_key(Run run) const {
   const PacketRun packets = this->packets(run);
   if (!rules_.is_key(packets)) return false;
@@ -216,17 +217,17 @@ bool PacketCollector::is_trusted_key(Run run) const {
   return rules_.opens_whole(packets, preamble_seen_);
 }
 
-// A part of it may have been overwritten since; what proved its front may be gone without harm.
+// A part of it may have been overwritten since then; the packet that proved its front may be gone without harm.
 bool PacketCollector::still_stands(const KeyPicture& key, Run run) const {
   if (!is_complete(run) || !rules_.is_key(packets(run))) return false;
   return key.proven_first == packets_[run.first].sequence || is_trusted_key(run);
 }
 
-// The picture whose turn it is: the one that follows the last packet used, or, when none is tracked, the oldest.
+// The next picture: the one that follows the last packet used or, when no sequence is tracked, the oldest.
 std::optional<PacketCollector::Run> PacketCollector::expected_run() const {
   if (packets_.empty()) return std::nullopt;
   if (!last_used_ || follows_last_used(packets_.front().sequence)) return run_around(0);
-  // Where the order of timestamps turns, the next picture need not stand first.
+  // Where the order of timestamps wraps, the next picture need not be first in the list.
   const auto next = std::find_if(packets_.begin(), packets_.end(),
                                  [this](const SPacketInfo& packet) { return follows_last_used(packet.sequence); });
   if (next == packets_.end()) return std::nullopt;
@@ -250,7 +251,8 @@ std::optional<PacketCollector::Run> PacketCollector::next_picture(Instant now) {
   return first_standing_key(now);
 }
 
-// The wait for what is missing before a key picture ends: the earliest that stands complete begins afresh.
+// A key picture has waited long enough for what is missing before it: the stream goes on with the earliest complete
+// one.
 std::optional<PacketCollector::Run> PacketCollector::first_standing_key(Instant now) {
   const std::optional<Instant> end_of_wait = deadline();
   if (!end_of_wait || now < *end_of_wait) return std::nullopt;
@@ -313,7 +315,8 @@ void PacketCollector::mark_used(Run run) {
   remove_passed_by();
 }
 
-// What is listed but no longer ahead will never be used. In order, both ends of the list tell that there is nothing.
+// Removes packets that are listed but no longer ahead: they will never be used. In order, both ends of the list show
+// that there are none.
 void PacketCollector::remove_passed_by() {
   if (packets_.empty()) return;
   const auto passed = [this](const SPacketInfo& packet) { return !sequence_is_ahead(packet.sequence, *last_used_); };
@@ -350,7 +353,7 @@ std::optional<PacketCollector::Instant> PacketCollector::deadline() const {
   return std::min_element(standing_keys_.begin(), standing_keys_.end(), earlier)->complete_since + kKeyPicturePatience;
 }
 
-// The next key picture starts afresh. Without a sequence there is nothing to forget.
+// The next key picture begins a new sequence. Without a tracked sequence there is none to forget.
 void PacketCollector::forget_sequence() {
   std::erase_if(standing_keys_, [this](const KeyPicture& key) { return !run_of(key.timestamp); });
   changed_ = true;

@@ -15,7 +15,7 @@
 
 namespace vexa {
 
-/// Where the packets of a complete picture stand in the list.
+/// The packets of a complete picture, by their place in the list.
 struct PacketRunPlace {
   std::size_t first = 0;
   std::size_t count = 0;
@@ -24,7 +24,7 @@ struct PacketRunPlace {
 /// Why a complete picture became no frame.
 enum class PictureLoss { kDamaged, kTooLarge };
 
-/// Keeps the ordered packet list of one stream and picks pictures from it. docs/packet_list.md tells its rules.
+/// Keeps the ordered packet list of one stream and picks pictures from it. docs/packet_list.md states its rules.
 ///
 /// Holds no clock and no bytes: the caller passes the time, and the packets' data stay in the packet buffer. Used by
 /// the streaming thread alone.
@@ -44,15 +44,15 @@ class PacketCollector {
   PacketCollector& operator=(const PacketCollector&) = delete;
 
   /// Takes a packet of at least 12 bytes; `clock_rate` is the RTP clock's, in ticks a second. True when it is
-  /// remembered, so that drop_overwritten must be told when its bytes are gone. `arrival` decides nothing but how a
-  /// packet that comes too late is counted.
+  /// remembered: drop_overwritten must then be called once its bytes are overwritten. `arrival` decides nothing but how
+  /// a packet that comes too late is counted.
   bool add(const SPacketInfo& packet, int clock_rate, Instant now,
            SequenceLedger::Arrival arrival = SequenceLedger::Arrival::kNew);
 
   /// The packets of these slots have been overwritten.
   void drop_overwritten(const std::vector<PacketRing::Slot>& slots);
 
-  /// The picture that is next, when it stands complete; pictures that cannot be shown are dropped on the way.
+  /// The next picture, if it is complete; pictures that cannot be shown are dropped on the way.
   std::optional<Run> next_picture(Instant now);
 
   /// The run was shown: its packets are used and leave the list.
@@ -104,7 +104,7 @@ class PacketCollector {
 
   std::vector<SPacketInfo>& packets_;
   const PictureRules& rules_;
-  std::optional<std::uint16_t> last_used_;  // sequence of the last packet used, while one is tracked
+  std::optional<std::uint16_t> last_used_;  // sequence number of the last packet used, while one is tracked
   std::uint32_t last_used_timestamp_ = 0;
   bool waiting_for_key_ = true;
   bool preamble_seen_ = false;

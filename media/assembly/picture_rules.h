@@ -1,4 +1,4 @@
-// What is common to the codecs' pictures in RTP: what their collection must know, what their assembly comes to.
+// What the packet collector has to know about a codec.
 #pragma once
 
 #include <algorithm>
@@ -25,8 +25,8 @@ struct PictureRules {
   std::uint8_t (*opening)(const SPacketInfo& first);
   /// The packet holds what key pictures of this camera open with (parameter sets).
   bool (*is_preamble)(const SPacketInfo& packet);
-  /// Whether a key picture that opens this way is whole at its front, as far as it tells by itself; `preamble_seen`
-  /// says that the camera sends preambles.
+  /// Whether a key picture that opens this way is whole at its front, judged by itself alone; `preamble_seen`:
+  /// the camera sends preambles.
   bool (*opens_whole)(PacketRun run, bool preamble_seen);
 };
 
@@ -42,7 +42,7 @@ struct AssembledPicture {
   std::int32_t frame_type = -1;  ///< an ELibDVideoFrameType value
 };
 
-/// What stands behind the RTP header.
+/// The packet's bytes after its RTP header.
 inline Bytes payload_of(const SPacketInfo& packet) {
   return Bytes(packet.data, packet.length).subspan(std::min<std::size_t>(kRtpHeaderSize, packet.length));
 }

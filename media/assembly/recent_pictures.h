@@ -1,4 +1,4 @@
-// The packets that were used lately, so that a duplicate is known from a restarted sequence.
+// The packets that were used lately: they distinguish a duplicate from a restarted sequence.
 #pragma once
 
 #include <array>
@@ -7,8 +7,8 @@
 
 namespace vexa {
 
-/// Remembers the pictures used last by timestamp and span of sequence numbers.
-/// Part of a stream's packet collector; used by the thread that reads the stream.
+/// Remembers the pictures used last by timestamp and span of sequence numbers. Owned by the packet collector, on its
+/// thread; of fixed size, so it never allocates.
 class RecentPictures {
  public:
   void add(std::uint32_t timestamp, std::uint16_t first, std::uint16_t last) {

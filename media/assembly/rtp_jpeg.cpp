@@ -22,7 +22,7 @@ constexpr unsigned char kOpensElsewhere = 2;
 
 constexpr bool carries_restart_interval(std::uint8_t type) { return type >= 64 && type <= 127; }
 
-/// What the header of a picture's first packet tells.
+/// The contents of the header of a picture's first packet.
 struct JpegHeader {
   JpegShape shape;
   std::uint8_t q;
@@ -48,7 +48,7 @@ void copy_table(ByteReader& in, QuantisationTable& table) {
   std::copy(bytes.begin(), bytes.end(), table.begin());
 }
 
-/// The tables in band; nothing when they are not two of 64 bytes.
+/// The tables in band; nullopt unless they are two of 64 bytes.
 std::optional<QuantisationTables> read_jpeg_tables(ByteReader& in) {
   in.u8();  // must be zero
   in.u8();  // precision
@@ -64,7 +64,7 @@ std::optional<QuantisationTables> read_jpeg_tables(ByteReader& in) {
 
 Bytes behind_user_data(Bytes payload) {
   if (!leads_with_user_data(payload)) return payload;
-  // Safe: a block cut short leaves nothing to read instead of a length below zero.
+  // Safe: a block cut short leaves no bytes to read instead of a length below zero.
   return payload.subspan(std::min(payload.size(), kUserDataBlock));
 }
 
@@ -111,7 +111,7 @@ AssembledPicture assemble_jpeg(Bytes beginning, PacketRun others, std::span<unsi
   FrameWriter writer(frame);
   writer.append(beginning);
   for (const SPacketInfo& packet : others) writer.append(further_scan_data(packet));
-  // Safe: a picture larger than the frame is told as such instead of being written past its end.
+  // Safe: a picture larger than the frame is reported as such instead of being written past its end.
   return {writer.fits() ? Assembly::kWhole : Assembly::kTooLarge, static_cast<std::uint32_t>(writer.length()),
           VIDEO_FRAME_JPEG};
 }

@@ -38,8 +38,8 @@ const unsigned char* find_among(Places places, const unsigned char* data_end, st
 constexpr std::size_t kBlock = 16;
 constexpr unsigned int kLastOfBlock = 1U << (kBlock - 1);
 
-/// Blocks of 16 bytes at once. A code begins with two zeros, of which the second may stand in the next block: places
-/// that hold no such pair are passed over, the others are looked at. The places are whole aligned blocks.
+/// Blocks of 16 bytes at once. A code begins with two zeros, of which the second may be in the next block: places
+/// without such a pair are skipped, the others are checked. The places are whole aligned blocks.
 __attribute__((target("sse2"))) const unsigned char* find_in_blocks(Places places, const unsigned char* data_end,
                                                                     std::size_t code_length) {
   const __m128i zero = _mm_setzero_si128();

@@ -9,8 +9,8 @@ namespace vexa {
 
 using Bytes = std::span<const unsigned char>;
 
-/// Reads big-endian numbers forward. Past the end every read gives 0 and `ok` stays false.
-/// Made on the stack for one parse; owns none of the bytes.
+/// Reads big-endian numbers forward. Beyond the end each read returns 0, and `ok` stays false. A local value over bytes
+/// of the caller's; never reads outside them.
 class ByteReader {
  public:
   explicit ByteReader(Bytes bytes) : bytes_(bytes) {}

@@ -15,7 +15,7 @@ bool is_leap_year(int year);
 /// Days in month 1 to 12; -1 for any other month.
 int days_in_month(int year, int month);
 
-/// The 1-based day of the year; nothing for a month outside 1 to 12 or a day outside 1 to 31.
+/// The 1-based day of the year; nullopt for a month outside 1 to 12 or a day outside 1 to 31.
 std::optional<int> day_of_year(int year, int month, int day);
 
 /// Seconds from 1970-01-01 00:00:00 UTC to a broken-down UTC time, whatever time_t is. Day, hour, minute and second are

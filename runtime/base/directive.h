@@ -1,5 +1,5 @@
-// Formats made of directives: "%", printf's flags and a letter. Fields are padded here, so that no text from outside
-// ever becomes a format of printf.
+// Formats made of directives: "%", printf's flags and a letter. Fields are padded in this file, so that no text from
+// outside is ever used as a format of printf.
 #pragma once
 
 #include <cstddef>
@@ -16,16 +16,16 @@ constexpr std::size_t kDirectiveTextLimit = 255;
 /// Copying stops once so many characters are written.
 constexpr std::size_t kDirectiveTextFull = 241;
 
-/// What stands between "%" and the letter.
+/// The flags between "%" and the letter.
 struct FieldFlags {
-  bool left = false;      ///< "-": pad behind
+  bool left = false;      ///< "-": pad on the right
   bool zeros = false;     ///< "0": pad a number with zeros
   std::size_t width = 0;  ///< at least so many characters
   /// At least so many digits of a number; at most so many characters of a text.
   std::optional<std::size_t> precision;
 };
 
-/// Reads the characters "#-.0123456789" as printf does; nothing when printf has no meaning for them. Numbers
+/// Reads the characters "#-.0123456789" as printf does; nullopt when printf has no meaning for them. Numbers
 /// above INT_MAX count as INT_MAX.
 std::optional<FieldFlags> parse_field_flags(std::string_view text);
 
@@ -38,7 +38,7 @@ std::string text_field(std::string_view text, const FieldFlags& flags);
 std::string two_digits(std::int64_t value);
 std::string four_digits(std::int64_t value);
 
-/// Gives what stands for a letter with these flags; nothing for a letter it does not know.
+/// Returns the text for a letter with these flags; nullopt for an unknown letter.
 using DirectiveWriter = std::function<std::optional<std::string>(char letter, const FieldFlags& flags)>;
 
 /// Copies `format`, null being empty, with `writer`'s text for each directive. "%%" is "%"; a directive that the writer

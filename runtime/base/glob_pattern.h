@@ -9,13 +9,13 @@
 namespace vexa {
 
 /// A compiled component: "*" stands for any characters, "?" for one, "[...]" for one that is listed or lies in a listed
-/// range, "[!...]" for one that does not. A "]" right behind "[" or "[!" is listed; a "-" before the closing "]" is.
+/// range, "[!...]" for one that does not. A "]" right after "[" or "[!" is listed; a "-" before the closing "]" is.
 /// A "[" without its "]" and every other character, "\" too, is itself. Bytes are compared, not characters.
 class GlobPattern {
  public:
   explicit GlobPattern(std::string_view component);
 
-  /// Whether anything in it stands for something else than itself.
+  /// Whether it holds a character with a special meaning.
   bool has_meta() const { return has_meta_; }
 
   /// A dot that begins a name is matched by a dot alone. Takes at most pattern length x name length steps.

@@ -1,4 +1,4 @@
-// What a step that can fail returns: its value, or why it failed.
+// The result of a step that can fail: its value, or the reason why it failed.
 #pragma once
 
 #include <new>
@@ -11,7 +11,7 @@
 
 namespace vexa {
 
-/// Why a step failed. The text is for people and its own; no decision is made by it.
+/// The reason why a step failed. Owns its text, which is for people: no decision is made by it.
 struct Failure {
   ELibDReturnCode code = LIBD_FAILED;
   std::string text;  ///< empty where there is nothing to report but the failure itself
@@ -61,7 +61,7 @@ class [[nodiscard]] Result<void> {
   std::optional<Failure> failure_;
 };
 
-/// Runs `work`; false when memory ran out in it. What it had made until then has undone itself.
+/// Runs `work`; false when memory ran out in it. Whatever it had made until then is destroyed.
 template <typename Work>
 [[nodiscard]] bool within_memory(Work&& work) {
   try {

@@ -10,11 +10,11 @@
 namespace vexa {
 
 struct ScannedNumber {
-  std::uint32_t value;  ///< the largest value stands for any larger one and for every negative one
+  std::uint32_t value;  ///< larger and negative numbers become the largest value
   std::size_t length;   ///< characters read, spaces and sign among them
 };
 
-/// Reads spaces, a sign and digits; sign and digits are `width` characters at most. Nothing when there is no digit.
+/// Reads spaces, a sign and digits; sign and digits are `width` characters at most. Nullopt when there is no digit.
 std::optional<ScannedNumber> scan_number(std::string_view text, std::size_t width);
 
 struct NumberPair {
@@ -22,8 +22,8 @@ struct NumberPair {
   int second;
 };
 
-/// The two numbers that a text begins with, as scanf reads "%d,%d": blanks and a sign may stand before each, the comma
-/// right behind the first, what follows the second is passed over. Nothing when either is missing. Values beyond int
+/// The two numbers that a text begins with, as scanf reads "%d,%d": blanks and a sign may come before each, the comma
+/// right after the first, what follows the second is ignored. Nullopt when either is missing. Values beyond int
 /// become its limits.
 std::optional<NumberPair> leading_pair(const std::string& text);
 

@@ -17,8 +17,8 @@ class VEXA_THREAD_ATTRIBUTE(scoped_lockable) Guard {
   CSimpleLock& lock_;
 };
 
-/// Holds `lock` for the guard's life and waits for it in turn: who waits holds `turn`, so that a thread which gives the
-/// lock back and wants it again at once comes after him. A thread that holds `lock` already must not make one.
+/// Holds `lock` for the guard's life and waits for it in turn. The waiting thread holds `turn`, so that a thread which
+/// releases the lock and wants it again at once comes second. A thread that holds `lock` already must not make one.
 class VEXA_THREAD_ATTRIBUTE(scoped_lockable) TurnGuard {
  public:
   TurnGuard(CSimpleLock& lock, CSimpleLock& turn) VEXA_ACQUIRE(lock) : lock_(lock) {

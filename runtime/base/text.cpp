@@ -59,7 +59,7 @@ Formatted vformat_within(std::size_t room, const char* format, va_list arguments
   // NOLINTNEXTLINE(clang-analyzer-valist.Uninitialized): the caller has begun the list.
   const int wanted = std::vsnprintf(text.data(), room, format, arguments);
   text.resize(before_nul(text).size());
-  // A negative answer: the text would not even have a length.
+  // A negative result: the text would be too long for a length.
   const bool cut = wanted < 0 || static_cast<std::size_t>(wanted) >= room;
   return {std::move(text), cut};
 }

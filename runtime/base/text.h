@@ -1,4 +1,4 @@
-// Small work on text: what follows a key, what stands before a mark, decimal numbers, hidden secrets, bounded
+// Small functions on text: what follows a key, what comes before a mark, decimal numbers, hidden secrets, bounded
 // formatting.
 #pragma once
 
@@ -10,24 +10,24 @@
 
 namespace vexa {
 
-/// What follows the first occurrence of `key`, to the end; nothing when there is none.
+/// What follows the first occurrence of `key`, to the end; nullopt when there is none.
 std::optional<std::string_view> text_after(std::string_view text, std::string_view key);
 
-/// What stands before the first `mark`; the whole text when there is none.
+/// What comes before the first `mark`; the whole text when there is none.
 std::string_view text_before(std::string_view text, char mark);
 
-/// What stands before the first NUL: the text as a C function sees it.
+/// What comes before the first NUL: the text as a C function reads it.
 inline std::string_view before_nul(std::string_view text) { return text_before(text, '\0'); }
 
-/// The value held to what an int can say.
+/// The value, limited to the range of an int.
 int clamp_to_int(long long value);
 
-/// The number that a text begins with, as strtol reads it in base 10: blanks and a sign may stand in front, what
-/// follows is passed over, no digit is 0. Values beyond int become its limits.
+/// The number that a text begins with, as strtol reads it in base 10: blanks and a sign may come first, what
+/// follows is ignored, no digit is 0. Values beyond int become its limits.
 int leading_int(const std::string& text);
 
-/// The number that `text` begins with behind blanks, as scanf's "%d" takes it: `text` begins behind it from then on.
-/// Nothing, and `text` stays, when there is no digit. Values beyond int become its limits.
+/// The number that `text` begins with after blanks, as scanf's "%d" takes it: `text` begins after it from then on.
+/// Nullopt, and `text` stays, when there is no digit. Values beyond int become its limits.
 std::optional<int> take_int(std::string_view& text);
 
 /// ASCII letters and digits, whatever the host's locale.

@@ -55,7 +55,7 @@ std::string in_brackets(const std::string& text) {
   return line.empty() ? "" : " (" + line + ")";
 }
 
-// Whole seconds, rounded up: what is due is not said to be in 0 s.
+// Whole seconds, rounded up: what is still due is never reported as 0 s.
 std::string seconds_until(std::int64_t moment, Moment now) {
   const std::int64_t left = std::max<std::int64_t>(moment - now.count(), 1);
   return std::to_string((left + 999) / 1000) + " s";

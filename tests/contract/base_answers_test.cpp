@@ -16,7 +16,7 @@ Result call_fresh(CLibraryDevice& device, Result (CLibraryDevice::*operation)(Ar
   return std::apply([&](auto&... argument) { return (device.*operation)(argument...); }, arguments);
 }
 
-TEST(BaseAnswers, EveryOperationAnswersAsTheTableSays) {
+TEST(BaseAnswers, EveryOperationReturnsTheTablesResult) {
   CLibraryDevice device;
 #define OPERATION(slot, result, name, parameters, answer)                                                         \
   EXPECT_EQ(call_fresh(device, static_cast<result(CLibraryDevice::*) parameters>(&CLibraryDevice::name)), answer) \

@@ -1,4 +1,4 @@
-// A new driver object: its members, what it knows before it is told anything, and what its end gives back.
+// A new driver object: its members, their first values, and what its end releases.
 #include <arpa/inet.h>
 #include <gtest/gtest.h>
 #include <malloc.h>
@@ -192,7 +192,7 @@ struct TypeCase {
   int answer;
 };
 
-TEST(DriverObject, SaysWhetherTheCameraHasABitOfTheTypeAskedFor) {
+TEST(DriverObject, ReportsWhetherTheCameraHasABitOfTheTypeAskedFor) {
   constexpr TypeCase kCases[] = {
       {0, 0, 0}, {0, 0xFFFFFFFF, 0},          {1, 1, 1},          {1, 2, 0},
       {6, 3, 1}, {0x80000000, 0x80000000, 1}, {0xFFFFFFFF, 0, 0}, {0x7FFFFFFF, 0x80000000, 0}};
@@ -316,7 +316,7 @@ TEST(DriverObject, ItsEndClosesTheStopEvent) {
 }
 
 #if !defined(__SANITIZE_ADDRESS__) && !defined(__SANITIZE_THREAD__)
-// Under a sanitizer its own leak check says the same.
+// Under a sanitizer its own leak check shows the same.
 TEST(DriverObject, ItsEndFreesTheByteArray) {
   constexpr std::size_t kOwnMapping = std::size_t{40} << 20;
   const std::size_t before = mallinfo2().hblkhd;

@@ -1,4 +1,4 @@
-// The numbers behind the names, which hosts were built with.
+// The numbers of the names, which are compiled into hosts.
 #include <gtest/gtest.h>
 
 #include <cstdint>

@@ -78,7 +78,7 @@ std::size_t rounded_up(std::size_t offset, std::size_t alignment) {
   return (offset + alignment - 1) / alignment * alignment;
 }
 
-/// The fields are all the record has, stand in the order given and hold what the table says.
+/// The fields are all that the record has, in the order given, with the values of the table.
 template <typename Record>
 void expect_fields(const Record& record, const std::vector<Field>& fields) {
   const auto* begin = reinterpret_cast<const unsigned char*>(&record);

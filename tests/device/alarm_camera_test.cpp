@@ -26,7 +26,7 @@ vexa::camera::CameraOptions watched_camera() {
   options.password = "secret";
   options.rtsp_port = 0;
   options.control = true;
-  options.speed = 20;  // a part without news 20 times a second
+  options.speed = 20;  // a part without changes 20 times a second
   return options;
 }
 
@@ -109,7 +109,7 @@ TEST_F(AlarmsOfACamera, LoseNoneOf10000ChangesAndClearTamperingOnceAMinute) {
       happen(Kind::kMotion, 1, world[2]);
     }
     alarm_clock_now = 1000 + change * kHour / kChanges;
-    // Before the change only what tells of the lens may come, or a part without news.
+    // Before the change only the state of the lens may come, or a part without changes.
     AlarmWorld states;
     for (int parts = 0; parts < 10 && states != world_after(change); ++parts) {
       states = next_states();

@@ -65,7 +65,7 @@ TEST_F(IoBox, WithoutDetectorsAsksNoCamera) {
   EXPECT_EQ(driver_.latest_error(), "-102 from before");
 }
 
-TEST_F(IoBox, NumbersDetectorsBehindTheInputs) {
+TEST_F(IoBox, NumbersDetectorsAfterTheInputs) {
   driver_.m_FixedIoBoxInfo.tamperingDetection = driver_.m_FixedIoBoxInfo.audioDetection = true;
   SLibDIoBoxInfo info;
   EXPECT_EQ(
@@ -84,7 +84,7 @@ TEST_F(IoBox, GivesAudioTheFirstNumberOfACameraWithoutTampering) {
   EXPECT_EQ(rows_of(info.pins).back(), (PinRow{3, 5, 0, 0}));
 }
 
-TEST_F(IoBox, TellsTheTamperLevelOrLeavesIt) {
+TEST_F(IoBox, ReportsTheTamperLevelOrLeavesIt) {
   driver_.m_FixedIoBoxInfo.tamperingDetection = true;
   const struct {
     const char* answer;
@@ -178,7 +178,7 @@ TEST_F(IoBox, OutputIsSwitchedByNumberAndState) {
   }
 }
 
-TEST_F(IoBox, OutputTellsTheLatestErrorOfARefusingCamera) {
+TEST_F(IoBox, OutputReportsTheLatestErrorOfARefusingCamera) {
   SLibDPinInfo pin;
   pin.number = 1;
   EXPECT_EQ(with({refusal("/command/main.cgi?Trigger=alarmout1off")}, [&] { return driver_.SetOutput(pin); }),

@@ -30,7 +30,7 @@ inline SLibDDetectionParam any_setting(int number) {
   return param;
 }
 
-/// What an answer can tell of a setting.
+/// What an answer can contain of a setting.
 inline SLibDDetectionParam as_told(SLibDDetectionParam param) {
   const SLibDDetectionWindow first = param.windows[0];
   for (SLibDDetectionWindow& w : param.windows) {

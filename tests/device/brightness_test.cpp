@@ -52,7 +52,7 @@ INSTANTIATE_TEST_SUITE_P(
                     BrightRow{"Iris Priority", 0, "Iris=0"}, BrightRow{"Iris Priority", 4999, "Iris=2"},
                     BrightRow{"Iris Priority", 10000, "Iris=5"}));
 
-TEST(BrightAbsolute, TellsTheLatestErrorWhenItsRequestIsRefused) {
+TEST(BrightAbsolute, ReportsTheLatestErrorWhenItsRequestIsRefused) {
   Driver play({refusal("/command/camera.cgi?Iris=5")});
   give_lists(play.driver, "Iris Priority");
   EXPECT_EQ(play.driver.BrightAbsolute(10000), LIBD_UNAUTHORIZED);
@@ -180,7 +180,7 @@ TEST(Bright, AsksAfreshAndLeavesTheCacheAlone) {
   EXPECT_EQ(play.driver.cached_inquiry(), "");
 }
 
-TEST(Bright, TellsTheLatestErrorWhenTheCameraRefuses) {
+TEST(Bright, ReportsTheLatestErrorWhenTheCameraRefuses) {
   Driver asked({refusal("/command/inquiry.cgi?inq=camera")});
   give_lists(asked.driver, "Iris Priority");
   EXPECT_EQ(asked.driver.Bright(1), LIBD_UNAUTHORIZED);

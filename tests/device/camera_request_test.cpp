@@ -86,7 +86,7 @@ TEST(SetCameraInfo, StoresNothingWhenTheRequestFails) {
   EXPECT_EQ(play.driver.m_CameraInfo, marked_camera_info(3));
 }
 
-TEST(SetCameraInfo, TellsTheLatestErrorWhenNobodyListens) {
+TEST(SetCameraInfo, ReportsTheLatestErrorWhenNobodyListens) {
   SettingsDriver driver;
   driver.use(own_loopback(0), refusing_port());
   SLibDCameraInfo info = settings("JPEG");

@@ -85,7 +85,7 @@ TEST(SetCameraTourInfo, TakesMoreThanFiveToursForFive) {
   expect_tours_sent(info, rest, INT_MAX);
 }
 
-TEST(SetCameraTourInfo, TellsTheLatestErrorWhenItsRequestIsRefused) {
+TEST(SetCameraTourInfo, ReportsTheLatestErrorWhenItsRequestIsRefused) {
   const auto set = [](PtzDriver& driver) {
     SLibDCameraTourInfo info = tours_of(false, 0, {tour_of(false, {1})});
     return driver.SetCameraTourInfo(info);

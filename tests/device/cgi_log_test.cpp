@@ -128,7 +128,7 @@ TEST(CgiLog, ALineIsBreakTimeDirectionAndMessage) {
             opening_banner() + line("To", "/command/inquiry.cgi?inq=system") + line("From", "200 OK"));
 }
 
-TEST(CgiLog, ALineTellsTheLocalTime) {
+TEST(CgiLog, ALineHasTheLocalTime) {
   const TemporaryFolder folder;
   LoggingDriver driver(folder / "Log.txt");
   const std::string before = CRealTime::GetTheCurrentTime().Format("%Y%O%D%H%M%S%03L", true);

@@ -66,7 +66,7 @@ TEST_F(Detection, OfAnLodCameraIsReadAsSeventeenSettings) {
   EXPECT_EQ(mode_, kUntouchedPosition);
 }
 
-TEST_F(Detection, OfAnLodCameraThatTellsNoKnownSizeFailsAndEmptiesTheList) {
+TEST_F(Detection, OfAnLodCameraThatReportsNoKnownSizeFailsAndEmptiesTheList) {
   driver_.m_LodDetection = true;
   for (const char* answer :
        {"LODMinObjectSize=vast&LODSensitivity=40", "LODMinObjectSize=large&LODSensitivity=x", ""}) {
@@ -223,7 +223,7 @@ TEST_F(Detection, SenderHandsOutTheSocketOfItsLastRequest) {
   EXPECT_EQ(socket, -1);
 }
 
-TEST_F(Detection, ChecksLookAtTheFirstWindow) {
+TEST_F(Detection, ChecksAreOfTheFirstWindow) {
   SLibDDetectionParam param = lod_setting(2, 100);
   std::string text = "before";
   EXPECT_EQ(driver_.CheckDetectionParamSensitivity(param), LIBD_OK);

@@ -16,7 +16,7 @@ namespace {
 const ScriptStep kLiveTimeout = command("/command/camera.cgi?RTSPTimeout=60");
 const ScriptStep kPlaybackTimeout = command("/command/edgestorage.cgi?EsRTSPRec1Timeout=60");
 
-TEST(KeepAlivePeriod, IsTheTimeoutThatTheCameraTells) {
+TEST(KeepAlivePeriod, IsTheTimeoutThatTheCameraReports) {
   const struct {
     const char* answer;
     int period;  // 9 stands from before

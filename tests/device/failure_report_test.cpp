@@ -39,7 +39,7 @@ TEST(LastFailure, OfANewDriverIsNone) {
   EXPECT_EQ(report.text + report.operation + report.camera, "");
 }
 
-TEST(LastFailure, SaysWhatFailedWhereAndWhy) {
+TEST(LastFailure, ReportsWhatFailedWhereAndWhy) {
   ScriptedCamera camera({refusal("/command/inquiry.cgi?inq=camera")});
   TestDriver driver;
   driver.use(camera.host(), camera.port(), kPatientTimeout);

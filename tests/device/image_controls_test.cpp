@@ -71,7 +71,7 @@ TEST_P(ImageSetter, SendsOneRequest) {
   EXPECT_EQ(GetParam().set(play.driver), LIBD_OK);
 }
 
-TEST_P(ImageSetter, TellsTheLatestErrorWhenItsRequestIsRefused) {
+TEST_P(ImageSetter, ReportsTheLatestErrorWhenItsRequestIsRefused) {
   Driver play({refusal(std::string("/command/camera.cgi?") + GetParam().path)});
   EXPECT_EQ(GetParam().set(play.driver), LIBD_UNAUTHORIZED);
 }
@@ -130,7 +130,7 @@ TEST(SetBrightMode, LeavesTheStoredModeAsItWas) {
   EXPECT_EQ(play.driver.m_PTZControlInfo.brightMode, "Full auto");
 }
 
-/// What a getter says: its result, and the numbers it hands out.
+/// What a getter returns: its result, and the numbers it fills.
 struct Said {
   int result;
   int value;
@@ -270,7 +270,7 @@ TEST(ImageGetters, AskAgainAfterAnEmptyAnswer) {
   EXPECT_EQ(kXdnr(play.driver), (Said{1, 2}));
 }
 
-TEST(ImageCache, TellsTheValueBeforeTheChangeUntilTheCameraIsAskedAnew) {
+TEST(ImageCache, ReportsTheValueBeforeTheChangeUntilTheCameraIsAskedAnew) {
   Driver play({inquiry("camera", "A=1&ViewDR=off&XDNR=low&VisibilityEnhancer=low&IRLed=off&IRLedMaxStrength=3"),
                command("/command/camera.cgi?ViewDR=on"), command("/command/camera.cgi?XDNR=high"),
                command("/command/camera.cgi?VisibilityEnhancer=high"),

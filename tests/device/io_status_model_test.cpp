@@ -91,7 +91,7 @@ class IoStatusModel : public testing::Test {
     driver_.m_UseMotionDetection = scene.motion;
   }
 
-  /// What a status call must give: the pins behind the inputs are the detectors that the box has, in their order, and
+  /// What a status call must give: the pins after the inputs are the detectors that the box has, in their order, and
   /// whatever is left over goes to the last.
   std::vector<PinRow> pins_of(const std::map<int, int>& bits) const {
     const SLibDFixedIoBoxInfo& box = driver_.m_FixedIoBoxInfo;

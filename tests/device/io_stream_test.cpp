@@ -121,7 +121,7 @@ TEST_F(IoStream, ThatIsRefusedLeavesATimeOutOf3Seconds) {
   EXPECT_EQ(driver_.GetCurrentIoStatus(pins_), LIBD_FAILED);
 }
 
-TEST_F(IoStream, IsStoppedWhenTheSensorInquiryFailsAndTellsWhatTheStopLeft) {
+TEST_F(IoStream, IsStoppedWhenTheSensorInquiryFailsAndReturnsTheStopsResult) {
   camera_.set_answer(kSensorInquiry, kAlarmRefusal);
   EXPECT_EQ(driver_.StartIoStreaming(), LIBD_FAILED);
   EXPECT_EQ(camera_.requests(), (RequestPaths{kAlarmsOn, AlarmCamera::kAlarms, kSensorInquiry, kAlarmsOff}));

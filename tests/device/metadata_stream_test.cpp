@@ -63,7 +63,7 @@ TEST_F(MetadataStream, IsClosedBeforeItIsOpenedAgain) {
   EXPECT_EQ(camera_.closed_streams(2), 2U);
 }
 
-TEST_F(MetadataStream, OfARefusingCameraTellsTheLatestError) {
+TEST_F(MetadataStream, OfARefusingCameraReportsTheLatestError) {
   camera_.set_answer(AlarmCamera::kMetadata, "HTTP/1.0 401 Unauthorized\r\n\r\n");
   EXPECT_EQ(driver_.StartModRawData(), LIBD_UNAUTHORIZED);
   EXPECT_EQ(driver_.m_MdStreamSocket, -1);

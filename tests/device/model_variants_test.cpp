@@ -104,7 +104,7 @@ Script script_of(const OutputRow& row, bool probed) {
   return script;
 }
 
-TEST_P(VideoOutput, IsPutBackByHeronBehindBothInquiries) {
+TEST_P(VideoOutput, IsPutBackByHeronAfterBothInquiries) {
   for (const char* model : {"Unknown", "LMX-A100", "LMX-C100"}) {
     Script script{inquiry("system", GetParam().system), inquiry("network", "MacAddress=00:11")};
     if (GetParam().brought) script.push_back(command(kToNetwork));
@@ -138,7 +138,7 @@ TEST_P(VideoOutput, IsLeftAloneBySimplePtzOnItsModels) {
 
 INSTANTIATE_TEST_SUITE_P(Rows, VideoOutput, testing::ValuesIn(kOutputs));
 
-/// What GetCurrentSystemInfo says and has filled when an exchange of the script is refused.
+/// What GetCurrentSystemInfo returns and has filled when an exchange of the script is refused.
 template <typename Variant>
 SLibDSystemInfo info_of_refused(Script script) {
   Played<Variant> play(std::move(script));
@@ -242,7 +242,7 @@ TEST(GetVideoOutMode, ReadsTheCamerasWordOnItsModels) {
   }
 }
 
-TEST(GetVideoOutMode, TellsTheLatestErrorWhenTheInquiryFails) {
+TEST(GetVideoOutMode, ReportsTheLatestErrorWhenTheInquiryFails) {
   const Asked refused{LIBD_UNAUTHORIZED, 77};
   EXPECT_EQ(asked_on_the_wire<CVexaSimpleHDCommon>(refusal(kAskSystem), "LMX-A100"), refused);
   EXPECT_EQ(asked_on_the_wire<CVexaSimplePTZCommon>(refusal(kAskSystem), "LMX-C200"), refused);

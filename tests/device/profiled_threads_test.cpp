@@ -7,7 +7,6 @@
 #include <vector>
 
 #include "tests/media/media_driver.h"
-#include "tests/media/pace.h"
 #include "tests/support/model_camera.h"
 
 namespace vexa_test {
@@ -36,7 +35,7 @@ SLibDCameraInfo side_record(int mark) {
   return info;
 }
 
-/// Which record the camera's answer was, by the fields that it tells; 0 for a mixture.
+/// Which record the camera's answer was, by the fields that it contains; 0 for a mixture.
 int told_mark(const SLibDCameraInfo& info) {
   for (const int mark : {1, 2}) {
     const SLibDCameraInfo whole = side_record(mark);
@@ -49,7 +48,7 @@ int told_mark(const SLibDCameraInfo& info) {
   return 0;
 }
 
-/// Which record the host stored last, by the fields that no camera tells; 0 for a mixture.
+/// Which record the host stored last, by the fields that no camera reports; 0 for a mixture.
 int stored_mark(const SLibDCameraInfo& info) {
   for (const int mark : {1, 2}) {
     const SLibDCameraInfo whole = side_record(mark);

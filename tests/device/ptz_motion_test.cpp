@@ -277,7 +277,7 @@ TEST(ZoomRelative, SendsItsShareOf4096AsSixteenBits) {
   expect_sent(rows, [](PtzDriver&) {});
 }
 
-TEST(PtzRequests, AreAsWrittenDown) {
+TEST(PtzRequests, AreExactByteForByte) {
   using D = PtzDriver&;
   const SLibDResolutionInfo vga = picture_of({640, 480});
   const auto usual = [](bool continuous) {

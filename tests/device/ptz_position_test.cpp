@@ -1,4 +1,4 @@
-// Where the camera looks, as the text of its pictures tells; and the records of control.
+// The camera's position, read from the text of its pictures; and the records of control.
 #include <gtest/gtest.h>
 
 #include <climits>
@@ -9,7 +9,7 @@
 namespace vexa_test {
 namespace {
 
-/// What GetCurrentPosition says, and what it leaves in a record that held other values.
+/// What GetCurrentPosition returns, and what it leaves in a record that held other values.
 struct PositionSaid {
   int result, pan, tilt, horizontal, vertical;
   bool moving;
@@ -48,7 +48,7 @@ class PtzPosition : public PtzUnsent {
 
 constexpr PositionSaid kNothingSaid = {0, 7, 7, 7, 7, false};
 
-TEST_F(PtzPosition, IsToldInThousandthsWithTheAnglesOfItsZoom) {
+TEST_F(PtzPosition, IsReportedInThousandthsWithTheAnglesOfItsZoom) {
   EXPECT_EQ(said("CamPos: 111006400C81000"), (PositionSaid{1, 625, 1250, 290000, 170000, false}));
 }
 
@@ -67,7 +67,7 @@ TEST_F(PtzPosition, IsZeroWhereItsFlagIsNotOne) {
   EXPECT_EQ(said("CamPos: xX2006400C81000"), (PositionSaid{1, 0, 0, 580000, 340000, false}));
 }
 
-TEST_F(PtzPosition, MovesWhileAnMStandsBehindIt) {
+TEST_F(PtzPosition, MovesWhileAnMFollowsIt) {
   EXPECT_TRUE(said("CamPos: 111006400C81000M").moving);
   EXPECT_FALSE(said("CamPos: 111006400C81000m").moving);
   EXPECT_FALSE(said("CamPos: 111006400C81000 ").moving);

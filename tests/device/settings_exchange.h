@@ -43,11 +43,11 @@ inline std::string text_of_latest_error(CLibraryDevice& driver) {
   return text;
 }
 
-/// A driver class, its settings in reach, that speaks to `host` as "admin" with the password "secret".
+/// A driver class, its settings in reach, that connects to `host` as "admin" with the password "secret".
 template <typename Driver>
 class Settings : public Reach<Driver> {
  public:
-  /// What an operation tells the model class about the video it will offer.
+  /// What an operation passes to the model class about the video it will offer.
   struct VideoParams {
     int standard;
     int width;

@@ -269,7 +269,7 @@ void give_two_of_each(PtzDriver& driver) {
   driver.m_SavedTimeout = kPatientTimeout;
 }
 
-/// Lets each allocation of the call fail in turn; every failure is told. The camera says `step` when it is asked.
+/// Lets each allocation of the call fail in turn; every failure is reported. The camera says `step` when it is asked.
 void expect_each_failure_told(PtzCall call, const ScriptStep& step, int few = 0) {
   fails_at_every_allocation(
       [&](Shortage& shortage) {

@@ -88,7 +88,7 @@ TEST_F(VideoProperties, LeaveTheListWholeWhenNoSizeIsGiven) {
   EXPECT_THAT(driver_.told, ElementsAre(VideoParams{LIBD_VIDEO_PAL, -1, -1}));
 }
 
-TEST_F(VideoProperties, AreNotHandedOutBeforeAModelClassSaysSo) {
+TEST_F(VideoProperties, AreNotHandedOutBeforeAModelClassFillsThem) {
   SLibDFixedCameraInfo info;
   info.value1 = 9;
   EXPECT_EQ(driver_.GetFixedCameraInfo(info), LIBD_NOT_SUPPORTED);

@@ -37,7 +37,7 @@ struct AnswerRow {
   Change change;  // from the marked record, its codec type 0
 };
 
-/// What stays when an answer says nothing of interest.
+/// What stays when an answer has no key of interest.
 SLibDCameraInfo before_answer() {
   SLibDCameraInfo info = marked_camera_info(3);
   info.streamNumber = 1;
@@ -49,7 +49,7 @@ void stays(SLibDCameraInfo&) {}
 
 class CameraAnswer : public testing::TestWithParam<AnswerRow> {};
 
-TEST_P(CameraAnswer, ChangesTheFieldsItSpeaksOfAndNoOthers) {
+TEST_P(CameraAnswer, ChangesTheFieldsItNamesAndNoOthers) {
   SLibDCameraInfo expected = before_answer();
   GetParam().change(expected);
   EXPECT_EQ(after_answer(before_answer(), GetParam().answer), expected) << GetParam().answer;
@@ -273,7 +273,7 @@ TEST(GetCameraInfo, LeavesAllButTheCacheWhenTheInquiryFails) {
   EXPECT_THAT(play.driver.told, IsEmpty());
 }
 
-TEST(GetCameraInfo, TellsTheModelClassAChangedPropertyOnce) {
+TEST(GetCameraInfo, CallsTheModelClassOnceForAChangedProperty) {
   const std::string answer = "VideoStd=ntsc&VidCapSize=1280,960&SolidPTZ=on&ImageMaxSize=640,480";
   Driver play({inquiry("camera", answer), inquiry("camera", answer)});
   SLibDCameraInfo info;
@@ -285,7 +285,7 @@ TEST(GetCameraInfo, TellsTheModelClassAChangedPropertyOnce) {
   EXPECT_THAT(play.driver.m_FixedCameraInfo.codecs, IsEmpty());
 }
 
-TEST(GetCameraInfo, TellsTheModelClassOfEachProperty) {
+TEST(GetCameraInfo, CallsTheModelClassForEachProperty) {
   for (const char* property :
        {"VideoStd=ntsc", "VidCapSize=1,0", "VidCapSize=0,1", "SolidPTZ=on", "ImageMaxSize=1,0", "ImageMaxSize=0,1"}) {
     Driver play({inquiry("camera", property)});

@@ -39,7 +39,7 @@ TEST(FilterLibrary, CanBeReplacedByTheHostsOwn) {
             "model=LMX-C100 ImageMaxSizeFilter=-2147483648,-2147483648 \n");
 }
 
-/// What GetCameraInfo tells the filter of one answer, by a driver that has read none before.
+/// What GetCameraInfo passes to the filter from one answer, by a driver that has read none before.
 std::string told_of(const std::string& answer) { return printed_with(VEXA_BINARY_DIR "/replacement", {answer}); }
 
 TEST(FilterWords, AreTheCamerasOwnTextsOfEachProperty) {

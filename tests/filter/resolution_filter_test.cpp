@@ -131,7 +131,7 @@ TEST(FilterTables, OfSimplePtz) {
 
 class EveryFamily : public testing::TestWithParam<const char*> {};
 
-TEST_P(EveryFamily, StandsFromTheLargestSizeToTheSmallest) {
+TEST_P(EveryFamily, ListsSizesFromTheLargestToTheSmallest) {
   for (const auto& codec : offered(GetParam(), {})) {
     const auto larger = [](const SLibDResolutionInfo& a, const SLibDResolutionInfo& b) {
       return a.width * a.height > b.width * b.height;

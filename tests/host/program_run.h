@@ -10,25 +10,18 @@
 
 #include <chrono>
 #include <csignal>
+#include <cstdio>
 #include <functional>
 #include <string>
+#include <string_view>
 #include <thread>
 #include <utility>
 #include <vector>
 
+#include "tests/support/process_state.h"
 #include "tests/support/temporary_folder.h"
 
 namespace vexa_test {
-
-// Asks until the condition holds; false when it does not within half a minute.
-inline bool eventually(const std::function<bool()>& condition) {
-  const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(30);
-  while (!condition()) {
-    if (std::chrono::steady_clock::now() > deadline) return false;
-    poll(nullptr, 0, 5);
-  }
-  return true;
-}
 
 struct ProgramResult {
   int exit_code = -1;  // 128 + N when signal N ended it
@@ -129,5 +122,18 @@ class ProgramRun {
   std::thread reader_;
   std::string terminal_text_;
 };
+
+// What ffprobe tells of a file, line by line; nothing else, such as a warning.
+inline std::vector<std::string> probed(const std::string& entries, const std::string& path) {
+  std::vector<std::string> lines;
+  const std::string command = "ffprobe -v warning -show_entries " + entries + " -of csv=p=0 '" + path + "' 2>&1";
+  std::FILE* output = popen((command + " </dev/null").c_str(), "r");
+  char line[128];
+  while (output != nullptr && std::fgets(line, sizeof line, output) != nullptr) {
+    lines.emplace_back(line, std::string_view(line).find('\n'));
+  }
+  if (output != nullptr) pclose(output);
+  return lines;
+}
 
 }  // namespace vexa_test

@@ -25,7 +25,7 @@ TEST_F(FirstHost, RecordsLiveVideo) {
   EXPECT_TRUE(contents_of(folder() / "live.h264") == pictures(250));
 }
 
-TEST_F(FirstHost, SaysWhyItEndsEarly) {
+TEST_F(FirstHost, ReportsWhyItEndsEarly) {
   const struct {
     const char* what;
     vexa::camera::RequestFault fault;

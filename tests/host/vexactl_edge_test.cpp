@@ -4,7 +4,7 @@
 #include <nlohmann/json.hpp>
 
 #include "tests/host/camera_fixture.h"
-#include "tests/host/probed_file.h"
+#include "tests/host/program_run.h"
 
 namespace vexa_test {
 namespace {
@@ -88,7 +88,7 @@ class EdgeByCommand : public WithCamera {
   std::vector<Recording> held() { return camera().card().recordings().value_or(std::vector<Recording>()); }
 };
 
-TEST_F(EdgeByCommand, ModeShowsWhatTheCameraSays) {
+TEST_F(EdgeByCommand, ModeShowsTheCamerasSettings) {
   EXPECT_EQ(edge({"mode"}).out,
             "recording        off\n"
             "stream           1\n"
@@ -137,7 +137,7 @@ TEST_F(EdgeByCommand, ModeOnNeedsAnAddressToWatch) {
   EXPECT_EQ(asked("Edgestorage="), 0u);
 }
 
-TEST_F(EdgeByCommand, AMissingCardIsToldWhenRecordingIsSwitchedOn) {
+TEST_F(EdgeByCommand, AMissingCardIsReportedWhenRecordingIsSwitchedOn) {
   camera().card().set_health(vexa::camera::CardHealth::kMissing);
   const ProgramResult result = edge({"mode", "on", "--watch", "10.0.0.1"});
   EXPECT_EQ(result.exit_code, 2);
@@ -267,7 +267,7 @@ TEST_F(EdgeByCommand, DeleteAsksFirstUnlessToldNotTo) {
   EXPECT_TRUE(held().empty());
 }
 
-TEST_F(EdgeByCommand, MistakesAreToldBeforeTheCameraIsAsked) {
+TEST_F(EdgeByCommand, MistakesAreReportedBeforeTheCameraIsAsked) {
   folder().make_file("file", "");
   const std::vector<std::vector<std::string>> lines = {
       {},

@@ -161,7 +161,7 @@ TEST_F(LogCommand, AFileThatIsNoLogEndsWithOne) {
   }
 }
 
-TEST_F(LogCommand, ALogWithoutRequestsSaysSo) {
+TEST_F(LogCommand, ALogWithoutRequestsIsReported) {
   folder().make_file("cgi.log", banner());
   const ProgramResult result = run({"log", "cgi.log"});
   EXPECT_EQ(result.exit_code, 0);
@@ -169,7 +169,7 @@ TEST_F(LogCommand, ALogWithoutRequestsSaysSo) {
   EXPECT_EQ(result.err, "vexactl: cgi.log holds no request\n");
 }
 
-TEST_F(LogCommand, SaysHowManyLinesItLeftOut) {
+TEST_F(LogCommand, ReportsHowManyLinesItLeftOut) {
   folder().make_file("cgi.log", banner() + "\r\nrubbish" + exchange("/a", "200 OK") + "\r\nmore");
   const ProgramResult result = run({"log", "cgi.log"});
   EXPECT_EQ(result.exit_code, 0);

@@ -296,7 +296,7 @@ TEST_F(PtzByCommand, ShadowToursAreShownAndTheirResumingIsSet) {
   EXPECT_THAT(act("shadow", {"show"}).out, testing::StartsWith("Shadow tours are off; "));
 }
 
-TEST_F(PtzByCommand, WatchTellsWhereTheCameraLooks) {
+TEST_F(PtzByCommand, WatchShowsTheCamerasPosition) {
   start_model("LMX-P200", "CamPos: 111E3E006401B58M");
   const ProgramResult text = act("ptz", {"watch", "--count", "1"});
   EXPECT_EQ(text.exit_code, 0) << text.err;

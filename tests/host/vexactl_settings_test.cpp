@@ -225,7 +225,7 @@ TEST_F(SettingsOfACamera, ExposureChangesAlsoWithoutAProfile) {
   EXPECT_THAT(commands(), testing::ElementsAre("/command/camera.cgi?ExpMode=full"));
 }
 
-TEST_F(SettingsOfACamera, ExposureSaysWhatIsWrong) {
+TEST_F(SettingsOfACamera, ExposureReportsWhatIsWrong) {
   start_model("LMX-P100");
   const struct {
     std::vector<std::string> arguments;

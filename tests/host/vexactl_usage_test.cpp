@@ -48,7 +48,7 @@ struct Refusal {
   const char* err;
 };
 
-TEST(CommandLine, EachMistakeEndsWithOneAndSaysWhatToDo) {
+TEST(CommandLine, EachMistakeEndsWithOneAndNamesWhatToDo) {
   const Refusal refusals[] = {
       {{}, "vexactl: the command is missing or unknown\n  See vexactl --help for the commands.\n"},
       {{"inof", "cam"}, "vexactl: the command is missing or unknown\n  See vexactl --help for the commands.\n"},
@@ -77,7 +77,7 @@ TEST(CommandLine, EachMistakeEndsWithOneAndSaysWhatToDo) {
       {{"info", "cam:0"},
        "vexactl: the port in the camera's address is not a number from 1 to 65535\n  For instance: cam1:80.\n"},
       {{"info", "cam", "--user", "admin:hunter2"},
-       "vexactl: a user name cannot hold a colon\n  A password belongs into --password-file or --credentials.\n"},
+       "vexactl: a user name cannot hold a colon\n  A password goes into --password-file or --credentials.\n"},
       {{"info", "cam", "--password-file", "missing"},
        "vexactl: cannot read missing: No such file or directory\n"
        "  Check the file's name and that you may read it.\n"},

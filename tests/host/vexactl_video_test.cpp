@@ -3,7 +3,7 @@
 #include <nlohmann/json.hpp>
 
 #include "tests/host/camera_fixture.h"
-#include "tests/host/probed_file.h"
+#include "tests/host/program_run.h"
 #include "tests/support/decoder.h"
 #include "virtual_camera/codec/image_clip.h"
 
@@ -159,7 +159,7 @@ TEST_F(VideoCommands, SoundThatStopsEndsWithFour) {
   EXPECT_TRUE(contents_of(folder() / "live.g711") == contents_of(VEXA_CLIPS "/tone.g711_64"));
 }
 
-TEST_F(VideoCommands, SoundThatBreaksOffSaysWhyAndKeepsWhatCame) {
+TEST_F(VideoCommands, SoundThatBreaksOffReportsWhyAndKeepsWhatCame) {
   start(kVideoCodecs[0]);
   ProgramRun listen(folder(), vexactl({"listen", place(), "--codec", "g711_64", "--out", "live.g711"}), kCredentials);
   ASSERT_TRUE(eventually([&] { return size_of("live.g711") > 0; }));

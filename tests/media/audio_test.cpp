@@ -168,7 +168,7 @@ TEST_F(AudioSettings, ThatTheCameraRefusesAreNotStored) {
   EXPECT_EQ(fields_of(driver_.m_AudioInfo), fields_of(SLibDAudioInfo()));
 }
 
-/// Lets each allocation of `call` fail in turn, against a camera that plays `script`; every failure is told.
+/// Lets each allocation of `call` fail in turn, against a camera that plays `script`; every failure is reported.
 template <typename Call>
 void expect_each_failure_told(const Script& script, int few, Call call) {
   fails_at_every_allocation(
@@ -229,7 +229,7 @@ TEST_F(AudioStream, GivesWhatOneReadGives) {
   EXPECT_EQ(driver_.latest_error(), "0 from before");
 }
 
-TEST_F(AudioStream, TellsTheCodecThatWasSet) {
+TEST_F(AudioStream, ReportsTheCodecThatWasSet) {
   const struct {
     const char* codec;
     std::int32_t type;

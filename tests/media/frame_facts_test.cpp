@@ -118,8 +118,8 @@ TEST_F(FactsOfALiveStream, NameAClockThatStands) {
   auto options = reporting();
   options.sender_reports.clock = vexa::camera::ReportedClock::kFrozen;
   start(options);
-  EXPECT_TRUE(take_until(
-      [](const FrameFacts& facts) { return facts.cameraClockState == vexa::FRAME_CAMERA_CLOCK_FROZEN; }));
+  EXPECT_TRUE(
+      take_until([](const FrameFacts& facts) { return facts.cameraClockState == vexa::FRAME_CAMERA_CLOCK_FROZEN; }));
   EXPECT_FALSE(knows(vexa::FRAME_FACTS_SENDER_TIME));
 }
 
@@ -154,9 +154,8 @@ TEST_F(FactsOfALiveStream, AreThoseOfTheSlotsFrames) {
   start(options);
   ASSERT_TRUE(take(1));
   EXPECT_EQ(facts_.discontinuity, vexa::FRAME_DISCONTINUITY_START);
-  EXPECT_TRUE(take_until([](const FrameFacts& facts) {
-    return facts.discontinuity == vexa::FRAME_DISCONTINUITY_SEQUENCE_RESTART;
-  }));
+  EXPECT_TRUE(take_until(
+      [](const FrameFacts& facts) { return facts.discontinuity == vexa::FRAME_DISCONTINUITY_SEQUENCE_RESTART; }));
 }
 
 TEST_F(FactsOfALiveStream, ComeFromTheCameraAloneWithStrictReception) {
@@ -176,8 +175,8 @@ TEST_F(FactsOfALiveStream, ComeFromTheCameraAloneWithStrictReception) {
     unsigned char datagram[20] = {0x80, 96, 1, static_cast<unsigned char>(i)};
     ASSERT_EQ(sendto(stranger.get(), datagram, sizeof datagram, 0, reinterpret_cast<sockaddr*>(&address), length), 20);
   }
-  EXPECT_TRUE(take_until(
-      [this](const FrameFacts&) { return statistics_of(driver_).packetsDiscardedForeignSource == 100; }));
+  EXPECT_TRUE(
+      take_until([this](const FrameFacts&) { return statistics_of(driver_).packetsDiscardedForeignSource == 100; }));
 }
 
 TEST_F(FactsOfALiveStream, NameTheControlPortBesideTheMediaPort) {

@@ -102,7 +102,7 @@ TEST_F(HttpFrames, OfJpegThatFailHaveTheCodeOfTheFailure) {
   EXPECT_EQ(driver_.latest_error(), "-200 Receive timed out");
 }
 
-TEST_F(HttpFrames, OfJpegOfLength0AreNothingYet) {
+TEST_F(HttpFrames, OfJpegOfLength0AreNoFrameYet) {
   driver_.use_timeout(10000);
   const struct {
     std::time_t now;
@@ -281,7 +281,7 @@ TEST_F(HttpFrames, AreTheSameHoweverTheBytesCome) {
   camera.join();
 }
 
-TEST_F(HttpFrames, BeginWithWhatStandsBeforeTheFirstStartCode) {
+TEST_F(HttpFrames, BeginWithWhatComesBeforeTheFirstStartCode) {
   for (const std::string front : {"x", "xyz", "wxyz"}) {
     ASSERT_TRUE(driver_.state().reset_stream_buffer());
     pair_.left();

@@ -13,7 +13,7 @@
 #include <vector>
 
 #include "tests/media/media_driver.h"
-#include "tests/media/video_ways.h"
+#include "tests/media/video_transports.h"
 #include "tests/support/own_address.h"
 #include "tests/support/process_state.h"
 #include "tests/support/temporary_folder.h"
@@ -78,7 +78,7 @@ class HttpLive : public testing::Test {
     }
   }
 
-  /// Polls until the stream says that it has been silent too long; frames may come before.
+  /// Polls until the stream reports that it has been silent too long; frames may come before.
   bool times_out() {
     const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(20);
     while (std::chrono::steady_clock::now() < end) {
@@ -229,7 +229,7 @@ class DisturbedHttpLive : public HttpLive, public testing::WithParamInterface<Br
     driver_.state().now = [] { return disturbed_now.load(); };
   }
 
-  /// Polls, while the driver's clock runs, until the stream gives a frame or says that it has been silent too long.
+  /// Polls, while the driver's clock runs, until the stream gives a frame or reports that it has been silent too long.
   ELibDReturnCode next_outcome(TakenFrame& frame) {
     ELibDReturnCode code = LIBD_NO_FRAME;
     eventually([&] {

@@ -7,12 +7,12 @@
 #include <vector>
 
 #include "media/assembly/jfif_header.h"
-#include "tests/media/video_ways.h"
+#include "tests/media/video_transports.h"
 
 namespace vexa_test {
 namespace {
 
-/// A decoded picture, and whether the decoder had anything to say of its data.
+/// A decoded picture, and whether the decoder complained.
 struct DecodedJpeg {
   unsigned width = 0;
   unsigned height = 0;
@@ -62,11 +62,11 @@ void decode_jpeg(const std::string& bytes, DecodedJpeg& decoded) {
 
 class DecodedJpegStream : public testing::TestWithParam<const char*> {
  protected:
-  static void expect_encoders_pixels(VideoWay way) {
-    const auto options = options_of_every_way(GetParam());
+  static void expect_encoders_pixels(VideoTransport transport) {
+    const auto options = options_for_all_transports(GetParam());
     const auto clip = vexa::camera::ImageClip::load(options.image_path);
     LiveCamera camera(options);
-    const auto frames = frames_by(way, camera, 25);
+    const auto frames = frames_by(transport, camera, 25);
     ASSERT_EQ(frames.size(), 25u);
     for (std::size_t i = 0; i < frames.size(); ++i) {
       DecodedJpeg arrived;
@@ -83,7 +83,8 @@ class DecodedJpegStream : public testing::TestWithParam<const char*> {
 };
 
 TEST_P(DecodedJpegStream, EqualsTheEncodersPicturePixelForPixelWithoutAWarning) {
-  for (const VideoWay way : {VideoWay::kUdp, VideoWay::kInterleaved, VideoWay::kHttp}) expect_encoders_pixels(way);
+  for (const VideoTransport transport : {VideoTransport::kUdp, VideoTransport::kInterleaved, VideoTransport::kHttp})
+    expect_encoders_pixels(transport);
 }
 
 INSTANTIATE_TEST_SUITE_P(Clips, DecodedJpegStream, testing::Values("plain.mjpeg", "restart.mjpeg", "sliced.mjpeg"),

@@ -9,7 +9,6 @@
 #include <utility>
 
 #include "tests/media/media_driver.h"
-#include "tests/media/pace.h"
 #include "tests/support/own_address.h"
 #include "virtual_camera/codec/jpeg_picture.h"
 #include "virtual_camera/codec/rtp_packetiser.h"
@@ -60,7 +59,8 @@ class LiveCamera {
     return {bytes.begin(), bytes.end()};
   }
 
-  /// Whether the frame is picture `index`. A JPEG picture arrives with a header of the driver's: it must tell the same.
+  /// Whether the frame is picture `index`. A JPEG picture arrives with a header of the driver's, which must have the
+  /// same contents.
   bool sent(std::uint64_t index, const std::string& frame) const {
     if (camera_.clip()->codec() != vexa::camera::Codec::kJpeg) return frame == picture(index);
     const auto arrived = read_frame(frame);

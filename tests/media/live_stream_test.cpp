@@ -184,7 +184,7 @@ TEST_P(Codec, DeliversEveryPictureAcrossTheLoopOfTheClip) {
   }
 }
 
-TEST_P(Codec, TellsWhereTheCameraLooksAndLosesNoPictureByIt) {
+TEST_P(Codec, ReportsTheCamerasPositionAndLosesNoPicture) {
   auto options = codec_options(GetParam());
   options.pictures = 30;
   options.user_data = "CamPos: 0123,4567,89ab,cdef and more";
@@ -204,7 +204,7 @@ INSTANTIATE_TEST_SUITE_P(Clips, Codec, testing::Values("small.m4v", "plain.mjpeg
                            return name;
                          });
 
-TEST(LiveH264, TellsWhereTheCameraLooks) {
+TEST(LiveH264, ReportsTheCamerasPosition) {
   auto options = codec_options("small.h264");
   options.pictures = 30;
   options.user_data = "CamPos: 0123,4567";

@@ -49,7 +49,7 @@ class RecordedCamera : public LiveCamera {
   }
 
   std::string record(std::uint64_t pictures) {
-    if ((*this)->clip() == nullptr) return {};  // the failure has been told
+    if ((*this)->clip() == nullptr) return {};  // the failure has been reported
     vexa::camera::Card& card = (*this)->card();
     vexa::camera::RecordingHead head;
     head.codec = (*this)->clip()->codec();
@@ -100,7 +100,7 @@ TEST_P(Playback, GivesEveryPictureAsItWasStoredWithItsStoredTime) {
   EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
 }
 
-// A second before the end of the clock's 32 bits; with it the base moves to the first picture behind the wrap.
+// A second before the end of the clock's 32 bits; with it the base moves to the first picture after the wrap.
 constexpr std::uint32_t kNearTheEnd = 0xFFFFFFFFU - 90000U;
 
 INSTANTIATE_TEST_SUITE_P(Clips, Playback,
@@ -180,7 +180,7 @@ TEST(PlaybackStream, IsNotTornDownWhenTheHostWantsItSo) {
   }
 }
 
-/// Moves the driver's clock until the host has been told of the silence.
+/// Moves the driver's clock until the silence is reported to the host.
 ELibDReturnCode code_of_silence(MediaDriver& driver, std::atomic<std::time_t>& now) {
   FrameTaker host;
   TakenFrame frame;

@@ -235,7 +235,7 @@ TEST_F(RtpFrames, AStreamThatNeverMakesAPictureLetsTheReaderGoAfterTheTimeOut) {
   camera.join();
 }
 
-TEST_F(RtpFrames, WithATimeOutOfNothingOrLessWhatHasArrivedIsRead) {
+TEST_F(RtpFrames, WithATimeOutOfZeroOrLessWhatHasArrivedIsRead) {
   for (const int timeout : {0, -1, -999}) {
     driver_.m_ConnectionInfo.timeout = timeout;
     EXPECT_EQ(read(), LIBD_NO_FRAME);
@@ -244,7 +244,7 @@ TEST_F(RtpFrames, WithATimeOutOfNothingOrLessWhatHasArrivedIsRead) {
   }
 }
 
-TEST_F(RtpFrames, TheLookAtAStandingKeyPictureIsNoTimeOutOfTheRead) {
+TEST_F(RtpFrames, TheCheckOfACompleteKeyPictureIsNoTimeOutOfTheRead) {
   driver_.m_ConnectionInfo.timeout = 600000;
   driver_.soil_latest_error();
   send_picture(kKey);

@@ -119,8 +119,8 @@ TEST_F(RtpJpegFrames, ADamagedPictureReachesTheHostEmpty) {
   EXPECT_EQ(taken.info.frameType, VIDEO_FRAME_JPEG);
 }
 
-TEST_F(RtpJpegFrames, AFirstPacketOf4096BytesIsTakenWhenItFitsBehindTheHeader) {
-  // The JFIF header and what stands behind the RTP and JPEG headers make 4096 bytes at most.
+TEST_F(RtpJpegFrames, AFirstPacketOf4096BytesIsTakenWhenItFitsAfterTheHeader) {
+  // The JFIF header and what stands after the RTP and JPEG headers make 4096 bytes at most.
   send_picture({jpeg_packet(0, Payload(4096 - kJfifHeader, 7))});
   EXPECT_EQ(read(), LIBD_OK);
   EXPECT_EQ(frame_.length, 4096u);
@@ -151,7 +151,7 @@ TEST_F(RtpJpegFrames, AStreamOfTooLongFirstPacketsNeverSticks) {
   EXPECT_TRUE(driver_.m_RtpPackets.empty());
 }
 
-TEST_F(RtpJpegFrames, UserDataInFrontTellsWhereTheCameraLooks) {
+TEST_F(RtpJpegFrames, UserDataInFrontGivesTheCamerasPosition) {
   Payload first(168, 0);
   first[0] = 0xff;
   first[1] = 0xd8;
@@ -164,7 +164,7 @@ TEST_F(RtpJpegFrames, UserDataInFrontTellsWhereTheCameraLooks) {
   EXPECT_EQ(stored_position(), "CamPos: 0001000200030004");
 }
 
-TEST_F(RtpJpegFrames, WithoutUserDataInFrontNoPositionIsLookedFor) {
+TEST_F(RtpJpegFrames, WithoutUserDataInFrontNoPositionIsSearchedFor) {
   Payload scan;
   for (const char c : std::string("CamPos: 5")) scan.push_back(static_cast<unsigned char>(c));
   send_picture({jpeg_packet(0, scan)});
@@ -172,7 +172,7 @@ TEST_F(RtpJpegFrames, WithoutUserDataInFrontNoPositionIsLookedFor) {
   EXPECT_EQ(stored_position(), "");
 }
 
-TEST_F(RtpJpegFrames, APictureBehindALossBeginsAfreshWithoutTheBrokenOne) {
+TEST_F(RtpJpegFrames, APictureAfterALossBeginsAfreshWithoutTheBrokenOne) {
   send_picture(small_picture(1));
   expect_small_picture(1);
   send_packet(jpeg_packet(0, {2}), Marker::kUnset);

@@ -42,7 +42,7 @@ TEST_F(RtpMpeg4Frames, APictureOfNoKnownCodeIsHandedOutAsInvalid) {
   EXPECT_EQ(frame_.frameType, VIDEO_FRAME_INVALID);
 }
 
-TEST_F(RtpMpeg4Frames, APictureBehindALossWaitsForTheNextKeyPicture) {
+TEST_F(RtpMpeg4Frames, APictureAfterALossWaitsForTheNextKeyPicture) {
   send_picture(kMpeg4Key);
   EXPECT_EQ(read(), LIBD_OK);
   ++sequence_;

@@ -64,7 +64,7 @@ TEST(SelectStream, RefusesAStreamThatIsNotThereAndChangesNothing) {
   }
 }
 
-TEST(SelectStream, TellsTheFailureOfItsInquiry) {
+TEST(SelectStream, ReportsTheFailureOfItsInquiry) {
   LiveCamera camera(camera_options());
   MediaDriver driver;
   camera.introduce(driver);

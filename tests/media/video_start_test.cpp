@@ -196,7 +196,7 @@ TEST(VideoStart, SetsAsideAZeroedStagingBufferAndKeepsLargeFramesForJpegAlone) {
   }
 }
 
-TEST(VideoStart, CountsTheSilenceFromBehindTheOpen) {
+TEST(VideoStart, CountsTheSilenceFromAfterTheOpen) {
   static std::atomic<std::time_t> now;
   now = 5000;
   auto options = camera_options();

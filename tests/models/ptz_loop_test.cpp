@@ -62,7 +62,7 @@ class ModelAtWork : private ModelCamera {
     ASSERT_EQ(device_->StartVideoStreaming(), LIBD_OK);
   }
 
-  /// The position that the pictures tell, once it is where the camera looks.
+  /// The position in the pictures, once it is the camera's own.
   SLibDPTZStatus seen() {
     SLibDPTZStatus status;
     NoPicture sink;

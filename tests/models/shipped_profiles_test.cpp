@@ -65,7 +65,7 @@ TEST(ShippedProfiles, CoverEveryKindOfCamera) {
   EXPECT_TRUE(seen.lod);
 }
 
-// What a profile says at first, and what the driver says once the camera has reported its settings, come from two
+// What a profile lists at first, and what the driver lists once the camera has reported its settings, come from two
 // tables.
 TEST(ShippedProfiles, OfferWhatTheFilterOffersWithoutACriterion) {
   for (const vexa::Profile& profile : shipped_profiles()) {

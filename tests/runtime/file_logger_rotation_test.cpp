@@ -105,7 +105,7 @@ TEST(FileLoggerRotation, WithoutCopiesTheSameFileGrowsAndEveryLineRotatesAgain) 
   }
 }
 
-TEST(FileLoggerRotation, TheNumberStandsBeforeTheExtension) {
+TEST(FileLoggerRotation, TheNumberComesBeforeTheExtension) {
   const struct {
     const char* name;
     const char* copy;

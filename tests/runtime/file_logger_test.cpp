@@ -86,7 +86,7 @@ TEST(FileLogger, HasItsMembersFirstAndInOrder) {
   EXPECT_LT(offsetof(CFileLogger::FileInfo, fileHandle), offsetof(CFileLogger::FileInfo, referenceCount));
 }
 
-TEST(FileLogger, SetFileNameIsTheSlotBehindTheDestructors) {
+TEST(FileLogger, SetFileNameIsTheSlotAfterTheDestructors) {
   struct Renamed : CFileLogger {
     void SetFileName(const char* name) override { given = name; }
     std::string given;

@@ -55,7 +55,7 @@ TEST(DeleteFile, RemovesAFile) {
   EXPECT_FALSE(is_there(path));
 }
 
-TEST(FileNames, EachFailureIsToldWithItsPath) {
+TEST(FileNames, EachFailureIsReportedWithItsPath) {
   const TemporaryFolder folder;
   const std::string file = folder.make_file("file");
   const std::string full = folder.make_folder("full");
@@ -93,7 +93,7 @@ TEST(FileNames, NullCountsAsTheEmptyPath) {
             "MoveFile rename  to : No such file or directory\n");
 }
 
-TEST(FileNames, AnUnprivilegedUserIsToldWhatItMayNotDo) {
+TEST(FileNames, AnUnprivilegedUsersRefusalIsReported) {
   const TemporaryFolder folder;
   const std::string file = folder.make_file("file");
   const std::string sub = folder.make_folder("sub");

@@ -138,7 +138,7 @@ TEST(GetFileAttributesEx, FillsItsRecord) {
   EXPECT_EQ(data.nFileSizeLow, 5U);
 }
 
-TEST(GetFileAttributesEx, TellsTheLowHalfOfALargeSize) {
+TEST(GetFileAttributesEx, ReportsTheLowHalfOfALargeSize) {
   const TemporaryFolder folder;
   const std::string path = folder.make_file("large");
   ASSERT_EQ(truncate64(path.c_str(), (off64_t{5} << 32) + 7), 0);
@@ -158,7 +158,7 @@ TEST(GetFileAttributesEx, RefusesOtherLevels) {
   }
 }
 
-TEST(GetFileAttributesEx, TellsWhyAPathCannotBeRead) {
+TEST(GetFileAttributesEx, ReportsWhyAPathCannotBeRead) {
   WIN32_FILE_ATTRIBUTE_DATA data;
   EXPECT_EQ(stderr_of([&] { EXPECT_EQ(GetFileAttributesEx("/gone/%s", GetFileExInfoStandard, &data), 0); }),
             "GetFileAttributesEx stat /gone/%s: No such file or directory\n");
@@ -185,7 +185,7 @@ TEST(FileTime, CountsWholeSecondsInTicksSince1601) {
   }
 }
 
-TEST(GetDiskFreeSpaceEx, TellsTheSystemsBlocksInBytes) {
+TEST(GetDiskFreeSpaceEx, ReportsTheSystemsBlocksInBytes) {
   const TemporaryFolder folder;
   struct statvfs64 system {};
   ASSERT_EQ(statvfs64(folder.path().c_str(), &system), 0);
@@ -207,7 +207,7 @@ TEST(GetDiskFreeSpaceEx, CountsIn64BitsAndInFragments) {
   EXPECT_EQ(bytes.HighPart, 0x1000U);
 }
 
-TEST(GetDiskFreeSpaceEx, TellsAvailableAllAndFreeBlocksApart) {
+TEST(GetDiskFreeSpaceEx, DistinguishesAvailableAllAndFreeBlocks) {
   struct statvfs64 system {};
   system.f_frsize = 512;
   system.f_blocks = 5;
@@ -242,7 +242,7 @@ TEST(GetDiskFreeSpaceEx, NullIsTheWorkingFolder) {
   EXPECT_EQ(total.QuadPart, std::uint64_t{here.f_blocks} * here.f_frsize);
 }
 
-TEST(GetDiskFreeSpaceEx, TellsItsFailureAndKeepsErrno) {
+TEST(GetDiskFreeSpaceEx, ReportsItsFailureAndKeepsErrno) {
   ULARGE_INTEGER value;
   value.QuadPart = 42;
   int error = 0;

@@ -135,7 +135,7 @@ TEST(CreateFile, IgnoresWhatItDoesNotKnow) {
   EXPECT_EQ(CloseHandle(event), 1);
 }
 
-TEST(CreateFile, TellsWhyItFailsAndKeepsNoDescriptor) {
+TEST(CreateFile, ReportsWhyItFailsAndKeepsNoDescriptor) {
   const std::size_t before = open_descriptors();
   const std::string long_name(4096, 'n');
   const struct {
@@ -154,7 +154,7 @@ TEST(CreateFile, TellsWhyItFailsAndKeepsNoDescriptor) {
   EXPECT_EQ(open_descriptors(), before);
 }
 
-TEST(CreateFile, TellsThatAFileIsReadOnly) {
+TEST(CreateFile, ReportsThatAFileIsReadOnly) {
   const TemporaryFolder folder;
   ASSERT_EQ(chmod(folder.path().c_str(), 0755), 0);
   const std::string path = folder.make_file("file");
@@ -166,7 +166,7 @@ TEST(CreateFile, TellsThatAFileIsReadOnly) {
             "CreateFile fopen " + path + ": Permission denied\n");
 }
 
-TEST(CreateFile, TellsThatMemoryIsShort) {
+TEST(CreateFile, ReportsThatMemoryIsShort) {
   typedHandle* file = nullptr;
   EXPECT_EQ(stderr_of([&] {
               errno = ENOMEM;
@@ -200,7 +200,7 @@ TEST(File, HandlesThatAreNoFilesAreRefusedBeforeAnythingIsSet) {
   EXPECT_EQ(FindClose(search), 1);
 }
 
-TEST(GetFileSize, TellsTheSizeAndAZeroHighHalf) {
+TEST(GetFileSize, ReportsTheSizeAndAZeroHighHalf) {
   const TemporaryFolder folder;
   typedHandle* file = open_file(folder.make_file("file", "twelve bytes"), 1, OPEN_EXISTING);
   unsigned long high = 42;
@@ -221,7 +221,7 @@ TEST(GetFileSize, CutsALargeSizeToItsLowHalf) {
   EXPECT_EQ(CloseHandle(file), 1);
 }
 
-TEST(GetFileSize, TellsItsFailure) {
+TEST(GetFileSize, ReportsItsFailure) {
   const BrokenFile broken;
   unsigned long high = 42;
   EXPECT_EQ(stderr_of([&] { EXPECT_EQ(GetFileSize(broken.handle(), &high), kNoSize); }),
@@ -229,7 +229,7 @@ TEST(GetFileSize, TellsItsFailure) {
   EXPECT_EQ(high, 42UL);
 }
 
-TEST(SetFilePointer, CountsFromWhereItIsTold) {
+TEST(SetFilePointer, CountsFromTheGivenPlace) {
   const TemporaryFolder folder;
   typedHandle* file = open_file(folder.make_file("file", "0123456789"), 1, OPEN_EXISTING);
   EXPECT_EQ(SetFilePointer(file, 4, nullptr, FILE_BEGIN), 4U);
@@ -252,7 +252,7 @@ TEST(SetFilePointer, RefusesAHighHalf) {
   EXPECT_EQ(CloseHandle(file), 1);
 }
 
-TEST(SetFilePointer, TellsItsFailure) {
+TEST(SetFilePointer, ReportsItsFailure) {
   const TemporaryFolder folder;
   typedHandle* file = open_file(folder.make_file("file"), 1, OPEN_EXISTING);
   EXPECT_EQ(stderr_of([&] { EXPECT_EQ(SetFilePointer(file, -1, nullptr, FILE_BEGIN), kNoSize); }),
@@ -262,7 +262,7 @@ TEST(SetFilePointer, TellsItsFailure) {
   EXPECT_EQ(CloseHandle(file), 1);
 }
 
-TEST(FlushFileBuffers, TellsItsResult) {
+TEST(FlushFileBuffers, ReportsItsResult) {
   const TemporaryFolder folder;
   typedHandle* file = open_file(folder.make_file("file"), 2, OPEN_EXISTING);
   EXPECT_EQ(FlushFileBuffers(file), 1);

@@ -115,7 +115,7 @@ TEST(FindFirstFile, FillsNothingWithoutARecord) {
   EXPECT_EQ(FindClose(search), 1);
 }
 
-TEST(FindFirstFile, TellsThatMemoryIsShortForTheHandleOrTheMatches) {
+TEST(FindFirstFile, ReportsThatMemoryIsShortForTheHandleOrTheMatches) {
   const TemporaryFolder folder;
   folder.make_file("a long name that needs memory of its own");
   const std::string pattern = folder / "*";
@@ -155,7 +155,7 @@ TEST(FindNextFile, GoesThroughTheMatchesInOrderAndEndsSilently) {
   EXPECT_EQ(FindClose(search), 1);
 }
 
-TEST(FindNextFile, TellsOfAMatchThatIsGoneAndGoesOnBehindIt) {
+TEST(FindNextFile, ReportsAMatchThatIsGoneAndGoesOnAfterIt) {
   const TemporaryFolder folder;
   for (const char* name : {"a", "b", "c"}) folder.make_file(name);
   _WIN32_FIND_DATA data = marked_data();
@@ -170,7 +170,7 @@ TEST(FindNextFile, TellsOfAMatchThatIsGoneAndGoesOnBehindIt) {
   EXPECT_EQ(FindClose(search), 1);
 }
 
-TEST(FindNextFile, NamesWhatStandsBehindTheLastSlash) {
+TEST(FindNextFile, NamesWhatFollowsTheLastSlash) {
   const TemporaryFolder folder;
   folder.make_folder("sub");
   _WIN32_FIND_DATA data = marked_data();

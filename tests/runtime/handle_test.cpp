@@ -114,7 +114,7 @@ TEST(CloseFileHandle, ClosesSilently) {
   EXPECT_EQ(fcntl(fd, F_GETFD), -1);
 }
 
-TEST(CloseFileHandle, TellsWhyClosingFailedAndStillFreesTheRecord) {
+TEST(CloseFileHandle, ReportsWhyClosingFailedAndStillFreesTheRecord) {
   vexa::FileHandle* file = vexa::new_record<vexa::FileHandle>();
   CaptureStderr();
   EXPECT_EQ(CloseFileHandle(file), 0);

@@ -1,5 +1,5 @@
 // pathglob beside the C library's glob, on a tree of 10,000 names. The rules agree in the C locale for patterns without
-// "^", "\" and character classes, and with "/" at the end only once, behind a "*"; the names and patterns here keep to
+// "^", "\" and character classes, and with "/" at the end only once, after a "*"; the names and patterns here keep to
 // those.
 #include <fcntl.h>
 #include <glob.h>

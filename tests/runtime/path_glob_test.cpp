@@ -291,7 +291,7 @@ int stop(const char* path, int code) {
   return 1;
 }
 
-TEST(PathGlob, TellsTheCallbackOfFoldersItCannotRead) {
+TEST(PathGlob, CallsTheCallbackForFoldersItCannotRead) {
   const TemporaryFolder folder;
   told.clear();
   EXPECT_EQ(find(folder / "gone/*", 0, &go_on).result, -3);

@@ -37,7 +37,7 @@ std::string in_folder(const std::string& folder, unsigned long len) {
   });
 }
 
-TEST(GetCurrentDirectory, TellsTheRoomItNeedsAndCopiesNothing) {
+TEST(GetCurrentDirectory, ReportsTheRoomItNeedsAndCopiesNothing) {
   const std::string untouched(65, '#');
   EXPECT_EQ(in_folder("/tmp", 4), "5 " + untouched);
   EXPECT_EQ(in_folder("/tmp", 0), "5 " + untouched);
@@ -70,7 +70,7 @@ TEST(GetCurrentDirectory, GivesAPathLongerThanTheSystemTakes) {
   EXPECT_EQ(report, std::to_string(expected.size()) + " " + expected);
 }
 
-TEST(GetCurrentDirectory, TellsThatItsFolderIsGone) {
+TEST(GetCurrentDirectory, ReportsThatItsFolderIsGone) {
   const TemporaryFolder folder;
   const std::string gone = folder.make_folder("gone");
   const std::string report = in_child([&] {

@@ -52,7 +52,7 @@ std::string text_of(const std::string& characters) {
   return *rc::gen::container<std::string>(rc::gen::elementOf(characters));
 }
 
-/// Directives that name all seven fields, in any order, with a character that no number holds behind each.
+/// Directives that name all seven fields, in any order, with a character that no number holds after each.
 std::string any_whole_format() {
   const std::vector<std::string> directives = {"%Y",
                                                *rc::gen::element<std::string>("%D", "%d"),

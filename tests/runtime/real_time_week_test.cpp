@@ -38,7 +38,7 @@ CRealTime local_noon(int year, int month, int day) {
 
 CRealTime noon(const WalkedDay& day) { return local_noon(day.year, day.month, day.day); }
 
-TEST(RealTimeWeek, LateDecemberAndEarlyJanuaryBelongWhereTheRuleSays) {
+TEST(RealTimeWeek, LateDecemberAndEarlyJanuaryBelongWhereTheRulePutsThem) {
   const struct {
     int rule;
     int first_day;

@@ -78,7 +78,7 @@ TEST(Ismbstrail, APositionBeforeTheStartIsNoBoundary) {
   EXPECT_EQ(_ismbstrail(text + 1, text), -1);
 }
 
-TEST(Ismbstrail, ReadsNothingAtOrBehindThePosition) {
+TEST(Ismbstrail, ReadsNothingAtOrAfterThePosition) {
   const auto page = static_cast<std::size_t>(sysconf(_SC_PAGESIZE));
   void* pages = mmap(nullptr, 2 * page, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
   ASSERT_NE(pages, MAP_FAILED);
@@ -187,7 +187,7 @@ TEST(InitializeCriticalSection, MakesARecursiveMutex) {
   EXPECT_EQ(pthread_mutex_destroy(&mutex), 0);
 }
 
-TEST(InitializeCriticalSection, TellsWhyItFailed) {
+TEST(InitializeCriticalSection, ReportsWhyItFailed) {
   CaptureStderr();
   InitializeCriticalSection(nullptr);
   EXPECT_EQ(GetCapturedStderr(), "pthread_mutex_init: Invalid argument\n");

@@ -46,7 +46,7 @@ TEST(CloseThreadHandle, MarksARunningThreadsHandleAsClosed) {
   EXPECT_TRUE(goes_through(gate));
 }
 
-// A host's thread-local object: when the thread is gone as far as its exit code tells, it still has work to do.
+// A host's thread-local object: it still has work to do when the thread's exit code is final.
 struct LateWork {
   struct Task {
     long closer;
@@ -165,7 +165,7 @@ TEST(CloseThreadHandle, ByTheThreadItselfDoesNotWaitForItselfAndLeavesNothingBeh
   EXPECT_TRUE(gives_threads_back(close_by_the_thread_itself));
 }
 
-TEST(CleanupThread, AnotherMakersThreadLeavesAnEntryThatTheNextOwnerReplaces) {
+TEST(CleanupThread, AForeignThreadLeavesAnEntryThatTheNextOwnerReplaces) {
   pthread_attr_t attributes;
   pthread_attr_init(&attributes);
   pthread_attr_setstacksize(&attributes, 524288);

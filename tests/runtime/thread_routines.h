@@ -59,7 +59,7 @@ inline unsigned int wait_at_gate(void* argument) {
   return 42;
 }
 
-// Opens the gate and sees the thread behind it end.
+// Opens the gate and waits until its thread has ended.
 inline bool goes_through(Gate& gate) {
   gate.release = true;
   return eventually([&gate] { return gate.left && !is_running(gate.entered); });

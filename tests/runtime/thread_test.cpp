@@ -72,7 +72,7 @@ unsigned int store_own_identifier(void* argument) {
   return 0;
 }
 
-TEST(BeginThread, TellsTheThreadsIdentifier) {
+TEST(BeginThread, ReportsTheThreadsIdentifier) {
   std::atomic<pthread_t> own{0};
   unsigned int out = 0;
   typedHandle* thread = _beginthreadex(nullptr, 0, store_own_identifier, &own, 0, &out);
@@ -196,7 +196,7 @@ TEST(EndThread, RecordsItsCodeAndUnwindsTheRoutine) {
   EXPECT_TRUE(unwound);
 }
 
-TEST(EndThread, EndsAThreadOfOtherMaking) {
+TEST(EndThread, EndsAForeignThread) {
   pthread_t thread = {};
   const auto routine = [](void*) -> void* {
     _endthreadex(3);

@@ -9,7 +9,7 @@ namespace vexa_test {
 
 struct Decoded {
   bool flawless = false;  ///< it met no damage
-  bool silent = true;     ///< nor had it anything to say of it
+  bool silent = true;     ///< it printed no complaint
   std::size_t frames = 0;
   std::string size;  ///< for instance "640x480"
 };

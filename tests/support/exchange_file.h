@@ -1,16 +1,16 @@
 // Exchanges with a camera, one text file each.
 //
-//   timeout 100          what the driver is told before
+//   timeout 100          settings of the driver, made before
 //   call http_open /x    what it is asked to do
 //   >>>                  the bytes it must send; ">>> another": over another connection
 //   GET /x HTTP/1.0\r\n
 //   <<< piece=1 pause=5 then=stay
-//   HTTP/1.0 200 OK\r\n  the camera's answer, and how it is given (close, stay or reset behind it)
+//   HTTP/1.0 200 OK\r\n  the camera's answer, and how it is given (close, stay or reset after it)
 //   ===
 //   result 1             what must come of it
 //
 // Bytes stand as they are; the line ends of the file do not count, "\r", "\n", "\\" and "\x00" stand for bytes. Lines
-// that begin with "#" say what is odd. What another file of the folder has already:
+// that begin with "#" describe what is odd. What another file of the folder has already:
 //
 //   after live_session 2    that file's first 2 requests and answers come first
 //   >>> as live_session     its request at the same place; "<<< as live_session" its answer

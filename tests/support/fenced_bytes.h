@@ -1,4 +1,4 @@
-// Bytes that end right before a page without access, so that a read behind them is caught in every build.
+// Bytes that end right before a page without access, so that a read after them is caught in every build.
 #pragma once
 
 #include <sys/mman.h>

@@ -1,4 +1,4 @@
-// What the system says about this process, and waiting for it to say something else.
+// The state of this process as the system reports it, and waiting for it to change.
 #pragma once
 
 #include <sys/syscall.h>

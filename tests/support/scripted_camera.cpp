@@ -46,7 +46,7 @@ void replace_all(std::string& text, std::string_view from, const std::string& to
   }
 }
 
-/// Two neighbouring ports behind "client_port=" become "{udp}-{udp+1}".
+/// Two neighbouring ports after "client_port=" become "{udp}-{udp+1}".
 std::string with_ports_named(std::string text) {
   constexpr std::string_view kKey = "client_port=";
   const std::size_t begin = text.find(kKey);

@@ -1,5 +1,5 @@
-// A camera that says what a script tells it, and complains when it hears anything else. It shares nothing with the
-// library, so that bytes are compared with what was written down, not with what the library believes.
+// A camera that sends the answers of a script, and complains when it receives anything else. It shares no code with the
+// library, so that bytes are compared with the script, not with what the library believes.
 #pragma once
 
 #include <atomic>
@@ -15,8 +15,8 @@ namespace vexa_test {
 
 /// What becomes of a connection when its last answer is out.
 enum class Then {
-  kClose,  ///< the camera says that it has no more, and waits for the driver to close
-  kStay,   ///< the camera says nothing more, and waits for the driver to close
+  kClose,  ///< the camera shuts its side down, and waits for the driver to close
+  kStay,   ///< the camera falls silent, and waits for the driver to close
   kReset,  ///< the connection is torn
 };
 

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <string>
+#include <vector>
 
 #include "device/driver_state.h"
 #include "runtime/base/sync.h"
@@ -45,6 +46,19 @@ class TestDriver : public Reach<CVexaCommon> {
     m_State->set_stream_socket(vexa::make_media_socket().release());
     const auto port = vexa::bind_media_socket(m_StreamSocket);
     return port ? *port : -1;
+  }
+};
+
+class StreamDriver : public TestDriver {
+ public:
+  ~StreamDriver() override { hold_stream(0); }
+
+  /// A stream buffer of `size` bytes, with nothing received yet; 0: none.
+  void hold_stream(std::size_t size) {
+    delete[] m_StreamBuffer;
+    m_StreamBuffer = size == 0 ? nullptr : new unsigned char[size];
+    m_StreamBufferSize = size;
+    m_StreamFrameStart = m_StreamSearchPos = m_StreamWriteEnd = m_StreamBuffer;
   }
 };
 

@@ -33,7 +33,7 @@ ScriptStep step(const std::string& path, const std::string& answer, Then then = 
   return made;
 }
 
-/// What the latest error says, as "code text".
+/// The latest error as "code text".
 class HttpOpen : public testing::Test {
  protected:
   HttpOpen() { driver_.soil_latest_error(); }
@@ -75,7 +75,7 @@ TEST_F(HttpOpen, GivesASocketThatDoesNotBlockAndIsClosedInChildren) {
   int size = 0;
   socklen_t length = sizeof size;
   EXPECT_EQ(getsockopt(socket, SOL_SOCKET, SO_RCVBUF, &size, &length), 0);
-  EXPECT_EQ(size, 2 * 131072);  // Linux tells twice what was asked for
+  EXPECT_EQ(size, 2 * 131072);  // Linux reports twice what was asked for
   driver_.http_close(socket);
 }
 
@@ -144,14 +144,14 @@ TEST_F(HttpOpen, RefusesALongerRequestAfterConnectingWithNothingSent) {
   }
 }
 
-TEST_F(HttpOpen, TellsThatTheConnectionWasRefused) {
+TEST_F(HttpOpen, ReportsThatTheConnectionWasRefused) {
   driver_.use(own_loopback(0), refusing_port(), 5000);
   EXPECT_EQ(driver_.http_open("/x"), -1);
   EXPECT_EQ(driver_.latest_error(), "0 Connection refused");
   EXPECT_EQ(open_descriptors(), descriptors_);
 }
 
-TEST_F(HttpOpen, TellsThatTheConnectionTimedOut) {
+TEST_F(HttpOpen, ReportsThatTheConnectionTimedOut) {
   const FullListener camera;
   const std::size_t descriptors = open_descriptors();
   driver_.use(camera.host(), camera.port(), 30);
@@ -170,7 +170,7 @@ TEST_F(HttpOpen, ShowsTheResolversNumberAsASystemError) {
   EXPECT_EQ(open_descriptors(), descriptors_);
 }
 
-TEST_F(HttpOpen, TellsThatThereIsNoDescriptorLeft) {
+TEST_F(HttpOpen, ReportsThatThereIsNoDescriptorLeft) {
   driver_.use(own_loopback(0), refusing_port(), 5000);
   EXPECT_EQ(in_child([&driver = driver_] {
               driver.http_open("/x");  // sanitizers look at new types with a descriptor

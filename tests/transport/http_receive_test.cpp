@@ -66,7 +66,7 @@ TEST_F(HttpHeaderRecv, TakesTheHeaderAlone) {
   expect_error(LIBD_FAILED, "from before");
 }
 
-TEST_F(HttpHeaderRecv, TakesUpToTheCarriageReturnsEvenBehindTwoLineFeeds) {
+TEST_F(HttpHeaderRecv, TakesUpToTheCarriageReturnsEvenAfterTwoLineFeeds) {
   say("part one\n\npart two\r\n\r\nbody");
   EXPECT_EQ(driver_.http_header_recv(socket_, buffer_, 1023, 5000), 22);
 }
@@ -108,7 +108,7 @@ TEST_F(HttpHeaderRecv, LooksNoFurtherThanItsLength) {
   EXPECT_EQ(buffer_[19], '#');
 }
 
-TEST_F(HttpHeaderRecv, TellsSystemErrors) {
+TEST_F(HttpHeaderRecv, ReportsSystemErrors) {
   EXPECT_EQ(driver_.http_header_recv(-1, buffer_, 1023, 5000), -1);
   expect_error(LIBD_FAILED, "Bad file descriptor");
   EXPECT_EQ(driver_.http_header_recv(no_socket(), buffer_, 1023, 5000), -1);
@@ -131,7 +131,7 @@ TEST_F(HttpRecv, GivesZeroInSilenceAndAtTheEnd) {
   expect_error(LIBD_FAILED, "from before");
 }
 
-TEST_F(HttpRecv, TellsSystemErrors) {
+TEST_F(HttpRecv, ReportsSystemErrors) {
   EXPECT_EQ(driver_.http_recv(-1, buffer_, 1024, 5000), -1);
   expect_error(LIBD_FAILED, "Bad file descriptor");
   EXPECT_EQ(driver_.http_recv(no_socket(), buffer_, 1024, 5000), -1);
@@ -154,7 +154,7 @@ TEST_F(HttpRecvn, GathersPieces) {
   EXPECT_STREQ(buffer_, "abcdef");
 }
 
-TEST_F(HttpRecvn, OfNothingGivesZeroAtOnce) {
+TEST_F(HttpRecvn, OfZeroBytesGivesZeroAtOnce) {
   EXPECT_EQ(driver_.http_recvn(-1, buffer_, 0, 5000), 0);
   EXPECT_EQ(driver_.http_recvn(-1, buffer_, -1, 5000), 0);
   expect_error(LIBD_FAILED, "from before");
@@ -175,7 +175,7 @@ TEST_F(HttpRecvn, TimesOut) {
   }
 }
 
-TEST_F(HttpRecvn, TellsSystemErrors) {
+TEST_F(HttpRecvn, ReportsSystemErrors) {
   EXPECT_EQ(driver_.http_recvn(-1, buffer_, 1, 5000), -1);
   expect_error(LIBD_FAILED, "Bad file descriptor");
   EXPECT_EQ(driver_.http_recvn(no_socket(), buffer_, 1, 5000), -1);
@@ -259,7 +259,7 @@ TEST(GetUrlParameter, FindsAKeyInsideALongerOne) {
   EXPECT_EQ(value, "on");
 }
 
-TEST(GetUrlParameter, SetsAnEmptyValueAndSaysSo) {
+TEST(GetUrlParameter, SetsAnEmptyValueAndReturnsFalse) {
   TestDriver driver;
   std::string value = "before";
   EXPECT_FALSE(driver.GetUrlParameter("A=&B=1", "A=", value));

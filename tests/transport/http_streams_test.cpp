@@ -9,7 +9,7 @@
 #include "media/assembly/start_code.h"
 #include "tests/support/process_state.h"
 #include "tests/support/stream_pair.h"
-#include "tests/transport/stream_driver.h"
+#include "tests/support/test_driver.h"
 #include "vexa/runtime.h"
 
 namespace vexa_test {
@@ -136,7 +136,7 @@ TEST_F(JpegPart, OfAClosedSocketIsASystemFailure) {
   EXPECT_EQ(driver_.latest_error(), "0 Bad file descriptor");
 }
 
-TEST_F(JpegPart, TellsTheCamerasPosition) {
+TEST_F(JpegPart, GivesTheCamerasPosition) {
   const struct {
     std::string image;
     std::string position;
@@ -213,7 +213,7 @@ TEST_F(AlarmPart, ThatDoesNotComeLeavesTheBits) {
   EXPECT_EQ(state_, 78U);
 }
 
-TEST_F(AlarmPart, ThatSaysNothingClearsTheBits) {
+TEST_F(AlarmPart, WithoutItemsClearsTheBits) {
   pair_.say("--part\r\n\r\n");
   EXPECT_EQ(receive(), 1);
   EXPECT_EQ(mask_, 0U);

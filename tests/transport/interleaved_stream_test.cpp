@@ -7,7 +7,7 @@
 #include <vector>
 
 #include "tests/support/stream_pair.h"
-#include "tests/transport/stream_driver.h"
+#include "tests/support/test_driver.h"
 #include "virtual_camera/codec/rtp_packetiser.h"
 #include "virtual_camera/rtp/rtp_stream.h"
 

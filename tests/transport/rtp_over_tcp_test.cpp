@@ -13,12 +13,12 @@
 #include "tests/support/failing_new.h"
 #include "tests/support/process_state.h"
 #include "tests/support/stream_pair.h"
-#include "tests/transport/stream_driver.h"
+#include "tests/support/test_driver.h"
 
 namespace vexa_test {
 namespace {
 
-/// An interleaved frame of channel 0 that says its packet is `length` bytes long.
+/// An interleaved frame of channel 0 that announces a packet of `length` bytes.
 std::string interleaved(std::string packet, std::size_t length) {
   return std::string("$\0", 2) + static_cast<char>(length >> 8) + static_cast<char>(length) + packet;
 }
@@ -48,7 +48,7 @@ class RtpOverTcp : public testing::Test {
   unsigned int timestamp_ = 2;
 };
 
-TEST_F(RtpOverTcp, GivesThePayloadAndWhatTheHeaderTells) {
+TEST_F(RtpOverTcp, GivesThePayloadAndTheHeadersFields) {
   pair_.say(interleaved(rtp_header() + "payload") + interleaved(rtp_header() + "next"));
   EXPECT_EQ(receive(), 7);
   EXPECT_EQ(payload(8), "payload#");

@@ -65,14 +65,14 @@ TEST_F(RtspHeader, SeesOnlyAPartOfAnAnswerLongerThanHalfTheBuffer) {
   }
 }
 
-TEST_F(RtspHeader, ReadsBehindTheLastLook) {
+TEST_F(RtspHeader, ReadsAfterTheLastPeek) {
   const long thread = kernel_thread_id();
   say(kAnswer.substr(0, 21));
   std::thread camera([this, thread] {
     EXPECT_TRUE(eventually([thread] { return is_sleeping(thread); }));
     say(kAnswer.substr(21));
   });
-  // The second look puts the whole answer behind the first 21 bytes; the read goes behind that, and the caller, who
+  // The second peek puts the whole answer after the first 21 bytes; the read goes after that, and the caller, who
   // reads from the beginning, sees the first look and what fits of the second.
   EXPECT_EQ(receive(1023, 3000), static_cast<int>(kAnswer.size()));
   camera.join();
@@ -119,7 +119,7 @@ TEST_F(RtspHeader, TimesOutOnGarbageThatFillsTheBuffer) {
   EXPECT_EQ(buffer_[1023], '#');
 }
 
-TEST_F(RtspHeader, TakesNothingFromWhatStoodInTheBuffer) {
+TEST_F(RtspHeader, TakesNothingFromWhatWasInTheBuffer) {
   std::memcpy(buffer_, "\r\n\r\n", 4);
   std::memcpy(buffer_ + 3, "\r\n\r\n", 4);
   say("RT");
@@ -127,12 +127,12 @@ TEST_F(RtspHeader, TakesNothingFromWhatStoodInTheBuffer) {
   expect_error(LIBD_TIMEOUT, "Receive timed out");
 }
 
-TEST_F(RtspHeader, ReadsWithoutLookingWhenTheTimeOutIsASecondBelowZero) {
+TEST_F(RtspHeader, ReadsWithoutPeekingWhenTheTimeOutIsASecondBelowZero) {
   say("no header");
   EXPECT_EQ(receive(1023, -1000), 9);
 }
 
-TEST_F(RtspHeader, TellsSystemErrors) {
+TEST_F(RtspHeader, ReportsSystemErrors) {
   EXPECT_EQ(driver_.rtp_over_tcp_header_recv(-1, buffer_, 1023, 1000), -1);
   expect_error(LIBD_FAILED, "Bad file descriptor");
   int ends[2];

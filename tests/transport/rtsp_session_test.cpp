@@ -169,7 +169,7 @@ TEST_F(RtspSession, LeavesTheMediaSocketOpenWhenTheOpenFails) {
   EXPECT_EQ(open_descriptors(), descriptors_ + 1);
 }
 
-TEST_F(RtspSession, TellsThatTheConnectionTimedOut) {
+TEST_F(RtspSession, ReportsThatTheConnectionTimedOut) {
   const FullListener camera;
   const std::size_t descriptors = open_descriptors();
   driver_.use(camera.host(), camera.port(), 30);
@@ -187,7 +187,7 @@ TEST_F(RtspSession, OpensNoSocketForAHostThatIsNotFound) {
   EXPECT_EQ(driver_.latest_error(), "0 Operation not permitted");
 }
 
-TEST_F(RtspSession, TellsThatThereIsNoDescriptorLeft) {
+TEST_F(RtspSession, ReportsThatThereIsNoDescriptorLeft) {
   driver_.use("127.0.0.1", 1, 1000);
   for (const rlim_t spare : {0U, 1U}) {
     EXPECT_EQ(in_child([&driver = driver_, spare] {
@@ -355,28 +355,28 @@ TEST_F(RtspClose, ThatCannotSendReadsTheAnswerAllTheSame) {
   EXPECT_EQ(driver_.m_RtspSocket, -1);
 }
 
-TEST_F(RtspClose, ThatCannotSendTellsTheSystemsText) {
+TEST_F(RtspClose, ThatCannotSendReportsTheSystemsText) {
   leave_no_room_to_send();
   say("RTSP/1.0 200 OK\r\n\r\n");
   close();
   EXPECT_EQ(driver_.LatestErrorText(), "Resource temporarily unavailable");
 }
 
-TEST_F(RtspClose, ToldTwiceTearsDownOnce) {
+TEST_F(RtspClose, CalledTwiceTearsDownOnce) {
   say("RTSP/1.0 200 OK\r\n\r\n");
   close();
   EXPECT_EQ(close(), "");
   EXPECT_EQ(heard(), "TEARDOWN rtsp://camera/ RTSP/1.0\r\nCSeq: 4\r\nSession: 7\r\n\r\n\r\n");
 }
 
-TEST_F(RtspClose, OfOneSocketTellsThePeer) {
+TEST_F(RtspClose, OfOneSocketNotifiesThePeer) {
   driver_.rtp_over_tcp_close(driver_.m_RtspSocket);
   driver_.m_RtspSocket = -1;
   char nothing = 0;
   EXPECT_EQ(recv(camera_, &nothing, 1, MSG_DONTWAIT), 0);
 }
 
-TEST(ParseClock, KeepsWhatTheClockTells) {
+TEST(ParseClock, KeepsWhatTheClockGives) {
   TestDriver driver;
   EXPECT_TRUE(driver.parse_clock("20240131T235959.250Z"));
   EXPECT_EQ(driver.m_RangeClockSeconds, 1706745599);

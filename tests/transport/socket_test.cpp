@@ -75,11 +75,11 @@ TEST(SendOnce, CountsAPartAsAFailure) {
   for (const int end : ends) close(end);
 }
 
-TEST(ShutdownAndClose, PassesOverNoSocketAndTellsThePeer) {
+TEST(ShutdownAndClose, IgnoresNoSocketAndNotifiesThePeer) {
   shutdown_and_close(-1);
   int ends[2];
   ASSERT_EQ(socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends), 0);
-  const int twin = dup(ends[0]);  // the peer hears of the end although another descriptor is still open
+  const int twin = dup(ends[0]);  // the peer sees the end although another descriptor is still open
   shutdown_and_close(ends[0]);
   EXPECT_EQ(fcntl(ends[0], F_GETFD), -1);
   char nothing = 0;

@@ -30,7 +30,7 @@ TEST(ResolveHost, TakesANameOfTheHostsTable) {
   EXPECT_EQ(ntohl(host.address->sin_addr.s_addr), 0x7f000001U);
 }
 
-TEST(ResolveHost, TellsTheResolversNumber) {
+TEST(ResolveHost, ReportsTheResolversNumber) {
   const ResolvedHost host = resolve_host("256.256.256.256", 80);
   EXPECT_FALSE(host.address);
   EXPECT_EQ(host.error, HOST_NOT_FOUND);
@@ -80,7 +80,7 @@ TEST_F(ConnectWithin, CountsARefusalDuringTheWaitAsConnected) {
   EXPECT_EQ(errno, ECONNREFUSED);
 }
 
-TEST_F(ConnectWithin, TellsASystemError) {
+TEST_F(ConnectWithin, ReportsASystemError) {
   EXPECT_EQ(connect_to("255.255.255.255", 80, 10000), -1);
   EXPECT_NE(errno, EINPROGRESS);
 }

@@ -24,13 +24,13 @@ class WaitBudgetTest : public testing::Test {
   int ends_[2] = {-1, -1};
 };
 
-TEST_F(WaitBudgetTest, SaysWhenADescriptorIsReady) {
+TEST_F(WaitBudgetTest, ReportsWhenADescriptorIsReady) {
   EXPECT_EQ(WaitBudget(10000).wait_writable(ends_[0]), 1);
   say();
   EXPECT_EQ(WaitBudget(10000).wait_readable(ends_[0]), 1);
 }
 
-TEST_F(WaitBudgetTest, GivesNothingWhenTheBudgetIsUsedUp) {
+TEST_F(WaitBudgetTest, GivesZeroWhenTheBudgetIsUsedUp) {
   const WaitBudget budget(20);
   EXPECT_EQ(budget.wait_readable(ends_[0]), 0);
   EXPECT_EQ(budget.wait_readable(ends_[0]), 0);
@@ -38,7 +38,7 @@ TEST_F(WaitBudgetTest, GivesNothingWhenTheBudgetIsUsedUp) {
   EXPECT_EQ(budget.wait_readable(ends_[0]), 1);
 }
 
-TEST_F(WaitBudgetTest, OfNothingOrLessLooksOnce) {
+TEST_F(WaitBudgetTest, OfZeroOrLessDoesNotWait) {
   for (const int milliseconds : {0, -1, -1000000}) EXPECT_EQ(WaitBudget(milliseconds).wait_readable(ends_[0]), 0);
   say();
   for (const int milliseconds : {0, -1, -1000000}) EXPECT_EQ(WaitBudget(milliseconds).wait_readable(ends_[0]), 1);

@@ -108,7 +108,7 @@ TEST_F(CardCamera, RecordsOnForTheTimeSetAfterItsNetworkIsBack) {
   ASSERT_TRUE(finished());
 }
 
-TEST_F(CardCamera, TellsItsFreeSpaceAndItsRecordings) {
+TEST_F(CardCamera, ReportsItsFreeSpaceAndItsRecordings) {
   EXPECT_NE(get("/command/inquiry.cgi?inq=a-slot").find("ASlot=Free space : 1024Kbyte"), std::string::npos);
   RecordingHead head;
   const std::string name = camera_.card().begin(head);

@@ -50,7 +50,7 @@ struct SharedConnection {
     received.erase(0, size);
     return front;
   }
-  // What stands next on the connection: a packet, put behind the others, or an answer, which is returned.
+  // What comes next on the connection: a packet, put after the others, or an answer, which is returned.
   std::optional<std::string> take() {
     if (!fill(4)) return "ended";
     if (received[0] != '$') {

@@ -221,7 +221,7 @@ TEST(RtpCamera, AClientWhosePortIsClosedDisturbsNoOther) {
   CameraOptions options = streaming_options("small");
   options.pictures = 50;
   StartedCamera camera(options);
-  // Held, so that nobody else is given the port, by a socket that hears another peer alone.
+  // Held, so that nobody else is given the port, by a socket that receives from another peer alone.
   asio::io_context context;
   const auto loopback = asio::ip::make_address("127.0.0.1");
   asio::ip::udp::socket closed(context, asio::ip::udp::endpoint(loopback, 0));

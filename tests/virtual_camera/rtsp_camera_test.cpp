@@ -14,7 +14,7 @@ namespace {
 
 using std::chrono::milliseconds;
 
-// The number behind "server_port=".
+// The number after "server_port=".
 std::string server_ports(const std::string& answer) {
   const std::size_t begin = answer.find("server_port=") + 12;
   return answer.substr(begin, answer.find("\r\n", begin) - begin);

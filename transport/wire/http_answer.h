@@ -20,7 +20,7 @@ struct StatusLine {
 /// Reads the status line that `text` begins with, `protocol` being "HTTP/" or "RTSP/".
 std::optional<StatusLine> parse_status_line(std::string_view text, std::string_view protocol);
 
-/// The bytes that follow, as "DataLen:" announces them; nothing when it does not, or announces less than none.
+/// The bytes that follow, as "DataLen:" announces them; nullopt when it does not, or announces a negative number.
 std::optional<int> announced_length(std::string_view part_header);
 
 /// The value of the first `key` (which carries its "="), up to the next "&" or the end; not decoded, perhaps empty.

@@ -1,4 +1,4 @@
-// What the driver says over HTTP.
+// The driver's HTTP requests.
 #pragma once
 
 #include <string>
@@ -28,8 +28,8 @@ Formatted http_get_request(const HttpTarget& target);
 /// Percent-encodes every byte but ASCII letters and digits and the characters in `spared`.
 std::string percent_encoded(std::string_view text, std::string_view spared);
 
-/// Percent-encodes what would end a word of a request (blanks, control characters) and the characters in `also`; all
-/// other bytes stay.
+/// Percent-encodes whatever would end a word of a request (blanks, control characters) and the characters in `also`;
+/// all other bytes stay.
 std::string as_one_word(std::string_view text, std::string_view also);
 
 }  // namespace vexa

@@ -9,7 +9,7 @@
 
 namespace vexa {
 
-/// The place of `timestamp` in the order of the list.
+/// The rank of `timestamp` in the order of the list.
 // Kept: small timestamps are lifted by a constant, so that 5 (taken as 10000005) comes after 10000004 and before
 // 9000000.
 constexpr std::uint32_t order_timestamp(std::uint32_t timestamp) {
@@ -25,13 +25,13 @@ constexpr bool sequence_is_ahead(std::uint16_t sequence, std::uint16_t other) {
 static_assert(sequence_is_ahead(0, 65535) && !sequence_is_ahead(65535, 0));
 static_assert(sequence_is_ahead(32766, 0) && !sequence_is_ahead(32767, 0) && !sequence_is_ahead(7, 7));
 
-/// `timestamp` lies after `other`, across the wrap at 2^32.
+/// `timestamp` is later than `other`, across the wrap at 2^32.
 constexpr bool timestamp_is_after(std::uint32_t timestamp, std::uint32_t other) {
   return static_cast<std::int32_t>(timestamp - other) > 0;
 }
 static_assert(timestamp_is_after(0, 0xffffffff) && !timestamp_is_after(0xffffffff, 0));
 
-/// `a` stands before `b` in the list: by timestamp, then by sequence. A search key that is marked keyOnly stands after
+/// `a` comes before `b` in the list: by timestamp, then by sequence. A search key that is marked keyOnly comes after
 /// every packet of its timestamp; equal packets are not ordered, and so keep their arrival order.
 inline bool ordered_before(const SPacketInfo& a, const SPacketInfo& b) {
   const std::uint32_t time_a = order_timestamp(a.timestamp);
@@ -41,8 +41,8 @@ inline bool ordered_before(const SPacketInfo& a, const SPacketInfo& b) {
   return a.sequence != b.sequence && !sequence_is_ahead(a.sequence, b.sequence);
 }
 
-/// Where `packet` belongs in the ordered list: behind all that it does not precede. Looks at the newest packet first,
-/// so that packets in order cost the same however many are listed.
+/// Where `packet` belongs in the ordered list: after all that it does not precede. Compares with the newest packet
+/// first, so that packets in order cost the same however many are listed.
 inline std::vector<SPacketInfo>::iterator place_of(std::vector<SPacketInfo>& packets, const SPacketInfo& packet) {
   if (packets.empty() || !ordered_before(packet, packets.back())) return packets.end();
   return std::upper_bound(packets.begin(), packets.end(), packet, ordered_before);

@@ -4,7 +4,7 @@ namespace vexa {
 
 std::uint32_t PacketRing::next_offset() {
   if (fill_ <= kSize - kDatagramRoom) return fill_;
-  // What earlier rounds left intact lies behind all of this round.
+  // What earlier rounds left intact comes after all of this round.
   this_round_.insert(this_round_.end(), earlier_rounds_.begin() + static_cast<std::ptrdiff_t>(oldest_),
                      earlier_rounds_.end());
   earlier_rounds_.swap(this_round_);

@@ -1,4 +1,4 @@
-// Where datagrams lie in the packet buffer, and which of them a new one overwrites.
+// The places of datagrams in the packet buffer, and which of them a new one overwrites.
 #pragma once
 
 #include <cstddef>
@@ -9,8 +9,8 @@
 
 namespace vexa {
 
-/// Places datagrams one behind the other in a buffer of kSize bytes, beginning again at its start when less than a
-/// whole datagram's room is left. Knows which kept packets lie where, in the order in which they will be overwritten,
+/// Places datagrams one after the other in a buffer of kSize bytes, beginning again at its start when less than a
+/// whole datagram's room is left. Knows the place of each kept packet, in the order in which they will be overwritten,
 /// so that a datagram costs the same however many are kept.
 class PacketRing {
  public:
@@ -38,14 +38,14 @@ class PacketRing {
   /// The packet kept last is not listed after all.
   void take_back() { this_round_.pop_back(); }
 
-  /// No packet is kept any more: begins again at the start, whose memory is still at hand.
+  /// No packet is kept any more: begins again at the start, whose memory is still in the cache.
   void restart();
 
  private:
   std::uint32_t fill_ = 0;
   std::uint32_t last_offset_ = 0;
   std::vector<Slot> this_round_;      // ascending by offset, below fill_
-  std::vector<Slot> earlier_rounds_;  // ascending by offset; those from oldest_ on lie at or behind fill_
+  std::vector<Slot> earlier_rounds_;  // ascending by offset; those from oldest_ on are at or after fill_
   std::size_t oldest_ = 0;
 };
 

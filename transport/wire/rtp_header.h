@@ -30,13 +30,13 @@ std::optional<RtpHeader> parse_rtp_header(Bytes datagram);
 inline constexpr std::size_t kInterleavedPrefixSize = 4;
 inline constexpr int kRtpVersionNumber = 2;
 
-/// Bytes of the packet that follows; nothing when the prefix does not begin with "$". Whatever the channel.
+/// Bytes of the packet that follows, on whatever channel; nullopt when the prefix does not begin with "$".
 std::optional<std::uint16_t> interleaved_length(Bytes prefix);
 
 /// Control packets (RTCP) go on the odd channels.
 inline bool is_control_channel(Bytes prefix) { return (prefix[1] & 1) != 0; }
 
-/// What the first byte of an RTP header (RFC 3550, 5.1) tells on this way.
+/// The fields of an RTP header's first byte (RFC 3550, 5.1), as this transport reads them.
 struct RtpFront {
   int version;
   std::size_t csrc_bytes;  ///< of the contributing sources between header and payload
@@ -44,7 +44,7 @@ struct RtpFront {
 
 RtpFront rtp_front(std::uint8_t first_byte);
 
-/// Payload bytes of a packet of `length` bytes; nothing when header and sources alone are longer.
+/// Payload bytes of a packet of `length` bytes; nullopt when header and sources alone are longer.
 std::optional<std::size_t> interleaved_payload(std::uint16_t length, RtpFront front);
 
 }  // namespace vexa

@@ -71,7 +71,7 @@ RangeClock parse_range_clock(std::string_view text) {
       case 'Z':
       case '\n':
       case '\r':
-        // Kept: without a "." the seconds are not told, and the time of day is read as the fraction.
+        // Kept: without a "." the seconds are not set, and the time of day is read as the fraction.
         read.micros = micros_in(clock.substr(field_begin, at - field_begin));
         read.understood = true;
         return read;

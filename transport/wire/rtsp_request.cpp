@@ -18,7 +18,7 @@ Formatted rtsp_describe(const RtspHead& head) {
 }
 
 Formatted rtsp_setup_udp(const RtspHead& head, int port) {
-  // Kept: the track is always "/video" behind the session's URL, whatever the description names; cameras answer to it.
+  // Kept: the track is always the session's URL with "/video", whatever the description names; cameras answer to it.
   return format_within(kRequestRoom,
                        "SETUP %s/video RTSP/1.0\r\nCSeq: %d\r\nTransport: RTP/AVP;unicast;client_port=%d-%d\r\n"
                        "Authorization: Basic %s\r\n\r\n",

@@ -1,4 +1,4 @@
-// What the driver says over RTSP (RFC 2326), each request as cameras have always been sent it.
+// The driver's RTSP requests (RFC 2326), byte for byte; cameras depend on their form.
 #pragma once
 
 #include <ctime>
@@ -8,22 +8,22 @@
 
 namespace vexa {
 
-/// What every request carries.
+/// What each request carries.
 struct RtspHead {
   const std::string& url;
   int cseq;
   const char* credentials;  ///< Basic, in Base64
 };
 
-/// What a session is played with.
+/// What a PLAY request carries.
 struct RtspPlay {
   int session;
   int scale;
 };
 
-// Each is cut when it does not fit.
+// Each is cut if it does not fit.
 Formatted rtsp_describe(const RtspHead& head);
-/// Names `port` and the one behind it for RTP over UDP.
+/// Names `port` and the one after it for RTP over UDP.
 Formatted rtsp_setup_udp(const RtspHead& head, int port);
 /// Takes RTP inside the RTSP connection.
 Formatted rtsp_setup_interleaved(const RtspHead& head);

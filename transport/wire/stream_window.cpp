@@ -33,7 +33,7 @@ void StreamWindow::make_room(StartCode code) {
   const std::size_t length = static_cast<std::size_t>(places_.write_end - places_.frame_start);
   std::memmove(buffer_.data(), places_.frame_start, length);
   places_.frame_start = buffer_.data();
-  // Kept: the frame under work is searched again from its front.
+  // Kept: the unfinished frame is searched again from its front.
   places_.search = buffer_.data() + code.length;
   places_.write_end = buffer_.data() + length;
 }

@@ -16,14 +16,14 @@ struct StartCode {
   std::size_t length;  ///< bytes of one start code
 };
 
-/// Cuts frames out of a buffer; a frame runs from one start code to the next. Holds no bytes: the buffer and the places
-/// in it are the caller's, and outlive the window.
+/// Cuts frames out of a buffer; a frame is everything from one start code to the next. Holds no bytes: the buffer and
+/// the places in it are the caller's, and outlive the window.
 class StreamWindow {
  public:
-  /// Places in the buffer. frame_start <= write_end always; search may be anywhere behind frame_start.
+  /// Places in the buffer. frame_start <= write_end always; search may be anywhere after frame_start.
   struct Places {
     unsigned char*& frame_start;  ///< first byte of the frame that is not handed out yet
-    unsigned char*& search;       ///< where the next start code is looked for
+    unsigned char*& search;       ///< where the search for the next start code goes on
     unsigned char*& write_end;    ///< end of the bytes received
   };
 
@@ -31,14 +31,14 @@ class StreamWindow {
 
   enum class Cut { kFrame, kNoneYet, kTooLong };
 
-  /// Copies the next whole frame to `room` and steps behind it; `length` is the frame's then. A frame that is longer
-  /// than the room stays where it is, for ever.
+  /// Copies the next whole frame to `room` and moves on to the one after it; `length` is the frame's then. A frame that
+  /// is longer than the room stays, and blocks all that follow.
   Cut cut_frame(StartCode code, std::span<unsigned char> room, std::size_t& length);
 
-  /// Moves the frame under work to the buffer's start when little room is left behind it.
+  /// Moves the unfinished frame to the buffer's start when little room is left after it.
   void make_room(StartCode code);
 
-  /// Where received bytes go; their count is told to `received`.
+  /// Where received bytes go; `received` is then called with their count.
   std::span<unsigned char> free_room() const;
   void received(std::size_t count) { places_.write_end += count; }
 

@@ -28,7 +28,7 @@ struct RecordingHead {
 };
 
 // A coded picture and its moment after the recording's start. Moments are whole tenths of a millisecond, which RTP's
-// clock of 90 kHz tells exactly.
+// clock of 90 kHz expresses exactly.
 struct StoredPicture {
   std::shared_ptr<const std::string> bytes;
   bool key = false;
@@ -57,31 +57,32 @@ struct Recording {
 
 enum class CardHealth { kGood, kMissing, kFailing };
 
-// Thread-safe. One recording is made at a time; what is full stays full until something is deleted.
+// The recordings of one camera, in memory. Owned by the camera's state; thread-safe. One recording is made at a time,
+// and what is full stays full until a recording is deleted.
 class Card {
  public:
   // 0 bytes: the slot is empty.
   explicit Card(std::uint64_t capacity);
 
-  // A missing card takes nothing and shows nothing; a failing one shows what it holds and does neither write nor
+  // A missing card neither records nor lists; a failing one lists what it holds and does neither write nor
   // delete.
   void set_health(CardHealth health);
   [[nodiscard]] CardHealth health() const;
   [[nodiscard]] std::uint64_t free_bytes() const;
 
-  // Begins a recording and tells its name, which no other has had; empty when the card takes none.
+  // Begins a recording and returns its name, which no other has had; empty when the card takes none.
   [[nodiscard]] std::string begin(RecordingHead head);
   // Adds to the recording begun. False when it cannot, or the recording was deleted: it has ended.
   [[nodiscard]] bool add(StoredPicture picture);
   void finish();
 
-  // A line for each recording; nothing when there is no card.
+  // A line for each recording; none when there is no card.
   enum class Order { kOldest, kNewest };
   [[nodiscard]] std::optional<std::string> search(Order order) const;
-  // The free space as the inquiry tells it.
+  // The free space as the inquiry reports it.
   [[nodiscard]] std::string space_text() const;
 
-  // From the oldest to the newest; nothing when there is no card.
+  // From the oldest to the newest; none when there is no card.
   [[nodiscard]] std::optional<std::vector<Recording>> recordings() const;
   [[nodiscard]] std::optional<Recording> find(std::string_view name) const;
   [[nodiscard]] bool holds(std::string_view name) const;
@@ -100,7 +101,7 @@ class Card {
   std::uint64_t made_ = 0;
 };
 
-// "/command/search?Order=oldest", and "/command/edgestorage.cgi?delete=all" or "?DeletebyName=NAME"; nothing for any
+// "/command/search?Order=oldest", and "/command/edgestorage.cgi?delete=all" or "?DeletebyName=NAME"; none for any
 // other request.
 [[nodiscard]] std::optional<Answer> answer_card(const RequestHead& request, Card& card);
 

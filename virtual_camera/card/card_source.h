@@ -11,9 +11,9 @@
 
 namespace vexa::camera {
 
-// Forward, pictures tell the times they were stored at, whatever the pace. Backward there are key pictures alone, and
-// they tell how long the playback has run, since times on the wire only go forward. Ends when the card has no longer
-// what it plays.
+// Forward, pictures carry the times they were stored at, whatever the pace. Backward there are key pictures alone, and
+// they carry the time that the playback has run, since times on the wire only go forward. Ends when the card has no
+// longer what it plays.
 class CardSource : public PictureSource {
  public:
   // `card` outlives it; the recording holds a picture; `scale` is not 0.

@@ -12,7 +12,7 @@ namespace vexa::camera {
 // Bits that a number takes; 0 for 0.
 [[nodiscard]] constexpr int bits_in(std::uint32_t value) { return static_cast<int>(std::bit_width(value)); }
 
-// Made for one picture by the code that draws it; not shared.
+// Collects the bits of one header or slice in memory. A local value of one thread; writes no file.
 class BitWriter {
  public:
   // The lowest `count` bits of the value, up to 32.

@@ -27,11 +27,11 @@ struct AccessUnit {
   [[nodiscard]] std::span<const std::uint8_t> unit(const NalUnit& nal) const {
     return std::span(bytes).subspan(nal.offset, nal.size);
   }
-  // The picture as a receiver rebuilds it from RTP: every NAL unit behind a start code of four bytes.
+  // The picture as a receiver rebuilds it from RTP: every NAL unit after a start code of four bytes.
   [[nodiscard]] std::vector<std::uint8_t> as_delivered() const;
 };
 
-// Immutable once loaded, and shared by any number of cameras and threads.
+// Holds the whole clip in memory. Immutable after loading and shared by any number of streams.
 class Clip {
  public:
   Clip() = default;

@@ -35,7 +35,7 @@ void put_se(BitWriter& out, int value) {
   put_ue(out, value > 0 ? 2 * magnitude - 1 : 2 * magnitude);
 }
 
-// The unit's bytes, behind the stop bit.
+// The unit's bytes, after the stop bit.
 std::string finished_unit(BitWriter& out) {
   out.bits(1, 1);
   out.pad(0);

@@ -1,4 +1,4 @@
-// Baseline JPEG (ITU-T T.81), drawn: blocks of nothing but their means.
+// Baseline JPEG (ITU-T T.81), drawn: each block holds its mean alone.
 #include <array>
 #include <cstdlib>
 #include <string_view>
@@ -40,7 +40,7 @@ void append_number(std::string& to, std::size_t value) {
   to += static_cast<char>(value & 0xffU);
 }
 
-// A marker and the segment behind it, with its length.
+// A marker and the segment after it, with its length.
 void append_segment(std::string& to, char marker, std::string_view body) {
   to += '\xff';
   to += marker;
@@ -66,7 +66,7 @@ std::array<MeanCode, 12> mean_codes(std::string_view table) {
   return codes;
 }
 
-// One component's blocks: their means are told as differences.
+// One component's blocks: their means are written as differences.
 class JpegComponent {
  public:
   JpegComponent(std::string_view table, MeanCode end_of_block) : codes_(mean_codes(table)), end_(end_of_block) {}

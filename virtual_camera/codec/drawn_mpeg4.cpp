@@ -30,7 +30,7 @@ void put_stuffing(BitWriter& out) {
   out.pad(1);
 }
 
-// The means of the blocks of one plane, from which those behind are predicted (7.4.3.1).
+// The means of the blocks of one plane, from which those after are predicted (7.4.3.1).
 class BlockMeans {
  public:
   BlockMeans(std::uint32_t columns, std::uint32_t rows)
@@ -63,7 +63,7 @@ class Mpeg4Picture {
   Mpeg4Picture(BitWriter& out, const SquareGrid& grid)
       : out_(out), brightness_(2 * grid.columns, 2 * grid.rows), blue_(grid.columns, grid.rows), red_(blue_) {}
 
-  // Behind the square's type: no prediction of coefficients, and none but the means.
+  // After the square's type: no prediction of coefficients, and none but the means.
   void put_square(std::uint32_t column, std::uint32_t row, const SquareColour& colour) {
     put_code(out_, "0");
     put_code(out_, "0011");
@@ -99,7 +99,7 @@ void put_headers(BitWriter& out, const DrawnVideo& video) {
   put_stuffing(out);
   put_unit(out, 0x00);
   put_unit(out, 0x20);
-  out.bits(0, 1);  // not every picture stands alone
+  out.bits(0, 1);  // not every picture is a key picture
   out.bits(1, 8);  // a simple object
   out.bits(0, 1);
   out.bits(1, 4);  // square pixels
@@ -107,7 +107,7 @@ void put_headers(BitWriter& out, const DrawnVideo& video) {
   out.bits(0, 2);  // rectangular
   out.bits(1, 1);
   out.bits(static_cast<std::uint32_t>(video.frame_rate), 16);
-  out.bits(0b101, 3);  // pictures tell their times
+  out.bits(0b101, 3);  // pictures carry their times
   out.bits(static_cast<std::uint32_t>(video.width), 13);
   out.bits(1, 1);
   out.bits(static_cast<std::uint32_t>(video.height), 13);

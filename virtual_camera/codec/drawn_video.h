@@ -14,7 +14,7 @@ struct DrawnVideo {
   int frame_rate = 1;  // pictures a second, 1 to 255
 };
 
-// Picture `index` of an endless run. Of H.264 and MPEG-4 each second begins with a key picture behind its parameter
+// Picture `index` of an endless run. Of H.264 and MPEG-4 each second begins with a key picture after its parameter
 // sets or headers; the others need all since then.
 [[nodiscard]] std::string draw_h264(const DrawnVideo& video, std::uint64_t index);   // Baseline, Annex B
 [[nodiscard]] std::string draw_mpeg4(const DrawnVideo& video, std::uint64_t index);  // simple profile
@@ -33,7 +33,7 @@ struct SquareGrid {
   std::uint32_t rows;
 };
 
-inline constexpr std::uint32_t kPatchSide = 4;  // squares that look alike, across and down
+inline constexpr std::uint32_t kPatchSide = 4;  // squares of one colour, across and down
 
 // What a square of JPEG and MPEG-4 looks like, 1 to 254 each.
 struct SquareColour {

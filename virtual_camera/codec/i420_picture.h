@@ -16,8 +16,7 @@ struct Colour {
   bool operator==(const Colour&) const = default;
 };
 
-// Keeps its memory from picture to picture.
-// A value; whoever paints it owns it.
+// The canvas of one encoder, used on its thread. Keeps its memory from picture to picture.
 class I420Picture {
  public:
   I420Picture() = default;

@@ -21,7 +21,7 @@ std::string two_bytes(std::size_t number) {
   return {static_cast<char>(number >> 8 & 0xff), static_cast<char>(number & 0xff)};
 }
 
-// Where the scan of a JPEG picture begins: behind the segments in front of it (ITU-T T.81, B.1.1.4).
+// Where the scan of a JPEG picture begins: after the segments in front of it (ITU-T T.81, B.1.1.4).
 std::optional<std::size_t> scan_of(std::string_view bytes, std::size_t begin) {
   constexpr unsigned kStartOfScan = 0xda;
   std::size_t at = begin + kMarkerSize;
@@ -62,7 +62,7 @@ std::shared_ptr<const ImageClip> ImageClip::load(const std::string& path) {
 }
 
 bool is_key_picture(Codec kind, std::string_view picture) {
-  constexpr std::size_t kUnitCode = 3;  // behind 00 00 01
+  constexpr std::size_t kUnitCode = 3;  // after 00 00 01
   constexpr unsigned kSequence = 0xb0;
   constexpr unsigned kGroup = 0xb3;
   switch (kind) {

@@ -13,10 +13,10 @@ namespace vexa::camera {
 
 class Clip;
 
-// A clip cut into pictures. Immutable, shared by any number of cameras.
+// A clip cut into pictures, held in memory. Immutable, shared by any number of cameras.
 class ImageClip {
  public:
-  // Known by its extension: ".mjpeg" (JPEG pictures one behind the other), ".h264" (Annex B) or ".m4v" (MPEG-4 Visual).
+  // Known by its extension: ".mjpeg" (JPEG pictures one after the other), ".h264" (Annex B) or ".m4v" (MPEG-4 Visual).
   // Null when the file cannot be read, is of no such kind, or holds no picture.
   [[nodiscard]] static std::shared_ptr<const ImageClip> load(const std::string& path);
 
@@ -42,7 +42,7 @@ class ImageClip {
 // in front of an H.264 picture, a user-data unit in front of the coded MPEG-4 picture. Unchanged without a text.
 [[nodiscard]] std::string with_user_data(Codec kind, const std::string& picture, std::string_view text);
 
-// A SEI unit of unregistered user data (ITU-T H.264, D.1.7) that holds the text, behind a start code of four bytes.
+// A SEI unit of unregistered user data (ITU-T H.264, D.1.7) that holds the text, after a start code of four bytes.
 [[nodiscard]] std::string sei_unit(std::string_view text);
 
 // The pictures of a file of each kind.

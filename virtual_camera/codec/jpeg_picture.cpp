@@ -31,7 +31,7 @@ class Reader {
   explicit Reader(Bytes file) : file_(file) {}
 
   std::optional<JpegPicture> read() {
-    std::size_t at = 2;  // behind SOI
+    std::size_t at = 2;  // after SOI
     while (at + 4 <= file_.size()) {
       const std::uint8_t marker = file_[at + 1];
       const std::size_t length = number_at(file_, at + 2);

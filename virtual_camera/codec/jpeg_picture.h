@@ -24,7 +24,7 @@ struct JpegPicture {
   bool operator==(const JpegPicture&) const = default;
 };
 
-// Nothing for a file that RFC 2435 cannot carry: not baseline, not 4:2:0 of three components, sides that are no
+// Nullopt for a file that RFC 2435 cannot carry: not baseline, not 4:2:0 of three components, sides that are no
 // multiple of 8 or above 2040, quantisation tables of 16 bits, or Huffman tables of its own.
 [[nodiscard]] std::optional<JpegPicture> read_jpeg(std::span<const std::uint8_t> file);
 

@@ -81,7 +81,7 @@ void set_up(AVCodecContext& context, const LiveEncoding& encoding) {
 
 struct StartCode {
   std::size_t at = 0;    // of its first byte
-  std::size_t unit = 0;  // of the byte behind it; both are the end of the bytes when there is none
+  std::size_t unit = 0;  // of the byte after it; both are the end of the bytes when there is none
 };
 
 StartCode next_start_code(std::span<const std::uint8_t> bytes, std::size_t from) {
@@ -92,7 +92,7 @@ StartCode next_start_code(std::span<const std::uint8_t> bytes, std::size_t from)
   return {bytes.size(), bytes.size()};
 }
 
-// Without supplemental units, in which the encoder tells about itself, and with start codes of four bytes.
+// Without supplemental units, in which the encoder describes itself, and with start codes of four bytes.
 std::vector<std::uint8_t> plain_h264(std::span<const std::uint8_t> bytes) {
   constexpr std::uint8_t kSupplemental = 6;
   std::vector<std::uint8_t> plain;

@@ -32,11 +32,10 @@ struct EncodedPicture {
   bool key = false;
 };
 
-// Whether this build has encoders: those for machines without FFmpeg's libraries do not, and open() then says so.
+// Whether this build has encoders: builds without FFmpeg's libraries do not, and open() then reports it.
 [[nodiscard]] bool has_live_encoders();
 
-// Belongs to one thread at a time.
-// A stream's LiveVideo owns it.
+// Owned by a LiveVideo and used on its thread. Keeps the state between pictures that delta pictures need.
 class LiveEncoder {
  public:
   // The encoder, or why there is none.

@@ -20,7 +20,7 @@ std::span<const std::uint8_t> bytes_of(const std::string& text) {
 
 bool is_slice_unit(const NalUnit& nal) { return nal.type >= 1 && nal.type <= 5; }
 
-// Receivers look for parameter sets at a picture's front: the unit goes behind them.
+// Receivers look for parameter sets at a picture's front: the unit goes after them.
 AccessUnit with_sei(const AccessUnit& picture, const std::string& unit) {
   constexpr std::size_t kStartCode = 4;
   const auto slice = std::find_if(picture.units.begin(), picture.units.end(), is_slice_unit);
@@ -64,8 +64,8 @@ std::vector<std::uint8_t> jpeg_user_data(const std::string& text) {
   return block;
 }
 
-// Receivers tell a picture's kind by its first unit, which a user-data unit must not be: a video object's code, which
-// may stand before any picture, goes in front.
+// Receivers recognise a picture's kind by its first unit, which a user-data unit must not be: a video object's code,
+// which may come before any picture, is put first.
 std::string mpeg4_with_text(const std::string& picture, const std::string& text) {
   static const std::string kVideoObject("\0\0\1\1", 4);
   const std::string changed = with_user_data(Codec::kMpeg4, picture, text);

@@ -1,5 +1,5 @@
 // Pictures as RTP payloads: H.264 as single NAL units and fragmentation units FU-A (RFC 6184), MPEG-4 Visual in pieces
-// (RFC 3016), JPEG as scan data behind headers (RFC 2435).
+// (RFC 3016), JPEG as scan data after headers (RFC 2435).
 #ifndef VIRTUAL_CAMERA_CODEC_RTP_PACKETISER_H_
 #define VIRTUAL_CAMERA_CODEC_RTP_PACKETISER_H_
 
@@ -19,7 +19,8 @@
 
 namespace vexa::camera {
 
-// The payloads of one picture, in order, packed into one block.
+// The payloads of one picture, in order, packed into one block. Immutable once made; the headers are added as it
+// leaves.
 class PacketisedPicture {
  public:
   PacketisedPicture() = default;
@@ -43,7 +44,7 @@ class PacketisedPicture {
 
 [[nodiscard]] PacketisedPicture packetise_mpeg4(std::span<const std::uint8_t> picture, std::size_t max_payload);
 
-// The tables go in band, behind the first header. `user_data` may be empty; it stands before that header. A packet is
+// The tables go in band, after the first header. `user_data` may be empty; it comes before that header. A packet is
 // larger than `max_payload` where its headers leave no room for a byte.
 [[nodiscard]] PacketisedPicture packetise_jpeg(const JpegPicture& picture, std::span<const std::uint8_t> user_data,
                                                std::size_t max_payload);
@@ -54,7 +55,7 @@ class PacketisedPicture {
 [[nodiscard]] std::optional<PacketisedPicture> packetise(Codec codec, const std::string& picture,
                                                          const std::string& text, std::size_t max_payload);
 
-// A clip cut into packets once, for any number of cameras and clients. Immutable.
+// A clip cut into packets once, for any number of cameras and clients. Immutable and shared.
 class PacketisedClip {
  public:
   PacketisedClip(Clip clip, std::size_t max_payload);

@@ -3,138 +3,160 @@
 #include <fmt/format.h>
 
 #include <algorithm>
+#include <cstddef>
 #include <fstream>
 #include <iterator>
 #include <nlohmann/json.hpp>
 #include <utility>
 
-#include "virtual_camera/model/lined_json.h"
-#include "virtual_camera/model/profile_place.h"
-#include "virtual_camera/model/profile_ptz.h"
-#include "virtual_camera/model/profile_video.h"
+#include "vexa/models.h"
+#include "virtual_camera/values/codec.h"
+#include "virtual_camera/values/number_text.h"
 
 namespace vexa::camera {
 namespace {
 
-constexpr std::size_t kLargestFile = 1 << 20;
-constexpr std::size_t kMostSteps = 64;
+using nlohmann::json;
 
-std::string exposure_word(const ProfilePlace& place) {
-  const std::string name = place.one_of({"Full auto", "Shutter Priority", "Iris Priority"});
-  if (name == "Full auto") return "full";
-  return name == "Iris Priority" ? "iris" : "shutter";
+// All below reads a profile that the library's reader has taken: every value has its type and is within its limits.
+
+// A member that may be left out; null then, which has no members and no items of its own.
+const json& part_of(const json& object, const char* key) {
+  static const json kLeftOut;
+  const auto found = object.is_object() ? object.find(key) : object.end();
+  return object.is_object() && found != object.end() ? *found : kLeftOut;
 }
 
-std::vector<int> steps_of(const ProfilePlace& list) {
-  std::vector<int> values;
-  for (const ProfilePlace& item : list.items(kMostSteps)) {
-    item.with_only({"label", "value"});
-    (void)item.required("label").text(32);
-    const ProfilePlace place = item.required("value");
-    const int value = place.number(0, 10000);
-    if (!values.empty() && value <= values.back()) place.refuse("must be above the one before it");
-    values.push_back(value);
+template <typename Value>
+Value value_of(const json& object, const char* key, Value left_out = {}) {
+  const json& part = part_of(object, key);
+  return part.is_null() ? left_out : part.get<Value>();
+}
+
+template <typename Value>
+std::vector<Value> list_of(const json& object, const char* key) {
+  return value_of<std::vector<Value>>(object, key);
+}
+
+// "1920x1080".
+PictureSize size_of(const std::string& text) {
+  const std::size_t by = text.find('x');
+  return {leading_number(text).value_or(0), leading_number(std::string_view(text).substr(by + 1)).value_or(0)};
+}
+
+std::vector<PictureSize> sizes_of(const json& object, const char* key) {
+  std::vector<PictureSize> sizes;
+  for (const std::string& text : list_of<std::string>(object, key)) sizes.push_back(size_of(text));
+  return sizes;
+}
+
+// The camera's word of a codec that profiles name as people do.
+std::string codec_setting(const std::string& name) {
+  const Codec codec = name == "H.264" ? Codec::kH264 : name == "MPEG4" ? Codec::kMpeg4 : Codec::kJpeg;
+  return std::string(codec_word(codec));
+}
+
+// Likewise of an exposure mode.
+std::string exposure_setting(const std::string& mode) {
+  if (mode == "Full auto") return "full";
+  return mode == "Iris Priority" ? "iris" : "shutter";
+}
+
+void take_video(const json& video, CameraProfile& profile) {
+  for (const json& codec : video.at("codecs")) {
+    profile.codecs.push_back({codec_setting(codec.at("name")), sizes_of(codec, "sizes"),
+                              list_of<int>(codec, "frameRates"), list_of<int>(codec, "qualities"),
+                              list_of<int>(codec, "bitRates")});
   }
-  return values;
-}
-
-// The steps that a mode goes through; other modes have none.
-void read_exposure_steps(const ProfilePlace& place, const char* key, bool wanted, std::vector<int>& steps) {
-  if (!wanted) return place.forbid(key, "is not for this mode");
-  steps = steps_of(place.required(key));
-}
-
-void read_exposure(const ProfilePlace& list, std::string_view driver, CameraProfile& profile) {
-  if (list && (driver == "heron" || driver == "simple-hd")) {
-    list.refuse("is not for the drivers \"heron\" and \"simple-hd\"");
+  for (const json& stream : video.at("streams")) {
+    profile.streams.push_back({codec_setting(stream.at("codec")), size_of(stream.at("size")),
+                               value_of<int>(stream, "frameRate"), value_of<int>(stream, "quality"),
+                               value_of<int>(stream, "bitRate")});
   }
-  for (const ProfilePlace& place : list.items(3)) {
-    place.with_only({"mode", "shutter", "iris"});
-    const ProfilePlace mode = place.required("mode");
-    const std::string word = exposure_word(mode);
-    if (word == "iris" && driver == "marlin") mode.refuse("is not for the driver \"marlin\"");
-    read_exposure_steps(place, "shutter", word == "shutter", profile.shutter_steps);
-    read_exposure_steps(place, "iris", word == "iris", profile.iris_steps);
-    const bool first = std::find(profile.exposure.begin(), profile.exposure.end(), word) == profile.exposure.end();
-    if (!first) mode.refuse("occurs twice among the exposure modes");
-    profile.exposure.push_back(word);
-  }
+  profile.standards = list_of<std::string>(video, "standards");
+  profile.capture_sizes = sizes_of(video, "captureSizes");
+  profile.max_sizes = sizes_of(video, "maxImageSizes");
+  const auto solid = value_of<std::string>(video, "solidPtz");
+  if (!solid.empty()) profile.solid_ptz = size_of(solid);
+  profile.electronic_flip = value_of<bool>(video, "electronicFlip");
+  profile.outputs = list_of<std::string>(video, "outputs");
 }
 
-void read_image(const ProfilePlace& image, std::string_view driver, CameraProfile& profile) {
-  image.with_only({"dayNight", "backLight", "noiseReduction", "wideDynamicRange", "visibilityEnhancer",
-                   "infraredStrength", "exposure"});
-  profile.day_night = image.optional("dayNight").words({"auto", "day", "night"});
-  profile.back_light = image.optional("backLight").flag();
-  profile.noise_reduction = image.optional("noiseReduction").flag();
-  profile.wide_dynamic_range = image.optional("wideDynamicRange").flag();
-  profile.visibility_enhancer = image.optional("visibilityEnhancer").flag();
-  profile.infrared_strength = image.optional("infraredStrength").number(1, 100);
-  read_exposure(image.optional("exposure"), driver, profile);
+void add_steps(const json& mode, const char* key, std::vector<int>& steps) {
+  for (const json& step : part_of(mode, key)) steps.push_back(step.at("value").get<int>());
 }
 
-void read_audio(const ProfilePlace& audio, CameraProfile& profile) {
-  if (!audio) return;
-  audio.with_only({"inputs", "outputs"});
-  const auto codecs = {std::string_view("g711_64"), std::string_view("g726_40"), std::string_view("g726_32"),
-                       std::string_view("g726_24"), std::string_view("g726_16")};
-  profile.audio_inputs = audio.required("inputs").words(codecs);
-  (void)audio.optional("outputs").words(codecs);
-}
-
-void read_io(const ProfilePlace& io, CameraProfile& profile) {
-  if (!io) return;
-  io.with_only({"inputs", "outputs", "videoDetection", "tamperingDetection", "audioDetection"});
-  profile.io = true;
-  profile.alarm_inputs = io.required("inputs").number(0, 16);
-  profile.alarm_outputs = io.required("outputs").number(0, 16);
-  profile.video_detection = io.optional("videoDetection").one_of({"motion", "object", "lod"});
-  profile.tampering_detection = io.optional("tamperingDetection").flag();
-  profile.audio_detection = io.optional("audioDetection").flag();
-}
-
-// What the types say of the camera, the other parts must bear out.
-void check_types(const ProfilePlace& types, const CameraProfile& profile) {
-  const auto named =
-      types.words({"fixed", "ptz", "sd", "hd", "audio", "edge-storage", "analog-output", "lod-detection"});
-  const struct {
-    const char* word;
-    bool holds;
-    const char* where;
-  } all[] = {{"ptz", profile.ptz.has_value(), "the profile has a part \"ptz\""},
-             {"audio", !profile.audio_inputs.empty(), "the profile has a part \"audio\""},
-             {"edge-storage", profile.edge_storage, "\"edgeStorage\" is true"},
-             {"analog-output", !profile.outputs.empty(), "\"video\" has \"outputs\""},
-             {"lod-detection", profile.video_detection == "lod", "\"io.videoDetection\" is \"lod\""}};
-  for (const auto& type : all) {
-    const bool is_named = std::find(named.begin(), named.end(), type.word) != named.end();
-    if (is_named == type.holds) continue;
-    types.refuse(fmt::format("must name \"{}\" exactly when {}", type.word, type.where));
+void take_image(const json& image, CameraProfile& profile) {
+  profile.day_night = list_of<std::string>(image, "dayNight");
+  profile.back_light = value_of<bool>(image, "backLight");
+  profile.noise_reduction = value_of<bool>(image, "noiseReduction");
+  profile.wide_dynamic_range = value_of<bool>(image, "wideDynamicRange");
+  profile.visibility_enhancer = value_of<bool>(image, "visibilityEnhancer");
+  profile.infrared_strength = value_of<int>(image, "infraredStrength");
+  for (const json& mode : part_of(image, "exposure")) {
+    profile.exposure.push_back(exposure_setting(mode.at("mode")));
+    add_steps(mode, "shutter", profile.shutter_steps);
+    add_steps(mode, "iris", profile.iris_steps);
   }
 }
 
-CameraProfile read_camera(const ProfilePlace& root) {
-  root.with_only({"$schema", "description", "driver", "model", "cameraTypes", "video", "image", "ptz", "audio", "io",
-                  "edgeStorage"});
-  CameraProfile profile;
-  (void)root.optional("$schema").text();
-  (void)root.required("description").text(200);
-  profile.model = root.required("model").text(64);
-  const std::string driver = root.required("driver").one_of({"common", "heron", "marlin", "simple-hd", "simple-ptz"});
-  profile.manual_iris_lens = driver == "marlin";
-  read_video_part(root.required("video"), driver, profile);
-  read_image(root.optional("image"), driver, profile);
-  profile.ptz = ptz_part(root.optional("ptz"));
-  read_audio(root.optional("audio"), profile);
-  read_io(root.optional("io"), profile);
-  profile.edge_storage = root.optional("edgeStorage").flag();
-  check_types(root.required("cameraTypes"), profile);
+AxisTimes times_of(const json& axis, AxisTimes left_out) {
+  return {value_of(axis, "travelTime", left_out.travel), value_of(axis, "rampTime", left_out.ramp)};
+}
+
+TurnProfile turn_of(const json& axis, AxisTimes left_out) {
+  return {value_of<int>(axis, "maxSpeed"), value_of<int>(axis, "span"),      value_of<int>(axis, "angleRange"),
+          value_of<int>(axis, "origin"),   value_of<int>(axis, "wideAngle"), value_of<int>(axis, "offset"),
+          times_of(axis, left_out)};
+}
+
+LensProfile lens_of(const json& axis, AxisTimes left_out) {
+  return {value_of<int>(axis, "minSpeed"), value_of<int>(axis, "maxSpeed"), value_of<int>(axis, "minPosition"),
+          value_of<int>(axis, "maxPosition"), times_of(axis, left_out)};
+}
+
+PtzProfile ptz_of(const json& ptz) {
+  // What an axis takes whose times are left out.
+  constexpr AxisTimes kPan = {3600, 250};
+  constexpr AxisTimes kTilt = {1500, 250};
+  constexpr AxisTimes kZoom = {3000, 100};
+  constexpr AxisTimes kFocus = {2000, 100};
+  PtzProfile profile;
+  profile.continuous = ptz.at("dialect") == "continuous";
+  profile.pan = turn_of(ptz.at("pan"), kPan);
+  profile.tilt = turn_of(ptz.at("tilt"), kTilt);
+  profile.zoom = lens_of(ptz.at("zoom"), kZoom);
+  for (const json& point : ptz.at("zoom").at("ratios")) {
+    profile.ratios.push_back({point.at("ratio").get<int>(), point.at("position").get<int>()});
+  }
+  if (const json& focus = part_of(ptz, "focus"); !focus.is_null()) profile.focus = lens_of(focus, kFocus);
+  profile.presets = value_of<int>(ptz, "presets");
+  profile.tours = value_of<int>(ptz, "tours");
+  profile.shadow_tours = value_of<int>(ptz, "shadowTours");
   return profile;
 }
 
-std::string refusal(const std::string& file, const JsonMistake& mistake) {
-  const std::string_view separator = mistake.key.empty() ? "" : ": ";
-  return fmt::format("{}:{}{}{}: {}", file, mistake.line, separator, mistake.key, mistake.text);
+void take_io(const json& io, CameraProfile& profile) {
+  if (io.is_null()) return;
+  profile.io = true;
+  profile.alarm_inputs = io.at("inputs").get<int>();
+  profile.alarm_outputs = io.at("outputs").get<int>();
+  profile.video_detection = value_of<std::string>(io, "videoDetection");
+  profile.tampering_detection = value_of<bool>(io, "tamperingDetection");
+  profile.audio_detection = value_of<bool>(io, "audioDetection");
+}
+
+CameraProfile camera_of(const json& root) {
+  CameraProfile profile;
+  profile.model = root.at("model").get<std::string>();
+  profile.manual_iris_lens = root.at("driver") == "marlin";
+  take_video(root.at("video"), profile);
+  take_image(part_of(root, "image"), profile);
+  if (const json& ptz = part_of(root, "ptz"); !ptz.is_null()) profile.ptz = ptz_of(ptz);
+  profile.audio_inputs = list_of<std::string>(part_of(root, "audio"), "inputs");
+  take_io(part_of(root, "io"), profile);
+  profile.edge_storage = value_of<bool>(root, "edgeStorage");
+  return profile;
 }
 
 bool is_wide(PictureSize size) { return size.width * 5 >= size.height * 8; }
@@ -155,23 +177,22 @@ const OfferedCodec* CameraProfile::codec(std::string_view word) const {
   return found == codecs.end() ? nullptr : &*found;
 }
 
-std::variant<CameraProfile, std::string> parse_camera_profile(std::string_view text, const std::string& file) {
-  const LinedJson json(text);
-  if (json.mistake()) return refusal(file, *json.mistake());
-  try {
-    return read_camera(ProfilePlace(&json.root(), ""));
-  } catch (const ProfileMistake& mistake) {
-    return refusal(file, {json.line_of(*mistake.at), mistake.key, mistake.text});
-  }
+std::variant<CameraProfile, std::string> parse_camera_profile(const std::string& text, const std::string& file) {
+  Profile checked;
+  ProfileError error;
+  if (!ParseProfile(text, file, checked, error)) return error.Message();
+  return camera_of(json::parse(text));
 }
 
 std::variant<CameraProfile, std::string> load_camera_profile(const std::string& path) {
-  std::ifstream file(path, std::ios::binary);
-  std::string text(kLargestFile + 1, '\0');
-  file.read(text.data(), static_cast<std::streamsize>(text.size()));
-  if (!file.is_open() || file.bad() || file.gcount() == 0) return fmt::format("{}: cannot be read, or is empty", path);
-  text.resize(static_cast<std::size_t>(file.gcount()));
-  if (text.size() > kLargestFile) return fmt::format("{}: is larger than 1 MiB", path);
+  // LoadProfile() refuses what is no file, or too large a one. It keeps less of a profile than a camera needs, so the
+  // text is read once more; ParseProfile() refuses it where the file has changed meanwhile.
+  Profile checked;
+  ProfileError error;
+  if (!LoadProfile(path, checked, error)) return error.Message();
+  const bool is_name = path.find('/') == std::string::npos && !path.ends_with(".json");
+  std::ifstream file(is_name ? ProfileFolder() + "/" + path + ".json" : path, std::ios::binary);
+  const std::string text{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
   return parse_camera_profile(text, path);
 }
 

@@ -1,4 +1,4 @@
-// What a camera model can do, as a profile file says it (docs/model_profiles.md).
+// What a camera model can do, as a profile file states it (docs/model_profiles.md).
 #ifndef VIRTUAL_CAMERA_MODEL_CAMERA_PROFILE_H_
 #define VIRTUAL_CAMERA_MODEL_CAMERA_PROFILE_H_
 
@@ -49,7 +49,7 @@ struct AxisTimes {
 // Pan or tilt, in the camera's units.
 struct TurnProfile {
   int max_speed = 1;
-  int span = 2;         // twice the way from the origin to the other end
+  int span = 2;         // twice the distance from the origin to the other end
   int angle_range = 1;  // degrees of the span
   int origin = 0;
   int wide_angle = 1;  // degrees that the picture spans at the wide end
@@ -89,7 +89,7 @@ struct PtzProfile {
   [[nodiscard]] int shared_speed() const { return std::min(pan.max_speed, tilt.max_speed); }
 };
 
-// Lists begin with what the camera leaves the factory with; an empty list says that it lacks the setting.
+// Lists begin with what the camera leaves the factory with; an empty list means that it lacks the setting.
 struct CameraProfile {
   std::string model;
   bool manual_iris_lens = false;  // exposure is set by the lens and the automatic shutter
@@ -125,9 +125,10 @@ struct CameraProfile {
   [[nodiscard]] const OfferedCodec* codec(std::string_view word) const;
 };
 
-// The profile, or what is wrong: "FILE:LINE: KEY: TEXT". `file` stands in that text only.
-[[nodiscard]] std::variant<CameraProfile, std::string> parse_camera_profile(std::string_view text,
+// The profile, or why the library's reader refuses it: "FILE:LINE: KEY: TEXT". `file` is used in that text only.
+[[nodiscard]] std::variant<CameraProfile, std::string> parse_camera_profile(const std::string& text,
                                                                             const std::string& file);
+// Of a file, or of the name of an installed profile (without "/" and ".json").
 [[nodiscard]] std::variant<CameraProfile, std::string> load_camera_profile(const std::string& path);
 
 }  // namespace vexa::camera

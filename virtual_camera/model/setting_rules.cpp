@@ -104,7 +104,7 @@ void SettingRules::add_streams() {
     const StreamDefaults& stream = profile_.streams[i];
     const auto key = [number = i + 1](const char* name) { return fmt::format("{}{}", name, number); };
     add(camera_, key("ImageCodec"), stream.codec, {.words = codecs});
-    // Their lists depend on the codec: agree() looks at them.
+    // Their lists depend on the codec: agree() checks them.
     add(camera_, key("ImageSize"), size_text(stream.size), {.words = {}, .least = 1, .most = kOften});
     add(camera_, key("FrameRate"), fmt::format("{}", stream.frame_rate), {.words = {}, .least = 1, .most = kOften});
     const int bit_rate = stream.bit_rate != 0 || bit_rates.empty() ? stream.bit_rate : bit_rates.front();

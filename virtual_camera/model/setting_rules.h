@@ -12,8 +12,8 @@
 
 namespace vexa::camera {
 
-// Immutable; any thread.
-// Shared by the store that obeys it and the camera that reads its profile.
+// The values that a model's commands take; the settings store asks it before it changes a key. Immutable, shared; any
+// thread.
 class SettingRules {
  public:
   using Pairs = std::vector<std::pair<std::string, std::string>>;  // key and value

@@ -18,7 +18,8 @@ namespace vexa::camera {
 
 class SettingRules;
 
-// Thread-safe. Values are kept as they came, without decoding; keys keep the order in which they were first set.
+// The settings of one camera. Owned by its state; thread-safe. Values are kept as they came, without decoding; keys
+// keep the order in which they were first set.
 class SettingsStore {
  public:
   SettingsStore();  // with a plausible camera's defaults
@@ -27,12 +28,12 @@ class SettingsStore {
   void set(std::string_view section, std::string_view key, std::string_view value);
   void erase(std::string_view section, std::string_view key);
   void erase_section(std::string_view section);
-  // Replaces a section's inquiry answer by this text, whatever its keys say; nothing puts the keys back.
+  // Replaces a section's inquiry answer by this text, whatever values its keys have; the keys cannot be brought back.
   void set_answer(std::string_view section, std::optional<std::string> text);
 
-  // "key=value&key=value" in order; nothing when there is no such section.
+  // "key=value&key=value" in order; none when there is no such section.
   [[nodiscard]] std::optional<std::string> answer(std::string_view section) const;
-  // Applies the pairs of a command's query ("K=V&K=V") to a section. False, and nothing changed, where the rules that
+  // Applies the pairs of a command's query ("K=V&K=V") to a section. False, and no key changed, where the rules that
   // the store obeys forbid it.
   [[nodiscard]] bool apply(std::string_view section, std::string_view query);
   // Has, from now on, the settings and the rules of a camera model. Without rules every command is taken.

@@ -64,7 +64,7 @@ void add_credentials(CLI::App& app, CameraOptions& camera) {
 
 void add_stream(CLI::App& app, CameraOptions& camera) {
   app.add_option("--profile", camera.profile_path,
-                 "profile of the camera model; without --clip it streams what its settings say")
+                 "profile of the camera model; without --clip it streams as its settings define")
       ->check(CLI::ExistingFile);
   camera.pictures_made = PicturesMade::kOfTheScene;
   app.add_flag_callback(

@@ -10,6 +10,7 @@
 
 namespace vexa::camera {
 
+// What the program does; main() owns it.
 struct ProgramOptions {
   CameraOptions camera;
   std::size_t count = 1;

@@ -12,7 +12,7 @@ namespace {
 
 constexpr const char* kPacketGroup = "Packet faults (P is a probability from 0 to 1)";
 constexpr const char* kRequestGroup =
-    "Request faults (MATCH is a part of the request's text; MATCH#N strikes only the Nth match)";
+    "Request faults (MATCH is a part of the request's text; MATCH#N applies to the Nth match only)";
 constexpr const char* kStreamGroup =
     "Faults of HTTP streams (N is a picture, or a piece of sound, counted from 0 in each stream)";
 
@@ -40,7 +40,7 @@ Restart restart_of(std::string_view text) {
   return restart;
 }
 
-// Moves the "#N" behind a match into the fault's occurrence.
+// Moves the "#N" after a match into the fault's occurrence.
 RequestFault counted(RequestFault fault) {
   const std::size_t mark = fault.match.rfind('#');
   if (mark == std::string::npos) return fault;
@@ -82,10 +82,10 @@ void FaultArguments::add_packet_faults(CLI::App& app, PacketFaults& faults) {
   probability("--loss", faults.loss, "lose a packet");
   probability("--burst-loss", faults.burst_loss, "begin a burst of lost packets");
   count("--burst-length", faults.burst_length, "packets lost in a burst");
-  probability("--reorder", faults.reorder, "hold a packet back behind later ones");
+  probability("--reorder", faults.reorder, "hold a packet back until later ones have left");
   count("--reorder-distance", faults.reorder_distance, "at most this many later ones");
   probability("--duplicate", faults.duplicate, "send a packet twice");
-  count("--duplicate-distance", faults.duplicate_distance, "the second behind at most this many later packets");
+  count("--duplicate-distance", faults.duplicate_distance, "the second after at most this many later packets");
   probability("--delay", faults.delay, "delay a packet");
   app.add_option_function<std::uint32_t>(
          "--delay-ms", [&faults](std::uint32_t ms) { faults.delay_time = std::chrono::milliseconds(ms); },
@@ -127,15 +127,15 @@ void FaultArguments::add_stream_faults(CLI::App& app) {
   const auto valued = [&app](const char* name, Pairs& pairs, const char* help) {
     app.add_option(name, pairs, help)->type_name("")->allow_extra_args(false)->group(kStreamGroup);
   };
-  valued("--part-length", part_length_, "N TEXT: TEXT stands behind \"DataLen: \"");
+  valued("--part-length", part_length_, "N TEXT: TEXT follows \"DataLen: \"");
   app.add_option("--no-part-length", no_part_length_, "the part does not announce its length")
       ->type_name("N")
       ->allow_extra_args(false)
       ->group(kStreamGroup);
-  valued("--before-picture", before_picture_, "N TEXT: TEXT stands in front of it (\\r and \\n are known)");
+  valued("--before-picture", before_picture_, "N TEXT: TEXT comes before it (\\r and \\n are known)");
   valued("--cut-picture", cut_picture_, "N BYTES: only so many bytes of it are sent");
   valued("--close-stream", close_stream_, "N BYTES: the connection closes after so many bytes of it");
-  valued("--silence-stream", silence_, "N BYTES: nothing comes after so many bytes of it");
+  valued("--silence-stream", silence_, "N BYTES: it falls silent after so many bytes");
   valued("--pause-stream", pause_, "N MS: it comes later by this time, and so does all that follows");
   valued("--other-clip", other_clip_, "N FILE: from here on the stream sends this file");
 }

@@ -14,7 +14,8 @@ namespace vexa::camera {
 // Requests and answers are bytes, not text: each byte becomes the character of its number, so none is lost.
 [[nodiscard]] std::string journal_line(const std::string& camera, const Request& request);
 
-// Thread-safe; each line is on disk before the answer leaves.
+// Owned by the program. Thread-safe: several threads may serve its cameras. Each line is on disk before the answer
+// leaves.
 class JournalFile {
  public:
   explicit JournalFile(const std::string& path) : file_(path, std::ios::trunc) {}

@@ -1,4 +1,4 @@
-// Where a camera looks, and what it says about it in its pictures.
+// The direction of a camera, and how its pictures report it.
 #ifndef VIRTUAL_CAMERA_PTZ_CAMERA_POSE_H_
 #define VIRTUAL_CAMERA_PTZ_CAMERA_POSE_H_
 
@@ -8,6 +8,7 @@
 
 namespace vexa::camera {
 
+// A value: the pose at one moment.
 struct CameraPose {
   double pan = 0;                // degrees, clockwise seen from above
   double tilt = 0;               // degrees, upwards

@@ -40,7 +40,7 @@ bool take_number(int& target, std::string_view value, int most) {
   return number.has_value();
 }
 
-// The keys that both kinds of tours have for all of them; nothing for another key.
+// The keys that both kinds of tours have for all of them; none for another key.
 std::optional<bool> take_common(TourSwitch& target, std::string_view key, std::string_view value) {
   if (key.empty()) return take_switch(target.on, value);
   if (key == "Resume") return take_resume(target.resume, value);
@@ -48,7 +48,7 @@ std::optional<bool> take_common(TourSwitch& target, std::string_view key, std::s
   return std::nullopt;
 }
 
-// The number in the list, from 0, of the tour that a key's letter names; nothing for what is no letter.
+// The number in the list, from 0, of the tour that a key's letter names; none for what is no letter.
 std::optional<std::size_t> letter_at(std::string_view key) {
   const std::size_t at = key.empty() ? std::string_view::npos : kTourLetters.find(key.front());
   return at == std::string_view::npos ? std::nullopt : std::optional<std::size_t>(at);

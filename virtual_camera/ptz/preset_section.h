@@ -44,7 +44,7 @@ struct TourSwitch {
   int resume = 0;
 };
 
-// Part of a camera's head, which guards it by its lock.
+// The stored presets and tours of one camera. Owned by its PtzHead, whose lock guards it. Moves no motor.
 class PresetSection {
  public:
   using Pairs = std::vector<std::pair<std::string, std::string>>;  // key and value
@@ -54,7 +54,7 @@ class PresetSection {
   // Takes the settings of tours that a command names, all of them or none: false. Of both kinds of tours one runs: the
   // kind switched on last.
   [[nodiscard]] bool set_tours(const Pairs& settings);
-  // What the inquiry says.
+  // The answer to the inquiry.
   [[nodiscard]] Pairs answer() const;
 
   // The tour that is to run; null when there is none.

@@ -30,7 +30,7 @@ double PtzAxis::position(double now) const {
 
 double PtzAxis::rests_from() const { return legs_[used_ - 1].begin; }
 
-// The leg under way ends after `duration`; until then it has this acceleration.
+// The present leg ends after `duration`; until then it has this acceleration.
 void PtzAxis::add_leg(double duration, double acceleration) {
   if (duration <= 0) return;
   legs_[used_ - 1].acceleration = acceleration;
@@ -54,8 +54,8 @@ void PtzAxis::run(double now, double speed) {
   rest_at(legs_[used_ - 1].position);
 }
 
-// The quickest way there: pull in the direction of the target as seen from where braking at once would end, run at the
-// greatest speed where there is room for it, brake.
+// The quickest motion there: pull in the direction of the target as seen from where braking at once would end, run at
+// the greatest speed where there is room for it, brake.
 void PtzAxis::go_to(double now, double target, double speed) {
   target = std::clamp(target, mechanics_.least, mechanics_.most);
   const double pull = mechanics_.acceleration;

@@ -8,7 +8,7 @@
 
 namespace vexa::camera {
 
-// Part of a mechanism; what uses the mechanism guards it.
+// One motor of a mechanism, which owns it; guarded as the mechanism is. Computes positions when asked and has no timer.
 class PtzAxis {
  public:
   struct Mechanics {

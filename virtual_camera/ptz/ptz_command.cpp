@@ -126,7 +126,7 @@ Order absolute_lens(PtzMotor motor, std::string_view value, const LensProfile& l
   return order;
 }
 
-// In 4096ths of the zoom's way.
+// In 4096ths of the zoom's range.
 Order relative_zoom(std::string_view value) {
   constexpr int kWhole = 4096;
   const auto step = held(signed_hex(value), -kWhole, kWhole);

@@ -12,7 +12,7 @@ namespace vexa::camera {
 namespace {
 
 constexpr std::size_t kMostOrders = 2048;  // of one recording; those beyond are obeyed alone
-constexpr double kEndOfTime = 1e12;        // seconds; doubles still tell milliseconds apart there
+constexpr double kEndOfTime = 1e12;        // seconds; doubles still resolve milliseconds there
 constexpr double kBeforePlaying = 1;       // seconds that a shadow tour waits at its start
 
 std::string position_text(const PtzPlace& place, bool turned, bool moving) {
@@ -95,7 +95,7 @@ void PtzHead::step_camera_tour() {
   if (next + 1 != tour.sequence.end()) program_->step = static_cast<std::size_t>(next + 1 - tour.sequence.begin());
 }
 
-// Step 0 goes to the start; each further one obeys an order; behind the last one the camera stands still.
+// Step 0 goes to the start; each further one obeys an order; after the last one the camera is at rest.
 void PtzHead::step_shadow_tour() {
   PtzProgram& program = *program_;
   const auto& orders = program.shadow.orders;

@@ -1,4 +1,4 @@
-// A camera's moving head: its motors, presets and tours on one clock, and where it looks at any time. There is no
+// A camera's moving head: its motors, presets and tours on one clock, and its direction at any time. There is no
 // timer: what tours have done meanwhile is caught up with whenever somebody asks.
 #ifndef VIRTUAL_CAMERA_PTZ_PTZ_HEAD_H_
 #define VIRTUAL_CAMERA_PTZ_PTZ_HEAD_H_
@@ -19,7 +19,7 @@
 
 namespace vexa::camera {
 
-// A tour under way: what it does next, and when.
+// A running tour: what it does next, and when.
 struct PtzProgram {
   enum class Kind { kCamera, kShadow, kPreview };
 
@@ -28,7 +28,7 @@ struct PtzProgram {
   std::size_t step = 0;  // in the sequence or among the orders
   double due = 0;
   double origin = 0;  // what a shadow tour's orders count from
-  double lap = 0;     // the beginning of the one under way
+  double lap = 0;     // the beginning of the present one
   int laps = 0;
 };
 // A shadow tour that is being recorded.
@@ -38,7 +38,7 @@ struct PtzRecording {
   ShadowTour made;
 };
 
-// Any thread.
+// Owned by the camera's state; thread-safe. Each operation first brings motors and tours up to its own moment.
 class PtzHead {
  public:
   using Time = std::chrono::steady_clock::time_point;
@@ -53,11 +53,11 @@ class PtzHead {
   // The section "presetposition".
   [[nodiscard]] Pairs preset_settings(Time now);
 
-  // Where it looks, and the text that tells the host of it; in a turned picture positions are told negated, as a host
+  // Its direction, and the text that reports it to hosts; in a turned picture positions are reported negated, as a host
   // counts them that turns them back.
   [[nodiscard]] CameraPose pose(bool turned, Time now);
   [[nodiscard]] PtzPlace place(Time now);
-  // Where the presets look, in the order of their numbers.
+  // The directions of the presets, in the order of their numbers.
   [[nodiscard]] std::vector<PresetMark> preset_marks();
 
  private:

@@ -6,7 +6,7 @@
 namespace vexa::camera {
 namespace {
 
-// A motor whose ends lie together stands, whatever it is told.
+// A motor whose ends are the same position never moves.
 PtzAxis::Mechanics mechanics_of(int end, int other_end, const AxisTimes& times) {
   const double way = std::max(std::abs(other_end - end), 1);
   PtzAxis::Mechanics mechanics;

@@ -39,12 +39,13 @@ struct PictureArea {
 struct PtzOrder {
   std::array<std::optional<MotorOrder>, kPtzMotors> motors;
   std::optional<PictureArea> area;
-  std::optional<double> zoom_by;  // share of the zoom's way
+  std::optional<double> zoom_by;  // share of the zoom's range
 
   std::optional<MotorOrder>& operator[](PtzMotor motor) { return motors[static_cast<std::size_t>(motor)]; }
 };
 
-// Part of a camera's head, which guards it by its lock.
+// Carries out orders by running the four motors together. Owned by PtzHead, whose lock guards it; knows no presets and
+// no tours.
 class PtzMechanism {
  public:
   explicit PtzMechanism(PtzProfile profile);  // at rest, straight ahead, at the wide end

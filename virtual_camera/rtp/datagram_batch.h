@@ -14,7 +14,8 @@
 
 namespace vexa::camera {
 
-// Part of a session's port; used on the loop's thread.
+// Owned by a port and used on the loop's thread. Keeps its memory from one batch to the next; never waits for the
+// socket.
 class DatagramBatch {
  public:
   // Sends the packets on a connected socket, in order, without those marked lost. Returns a record for each; a packet

@@ -1,4 +1,4 @@
-// RTP packets between the answers on an RTSP connection, each behind "$", its channel and its length (RFC 2326, 10.12).
+// RTP packets between the answers on an RTSP connection, each after "$", its channel and its length (RFC 2326, 10.12).
 #ifndef VIRTUAL_CAMERA_RTP_INTERLEAVED_LANE_H_
 #define VIRTUAL_CAMERA_RTP_INTERLEAVED_LANE_H_
 
@@ -17,19 +17,20 @@
 
 namespace vexa::camera {
 
-// What the sessions of one connection send on it. Answers and packets take turns; neither is ever torn by the other.
+// What the sessions of one connection send on it. Held by the connection and its ports; on the loop's thread. Answers
+// and packets take turns, and neither is ever cut by the other.
 class InterleavedLane : public std::enable_shared_from_this<InterleavedLane> {
  public:
-  // `socket` is the owner's. `reset` ends the owner's connection where writing fails, or the peer takes nothing for
+  // `socket` is the owner's. `reset` ends the owner's connection where writing fails, or the peer reads no byte for
   // `patience`; it is called only while the owner lives.
   InterleavedLane(std::weak_ptr<void> owner, std::function<void()> reset, asio::ip::tcp::socket& socket,
                   std::chrono::milliseconds patience);
 
-  // Puts a packet behind those that wait; false when there is no room for it.
+  // Puts a packet after those that wait; false when there is no room for it.
   [[nodiscard]] bool offer(std::uint8_t channel, const Outgoing& packet);
-  // Lets what waits leave, once nothing else does.
+  // Sends the packets that wait, once no other write is in progress.
   void flush();
-  // Calls `ready` as soon as no packet is on its way; none leaves from then on until release().
+  // Calls `ready` as soon as no packet is being written; none leaves from then on until release().
   void claim(std::function<void()> ready);
   void release();
   void close();
@@ -53,7 +54,8 @@ class InterleavedLane : public std::enable_shared_from_this<InterleavedLane> {
   bool closed_ = false;
 };
 
-// One session's channel of a lane. A packet for which there is no room is lost, and the rest of its picture with it.
+// One session's channel of a lane; owned by the session's sender. A packet for which there is no room is lost, and the
+// rest of its picture with it.
 class InterleavedPort : public PacketPort {
  public:
   InterleavedPort(std::weak_ptr<InterleavedLane> lane, std::uint8_t channel)

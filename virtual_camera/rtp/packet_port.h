@@ -10,7 +10,8 @@
 
 namespace vexa::camera {
 
-// A session owns its port and calls it on the loop's thread: a UdpPort of its own, or its channel of a shared lane.
+// Datagrams or an RTSP connection, behind one interface for RtpSender, which owns it; on the loop's thread. Never
+// waits.
 class PacketPort {
  public:
   enum class Hashing { kOff, kOn };

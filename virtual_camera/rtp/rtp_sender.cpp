@@ -31,7 +31,7 @@ void RtpSender::play(Play play) {
   if (!may_play()) return;
   user_data_ = std::move(play.user_data);
   stream_.emplace(std::move(play.source), *options_, play.faults, RtpStream::Identity{session_, play.seed});
-  lane_.emplace(std::move(play.faults), play.seed);
+  impairment_.emplace(std::move(play.faults), play.seed);
   started_ = Clock::now() + play.pause;
   wait_for_next();
 }
@@ -47,7 +47,7 @@ RtpSender::Time RtpSender::paced(std::chrono::nanoseconds time) const {
   return Time(std::llround(static_cast<double>(time.count()) / options_->speed));
 }
 
-// The bursts of a picture are spread over the first half of its time; a port sends one datagram behind the other.
+// The bursts of a picture are spread over the first half of its time; a port sends one datagram after the other.
 std::optional<RtpSender::Time> RtpSender::next_burst() const {
   if (picture_.empty()) return std::nullopt;
   if (const unsigned rate = options_->link_megabits; rate > 0) {
@@ -61,7 +61,7 @@ std::optional<RtpSender::Time> RtpSender::next_burst() const {
 std::optional<RtpSender::Time> RtpSender::next_event() {
   std::optional<Time> burst = next_burst();
   if (!burst && stream_->load()) burst = paced(stream_->loaded().due);
-  const std::optional<Time> due = lane_->next_due();
+  const std::optional<Time> due = impairment_->next_due();
   if (!burst || !due) return burst ? burst : due;
   return std::min(*burst, *due);
 }
@@ -100,7 +100,7 @@ void RtpSender::slip_if_far_behind(Time event) {
 // Whether the picture that is due stays. One that leaves late takes the schedule with it: pictures do not catch up with
 // each other where somebody watches over their pace.
 bool RtpSender::holds(Time event) {
-  if (!options_->hold_pictures || !picture_.empty() || lane_->next_due() == event) return false;
+  if (!options_->hold_pictures || !picture_.empty() || impairment_->next_due() == event) return false;
   const bool held = options_->hold_pictures();
   started_ = std::max(started_, Clock::now() + (held ? kHold : Clock::duration::zero()) - event);
   return held;
@@ -126,19 +126,19 @@ void RtpSender::offer_burst(Time now) {
   const std::size_t end = std::min(picture_.size(), offered_ + burst);
   for (; offered_ < end; ++offered_) {
     offered_bytes_ += picture_[offered_].payload_to_send().size() + kWireOverhead;
-    lane_->offer(std::move(picture_[offered_]), now, leaving_);
+    impairment_->offer(std::move(picture_[offered_]), now, leaving_);
   }
   if (offered_ < picture_.size()) return;
   picture_.clear();
-  if (!stream_->load() && stream_->ended()) lane_->release_held(leaving_);
+  if (!stream_->load() && stream_->ended()) impairment_->release_held(leaving_);
 }
 
 void RtpSender::run_event() {
   const std::optional<Time> now = next_event();
   if (!now || holds(*now)) return wait_for_next();
   leaving_.clear();
-  if (lane_->next_due() == now) {
-    lane_->release_due(*now, leaving_);
+  if (impairment_->next_due() == now) {
+    impairment_->release_due(*now, leaving_);
   } else {
     offer_burst(*now);
     if (options_->link_megabits == 0) not_before_ = Clock::now() + options_->burst_gap;

@@ -12,7 +12,7 @@
 #include <string>
 #include <vector>
 
-#include "virtual_camera/rtp/fault_lane.h"
+#include "virtual_camera/rtp/packet_impairment.h"
 #include "virtual_camera/rtp/packet_port.h"
 #include "virtual_camera/rtp/rtp_stream.h"
 #include "virtual_camera/rtp/sent_log.h"
@@ -21,7 +21,8 @@
 
 namespace vexa::camera {
 
-// One for each session. Lives on the loop's thread.
+// One for each session, held by it and by its timer; on the loop's thread. Never drifts: each picture has a time of its
+// own, counted from PLAY.
 class RtpSender : public std::enable_shared_from_this<RtpSender> {
  public:
   // What a stream is played with.
@@ -33,7 +34,7 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
     std::chrono::milliseconds pause{0};  // before the first picture
   };
 
-  // The port stands open. The context outlives the sender.
+  // The port is open. The context outlives the sender.
   RtpSender(asio::io_context& context, std::shared_ptr<const CameraOptions> options, std::shared_ptr<SentLog> sent,
             std::uint32_t session, std::unique_ptr<PacketPort> port);
 
@@ -45,7 +46,7 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
 
  private:
   using Clock = std::chrono::steady_clock;
-  using Time = FaultLane::Time;
+  using Time = PacketImpairment::Time;
 
   [[nodiscard]] Time paced(std::chrono::nanoseconds time) const;
   [[nodiscard]] std::optional<Time> next_burst() const;
@@ -67,10 +68,10 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
   asio::steady_timer timer_;
   std::function<std::string()> user_data_;
   std::optional<RtpStream> stream_;
-  std::optional<FaultLane> lane_;
+  std::optional<PacketImpairment> impairment_;
   Clock::time_point started_;
   Clock::time_point not_before_;   // the pause after a burst
-  std::vector<Outgoing> picture_;  // the picture under way
+  std::vector<Outgoing> picture_;  // the picture being sent
   Time picture_began_{0};
   std::size_t offered_ = 0;        // packets of it already offered
   std::size_t offered_bytes_ = 0;  // what they take on the wire

@@ -22,7 +22,7 @@
 
 namespace vexa::camera {
 
-// One datagram on its way out.
+// One datagram that is to leave.
 struct Outgoing {
   std::array<std::uint8_t, 12> header{};
   std::shared_ptr<const PacketisedPicture> picture;  // keeps the payload
@@ -40,7 +40,7 @@ struct Outgoing {
 // The options' payload type; JPEG has a static one (RFC 3551, table 5).
 [[nodiscard]] std::uint8_t payload_type_of(const CameraOptions& options, Codec codec);
 
-// A session's sender owns it; used on the loop's thread.
+// Turns pictures into packets. Owned by RtpSender, on the loop's thread; opens no socket and reads no clock.
 class RtpStream {
  public:
   // What makes a stream differ from those beside it.
@@ -64,7 +64,7 @@ class RtpStream {
   [[nodiscard]] const SourcePicture& loaded() const { return *loaded_; }
   [[nodiscard]] const SourceFormat& format() const { return source_->format(); }
   [[nodiscard]] std::uint64_t next_picture() const { return picture_; }  // its running index
-  // Appends the packets of the next picture, with the text in its user data where that is not empty; nothing when there
+  // Appends the packets of the next picture, with the text in its user data where that is not empty; none when there
   // is none.
   void take_picture(std::vector<Outgoing>& packets, const std::string& text = {});
 

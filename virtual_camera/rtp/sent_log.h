@@ -15,7 +15,7 @@ namespace vexa::camera {
 
 struct SentPacket {
   std::uint32_t session = 0;  // the RTSP session number
-  // The header fields as they stand in the datagram, after every fault.
+  // The header fields in the datagram, after all faults.
   std::uint16_t sequence = 0;
   std::uint32_t timestamp = 0;
   bool marker = false;
@@ -23,7 +23,7 @@ struct SentPacket {
   std::size_t clip_picture = 0;     // index of the access unit in the clip
   std::size_t packet = 0;           // place in its picture, from 0
   std::size_t picture_packets = 0;  // packets of that picture
-  bool lost = false;                // never sent; it stands where it would have gone
+  bool lost = false;                // never sent; listed where it would have gone
   bool duplicate = false;           // a second copy of a packet
   bool reordered = false;
   bool delayed = false;
@@ -35,7 +35,8 @@ struct SentPacket {
   std::chrono::steady_clock::time_point time;
 };
 
-// Thread-safe. Entries appear right after the datagrams have left.
+// Kept for tests, which compare it with what the host received. Thread-safe. Entries appear right after the datagrams
+// have left.
 class SentLog {
  public:
   using Predicate = std::function<bool(const std::deque<SentPacket>&)>;

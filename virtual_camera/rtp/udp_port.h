@@ -12,7 +12,7 @@
 
 namespace vexa::camera {
 
-// Owns the socket. Used on the loop's thread.
+// Owned by the sender of a session, on the loop's thread. What the client sends to the port is not read.
 class UdpPort : public PacketPort {
  public:
   explicit UdpPort(asio::io_context& context) : socket_(context) {}

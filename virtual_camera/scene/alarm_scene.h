@@ -24,7 +24,7 @@ struct AlarmEvent {
   int value = 0;   // 0: open, free, quiet, still
 };
 
-// Thread-safe. Every change that happens makes one part; what stays as it is makes none.
+// Owned by the camera's state; thread-safe. Each change makes one part; a state that stays makes none.
 class AlarmScene {
  public:
   static constexpr std::size_t kWindows = 4;
@@ -40,7 +40,7 @@ class AlarmScene {
 
   // False for a contact or window that the camera does not have.
   bool happen(const AlarmEvent& event);
-  // Whether the detectors are switched on; off, they report nothing.
+  // Whether the detectors are switched on; off, they report no alarm.
   void switch_detectors(bool tampering, bool audio);
   // The camera forgets the tampering alarm until the lens is covered anew.
   void clear_tampering();

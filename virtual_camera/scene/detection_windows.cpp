@@ -47,7 +47,7 @@ class NumberedKeys {
   int number_;
 };
 
-// Nothing for a window that was never set. One without a readable area is off.
+// Nullopt for a window that was never set. One without a readable area is off.
 std::optional<DetectionWindow> window_of(const NumberedKeys& keys, std::size_t place) {
   const std::string name = fmt::format("Win{}", place + 1);
   const auto state = keys.get(name);

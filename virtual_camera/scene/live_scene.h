@@ -23,15 +23,15 @@ class LiveScene {
  public:
   using Time = std::chrono::steady_clock::time_point;
 
-  // All that it is given outlives it. An empty `pose`: the camera does not know where it looks; it then looks north at
-  // 60 degrees. `ptz` is null for a camera that does not move.
+  // All that it is given outlives it. An empty `pose`: the camera's direction is not known; the scene is then shown to
+  // the north at 60 degrees. `ptz` is null for a camera that does not move.
   LiveScene(const SettingsStore& settings, const AlarmScene& alarms, const SceneStage& stage, PoseSource pose,
             PtzHead* ptz)
       : settings_(settings), alarms_(alarms), stage_(stage), pose_(std::move(pose)), ptz_(ptz) {}
   LiveScene(const LiveScene&) = delete;
   LiveScene& operator=(const LiveScene&) = delete;
 
-  // nullopt for a camera that does not know where it looks.
+  // nullopt for a camera whose direction is not known.
   [[nodiscard]] std::optional<CameraPose> pose(Time now) const;
   // In a picture of this size.
   [[nodiscard]] View view(PictureSize size, Time now) const;

@@ -28,8 +28,8 @@ constexpr Colour kClockGround{16, 128, 128};
 constexpr std::uint8_t kTile = 8;  // by which every other tile of 10 degrees is brighter
 
 // What one picture is drawn with. Everything is laid out upright; the painter turns it where the picture is rotated.
-struct Sheet {
-  Sheet(const View& view, I420Picture& target)
+struct Canvas {
+  Canvas(const View& view, I420Picture& target)
       : picture(target),
         size{target.width(), target.height()},
         place({view.pose, size, false}),
@@ -61,26 +61,26 @@ Colour background_at(double elevation) {
 
 bool odd_tile(double degrees) { return static_cast<int>(std::floor(degrees / 10)) % 2 != 0; }
 
-void draw_background(Sheet& sheet) {
-  const auto width = static_cast<std::size_t>(sheet.size.width);
+void draw_background(Canvas& canvas) {
+  const auto width = static_cast<std::size_t>(canvas.size.width);
   std::array<std::vector<std::uint8_t>, 2> tiles;  // by column, for even and odd rows of tiles
-  for (int column = 0; column < sheet.size.width; ++column) {
-    const bool odd = odd_tile(sheet.place.bearing(column + 0.5));
+  for (int column = 0; column < canvas.size.width; ++column) {
+    const bool odd = odd_tile(canvas.place.bearing(column + 0.5));
     tiles[0].push_back(odd ? kTile : 0);
     tiles[1].push_back(odd ? 0 : kTile);
   }
-  if (sheet.rotated) {
+  if (canvas.rotated) {
     for (auto& row : tiles) std::reverse(row.begin(), row.end());
   }
   const std::uint8_t* drawn = nullptr;
   Colour drawn_colour;
   bool drawn_odd = false;
-  for (int row = 0; row < sheet.size.height; ++row) {
-    const double elevation = sheet.place.elevation(row + 0.5);
+  for (int row = 0; row < canvas.size.height; ++row) {
+    const double elevation = canvas.place.elevation(row + 0.5);
     const Colour colour = background_at(elevation);
     const bool odd = odd_tile(elevation);
-    const int line = sheet.rotated ? sheet.size.height - 1 - row : row;
-    std::uint8_t* to = sheet.picture.y() + static_cast<std::size_t>(line) * width;
+    const int line = canvas.rotated ? canvas.size.height - 1 - row : row;
+    std::uint8_t* to = canvas.picture.y() + static_cast<std::size_t>(line) * width;
     if (drawn != nullptr && drawn_colour == colour && drawn_odd == odd) {
       std::memcpy(to, drawn, width);
     } else {
@@ -93,15 +93,15 @@ void draw_background(Sheet& sheet) {
     drawn_odd = odd;
     if (row % 2 != 0) continue;
     const auto half = static_cast<std::size_t>(line / 2) * (width / 2);
-    std::memset(sheet.picture.u() + half, colour.u, width / 2);
-    std::memset(sheet.picture.v() + half, colour.v, width / 2);
+    std::memset(canvas.picture.u() + half, colour.u, width / 2);
+    std::memset(canvas.picture.v() + half, colour.v, width / 2);
   }
 }
 
 // Between two numbers of the scale; a tenth of it is between two ticks.
-Millidegrees scale_step(const Sheet& sheet) {
+Millidegrees scale_step(const Canvas& canvas) {
   constexpr Millidegrees kSteps[] = {10, 20, 50, 100, 200, 500, 1000, 2000, 5000, 10000, 15000, 30000, 90000};
-  const double least = 72.0 * sheet.dot / sheet.place.pixels_per_degree() * static_cast<double>(kDegree);
+  const double least = 72.0 * canvas.dot / canvas.place.pixels_per_degree() * static_cast<double>(kDegree);
   const auto* step = std::lower_bound(std::begin(kSteps), std::end(kSteps) - 1, least,
                                       [](Millidegrees s, double wanted) { return static_cast<double>(s) < wanted; });
   return *step;
@@ -133,64 +133,64 @@ ScaleRange range_of(double from, double to, Millidegrees step) {
 double in_degrees(Millidegrees angle) { return static_cast<double>(angle) / static_cast<double>(kDegree); }
 
 // One line of the scale, along an elevation.
-void draw_scale_line(Sheet& sheet, Millidegrees elevation, ScaleRange bearings, Millidegrees step) {
-  const int line = sheet.row(in_degrees(elevation));
-  const int dot = sheet.dot;
-  sheet.painter.fill({0, line, sheet.size.width, 1}, kScale);
+void draw_scale_line(Canvas& canvas, Millidegrees elevation, ScaleRange bearings, Millidegrees step) {
+  const int line = canvas.row(in_degrees(elevation));
+  const int dot = canvas.dot;
+  canvas.painter.fill({0, line, canvas.size.width, 1}, kScale);
   for (Millidegrees at = bearings.first; at <= bearings.last; at += step / 10) {
-    const int column = sheet.column(in_degrees(at));
+    const int column = canvas.column(in_degrees(at));
     const bool numbered = at % step == 0;
     const int tick = (numbered ? 8 : at % (step / 2) == 0 ? 5 : 3) * dot;
-    sheet.painter.fill({column, line - tick, std::max(dot / 2, 1), tick}, kScale);
+    canvas.painter.fill({column, line - tick, std::max(dot / 2, 1), tick}, kScale);
     if (!numbered) continue;
     const Millidegrees bearing = (at % kFullTurn + kFullTurn) % kFullTurn;
-    sheet.painter.write(bearing_text(bearing), column + 2 * dot, line - (2 + kLetterHeight + 3) * dot, dot, kScale);
-    sheet.painter.write(degrees_text(elevation), column + 2 * dot, line + 3 * dot, dot, kScale);
+    canvas.painter.write(bearing_text(bearing), column + 2 * dot, line - (2 + kLetterHeight + 3) * dot, dot, kScale);
+    canvas.painter.write(degrees_text(elevation), column + 2 * dot, line + 3 * dot, dot, kScale);
   }
 }
 
-void draw_scale(Sheet& sheet) {
-  const Millidegrees step = scale_step(sheet);
-  const double half_width = sheet.size.width / sheet.place.pixels_per_degree() / 2;
-  const double pan = sheet.place.bearing(sheet.size.width / 2.0);
+void draw_scale(Canvas& canvas) {
+  const Millidegrees step = scale_step(canvas);
+  const double half_width = canvas.size.width / canvas.place.pixels_per_degree() / 2;
+  const double pan = canvas.place.bearing(canvas.size.width / 2.0);
   const ScaleRange bearings = range_of(pan - half_width, pan + half_width, step / 10);
-  const ScaleRange elevations = range_of(sheet.place.elevation(sheet.size.height), sheet.place.elevation(0), step);
+  const ScaleRange elevations = range_of(canvas.place.elevation(canvas.size.height), canvas.place.elevation(0), step);
   for (Millidegrees at = std::max(elevations.first, kNadir); at <= std::min(elevations.last, kZenith); at += step) {
-    draw_scale_line(sheet, at, bearings, step);
+    draw_scale_line(canvas, at, bearings, step);
   }
 }
 
-void draw_posts(Sheet& sheet) {
+void draw_posts(Canvas& canvas) {
   for (int bearing = 0; bearing < 360; bearing += 90) {
-    const Area post{sheet.column(bearing) - sheet.dot, 0, 2 * sheet.dot, sheet.size.height};
-    sheet.painter.fill(post, bearing == 0 ? kNorthPost : kOtherPost);
+    const Area post{canvas.column(bearing) - canvas.dot, 0, 2 * canvas.dot, canvas.size.height};
+    canvas.painter.fill(post, bearing == 0 ? kNorthPost : kOtherPost);
   }
 }
 
-void draw_mark(Sheet& sheet, const PresetMark& mark) {
-  const int dot = sheet.dot;
+void draw_mark(Canvas& canvas, const PresetMark& mark) {
+  const int dot = canvas.dot;
   const std::string number = std::to_string(mark.number);
-  const int column = sheet.column(mark.pan);
-  const int row = sheet.row(mark.tilt);
+  const int column = canvas.column(mark.pan);
+  const int row = canvas.row(mark.tilt);
   const int width = (kLetterPitch * static_cast<int>(number.size()) + 3) * dot;
   const int top = row - 26 * dot;
-  sheet.painter.fill({column - dot / 2, top, std::max(dot, 2), 26 * dot + 1}, kFlag);
-  sheet.painter.fill({column, top, width, (kLetterHeight + 4) * dot}, kFlag);
-  sheet.painter.write(number, column + 2 * dot, top + 2 * dot, dot, kDark);
+  canvas.painter.fill({column - dot / 2, top, std::max(dot, 2), 26 * dot + 1}, kFlag);
+  canvas.painter.fill({column, top, width, (kLetterHeight + 4) * dot}, kFlag);
+  canvas.painter.write(number, column + 2 * dot, top + 2 * dot, dot, kDark);
 }
 
-void draw_figure(Sheet& sheet, const Intruder& intruder) {
+void draw_figure(Canvas& canvas, const Intruder& intruder) {
   const double unit = intruder.height / 20;  // degrees
   // A part of the body: from the middle to the right, and from the feet up, in units.
   const auto part = [&](double left, double bottom, double width, double height) {
-    const double pixels = sheet.place.pixels_per_degree() * unit;
-    const double middle = sheet.place.column(intruder.bearing);
-    const double ground = sheet.place.row(intruder.feet);
-    const int x = Sheet::pixel(middle + left * pixels);
-    const int y = Sheet::pixel(ground - (bottom + height) * pixels);
-    sheet.painter.fill({x, y, std::max(Sheet::pixel(middle + (left + width) * pixels) - x, 1),
-                        std::max(Sheet::pixel(ground - bottom * pixels) - y, 1)},
-                       kFigure);
+    const double pixels = canvas.place.pixels_per_degree() * unit;
+    const double middle = canvas.place.column(intruder.bearing);
+    const double ground = canvas.place.row(intruder.feet);
+    const int x = Canvas::pixel(middle + left * pixels);
+    const int y = Canvas::pixel(ground - (bottom + height) * pixels);
+    canvas.painter.fill({x, y, std::max(Canvas::pixel(middle + (left + width) * pixels) - x, 1),
+                         std::max(Canvas::pixel(ground - bottom * pixels) - y, 1)},
+                        kFigure);
   };
   const double swing = 3 * std::abs(2 * (intruder.steps - std::floor(intruder.steps)) - 1);
   part(-2, 16, 4, 4);
@@ -221,17 +221,17 @@ std::chrono::milliseconds clock_of(std::chrono::system_clock::time_point now) {
 
 void render(const View& view, const SceneMoment& moment, I420Picture& picture) {
   picture.resize(view.size.width, view.size.height);
-  Sheet sheet(view, picture);
+  Canvas canvas(view, picture);
   if (moment.covered) {
-    sheet.painter.fill({0, 0, sheet.size.width, sheet.size.height}, kDark);
+    canvas.painter.fill({0, 0, canvas.size.width, canvas.size.height}, kDark);
   } else {
-    draw_background(sheet);
-    draw_scale(sheet);
-    draw_posts(sheet);
-    for (const PresetMark& mark : moment.presets) draw_mark(sheet, mark);
-    if (moment.intruder) draw_figure(sheet, *moment.intruder);
+    draw_background(canvas);
+    draw_scale(canvas);
+    draw_posts(canvas);
+    for (const PresetMark& mark : moment.presets) draw_mark(canvas, mark);
+    if (moment.intruder) draw_figure(canvas, *moment.intruder);
   }
-  draw_clock(picture, sheet.dot, moment.clock);
+  draw_clock(picture, canvas.dot, moment.clock);
 }
 
 }  // namespace vexa::camera

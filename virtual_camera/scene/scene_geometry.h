@@ -20,7 +20,8 @@ struct View {
 // Degrees from `from` to `to` the shorter way: -180 to below 180, clockwise above 0.
 [[nodiscard]] double turn_between(double from, double to);
 
-// Angles that are no numbers count as 0, and a tilt ends at a full turn; the picture spans 0.1 to 360 degrees.
+// One view of the scene; a value. Angles that are no numbers count as 0, and a tilt ends at a full turn; the picture
+// spans 0.1 to 360 degrees.
 class Projection {
  public:
   explicit Projection(const View& view);
@@ -59,10 +60,10 @@ struct PictureBox {
   double bottom = 0;
 };
 
-// Where the figure stands in the picture, also where that is outside.
+// The place of the figure in the picture, also outside of it.
 [[nodiscard]] PictureBox box_of(const Intruder& intruder, const View& view);
 
-// A straight way through the scene.
+// A straight path through the scene.
 struct Walk {
   double from = 0;    // bearing at which it begins
   double turn = 0;    // degrees walked in all, clockwise above 0

@@ -21,8 +21,8 @@ struct Area {
 inline constexpr int kLetterPitch = 6;
 inline constexpr int kLetterHeight = 7;
 
-// Rotated, it puts everything where it stands when the picture is turned by 180 degrees.
-// Made for one picture by the thread that paints it.
+// Draws on a picture of the caller's, on its thread. Rotated, it draws everything where it is in the picture turned by
+// 180 degrees. Never draws outside the picture.
 class ScenePainter {
  public:
   ScenePainter(I420Picture& picture, bool rotated) : picture_(picture), rotated_(rotated) {}

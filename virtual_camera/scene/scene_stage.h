@@ -10,8 +10,7 @@
 
 namespace vexa::camera {
 
-// Any thread.
-// A camera owns one: its watch sends the walker in, its painters look.
+// Holds the intruder, if there is one. Owned by the camera's state; thread-safe.
 class SceneStage {
  public:
   using Time = std::chrono::steady_clock::time_point;

@@ -21,12 +21,13 @@ namespace vexa::camera {
 
 struct CameraState;
 
-// What a path of the control port lets happen; nothing for a path that it does not know.
+// The event that a path of the control port causes; none for a path that it does not know.
 [[nodiscard]] std::optional<AlarmEvent> control_event(std::string_view path);
-// How long an intruder walks whom a path sends through the scene; nothing for another path.
+// How long the intruder walks whom a path sends through the scene; none for another path.
 [[nodiscard]] std::optional<std::chrono::seconds> control_walk(std::string_view path);
 
-// Lives on the loop's thread.
+// Held by the camera's core; on the loop's thread. It takes no credentials, and so listens on the loopback address
+// alone.
 class AlarmControl : public std::enable_shared_from_this<AlarmControl> {
  public:
   explicit AlarmControl(std::shared_ptr<CameraState> state);

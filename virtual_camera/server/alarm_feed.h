@@ -15,7 +15,7 @@
 
 namespace vexa::camera {
 
-// Held by a shared_ptr.
+// Owned by the connection and held by its timer; on the loop's thread. Made by make_shared only.
 class AlarmFeed : public HttpBody, public std::enable_shared_from_this<AlarmFeed> {
  public:
   enum class Changes { kLeftOut, kSentAtOnce };

@@ -16,7 +16,7 @@
 namespace vexa::camera {
 namespace {
 
-// Far above what honest hosts open at once; more connections are closed at once.
+// Far above what well-behaved hosts open at once; more connections are closed at once.
 constexpr std::size_t kMaxConnections = 512;
 
 void keep(std::vector<std::weak_ptr<Connection>>& connections, const std::shared_ptr<Connection>& connection) {
@@ -45,8 +45,8 @@ std::string bind_failure(const std::string& address, std::uint16_t port, const a
 
 }  // namespace
 
-// Parts of the alarm-data stream on their way to the loop's thread.
-class CameraCore::AlarmNews {
+// Parts of the alarm-data stream, queued for the loop's thread. Any thread adds them, the loop's takes them.
+class CameraCore::AlarmParts {
  public:
   void add(const std::string& part) {
     const std::lock_guard<std::mutex> lock(mutex_);
@@ -124,24 +124,24 @@ void CameraCore::take_calls() {
     if (const std::shared_ptr<CameraCore> core = weak.lock()) core->set_network(plugged);
   };
   state_->requests.settings_changed = [weak = std::weak_ptr<CardRecorder>(recorder_)] {
-    if (const std::shared_ptr<CardRecorder> recorder = weak.lock()) recorder->look();
+    if (const std::shared_ptr<CardRecorder> recorder = weak.lock()) recorder->update();
   };
 }
 
 // Changes may come from any thread; the connections live on the loop's. They wait in a queue of their own, because what
 // the loop's thread posts and what others post overtake each other.
 void CameraCore::spread_alarms() {
-  const auto news = std::make_shared<AlarmNews>();
+  const auto parts = std::make_shared<AlarmParts>();
   state_->alarm_part =
-      state_->alarms.listen([weak = weak_from_this(), news, &context = state_->context](const std::string& part) {
-        news->add(part);
-        asio::post(context, [weak, news] {
-          if (const std::shared_ptr<CameraCore> core = weak.lock()) core->tell(news->take());
+      state_->alarms.listen([weak = weak_from_this(), parts, &context = state_->context](const std::string& part) {
+        parts->add(part);
+        asio::post(context, [weak, parts] {
+          if (const std::shared_ptr<CameraCore> core = weak.lock()) core->send_alarm_parts(parts->take());
         });
       });
 }
 
-void CameraCore::tell(const std::deque<std::string>& parts) {
+void CameraCore::send_alarm_parts(const std::deque<std::string>& parts) {
   for (const std::string& part : parts) {
     state_->alarm_part = part;
     for (const std::weak_ptr<Connection>& connection : state_->connections) {
@@ -162,7 +162,7 @@ void CameraCore::stop() {
   running_ = false;
   state_->requests = {};
   plugged_ = true;
-  recorder_->see(true);
+  recorder_->set_reachable(true);
   recorder_->stop();
   back_.cancel();
   state_->alarms.listen(nullptr);
@@ -186,14 +186,14 @@ void CameraCore::vanish_for(std::chrono::milliseconds away) {
 
 void CameraCore::come_back() {
   constexpr std::chrono::milliseconds kRetry{50};
-  recorder_->look();
+  recorder_->update();
   if (plugged_ && !open_ports().empty()) vanish_for(kRetry);
 }
 
 void CameraCore::set_network(bool plugged) {
   if (!running_ || plugged == plugged_) return;
   plugged_ = plugged;
-  recorder_->see(plugged_);
+  recorder_->set_reachable(plugged_);
   back_.cancel();
   vanish();
   if (plugged_) come_back();

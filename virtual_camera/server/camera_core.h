@@ -16,7 +16,8 @@
 
 namespace vexa::camera {
 
-// The public VirtualCamera holds it and calls it on the loop's thread; ports and connections hold the state, not this.
+// Starts, stops and reboots one camera. Held by VirtualCamera and by its own handlers; every operation runs on the
+// loop's thread, except that alarm parts may be added by any.
 class CameraCore : public std::enable_shared_from_this<CameraCore> {
  public:
   explicit CameraCore(std::shared_ptr<CameraState> state);
@@ -34,7 +35,7 @@ class CameraCore : public std::enable_shared_from_this<CameraCore> {
   [[nodiscard]] std::uint16_t control_port() const { return control_->port(); }
 
  private:
-  class AlarmNews;
+  class AlarmParts;
 
   [[nodiscard]] std::string prepare();
   [[nodiscard]] std::string open_ports();
@@ -43,7 +44,7 @@ class CameraCore : public std::enable_shared_from_this<CameraCore> {
   void come_back();
   void spread_alarms();
   void take_calls();
-  void tell(const std::deque<std::string>& parts);
+  void send_alarm_parts(const std::deque<std::string>& parts);
 
   std::shared_ptr<CameraState> state_;
   std::shared_ptr<Listener> http_;

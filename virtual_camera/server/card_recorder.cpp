@@ -57,12 +57,12 @@ RecorderSettings recorder_settings(const SettingsStore& settings) {
 CardRecorder::CardRecorder(std::shared_ptr<CameraState> state)
     : state_(std::move(state)), pace_(state_->context), after_(state_->context) {}
 
-void CardRecorder::see(bool reachable) {
+void CardRecorder::set_reachable(bool reachable) {
   reachable_ = reachable;
-  look();
+  update();
 }
 
-void CardRecorder::look() {
+void CardRecorder::update() {
   const RecorderSettings settings = recorder_settings(state_->settings);
   if (settings.image == 0) return stop();
   if (!reachable_) {

@@ -22,18 +22,18 @@ struct RecorderSettings {
   std::chrono::seconds after{0};  // recorded on when the watched address is back
 };
 
-// What the section "edgestorage" says; no stream while it is off or watches no address.
+// The settings in the section "edgestorage"; no stream while it is off or watches no address.
 [[nodiscard]] RecorderSettings recorder_settings(const SettingsStore& settings);
 
-// Lives on the loop's thread.
+// Held by the camera's core and its timer; on the loop's thread. Writes pictures to the card, never reads any.
 class CardRecorder : public std::enable_shared_from_this<CardRecorder> {
  public:
   explicit CardRecorder(std::shared_ptr<CameraState> state);
 
-  // The address to watch is there or not.
-  void see(bool reachable);
+  // Whether the camera reaches the address that it watches.
+  void set_reachable(bool reachable);
   // The settings may have changed.
-  void look();
+  void update();
   // Ends the recording at once.
   void stop();
 

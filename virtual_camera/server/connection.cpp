@@ -12,7 +12,7 @@
 namespace vexa::camera {
 namespace {
 
-// Longer requests are refused: the longest honest one is 1023 bytes.
+// Longer requests are refused: a driver's longest is 1023 bytes.
 constexpr std::size_t kMaxRequest = 8192;
 // A held or half-closed connection waits this long for its peer to go.
 constexpr std::chrono::seconds kLingerLimit{60};
@@ -198,7 +198,7 @@ void Connection::delivered() {
   });
 }
 
-// Whatever the peer says from here on is passed over.
+// Whatever the peer sends from here on is ignored.
 void Connection::begin_stream() {
   received_.clear();
   deadline_.expires_at(std::chrono::steady_clock::time_point::max());

@@ -22,7 +22,8 @@ namespace vexa::camera {
 
 struct CameraState;
 
-// Owned by the operations that wait for its socket, and ends with them. On the loop's thread.
+// Held by its own pending reads and writes, and gone once there are none; on the loop's thread. It never blocks:
+// deadlines are timers.
 class Connection : public std::enable_shared_from_this<Connection> {
  public:
   Connection(asio::ip::tcp::socket socket, std::shared_ptr<CameraState> state);

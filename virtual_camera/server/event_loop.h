@@ -11,7 +11,8 @@
 
 namespace vexa::camera {
 
-// Everything a camera does happens on its loop's thread, so that cameras need no locks among their own parts.
+// Shared by the cameras that it serves. Everything that its cameras do happens on its thread, so that they need
+// no locks among their own parts.
 class EventLoop {
  public:
   EventLoop() : work_(asio::make_work_guard(context_)), thread_([this] { context_.run(); }) {}

@@ -20,10 +20,10 @@ void report_contacts(const AlarmScene& alarms, SettingsStore& settings);
 void report_card(const Card& card, SettingsStore& settings);
 void report_presets(PtzHead& ptz, SettingsStore& settings);
 
-// Switches the detectors as the settings say.
+// Switches the detectors according to the settings.
 void switch_detectors(const SettingsStore& settings, AlarmScene& alarms);
 
-// The picture in which hosts point at what the camera is to look at: that of the first stream.
+// The picture whose pixels hosts use to point the camera: that of the first stream.
 [[nodiscard]] PtzPicture pointed_picture(const SettingsStore& settings);
 
 }  // namespace vexa::camera

@@ -12,7 +12,7 @@
 
 namespace vexa::camera {
 
-// Owned and run as any Connection.
+// Routes a request to settings, motors, card or streams. On the loop's thread; owns the body of a running stream.
 class HttpConnection : public Connection, private HttpBody::Line {
  public:
   using Connection::Connection;

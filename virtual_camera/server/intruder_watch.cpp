@@ -11,16 +11,16 @@ IntruderWatch::IntruderWatch(std::shared_ptr<CameraState> state) : state_(std::m
 void IntruderWatch::walk(std::chrono::milliseconds duration) {
   const auto now = std::chrono::steady_clock::now();
   state_->stage.enter(walk_through(state_->scene.main_view(now), duration), now);
-  look();
+  check();
 }
 
 void IntruderWatch::stop() {
   pace_.cancel();
   state_->stage.enter({}, {});
-  tell({});
+  report({});
 }
 
-void IntruderWatch::tell(const std::array<bool, kDetectionWindows>& seen) {
+void IntruderWatch::report(const std::array<bool, kDetectionWindows>& seen) {
   constexpr int kMovement = 60;
   for (std::size_t i = 0; i < seen.size(); ++i) {
     if (std::exchange(seen_[i], seen[i]) == seen[i]) continue;
@@ -28,14 +28,14 @@ void IntruderWatch::tell(const std::array<bool, kDetectionWindows>& seen) {
   }
 }
 
-void IntruderWatch::look() {
+void IntruderWatch::check() {
   constexpr std::chrono::milliseconds kInterval{20};
   const auto now = std::chrono::steady_clock::now();
-  tell(state_->scene.alarmed_windows(now));
+  report(state_->scene.alarmed_windows(now));
   if (!state_->stage.intruder(now)) return;
   pace_.expires_after(kInterval);
   pace_.async_wait([self = shared_from_this()](asio::error_code stopped) {
-    if (!stopped) self->look();
+    if (!stopped) self->check();
   });
 }
 

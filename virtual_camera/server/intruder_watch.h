@@ -13,7 +13,7 @@ namespace vexa::camera {
 
 struct CameraState;
 
-// Lives on the loop's thread.
+// Held by the camera's core and its timer; on the loop's thread.
 class IntruderWatch : public std::enable_shared_from_this<IntruderWatch> {
  public:
   explicit IntruderWatch(std::shared_ptr<CameraState> state);
@@ -24,8 +24,8 @@ class IntruderWatch : public std::enable_shared_from_this<IntruderWatch> {
   void stop();
 
  private:
-  void look();
-  void tell(const std::array<bool, kDetectionWindows>& seen);
+  void check();
+  void report(const std::array<bool, kDetectionWindows>& seen);
 
   std::shared_ptr<CameraState> state_;
   asio::steady_timer pace_;

@@ -25,8 +25,7 @@ struct Request {
   std::string answer;  // the bytes the camera set out to send; a fault may have cut them
 };
 
-// Thread-safe. A request stands here before the first byte of its answer leaves.
-// Part of a camera's state; tests read it while the camera runs.
+// Owned by the camera; thread-safe. A request is in the journal before the first byte of its answer leaves.
 class Journal {
  public:
   using Predicate = std::function<bool(const std::deque<Request>&)>;

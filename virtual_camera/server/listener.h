@@ -11,8 +11,7 @@
 
 namespace vexa::camera {
 
-// Lives on the loop's thread.
-// A camera's core owns one for each port.
+// Accepts connections and passes each to a function. Held by the camera's core; on the loop's thread.
 class Listener : public std::enable_shared_from_this<Listener> {
  public:
   // Takes a connection that has been accepted.

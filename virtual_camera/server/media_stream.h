@@ -14,7 +14,8 @@ namespace vexa::camera {
 
 struct CameraState;
 
-// Owned by the connection whose answer it is; on the loop's thread.
+// Sends the pieces of an HttpStream when they are due. Owned by the connection whose answer it continues; on the loop's
+// thread.
 class MediaStream : public HttpBody {
  public:
   MediaStream(HttpStream stream, std::function<bool()> holds_pictures);

@@ -9,7 +9,8 @@
 
 namespace vexa::camera {
 
-// Thread-safe: tests change them while the camera runs.
+// Sessions copy the faults when they begin; a change does not reach those that run. Thread-safe, as tests change them
+// while the camera runs.
 class PacketFaultBox {
  public:
   explicit PacketFaultBox(PacketFaults faults) : faults_(std::move(faults)) {}

@@ -14,7 +14,7 @@
 
 namespace vexa::camera {
 
-// Thread-safe. Every rule counts its own matches; the first rule in force wins.
+// Owned by the camera's state; thread-safe. Each rule counts its own matches; the first rule in force wins.
 class RequestFaultList {
  public:
   void add(RequestFault fault);

@@ -70,7 +70,7 @@ Answer RtspConnection::dispatch(const RequestHead& request, std::uint32_t sequen
   return rtsp_answer({"501 Not Implemented", sequence, kMethods, {}});
 }
 
-// Nothing for a path that names no recording, or one without a picture.
+// Nullopt for a path that names no recording, or one without a picture.
 std::optional<Recording> RtspConnection::recording_at(std::string_view path, VideoUrl as) {
   const RecordingUrl url = recording_url(path);
   if (url.kind != as) return std::nullopt;
@@ -97,7 +97,7 @@ Answer RtspConnection::describe(const RequestHead& request, std::uint32_t sequen
   return rtsp_answer({"200 OK", sequence, {}, description});
 }
 
-RtspConnection::MediaWay RtspConnection::open_udp(const AskedTransport& asked) {
+RtspConnection::MediaTransport RtspConnection::open_udp(const AskedTransport& asked) {
   asio::error_code error;
   const asio::ip::tcp::endpoint peer = socket().remote_endpoint(error);
   auto port = std::make_unique<UdpPort>(state().context);
@@ -108,8 +108,8 @@ RtspConnection::MediaWay RtspConnection::open_udp(const AskedTransport& asked) {
   return {std::move(port), std::move(transport)};
 }
 
-// Channels that an earlier session of the connection had are not given again; the host is told which it gets.
-RtspConnection::MediaWay RtspConnection::open_interleaved(const AskedTransport& asked) {
+// Channels that an earlier session of the connection had are not given again; the answer names those it gets.
+RtspConnection::MediaTransport RtspConnection::open_interleaved(const AskedTransport& asked) {
   constexpr std::uint16_t kChannels = 256;
   const bool free = asked.first >= next_channel_;
   const std::uint16_t first = free ? asked.first : next_channel_;
@@ -129,17 +129,17 @@ Answer RtspConnection::setup(const RequestHead& request, std::uint32_t sequence)
   const bool found = classify_url(request.path) == VideoUrl::kTrack || recording_at(request.path, VideoUrl::kTrack);
   if (!found) return status_only("404 Not Found", sequence);
   const AskedTransport asked = asked_transport(request.field("Transport"));
-  if (asked.way == AskedTransport::Way::kNone) return status_only("461 Unsupported Transport", sequence);
+  if (asked.kind == AskedTransport::Kind::kNone) return status_only("461 Unsupported Transport", sequence);
   if (state().sessions.size() >= kMaxSessions) return status_only("453 Not Enough Bandwidth", sequence);
-  MediaWay way = asked.way == AskedTransport::Way::kUdp ? open_udp(asked) : open_interleaved(asked);
-  if (!way.port) return status_only("500 Internal Server Error", sequence);
+  MediaTransport media = asked.kind == AskedTransport::Kind::kUdp ? open_udp(asked) : open_interleaved(asked);
+  if (!media.port) return status_only("500 Internal Server Error", sequence);
   const auto session = std::make_shared<RtspSession>(shared_state(), state().next_session++, video_number(request.path),
-                                                     std::move(way.port), way.pause);
+                                                     std::move(media.port), media.pause);
   state().sessions[session->number()] = session;
   own_sessions_.push_back(session);
   session->touch();
   const std::string fields = fmt::format("Session: {};timeout={}\r\nTransport: {}\r\n", session->number(),
-                                         state().options.session_timeout.count(), way.transport);
+                                         state().options.session_timeout.count(), media.transport);
   return rtsp_answer({"200 OK", sequence, fields, {}});
 }
 

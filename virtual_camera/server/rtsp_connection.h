@@ -21,7 +21,7 @@
 
 namespace vexa::camera {
 
-// Owned and run as any Connection.
+// Answers RTSP requests, and ends the sessions that it has set up when it ends. On the loop's thread.
 class RtspConnection : public Connection {
  public:
   using Connection::Connection;
@@ -38,14 +38,14 @@ class RtspConnection : public Connection {
   void claim_socket(const std::function<void()>& ready) override;
   void release_socket() override;
 
-  // Where a session's packets are to go, and how SETUP's answer tells it; no port: it could not be opened.
-  struct MediaWay {
+  // Where a session's packets are to go, and how SETUP's answer states it; no port: it could not be opened.
+  struct MediaTransport {
     std::unique_ptr<PacketPort> port;
     std::string transport;
     std::chrono::milliseconds pause{0};
   };
-  MediaWay open_udp(const AskedTransport& asked);
-  MediaWay open_interleaved(const AskedTransport& asked);
+  MediaTransport open_udp(const AskedTransport& asked);
+  MediaTransport open_interleaved(const AskedTransport& asked);
 
   Answer dispatch(const RequestHead& request, std::uint32_t sequence);
   std::optional<Recording> recording_at(std::string_view path, VideoUrl as);

@@ -16,7 +16,8 @@ namespace vexa::camera {
 
 struct CameraState;
 
-// Its connection owns it; on the loop's thread.
+// Owned by the camera's table of sessions; its connection takes it out. On the loop's thread. Sends no answer: the
+// connection does.
 class RtspSession : public std::enable_shared_from_this<RtspSession> {
  public:
   // `video`: the number of the camera's video stream that it plays. `port` is open; the first picture leaves through
@@ -31,7 +32,7 @@ class RtspSession : public std::enable_shared_from_this<RtspSession> {
   void play();
   // A request named the session: its time starts over.
   void touch();
-  // Stops sending for good. The session leaves the camera's table, when it still stands there.
+  // Stops sending for good. The session leaves the camera's table, if it is still there.
   void end();
 
  private:

@@ -20,7 +20,7 @@ std::string parameter_sets(const SourceFormat& format) {
                      base64_text(format.picture_parameters));
 }
 
-// The lines that tell the codec (RFC 6184, 8.2; RFC 3016, 5.2; RFC 2435).
+// The lines that describe the codec (RFC 6184, 8.2; RFC 3016, 5.2; RFC 2435).
 std::string format_lines(const CameraOptions& options, Codec codec, std::string_view sets) {
   const auto type = payload_type_of(options, codec);
   switch (codec) {

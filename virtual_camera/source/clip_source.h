@@ -10,8 +10,7 @@
 
 namespace vexa::camera {
 
-// Nothing is copied: what it hands out keeps the clip.
-// Owned by the session or the HTTP answer that shows it, and used on its thread.
+// Owned by one stream, on its thread. No picture is copied: those that it returns keep the clip alive.
 class ClipSource : public PictureSource {
  public:
   enum class AtEnd { kStop, kStartOver };

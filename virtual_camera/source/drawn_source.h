@@ -10,8 +10,7 @@
 
 namespace vexa::camera {
 
-// Draws each picture when it is asked for.
-// Owned by the session or the HTTP answer that shows it, and used on its thread.
+// Owned by one stream, on its thread. Draws each picture when it is asked for.
 class DrawnSource : public PictureSource {
  public:
   DrawnSource(Codec codec, const DrawnVideo& video);

@@ -85,8 +85,8 @@ std::string HttpStream::unit_bytes(const std::string& content) const {
   return fmt::format("{}--picture\r\nContent-Type: image/jpeg\r\n{}\r\n{}\r\n", front, line, content);
 }
 
-// The faults that change what stands ready, or end the stream with it.
-void HttpStream::strike() {
+// The faults that change the piece that is ready, or end the stream with it.
+void HttpStream::apply_faults() {
   if (const HttpStreamFault* cut = fault(Action::kCut)) unit_ = unit_.substr(0, cut->bytes);
   for (const Action action : {Action::kClose, Action::kSilence}) {
     const HttpStreamFault* end = fault(action);
@@ -117,7 +117,7 @@ std::string HttpStream::take() {
   if (!load_unit()) return {};
   if (!std::exchange(made_, true)) {
     unit_ = unit_bytes(content());
-    strike();
+    apply_faults();
   }
   std::string piece = unit_.substr(0, options_.piece == 0 ? unit_.size() : options_.piece);
   unit_.erase(0, piece.size());

@@ -29,7 +29,7 @@ struct HttpStreamOptions {
   std::vector<HttpStreamFault> faults;
 };
 
-// Owned by the answer that it is sent in; one thread at a time.
+// Owned by a MediaStream, which asks for each piece when it is due. One thread at a time.
 class HttpStream {
  public:
   struct Piece {
@@ -46,15 +46,15 @@ class HttpStream {
 
   // The head of the answer.
   [[nodiscard]] std::string head() const;
-  // When the next piece leaves; nothing at the stream's end, or while its source has no picture.
+  // When the next piece leaves; none at the stream's end, or while its source has no picture.
   [[nodiscard]] std::optional<std::chrono::nanoseconds> next_due();
   // Whether the next piece begins a picture or a piece of sound; only after next_due() has found one.
   [[nodiscard]] bool begins_unit() const { return !made_; }
-  // The next piece, made as it leaves; empty where a fault leaves nothing of it, or nothing is due.
+  // The next piece, made as it leaves; empty where a fault leaves no byte of it, or none is due.
   [[nodiscard]] std::string take();
-  // Both at once, over empty pieces; nothing at the stream's end.
+  // Both at once, over empty pieces; none at the stream's end.
   [[nodiscard]] std::optional<Piece> next();
-  // Whether next_due() gave nothing only because the source has no picture yet; then wait() calls `ready` as the
+  // Whether next_due() returned none only because the source has no picture yet; then wait() calls `ready` as the
   // source's does.
   [[nodiscard]] bool waits() const;
   void wait(const std::function<void()>& ready) { source_->wait(ready); }
@@ -68,21 +68,21 @@ class HttpStream {
   [[nodiscard]] std::string unit_bytes(const std::string& content) const;
   [[nodiscard]] const HttpStreamFault* fault(HttpStreamFault::Action action) const;
   void change_clip(const std::string& path);
-  void strike();
+  void apply_faults();
   [[nodiscard]] bool is_jpeg() const;
   [[nodiscard]] std::chrono::nanoseconds paced(std::chrono::nanoseconds time) const;
 
   std::unique_ptr<PictureSource> source_;  // null: sound, or another clip was to follow and is not there
-  std::optional<SourcePicture> picture_;   // of the unit under way
+  std::optional<SourcePicture> picture_;   // of the present unit
   std::string sound_;
   std::size_t sound_unit_ = 0;
   HttpStreamOptions options_;
-  std::uint64_t index_ = 0;  // of the unit under way, or of the next
+  std::uint64_t index_ = 0;  // of the present unit, or of the next
   std::chrono::nanoseconds source_began_{0};
   std::chrono::nanoseconds planned_{0};  // when the unit leaves, without the pauses
   std::chrono::nanoseconds late_{0};     // all pauses so far
   std::string unit_;                     // what has not left of it
-  bool loaded_ = false;                  // a unit is under way
+  bool loaded_ = false;                  // a unit is being sent
   bool made_ = false;                    // its bytes are
   bool ended_ = false;
   bool closes_ = true;

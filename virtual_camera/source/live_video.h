@@ -20,7 +20,8 @@
 
 namespace vexa::camera {
 
-// Its thread runs from the first picture asked for until the last source is gone; only its sources keep it.
+// Shared by the sources that watch it. Its thread runs from the first picture asked for until the last source is gone;
+// only its sources keep it.
 class LiveVideo : public std::enable_shared_from_this<LiveVideo> {
  public:
   // Fills the picture with what is to be seen at this moment. Called on the thread.
@@ -36,7 +37,7 @@ class LiveVideo : public std::enable_shared_from_this<LiveVideo> {
   [[nodiscard]] const LiveEncoding& encoding() const { return encoding_; }
   // One more who watches: from when the source is first asked for a picture, beginning with a key picture, which is
   // made at once. One that is not asked for two seconds loses what it did not take, and goes on with a key picture. Its
-  // wait() calls `ready` on the thread, with a lock held: that may hand work over, and nothing else.
+  // wait() calls `ready` on the thread, with a lock held: that may post work to another thread, and no more.
   [[nodiscard]] std::unique_ptr<PictureSource> watch();
 
  private:

@@ -17,14 +17,14 @@ namespace vexa::camera {
 
 class PacketisedPicture;
 
-// A coded picture on its way to one taker. What it points to is immutable and may be shared by any number of takers.
+// A coded picture for one receiver. What it points to is immutable and may be shared by any number of receivers.
 struct SourcePicture {
   Codec codec = Codec::kH264;
   bool key = false;                                  // needs no picture before it
-  std::shared_ptr<const std::string> bytes;          // H.264 behind start codes of four bytes throughout; never null
+  std::shared_ptr<const std::string> bytes;          // H.264 after start codes of four bytes throughout; never null
   std::shared_ptr<const PacketisedPicture> packets;  // the same as RTP payloads, where it was cut before; else null
   std::size_t place = 0;                             // in its clip; else counted from 0
-  // Both after the beginning of the source at pace 1. The second, which RTP timestamps tell, may run at another pace,
+  // Both after the beginning of the source at pace 1. The second, which RTP timestamps carry, may run at another pace,
   // or backwards.
   std::chrono::nanoseconds due{0};
   std::chrono::nanoseconds stamp{0};
@@ -34,7 +34,7 @@ struct SourcePicture {
 struct SourceFormat {
   Codec codec = Codec::kH264;
   double frames_per_second = 25;
-  // Whether pictures take user data on their way out: the options', or where the camera looks now. Else they leave as
+  // Whether pictures get user data when they leave: the options', or the camera's present direction. Else they leave as
   // they are, like recordings.
   bool takes_user_data = true;
   // H.264's parameter sets, NAL units without start codes; empty: not known yet.
@@ -42,7 +42,8 @@ struct SourceFormat {
   std::string picture_parameters;
 };
 
-// Made for one taker: each begins with its own first picture, which is a key picture. One thread at a time.
+// Made for one receiver, which owns it: each begins with its own first picture, which is a key picture. One thread at a
+// time. It reads no clock: pictures carry the times they are due.
 class PictureSource {
  public:
   PictureSource() = default;
@@ -51,12 +52,12 @@ class PictureSource {
   PictureSource& operator=(const PictureSource&) = delete;
 
   [[nodiscard]] virtual const SourceFormat& format() const = 0;
-  // The next picture, in the order of `due`; nothing when there is none yet, or never again. It may be asked for before
+  // The next picture, in the order of `due`; none when there is none yet, or never again. It may be asked for before
   // it is due; a picture that is made from life comes when it is.
   [[nodiscard]] virtual std::optional<SourcePicture> next() = 0;
   // Whether no picture follows those handed out.
   [[nodiscard]] virtual bool ended() const = 0;
-  // When next() gave nothing and the source has not ended: calls `ready` once, from any thread or at once, when it is
+  // When next() returned none and the source has not ended: calls `ready` once, from any thread or at once, when it is
   // worth asking again. A call that the source does not outlive may be left out.
   virtual void wait(const std::function<void()>& ready) { ready(); }
 };

@@ -1,4 +1,4 @@
-// The faults a virtual camera can be told to show, as plain values.
+// The faults that a virtual camera can show, as plain values.
 #ifndef VIRTUAL_CAMERA_VALUES_FAULTS_H_
 #define VIRTUAL_CAMERA_VALUES_FAULTS_H_
 
@@ -24,17 +24,17 @@ struct TimestampRestart {
   std::optional<std::uint32_t> value;
 };
 
-// What happens to RTP packets on their way. Probabilities are 0 to 1, drawn for each packet from the camera's seed, so
-// that the same seed, clip and settings give the same faults. Distances count later packets of the same session, also
-// those that are lost or held back themselves.
+// What happens to RTP packets before they leave. Probabilities are 0 to 1, drawn for each packet from the camera's
+// seed, so that the same seed, clip and settings give the same faults. Distances count later packets of the same
+// session, also those that are lost or held back themselves.
 struct PacketFaults {
   double loss = 0;
   double burst_loss = 0;  // probability that a burst begins with this packet
   std::size_t burst_length = 8;
   double reorder = 0;
-  std::size_t reorder_distance = 20;  // a packet is held back behind 1 to this many later packets
+  std::size_t reorder_distance = 20;  // a packet is held back until 1 to this many later packets have left
   double duplicate = 0;
-  std::size_t duplicate_distance = 0;  // 0: the duplicate follows at once; n: behind 0 to n later packets
+  std::size_t duplicate_distance = 0;  // 0: the duplicate follows at once; n: after 0 to n later packets
   double delay = 0;
   std::chrono::milliseconds delay_time{100};
   double corrupt_payload = 0;
@@ -43,13 +43,13 @@ struct PacketFaults {
   double missing_marker = 0;     // drawn for the last packet of each picture
   std::vector<SequenceRestart> sequence_restarts;
   std::vector<TimestampRestart> timestamp_restarts;
-  // Random faults strike only pictures from first_picture to last_picture, so that a stream can start and end clean.
+  // Random faults affect only pictures from first_picture to last_picture, so that a stream can start and end clean.
   std::uint64_t first_picture = 0;
   std::uint64_t last_picture = std::numeric_limits<std::uint64_t>::max();
 };
 
 enum class FaultAction {
-  kNoAnswer,          // the request is taken and nothing ever comes back
+  kNoAnswer,          // the request is taken and never answered
   kSlowAnswer,        // the answer comes after `time`
   kByteAtATime,       // a byte, then `time`, then the next
   kCutAfter,          // only the first `bytes` bytes, then the connection is closed
@@ -90,10 +90,10 @@ struct HttpStreamFault {
   enum class Action {
     kDataLength,    // "DataLen: " is followed by `text`
     kNoDataLength,  // the part does not announce its length
-    kBefore,        // `text` stands in front of it
+    kBefore,        // `text` comes before it
     kCut,           // only the first `bytes` bytes of it are sent; the stream goes on with the next
     kClose,         // the connection closes after `bytes` bytes of it
-    kSilence,       // nothing more comes after `bytes` bytes of it
+    kSilence,       // the stream falls silent after `bytes` bytes of it
     kPause,         // it comes later by `time`, and so does all that follows
     kOtherClip,     // from here on the stream sends the clip of the file `text`, from its beginning
   };

@@ -1,4 +1,4 @@
-// Everything one virtual camera can be told at its start.
+// The options of one virtual camera, set before it starts.
 #ifndef VIRTUAL_CAMERA_VALUES_OPTIONS_H_
 #define VIRTUAL_CAMERA_VALUES_OPTIONS_H_
 
@@ -26,7 +26,7 @@ class ImageClip;
 class PacketisedClip;
 class SettingRules;
 
-// How pictures are made as streams are set: drawn squares, which cost nothing, or the scene before the camera, painted
+// How pictures are made as streams are set: drawn squares, which cost no time, or the scene before the camera, painted
 // and encoded as they are sent. Builds without encoders draw.
 enum class PicturesMade { kDrawn, kOfTheScene };
 
@@ -56,9 +56,8 @@ struct CameraOptions {
   // which wins. With neither, there is no such stream.
   std::string image_path;
   std::shared_ptr<const ImageClip> images;
-  std::string
-      sound_path;         // "/audio" streams this file with the codec's word behind it: "tone" means "tone.g711_64" ...
-  std::string user_data;  // in every picture over HTTP and in key pictures over RTP, such as "CamPos: ..."
+  std::string sound_path;  // "/audio" streams this file with the codec's word after it: "tone" means "tone.g711_64" ...
+  std::string user_data;   // in every picture over HTTP and in key pictures over RTP, such as "CamPos: ..."
   std::size_t stream_piece = 0;  // bytes of an HTTP stream that leave at a time; 0: a picture at once
   std::vector<HttpStreamFault> stream_faults;
 
@@ -74,7 +73,7 @@ struct CameraOptions {
 
   double frames_per_second = 25;
   double speed = 1;  // pace: 4 sends four times faster, with timestamps advancing by picture as at 1
-  // Asked on the camera's thread before each picture of a stream leaves; while it returns true the stream stands still,
+  // Asked on the camera's thread before each picture of a stream leaves; while it returns true the stream pauses,
   // and goes on at its pace from there. For hosts in the same process, which must not lose a picture on a machine that
   // is slow for a moment. Empty: never held.
   std::function<bool()> hold_pictures;
@@ -82,7 +81,7 @@ struct CameraOptions {
   std::uint32_t clock_rate = 90000;
   std::uint16_t start_sequence = 1;
   std::uint32_t start_timestamp = 100000000;
-  std::uint8_t payload_type = 96;  // JPEG has 26 whatever stands here
+  std::uint8_t payload_type = 96;  // JPEG always has 26
   std::size_t max_payload = 1400;  // RTP payload bytes of one datagram, at least 3
   // A picture goes out in bursts of at most this many packets, spread over half the picture's time.
   std::size_t burst_packets = 16;
@@ -92,7 +91,7 @@ struct CameraOptions {
   unsigned link_megabits = 0;
 
   // Packets on the RTSP connection begin so long after PLAY's answer: hosts take an answer off the connection together
-  // with what has come behind it.
+  // with what has come after it.
   std::chrono::milliseconds interleaved_pause{250};
   // A host that takes none of them for so long has its connection reset.
   std::chrono::milliseconds interleaved_patience{10000};

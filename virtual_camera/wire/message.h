@@ -45,7 +45,7 @@ struct Answer {
 // The command was obeyed.
 [[nodiscard]] Answer no_content();
 
-// The bytes of a percent-encoded text; nothing when it is no such text.
+// The bytes of a percent-encoded text; nullopt when it is no such text.
 [[nodiscard]] std::optional<std::string> percent_decoded(std::string_view text);
 // The text with its "%", ",", "&" and control characters percent-encoded, so that a list can hold it.
 [[nodiscard]] std::string percent_encoded_for_list(std::string_view text);

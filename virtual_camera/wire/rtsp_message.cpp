@@ -17,7 +17,7 @@ bool all_digits(std::string_view text) {
   return !text.empty() && text.find_first_not_of("0123456789") == std::string_view::npos;
 }
 
-// The numbers behind a name of a Transport field, such as "client_port=5000-5001".
+// The numbers after a name of a Transport field, such as "client_port=5000-5001".
 std::optional<std::pair<std::uint16_t, std::uint16_t>> number_pair(std::string_view alternative,
                                                                    std::string_view name) {
   const std::size_t found = alternative.find(name);
@@ -33,19 +33,19 @@ std::optional<std::pair<std::uint16_t, std::uint16_t>> number_pair(std::string_v
 
 // One alternative of a Transport field.
 AskedTransport parse_alternative(std::string_view text) {
-  using Way = AskedTransport::Way;
+  using Kind = AskedTransport::Kind;
   constexpr std::uint16_t kMostChannel = 255;
   if (text.find("multicast") != std::string_view::npos) return {};
   if (text.starts_with("RTP/AVP;") || text.starts_with("RTP/AVP/UDP;")) {
     const auto ports = number_pair(text, "client_port=");
-    return ports && ports->first != 0 ? AskedTransport{Way::kUdp, ports->first, ports->second} : AskedTransport{};
+    return ports && ports->first != 0 ? AskedTransport{Kind::kUdp, ports->first, ports->second} : AskedTransport{};
   }
   if (text != "RTP/AVP/TCP" && !text.starts_with("RTP/AVP/TCP;")) return {};
   constexpr std::string_view kChannels = "interleaved=";
-  if (text.find(kChannels) == std::string_view::npos) return {Way::kInterleaved, 0, 1};
+  if (text.find(kChannels) == std::string_view::npos) return {Kind::kInterleaved, 0, 1};
   const auto channels = number_pair(text, kChannels);
   if (!channels || channels->first > kMostChannel || channels->second > kMostChannel) return {};
-  return {Way::kInterleaved, channels->first, channels->second};
+  return {Kind::kInterleaved, channels->first, channels->second};
 }
 
 std::size_t body_size(const RequestHead& head) {
@@ -86,7 +86,7 @@ AskedTransport asked_transport(std::string_view transport) {
   while (!transport.empty()) {
     const std::size_t end = std::min(transport.find(','), transport.size());
     const AskedTransport asked = parse_alternative(transport.substr(0, end));
-    if (asked.way != AskedTransport::Way::kNone) return asked;
+    if (asked.kind != AskedTransport::Kind::kNone) return asked;
     transport.remove_prefix(std::min(end + 1, transport.size()));
   }
   return {};

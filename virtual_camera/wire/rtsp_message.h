@@ -15,7 +15,7 @@ namespace vexa::camera {
 // Hosts read an answer in one piece of at most 1023 bytes, some in half of that; so no answer is longer than this.
 constexpr std::size_t kMaxRtspAnswer = 500;
 
-// Bytes of the first request: its head, its body, and empty lines right behind it; 0 when more must come.
+// Bytes of the first request: its head, its body, and empty lines right after it; 0 when more must come.
 [[nodiscard]] std::size_t rtsp_request_size(std::string_view received);
 
 // The CSeq of a request, when it is a plain number.
@@ -24,9 +24,9 @@ constexpr std::size_t kMaxRtspAnswer = 500;
 [[nodiscard]] std::uint32_t session_of(const RequestHead& request);
 // How a host wants its packets: in datagrams, or between the answers on the RTSP connection (RFC 2326, 10.12).
 struct AskedTransport {
-  enum class Way { kNone, kUdp, kInterleaved };
+  enum class Kind { kNone, kUdp, kInterleaved };
 
-  Way way = Way::kNone;
+  Kind kind = Kind::kNone;
   // The client's ports, or the channels; the second is the one after the first unless named.
   std::uint16_t first = 0;
   std::uint16_t second = 0;

@@ -42,7 +42,7 @@ TEST(BoxPins, AreNoneForCountsOfNoneOrLess) {
   }
 }
 
-TEST(DetectorEnabled, IsOnUnlessTheCameraSaysOff) {
+TEST(DetectorEnabled, IsOnUnlessTheCameraReportsOff) {
   const struct {
     const char* answer;
     bool enabled;
@@ -81,7 +81,7 @@ TEST(SensorPins, AreReadInTheAnswersOrder) {
   for (const auto& row : rows) EXPECT_EQ(rows_of(sensor_pins(row.answer)), row.pins) << row.answer;
 }
 
-TEST(StatusPins, BehindTheInputsAreTheDetectorsInTheirOrder) {
+TEST(StatusPins, AfterTheInputsAreTheDetectorsInTheirOrder) {
   SLibDFixedIoBoxInfo fixed = box_of(2, 0);
   fixed.videoDetection = fixed.tamperingDetection = true;
   EXPECT_EQ(rows_of(status_pins({0b1111, 0b1010}, fixed)),
@@ -97,7 +97,7 @@ TEST(StatusPins, FurtherPinsAreAudioOrInputsWithoutIt) {
   EXPECT_EQ(rows_of(status_pins({0b111, 0}, fixed)), (std::vector<PinRow>{{1, 2, 1, 0}, {2, 5, 1, 0}, {3, 5, 1, 0}}));
 }
 
-TEST(StatusPins, TakeTheirTypeByTheOrderInWhichThePartSpeaksOfThem) {
+TEST(StatusPins, TakeTheirTypeByTheirOrderInThePart) {
   SLibDFixedIoBoxInfo fixed = box_of(1, 0);
   fixed.videoDetection = fixed.tamperingDetection = true;
   EXPECT_EQ(rows_of(status_pins({0b1000, 0b1000}, fixed)), (std::vector<PinRow>{{4, 2, 1, 1}}));

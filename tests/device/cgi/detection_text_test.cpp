@@ -192,7 +192,7 @@ TEST(ObjectItems, OfNoFormAreSkipped) {
   }
 }
 
-TEST(ObjectSettings, BeginBehindTheLastPreDefAndItsItem) {
+TEST(ObjectSettings, BeginAfterTheLastPreDefAndItsItem) {
   const struct {
     const char* answer;
     std::vector<int> numbers;

@@ -76,7 +76,7 @@ INSTANTIATE_TEST_SUITE_P(Unknown, DayNight,
                                          DayNightRow{"A=1&DayNightMode=manual&DayNight=ON", -1},
                                          DayNightRow{"A=1&DayNightMode=manual&xDayNight=on", -1}));
 
-TEST(DayNight, IsNothingWithoutItsKey) {
+TEST(DayNight, IsNoneWithoutItsKey) {
   for (const char* answer : {"", "A=1", "DayNightMode=auto", "A=1&DayNight=on", "A=1&DayNightMode"}) {
     EXPECT_FALSE(vexa::day_night_of(answer)) << answer;
   }

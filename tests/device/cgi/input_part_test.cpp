@@ -68,7 +68,7 @@ TEST(InputPart, ASensorsNumberCountsWithoutItsValue) {
               {"Sensor=1&Tampering=1", kOdWindows, 0b10, 0b10}});
 }
 
-TEST(InputPart, PutsMotionBehindTheLastSensor) {
+TEST(InputPart, PutsMotionAfterTheLastSensor) {
   expect_all({{"Sensor1=0&Sensor2=0&VMF=1", kFlag, 0b111, 0b100},
               {"Sensor1=0&Sensor2=0&OdWin1=1", kOdWindows, 0b111, 0b100},
               {"Sensor1=0&Sensor2=0&OdWin1=1&Tampering=1&Audio=1", kOdWindows, 0b11111, 0b11100},
@@ -116,7 +116,7 @@ TEST(InputPart, LooksForTheNextWindowNineCharactersOn) {
   expect_all({{"OdWin2=0&OdWin3=1", kOdWindows, 0b1, 0b1}, {"OdWin2=0OdWin3=1", kOdWindows, 0b1, 0b0}});
 }
 
-TEST(InputPart, LooksForTamperingBehindTheMotionItems) {
+TEST(InputPart, LooksForTamperingAfterTheMotionItems) {
   expect_all({{"Tampering=1&Sensor1=0", kOdWindows, 0b1, 0},
               {"Sensor1=0&Tampering=1&OdWin1=1", kOdWindows, 0b11, 0b10},
               {"Sensor1=0&OdWinTampering=1", kOdWindows, 0b1, 0},
@@ -133,7 +133,7 @@ TEST(InputPart, TamperingMovesAudioUpAlsoWithoutAValue) {
               {"Sensor1=0&Sensor2=0&Audio=", kOdWindows, 0b11, 0}});
 }
 
-TEST(InputPart, LooksForAudioTwelveCharactersBehindTampering) {
+TEST(InputPart, LooksForAudioTwelveCharactersAfterTampering) {
   expect_all({{"Tampering=1&Audio=1", kOdWindows, 0b110, 0b110},
               {"Tampering=&Audio=1", kOdWindows, 0, 0},
               {"TamperingAudio=1", kOdWindows, 0, 0},

@@ -94,7 +94,7 @@ TEST(ViewingAngles, TakeTheFirstNeighboursOfATableThatIsNotSorted) {
   EXPECT_EQ(viewing_angles({{1, 0}, {2, 5}, {4, 5}, {8, 10}}, wide_angles(100, 100), 5)->horizontal, 500000);
 }
 
-TEST(ViewingAngles, AreThoseOfTheLastRatioAtAndAboveItsPositionWhateverStandsBefore) {
+TEST(ViewingAngles, AreThoseOfTheLastRatioAtAndAboveItsPositionWhateverComesBefore) {
   EXPECT_EQ(viewing_angles({{1, 0}, {2, 5}, {4, 5}}, wide_angles(100, 100), 5)->horizontal, 250000);
   EXPECT_EQ(viewing_angles({{1, 0}, {16, 30}, {2, 20}}, wide_angles(100, 100), 25)->horizontal, 500000);
   EXPECT_EQ(viewing_angles({{4, 30}, {1, 10}}, wide_angles(100, 100), 20)->horizontal, 250000)

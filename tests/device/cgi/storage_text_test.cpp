@@ -70,7 +70,7 @@ TEST(Recordings, WithAQualityHaveNoBitRate) {
   EXPECT_EQ(records[0].quality, 7);
 }
 
-TEST(Recordings, KeepTheCamerasOrderWhateverStandsBetweenThem) {
+TEST(Recordings, KeepTheCamerasOrderWhateverIsBetweenThem) {
   for (const std::string between : {"\r\n", ",", ",Extra=1,", "\x01 junk StreamNam", "\n\n"}) {
     const Records records = read_fenced("OK\r\n" + named("b") + between + named("a") + between + named("c"));
     ASSERT_EQ(records.size(), 3u) << between;
@@ -102,7 +102,7 @@ TEST(Recordings, CutAnywhereGiveTheWholeOnesBeforeTheCut) {
   }
 }
 
-TEST(Recordings, CutRightBehindStatusCount) {
+TEST(Recordings, CutRightAfterStatusCount) {
   const Records records = read_fenced(with(9, "Status="));
   ASSERT_EQ(records.size(), 1u);
   EXPECT_EQ(records[0].status, "");

@@ -8,26 +8,26 @@
 
 namespace {
 
-TEST(ValueBehind, RunsToTheNextAmpersandOrTheEnd) {
-  const vexa::PlacedValue inner = vexa::value_behind("A=1&B=22&C=3", 4, 2);
+TEST(ValueAfter, RunsToTheNextAmpersandOrTheEnd) {
+  const vexa::PlacedValue inner = vexa::value_after("A=1&B=22&C=3", 4, 2);
   EXPECT_EQ(inner.text, "22");
   EXPECT_EQ(inner.end, 8u);
-  const vexa::PlacedValue last = vexa::value_behind("A=1&B=22&C=3", 9, 2);
+  const vexa::PlacedValue last = vexa::value_after("A=1&B=22&C=3", 9, 2);
   EXPECT_EQ(last.text, "3");
   EXPECT_EQ(last.end, 12u);
 }
 
-TEST(ValueBehind, IsEmptyBehindAKeyWithoutAValue) {
-  EXPECT_EQ(vexa::value_behind("A=&B=", 0, 2).text, "");
-  EXPECT_EQ(vexa::value_behind("A=&B=", 0, 2).end, 2u);
-  EXPECT_EQ(vexa::value_behind("A=&B=", 3, 2).text, "");
-  EXPECT_EQ(vexa::value_behind("A=&B=", 3, 2).end, 5u);
+TEST(ValueAfter, IsEmptyAfterAKeyWithoutAValue) {
+  EXPECT_EQ(vexa::value_after("A=&B=", 0, 2).text, "");
+  EXPECT_EQ(vexa::value_after("A=&B=", 0, 2).end, 2u);
+  EXPECT_EQ(vexa::value_after("A=&B=", 3, 2).text, "");
+  EXPECT_EQ(vexa::value_after("A=&B=", 3, 2).end, 5u);
 }
 
-TEST(ValueBehind, ReadsNothingOutsideTheAnswer) {
+TEST(ValueAfter, ReadsNothingOutsideTheAnswer) {
   for (const std::size_t at : {std::size_t{0}, std::size_t{1}, std::size_t{3}, std::size_t{4}, std::string::npos}) {
     for (const std::size_t length : {std::size_t{4}, std::size_t{5}, std::string::npos}) {
-      const vexa::PlacedValue value = vexa::value_behind("A=1", at, length);
+      const vexa::PlacedValue value = vexa::value_after("A=1", at, length);
       EXPECT_EQ(value.text, "") << at << " " << length;
       EXPECT_EQ(value.end, 3u) << at << " " << length;
     }

@@ -14,7 +14,7 @@ std::string loaded(const CredentialSources& sources) {
   return result ? result->user + "|" + result->password : "refused: " + result.error().text;
 }
 
-TEST(CredentialSources, NobodyGivesNothing) { EXPECT_EQ(loaded({}), "|"); }
+TEST(CredentialSources, WithoutSourcesThereAreNoCredentials) { EXPECT_EQ(loaded({}), "|"); }
 
 TEST(CredentialSources, OptionsWinOverTheEnvironment) {
   const TemporaryFolder folder;

@@ -25,7 +25,7 @@ TEST(Redactor, KnowsCredentialsOfEveryLengthInBase64) {
 
 TEST(Redactor, EndsOnAPasswordMadeOfItsOwnMark) { EXPECT_EQ(Redactor({"a", "*"})("x*y"), "x***y"); }
 
-TEST(Redactor, HidesAPasswordWhereverItStands) {
+TEST(Redactor, HidesAPasswordWhereverItIs) {
   const Redactor redact({"admin", "pw"});
   const struct {
     const char* text;

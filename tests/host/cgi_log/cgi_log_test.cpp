@@ -64,7 +64,7 @@ TEST(CgiLogLine, MayHaveAnEmptyMessage) {
   EXPECT_EQ(line->message, "");
 }
 
-TEST(CgiLogLine, IsNothingElse) {
+TEST(CgiLogLine, IsNoOtherText) {
   const char* const texts[] = {"",
                                "01-01-2026\t00:00:00.000\tCGI\t",
                                "01-01-2026\t00:00:00.000\tCGI\tTo",
@@ -130,7 +130,7 @@ TEST_F(CgiLog, ARequestThatAnotherFollowsIsUnanswered) {
 
 TEST_F(CgiLog, ARequestAtTheEndIsUnanswered) { EXPECT_THAT(read(to("/a")), testing::ElementsAre("/a>-")); }
 
-TEST_F(CgiLog, AnAnswerWithoutARequestStandsAlone) {
+TEST_F(CgiLog, AnAnswerWithoutARequestIsARowOfItsOwn) {
   EXPECT_THAT(read(from("200 OK") + from("204 No")), testing::ElementsAre("->200 OK", "->204 No"));
   EXPECT_THAT(durations_, testing::Each(std::optional<milliseconds>()));
 }
@@ -140,7 +140,7 @@ TEST_F(CgiLog, AClockPutBackLeavesNoDuration) {
   EXPECT_EQ(durations_.front(), std::nullopt);
 }
 
-TEST_F(CgiLog, AnAnswerBehindABannerBelongsToTheRequestBeforeIt) {
+TEST_F(CgiLog, AnAnswerAfterABannerBelongsToTheRequestBeforeIt) {
   EXPECT_THAT(read(kOpening + to("/a") + kClosing + kOpening + from("200 OK")), testing::ElementsAre("/a>200 OK"));
 }
 
@@ -202,7 +202,7 @@ TEST_F(CgiLog, ASettledLineIsHandedOutBeforeTheNextBegins) {
   EXPECT_THAT(read(to("/b") + from("204 No")), testing::ElementsAre("/a>200 OK", "/b>204 No"));
 }
 
-TEST_F(CgiLog, ABannerBehindASettledLineIsNoLine) {
+TEST_F(CgiLog, ABannerAfterASettledLineIsNoLine) {
   reader_.feed(to("/a"));
   reader_.settle();
   EXPECT_THAT(read(kClosing + kOpening + from("200 OK")), testing::ElementsAre("/a>200 OK"));
@@ -235,7 +235,7 @@ TEST(CgiLogTable, AlignsItsColumns) {
             "2026-03-04 05:06:07.008       -       -  -                                         odd\n");
 }
 
-TEST(CgiLogTable, ARowIsOneLineWhateverTheCameraSays) {
+TEST(CgiLogTable, ARowIsOneLineWhateverTheCameraSends) {
   const std::string row = table_row(exchange("/\xff\xc2", "a\r\nb\x1b[2J\xc2\x9b"), Redactor());
   EXPECT_EQ(row.find('\n'), row.size() - 1);
   EXPECT_TRUE(row.ends_with("  a\\x0d\\x0ab\\x1b[2J\\xc2\x9b\n")) << row;

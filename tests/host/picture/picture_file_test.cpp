@@ -111,7 +111,7 @@ TEST(PictureDecoder, ComesToThePictureOfTheLastFrame) {
   }
 }
 
-TEST(PictureDecoder, TellsWhatIsNoPicture) {
+TEST(PictureDecoder, ReportsWhatIsNoPicture) {
   const FrameBytes noise(1000, 0x5a);
   for (const Codec codec : {Codec::kJpeg, Codec::kMpeg4, Codec::kH264}) {
     for (const auto& frames : {std::vector<FrameBytes>{}, {FrameBytes{}}, {noise}, {noise, FrameBytes{}, noise}}) {
@@ -161,7 +161,7 @@ TEST(StreamParameters, OfACutPictureAreReadOrRefused) {
 
 #else
 
-TEST(PictureDecoder, RefusesWithoutFfmpegAndSaysWhatToDo) {
+TEST(PictureDecoder, RefusesWithoutFfmpegAndReportsWhatToDo) {
   const auto result = decode_picture(Codec::kH264, {});
   ASSERT_FALSE(result);
   EXPECT_EQ(result.error().code, ExitCode::kUsage);

@@ -39,7 +39,7 @@ TEST(FrameFile, ReplacesAFormerFileWithTheFirstPicture) {
   EXPECT_EQ(contents_of(folder / "live"), "a");
 }
 
-TEST(FrameFile, SaysEarlyWhatOpeningWouldSay) {
+TEST(FrameFile, ReportsEarlyWhatOpeningWouldReport) {
   const TemporaryFolder folder;
   const std::string file_as_folder = folder.make_file("file") + "/live";
   EXPECT_EQ(text_of(FrameFile(folder.path()).check()), "cannot write " + folder.path() + ": Is a directory");

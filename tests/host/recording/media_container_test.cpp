@@ -129,7 +129,7 @@ TEST_P(MediaContainerOf, NoTwoPicturesHaveTheSameTime) {
 INSTANTIATE_TEST_SUITE_P(Of, MediaContainerOf, testing::ValuesIn(kContained),
                          [](const auto& tested) { return tested.param.name; });
 
-TEST(MediaContainer, WhatCannotBeWrittenIsTold) {
+TEST(MediaContainer, WhatCannotBeWrittenIsReported) {
   const auto clip = vexa::camera::ImageClip::load(VEXA_CLIPS "/plain.mjpeg");
   ASSERT_TRUE(clip);
   const std::string& picture = clip->pictures()[0];

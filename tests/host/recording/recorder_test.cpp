@@ -21,7 +21,7 @@ struct Answer {
   std::int32_t microseconds = 0;
 };
 
-// A device that answers polls as told, a millisecond each, and then has no frame for ever.
+// A device that answers polls from a list, a millisecond each, and then never has a frame again.
 class ScriptedDevice final : public CLibraryDevice {
  public:
   explicit ScriptedDevice(std::deque<Answer> answers) : answers_(std::move(answers)) {}

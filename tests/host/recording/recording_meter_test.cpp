@@ -64,7 +64,7 @@ TEST(RecordingMeter, PicturesThatStayAwayAtTheEndAreMissingToo) {
   EXPECT_EQ(meter.missing_frames(at(10001)), 225u);
 }
 
-TEST(RecordingMeter, ACameraFasterThanItSaysMissesNothing) {
+TEST(RecordingMeter, ACameraFasterThanItsSettingMissesNoPicture) {
   RecordingMeter meter;
   meter.set_camera_rate(25);
   for (int i = 0; i <= 50; ++i) meter.add(1000, false, at(i * 20));

@@ -32,7 +32,7 @@ TEST(SoundFile, FormatGoesByTheEndOfTheName) {
 
 TEST(SoundFile, RawSoundStaysAsItIs) { EXPECT_EQ(sound_written(SoundFormat::kRaw, "abc", 2), "abcabc"); }
 
-TEST(SoundFile, WaveTellsMuLawAndHowMuchThereIs) {
+TEST(SoundFile, WaveHeaderNamesMuLawAndTheLength) {
   const std::string header =
       std::string("RIFF\x38\0\0\0WAVEfmt \x12\0\0\0\x07\0\x01\0\x40\x1f\0\0\x40\x1f\0\0", 36 - 4) +
       std::string("\x01\0\x08\0\0\0fact\4\0\0\0\6\0\0\0data\6\0\0\0", 26);

@@ -43,7 +43,7 @@ TEST(PtzScale, EveryPositionComesBackFromItsDegrees) {
   }
 }
 
-TEST(PtzScale, RangesAreToldInDegrees) {
+TEST(PtzScale, RangesAreReportedInDegrees) {
   EXPECT_EQ(kFullCircle.range_text(), "-180 to 180");
   EXPECT_EQ(kRaisedTilt.range_text(), "-20 to 85");
 }
@@ -81,7 +81,7 @@ TEST(PtzScale, ALensWithoutATableReachesNoMagnification) {
   EXPECT_EQ(zoom_range_text(Profile()), "not known");
 }
 
-TEST(PtzScale, AStatusIsToldInDegrees) {
+TEST(PtzScale, AStatusIsReportedInDegrees) {
   SLibDPTZStatus status;
   status.panPosition = -12345;
   status.tiltPosition = 90000;

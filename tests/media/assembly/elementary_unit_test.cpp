@@ -16,7 +16,7 @@ std::vector<unsigned char> unit_with(std::initializer_list<unsigned char> code, 
   return unit;
 }
 
-TEST(ElementaryUnit, OfH264IsKnownByTheLowFiveBitsBehindItsStartCode) {
+TEST(ElementaryUnit, OfH264IsKnownByTheLowFiveBitsAfterItsStartCode) {
   for (int byte = 0; byte < 256; ++byte) {
     const int type = byte & 31;
     const UnitKind expected = type == 1 || type == 5 ? UnitKind::kPicture
@@ -27,7 +27,7 @@ TEST(ElementaryUnit, OfH264IsKnownByTheLowFiveBitsBehindItsStartCode) {
   }
 }
 
-TEST(ElementaryUnit, OfMpeg4IsKnownByTheByteBehindItsStartCode) {
+TEST(ElementaryUnit, OfMpeg4IsKnownByTheByteAfterItsStartCode) {
   for (int byte = 0; byte < 256; ++byte) {
     const UnitKind expected = byte == 0xb6   ? UnitKind::kPicture
                               : byte == 0xb2 ? UnitKind::kUserData
@@ -48,7 +48,7 @@ TEST(ElementaryUnit, CutShortIsAnyOther) {
   }
 }
 
-TEST(ElementaryUnit, TextBeginsBehindItsHead) {
+TEST(ElementaryUnit, TextBeginsAfterItsHead) {
   const std::string unit = "0123456789abcdef";
   for (std::size_t length = 0; length <= unit.size(); ++length) {
     const Bytes bytes(reinterpret_cast<const unsigned char*>(unit.data()), length);

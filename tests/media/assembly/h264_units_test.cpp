@@ -51,7 +51,7 @@ TEST(H264Units, RebuildsEachPictureByteForByte) {
   }
 }
 
-TEST(H264Units, EverySingleUnitAndEveryFragmentedOneTellsTheFramesType) {
+TEST(H264Units, EverySingleUnitAndEveryFragmentedOneGivesTheFramesType) {
   for (int type = 0; type < 32; ++type) {
     const std::int32_t expected = type == 1 ? 22 : type == 5 ? 20 : -1;
     const auto unit = static_cast<unsigned char>(0x60 | type);
@@ -127,7 +127,7 @@ struct OpeningCase {
   bool whole_alone;  // for one that does not
 };
 
-TEST(H264Units, TheFirstPacketTellsHowAPictureOpens) {
+TEST(H264Units, TheFirstPacketShowsHowAPictureOpens) {
   const OpeningCase cases[] = {
       {"delimiter", {0x09, 0x10}, 9, true, true},
       {"sequence parameter set", {0x67, 1}, 7, true, true},

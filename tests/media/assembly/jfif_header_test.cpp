@@ -28,7 +28,7 @@ HeaderBytes part_of(const HeaderBytes& bytes, std::size_t from, std::size_t leng
   return {begin, begin + static_cast<std::ptrdiff_t>(length)};
 }
 
-TEST(JfifHeader, StandsByteForByte) {
+TEST(JfifHeader, IsExactByteForByte) {
   const HeaderBytes header = header_of({80, 60, 0});
   ASSERT_EQ(header.size(), kWithoutRestart);
   EXPECT_EQ(part_of(header, 0, 9), (HeaderBytes{0xff, 0xd8, 0xff, 0xdb, 0, 0x43, 0, 16, 11}));
@@ -43,7 +43,7 @@ TEST(JfifHeader, StandsByteForByte) {
   EXPECT_EQ(part_of(header, 591, 14), (HeaderBytes{0xff, 0xda, 0, 0x0c, 3, 0, 0, 1, 0x11, 2, 0x11, 0, 0x3f, 0}));
 }
 
-TEST(JfifHeader, TellsARestartIntervalBetweenTablesAndFrame) {
+TEST(JfifHeader, HasARestartIntervalBetweenTablesAndFrame) {
   for (const std::uint16_t interval : {std::uint16_t{1}, std::uint16_t{0x1234}, std::uint16_t{0xffff}}) {
     const HeaderBytes header = header_of({80, 60, interval});
     ASSERT_EQ(header.size(), kWithoutRestart + 6);
@@ -52,7 +52,7 @@ TEST(JfifHeader, TellsARestartIntervalBetweenTablesAndFrame) {
   }
 }
 
-TEST(JfifHeader, TellsSizesFromZeroTo2040) {
+TEST(JfifHeader, HasSizesFromZeroTo2040) {
   EXPECT_EQ(part_of(header_of({0, 0, 0}), 145, 4), (HeaderBytes{0, 0, 0, 0}));
   EXPECT_EQ(part_of(header_of({1, 2, 0}), 145, 4), (HeaderBytes{0, 16, 0, 8}));
   EXPECT_EQ(part_of(header_of({255, 255, 0}), 145, 4), (HeaderBytes{7, 0xf8, 7, 0xf8}));

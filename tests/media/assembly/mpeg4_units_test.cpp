@@ -21,7 +21,7 @@ TEST(Mpeg4Units, PayloadsAreJoinedAsTheyAre) {
   EXPECT_EQ(frame, (Payload{0, 0, 1, 0xb6, 7, 8, 0, 0, 1}));
 }
 
-TEST(Mpeg4Units, TheFourthByteTellsTheType) {
+TEST(Mpeg4Units, TheFourthByteGivesTheType) {
   for (int code = 0; code < 256; ++code) {
     std::int32_t type = -1;
     if (code == 0x01 || code == 0xb6) type = 11;

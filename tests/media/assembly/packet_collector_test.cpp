@@ -137,7 +137,7 @@ TEST(PacketCollector, ALostPacketCostsItsPictureAndThoseUpToTheNextKeyPicture) {
   EXPECT_EQ(collection.shown(), timestamps_of({key, next_key, after}));
 }
 
-TEST(PacketCollector, AKeyPictureBehindAGapIsHeldBackFor200MillisecondsAndNoLonger) {
+TEST(PacketCollector, AKeyPictureAfterAGapIsHeldBackFor200MillisecondsAndNoLonger) {
   ModelStream stream;
   const ModelPicture key = stream.key_picture(2);
   stream.delta_picture(2);  // never arrives
@@ -151,7 +151,7 @@ TEST(PacketCollector, AKeyPictureBehindAGapIsHeldBackFor200MillisecondsAndNoLong
   EXPECT_EQ(collection.shown(), timestamps_of({key, next_key}));
 }
 
-TEST(PacketCollector, WhatArrivesLateWithinThe200MillisecondsCostsNothing) {
+TEST(PacketCollector, WhatArrivesLateWithinThe200MillisecondsLosesNoPicture) {
   ModelStream stream;
   const ModelPicture key = stream.key_picture(2);
   const ModelPicture late = stream.delta_picture(3);
@@ -165,7 +165,7 @@ TEST(PacketCollector, WhatArrivesLateWithinThe200MillisecondsCostsNothing) {
   EXPECT_EQ(collection.shown(), timestamps_of({key, late, next_key}));
 }
 
-TEST(PacketCollector, ACompletePictureBehindAGapWaitsForWhatIsMissing) {
+TEST(PacketCollector, ACompletePictureAfterAGapWaitsForWhatIsMissing) {
   ModelStream stream;
   const ModelPicture key = stream.key_picture(2);
   const ModelPicture late = stream.delta_picture(1);
@@ -287,7 +287,7 @@ struct BareKeyBehindAGap {
   ModelPicture bare = source.bare_key_picture();
 };
 
-TEST(PacketCollector, ALatePacketProvesTheFrontOfAKeyPictureThatStandsBehindIt) {
+TEST(PacketCollector, ALatePacketProvesTheFrontOfTheKeyPictureThatFollowsIt) {
   BareKeyBehindAGap stream;
   Collection collection;
   collection.arrive(stream.key);
@@ -526,7 +526,7 @@ TEST(PacketCollector, APacketThatPartsARunOfEqualPlacesCountsAsTwoPicturesMore) 
 struct Channel {
   const char* name;
   double loss = 0;
-  double reorder = 0;  // held back behind up to 20 packets
+  double reorder = 0;  // held back after up to 20 packets
   double duplicate = 0;
 };
 
@@ -543,7 +543,7 @@ class PacketCollectorModel : public testing::TestWithParam<ChannelCase> {
     double place;
   };
 
-  /// The packets as they arrive; `whole[i]` tells whether all of picture i do.
+  /// The packets as they arrive; `whole[i]`: whether all of picture i do.
   std::vector<Sent> through(const std::vector<ModelPicture>& pictures, std::vector<bool>& whole) {
     const Channel& channel = GetParam().channel;
     std::uniform_real_distribution<double> chance(0, 1);
@@ -579,7 +579,7 @@ class PacketCollectorModel : public testing::TestWithParam<ChannelCase> {
   std::mt19937 random_{20260101};
 };
 
-TEST_P(PacketCollectorModel, EveryWholePictureBehindAKeyPictureIsHandedOutOnceAndInOrder) {
+TEST_P(PacketCollectorModel, EveryWholePictureAfterAKeyPictureIsHandedOutOnceAndInOrder) {
   ModelStream stream(GetParam().start);
   const std::vector<ModelPicture> pictures = stream.pictures(5000, 25, random_);
   std::vector<bool> whole(pictures.size(), true);

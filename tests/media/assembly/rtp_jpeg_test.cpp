@@ -60,7 +60,7 @@ TEST(RtpJpeg, TypesFrom64To127CarryARestartInterval) {
   }
 }
 
-TEST(RtpJpeg, ARestartIntervalOfZeroIsNotTold) {
+TEST(RtpJpeg, ARestartIntervalOfZeroIsLeftOut) {
   const auto jfif = begun(payload_of_first({.type = 64, .rest = {0, 0, 0xff, 0xff, 7}}));
   ASSERT_TRUE(jfif);
   EXPECT_EQ(scan_of(*jfif, kJfif), Payload{7});
@@ -94,7 +94,7 @@ TEST(RtpJpeg, QualityFrom128OnTakesTheTablesInBand) {
   }
 }
 
-TEST(RtpJpeg, TablesInBandStandBehindTheRestartHeader) {
+TEST(RtpJpeg, TablesInBandFollowTheRestartHeader) {
   const auto jfif = begun(
       payload_of_first({.type = 65, .q = 255, .rest = joined(joined({0, 9, 0xff, 0xff}, tables_of_length(128)), {7})}));
   ASSERT_TRUE(jfif);
@@ -156,7 +156,7 @@ TEST(RtpJpeg, AHeaderCutAnywhereIsRefused) {
   }
 }
 
-TEST(RtpJpeg, UserDataOf168BytesStandsBeforeTheHeader) {
+TEST(RtpJpeg, UserDataOf168BytesComesBeforeTheHeader) {
   Payload block(168, 'x');
   block[0] = 0xff;
   block[1] = 0xd8;
@@ -170,7 +170,7 @@ TEST(RtpJpeg, UserDataOf168BytesStandsBeforeTheHeader) {
   }
 }
 
-TEST(RtpJpeg, UserDataIsToldByItsFirstTwoBytes) {
+TEST(RtpJpeg, UserDataIsRecognisedByItsFirstTwoBytes) {
   EXPECT_FALSE(leads_with_user_data(Payload{}));
   EXPECT_FALSE(leads_with_user_data(Payload{0xff}));
   EXPECT_FALSE(leads_with_user_data(Payload{0xff, 0xd9}));
@@ -192,7 +192,7 @@ AssembledPicture assembled_jpeg(const std::vector<Payload>& others, Payload& fra
   return picture;
 }
 
-TEST(RtpJpeg, FurtherPacketsAddWhatStandsBehindTheirHeader) {
+TEST(RtpJpeg, FurtherPacketsAddWhatFollowsTheirHeader) {
   struct {
     const char* what;
     Payload payload;

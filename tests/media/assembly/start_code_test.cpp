@@ -99,7 +99,7 @@ TEST(StartCode, IsTheFirstOfRandomBytesFullOfZeros) {
   }
 }
 
-TEST(StartCode, SearchReadsNothingBehindTheData) {
+TEST(StartCode, SearchReadsNothingAfterTheData) {
   for (std::size_t length = 0; length <= 80; ++length) {
     for (const int filler : {0, 1, 255}) {
       const vexa_test::FencedBytes data(CodeData(length, static_cast<unsigned char>(filler)));
@@ -120,7 +120,7 @@ TEST(StartCode, OfMoreZerosTheLastBelongToIt) {
   EXPECT_EQ(find_start_code_h264(kLong, sizeof kLong), kLong + 2);
 }
 
-TEST(StartCode, IsNoneInNothing) {
+TEST(StartCode, IsNoneInNoData) {
   EXPECT_EQ(find_start_code_h264(nullptr, 0), nullptr);
   EXPECT_EQ(find_start_code_mpeg4(nullptr, 0), nullptr);
 }

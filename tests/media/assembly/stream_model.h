@@ -41,7 +41,7 @@ class ModelStream {
     return finish(picture);
   }
 
-  /// Two IDR slices, a packet each, neither of which tells by itself that it is the picture's first.
+  /// Two IDR slices, a packet each, neither of which shows by itself that it is the picture's first.
   ModelPicture bare_key_picture() {
     ModelPicture picture{true, {}};
     for (int i = 0; i < 2; ++i) picture.packets.push_back(packet({0x65, 0x08}));

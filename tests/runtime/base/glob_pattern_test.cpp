@@ -79,7 +79,7 @@ TEST(GlobPattern, HyphenAtTheEdgesOfASetIsListed) {
   expect_all({{"[a-]", {"-", "a"}, {"b"}}, {"[-a]", {"-", "a"}, {}}, {"[-]", {"-"}, {}}, {"[!-]", {"a"}, {"-"}}});
 }
 
-TEST(GlobPattern, ClosingBracketRightBehindTheOpeningIsListed) {
+TEST(GlobPattern, ClosingBracketRightAfterTheOpeningIsListed) {
   expect_all(
       {{"[]]", {"]"}, {"a"}}, {"[]a]", {"a"}, {}}, {"[]-_]", {"^"}, {}}, {"[!]]", {"a"}, {"]"}}, {"[!]a]", {}, {"a"}}});
 }

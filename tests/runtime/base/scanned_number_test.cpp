@@ -75,7 +75,7 @@ INSTANTIATE_TEST_SUITE_P(Texts, NumberPair,
 
 class NoNumberPair : public testing::TestWithParam<const char*> {};
 
-TEST_P(NoNumberPair, IsNothing) { EXPECT_FALSE(vexa::leading_pair(GetParam())) << GetParam(); }
+TEST_P(NoNumberPair, IsNone) { EXPECT_FALSE(vexa::leading_pair(GetParam())) << GetParam(); }
 
 INSTANTIATE_TEST_SUITE_P(Texts, NoNumberPair,
                          testing::Values("", ",", "1280", "1280,", ",720", "1280 ,720", "1280x720", "1280;720", "a,b",

@@ -15,7 +15,7 @@ TEST(TextAfter, GivesWhatFollowsTheFirstKey) {
   EXPECT_EQ(text_after("abc", ""), "abc");
 }
 
-TEST(TextBefore, GivesWhatStandsBeforeTheFirstMark) {
+TEST(TextBefore, GivesWhatComesBeforeTheFirstMark) {
   EXPECT_EQ(text_before("a&b&c", '&'), "a");
   EXPECT_EQ(text_before("&b", '&'), "");
   EXPECT_EQ(text_before("abc", '&'), "abc");
@@ -76,7 +76,7 @@ TEST(Masked, HidesEachPlaceOfASecret) {
   for (const auto& c : cases) EXPECT_EQ(masked(c.text, c.secret), c.shown) << c.text << " " << c.secret;
 }
 
-TEST(FormatWithin, KeepsWhatFitsAndSaysWhetherItWasCut) {
+TEST(FormatWithin, KeepsWhatFitsAndReportsWhetherItWasCut) {
   const Formatted fitting = format_within(4, "%s", "abc");
   EXPECT_EQ(fitting.text, "abc");
   EXPECT_FALSE(fitting.cut);

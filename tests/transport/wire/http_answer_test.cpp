@@ -30,7 +30,7 @@ TEST(HeaderLength, CountsUpToTheFirstBlankLine) {
 
 TEST(HeaderLength, LooksForCarriageReturnsFirst) { EXPECT_EQ(header_length("a\n\nb\r\n\r\nc"), 8U); }
 
-TEST(HeaderLength, EndsItsLookAtANul) {
+TEST(HeaderLength, EndsItsSearchAtANul) {
   EXPECT_EQ(header_length(std::string_view("HTTP\0\r\n\r\n", 9)), 0U);
   EXPECT_EQ(header_length(std::string_view("a\r\n\r\n\0b", 7)), 5U);
 }
@@ -79,7 +79,7 @@ TEST(ParseStatusLine, EndsTheReasonAtACaret) {
   EXPECT_EQ(parse_status_line("HTTP/1.0 404 Not^Found\r\n", "HTTP/")->reason, "Not");
 }
 
-TEST(ParseStatusLine, ReadsNothingBehindANul) {
+TEST(ParseStatusLine, ReadsNothingAfterANul) {
   EXPECT_FALSE(parse_status_line(std::string_view("HTTP/1.0 200\0 OK", 16), "HTTP/"));
   EXPECT_EQ(parse_status_line(std::string_view("HTTP/1.0 200 O\0K", 16), "HTTP/")->reason, "O");
 }
@@ -92,7 +92,7 @@ TEST(ParseStatusLine, KeepsALongReasonTo1023Characters) {
   }
 }
 
-TEST(ParseStatusLine, ReadsRtspTheSameWay) {
+TEST(ParseStatusLine, ReadsRtspAlike) {
   EXPECT_EQ(parse_status_line("RTSP/1.0 454 Session Not Found\r\n", "RTSP/")->status, 454);
   EXPECT_FALSE(parse_status_line("HTTP/1.0 200 OK", "RTSP/"));
 }
@@ -135,7 +135,7 @@ TEST(CgiValue, GoesUpToTheNextPairOrTheEnd) {
   for (const auto& c : cases) EXPECT_EQ(cgi_value(c.answer, c.key), c.value) << c.answer << " " << c.key;
 }
 
-TEST(CgiValue, IsNothingWithoutTheKey) {
+TEST(CgiValue, IsNoneWithoutTheKey) {
   for (const char* answer : {"", "B=1", "a=1", "A", "&&&&"}) EXPECT_EQ(cgi_value(answer, "A="), std::nullopt) << answer;
 }
 
@@ -156,7 +156,7 @@ TEST(CgiValue, IsEveryPrefixOfACutAnswer) {
   }
 }
 
-TEST(AnnouncedLength, IsTheNumberBehindItsKey) {
+TEST(AnnouncedLength, IsTheNumberAfterItsKey) {
   const struct {
     const char* header;
     std::optional<int> length;

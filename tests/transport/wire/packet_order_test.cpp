@@ -57,7 +57,7 @@ TEST(PacketOrder, AnyOtherSequenceDifferencePutsThePacketBefore) {
 
 TEST(PacketOrder, EqualPacketsAreNotOrdered) { EXPECT_FALSE(ordered_before(packet(20000000, 3), packet(20000000, 3))); }
 
-TEST(PacketOrder, AKeyOnlySearchKeyStandsAfterEveryPacketOfItsTimestamp) {
+TEST(PacketOrder, AKeyOnlySearchKeyComesAfterEveryPacketOfItsTimestamp) {
   SPacketInfo key = packet(20000000, 0);
   key.keyOnly = true;
   for (const int number : {0, 1, 32767, 65535}) {
@@ -83,7 +83,7 @@ TEST(PacketOrder, ShuffledPacketsFindTheirPlaces) {
   for (std::size_t i = 0; i < list.size(); ++i) EXPECT_EQ(list[i].sequence, wanted[i].sequence) << i;
 }
 
-TEST(PacketOrder, ANewPacketStandsBehindItsEqual) {
+TEST(PacketOrder, ANewPacketComesAfterItsEqual) {
   std::vector<SPacketInfo> list = {packet(20000000, 1), packet(20000000, 2), packet(20000000, 3)};
   EXPECT_EQ(place_of(list, packet(20000000, 2)) - list.begin(), 2);
   EXPECT_EQ(place_of(list, packet(20000000, 3)) - list.begin(), 3);

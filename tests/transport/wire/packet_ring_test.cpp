@@ -16,7 +16,7 @@ SPacketInfo numbered(std::uint32_t number) {
   return info;
 }
 
-TEST(PacketRing, DatagramsLieOneBehindTheOther) {
+TEST(PacketRing, DatagramsLieOneAfterTheOther) {
   PacketRing ring;
   std::vector<PacketRing::Slot> overwritten;
   EXPECT_EQ(ring.next_offset(), 0u);

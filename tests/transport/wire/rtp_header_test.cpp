@@ -35,7 +35,7 @@ TEST(RtpHeader, TakesNoNoticeOfVersionPaddingExtensionAndSources) {
   }
 }
 
-TEST(Interleaved, TellsThePacketsLengthWhateverTheChannel) {
+TEST(Interleaved, ReportsThePacketsLengthWhateverTheChannel) {
   using Prefix = std::vector<unsigned char>;
   EXPECT_EQ(interleaved_length(Prefix{'$', 0, 0x01, 0x02}), 0x0102);
   EXPECT_EQ(interleaved_length(Prefix{'$', 1, 0xff, 0xff}), 65535);
@@ -45,7 +45,7 @@ TEST(Interleaved, TellsThePacketsLengthWhateverTheChannel) {
   EXPECT_EQ(interleaved_length(Prefix{}), std::nullopt);
 }
 
-TEST(Interleaved, TellsVersionAndSourcesFromTheFirstByte) {
+TEST(Interleaved, ReportsVersionAndSourcesFromTheFirstByte) {
   const struct {
     std::uint8_t first;
     int version;
@@ -57,7 +57,7 @@ TEST(Interleaved, TellsVersionAndSourcesFromTheFirstByte) {
   }
 }
 
-TEST(Interleaved, LeavesThePayloadBehindHeaderAndSources) {
+TEST(Interleaved, LeavesThePayloadAfterHeaderAndSources) {
   const struct {
     std::uint16_t length;
     std::size_t csrc_bytes;

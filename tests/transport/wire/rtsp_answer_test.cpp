@@ -14,7 +14,7 @@ constexpr std::string_view kDescription =
     "RTSP/1.0 200 OK\r\nCSeq: 1\r\nContent-Type: application/sdp\r\n\r\n"
     "v=0\r\na=range:clock=20240131T235959.250Z-\r\nm=video 0 RTP/AVP 96\r\na=rtpmap:96 H264/90000\r\n\r\n";
 
-TEST(RtpClock, IsTheNumberBehindTheFirstSlash) {
+TEST(RtpClock, IsTheNumberAfterTheFirstSlash) {
   const struct {
     std::string_view answer;
     int rate;
@@ -29,7 +29,7 @@ TEST(RtpClock, IsTheNumberBehindTheFirstSlash) {
   }
 }
 
-TEST(RtpClock, SaysWhatIsMissing) {
+TEST(RtpClock, ReportsWhatIsMissing) {
   const struct {
     std::string_view answer;
     Found found;
@@ -73,14 +73,14 @@ TEST(SessionNumber, IsASignedDecimal) {
   for (const auto& c : cases) EXPECT_EQ(session_number(c.answer), c.number) << c.answer;
 }
 
-TEST(SessionNumber, IsNothingForOtherIdentifiers) {
+TEST(SessionNumber, IsNoneForOtherIdentifiers) {
   for (const char* answer : {"", "Session", "Session:", "Session: ", "Session: ABCDEF", "Session: ;1", "session: 1",
                              "Session: ABC\r\nSession: 1"}) {
     EXPECT_EQ(session_number(answer), std::nullopt) << answer;
   }
 }
 
-TEST(RtspHeaderComplete, LooksFromFourBytesBeforeTheLatestLook) {
+TEST(RtspHeaderComplete, SearchesFromFourBytesBeforeTheLatestPeek) {
   const struct {
     std::string_view looked_at;
     std::size_t latest;
@@ -154,7 +154,7 @@ TEST(ParseRangeClock, TakesALongerFractionAsItIs) {
   EXPECT_EQ(parse_range_clock("20240131T235959.99999999999Z").micros, INT_MAX);
 }
 
-TEST(ParseRangeClock, WithoutAFractionTellsNoSecondsAndTakesTheTimeForIt) {
+TEST(ParseRangeClock, WithoutAFractionGivesNoSecondsAndTakesTheTimeForIt) {
   const RangeClock clock = parse_range_clock("20240131T235959Z");
   EXPECT_TRUE(clock.understood);
   EXPECT_EQ(clock.seconds, std::nullopt);

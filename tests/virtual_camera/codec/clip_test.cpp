@@ -20,7 +20,7 @@ Buffer file_bytes(const std::string& path) {
   return {text.begin(), text.end()};
 }
 
-// Joins NAL units given by their bytes, each behind a start code of its own length.
+// Joins NAL units given by their bytes, each after a start code of its own length.
 Buffer stream_of(const std::vector<std::pair<int, Buffer>>& units) {
   Buffer stream;
   for (const auto& [zeros, unit] : units) {
@@ -40,7 +40,7 @@ const Buffer kIdrNext{0x65, 0x40};  // a later slice of the same picture
 const Buffer kDelta{0x41, 0x9A};
 const Buffer kDeltaNext{0x41, 0x5A};
 
-TEST(Clip, AccessUnitsBeginWhereH264SaysTheyDo) {
+TEST(Clip, AccessUnitsBeginWhereH264DefinesIt) {
   const struct {
     const char* name;
     std::vector<Buffer> units;
@@ -63,7 +63,7 @@ TEST(Clip, AccessUnitsBeginWhereH264SaysTheyDo) {
   }
 }
 
-TEST(Clip, AccessUnitsKeepTheFilesBytesAndAreDeliveredBehindFourByteCodes) {
+TEST(Clip, AccessUnitsKeepTheFilesBytesAndAreDeliveredAfterFourByteCodes) {
   const Buffer stream = stream_of({{3, kSps}, {2, kPps}, {2, kIdr}, {2, kDelta}});
   const Clip clip = Clip::from_annex_b(stream);
   ASSERT_EQ(clip.access_units().size(), 2U);
@@ -74,7 +74,7 @@ TEST(Clip, AccessUnitsKeepTheFilesBytesAndAreDeliveredBehindFourByteCodes) {
   EXPECT_FALSE(clip.access_units()[1].key);
 }
 
-TEST(Clip, ZerosBehindANalUnitAreNotPartOfIt) {
+TEST(Clip, ZerosAfterANalUnitAreNotPartOfIt) {
   const Clip clip = Clip::from_annex_b(stream_of({{3, {0x65, 0x88, 0, 0, 0}}, {3, kDelta}}));
   ASSERT_EQ(clip.access_units().size(), 2U);
   EXPECT_EQ(clip.access_units()[0].units[0].size, 2U);

@@ -27,7 +27,7 @@ TEST(ImageClip, LeavesOutAJpegPictureThatIsCut) {
 
 std::string unit(char code, const std::string& rest) { return std::string("\0\0\1", 3) + code + rest; }
 
-TEST(ImageClip, CutsMpeg4PicturesBehindTheCodedPicture) {
+TEST(ImageClip, CutsMpeg4PicturesAfterTheCodedPicture) {
   const std::string key = unit('\xb0', "sequence") + unit('\xb2', "user data") + unit('\xb6', "picture");
   const std::string delta = unit('\xb6', "next");
   EXPECT_EQ(cut_mpeg4("front" + key + delta + key), (std::vector<std::string>{key, delta, key}));

@@ -74,7 +74,7 @@ TEST(PacketiseJpeg, PutsTheTablesIntoTheFirstPacketAlone) {
   EXPECT_EQ(jpeg_payload(packets, 2).size(), 8U + 148U);
 }
 
-TEST(PacketiseJpeg, TellsTheRestartIntervalInEveryPacket) {
+TEST(PacketiseJpeg, ReportsTheRestartIntervalInEveryPacket) {
   const PacketisedPicture packets = packetise_jpeg(drawn(0x0102, 300), {}, 250);
   ASSERT_EQ(packets.packets(), 2U);
   for (std::size_t i = 0; i < 2; ++i) {

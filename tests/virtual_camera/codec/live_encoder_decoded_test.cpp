@@ -53,7 +53,7 @@ std::vector<EncodedPicture> encode_all(const LiveEncoding& encoding, int picture
   return all;
 }
 
-// What ffmpeg makes of all access units in a row: planes, picture behind picture. Empty when anything displeased it.
+// What ffmpeg makes of all access units in a row: planes, picture after picture. Empty when ffmpeg complained.
 std::string decode_planes(const std::vector<EncodedPicture>& pictures, const std::string& format) {
   const vexa_test::TemporaryFolder folder;
   std::string bytes;

@@ -11,7 +11,7 @@ std::string refusal_of(const LiveEncoding& encoding) {
   return text != nullptr ? *text : "";
 }
 
-TEST(LiveEncoder, OpensWhereTheBuildHasEncodersAndElseSaysWhyNot) {
+TEST(LiveEncoder, OpensWhereTheBuildHasEncodersAndElseReportsWhyNot) {
   for (const Codec codec : {Codec::kJpeg, Codec::kMpeg4, Codec::kH264}) {
     EXPECT_EQ(refusal_of({codec, 320, 192}), has_live_encoders() ? "" : "this build is without FFmpeg's libraries");
   }

@@ -109,7 +109,7 @@ TEST(RtpPacketiser, ATextOfMpeg4LeavesThePicturesKindAtItsFront) {
   EXPECT_EQ(payload_text(*packetise(Codec::kMpeg4, delta, "", 1400), 0), delta);
 }
 
-TEST(RtpPacketiser, WhatRtpCannotCarryIsNothing) {
+TEST(RtpPacketiser, WhatRtpCannotCarryIsRefused) {
   EXPECT_FALSE(packetise(Codec::kH264, "no unit", "", 1400));
   EXPECT_FALSE(packetise(Codec::kJpeg, "no picture", "", 1400));
 }

@@ -51,7 +51,7 @@ TEST(CameraProfile, NamesFileAndKeyOfWhatItCannotRead) {
       {"\"model\"", "\"driver\"", "p.json:2: driver: occurs twice"},
       {"\"outputs\": 0", "\"inputs\": 1", "p.json:7: inputs: occurs twice"},
       {"\"inputs\": 1", "\"inputs\": 17", "p.json:7: io.inputs: must be from 0 to 16"},
-      {"\"inputs\": 1", "\"inputs\": 18446744073709551615", "p.json:7: io.inputs: must be from 0 to 16"},
+      {"\"inputs\": 1", "\"inputs\": 18446744073709551615", "p.json:7: too large"},
       {"\"inputs\": 1", "\"inputs\": true", "p.json:7: io.inputs: must be a whole number"},
       {"\"inputs\": 1", "\"inputs\": 1.0", "p.json:7: io.inputs: must be a whole number"},
       {"\"inputs\": 1, \"outputs\": 0", "\"inputs\": 1,\n \"outputs\": 0,\n \"audioDetection\":\n 1",
@@ -72,7 +72,8 @@ TEST(CameraProfile, NamesFileAndKeyOfWhatItCannotRead) {
        "p.json:2: cameraTypes: must name \"ptz\" exactly when the profile has a part \"ptz\""},
       {"\"io\": {", "\"io\": [", "p.json:7: not JSON: something is missing, too many or misspelt here"}};
   for (const auto& c : cases) EXPECT_EQ(mistake_in(c.from, c.to), c.error);
-  EXPECT_EQ(std::get<std::string>(load_camera_profile("/nowhere.json")), "/nowhere.json: cannot be read, or is empty");
+  EXPECT_EQ(std::get<std::string>(load_camera_profile("/nowhere.json")),
+            "/nowhere.json: cannot be read: No such file or directory");
   EXPECT_EQ(std::get<std::string>(parse_camera_profile("[]", "p.json")), "p.json:1: must be an object");
   const std::string deep(17, '[');
   EXPECT_EQ(std::get<std::string>(parse_camera_profile(deep + std::string(17, ']'), "p.json")),
@@ -88,6 +89,13 @@ TEST(CameraProfile, ReadsEveryProfileThatIsShipped) {
     ++read;
   }
   EXPECT_GE(read, 5U);
+}
+
+TEST(CameraProfile, IsFoundByTheNameOfAnInstalledProfile) {
+  const auto named = load_camera_profile("LMX-P200");
+  ASSERT_TRUE(std::holds_alternative<CameraProfile>(named)) << std::get<std::string>(named);
+  EXPECT_EQ(std::get<CameraProfile>(named).model, "LMX-P200");
+  EXPECT_TRUE(std::holds_alternative<std::string>(load_camera_profile("no-such-model")));
 }
 
 SettingsStore& of_model(SettingsStore& settings, const std::string& model) {

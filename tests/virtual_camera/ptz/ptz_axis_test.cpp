@@ -13,7 +13,7 @@ namespace {
 // 10 units a second after one second, and 5 units on the way there.
 constexpr PtzAxis::Mechanics kPlain = {-100, 100, 10, 10};
 
-TEST(PtzAxis, SpeedsUpRunsAndBrakesOnItsWay) {
+TEST(PtzAxis, SpeedsUpRunsAndBrakes) {
   PtzAxis axis(kPlain, 0);
   axis.go_to(0, 40, 1);
   EXPECT_DOUBLE_EQ(axis.position(0), 0);
@@ -36,7 +36,7 @@ TEST(PtzAxis, AShortWayNeverReachesFullSpeed) {
   EXPECT_DOUBLE_EQ(axis.position(7), -2.5);
 }
 
-TEST(PtzAxis, AStoppedRunStandsWhereItHasBraked) {
+TEST(PtzAxis, AStoppedRunRestsWhereItHasBraked) {
   PtzAxis axis(kPlain, 0);
   axis.run(0, -0.5);
   EXPECT_DOUBLE_EQ(axis.position(2.5), -11.25);
@@ -46,7 +46,7 @@ TEST(PtzAxis, AStoppedRunStandsWhereItHasBraked) {
   EXPECT_DOUBLE_EQ(axis.rests_from(), 3);
 }
 
-TEST(PtzAxis, ARunEndsAtTheEndOfTheWay) {
+TEST(PtzAxis, ARunEndsAtTheEndOfTheRange) {
   PtzAxis axis(kPlain, 0);
   axis.run(0, 1);
   EXPECT_DOUBLE_EQ(axis.rests_from(), 11);
@@ -65,7 +65,7 @@ TEST(PtzAxis, TurnsRoundByBrakingFirst) {
   EXPECT_NEAR(axis.rests_from(), 3 + 2 * std::sqrt(0.5), 1e-9);
 }
 
-TEST(PtzAxis, SlowsDownToALowerSpeedOnItsWay) {
+TEST(PtzAxis, SlowsDownToALowerSpeedWhileItRuns) {
   PtzAxis axis(kPlain, 0);
   axis.run(0, 1);
   axis.go_to(2, 90, 0.5);

@@ -14,7 +14,7 @@ namespace {
 constexpr PtzPicture kUpright = {{640, 480}, false};
 constexpr PtzPicture kTurned = {{640, 480}, true};
 
-// "pan>-12.5%" runs, "zoom=4000" goes there; what is not told is not written.
+// "pan>-12.5%" runs, "zoom=4000" goes there; what is not ordered is not written.
 std::string told(const std::string& key, const std::string& value, const PtzPicture& picture = kUpright,
                  const PtzProfile& profile = dome()) {
   const std::optional<PtzOrder> order = ptz_order(key, value, profile, picture);

@@ -1,4 +1,4 @@
-// A moving head on a clock that the test sets: what it tells of itself, presets, tours.
+// A moving head on a clock that the test sets: its reports, presets, tours.
 #include "virtual_camera/ptz/ptz_head.h"
 #include "virtual_camera/wire/message.h"
 
@@ -49,7 +49,7 @@ class PtzHeadTest : public testing::Test {
   PtzHead head_{dome(), start_, 1};
 };
 
-TEST_F(PtzHeadTest, TellsWhereItLooks) {
+TEST_F(PtzHeadTest, ReportsItsDirection) {
   EXPECT_EQ(head_.pose(false, at(0)).user_data, "CamPos: 111000000000000S");
   ASSERT_TRUE(move(0, "AbsolutePanTilt=FC18,0640,20"));
   ASSERT_TRUE(move(0, "AbsoluteZoom=0FA0"));
@@ -61,7 +61,7 @@ TEST_F(PtzHeadTest, TellsWhereItLooks) {
   EXPECT_DOUBLE_EQ(pose.horizontal_angle, 29);
 }
 
-TEST_F(PtzHeadTest, TellsThePositionNegatedInATurnedPicture) {
+TEST_F(PtzHeadTest, ReportsThePositionNegatedInATurnedPicture) {
   ASSERT_TRUE(move(0, "AbsolutePanTilt=FC18,0640,20"));
   EXPECT_EQ(head_.pose(true, at(60)).user_data, "CamPos: 11103E8F9C00000S");
   EXPECT_DOUBLE_EQ(head_.pose(true, at(60)).pan, -6.25) << "the motors have not moved";
@@ -166,7 +166,7 @@ TEST_F(PtzHeadTest, ATourSkipsPresetsThatAreNotSet) {
   EXPECT_EQ(pan(128), -1000);
 }
 
-TEST_F(PtzHeadTest, ATourWithoutAPresetThatIsSetStands) {
+TEST_F(PtzHeadTest, ATourWithoutAPresetThatIsSetRests) {
   ASSERT_TRUE(presets(0, "Tour=on&TourA=on&TourASequence=1,2"));
   EXPECT_EQ(head_.pose(false, at(1e6)).user_data, "CamPos: 111000000000000S");
 }
@@ -365,7 +365,7 @@ TEST_F(PtzHeadTest, SwitchingOffNamesFourShadowToursHoweverManyThereAre) {
   EXPECT_TRUE(presets(0, "STour=off&STourA=off&STourB=off&STourC=off&STourD=off"));
 }
 
-TEST_F(PtzHeadTest, AShadowTourWithoutARecordingStands) {
+TEST_F(PtzHeadTest, AShadowTourWithoutARecordingRests) {
   ASSERT_TRUE(presets(0, "STour=on&STourA=on&STourB=off"));
   EXPECT_EQ(head_.pose(false, at(1e6)).user_data, "CamPos: 111000000000000S");
 }

@@ -38,7 +38,7 @@ TEST(PtzMechanism, BeginsAtTheHorizonOrTheEndNearestToIt) {
   EXPECT_EQ(PtzMechanism(profile).place(0)[1], -2400);
 }
 
-TEST(PtzMechanism, TellsItsPlaceInDegrees) {
+TEST(PtzMechanism, ReportsItsPlaceInDegrees) {
   PtzMechanism mechanism(dome());
   mechanism.obey(order_to({14400, -1600, 4000, 5000}, 20, dome()), 0);
   EXPECT_TRUE(mechanism.looks_elsewhere(1));
@@ -48,7 +48,7 @@ TEST(PtzMechanism, TellsItsPlaceInDegrees) {
   EXPECT_EQ(mechanism.place(kLongAfter), (PtzPlace{14400, -1600, 4000, 5000}));
 }
 
-TEST(PtzMechanism, GoesAtTheSpeedThatItIsTold) {
+TEST(PtzMechanism, GoesAtTheGivenSpeed) {
   PtzMechanism mechanism(dome());
   mechanism.obey(order_to({28800, 0, 0, 32768}, 12, dome()), 0);
   // 5760 units a second at speed 24: half of that here, with half a second to reach it and to brake.
@@ -57,7 +57,7 @@ TEST(PtzMechanism, GoesAtTheSpeedThatItIsTold) {
   EXPECT_EQ(mechanism.place(1.5)[0], 3600);
 }
 
-TEST(PtzMechanism, FocusAloneDoesNotLookElsewhere) {
+TEST(PtzMechanism, FocusAloneDoesNotTurnTheCamera) {
   PtzMechanism mechanism(dome());
   PtzOrder order;
   order[PtzMotor::kFocus] = MotorOrder{MotorOrder::Kind::kRun, 1, 0};
@@ -86,7 +86,7 @@ TEST(PtzMechanism, AnAreaCountsInThePictureAsItIsZoomed) {
   EXPECT_EQ(mechanism.place(kLongAfter)[0], 464);
 }
 
-TEST(PtzMechanism, ZoomsByAShareOfItsWay) {
+TEST(PtzMechanism, ZoomsByAShareOfItsRange) {
   PtzOrder order;
   order.zoom_by = 0.25;
   PtzMechanism mechanism(dome());
@@ -98,7 +98,7 @@ TEST(PtzMechanism, ZoomsByAShareOfItsWay) {
   EXPECT_EQ(mechanism.place(kLongAfter)[2], 0);
 }
 
-TEST(PtzMechanism, AModelThatCountsBackwardsTurnsTheSameWay) {
+TEST(PtzMechanism, AModelThatCountsBackwardsTurnsInTheSameDirection) {
   PtzProfile profile = dome();
   profile.pan.span = -115200;
   profile.pan.origin = 28800;

@@ -44,7 +44,7 @@ TEST(RtpStream, HeadersHoldVersionTypeSequenceTimestampAndSource) {
   for (std::size_t i = 8; i < 12; ++i) EXPECT_EQ(first[i], second[i]);
 }
 
-TEST(RtpStream, MarkerStandsOnTheLastPacketOfEachPicture) {
+TEST(RtpStream, MarkerIsOnTheLastPacketOfEachPicture) {
   CameraOptions options = stream_options();
   RtpStream stream(options, {}, 7, 1);
   std::vector<bool> markers;
@@ -137,7 +137,7 @@ TEST(RtpStream, APictureTakesATextAndOneWithoutIsTheClipsOwn) {
 }
 
 TEST(RtpStream, TimestampsFollowTheStampsOfASourceThatRunsBackwards) {
-  /// Three pictures, one each 40 ms, told from the last to the first.
+  /// Three pictures, one each 40 ms, from the last to the first.
   class Backwards : public PictureSource {
    public:
     [[nodiscard]] const SourceFormat& format() const override { return format_; }

@@ -100,7 +100,7 @@ TEST_F(SeenByACamera, ZoomBringsTheFigureIntoMoreWindows) {
 class SeenByADome : public SeenByACamera {
  protected:
   [[nodiscard]] const LiveScene& scene() const override { return scene_; }
-  // The head rests at `place` a minute after it is told, and a preset holds that place.
+  // The head rests at `place` a minute after the order, and a preset holds that place.
   void set_preset(const std::string& number, const std::string& place) {
     ASSERT_TRUE(ptz_.move({{"AbsolutePanTilt", place}}, {}, now_));
     now_ += std::chrono::minutes(1);

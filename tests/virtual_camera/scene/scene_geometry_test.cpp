@@ -81,7 +81,7 @@ TEST(Projection, HoldsOutAgainstPosesThatNoCameraHas) {
   }
 }
 
-TEST(TurnBetween, TakesTheShorterWay) {
+TEST(TurnBetween, TakesTheShorterTurn) {
   const struct {
     double from;
     double to;
@@ -99,7 +99,7 @@ TEST(BoxOf, IsTheFigureInTenThousandthsOfThePicture) {
   EXPECT_NEAR(box.bottom, 5000 + 10 * 10000 / 30.0, 1e-6);
 }
 
-TEST(BoxOf, StandsOnItsHeadInARotatedPicture) {
+TEST(BoxOf, IsUpsideDownInARotatedPicture) {
   View view = wide_view();
   const Intruder intruder{40, -20, 8, 0};
   const PictureBox upright = box_of(intruder, view);

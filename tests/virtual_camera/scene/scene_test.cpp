@@ -180,7 +180,7 @@ std::vector<std::string> clock_dots(std::chrono::milliseconds clock) {
   return rows;
 }
 
-TEST(Scene, ClockTellsTheMomentToTheMillisecond) {
+TEST(Scene, ClockShowsTheMomentToTheMillisecond) {
   EXPECT_EQ(clock_dots(std::chrono::milliseconds(12 * 3600000 + 34 * 60000 + 56 * 1000 + 789)),
             (std::vector<std::string>{"  #    ###        #####    #        #####   ##        #####  ###   ###  ",
                                       " ##   #   #  ##      #    ##   ##   #      #              # #   # #   # ",

@@ -17,7 +17,7 @@ TEST(RequestFaults, OnlyRequestsThatHoldTheMatchAreStruck) {
   EXPECT_FALSE(list.take("GET /command/inquiry.cgi?inq=system HTTP/1.0"));
 }
 
-TEST(RequestFaults, AnOccurrenceStrikesThatMatchAlone) {
+TEST(RequestFaults, AnOccurrenceAppliesToThatMatchAlone) {
   RequestFaultList list;
   list.add(RequestFault::reset("A").nth(2));
   EXPECT_FALSE(list.take("A"));

@@ -106,7 +106,7 @@ TEST_P(LiveVideoTest, EndsWithTheLastWhoWatches) {
 
 INSTANTIATE_TEST_SUITE_P(Of, LiveVideoTest, testing::Values(Codec::kJpeg, Codec::kMpeg4, Codec::kH264));
 
-TEST(LiveVideo, SaysWhyThereIsNone) {
+TEST(LiveVideo, ReportsWhyThereIsNone) {
   LiveEncoding encoding;
   encoding.width = 161;
   encoding.height = 128;

@@ -10,7 +10,7 @@
 namespace vexa::camera {
 namespace {
 
-TEST(RtspMessage, ARequestEndsBehindItsBodyAndTheEmptyLinesThatFollow) {
+TEST(RtspMessage, ARequestEndsAfterItsBodyAndTheEmptyLinesThatFollow) {
   const std::string head = "TEARDOWN rtsp://h/a RTSP/1.0\r\nCSeq: 5\r\n";
   const struct {
     std::string received;
@@ -49,38 +49,38 @@ TEST(RtspMessage, SequenceAndSessionAreDecimalNumbers) {
 }
 
 TEST(RtspMessage, TheFirstTransportThatCanBeServedCounts) {
-  using Way = AskedTransport::Way;
+  using Kind = AskedTransport::Kind;
   const struct {
     std::string transport;
-    Way way;
+    Kind kind;
     int first, second;
-  } cases[] = {{"RTP/AVP;unicast;client_port=5000-5001", Way::kUdp, 5000, 5001},
-               {"RTP/AVP/UDP;unicast;client_port=5000-5003", Way::kUdp, 5000, 5003},
-               {"RTP/AVP;client_port=5000", Way::kUdp, 5000, 5001},
-               {"RTP/AVP;client_port=5000;mode=play-1", Way::kUdp, 5000, 5001},
-               {"RTP/AVP;client_port=5000-x", Way::kUdp, 5000, 5001},
-               {"RTP/AVP/TCP;unicast;interleaved=0-1;", Way::kInterleaved, 0, 1},
-               {"RTP/AVP/TCP;unicast;interleaved=4-7", Way::kInterleaved, 4, 7},
-               {"RTP/AVP/TCP;interleaved=254", Way::kInterleaved, 254, 255},
-               {"RTP/AVP/TCP;unicast", Way::kInterleaved, 0, 1},
-               {"RTP/AVP/TCP", Way::kInterleaved, 0, 1},
-               {"RTP/AVP/TCP;unicast;interleaved=0-1,RTP/AVP;unicast;client_port=7000-7001", Way::kInterleaved, 0, 1},
-               {"RTP/AVP;multicast,RTP/AVP;unicast;client_port=7000-7001", Way::kUdp, 7000, 7001},
-               {"RTP/AVP;unicast;client_port=0-1,RTP/AVP/TCP;interleaved=2-3", Way::kInterleaved, 2, 3},
-               {"RTP/AVP/TCP;interleaved=255", Way::kNone, 0, 0},
-               {"RTP/AVP/TCP;interleaved=0-256", Way::kNone, 0, 0},
-               {"RTP/AVP/TCP;interleaved=70000", Way::kNone, 0, 0},
-               {"RTP/AVP/TCP;interleaved=x", Way::kNone, 0, 0},
-               {"RTP/AVP/TCPX;interleaved=0-1", Way::kNone, 0, 0},
-               {"RTP/AVP;multicast;client_port=5000-5001", Way::kNone, 0, 0},
-               {"RTP/AVP;unicast;client_port=70000-70001", Way::kNone, 0, 0},
-               {"RTP/AVP;unicast;client_port=x", Way::kNone, 0, 0},
-               {"RTP/AVP;unicast", Way::kNone, 0, 0},
-               {"client_port=5000", Way::kNone, 0, 0},
-               {"", Way::kNone, 0, 0}};
+  } cases[] = {{"RTP/AVP;unicast;client_port=5000-5001", Kind::kUdp, 5000, 5001},
+               {"RTP/AVP/UDP;unicast;client_port=5000-5003", Kind::kUdp, 5000, 5003},
+               {"RTP/AVP;client_port=5000", Kind::kUdp, 5000, 5001},
+               {"RTP/AVP;client_port=5000;mode=play-1", Kind::kUdp, 5000, 5001},
+               {"RTP/AVP;client_port=5000-x", Kind::kUdp, 5000, 5001},
+               {"RTP/AVP/TCP;unicast;interleaved=0-1;", Kind::kInterleaved, 0, 1},
+               {"RTP/AVP/TCP;unicast;interleaved=4-7", Kind::kInterleaved, 4, 7},
+               {"RTP/AVP/TCP;interleaved=254", Kind::kInterleaved, 254, 255},
+               {"RTP/AVP/TCP;unicast", Kind::kInterleaved, 0, 1},
+               {"RTP/AVP/TCP", Kind::kInterleaved, 0, 1},
+               {"RTP/AVP/TCP;unicast;interleaved=0-1,RTP/AVP;unicast;client_port=7000-7001", Kind::kInterleaved, 0, 1},
+               {"RTP/AVP;multicast,RTP/AVP;unicast;client_port=7000-7001", Kind::kUdp, 7000, 7001},
+               {"RTP/AVP;unicast;client_port=0-1,RTP/AVP/TCP;interleaved=2-3", Kind::kInterleaved, 2, 3},
+               {"RTP/AVP/TCP;interleaved=255", Kind::kNone, 0, 0},
+               {"RTP/AVP/TCP;interleaved=0-256", Kind::kNone, 0, 0},
+               {"RTP/AVP/TCP;interleaved=70000", Kind::kNone, 0, 0},
+               {"RTP/AVP/TCP;interleaved=x", Kind::kNone, 0, 0},
+               {"RTP/AVP/TCPX;interleaved=0-1", Kind::kNone, 0, 0},
+               {"RTP/AVP;multicast;client_port=5000-5001", Kind::kNone, 0, 0},
+               {"RTP/AVP;unicast;client_port=70000-70001", Kind::kNone, 0, 0},
+               {"RTP/AVP;unicast;client_port=x", Kind::kNone, 0, 0},
+               {"RTP/AVP;unicast", Kind::kNone, 0, 0},
+               {"client_port=5000", Kind::kNone, 0, 0},
+               {"", Kind::kNone, 0, 0}};
   for (const auto& c : cases) {
     const AskedTransport asked = asked_transport(c.transport);
-    EXPECT_EQ(asked.way, c.way) << c.transport;
+    EXPECT_EQ(asked.kind, c.kind) << c.transport;
     EXPECT_EQ(asked.first, c.first) << c.transport;
     EXPECT_EQ(asked.second, c.second) << c.transport;
   }
@@ -153,7 +153,7 @@ TEST(SessionDescription, ParameterSetsAreNamedWhereTheyFit) {
   EXPECT_EQ(describe_session(options, format, whole.size() - 1).find("sprop"), std::string::npos);
 }
 
-TEST(RtspMessage, RecordingsAreNamedBehindMediaWhereNoVideoStreamIs) {
+TEST(RtspMessage, RecordingsAreNamedAfterMediaWhereNoVideoStreamIs) {
   const struct {
     const char* path;
     VideoUrl kind;

@@ -1,4 +1,4 @@
-// The ways by which a picture reaches a host: datagrams, the RTSP connection, an HTTP stream.
+// The transports of a picture to a host: datagrams, the RTSP connection, an HTTP stream.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -14,10 +14,10 @@
 
 namespace vexa_test {
 
-enum class VideoWay { kUdp, kInterleaved, kHttp };
+enum class VideoTransport { kUdp, kInterleaved, kHttp };
 
-/// A camera that plays `clip` by every way.
-inline vexa::camera::CameraOptions options_of_every_way(const std::string& clip) {
+/// A camera that plays `clip` over each transport.
+inline vexa::camera::CameraOptions options_for_all_transports(const std::string& clip) {
   auto options = camera_options();
   options.clip_path = options.image_path = std::string(VEXA_CLIPS) + "/" + clip;
   if (clip.ends_with(".mjpeg")) options.speed = kJpegPace;
@@ -84,11 +84,11 @@ class InterleavedReader {
 };
 
 /// The first frames of the camera's video as the driver hands them out; fewer when no more came.
-inline std::vector<std::string> frames_by(VideoWay way, LiveCamera& camera, std::size_t count) {
+inline std::vector<std::string> frames_by(VideoTransport transport, LiveCamera& camera, std::size_t count) {
   MediaDriver driver;
   camera.introduce(driver);
   std::vector<std::string> frames;
-  if (way == VideoWay::kInterleaved) {
+  if (transport == VideoTransport::kInterleaved) {
     InterleavedReader reader(driver);
     EXPECT_TRUE(reader.open(camera)) << driver.latest_error();
     while (frames.size() < count) {
@@ -97,7 +97,7 @@ inline std::vector<std::string> frames_by(VideoWay way, LiveCamera& camera, std:
     }
     return frames;
   }
-  if (way == VideoWay::kHttp) driver.m_ConnectionInfo.streamTransport = 0;
+  if (transport == VideoTransport::kHttp) driver.m_ConnectionInfo.streamTransport = 0;
   EXPECT_EQ(driver.StartVideoStreaming(), LIBD_OK) << driver.latest_error();
   for (TakenFrame& frame : FrameTaker().take_all(driver, count)) frames.push_back(std::move(frame.bytes));
   return frames;

@@ -1,23 +1,24 @@
-#include "virtual_camera/rtp/fault_lane.h"
+#include "virtual_camera/rtp/packet_impairment.h"
 
 #include <utility>
 
 namespace vexa::camera {
 
-FaultLane::FaultLane(PacketFaults faults, std::uint64_t seed) : faults_(std::move(faults)), random_(seed) {}
+PacketImpairment::PacketImpairment(PacketFaults faults, std::uint64_t seed)
+    : faults_(std::move(faults)), random_(seed) {}
 
 // Written out, because the standard distributions may draw differently from one word size to another.
-bool FaultLane::hit(double probability) {
+bool PacketImpairment::hit(double probability) {
   if (probability <= 0) return false;
   constexpr double kScale = 1.0 / 9007199254740992.0;  // 2^-53
   return static_cast<double>(random_() >> 11U) * kScale < probability;
 }
 
-std::size_t FaultLane::up_to(std::size_t most) {
+std::size_t PacketImpairment::up_to(std::size_t most) {
   return static_cast<std::size_t>(random_() % (std::uint64_t{most} + 1));
 }
 
-bool FaultLane::lost() {
+bool PacketImpairment::lost() {
   if (burst_left_ > 0) {
     --burst_left_;
     return true;
@@ -29,7 +30,7 @@ bool FaultLane::lost() {
   return hit(faults_.loss);
 }
 
-void FaultLane::corrupt(Outgoing& packet) {
+void PacketImpairment::corrupt(Outgoing& packet) {
   if (packet.record.marker && hit(faults_.missing_marker)) {
     packet.header[1] &= 0x7FU;
     packet.record.marker_removed = true;
@@ -49,7 +50,7 @@ void FaultLane::corrupt(Outgoing& packet) {
   packet.record.corrupted_payload = true;
 }
 
-void FaultLane::duplicate(const Outgoing& packet, std::vector<Outgoing>& leaving) {
+void PacketImpairment::duplicate(const Outgoing& packet, std::vector<Outgoing>& leaving) {
   Outgoing copy = packet;
   copy.record.duplicate = true;
   const std::size_t behind = up_to(faults_.duplicate_distance);
@@ -60,7 +61,7 @@ void FaultLane::duplicate(const Outgoing& packet, std::vector<Outgoing>& leaving
   }
 }
 
-void FaultLane::count_down(std::size_t held_before, std::vector<Outgoing>& leaving) {
+void PacketImpairment::count_down(std::size_t held_before, std::vector<Outgoing>& leaving) {
   std::vector<Held> still_held;
   for (std::size_t i = 0; i < held_.size(); ++i) {
     if (i < held_before) --held_[i].behind;
@@ -73,7 +74,7 @@ void FaultLane::count_down(std::size_t held_before, std::vector<Outgoing>& leavi
   held_ = std::move(still_held);
 }
 
-void FaultLane::offer(Outgoing packet, Time now, std::vector<Outgoing>& leaving) {
+void PacketImpairment::offer(Outgoing packet, Time now, std::vector<Outgoing>& leaving) {
   const std::size_t held_before = held_.size();
   const bool struck = packet.record.picture >= faults_.first_picture && packet.record.picture <= faults_.last_picture;
   if (!struck) {
@@ -100,19 +101,19 @@ void FaultLane::offer(Outgoing packet, Time now, std::vector<Outgoing>& leaving)
   if (held_before > 0) count_down(held_before, leaving);
 }
 
-void FaultLane::release_due(Time now, std::vector<Outgoing>& leaving) {
+void PacketImpairment::release_due(Time now, std::vector<Outgoing>& leaving) {
   while (!delayed_.empty() && delayed_.begin()->first <= now) {
     leaving.push_back(std::move(delayed_.begin()->second));
     delayed_.erase(delayed_.begin());
   }
 }
 
-std::optional<FaultLane::Time> FaultLane::next_due() const {
+std::optional<PacketImpairment::Time> PacketImpairment::next_due() const {
   if (delayed_.empty()) return std::nullopt;
   return delayed_.begin()->first;
 }
 
-void FaultLane::release_held(std::vector<Outgoing>& leaving) {
+void PacketImpairment::release_held(std::vector<Outgoing>& leaving) {
   for (Held& held : held_) leaving.push_back(std::move(held.packet));
   held_.clear();
 }

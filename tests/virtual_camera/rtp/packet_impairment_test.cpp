@@ -1,4 +1,4 @@
-#include "virtual_camera/rtp/fault_lane.h"
+#include "virtual_camera/rtp/packet_impairment.h"
 
 #include <gtest/gtest.h>
 
@@ -27,15 +27,15 @@ Outgoing packet_of(std::size_t n) {
 }
 
 std::vector<Outgoing> through(const PacketFaults& faults, std::size_t packets, std::uint64_t seed = 1) {
-  FaultLane lane(faults, seed);
+  PacketImpairment impairment(faults, seed);
   std::vector<Outgoing> leaving;
   for (std::size_t n = 0; n < packets; ++n) {
     const auto now = milliseconds(n);
-    lane.release_due(now, leaving);
-    lane.offer(packet_of(n), now, leaving);
+    impairment.release_due(now, leaving);
+    impairment.offer(packet_of(n), now, leaving);
   }
-  lane.release_held(leaving);
-  while (const auto due = lane.next_due()) lane.release_due(*due, leaving);
+  impairment.release_held(leaving);
+  while (const auto due = impairment.next_due()) impairment.release_due(*due, leaving);
   return leaving;
 }
 
@@ -65,7 +65,7 @@ PacketFaults everything() {
   return faults;
 }
 
-TEST(FaultLane, WithoutFaultsEveryPacketLeavesInOrder) {
+TEST(PacketImpairment, WithoutFaultsEveryPacketLeavesInOrder) {
   const std::vector<Outgoing> packets = through({}, 100);
   ASSERT_EQ(packets.size(), 100U);
   for (std::size_t n = 0; n < 100; ++n) {
@@ -75,7 +75,7 @@ TEST(FaultLane, WithoutFaultsEveryPacketLeavesInOrder) {
   }
 }
 
-TEST(FaultLane, TheSameSeedGivesTheSameFaults) {
+TEST(PacketImpairment, TheSameSeedGivesTheSameFaults) {
   const auto fingerprint = [](std::uint64_t seed) {
     std::vector<std::vector<std::uint8_t>> bytes;
     for (const Outgoing& packet : through(everything(), 2000, seed)) {
@@ -90,7 +90,7 @@ TEST(FaultLane, TheSameSeedGivesTheSameFaults) {
   EXPECT_NE(fingerprint(1), fingerprint(2));
 }
 
-TEST(FaultLane, SeededDrawsAreTheSameOnEveryWordSize) {
+TEST(PacketImpairment, SeededDrawsAreTheSameOnEveryWordSize) {
   PacketFaults faults;
   faults.loss = 0.1;
   std::vector<std::uint64_t> lost;
@@ -100,7 +100,7 @@ TEST(FaultLane, SeededDrawsAreTheSameOnEveryWordSize) {
   EXPECT_EQ(lost, (std::vector<std::uint64_t>{3, 7, 10, 27, 38, 43, 54, 57, 59}));
 }
 
-TEST(FaultLane, LossTakesItsShareAndLeavesTheRestInOrder) {
+TEST(PacketImpairment, LossTakesItsShareAndLeavesTheRestInOrder) {
   PacketFaults faults;
   faults.loss = 0.1;
   const std::vector<Outgoing> packets = through(faults, kMany);
@@ -112,7 +112,7 @@ TEST(FaultLane, LossTakesItsShareAndLeavesTheRestInOrder) {
   EXPECT_TRUE(std::is_sorted(order.begin(), order.end()));
 }
 
-TEST(FaultLane, BurstsLoseTheirLengthOfPacketsInARow) {
+TEST(PacketImpairment, BurstsLoseTheirLengthOfPacketsInARow) {
   PacketFaults faults;
   faults.burst_loss = 0.002;
   faults.burst_length = 5;
@@ -130,7 +130,7 @@ TEST(FaultLane, BurstsLoseTheirLengthOfPacketsInARow) {
   EXPECT_GT(bursts, 10U);
 }
 
-TEST(FaultLane, ReorderedPacketsFallBehindAtMostTheDistanceOfLaterOnes) {
+TEST(PacketImpairment, ReorderedPacketsComeAfterAtMostTheDistanceOfLaterOnes) {
   PacketFaults faults;
   faults.reorder = 0.05;
   faults.reorder_distance = 20;
@@ -152,7 +152,7 @@ TEST(FaultLane, ReorderedPacketsFallBehindAtMostTheDistanceOfLaterOnes) {
   EXPECT_GT(distances[1], 10U);
 }
 
-TEST(FaultLane, DuplicatesFollowAtOnceOrBehindLaterPackets) {
+TEST(PacketImpairment, DuplicatesFollowAtOnceOrAfterLaterPackets) {
   PacketFaults faults;
   faults.duplicate = 0.01;
   std::vector<Outgoing> packets = through(faults, kMany);
@@ -179,7 +179,7 @@ TEST(FaultLane, DuplicatesFollowAtOnceOrBehindLaterPackets) {
   }
 }
 
-TEST(FaultLane, DelayedPacketsLeaveWhenTheirTimeHasCome) {
+TEST(PacketImpairment, DelayedPacketsLeaveWhenTheirTimeHasCome) {
   PacketFaults faults;
   faults.delay = 0.01;
   faults.delay_time = milliseconds(7);
@@ -196,7 +196,7 @@ TEST(FaultLane, DelayedPacketsLeaveWhenTheirTimeHasCome) {
   EXPECT_GT(delayed, 100U);
 }
 
-TEST(FaultLane, CorruptionFlipsTheStatedBitsOfPayloadOrHeader) {
+TEST(PacketImpairment, CorruptionFlipsTheStatedBitsOfPayloadOrHeader) {
   PacketFaults faults;
   faults.corrupt_payload = 1;
   faults.corrupt_bits = 1;
@@ -222,7 +222,7 @@ TEST(FaultLane, CorruptionFlipsTheStatedBitsOfPayloadOrHeader) {
   }
 }
 
-TEST(FaultLane, AMissingMarkerIsClearedInTheHeader) {
+TEST(PacketImpairment, AMissingMarkerIsClearedInTheHeader) {
   PacketFaults faults;
   faults.missing_marker = 1;
   for (const Outgoing& packet : through(faults, 10)) {
@@ -232,7 +232,7 @@ TEST(FaultLane, AMissingMarkerIsClearedInTheHeader) {
   }
 }
 
-TEST(FaultLane, FaultsStrikeOnlyPicturesOfTheirWindow) {
+TEST(PacketImpairment, FaultsAffectOnlyPicturesOfTheirWindow) {
   PacketFaults faults;
   faults.loss = 1;
   faults.first_picture = 10;
@@ -243,7 +243,7 @@ TEST(FaultLane, FaultsStrikeOnlyPicturesOfTheirWindow) {
   }
 }
 
-TEST(FaultLane, NothingIsKeptBackForever) {
+TEST(PacketImpairment, NothingIsKeptBackForever) {
   PacketFaults faults = everything();
   faults.loss = 0;
   faults.burst_loss = 0;

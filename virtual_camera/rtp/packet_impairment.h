@@ -1,7 +1,6 @@
-// The stretch of bad network between a camera's RTP stream and its socket. It knows no clock: times are the camera's
-// schedule, so that the same seed gives the same order on any machine.
-#ifndef VIRTUAL_CAMERA_RTP_FAULT_LANE_H_
-#define VIRTUAL_CAMERA_RTP_FAULT_LANE_H_
+// A bad network between a camera's RTP stream and its socket: packets are lost, late, repeated, reordered, damaged.
+#ifndef VIRTUAL_CAMERA_RTP_PACKET_IMPAIRMENT_H_
+#define VIRTUAL_CAMERA_RTP_PACKET_IMPAIRMENT_H_
 
 #include <chrono>
 #include <cstddef>
@@ -16,12 +15,13 @@
 
 namespace vexa::camera {
 
-// Part of a session's RTP stream; used on the loop's thread.
-class FaultLane {
+// Applies the faults of one stream. Owned by the RtpSender and used on its thread. Reads no clock: times are the
+// camera's schedule, so that the same seed gives the same order on any machine.
+class PacketImpairment {
  public:
   using Time = std::chrono::nanoseconds;  // since the stream's start, as scheduled
 
-  FaultLane(PacketFaults faults, std::uint64_t seed);
+  PacketImpairment(PacketFaults faults, std::uint64_t seed);
 
   // Takes the next packet of the stream and appends whatever leaves now, in order; lost packets too, marked so.
   void offer(Outgoing packet, Time now, std::vector<Outgoing>& leaving);
@@ -29,7 +29,7 @@ class FaultLane {
   void release_due(Time now, std::vector<Outgoing>& leaving);
   // When the next delayed packet leaves.
   [[nodiscard]] std::optional<Time> next_due() const;
-  // The stream has ended: appends the packets held back behind later ones.
+  // The stream has ended: appends the packets that are still held back.
   void release_held(std::vector<Outgoing>& leaving);
 
  private:
@@ -54,4 +54,4 @@ class FaultLane {
 
 }  // namespace vexa::camera
 
-#endif  // VIRTUAL_CAMERA_RTP_FAULT_LANE_H_
+#endif  // VIRTUAL_CAMERA_RTP_PACKET_IMPAIRMENT_H_

@@ -1,5 +1,5 @@
-// Every codec by every way, from the encoder's pictures to a decoder that is not ours.
-#include "tests/media/video_ways.h"
+// Every codec by every transport, from the encoder's pictures to a decoder that is not ours.
+#include "tests/media/video_transports.h"
 
 #include <gtest/gtest.h>
 
@@ -25,33 +25,33 @@ constexpr CodecClip kCodecClips[] = {{"Jpeg", "plain.mjpeg", "mjpeg"},
 /// Over HTTP each slice is a frame.
 constexpr CodecClip kSlicedClip = {"H264InSlices", "slices.h264", "h264"};
 
-struct NamedWay {
+struct NamedTransport {
   const char* name;
-  VideoWay way;
+  VideoTransport transport;
 };
 
-constexpr NamedWay kDatagrams = {"Datagrams", VideoWay::kUdp};
-constexpr NamedWay kRtspConnection = {"RtspConnection", VideoWay::kInterleaved};
-constexpr NamedWay kHttpStream = {"Http", VideoWay::kHttp};
+constexpr NamedTransport kDatagrams = {"Datagrams", VideoTransport::kUdp};
+constexpr NamedTransport kRtspConnection = {"RtspConnection", VideoTransport::kInterleaved};
+constexpr NamedTransport kHttpStream = {"Http", VideoTransport::kHttp};
 
-class EveryCodecByEveryWay : public testing::TestWithParam<std::tuple<CodecClip, NamedWay>> {
+class EveryCodecOverEveryTransport : public testing::TestWithParam<std::tuple<CodecClip, NamedTransport>> {
  protected:
   static constexpr std::size_t kFrames = 30;
 
   static const CodecClip& clip() { return std::get<0>(GetParam()); }
-  static VideoWay way() { return std::get<1>(GetParam()).way; }
+  static VideoTransport transport() { return std::get<1>(GetParam()).transport; }
 };
 
-TEST_P(EveryCodecByEveryWay, FramesAreTheEncodersAndADecoderHasNothingToSay) {
-  const auto options = options_of_every_way(clip().clip);
+TEST_P(EveryCodecOverEveryTransport, FramesAreTheEncodersAndDecodeWithoutComplaint) {
+  const auto options = options_for_all_transports(clip().clip);
   const auto encoded = vexa::camera::ImageClip::load(options.image_path);
   LiveCamera camera(options);
-  const std::vector<std::string> frames = frames_by(way(), camera, kFrames);
+  const std::vector<std::string> frames = frames_by(transport(), camera, kFrames);
   ASSERT_EQ(frames.size(), kFrames);
   const TemporaryFolder folder;
   std::ofstream file(folder / "frames", std::ios::binary);
   for (std::size_t i = 0; i < frames.size(); ++i) {
-    if (way() == VideoWay::kHttp) {
+    if (transport() == VideoTransport::kHttp) {
       ASSERT_TRUE(frames[i] == without_user_data(encoded->kind(), encoded->pictures()[i])) << i;
     } else {
       ASSERT_TRUE(camera.sent(i, frames[i])) << i;
@@ -66,17 +66,17 @@ TEST_P(EveryCodecByEveryWay, FramesAreTheEncodersAndADecoderHasNothingToSay) {
   EXPECT_EQ(decoded.size, "320x240");
 }
 
-std::string name_of_codec_and_way(const testing::TestParamInfo<std::tuple<CodecClip, NamedWay>>& tested) {
+std::string name_of_codec_and_transport(const testing::TestParamInfo<std::tuple<CodecClip, NamedTransport>>& tested) {
   return std::string(std::get<0>(tested.param).name) + "By" + std::get<1>(tested.param).name;
 }
 
-INSTANTIATE_TEST_SUITE_P(Of, EveryCodecByEveryWay,
+INSTANTIATE_TEST_SUITE_P(Of, EveryCodecOverEveryTransport,
                          testing::Combine(testing::ValuesIn(kCodecClips),
                                           testing::Values(kDatagrams, kRtspConnection, kHttpStream)),
-                         name_of_codec_and_way);
-INSTANTIATE_TEST_SUITE_P(OfSlices, EveryCodecByEveryWay,
+                         name_of_codec_and_transport);
+INSTANTIATE_TEST_SUITE_P(OfSlices, EveryCodecOverEveryTransport,
                          testing::Combine(testing::Values(kSlicedClip), testing::Values(kDatagrams, kRtspConnection)),
-                         name_of_codec_and_way);
+                         name_of_codec_and_transport);
 
 }  // namespace
 }  // namespace vexa_test
