@@ -35,7 +35,7 @@ class PictureReader {
     int clock_rate;         ///< ticks a second
     int timeout;            ///< milliseconds that a read may take
     std::function<bool()> is_stopped;
-    bool strict;  ///< takes packets of the camera's address and of the stream's SSRC alone
+    bool strict;                        ///< takes packets of the camera's address and of the stream's SSRC alone
     std::optional<Errand> errand = {};  ///< ends the wait for a datagram, with no picture yet
   };
 
@@ -51,6 +51,7 @@ class PictureReader {
 
  private:
   Result<int> receive(int timeout);
+  void restart_ring();
   struct Datagram {
     std::uint32_t length;
     std::uint32_t sender;  ///< with strict reception alone
