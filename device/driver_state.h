@@ -2,6 +2,7 @@
 #pragma once
 
 #include <atomic>
+#include <cstdint>
 #include <ctime>
 #include <deque>
 #include <memory>
@@ -72,6 +73,7 @@ struct DriverState {
   std::unique_ptr<FrameChronicle> chronicle;  ///< as `ledger`; never null
   std::atomic<bool> strict_reception{false};  ///< any thread's
   QueuedFacts ready_frame;                    ///< assembled and on its way to the queue; as `ledger`
+  std::size_t stream_part = SIZE_MAX;         ///< bytes in use at the start of m_StreamBuffer; the streaming thread's
   FrameStore spare_frames VEXA_GUARDED_BY(driver.m_FrameQueueLock);
   QueueCounts queue VEXA_GUARDED_BY(driver.m_FrameQueueLock);
   LostFrames lost_before_next VEXA_GUARDED_BY(driver.m_FrameQueueLock);           ///< of the next frame to be queued
@@ -158,7 +160,7 @@ struct DriverState {
   ELibDReturnCode read_elementary_frame(CVexaCommon::VideoFrameInfo& frame, const Codec& codec, int& received);
   bool reset_stream_buffer();
   void release_stream_buffer();
-  StreamWindow stream_window();
+  StreamWindow stream_window(std::size_t* part = nullptr);
   /// Looks for the camera's position in the whole data; true when it is there and stored.
   bool store_position(Bytes data);
 
