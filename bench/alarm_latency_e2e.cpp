@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // How long after a contact closes the status call that reports it returns: one host process watches 16 cameras over
 // loopback, each with a thread of its own.
 //   alarm_latency_e2e [CHANGES]     200 changes a camera; ends with 1 when one was lost

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What GetCameraInfo costs of the processor over loopback, beside a bare exchange of the same bytes: buffer, locks,
 // reading the answer, and the copy that the host gets.
 //   camera_info_e2e [CALLS]     2000 calls of each kind

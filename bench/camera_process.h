@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Cameras in a process of their own, so that their work is not counted.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A line of the log beside what the system takes for the same write, in a folder held in memory. The difference between
 // the first two is the logger's own cost.
 #include <benchmark/benchmark.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Multipart JPEG over HTTP: CPU seconds a GB beside a bare recv loop, and whether cameras of 30 pictures a second of
 // 1 MB each keep up. The camera is a process of its own, so that only the reader's time is counted.
 //

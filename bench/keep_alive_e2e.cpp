@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a camera that never answers its keep-alives costs a stream: pictures lost while each is awaited, at 8 and 40
 // Mbit/s, with a keep-alive every second.
 //   keep_alive_e2e [SECONDS]     each stream plays SECONDS (10); ends with 1 when a picture was lost

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The matcher of directory search: usual patterns, and those that are meant to be slow.
 #include <benchmark/benchmark.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The latency of a command to move: from the call to the request's last byte at a camera on this machine.
 //   ptz_latency_e2e [CALLS]
 #include <arpa/inet.h>

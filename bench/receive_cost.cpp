@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reads pictures from a socket once, for valgrind to count the instructions: scripts/check_performance.
 //   receive_cost driver|bare PICTURES PAYLOAD     each picture has 8 datagrams, of PAYLOAD bytes and a header
 #include <sys/socket.h>

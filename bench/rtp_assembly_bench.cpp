@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The pure parts of the RTP path: header, order, collection, assembly.
 #include <benchmark/benchmark.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // CPU seconds that a GB of RTP costs its reader: pictures of each codec, beside a loop that only receives.
 //   rtp_codecs_e2e [MEGABYTES]
 #include <sys/socket.h>

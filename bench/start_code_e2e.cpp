@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The search for start codes beside other ways through the same memory: 64 MB of real H.264, GB a second.
 //   start_code_e2e [CLIP]
 #include <dlfcn.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reading the camera's list of recordings.
 #include <benchmark/benchmark.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a stream costs from the socket to the host: the driver beside a bare poll and recvfrom loop on the same stream.
 //   streaming_e2e [SECONDS [COUNT]]     COUNT measurements (8) of SECONDS (10); ends with 1 when a frame was lost
 // Needs port 554 on 127.0.1.x: run as root, or in `unshare -rn` with the loopback up.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reading the settings of one video stream out of a camera's answer, as GetCameraInfo does once it has the answer.
 #include <benchmark/benchmark.h>
 

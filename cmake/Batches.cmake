@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # vexa_batch(TARGET): compiles several files of a target in one go, which makes whole builds several times faster. Files
 # that keep the same name to themselves never share a batch: scripts/batch_sources. An edit may bring such a name in;
 # configuring again puts the files into other batches.

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # vexa_measure(TARGET): its files count which of their lines and branches run: scripts/coverage. Of the libraries alone, so
 # that their tests compile as in every other build.
 option(VEXA_COVERAGE "Count what the tests run of the libraries (needs clang)" OFF)

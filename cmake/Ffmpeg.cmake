@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # vexa_ffmpeg: FFmpeg's libraries, for the virtual camera's live pictures and vexactl's containers. Debian has them for the
 # machine's own word size, not for -m32; builds without them have no such target and no VEXA_WITH_FFMPEG, and work without
 # those parts.

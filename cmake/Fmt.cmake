@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # vexa_fmt: the formatting library of the virtual camera and vexactl. Debian has it compiled for the machine's own word
 # size; other builds compile what they use of it into each file.
 add_library(vexa_fmt INTERFACE)

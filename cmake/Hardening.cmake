@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # What makes a flaw that we overlooked harder to use: of everything that ships, checked in the finished files by
 # scripts/check_elf. Sanitizers bring checks of their own, which some of these would hide.
 if(VEXA_SANITIZE)

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # What a host developer gets: headers, the libraries, a CMake package, pkg-config files, the licence and the documents.
 include(CMakePackageConfigHelpers)
 

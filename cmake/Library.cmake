@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # libVexaCommon.so.1: the driver. Its objects are also put into a static library, vexa_testable, so that tests and
 # benchmarks reach the hidden cores.
 file(GLOB_RECURSE vexa_sources CONFIGURE_DEPENDS

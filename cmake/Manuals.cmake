@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # vexa_manual(TARGET): a program's manual page and completions, made from its own command line, and their installation.
 # Sanitized programs are left out: not every system runs them just so.
 option(VEXA_BUILD_MANUALS "Make manual pages and completions of the programs (needs python3)" ON)

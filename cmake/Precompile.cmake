@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # Headers of other libraries that most files of a target read, compiled once. The libraries that ship, and clang-tidy, go
 # without: there each file has to name what it uses.
 option(VEXA_PRECOMPILE "Precompile the headers that most files of the tests and tools read" ON)

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # vexa_static(LIBRARY OBJECTS [LINKS...]): lib<LIBRARY>.a beside the shared library, of the same objects; in CMake packages
 # Vexa::<name>Static. Hosts that link it link the libraries that it needs as well: pkg-config --static names them.
 function(vexa_static library objects)

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # One place for the warnings that every target of ours compiles with. They are errors where CMAKE_COMPILE_WARNING_AS_ERROR
 # is on: in the presets, not in a user's build. GCC's sanitizers bring false alarms with them, so builds with them give no
 # warnings.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A program's command line as data: manuals and completions are made from it, so that they hold what --help shows.
 #ifndef COMMAND_LINE_DESCRIPTION_H_
 #define COMMAND_LINE_DESCRIPTION_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Alarm pins: what the camera has, the polled stream of their states, and the outputs.
 #include <cerrno>
 #include <utility>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Sound from the camera: its settings, and the stream that the host polls.
 #include <algorithm>
 #include <utility>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What members reach the camera with: the shared connection settings, the CGI log, one request at a time.
 #pragma once
 

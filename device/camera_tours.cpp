@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Camera tours: sequences of presets.
 
 #include "device/cgi/tour_text.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The cancels that hosts use.
 #include "vexa/cancel.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What ends the calls that wait in a driver.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The connection settings, and the switches of the CGI log.
 #include <cstring>
 #include <utility>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Detection settings, and the switches of the detectors.
 #include "device/cgi/detection_text.h"
 

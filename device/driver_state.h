@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The state of a driver object besides the fields of its class, and the steps that several of its members share.
 #pragma once
 

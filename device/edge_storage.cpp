@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Recordings on the camera's card.
 #include <utility>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The latest failure of a driver, and the boundary at which a member's work becomes its result.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // How many requests were made of the camera, and how they ended.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The latest failed operation, as hosts read it.
 #include <cstddef>
 

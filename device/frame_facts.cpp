@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Frames with what is known of them.
 #include "vexa/frame_facts.h"
 

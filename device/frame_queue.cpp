@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The frames that wait for the host.
 #include <algorithm>
 #include <utility>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The HTTP members that model classes use: requests, answers, streams.
 #include <algorithm>
 #include <cstdarg>

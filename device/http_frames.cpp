@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Frames from the camera's HTTP image stream.
 #include <sys/time.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Exposure and image controls. Setters send one request; getters read the cached answer of the camera inquiry.
 
 #include "device/cgi/image_text.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Motion metadata: the polled stream of detection values.
 #include "device/cgi/input_part.h"
 #include "device/driver_state.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The members that model variants override: exposure modes, and the output that the picture goes to.
 #include <algorithm>
 #include <string_view>

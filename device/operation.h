@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One call of a host's, while it lasts.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The streams that the host polls: sound, alarms, motion metadata.
 #pragma once
 

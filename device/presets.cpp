@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Stored positions. The host counts them from 0, the camera from 1.
 
 #include "device/cgi/ptz_text.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pan, tilt, zoom and focus. Every motion is one request; cameras take speeds in one of two dialects.
 #include "device/cgi/ptz_text.h"
 #include "device/driver_state.h"

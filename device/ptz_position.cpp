@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The camera's position, and the stored control settings.
 #include <optional>
 #include <utility>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which streams of a driver have something for its host, and who waits for them.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The out-of-line members of the public records.
 #include "vexa/io_info.h"
 #include "vexa/video_info.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "device/request_echo.h"
 
 #include <cstdio>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Frames from the pictures of an RTP session.
 #include <chrono>
 #include <optional>

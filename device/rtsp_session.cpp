@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The RTSP members: opening a session, keeping it alive, closing it, reading packets.
 #include "transport/rtsp_session.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Shadow tours: movements that the camera records and plays back.
 
 #include "device/cgi/tour_text.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a host reads of a driver's counts.
 #include "vexa/statistics.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The choice of a video stream.
 #include "vexa/stream_choice.h"
 

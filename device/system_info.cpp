@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The camera's identity.
 
 #include "device/driver_state.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The driver object: its construction and end, its latest error, and members that belong to no family.
 #include "vexa/vexa_common.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Video settings of one stream, and the codecs and sizes that the camera's properties leave.
 #include <utility>
 #include <vector>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Starting and stopping video, and the thread between.
 #include <cerrno>
 #include <chrono>

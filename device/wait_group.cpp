@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "device/wait_group.h"
 
 #include <sys/epoll.h>

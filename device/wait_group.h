@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The streams of several drivers that a host waits for by one descriptor.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Waiting for what drivers have for their host.
 #include "vexa/waiting.h"
 

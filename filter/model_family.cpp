@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "filter/model_family.h"
 
 namespace vexa::filter {

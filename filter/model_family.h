@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the cameras of one family offer: the tables that the criteria narrow.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The criteria that narrow a family's sizes.
 #pragma once
 

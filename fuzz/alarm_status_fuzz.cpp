@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The alarm stream of any bytes, polled by the driver; the first byte decides what the camera has. Also the answers
 // about its pins.
 #include <fcntl.h>

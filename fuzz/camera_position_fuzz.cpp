@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Any user data: a position is 8 to 24 characters of it that begin with its key.
 #include <cstdint>
 #include <cstdlib>

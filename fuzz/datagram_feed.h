@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Passes the datagrams of a fuzz input to the packet collector: two bytes of length before each. They are
 // placed as in the packet buffer of a running stream, where later ones overwrite earlier ones.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Answers about detection, of both kinds of camera: what is read of any bytes can be sent, and reads back equal.
 #include <cstdint>
 #include <cstdlib>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What is read from HTTP answers: header end and status line, the announced length of a picture, and values of
 // inquiries, for which the input is a key, a NUL, and an answer.
 #include <cstddef>

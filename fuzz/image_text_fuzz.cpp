@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Readings of image controls and steps along exposure lists: any bytes give a value of the tables or none.
 #include <cstdint>
 #include <cstdlib>

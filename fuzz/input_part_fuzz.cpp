@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Alarm parts, for all forms in which cameras report motion; the first byte chooses.
 #include <cstddef>
 #include <cstdint>

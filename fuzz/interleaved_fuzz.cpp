@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Packets inside an RTSP connection, one after the other.
 #include <cstddef>
 #include <cstdint>

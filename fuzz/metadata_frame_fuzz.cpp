@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Motion metadata of any bytes: a window without a number of its own keeps its value, and reading again changes
 // nothing.
 #include <cstdint>

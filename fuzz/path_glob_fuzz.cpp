@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The matcher of directory search: the first line is the pattern, the rest the name. What is found is held against the
 // rule, written down as plainly as it can be and bounded by a table instead of by cleverness.
 #include <cstddef>

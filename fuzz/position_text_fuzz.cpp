@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Position texts of pictures: any bytes give a position or none, and any position gives angles within their record.
 #include <cstdint>
 #include <cstdlib>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Lists of preset names: any bytes name presets that exist and leave their number and order alone.
 #include <cstdint>
 #include <cstdlib>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // CRealTime::Format and CRealTimeSpan::Format: the input is eight bytes of ticks and a format.
 #include <cstddef>
 #include <cstdint>

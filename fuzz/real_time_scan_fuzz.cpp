@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // CRealTime::Scan and the text constructor: the input is a format, a NUL, and a text.
 #include <cstddef>
 #include <cstdint>

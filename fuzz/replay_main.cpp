@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Replays the corpus of one fuzz target: every file, and every file cut short at every length. Each input lies right
 // before a page that may not be touched, so that reading one byte too far ends the program.
 #include <sys/mman.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Any datagrams: two bytes of length before each.
 #include "fuzz/datagram_feed.h"
 #include "media/assembly/rtp_pictures.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Any datagrams: two bytes of length before each. What is made of them begins and is as long as a JFIF picture.
 #include <cstdlib>
 

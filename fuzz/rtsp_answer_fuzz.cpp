@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Everything read from RTSP answers: header end after any peek, status line, clock rate, session, range clock.
 #include <cstddef>
 #include <cstdint>

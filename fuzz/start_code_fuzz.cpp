@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Any bytes, from any place in a block on: the finders return what a search byte by byte returns. The first byte
 // decides how much is left out at the front.
 #include <algorithm>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The list of recordings: whatever a camera answers is read, and what was read, written again, reads the same.
 #include <cstdint>
 #include <cstdlib>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // An elementary stream in pieces: a byte of length before each. However they come, no byte of the stream is lost.
 #include <algorithm>
 #include <cstddef>

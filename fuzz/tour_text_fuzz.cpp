@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Camera tours and shadow tours: any answer can be read, and what was read is either refused or set again in
 // a request that holds no other command.
 #include <cstdint>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Readings of video settings: any answer is read without a fault, and every value lies inside it.
 #include <cstdint>
 #include <cstdlib>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The command line of vexactl as a whole.
 #ifndef HOST_COMMAND_LINE_H_
 #define HOST_COMMAND_LINE_H_

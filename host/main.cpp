@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl: the command-line host.
 #include <csignal>
 #include <cstdio>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What is known of each picture beside its bytes: when its packets came, what is missing before it, the sender's time.
 #pragma once
 

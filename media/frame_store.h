@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Spare frame buffers.
 #pragma once
 
@@ -12,9 +13,8 @@ namespace vexa {
 
 /// Keeps a few frame buffers that are done with, so that a picture need not fetch fresh pages from the system. What a
 /// stream no longer needs goes back to the system: spares that were not taken for some time, and the rear of buffers
-/// that held larger pictures. Owned by the
-/// driver; any thread that holds the lock of the frame queue. Frames of one size are the rule, so a buffer fits only a
-/// request for its own size.
+/// that held larger pictures. Frames of one size are the rule, so a buffer fits only a request for its own size. Owned
+/// by the driver; any thread that holds the lock of the frame queue.
 class FrameStore {
  public:
   static constexpr unsigned kIdlePeriod = 32;  ///< frames

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // From the datagrams of an RTP stream to the packets of its next picture.
 #pragma once
 

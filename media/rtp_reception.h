@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a running RTP stream keeps between two pictures.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the reader of a stream counts, and what of it any thread can read.
 #pragma once
 

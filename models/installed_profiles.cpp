@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Where the profiles lie: in a place relative to this library, so that the package can be kept anywhere.
 #include <dlfcn.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // JSON text as a tree whose every value knows its line, so that what is wrong can be pointed at.
 #ifndef MODELS_JSON_TEXT_H_
 #define MODELS_JSON_TEXT_H_

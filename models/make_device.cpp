@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Drivers that know their model.
 #include <mutex>
 #include <new>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reading a profile that obeys the schema into the records that a driver hands out: values by key, and the first thing
 // found that is wrong.
 #ifndef MODELS_READING_H_

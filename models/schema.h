@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Checks a JSON value against a JSON schema: the part of the language that the profiles' schema uses.
 #ifndef MODELS_SCHEMA_H_
 #define MODELS_SCHEMA_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Failure lines of the runtime on standard error.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Manual-reset events: a pipe that holds at least one byte while the event is signalled.
 #include <fcntl.h>
 #include <poll.h>

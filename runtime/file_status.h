@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the system reports about a file, in the values of this layer.
 #pragma once
 

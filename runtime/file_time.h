@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tick arithmetic under the time conversions and the time classes.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The records that typedHandle pointers lead to. Each names its kind, so that one function tells them apart.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // An event that others wait for by a descriptor.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Large blocks of memory that the system holds only as far as they are used.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The directive languages of CRealTime::Format and CRealTimeSpan::Format, as functions of plain values.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Windows calls that are one call of the C library, or a constant.
 #include <dlfcn.h>
 #include <pthread.h>

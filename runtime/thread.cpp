@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Threads whose exit code can be polled. One lock guards the thread map and the state of every thread handle.
 #include <limits.h>
 #include <pthread.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Waiting on events with one poll; the signal stays in the pipe.
 #include <poll.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Whether, and how long, a reader lets datagrams gather before it drains them.
 #pragma once
 

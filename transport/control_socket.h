@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The RTCP port beside a media port.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // HTTP/1.0 exchanges with the camera, each over a connection of its own.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reading what a camera sends over an HTTP connection.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // HTTP streams without an end, read one unit at a time: pictures, text parts, elementary video.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // RTP packets inside an RTSP connection.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "transport/name_lookup.h"
 
 #include <arpa/inet.h>

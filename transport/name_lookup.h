@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Looking a host name up without standing still in the system's resolver.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Datagrams of an RTP stream over UDP.
 #pragma once
 

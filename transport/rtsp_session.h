@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // RTSP sessions: opening, keeping alive, closing.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // From a host name to a connected TCP socket.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "virtual_camera/camera_host.h"
 
 #include <fmt/format.h>

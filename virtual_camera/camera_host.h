@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Many cameras in one process, at consecutive addresses.
 #ifndef VIRTUAL_CAMERA_CAMERA_HOST_H_
 #define VIRTUAL_CAMERA_CAMERA_HOST_H_

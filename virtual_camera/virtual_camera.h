@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A network camera in software: HTTP commands and RTSP/RTP video, with a journal of what it was asked and faults on
 // demand. On the wire it shares no code with the driver library, so that each checks the other.
 #ifndef VIRTUAL_CAMERA_VIRTUAL_CAMERA_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Loops that only receive: the least that a reader can do. One wakes for every datagram, one naps and drains.
 #include <arpa/inet.h>
 #include <netinet/in.h>

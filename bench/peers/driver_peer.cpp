@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The driver, and a host that waits for the frames of all streams in one thread.
 #include "bench/peers/peer.h"
 #include "vexa/vexa_common.h"

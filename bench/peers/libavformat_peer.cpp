@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // FFmpeg's demultiplexer, a thread a stream, as programs use it that show or record cameras.
 #include "bench/peers/peer.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pictures as cameras of a bit rate send them, in RTP payloads. Nobody decodes them.
 #pragma once
 

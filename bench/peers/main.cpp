@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One measurement of one reader of RTP streams: prints a JSON object. scripts/bench_peers compares them.
 //   vexa-peers [NAME=VALUE...]   the names and their defaults stand in bench/peers/options.h
 // Needs port 554 on 127.0.1.1: scripts/own_network vexa-peers ...

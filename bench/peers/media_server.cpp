@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "bench/peers/media_server.h"
 
 #include <arpa/inet.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A media server that belongs to none of the peers: RTSP and RTP over UDP, paced by the clock.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A reader of the media server's streams.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Alarm pins: the list of a camera's inputs, outputs and detectors, their states in the camera's answers, and when a
 // tampering alarm is cleared.
 #pragma once

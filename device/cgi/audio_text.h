@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The camera's words for the codec of its audio input.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Detection settings as cameras write them: windows and object sizes, or one size and one sensitivity (LOD).
 #pragma once
 

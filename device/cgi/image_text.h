@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The camera's words of exposure and image control, and the steps along its exposure lists.
 #pragma once
 

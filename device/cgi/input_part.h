@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The alarm and detection stream: what one text part reports of the camera's inputs and detectors, and the pins that
 // hosts get for it.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A camera's position: the text in its pictures, positions as angles, viewing angles by zoom.
 #pragma once
 

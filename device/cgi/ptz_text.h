@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Scales of motion: the host's speeds, positions and picture coordinates in the camera's units.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Recordings as the camera lists them.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Camera tours and shadow tours as the camera writes them.
 #pragma once
 

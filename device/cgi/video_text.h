@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The camera's texts of video settings: codec words, sizes, keys of one stream.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tables of values and the camera's words for them.
 #pragma once
 

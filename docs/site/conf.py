@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # Sphinx's settings for the site; scripts/docs runs it on a copy of the pages.
 import os
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "host/access/camera_address.h"
 
 #include <fmt/format.h>

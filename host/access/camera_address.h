@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The camera's address, as given on the command line.
 #ifndef HOST_ACCESS_CAMERA_ADDRESS_H_
 #define HOST_ACCESS_CAMERA_ADDRESS_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // User name and password: from files and the environment, never from the command line itself, where every user of the
 // machine could read the password.
 #ifndef HOST_ACCESS_CREDENTIALS_H_

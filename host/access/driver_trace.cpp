@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "host/access/driver_trace.h"
 
 #include <fcntl.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a driver traces of its RTSP sessions, on standard error; and standard output kept for vexactl's results.
 #ifndef HOST_ACCESS_DRIVER_TRACE_H_
 #define HOST_ACCESS_DRIVER_TRACE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Keeps the password out of everything that vexactl prints for others: the driver's trace, a camera's answers.
 #ifndef HOST_ACCESS_REDACTOR_H_
 #define HOST_ACCESS_REDACTOR_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The video codecs of cameras, and their names.
 #ifndef HOST_BASE_CODEC_H_
 #define HOST_BASE_CODEC_H_

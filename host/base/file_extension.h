@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The kind of a file, by the end of its name.
 #ifndef HOST_BASE_FILE_EXTENSION_H_
 #define HOST_BASE_FILE_EXTENSION_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Numbers as a person or a camera writes them.
 #ifndef HOST_BASE_NUMBER_TEXT_H_
 #define HOST_BASE_NUMBER_TEXT_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Texts as vexactl prints them.
 #ifndef HOST_BASE_PRINTABLE_H_
 #define HOST_BASE_PRINTABLE_H_

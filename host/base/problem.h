@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A failure as the user sees it, and the exit codes of vexactl.
 #ifndef HOST_BASE_PROBLEM_H_
 #define HOST_BASE_PROBLEM_H_

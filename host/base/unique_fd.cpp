@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "host/base/unique_fd.h"
 
 #include <poll.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A descriptor that closes itself, and writing all of something to one.
 #ifndef HOST_BASE_UNIQUE_FD_H_
 #define HOST_BASE_UNIQUE_FD_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The options that all commands with a camera share.
 #ifndef HOST_CAMERA_CAMERA_OPTIONS_H_
 #define HOST_CAMERA_CAMERA_OPTIONS_H_

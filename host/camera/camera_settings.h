@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A camera's settings as a whole: read, shown, changed.
 #ifndef HOST_CAMERA_CAMERA_SETTINGS_H_
 #define HOST_CAMERA_CAMERA_SETTINGS_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The driver as vexactl uses it, and its failures in words.
 #ifndef HOST_CAMERA_LIVE_CAMERA_H_
 #define HOST_CAMERA_LIVE_CAMERA_H_

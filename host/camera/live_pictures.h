@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A camera's live video, picture by picture.
 #ifndef HOST_CAMERA_LIVE_PICTURES_H_
 #define HOST_CAMERA_LIVE_PICTURES_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A camera of a known model, with the driver class that its profile names.
 #ifndef HOST_CAMERA_MODEL_CAMERA_H_
 #define HOST_CAMERA_MODEL_CAMERA_H_

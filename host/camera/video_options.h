@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The options that choose a camera's video stream and its transport.
 #ifndef HOST_CAMERA_VIDEO_OPTIONS_H_
 #define HOST_CAMERA_VIDEO_OPTIONS_H_

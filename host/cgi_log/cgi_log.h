@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The driver's CGI log, read back: which request got which answer, and when.
 #ifndef HOST_CGI_LOG_CGI_LOG_H_
 #define HOST_CGI_LOG_CGI_LOG_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A file that grows while it is read.
 #ifndef HOST_CGI_LOG_FOLLOWED_FILE_H_
 #define HOST_CGI_LOG_FOLLOWED_FILE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A command with actions of its own: vexactl ptz CAMERA pan, vexactl preset CAMERA list.
 #ifndef HOST_COMMANDS_ACTION_GROUP_H_
 #define HOST_COMMANDS_ACTION_GROUP_H_

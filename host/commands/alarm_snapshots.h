@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pictures of the moments of alarms.
 #ifndef HOST_COMMANDS_ALARM_SNAPSHOTS_H_
 #define HOST_COMMANDS_ALARM_SNAPSHOTS_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Shows a camera's alarms as they come.
 #ifndef HOST_COMMANDS_ALARM_WATCH_H_
 #define HOST_COMMANDS_ALARM_WATCH_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl io, output and watch: a camera's pins, its outputs, and its alarms as they come.
 #include <fmt/format.h>
 

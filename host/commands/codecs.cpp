@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl codecs and exposure: what a camera offers, and steps along its exposure.
 #include <fmt/format.h>
 

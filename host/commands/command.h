@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One command of vexactl. A family of commands has a file of its own here; command_line.cpp lists them.
 #ifndef HOST_COMMANDS_COMMAND_H_
 #define HOST_COMMANDS_COMMAND_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl detection, tampering and audio-detection: the settings of a camera's detectors, and switching them.
 #include <fmt/format.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The picture that a camera sends now, with its detection windows drawn on it.
 #ifndef HOST_COMMANDS_DETECTION_PICTURE_H_
 #define HOST_COMMANDS_DETECTION_PICTURE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl edge: recording on a camera's card, and the recordings there. Playing them has a file of its own.
 #include <fmt/format.h>
 

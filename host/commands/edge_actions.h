@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The actions of vexactl edge that play recordings.
 #ifndef HOST_COMMANDS_EDGE_ACTIONS_H_
 #define HOST_COMMANDS_EDGE_ACTIONS_H_

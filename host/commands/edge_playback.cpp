@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl edge play, get and backfill: recordings played by the camera, counted or kept in files.
 #include <fmt/format.h>
 

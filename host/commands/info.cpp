@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl info: a camera's identity and video settings.
 #include <fmt/format.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl listen: a camera's sound into a file.
 #include <fmt/format.h>
 

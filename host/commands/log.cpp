@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl log: the driver's CGI log as a table.
 #include <fmt/format.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl preset: a camera's stored positions. They are counted from 1, as on the camera and in its tours.
 #include <fmt/format.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl profile: the profiles of camera models.
 #include <fmt/format.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl ptz: turns, zooms and focuses a camera.
 #include <fmt/format.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl ptz watch: a camera's position, taken from its pictures.
 #include "host/commands/ptz_watch.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The action of vexactl ptz that shows a camera's position.
 #ifndef HOST_COMMANDS_PTZ_WATCH_H_
 #define HOST_COMMANDS_PTZ_WATCH_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl record: live video into a file.
 #include <fmt/format.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl settings, set and daynight: shows and changes a camera's settings.
 #include <fmt/format.h>
 

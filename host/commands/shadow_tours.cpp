@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl shadow: movements by hand that a camera records and plays back.
 #include <fmt/format.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl snapshot: one picture of live video into a file.
 #include <fmt/format.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl tour: a camera's tours, each a row of presets that it visits in turn.
 #include <fmt/format.h>
 

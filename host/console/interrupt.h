@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Ctrl-C, SIGTERM and SIGHUP.
 #ifndef HOST_CONSOLE_INTERRUPT_H_
 #define HOST_CONSOLE_INTERRUPT_H_

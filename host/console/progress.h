@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The progress line of work that reports each of its steps.
 #ifndef HOST_CONSOLE_PROGRESS_H_
 #define HOST_CONSOLE_PROGRESS_H_

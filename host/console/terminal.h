@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The output of vexactl: results on standard output, everything else on standard error.
 #ifndef HOST_CONSOLE_TERMINAL_H_
 #define HOST_CONSOLE_TERMINAL_H_

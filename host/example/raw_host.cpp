@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Records live video with the driver alone: no camera profile, one thread, one poll.
 //   raw-host ADDRESS FRAMES FILE
 #include <poll.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Many cameras, one thread: takes their frames as a video wall does, by one epoll.
 //   wall-host FRAMES ADDRESS...   one camera for each address, FRAMES of each; ends with 1 when one fell short
 #include <sys/epoll.h>

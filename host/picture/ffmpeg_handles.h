@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // FFmpeg's objects, each freed with its handle.
 #ifndef HOST_PICTURE_FFMPEG_HANDLES_H_
 #define HOST_PICTURE_FFMPEG_HANDLES_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A decoded picture, and the detection windows that are drawn on it: window_drawing.cpp.
 #ifndef HOST_PICTURE_PICTURE_H_
 #define HOST_PICTURE_PICTURE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Frames of a camera's video to a picture. Needs FFmpeg's libraries: a build without them refuses.
 #ifndef HOST_PICTURE_PICTURE_DECODER_H_
 #define HOST_PICTURE_PICTURE_DECODER_H_

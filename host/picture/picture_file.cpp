@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "host/picture/picture_file.h"
 
 #include "host/base/file_extension.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pictures as PNG and JPEG files. Needs FFmpeg's libraries: a build without them refuses.
 #ifndef HOST_PICTURE_PICTURE_FILE_H_
 #define HOST_PICTURE_PICTURE_FILE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The file that a recording goes to.
 #ifndef HOST_RECORDING_FRAME_FILE_H_
 #define HOST_RECORDING_FRAME_FILE_H_

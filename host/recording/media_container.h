@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Video in a Matroska or MP4 file, each picture with its time. Needs FFmpeg's libraries: a build without them refuses.
 #ifndef HOST_RECORDING_MEDIA_CONTAINER_H_
 #define HOST_RECORDING_MEDIA_CONTAINER_H_

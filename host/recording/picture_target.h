@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The destination of a recording's pictures.
 #ifndef HOST_RECORDING_PICTURE_TARGET_H_
 #define HOST_RECORDING_PICTURE_TARGET_H_

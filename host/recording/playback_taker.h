@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Takes the pictures of a recording that a camera plays.
 #ifndef HOST_RECORDING_PLAYBACK_TAKER_H_
 #define HOST_RECORDING_PLAYBACK_TAKER_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Writes live pictures from a driver to a file.
 #ifndef HOST_RECORDING_RECORDER_H_
 #define HOST_RECORDING_RECORDER_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The figures of a recording so far.
 #ifndef HOST_RECORDING_RECORDING_METER_H_
 #define HOST_RECORDING_RECORDING_METER_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What --out names: a file of pictures one after the other, or a container.
 #ifndef HOST_RECORDING_RECORDING_TARGET_H_
 #define HOST_RECORDING_RECORDING_TARGET_H_

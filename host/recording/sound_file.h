@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The file that a camera's sound goes to.
 #ifndef HOST_RECORDING_SOUND_FILE_H_
 #define HOST_RECORDING_SOUND_FILE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pins and detection in the words of the command line.
 #ifndef HOST_WORDS_ALARM_WORDS_H_
 #define HOST_WORDS_ALARM_WORDS_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // How a camera is set to record on its card, read from the camera's answer.
 #ifndef HOST_WORDS_CARD_MODE_H_
 #define HOST_WORDS_CARD_MODE_H_

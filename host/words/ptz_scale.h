@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Directions, degrees and magnifications in the scales that the driver takes.
 #ifndef HOST_WORDS_PTZ_SCALE_H_
 #define HOST_WORDS_PTZ_SCALE_H_

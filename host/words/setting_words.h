@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Settings in the words of the command line: "codec=H.264", "day-night=auto".
 #ifndef HOST_WORDS_SETTING_WORDS_H_
 #define HOST_WORDS_SETTING_WORDS_H_

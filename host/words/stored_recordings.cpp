@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "host/words/stored_recordings.h"
 
 #include <fmt/format.h>

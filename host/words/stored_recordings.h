@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The recordings on a camera's card, in words: when, of what codec, and as the name of a file.
 #ifndef HOST_WORDS_STORED_RECORDINGS_H_
 #define HOST_WORDS_STORED_RECORDINGS_H_

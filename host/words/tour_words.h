@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What camera tours and shadow tours have in common, in the words of the command line.
 #ifndef HOST_WORDS_TOUR_WORDS_H_
 #define HOST_WORDS_TOUR_WORDS_H_

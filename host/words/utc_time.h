@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Moments as "2024-01-31T23:59:59Z".
 #ifndef HOST_WORDS_UTC_TIME_H_
 #define HOST_WORDS_UTC_TIME_H_

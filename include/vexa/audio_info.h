@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Audio settings, capabilities and frames.
 #pragma once
 

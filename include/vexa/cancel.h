@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Ending what waits in a driver.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Small records that several families share, and the host's frame receiver.
 #pragma once
 

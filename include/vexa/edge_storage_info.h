@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Recordings held on the camera's own card.
 #pragma once
 

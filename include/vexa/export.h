@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Marks what the shared libraries hand out; everything else stays hidden.
 #pragma once
 

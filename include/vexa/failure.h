@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Why an operation failed, as one record, and codes by name.
 #pragma once
 

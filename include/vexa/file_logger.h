@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A log file that several loggers of a process share, rotated by size.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // When a frame was taken and how it came: RTP time, sequence, arrival, losses, the camera's clock.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Alarm pins, detection settings and motion metadata.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The contract between a video-management host and a device driver.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Camera models: profiles of what a model can do, and the driver of a model. Of the library libVexaModels.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pan, tilt, zoom and focus; presets, camera tours and shadow tours.
 //
 // Three kinds of units meet here. The host's are fixed: speeds -10000 to 10000, positions 0 to 10000. The camera's are

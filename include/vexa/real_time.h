@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Points and lengths of time: the Win32-style conversions, CRealTime and CRealTimeSpan.
 #pragma once
 

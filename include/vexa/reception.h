@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Whose packets a driver takes.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The resolution filter: which codecs and picture sizes a camera model offers under given properties.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The Windows-style system interface the driver and its host are written against, on POSIX.
 //
 // Every free function has C linkage under exactly its Windows name. Unless a function says otherwise: BOOL results are

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The state of a camera that stays connected. Of the library libVexaSession.
 #pragma once
 

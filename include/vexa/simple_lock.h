@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The one mutex of the driver and its logger.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What became of each packet and frame of a driver's streams.
 #pragma once
 

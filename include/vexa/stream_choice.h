@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which of the camera's video streams a start opens.
 #pragma once
 

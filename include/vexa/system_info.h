@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // How a camera is reached, and what it reports about itself.
 #pragma once
 

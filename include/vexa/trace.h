@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a driver traces of its RTSP sessions.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The driver of this camera family.
 #pragma once
 

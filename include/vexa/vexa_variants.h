@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The model variants of the driver: each replaces a few operations, everything else is CVexaCommon's.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Video settings, video capabilities and video frames.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Waiting for what a driver has for its host, in place of asking again and again.
 //
 // A driver has four streams to take from: video, alarms, motion metadata and audio. A stream is ready while there is

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the driver has to know about each video codec: one row a codec.
 #pragma once
 

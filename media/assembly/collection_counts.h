@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Where the packets and pictures of a stream have gone.
 #pragma once
 

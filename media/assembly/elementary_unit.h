@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Elementary streams over HTTP: the part that each unit between two start codes plays in a picture.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A frame buffer that is filled from its start and never beyond its end.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The JPEG markers and tables in front of a picture's scan data, which do not travel over RTP.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which received packets form the next picture; which are waited for, and which are given up.
 #pragma once
 

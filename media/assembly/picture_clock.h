@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Time stamps of played-back pictures: RTP timestamps on the clock of the recording.
 #pragma once
 

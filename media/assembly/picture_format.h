@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What in a frame gives its picture's format.
 #pragma once
 

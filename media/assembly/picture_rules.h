@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the packet collector has to know about a codec.
 #pragma once
 

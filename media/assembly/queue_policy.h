@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the frame queue does with a new frame when the host reads slower than the camera sends.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The packets that were used lately: they distinguish a duplicate from a restarted sequence.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pictures from RTP packets, a file of each codec: H.264 (RFC 6184) in h264_units.cpp, MPEG-4 Visual (RFC 3016) in
 // mpeg4_units.cpp, JPEG (RFC 2435) in rtp_jpeg.cpp.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The start codes between the units of a byte stream: 00 00 00 01 (H.264, Annex B) and 00 00 01 (MPEG-4 Visual).
 #pragma once
 

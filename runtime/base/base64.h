@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Base64 (RFC 4648), and a decoder that takes what cameras send.
 #pragma once
 

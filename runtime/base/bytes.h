@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Bytes from outside, and a forward reader of them whose failure is sticky.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The Gregorian calendar: days, years and week numbers as plain arithmetic, without zones or clocks.
 #pragma once
 

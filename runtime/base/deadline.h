@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Deadlines on the steady clock, in the milliseconds that poll takes.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Formats made of directives: "%", printf's flags and a letter. Fields are padded in this file, so that no text from
 // outside is ever used as a format of printf.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Matching of one name against one component of a search pattern.
 #pragma once
 

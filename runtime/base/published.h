@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A record that one thread writes and any thread reads, without a lock.
 #pragma once
 

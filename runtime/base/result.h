@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The result of a step that can fail: its value, or the reason why it failed.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Decimal numbers at the front of a text, with scanf's leniency and without its overflow.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A lock guard that clang's thread-safety analysis understands.
 #pragma once
 

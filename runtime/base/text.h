@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Small functions on text: what follows a key, what comes before a mark, decimal numbers, hidden secrets, bounded
 // formatting.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A change that is taken back unless it is kept.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Bounds how many sessions connect at the same time.
 #pragma once
 

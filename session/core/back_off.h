@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // How long a session waits before it tries its camera again.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Keeps refused credentials from locking a camera's account.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "session/core/event_slot.h"
 
 #include <utility>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The latest event of a session for a host that may be slow.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The cause of a failed operation, in the field's terms.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Time as the session's parts are given it.
 #pragma once
 

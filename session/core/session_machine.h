@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a session does next, from what it has seen.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A session's state as one sentence for a person.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What CLibraryDevice itself answers, and what it does to records.
 #include <gtest/gtest.h>
 

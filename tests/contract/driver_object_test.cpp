@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A new driver object: its members, their first values, and what its end releases.
 #include <arpa/inet.h>
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The numbers of the names, which are compiled into hosts.
 #include <gtest/gtest.h>
 

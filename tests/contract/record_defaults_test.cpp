@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // New records: the fields and defaults that hosts know.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The places of the operations in the virtual table. Hosts built elsewhere call by place.
 #include <gtest/gtest.h>
 

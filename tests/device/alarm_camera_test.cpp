@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Alarms, detection settings and metadata between the driver and the virtual camera.
 #include <arpa/inet.h>
 #include <gtest/gtest.h>

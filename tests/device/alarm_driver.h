@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The driver with its alarm, detection and metadata members in reach and a clock that the test sets, and a camera that
 // answers every request while its streams stay open.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The list of pins that a camera has, its outputs, and its live alarm stream stopped.
 #include <gtest/gtest.h>
 #include <sys/socket.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Alarm pins, detection settings and the polled streams when memory is short.
 #include <gtest/gtest.h>
 

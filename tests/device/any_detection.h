@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Detection settings of every kind, for properties.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Brightness on the wire: levels and steps along the camera's exposure lists.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // All fields of a camera-info record, for comparing whole records.
 #pragma once
 

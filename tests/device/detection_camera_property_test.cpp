@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Detection settings of every kind through a camera: what a host sets it reads back, request by request.
 #include <gtest/gtest.h>
 #include <rapidcheck.h>

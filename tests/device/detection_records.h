@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Detection records as tests write and compare them.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Recordings on the camera's card: what the driver asks and what it makes of the answers.
 #include <gtest/gtest.h>
 

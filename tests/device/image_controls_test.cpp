@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Exposure and image controls on the wire.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Every bit of a part and every pin of a status call, against a model of what the camera means: items that stand for
 // inputs and detectors, laid out on bits by counting.
 #include <gtest/gtest.h>

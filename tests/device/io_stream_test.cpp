@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The polled stream of pin states, from start to stop.
 #include <gtest/gtest.h>
 

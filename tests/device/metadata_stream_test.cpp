@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The polled stream of motion metadata.
 #include <gtest/gtest.h>
 

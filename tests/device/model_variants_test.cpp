@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the model variants do in their own way, on the wire.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Alarm and metadata streams, polled, started and stopped from several host threads at once.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Host threads that read and set a camera of a profile while its video streams, through the host's interface alone.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Directions of motion: by the signs of speeds, and their words.
 #include <gtest/gtest.h>
 

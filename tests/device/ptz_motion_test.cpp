@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Motion on the wire: both dialects over grids of arguments, compared with a model of its own.
 #include <gtest/gtest.h>
 

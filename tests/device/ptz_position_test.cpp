@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The camera's position, read from the text of its pictures; and the records of control.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The driver's pan, tilt and zoom in reach, a camera's units for it, and requests played in a row.
 #pragma once
 

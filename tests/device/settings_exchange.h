@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Settings on the wire: scripts of commands and inquiries, and a driver whose settings are in reach.
 #pragma once
 

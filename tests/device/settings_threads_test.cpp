@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Host threads that read and set while video streams.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Shadow tours on the wire.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Settings, image controls, records, motion, presets and tours when memory is short.
 #include <gtest/gtest.h>
 

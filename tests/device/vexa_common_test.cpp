@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The driver's own operations and its latest error.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the host sets of the camera's video without asking the camera, and what is offered then.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // GetCameraInfo on the wire.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Waiting for several streams and drivers: what is ready, and sets of drivers.
 #include <gtest/gtest.h>
 #include <sys/socket.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A host's own library in the place of libVexaCommonFilter.so.1.
 #include <gtest/gtest.h>
 

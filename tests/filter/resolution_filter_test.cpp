@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The resolution filter: tables of the families, and what each criterion leaves.
 #include "vexa/resolution_filter.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A virtual camera at an address of its own, and vexactl to drive it.
 #pragma once
 

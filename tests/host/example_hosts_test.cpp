@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The hosts to copy from: they record, and give their reasons when they cannot.
 #include "tests/host/camera_fixture.h"
 

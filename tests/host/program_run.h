@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Runs a program of the build as a user would, in a folder of its own.
 #pragma once
 

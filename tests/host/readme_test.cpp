@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The host that the README shows: it is the one that is built, and it works.
 #include "tests/host/camera_fixture.h"
 

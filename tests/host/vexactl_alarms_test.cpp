@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl io, output, watch, detection, tampering and audio-detection, against a virtual camera of a model.
 #include <nlohmann/json.hpp>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl edge: recordings on the card of a virtual camera.
 #include <cmath>
 #include <filesystem>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl info, against a virtual camera.
 #include <filesystem>
 #include <nlohmann/json.hpp>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Ctrl-C and SIGTERM at any moment.
 #include <gtest/gtest.h>
 #include <poll.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl --cgi-log and vexactl log, against a virtual camera.
 #include <filesystem>
 #include <nlohmann/json.hpp>

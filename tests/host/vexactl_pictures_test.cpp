@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pictures that vexactl makes: detection windows drawn on one, and those of alarms.
 #include <array>
 #include <cstdlib>

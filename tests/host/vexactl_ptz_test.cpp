@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl ptz, preset, tour and shadow, against a virtual camera of a model.
 #include <nlohmann/json.hpp>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl record, against a virtual camera.
 #include <sys/stat.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl settings, set, codecs, exposure, daynight and profile, against a virtual camera of a model.
 #include <nlohmann/json.hpp>
 

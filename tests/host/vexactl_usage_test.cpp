@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The command line of vexactl: help, refusals, and what they must not repeat.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexactl record, snapshot and listen: every codec, by every transport, into every kind of file.
 #include <filesystem>
 #include <nlohmann/json.hpp>

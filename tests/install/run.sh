@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: Apache-2.0
 # Installs a build into an empty place and proves it with a host outside the source tree: found by CMake, found by
 # pkg-config, compiled as C++14, run. Then looks at what the libraries say of themselves.
 #   run.sh BUILD-DIRECTORY

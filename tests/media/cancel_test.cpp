@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Calls that wait for a camera which does not answer, and their cancels.
 #include "vexa/cancel.h"
 

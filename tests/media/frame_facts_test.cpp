@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Facts and counts of streams from a whole camera.
 #include "vexa/frame_facts.h"
 

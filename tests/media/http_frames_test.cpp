@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Frames from HTTP image streams, on connections of the test's own.
 #include <gtest/gtest.h>
 #include <sys/time.h>

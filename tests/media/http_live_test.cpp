@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Frames and sound from the HTTP streams of a virtual camera.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Streams of which packets are lost, sent twice or out of order.
 #include <gtest/gtest.h>
 

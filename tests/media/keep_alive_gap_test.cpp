@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A camera that does not answer its keep-alives, while it streams.
 #include <gtest/gtest.h>
 

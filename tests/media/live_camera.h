@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A virtual camera on an address of its own, and drivers that stream from it.
 #pragma once
 

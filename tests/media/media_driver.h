@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The driver with its streaming members in reach, and a host that takes its frames.
 #pragma once
 

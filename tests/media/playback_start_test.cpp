@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Starting the playback of a recording: what is asked, what a failure leaves.
 #include <gtest/gtest.h>
 

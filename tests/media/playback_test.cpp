@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Recordings played back: what comes out is what was stored, at the times it was stored at.
 #include <gtest/gtest.h>
 

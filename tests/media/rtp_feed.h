@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A driver whose media socket is one end of a pair, and packets that a test sends into the other.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Every operation while memory is short: a call that fails throws nothing and has changed nothing, but for what its row
 // names, as its contract does.
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The equations that hold in every snapshot.
 #pragma once
 

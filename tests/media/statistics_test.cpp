@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a driver's counts are after packets and frames of each fate.
 #include "vexa/statistics.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "vexa/stream_choice.h"
 
 #include <gtest/gtest.h>

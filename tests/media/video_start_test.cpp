@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Starting and stopping video: turns, failures on the way, what is left behind.
 #include <gtest/gtest.h>
 #include <sys/socket.h>

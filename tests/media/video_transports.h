@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The transports of a picture to a host: datagrams, the RTSP connection, an HTTP stream.
 #pragma once
 

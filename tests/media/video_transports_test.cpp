@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Every codec by every transport, from the encoder's pictures to a decoder that is not ours.
 #include "tests/media/video_transports.h"
 

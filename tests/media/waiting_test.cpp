@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Waiting for video: the descriptor, the wait, and a set of drivers.
 #include "vexa/waiting.h"
 

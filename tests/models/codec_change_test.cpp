@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A host that changes codec, size and rate of a running camera through the public interface alone.
 #include <gtest/gtest.h>
 #include <poll.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The driver of a model, and what it answers before any camera is asked.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What is wrong with a profile is named with its file, line and key, and nothing of it is taken.
 #include <gtest/gtest.h>
 

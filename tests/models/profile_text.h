@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A small profile that is right, and changes to it.
 #pragma once
 

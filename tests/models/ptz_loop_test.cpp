@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The closed loop: a driver made for a model moves a camera of that model, and reads where it looks out of its
 // pictures.
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The profiles that come with the library.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

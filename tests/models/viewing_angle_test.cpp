@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Viewing angles of the shipped models over their whole zoom, against exact arithmetic.
 #include <gtest/gtest.h>
 

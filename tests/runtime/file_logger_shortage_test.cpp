@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Log files when memory is short.
 #include <gtest/gtest.h>
 

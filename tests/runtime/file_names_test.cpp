@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Making, moving and removing files and directories by name.
 #include <gtest/gtest.h>
 #include <sys/stat.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The process's time zone, changed for the length of a test.
 #pragma once
 

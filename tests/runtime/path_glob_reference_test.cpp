@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // pathglob beside the C library's glob, on a tree of 10,000 names. The rules agree in the C locale for patterns without
 // "^", "\" and character classes, and with "/" at the end only once, after a "*"; the names and patterns here keep to
 // those.

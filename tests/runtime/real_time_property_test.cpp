@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What holds for times and formats of every kind; RapidCheck chooses them, and shrinks what does not hold.
 #include <gtest/gtest.h>
 #include <rapidcheck.h>

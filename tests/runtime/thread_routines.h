@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Start routines, and watching the threads that run them.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Counts of 100 ns since 1601, and the fields of a system time side by side.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Week numbers found by walking and by the C library, to hold the library's arithmetic against.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A decoder that is not ours, as the last word on pictures.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Descriptors as a host sees them, and a process that has none left.
 #pragma once
 

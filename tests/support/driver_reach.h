@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A driver class with everything in reach that model classes reach.
 #pragma once
 

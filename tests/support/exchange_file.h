@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Exchanges with a camera, one text file each.
 //
 //   timeout 100          settings of the driver, made before

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One exchange file played against one driver.
 #pragma once
 

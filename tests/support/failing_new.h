@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Lets allocations fail. A test program that uses it has its operator new replaced.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Bytes that end right before a page without access, so that a read after them is caught in every build.
 #pragma once
 

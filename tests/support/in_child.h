@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Work done in a process of its own, where limits, users and working folders may be changed.
 #pragma once
 

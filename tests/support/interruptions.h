@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Signals without end for one thread, so that its waits are interrupted again and again.
 #pragma once
 

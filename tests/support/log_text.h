@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What log files hold, with the digits of their times made equal.
 #pragma once
 

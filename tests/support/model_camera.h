@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A camera of a model and the driver made for it, used through the host's interface alone.
 #pragma once
 

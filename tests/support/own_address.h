@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Loopback addresses that no other process of a parallel test run uses.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The state of this process as the system reports it, and waiting for it to change.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // How many pages of a block are in memory.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A camera that sends the answers of a script, and complains when it receives anything else. It shares no code with the
 // library, so that bytes are compared with the script, not with what the library believes.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A camera's end and the driver's end of a connection.
 #pragma once
 

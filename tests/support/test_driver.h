@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The driver with everything in reach that model classes reach, and a camera address set without a log file.
 #pragma once
 

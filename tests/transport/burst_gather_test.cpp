@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "transport/burst_gather.h"
 
 #include <gtest/gtest.h>

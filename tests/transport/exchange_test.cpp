@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Every exchange of tests/data/exchanges, byte for byte, and what the reader of their files takes and refuses.
 #include "tests/support/exchange_run.h"
 

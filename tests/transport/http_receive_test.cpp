@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The reading functions of the HTTP client, on sockets of the test's own.
 #include <gtest/gtest.h>
 #include <sys/socket.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The readers of endless HTTP streams, on connections of the test's own.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A whole stream of H.264 packets inside a connection.
 #include <gtest/gtest.h>
 #include <sys/socket.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Host names while the system's resolver does not answer. It is replaced here by one that answers when a test says so.
 #include "transport/name_lookup.h"
 

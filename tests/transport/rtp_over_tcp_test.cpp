@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // RTP inside the RTSP connection, on connections of the test's own.
 #include <fcntl.h>
 #include <gtest/gtest.h>

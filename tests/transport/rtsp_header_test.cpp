@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The header receive of RTSP answers, look by look.
 #include <gtest/gtest.h>
 #include <sys/socket.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A plain client for tests of the virtual camera: blocking, with a limit on every wait.
 #ifndef TESTS_VIRTUAL_CAMERA_CAMERA_CLIENT_H_
 #define TESTS_VIRTUAL_CAMERA_CAMERA_CLIENT_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A camera that records while its network is away, over real connections.
 #include <gtest/gtest.h>
 

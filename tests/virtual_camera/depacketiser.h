@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Rebuilds pictures from RTP payloads, written from RFC 6184 for the tests alone.
 #ifndef TESTS_VIRTUAL_CAMERA_DEPACKETISER_H_
 #define TESTS_VIRTUAL_CAMERA_DEPACKETISER_H_

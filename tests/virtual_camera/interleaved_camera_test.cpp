@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pictures from the camera inside the RTSP connection.
 #include <gtest/gtest.h>
 

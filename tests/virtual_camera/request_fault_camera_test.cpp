@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Faults on requests, as a host meets them on both ports.
 #include <gtest/gtest.h>
 

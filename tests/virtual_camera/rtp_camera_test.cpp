@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pictures from the camera to a UDP socket.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The camera's RTSP side over real connections.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a camera's HTTP answers are made of: header end, status line, the small header before each picture of a
 // multipart stream, the key=value pairs of an inquiry.
 #pragma once

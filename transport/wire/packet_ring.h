@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The places of datagrams in the packet buffer, and which of them a new one overwrites.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // RTCP packets (RFC 3550, 6.4 and 6.5): sender reports read, receiver reports written.
 #pragma once
 

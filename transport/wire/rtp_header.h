@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What stands before the payload of an RTP packet: the fixed header (RFC 3550, 5.1), and the prefix of a packet inside
 // an RTSP connection (RFC 2326, 10.12).
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "transport/wire/rtsp_answer.h"
 
 #include <ctime>

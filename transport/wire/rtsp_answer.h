@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The values that the driver reads from a camera's RTSP answers and their SDP.
 #pragma once
 

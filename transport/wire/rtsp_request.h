@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The driver's RTSP requests (RFC 2326), byte for byte; cameras depend on their form.
 #pragma once
 

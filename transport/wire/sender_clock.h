@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The sender's clock, out of its RTCP reports.
 #pragma once
 

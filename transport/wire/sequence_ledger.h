@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which sequence numbers of an RTP source have come (RFC 3550, A.1 and A.3).
 #pragma once
 

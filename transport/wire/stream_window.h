@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The bytes of an elementary stream between the socket and the frame cut out of them.
 #pragma once
 

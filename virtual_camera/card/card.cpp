@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "virtual_camera/card/card.h"
 
 #include <fmt/format.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The card in the camera's slot, and the recordings on it.
 #ifndef VIRTUAL_CAMERA_CARD_CARD_H_
 #define VIRTUAL_CAMERA_CARD_CARD_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The pictures of a recording, at the pace and in the direction that a host asks for.
 #ifndef VIRTUAL_CAMERA_CARD_CARD_SOURCE_H_
 #define VIRTUAL_CAMERA_CARD_CARD_SOURCE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Bits put together to bytes, the highest first.
 #ifndef VIRTUAL_CAMERA_CODEC_BIT_WRITER_H_
 #define VIRTUAL_CAMERA_CODEC_BIT_WRITER_H_

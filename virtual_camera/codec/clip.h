@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // An H.264 clip in the byte stream format of ITU-T H.264 Annex B, cut into access units.
 #ifndef VIRTUAL_CAMERA_CODEC_CLIP_H_
 #define VIRTUAL_CAMERA_CODEC_CLIP_H_

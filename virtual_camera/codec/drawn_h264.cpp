@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // H.264, Baseline profile (ITU-T H.264), drawn.
 #include <string>
 

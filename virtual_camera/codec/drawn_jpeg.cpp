@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Baseline JPEG (ITU-T T.81), drawn: each block holds its mean alone.
 #include <array>
 #include <cstdlib>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // MPEG-4 Visual, simple profile (ISO/IEC 14496-2): intra pictures, and predicted ones whose squares stay but for one.
 #include <algorithm>
 #include <cstddef>

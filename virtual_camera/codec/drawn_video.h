@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pictures of any size and rate, drawn without an encoder: squares of one brightness and colour each, of which one
 // changes from picture to picture.
 #ifndef VIRTUAL_CAMERA_CODEC_DRAWN_VIDEO_H_

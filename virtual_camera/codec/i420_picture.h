@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A picture in I420: a plane of brightness, and two of colour at half its sides.
 #ifndef VIRTUAL_CAMERA_CODEC_I420_PICTURE_H_
 #define VIRTUAL_CAMERA_CODEC_I420_PICTURE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the camera's HTTP image streams send: pictures of JPEG, H.264 or MPEG-4, and sound.
 #ifndef VIRTUAL_CAMERA_CODEC_IMAGE_CLIP_H_
 #define VIRTUAL_CAMERA_CODEC_IMAGE_CLIP_H_

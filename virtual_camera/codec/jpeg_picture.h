@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A JPEG file taken apart into what travels over RTP.
 #ifndef VIRTUAL_CAMERA_CODEC_JPEG_PICTURE_H_
 #define VIRTUAL_CAMERA_CODEC_JPEG_PICTURE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pictures to JPEG, MPEG-4 Visual or H.264 as they are made, one access unit a picture.
 #ifndef VIRTUAL_CAMERA_CODEC_LIVE_ENCODER_H_
 #define VIRTUAL_CAMERA_CODEC_LIVE_ENCODER_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // JPEG as RTP payloads (RFC 2435).
 #include <algorithm>
 #include <utility>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pictures as RTP payloads: H.264 as single NAL units and fragmentation units FU-A (RFC 6184), MPEG-4 Visual in pieces
 // (RFC 3016), JPEG as scan data after headers (RFC 2435).
 #ifndef VIRTUAL_CAMERA_CODEC_RTP_PACKETISER_H_

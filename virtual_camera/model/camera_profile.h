@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a camera model can do, as a profile file states it (docs/model_profiles.md).
 #ifndef VIRTUAL_CAMERA_MODEL_CAMERA_PROFILE_H_
 #define VIRTUAL_CAMERA_MODEL_CAMERA_PROFILE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "virtual_camera/model/setting_rules.h"
 
 #include <fmt/format.h>

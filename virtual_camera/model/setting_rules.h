@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which settings a camera of a profile has, and which values they take.
 #ifndef VIRTUAL_CAMERA_MODEL_SETTING_RULES_H_
 #define VIRTUAL_CAMERA_MODEL_SETTING_RULES_H_

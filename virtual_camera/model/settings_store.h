@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The camera's settings: sections of key=value pairs, read by inquiries and changed by commands.
 #ifndef VIRTUAL_CAMERA_MODEL_SETTINGS_STORE_H_
 #define VIRTUAL_CAMERA_MODEL_SETTINGS_STORE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The command line of vexa-camera.
 #ifndef VIRTUAL_CAMERA_PROGRAM_COMMAND_LINE_H_
 #define VIRTUAL_CAMERA_PROGRAM_COMMAND_LINE_H_

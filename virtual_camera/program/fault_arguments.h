@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Faults as they are written on the command line.
 #ifndef VIRTUAL_CAMERA_PROGRAM_FAULT_ARGUMENTS_H_
 #define VIRTUAL_CAMERA_PROGRAM_FAULT_ARGUMENTS_H_

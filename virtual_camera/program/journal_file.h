@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A journal as a file: one JSON object a line.
 #ifndef VIRTUAL_CAMERA_PROGRAM_JOURNAL_FILE_H_
 #define VIRTUAL_CAMERA_PROGRAM_JOURNAL_FILE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // vexa-camera: virtual cameras as a program.
 #include <fmt/format.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The direction of a camera, and how its pictures report it.
 #ifndef VIRTUAL_CAMERA_PTZ_CAMERA_POSE_H_
 #define VIRTUAL_CAMERA_PTZ_CAMERA_POSE_H_

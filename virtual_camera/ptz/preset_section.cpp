@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "virtual_camera/ptz/preset_section.h"
 
 #include <fmt/format.h>

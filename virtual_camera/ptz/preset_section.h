@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a camera keeps of presets, camera tours and shadow tours, and how its commands and inquiries write it.
 #ifndef VIRTUAL_CAMERA_PTZ_PRESET_SECTION_H_
 #define VIRTUAL_CAMERA_PTZ_PRESET_SECTION_H_

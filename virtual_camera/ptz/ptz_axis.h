@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One motor: runs and goes to places with limits, a greatest speed and inertia. Knows no clock: times are seconds that
 // the caller counts, and never fall from one order to the next.
 #ifndef VIRTUAL_CAMERA_PTZ_PTZ_AXIS_H_

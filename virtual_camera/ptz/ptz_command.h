@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The commands that move a camera, read from the texts of requests.
 #ifndef VIRTUAL_CAMERA_PTZ_PTZ_COMMAND_H_
 #define VIRTUAL_CAMERA_PTZ_PTZ_COMMAND_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A camera's moving head: its motors, presets and tours on one clock, and its direction at any time. There is no
 // timer: what tours have done meanwhile is caught up with whenever somebody asks.
 #ifndef VIRTUAL_CAMERA_PTZ_PTZ_HEAD_H_

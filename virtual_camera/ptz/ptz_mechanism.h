@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The motors of a camera that moves: pan, tilt, zoom and focus of a model, in the camera's units, on a clock that the
 // caller counts in seconds.
 #ifndef VIRTUAL_CAMERA_PTZ_PTZ_MECHANISM_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Sends many datagrams with few system calls, and notes what became of each.
 #ifndef VIRTUAL_CAMERA_RTP_DATAGRAM_BATCH_H_
 #define VIRTUAL_CAMERA_RTP_DATAGRAM_BATCH_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // RTP packets between the answers on an RTSP connection, each after "$", its channel and its length (RFC 2326, 10.12).
 #ifndef VIRTUAL_CAMERA_RTP_INTERLEAVED_LANE_H_
 #define VIRTUAL_CAMERA_RTP_INTERLEAVED_LANE_H_

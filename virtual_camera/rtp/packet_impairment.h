@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A bad network between a camera's RTP stream and its socket: packets are lost, late, repeated, reordered, damaged.
 #ifndef VIRTUAL_CAMERA_RTP_PACKET_IMPAIRMENT_H_
 #define VIRTUAL_CAMERA_RTP_PACKET_IMPAIRMENT_H_

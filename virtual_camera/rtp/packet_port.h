@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Where a session's RTP packets leave the camera.
 #ifndef VIRTUAL_CAMERA_RTP_PACKET_PORT_H_
 #define VIRTUAL_CAMERA_RTP_PACKET_PORT_H_

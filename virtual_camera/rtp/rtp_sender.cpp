@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "virtual_camera/rtp/rtp_sender.h"
 
 #include <algorithm>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Sends one session's RTP stream through its port at the pace of the pictures, by an absolute schedule.
 #ifndef VIRTUAL_CAMERA_RTP_RTP_SENDER_H_
 #define VIRTUAL_CAMERA_RTP_RTP_SENDER_H_

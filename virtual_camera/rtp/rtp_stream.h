@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The RTP packets of an endless (or ended) run of pictures: sequence numbers, timestamps, markers (RFC 3550).
 #ifndef VIRTUAL_CAMERA_RTP_RTP_STREAM_H_
 #define VIRTUAL_CAMERA_RTP_RTP_STREAM_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Writes a stream's sender reports (RFC 3550, 6.4.1).
 #ifndef VIRTUAL_CAMERA_RTP_SENDER_REPORT_H_
 #define VIRTUAL_CAMERA_RTP_SENDER_REPORT_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a virtual camera really put on the wire: every RTP datagram in order, and the ones it dropped on purpose.
 #ifndef VIRTUAL_CAMERA_RTP_SENT_LOG_H_
 #define VIRTUAL_CAMERA_RTP_SENT_LOG_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // RTP packets as datagrams from a port of the session's own.
 #ifndef VIRTUAL_CAMERA_RTP_UDP_PORT_H_
 #define VIRTUAL_CAMERA_RTP_UDP_PORT_H_

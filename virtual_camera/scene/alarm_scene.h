@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What happens around the camera: contacts that close, a covered lens, noise, something that moves. It makes the parts
 // of the alarm-data and motion-metadata streams.
 #ifndef VIRTUAL_CAMERA_SCENE_ALARM_SCENE_H_

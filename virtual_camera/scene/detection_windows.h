@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The areas of the picture in which a camera watches for movement, and who is seen in them.
 #ifndef VIRTUAL_CAMERA_SCENE_DETECTION_WINDOWS_H_
 #define VIRTUAL_CAMERA_SCENE_DETECTION_WINDOWS_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a running camera sees at a moment.
 #ifndef VIRTUAL_CAMERA_SCENE_LIVE_SCENE_H_
 #define VIRTUAL_CAMERA_SCENE_LIVE_SCENE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a camera sees: a panorama with a compass scale, the marks of its presets, a clock, and what happens there.
 #ifndef VIRTUAL_CAMERA_SCENE_SCENE_H_
 #define VIRTUAL_CAMERA_SCENE_SCENE_H_

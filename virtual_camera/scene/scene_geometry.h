@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which direction of the scene falls where in a picture: the scene is a panorama, unrolled, so that degrees are equally
 // long everywhere. Pure functions of the pose.
 #ifndef VIRTUAL_CAMERA_SCENE_SCENE_GEOMETRY_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Rectangles and letters in a picture, clipped at its edges.
 #ifndef VIRTUAL_CAMERA_SCENE_SCENE_PAINTER_H_
 #define VIRTUAL_CAMERA_SCENE_SCENE_PAINTER_H_

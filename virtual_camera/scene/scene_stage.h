@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Who is about in the scene that a camera sees.
 #ifndef VIRTUAL_CAMERA_SCENE_SCENE_STAGE_H_
 #define VIRTUAL_CAMERA_SCENE_SCENE_STAGE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The port by which a person or a test makes things happen around a camera, on the loopback address alone:
 //   GET /contact/NUMBER/close or open, /lens/cover or free, /noise/on or off, /motion/WINDOW/VALUE,
 //   /walk, /walk/SECONDS, /network/unplug or plug

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The streams of alarm data and motion metadata as the body of an HTTP answer: a part at each interval and, of alarm
 // data, one at each change.
 #ifndef VIRTUAL_CAMERA_SERVER_ALARM_FEED_H_

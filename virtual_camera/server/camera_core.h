@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A running camera: its two ports, its sessions, its life cycle. Lives on the loop's thread.
 #ifndef VIRTUAL_CAMERA_SERVER_CAMERA_CORE_H_
 #define VIRTUAL_CAMERA_SERVER_CAMERA_CORE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the connections of one camera share.
 #ifndef VIRTUAL_CAMERA_SERVER_CAMERA_STATE_H_
 #define VIRTUAL_CAMERA_SERVER_CAMERA_STATE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "virtual_camera/server/card_recorder.h"
 
 #include <asio/io_context.hpp>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Records one of the camera's video streams on the card while the network is away.
 #ifndef VIRTUAL_CAMERA_SERVER_CARD_RECORDER_H_
 #define VIRTUAL_CAMERA_SERVER_CARD_RECORDER_H_

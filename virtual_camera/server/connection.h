@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One TCP connection to the camera: it reads requests, lets a subclass answer, journals both, and sends the answer the
 // way the faults say.
 #ifndef VIRTUAL_CAMERA_SERVER_CONNECTION_H_

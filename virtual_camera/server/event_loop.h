@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One thread that serves any number of cameras.
 #ifndef VIRTUAL_CAMERA_SERVER_EVENT_LOOP_H_
 #define VIRTUAL_CAMERA_SERVER_EVENT_LOOP_H_

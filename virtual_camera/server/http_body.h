@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The body of an HTTP answer that goes on after its head: pictures, sound or alarms.
 #ifndef VIRTUAL_CAMERA_SERVER_HTTP_BODY_H_
 #define VIRTUAL_CAMERA_SERVER_HTTP_BODY_H_

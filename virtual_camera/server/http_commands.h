@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The HTTP commands of a running camera, and what it keeps elsewhere and hosts read or change as settings.
 #ifndef VIRTUAL_CAMERA_SERVER_HTTP_COMMANDS_H_
 #define VIRTUAL_CAMERA_SERVER_HTTP_COMMANDS_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The camera's HTTP side: one request, one answer, then the connection ends. The answer may be a stream without end.
 #ifndef VIRTUAL_CAMERA_SERVER_HTTP_CONNECTION_H_
 #define VIRTUAL_CAMERA_SERVER_HTTP_CONNECTION_H_

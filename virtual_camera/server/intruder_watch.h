@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Walks an intruder through the scene and sets off the detection windows in which the camera sees the figure.
 #ifndef VIRTUAL_CAMERA_SERVER_INTRUDER_WATCH_H_
 #define VIRTUAL_CAMERA_SERVER_INTRUDER_WATCH_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a virtual camera was asked: every request, byte for byte, in the order of arrival.
 #ifndef VIRTUAL_CAMERA_SERVER_JOURNAL_H_
 #define VIRTUAL_CAMERA_SERVER_JOURNAL_H_

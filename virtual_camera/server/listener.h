@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One listening port of the camera.
 #ifndef VIRTUAL_CAMERA_SERVER_LISTENER_H_
 #define VIRTUAL_CAMERA_SERVER_LISTENER_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // "/imageN" and "/audio": a stream of pictures or sound as the body of an HTTP answer.
 #ifndef VIRTUAL_CAMERA_SERVER_MEDIA_STREAM_H_
 #define VIRTUAL_CAMERA_SERVER_MEDIA_STREAM_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The packet faults of the sessions to come.
 #ifndef VIRTUAL_CAMERA_SERVER_PACKET_FAULT_BOX_H_
 #define VIRTUAL_CAMERA_SERVER_PACKET_FAULT_BOX_H_

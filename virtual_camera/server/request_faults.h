@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which request meets which fault, and what a fault does to the sending of an answer.
 #ifndef VIRTUAL_CAMERA_SERVER_REQUEST_FAULTS_H_
 #define VIRTUAL_CAMERA_SERVER_REQUEST_FAULTS_H_

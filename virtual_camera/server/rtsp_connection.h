@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The camera's RTSP side. Sessions belong to the connection that set them up and end with it.
 #ifndef VIRTUAL_CAMERA_SERVER_RTSP_CONNECTION_H_
 #define VIRTUAL_CAMERA_SERVER_RTSP_CONNECTION_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One RTSP session: its number, its sender, and its end when the host falls silent.
 #ifndef VIRTUAL_CAMERA_SERVER_RTSP_SESSION_H_
 #define VIRTUAL_CAMERA_SERVER_RTSP_SESSION_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The pictures of a clip, at a steady rate.
 #ifndef VIRTUAL_CAMERA_SOURCE_CLIP_SOURCE_H_
 #define VIRTUAL_CAMERA_SOURCE_CLIP_SOURCE_H_

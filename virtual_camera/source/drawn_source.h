@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Drawn pictures (codec/drawn_video.h) as a source of a stream.
 #ifndef VIRTUAL_CAMERA_SOURCE_DRAWN_SOURCE_H_
 #define VIRTUAL_CAMERA_SOURCE_DRAWN_SOURCE_H_

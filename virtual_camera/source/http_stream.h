@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // An endless HTTP answer as a sequence of pieces, each with its time: video as multipart JPEG or as an elementary
 // stream, or sound; with its faults. Knows no socket and no clock.
 #ifndef VIRTUAL_CAMERA_SOURCE_HTTP_STREAM_H_

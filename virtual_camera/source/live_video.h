@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pictures made from life: painted and encoded at the stream's pace, on a thread of their own, for all who watch.
 #ifndef VIRTUAL_CAMERA_SOURCE_LIVE_VIDEO_H_
 #define VIRTUAL_CAMERA_SOURCE_LIVE_VIDEO_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Where the pictures of a stream come from: a clip, a drawing, a scene, a card.
 #ifndef VIRTUAL_CAMERA_SOURCE_PICTURE_SOURCE_H_
 #define VIRTUAL_CAMERA_SOURCE_PICTURE_SOURCE_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Where the pictures of each video stream come from under the camera's present settings.
 #ifndef VIRTUAL_CAMERA_SOURCE_STREAM_SOURCES_H_
 #define VIRTUAL_CAMERA_SOURCE_STREAM_SOURCES_H_

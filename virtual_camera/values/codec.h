@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The codecs of pictures, and the camera's words for them in its settings.
 #ifndef VIRTUAL_CAMERA_VALUES_CODEC_H_
 #define VIRTUAL_CAMERA_VALUES_CODEC_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The faults that a virtual camera can show, as plain values.
 #ifndef VIRTUAL_CAMERA_VALUES_FAULTS_H_
 #define VIRTUAL_CAMERA_VALUES_FAULTS_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Numbers in texts.
 #ifndef VIRTUAL_CAMERA_VALUES_NUMBER_TEXT_H_
 #define VIRTUAL_CAMERA_VALUES_NUMBER_TEXT_H_

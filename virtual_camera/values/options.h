@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The options of one virtual camera, set before it starts.
 #ifndef VIRTUAL_CAMERA_VALUES_OPTIONS_H_
 #define VIRTUAL_CAMERA_VALUES_OPTIONS_H_

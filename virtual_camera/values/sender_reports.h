@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The RTCP sender reports of a virtual camera, and what its clock does in them.
 #ifndef VIRTUAL_CAMERA_VALUES_SENDER_REPORTS_H_
 #define VIRTUAL_CAMERA_VALUES_SENDER_REPORTS_H_

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // HTTP (RFC 1945) as the camera reads and writes it: request heads, answers, Basic credentials, percent-encoded texts
 // (RFC 3986, 2.1).
 #ifndef VIRTUAL_CAMERA_WIRE_MESSAGE_H_

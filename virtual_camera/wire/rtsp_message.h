@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // RTSP (RFC 2326) texts: what the camera reads from requests and how its answers look.
 #ifndef VIRTUAL_CAMERA_WIRE_RTSP_MESSAGE_H_
 #define VIRTUAL_CAMERA_WIRE_RTSP_MESSAGE_H_

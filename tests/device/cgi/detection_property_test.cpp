@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Detection settings of every kind: what is sent reads back as it was.
 #include <gtest/gtest.h>
 #include <rapidcheck.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Positions as angles and viewing angles, against exact arithmetic.
 #include "device/cgi/position_text.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The camera's texts of video settings.
 #include "device/cgi/video_text.h"
 

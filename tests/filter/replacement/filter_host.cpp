@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A host that prints what its driver offers after each property it sets, or after each answer of a camera that it is
 // given on its command line.
 #include <climits>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A host's own filter library: it offers back what it was asked, one codec for each question.
 #include <string>
 #include <utility>

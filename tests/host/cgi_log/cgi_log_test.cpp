@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The CGI log read back: lines, banners, and what belongs together.
 #include "host/cgi_log/cgi_log.h"
 

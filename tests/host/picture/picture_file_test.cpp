@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pictures decoded from video and written as files.
 #include "host/picture/picture_file.h"
 

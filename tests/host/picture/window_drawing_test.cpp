@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Detection windows drawn on a picture.
 #include "host/picture/picture.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Containers, read back by programs that are not ours.
 #include "host/recording/media_container.h"
 

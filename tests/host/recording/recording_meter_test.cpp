@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "host/recording/recording_meter.h"
 
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Degrees and magnifications in the driver's scales.
 #include "host/words/ptz_scale.h"
 

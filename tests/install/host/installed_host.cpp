@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Uses the installed library as a host does: constructs drivers, derives a model class, finds a runtime function by
 // name.
 #include <dlfcn.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "media/assembly/rtp_pictures.h"
 
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Packets over bytes of their own, each allocated to its exact length.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "media/assembly/picture_clock.h"
 
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "media/assembly/queue_policy.h"
 
 #include <gtest/gtest.h>

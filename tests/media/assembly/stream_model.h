@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A made-up H.264 stream, cut into packets, for tests of the collection: no socket and no clock.
 #pragma once
 

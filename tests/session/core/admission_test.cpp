@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // How many sessions connect at once.
 #include "session/core/admission.h"
 

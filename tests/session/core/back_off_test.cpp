@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The waits between a session's attempts.
 #include "session/core/back_off.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Refused credentials, and a camera that locks an account.
 #include "session/core/credential_breaker.h"
 

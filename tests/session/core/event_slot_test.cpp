@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Events for a host that may be slow.
 #include "session/core/event_slot.h"
 

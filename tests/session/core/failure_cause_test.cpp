@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Causes from codes and texts, and sentences for people.
 #include "session/core/failure_cause.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The states of a session.
 #include "session/core/session_machine.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The card, its recordings, and what hosts ask of it, without a camera around.
 #include "virtual_camera/card/card.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "virtual_camera/codec/drawn_video.h"
 
 #include <gtest/gtest.h>

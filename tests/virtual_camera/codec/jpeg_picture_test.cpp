@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "virtual_camera/codec/jpeg_picture.h"
 
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pictures as they come out of the encoder, decoded by decoders that are not ours.
 #include <gtest/gtest.h>
 // Needs <cstdio> before it.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "virtual_camera/codec/rtp_packetiser.h"
 
 #include <gtest/gtest.h>

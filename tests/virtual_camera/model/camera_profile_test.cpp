@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A camera that follows a profile: what it reads of the file, and which settings it has and takes.
 #include "virtual_camera/model/camera_profile.h"
 

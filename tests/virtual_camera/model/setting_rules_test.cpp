@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The settings of a model that exists nowhere: small, so that each rule shows.
 #include "virtual_camera/model/setting_rules.h"
 

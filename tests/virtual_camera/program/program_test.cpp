@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The program vexa-camera: its command line, and one run from start to Ctrl-C.
 #include <gtest/gtest.h>
 #include <signal.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a camera keeps of presets and tours, without a head that moves.
 #include "virtual_camera/ptz/preset_section.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One motor on a clock that the test counts.
 #include "virtual_camera/ptz/ptz_axis.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Requests that move a camera, as texts and what the motors make of them.
 #include "virtual_camera/ptz/ptz_command.h"
 

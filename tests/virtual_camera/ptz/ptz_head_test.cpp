@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A moving head on a clock that the test sets: its reports, presets, tours.
 #include "virtual_camera/ptz/ptz_head.h"
 #include "virtual_camera/wire/message.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Four motors in a camera's units, on a clock that the test counts.
 #include "virtual_camera/ptz/ptz_mechanism.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Moving camera models of tests.
 #ifndef TESTS_VIRTUAL_CAMERA_PTZ_MODELS_H_
 #define TESTS_VIRTUAL_CAMERA_PTZ_MODELS_H_

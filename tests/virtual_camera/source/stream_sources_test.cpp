@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the streams of a camera send as they are set.
 #include "virtual_camera/source/stream_sources.h"
 
