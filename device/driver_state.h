@@ -2,6 +2,7 @@
 #pragma once
 
 #include <atomic>
+#include <cstdint>
 #include <ctime>
 #include <deque>
 #include <memory>
@@ -72,6 +73,7 @@ struct DriverState {
   std::unique_ptr<FrameChronicle> chronicle;  ///< as `ledger`; never null
   std::atomic<bool> strict_reception{false};  ///< any thread's
   QueuedFacts ready_frame;                    ///< assembled and on its way to the queue; as `ledger`
+  std::size_t stream_part = SIZE_MAX;         ///< bytes in use at the start of m_StreamBuffer; the streaming thread's
   FrameStore spare_frames VEXA_GUARDED_BY(driver.m_FrameQueueLock);
   QueueCounts queue VEXA_GUARDED_BY(driver.m_FrameQueueLock);
   LostFrames lost_before_next VEXA_GUARDED_BY(driver.m_FrameQueueLock);           ///< of the next frame to be queued
@@ -158,7 +160,7 @@ struct DriverState {
   ELibDReturnCode read_elementary_frame(CVexaCommon::VideoFrameInfo& frame, const Codec& codec, int& received);
   bool reset_stream_buffer();
   void release_stream_buffer();
-  StreamWindow stream_window();
+  StreamWindow stream_window(std::size_t* part = nullptr);
   /// Looks for the camera's position in the whole data; true when it is there and stored.
   bool store_position(Bytes data);
 
@@ -191,8 +193,6 @@ struct DriverState {
   /// Makes `stream` the one that is played, with what the answer says of it.
   ELibDReturnCode choose_stream(const std::string& answer, int stream);
   void read_video_ports(const std::string& answer) VEXA_REQUIRES(driver.m_ConnectionLock);
-  /// Offers what the filter leaves.
-  void offer_filtered() VEXA_REQUIRES(driver.m_ConnectionLock);
   void filter_by(const char* item, const std::string& value);
 
   // Alarms; any thread: device/alarm_io.cpp

@@ -54,7 +54,7 @@ ELibDReturnCode CVexaCommon::SetEdgeStorageMode(const SLibDEdgeStorageMode& mode
   // Kept: a card that cannot be asked for its space counts as one with room.
   const ELibDReturnCode result = CheckEdgeStorageFreeSize() == 0 ? LIBD_NO_FRAME : LIBD_OK;
   m_State->camera.send("/command/camera.cgi?RTPUserData=on");
-  return result;
+  return operation.returns(result);
 }
 
 ELibDReturnCode CVexaCommon::GetEdgeStorageRecordList(SLibDEdgeStorageRecordList& list) {

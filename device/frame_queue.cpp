@@ -157,7 +157,7 @@ ELibDReturnCode DriverState::take_oldest_frame(SLibDVideoFrameInfo& frame, Frame
 void DriverState::note_video() { readiness.set_video(!driver.m_FrameQueue.empty() || driver.m_VideoTimedOut); }
 
 void DriverState::free_frame(CVexaCommon::VideoFrameInfo& frame) {
-  spare_frames.give_back(frame.data, frame.capacity);
+  spare_frames.give_back(frame.data, frame.capacity, frame.length);
   frame.data = nullptr;
 }
 

@@ -14,6 +14,8 @@ namespace {
 
 /// Twice the largest frame and more, so that an unfinished frame is seldom moved.
 constexpr std::size_t kStreamBuffer = std::size_t{4} << 20;
+/// What a stream of small pictures uses of it: two pictures or so, and what is read at a time.
+constexpr std::size_t kFirstStreamPart = std::size_t{192} << 10;
 
 void stamp_now(CVexaCommon::VideoFrameInfo& frame) {
   timeval now{};
@@ -83,6 +85,7 @@ namespace vexa {
 bool DriverState::reset_stream_buffer() {
   if (driver.m_StreamBuffer == nullptr) driver.m_StreamBuffer = new (std::nothrow) unsigned char[kStreamBuffer];
   driver.m_StreamBufferSize = driver.m_StreamBuffer == nullptr ? 0 : kStreamBuffer;
+  stream_part = kFirstStreamPart;
   driver.m_StreamFrameStart = driver.m_StreamSearchPos = driver.m_StreamWriteEnd = driver.m_StreamBuffer;
   return driver.m_StreamBuffer != nullptr;
 }
@@ -93,9 +96,10 @@ void DriverState::release_stream_buffer() {
   driver.m_StreamFrameStart = driver.m_StreamSearchPos = driver.m_StreamWriteEnd = nullptr;
 }
 
-StreamWindow DriverState::stream_window() {
+StreamWindow DriverState::stream_window(std::size_t* part) {
   return {{driver.m_StreamBuffer, driver.m_StreamBufferSize},
-          {driver.m_StreamFrameStart, driver.m_StreamSearchPos, driver.m_StreamWriteEnd}};
+          {driver.m_StreamFrameStart, driver.m_StreamSearchPos, driver.m_StreamWriteEnd},
+          part};
 }
 
 void DriverState::part_is_ready(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec) {
@@ -124,7 +128,7 @@ ELibDReturnCode DriverState::read_elementary_frame(CVexaCommon::VideoFrameInfo& 
   frame.frameType = VIDEO_FRAME_INVALID;
   frame.length = 0;
   begin_frame();
-  StreamWindow window = stream_window();
+  StreamWindow window = stream_window(&stream_part);
   const StoppableSocket source = stream_source();
   const auto user_data = [this](Bytes text) {
     driver.GetUserDataFromStream(text.data(), static_cast<unsigned int>(text.size()));

@@ -1,5 +1,6 @@
 // Video settings of one stream, and the codecs and sizes that the camera's properties leave.
 #include <utility>
+#include <vector>
 
 #include "device/cgi/video_text.h"
 #include "device/driver_state.h"
@@ -92,14 +93,16 @@ void DriverState::read_camera_answer(const std::string& answer, SLibDCameraInfo&
   }
   if (changed) driver.InitializeFixedVideoParams(standard, width, height);
   const Guard guard(driver.m_ConnectionLock);
-  if (changed) offer_filtered();
-  offer_is_stale = false;
+  std::vector<SLibDVideoCodecInfo> offer;
+  if (changed) driver.m_ResolutionFilter.GetFilteredResolutionList(offer);
   Undo change(driver.m_CameraInfo);
   read_stream_settings(answer, info.streamNumber);
   read_video_ports(answer);
   // Kept: the record comes back whole, the driver's stream number with it; hosts set the number before each call.
   put_whole(info, driver.m_CameraInfo);
   change.keep();
+  if (changed) driver.m_FixedCameraInfo.codecs.swap(offer);
+  offer_is_stale = false;
 }
 
 bool DriverState::read_camera_properties(const std::string& answer) {
@@ -158,13 +161,9 @@ void DriverState::filter_by(const char* item, const std::string& value) {
   const Guard guard(driver.m_ConnectionLock);
   driver.m_ResolutionFilter.Initialize(driver.m_FixedSystemInfo.modelName);
   driver.m_ResolutionFilter.SetFilterItemCriteria(item, value);
-  offer_filtered();
-}
-
-void DriverState::offer_filtered() {
-  std::vector<SLibDVideoCodecInfo> left;
-  driver.m_ResolutionFilter.GetFilteredResolutionList(left);
-  driver.m_FixedCameraInfo.codecs.swap(left);
+  std::vector<SLibDVideoCodecInfo> offer;
+  driver.m_ResolutionFilter.GetFilteredResolutionList(offer);
+  driver.m_FixedCameraInfo.codecs.swap(offer);
 }
 
 }  // namespace vexa

@@ -1,7 +1,6 @@
 // Starting and stopping video, and the thread between.
-#include <unistd.h>
-
 #include <cerrno>
+#include <chrono>
 #include <cstdlib>
 #include <utility>
 
@@ -9,6 +8,8 @@
 #include "media/assembly/codec.h"
 #include "media/frame_chronicle.h"
 #include "runtime/base/text.h"
+#include "runtime/handle.h"
+#include "runtime/pages.h"
 #include "transport/failure.h"
 #include "transport/wire/http_request.h"
 #include "vexa/runtime.h"
@@ -20,8 +21,8 @@ constexpr unsigned int kLargeFrameCapacity = 2000000;
 constexpr int kRtspPort = 554;
 constexpr std::size_t kPathRoom = 260;  // of a session's path, the terminator among it
 constexpr int kRtspTransport = 1;
-constexpr int kOpenTimeout = 40000;       // milliseconds
-constexpr useconds_t kExitPoll = 100000;  // microseconds
+constexpr int kOpenTimeout = 40000;  // milliseconds
+constexpr std::chrono::milliseconds kExitPoll{100};
 
 }  // namespace
 
@@ -152,7 +153,8 @@ ELibDReturnCode DriverState::start_thread(const std::string& codec) {
     // Kept: the staging buffer is allocated and zeroed although no line here reads it; model classes may use it.
     delete[] std::exchange(driver.m_StagingBuffer, nullptr);
     driver.m_StagingBufferSize = driver.m_LargeFrameBuffers ? kLargeFrameCapacity : kFrameCapacity;
-    driver.m_StagingBuffer = new unsigned char[driver.m_StagingBufferSize]();
+    driver.m_StagingBuffer = new unsigned char[driver.m_StagingBufferSize];
+    clear_untouched({driver.m_StagingBuffer, driver.m_StagingBufferSize});
   }
   driver.m_StreamingThread = _beginthreadex(nullptr, 0, CVexaCommon::StreamingThread, &driver, 0, nullptr);
   return driver.m_StreamingThread != nullptr ? LIBD_OK : abandon_start(EAGAIN);
@@ -194,7 +196,9 @@ ELibDReturnCode DriverState::nothing_yet() {
 void DriverState::end_thread() {
   SetEvent(driver.m_StopVideoEvent);
   unsigned long code = 0;
-  while (GetExitCodeThread(driver.m_StreamingThread, &code) != 0 && code == STILL_ACTIVE) usleep(kExitPoll);
+  while (GetExitCodeThread(driver.m_StreamingThread, &code) != 0 && code == STILL_ACTIVE) {
+    wait_for_thread_end(driver.m_StreamingThread, kExitPoll);
+  }
   ResetEvent(driver.m_StopVideoEvent);
   if (driver.m_StreamingThread != nullptr) CloseHandle(driver.m_StreamingThread);
   driver.m_StreamingThread = nullptr;

@@ -2,9 +2,11 @@
 
 #include <algorithm>
 #include <chrono>
+#include <span>
 #include <utility>
 
 #include "runtime/base/deadline.h"
+#include "runtime/pages.h"
 #include "transport/http_stream.h"
 #include "transport/rtp_socket.h"
 #include "transport/wait_budget.h"
@@ -22,8 +24,9 @@ constexpr std::chrono::milliseconds kLeastReading{100};
 
 Result<std::optional<PacketRunPlace>> PictureReader::next() {
   ledger_.use_socket(source_.socket.socket);
-  chronicle_.tend_control(source_.clock_rate, Clock::now());
-  const auto give_up = Clock::now() + std::max(std::chrono::milliseconds(source_.timeout), kLeastReading);
+  const auto begin = Clock::now();
+  chronicle_.tend_control(source_.clock_rate, begin);
+  const auto give_up = begin + std::max(std::chrono::milliseconds(source_.timeout), kLeastReading);
   for (;;) {
     const auto now = Clock::now();
     if (const auto place = rtp_.collector.next_picture(now)) return place;
@@ -32,6 +35,7 @@ Result<std::optional<PacketRunPlace>> PictureReader::next() {
     const auto deadline = rtp_.collector.deadline();
     int until_look = deadline ? milliseconds_until(*deadline) : source_.timeout;
     if (source_.errand) until_look = std::min(until_look, std::max(milliseconds_until(source_.errand->deadline), 0));
+    if (until_look < source_.timeout) ledger_.about_to_wait();
     // The collector has to be asked again before the read would time out: that is no silence of the camera.
     if (until_look < source_.timeout && !packet_waits(until_look)) {
       if (errand_is_due()) return std::optional<PacketRunPlace>();
@@ -66,8 +70,17 @@ bool PictureReader::errand_is_due() const {
   return Clock::now() >= deadline || (descriptor >= 0 && WaitBudget(0).wait_readable(descriptor) != 0);
 }
 
+void PictureReader::restart_ring() {
+  const std::size_t reach = rtp_.ring.reach();
+  rtp_.ring.restart();
+  if (reach == 0) return;
+  if (const auto needed = rtp_.buffer_need.used(reach)) {
+    give_pages_back(std::span(source_.buffer, PacketRing::kSize).subspan(*needed));
+  }
+}
+
 Result<int> PictureReader::receive(int timeout) {
-  if (rtp_.collector.is_empty()) rtp_.ring.restart();
+  if (rtp_.collector.is_empty()) restart_ring();
   auto* place = reinterpret_cast<char*>(source_.buffer + rtp_.ring.next_offset());
   SPacketInfo packet;
   std::uint32_t sender = 0;
@@ -103,6 +116,7 @@ void PictureReader::take(const SPacketInfo& packet, const Datagram& datagram) {
   if (!rtp_.takes(packet)) return ledger_.refuse(StreamLedger::Refusal::kWrongPayloadType);
   ledger_.media(packet.timestamp, source_.clock_rate, datagram.arrival);
   chronicle_.arrived(packet, source_.socket.socket, datagram.arrival);
+  if (packet.marker) rtp_.gather.picture_ended();
   // The ring keeps its bytes before it is listed: should memory run out in between, it is lost like one on the wire.
   rtp_.ring.keep(packet);
   const std::uint64_t restarts = rtp_.collector.counts().restarts;

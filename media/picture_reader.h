@@ -51,6 +51,7 @@ class PictureReader {
 
  private:
   Result<int> receive(int timeout);
+  void restart_ring();
   struct Datagram {
     std::uint32_t length;
     std::uint32_t sender;  ///< with strict reception alone

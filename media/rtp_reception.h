@@ -7,6 +7,7 @@
 
 #include "media/assembly/codec.h"
 #include "media/assembly/packet_collector.h"
+#include "runtime/base/recent_need.h"
 #include "transport/burst_gather.h"
 #include "transport/wire/packet_ring.h"
 
@@ -35,6 +36,7 @@ struct RtpReception {
 
   const Codec& codec;
   PacketRing ring;
+  RecentNeed buffer_need;  // of the packet buffer
   PacketCollector collector;
   BurstGather gather;
   std::vector<PacketRing::Slot> overwritten;  // room for all that one packet can overwrite

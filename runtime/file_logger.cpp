@@ -107,11 +107,9 @@ CFileLogger::~CFileLogger() { CloseFile(); }
 
 void CFileLogger::SetFileName(const char* name) {
   if (name == nullptr || *name == '\0') return;
-  // Without memory the name stays, as everything does that a logger cannot do.
-  (void)vexa::within_memory([&] {
-    const vexa::Guard guard(m_FileListLock);
-    m_FileName = name;
-  });
+  const vexa::Guard guard(m_FileListLock);
+  // Safe: without memory for its name a logger opens no file, rather than the one of its former name.
+  if (!vexa::within_memory([&] { m_FileName = name; })) m_FileName.clear();
 }
 
 // Safe: the lock is held from leaving the old file to having the new one, so that a thread that logs or opens meanwhile

@@ -3,6 +3,7 @@
 
 #include <pthread.h>
 
+#include <chrono>
 #include <cstddef>
 #include <cstdint>
 #include <new>
@@ -17,7 +18,8 @@ struct _windowsThreadHandle : typedHandle {
   pthread_t id = 0;
   std::uint32_t exit_code = STILL_ACTIVE;
   bool closed = false;
-  bool finished = false;  // the routine is done, whatever its exit code
+  bool finished = false;                            // the routine is done, whatever its exit code
+  pthread_cond_t ended = PTHREAD_COND_INITIALIZER;  // `finished` has become true
 };
 
 namespace vexa {
@@ -58,6 +60,10 @@ Record* new_record() {
   if (record != nullptr) record->kind = Record::kKind;
   return record;
 }
+
+/// Waits until the routine of a thread started by _beginthreadex is done, `longest` at most; all of that when it was
+/// done before. The handle must stay open meanwhile.
+void wait_for_thread_end(typedHandle* h, std::chrono::milliseconds longest);
 
 /// As record_of<FileHandle>; a refusal is reported on standard error.
 FileHandle* check_file_handle(typedHandle* h);

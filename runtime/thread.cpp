@@ -2,7 +2,9 @@
 #include <limits.h>
 #include <pthread.h>
 
+#include <chrono>
 #include <cstddef>
+#include <ctime>
 #include <map>
 #include <memory>
 #include <new>
@@ -23,6 +25,10 @@ class VEXA_LOCK ThreadLock {
  public:
   void lock() VEXA_ACQUIRE() { pthread_mutex_lock(&mutex_); }
   void unlock() VEXA_RELEASE() { pthread_mutex_unlock(&mutex_); }
+  /// Gives the lock, which is held once, up until `condition` is signalled; false when it was not before `deadline`.
+  bool wait(pthread_cond_t& condition, const timespec& deadline) VEXA_REQUIRES(this) {
+    return pthread_cond_clockwait(&condition, &mutex_, CLOCK_MONOTONIC, &deadline) == 0;
+  }
 
  private:
   pthread_mutex_t mutex_ = PTHREAD_RECURSIVE_MUTEX_INITIALIZER_NP;
@@ -76,6 +82,19 @@ void remove_thread(ThreadHandle* handle) {
   const Hold hold;
   threads().erase(handle->id);
   delete handle;
+}
+
+timespec monotonic_after(std::chrono::milliseconds span) {
+  constexpr long kSecond = 1'000'000'000;  // nanoseconds
+  timespec time{};
+  clock_gettime(CLOCK_MONOTONIC, &time);
+  const auto seconds = std::chrono::floor<std::chrono::seconds>(span);
+  time.tv_sec += static_cast<std::time_t>(seconds.count());
+  time.tv_nsec += static_cast<long>(std::chrono::nanoseconds(span - seconds).count());
+  if (time.tv_nsec < kSecond) return time;
+  ++time.tv_sec;
+  time.tv_nsec -= kSecond;
+  return time;
 }
 
 struct StartBlock {
@@ -143,9 +162,19 @@ void cleanup_thread_internal(unsigned int code) {
   if (handle == nullptr) return;
   handle->exit_code = code;
   handle->finished = true;
+  pthread_cond_broadcast(&handle->ended);
   if (!handle->closed) return;
   pthread_detach(pthread_self());
   remove_thread(handle);
+}
+
+void vexa::wait_for_thread_end(typedHandle* h, std::chrono::milliseconds longest) {
+  auto* handle = record_of<ThreadHandle>(h);
+  if (handle == nullptr) return;
+  const timespec deadline = monotonic_after(longest);
+  const Hold hold;
+  const bool was_done = handle->finished;
+  while ((was_done || !handle->finished) && thread_lock.wait(handle->ended, deadline)) continue;
 }
 
 int GetExitCodeThread(typedHandle* h, unsigned long* code) {

@@ -1,4 +1,5 @@
 #include <vexa/models.h>
+#include <vexa/trace.h>
 #include <vexa/vexa_common.h>
 #include <vexa/waiting.h>
 
@@ -57,6 +58,8 @@ int main(int argc, char** argv) {
   const auto camera = vexa::MakeDevice(profile);  // the driver of this model: it knows what the camera can do
   if (!camera) return failed("no driver", "out of memory");
   camera->SetCurrentConnectionInfo(connection);
+  // Without it the driver writes its RTSP requests, password included, to standard output.
+  if (auto* driver = dynamic_cast<CVexaCommon*>(camera.get())) vexa::SetTrace(*driver, [](const char*) {});
 
   SLibDCameraInfo video;
   ELibDReturnCode result = camera->GetCameraInfo(video);

@@ -13,8 +13,9 @@ class CancelSignal;
 
 /// Ends what waits in `driver` at this moment, within 100 ms: starts, stops, requests, inquiries and polls, in whatever
 /// threads they run. Each returns the code that it has for a camera which does not answer in time, and undoes what it
-/// undoes then; a stop still sends TEARDOWN and does not wait for the answer. LastFailure says that it was a cancel.
-/// What begins afterwards is not affected, and neither is video that plays. One call of the system's, no wait.
+/// undoes then; a stop of video still sends TEARDOWN and does not wait for the answer (one of the alarm stream closes
+/// it and leaves the camera's alarm data on). LastFailure says that it was a cancel. What begins afterwards is not
+/// affected, and neither is video that plays. One call of the system's, no wait.
 ///
 /// Any thread; not for signal handlers. The driver exists until the call has returned: to destroy it meanwhile is an
 /// error of the host. After a fork only the process that forked may use its drivers.

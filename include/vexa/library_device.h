@@ -96,7 +96,8 @@ class VEXA_API CLibraryDevice {
   virtual ELibDReturnCode GetCurrentConnectionInfo(SLibDConnectionInfo& info);
   /// Asks the camera for the settings of the video stream `info.streamNumber`, and narrows what is offered by what it
   /// reports. Fills the whole record, the stream number too: set it before each call. A failure also forgets the answer
-  /// that the getters of image controls read from.
+  /// that the getters of image controls read from, and may have taken the video standard, the capture size and the
+  /// like.
   virtual ELibDReturnCode GetCameraInfo(SLibDCameraInfo& info);
   /// Asks the camera for the codec of its audio input. The other fields are those last set; a codec that is not known
   /// leaves the codec last set.

@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "tests/device/edge_storage_reach.h"
+#include "tests/device/settings_exchange.h"
 #include "tests/support/failing_new.h"
 #include "tests/support/process_state.h"
 

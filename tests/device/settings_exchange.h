@@ -122,4 +122,16 @@ class Played {
   const Ends ends_;
 };
 
+/// The driver's edge storage, as a model with a card sets it up.
+class EdgeStorageReach : public CVexaCommon {
+ public:
+  EdgeStorageReach() {
+    m_EdgeStorageSupported = true;
+    m_SavedTimeout = kPatientTimeout;
+  }
+};
+
+using EdgeDriver = Settings<EdgeStorageReach>;
+using EdgePlay = Played<EdgeStorageReach>;
+
 }  // namespace vexa_test

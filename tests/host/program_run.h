@@ -123,7 +123,7 @@ class ProgramRun {
   std::string terminal_text_;
 };
 
-// What ffprobe tells of a file, line by line; nothing else, such as a warning.
+// What ffprobe reports about a file, line by line, without warnings.
 inline std::vector<std::string> probed(const std::string& entries, const std::string& path) {
   std::vector<std::string> lines;
   const std::string command = "ffprobe -v warning -show_entries " + entries + " -of csv=p=0 '" + path + "' 2>&1";

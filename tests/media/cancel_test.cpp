@@ -15,6 +15,7 @@
 
 #include "tests/media/live_camera.h"
 #include "tests/support/process_state.h"
+#include "tests/support/scripted_camera.h"
 #include "vexa/failure.h"
 
 namespace vexa_test {
@@ -143,14 +144,16 @@ bool ended(LiveCamera& camera, std::future<Result>& call) {
 }
 
 /// Cancels the call at its request number `step`, from 1. False when the call makes fewer.
-bool cancel_at(const CallRow& row, std::uint32_t step) {
-  LiveCamera camera(camera_options());
+bool cancel_at(LiveCamera& camera, const CallRow& row, std::uint32_t step) {
   CancelDriver driver;
   camera.introduce(driver, kEndless);
+  camera->clear_request_faults();
   camera->add_request_fault(RequestFault::no_answer("").nth(step));
+  const std::size_t before = requests(camera);
   auto call = std::async(std::launch::async, [&] { return row.call(driver); });
-  EXPECT_TRUE(eventually([&] { return requests(camera) >= step || call.wait_for(0s) == std::future_status::ready; }));
-  const bool reached = call.wait_for(0s) != std::future_status::ready;
+  const auto is_over = [&] { return call.wait_for(0s) == std::future_status::ready; };
+  EXPECT_TRUE(eventually([&] { return requests(camera) >= before + step || is_over(); }));
+  const bool reached = !is_over();
   vexa::Cancel(driver);
   EXPECT_TRUE(ended(camera, call)) << row.name << " at request " << step;
   const ELibDReturnCode code = call.get();
@@ -161,17 +164,32 @@ bool cancel_at(const CallRow& row, std::uint32_t step) {
     EXPECT_EQ(failure.operation, row.name) << " at request " << step;
     EXPECT_EQ(failure.code, code) << row.name << " at request " << step;
   }
+  driver.state().teardown_timeout = 0;
   return reached;
 }
 
 TEST(Cancel, EndsEachOperationAtEachOfItsRequests) {
-  const std::size_t descriptors = open_descriptors();
+  LiveCamera camera(camera_options());
   for (const CallRow& row : calls()) {
     std::uint32_t step = 1;
-    while (cancel_at(row, step) && step < 20) ++step;
+    while (cancel_at(camera, row, step) && step < 20) ++step;
     EXPECT_GT(step, 1u) << row.name << " asks nothing";
     EXPECT_LT(step, 20u) << row.name;
   }
+}
+
+TEST(Cancel, LeavesNoDescriptorBehind) {
+  CancelDriver driver;
+  const FullListener camera;
+  driver.use(camera.host(), camera.port(), kEndless);
+  const std::size_t descriptors = open_descriptors();
+  const CallRow inquiry = calls().front();
+  auto call = std::async(std::launch::async, [&] { return inquiry.call(driver); });
+  ASSERT_TRUE(eventually([&] { return open_descriptors() > descriptors + 1; }));
+  vexa::Cancel(driver);
+  ASSERT_EQ(call.wait_for(kSoon), std::future_status::ready);
+  EXPECT_EQ(call.get(), LIBD_TIMEOUT);
+  EXPECT_EQ(driver.LatestErrorText(), "Connection timed out");
   EXPECT_EQ(open_descriptors(), descriptors);
 }
 

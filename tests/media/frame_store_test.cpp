@@ -2,11 +2,14 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <cstring>
 #include <memory>
 #include <new>
 #include <vector>
 
 #include "tests/support/failing_new.h"
+#include "tests/support/resident_pages.h"
 
 namespace vexa {
 namespace {
@@ -85,6 +88,40 @@ TEST(FrameStore, ClearedItKeepsNothing) {
   unsigned char* kept = later.get();
   store.give_back(later.release(), 16);
   EXPECT_EQ(Buffer(store.take(16)).get(), kept) << "it goes on afterwards";
+}
+
+TEST(FrameStore, GivesTheRearOfItsBuffersBackWhenTheStreamShrinks) {
+  constexpr std::size_t kCapacity = 1200000;
+  FrameStore store;
+  const auto stream = [&store](std::size_t length) {
+    for (unsigned i = 0; i < RecentNeed::kPeriod; ++i) {
+      unsigned char* buffer = store.take(kCapacity);
+      std::memset(buffer, 1, length);
+      store.give_back(buffer, kCapacity, length);
+    }
+  };
+  unsigned char* out = store.take(kCapacity);
+  std::memset(out, 1, 1000000);
+  stream(1000000);
+  stream(20000);
+  const std::size_t needed = 20000 / vexa_test::page_size() + 1;
+  unsigned char* spare = store.take(kCapacity);
+  EXPECT_LE(vexa_test::resident_pages(spare, kCapacity), needed);
+  EXPECT_EQ(std::count(spare, spare + 20000, 1), 20000);
+  store.give_back(out, kCapacity, 10);
+  EXPECT_LE(vexa_test::resident_pages(out, kCapacity), needed) << "one that was with the host meanwhile";
+  store.give_back(spare, kCapacity, 10);
+}
+
+TEST(FrameStore, DropsSparesThatAreNotTakenForSomeTime) {
+  FrameStore store;
+  std::vector<unsigned char*> buffers;
+  for (int i = 0; i < 4; ++i) buffers.push_back(store.take(8));
+  for (unsigned char* buffer : buffers) store.give_back(buffer, 8, 8);
+  for (unsigned i = 0; i < 2 * FrameStore::kIdlePeriod; ++i) store.give_back(store.take(8), 8, 8);
+  const Buffer last(store.take(8));
+  EXPECT_EQ(last.get(), buffers.back());
+  EXPECT_TRUE(has_none(store, 8));
 }
 
 }  // namespace

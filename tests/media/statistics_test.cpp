@@ -7,6 +7,7 @@
 
 #include "tests/media/rtp_feed.h"
 #include "tests/media/statistics_equations.h"
+#include "transport/socket.h"
 #include "vexa/frame_facts.h"
 #include "vexa/reception.h"
 
@@ -276,6 +277,60 @@ TEST_F(Statistics, TheTableHasEachNumberOnce) {
   const std::size_t numbers = (sizeof(vexa::StreamStatistics) - offsetof(vexa::StreamStatistics, time)) / 8;
   EXPECT_EQ(table.size(), numbers + 1) << "and the transport";
   EXPECT_EQ(table.at("vexa_stream_packets_discarded_by_reason_total{reason=\"late\"}"), 0u);
+}
+
+/// A connection with RTP inside, and the camera's end of it.
+class StatisticsOverTcp : public Statistics {
+ protected:
+  StatisticsOverTcp() {
+    int ends[2];
+    EXPECT_EQ(socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends), 0);
+    peer_ = vexa::Socket(ends[0]);
+    connection_ = vexa::Socket(ends[1]);
+    driver_.state().ledger.begin_stream(vexa::StreamTransport::kTcp);
+  }
+  int receive(unsigned char channel, const Payload& packet) {
+    Payload bytes = {'$', channel, static_cast<unsigned char>(packet.size() >> 8),
+                     static_cast<unsigned char>(packet.size())};
+    bytes.insert(bytes.end(), packet.begin(), packet.end());
+    EXPECT_EQ(write(peer_.get(), bytes.data(), bytes.size()), static_cast<ssize_t>(bytes.size()));
+    std::vector<char> room(65536);
+    return driver_.rtp_over_tcp_payload_recv(connection_.get(), room.data(), static_cast<int>(room.size()), nullptr,
+                                             nullptr, 1000, nullptr);
+  }
+
+  vexa::Socket peer_;
+  vexa::Socket connection_;
+};
+
+TEST_F(StatisticsOverTcp, WhatIsMissingTheCameraLeftOut) {
+  for (const unsigned sequence : {1u, 2u, 5u}) {
+    EXPECT_EQ(receive(0, rtp_datagram({true, 96, sequence, timestamp_}, kSlice)), 3);
+  }
+  const vexa::StreamStatistics s = now();
+  EXPECT_EQ(s.transport, vexa::STREAM_TRANSPORT_TCP);
+  EXPECT_EQ(s.packetsMissingInCamera, 2u);
+  EXPECT_EQ(s.packetsMissing, 0u);
+  EXPECT_EQ(s.packetsUsed, 3u);
+}
+
+TEST_F(StatisticsOverTcp, AReportOnTheOddChannelIsReadAndPassesForMediaAllTheSame) {
+  receive(0, rtp_datagram({true, 96, 1, timestamp_}, kSlice));
+  const Payload report = {0x80, 200, 0, 6, 0, 0, 0, 0, 0xe9, 0, 0, 1, 0, 0, 0, 0, 0, 1, 2, 3, 0, 0, 0, 9, 0, 0, 1, 0};
+  EXPECT_EQ(receive(1, report), static_cast<int>(report.size()) - 12);
+  const vexa::StreamStatistics s = now();
+  EXPECT_EQ(s.rtcpSenderReports, 1u);
+  EXPECT_EQ(s.packetsReceived, 1u) << "a report is no packet of the stream";
+}
+
+TEST_F(StatisticsOverTcp, AReportOfAnotherSourceOrNoReportIsRefused) {
+  receive(0, rtp_datagram({true, 96, 1, timestamp_}, kSlice));
+  const Payload other = {0x80, 200, 0, 6, 0, 0, 0, 7, 0xe9, 0, 0, 1, 0, 0, 0, 0, 0, 1, 2, 3, 0, 0, 0, 9, 0, 0, 1, 0};
+  const Payload cut(other.begin(), other.begin() + 20);
+  receive(1, other);
+  receive(1, cut);
+  EXPECT_EQ(now().rtcpRefused, 2u);
+  EXPECT_EQ(now().rtcpSenderReports, 0u);
 }
 
 TEST_F(Statistics, FactsComeWithTheFrame) {

@@ -11,6 +11,7 @@
 #include "tests/media/live_camera.h"
 #include "tests/support/failing_new.h"
 #include "tests/support/process_state.h"
+#include "tests/support/resident_pages.h"
 #include "vexa/runtime.h"
 
 namespace vexa_test {
@@ -194,6 +195,14 @@ TEST(VideoStart, SetsAsideAZeroedStagingBufferAndKeepsLargeFramesForJpegAlone) {
     expect_stopped(driver);
     EXPECT_EQ(driver.m_StagingBufferSize, 0u);
   }
+}
+
+TEST(VideoStart, BringsNoneOfTheStagingBuffersPagesIntoMemory) {
+  OpenedDriver driver;
+  driver.m_StreamWaitMs = 600000;
+  ASSERT_EQ(driver.state().start_thread("H.264"), LIBD_OK);
+  EXPECT_LE(resident_pages(driver.m_StagingBuffer, driver.m_StagingBufferSize), 2u);
+  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
 }
 
 TEST(VideoStart, CountsTheSilenceFromAfterTheOpen) {

@@ -19,6 +19,10 @@ class Logger : public CFileLogger {
   using CFileLogger::m_MaxSize;
 };
 
+const char* const kLongName =
+    "another-name-that-is-longer-than-a-text-holds-by-itself-and-than-the-folder-of-the-test-"
+    "and-the-name-of-the-log-file-in-it-together-so-that-a-text-must-grow-for-it-again";
+
 /// Lets each allocation of the step fail in turn: how many there are.
 int failures_of(const std::function<void(Logger&)>& step, bool open) {
   for (int nth = 0; nth < 1000; ++nth) {
@@ -47,7 +51,7 @@ TEST(FileLoggerShortOfMemory, ThrowsNothing) {
     bool open;
     std::function<void(Logger&)> step;
   } rows[] = {
-      {"naming", false, [](Logger& logger) { logger.SetFileName("another-name-longer-than-a-text-holds-by-itself"); }},
+      {"naming", false, [](Logger& logger) { logger.SetFileName(kLongName); }},
       {"opening", false, [](Logger& logger) { logger.OpenFile(); }},
       {"opening again", true, [](Logger& logger) { logger.OpenFile(); }},
       {"a line that rotates", true, [](Logger& logger) { logger.Log("line"); }},
@@ -58,6 +62,21 @@ TEST(FileLoggerShortOfMemory, ThrowsNothing) {
     EXPECT_GT(failures, 0) << row.name;
     EXPECT_LT(failures, 1000) << row.name;
   }
+}
+
+TEST(FileLoggerShortOfMemory, OpensNoFileOfItsFormerName) {
+  const TemporaryFolder folder;
+  const std::string former = folder / "log.txt";
+  CFileLogger logger;
+  logger.SetFileName(former.c_str());
+  {
+    const AllocationFailure failure(0);
+    logger.SetFileName(kLongName);
+    EXPECT_TRUE(failure.happened());
+  }
+  logger.OpenFile();
+  logger.Log("line");
+  EXPECT_EQ(entries_in(folder.path().c_str()), 0u);
 }
 
 TEST(FileLoggerShortOfMemory, LeavesTheBannerOutAtItsEnd) {

@@ -2,6 +2,8 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+
 namespace vexa {
 namespace {
 
@@ -99,6 +101,82 @@ TEST(BurstGather, DoesNotNapInTheMiddleOfAPictureWhereItDidNotAtItsBeginning) {
   stream.run(641, {10, 1400}, {10, 1400});
   ASSERT_EQ(stream.latest(), microseconds(0));
   EXPECT_EQ(stream.goes_on(), microseconds(0));
+}
+
+/// Pictures whose datagrams trickle in, one each 100 us; the reader naps until the last one is there.
+class Trickle {
+ public:
+  void run(int pictures, microseconds length) {
+    naps = read = 0;
+    late = microseconds(0);
+    for (int i = 0; i < pictures; ++i) read_picture(length);
+  }
+
+  int naps = 0;
+  int read = 0;          // pictures, without those that the reader tried without a nap
+  microseconds late{0};  // of these together, from the last datagram to the end of the nap that brought it
+
+ private:
+  void read_picture(microseconds length) {
+    microseconds arrived{0};
+    microseconds now = gather_.woken();
+    const bool is_trial = now.count() == 0;
+    while (!is_trial) {
+      ++naps;
+      for (; arrived <= std::min(now, length); arrived += microseconds(100)) gather_.received(1400);
+      if (now >= length) break;
+      const microseconds nap = gather_.goes_on();
+      ASSERT_NE(nap, microseconds(0));
+      now += nap;
+    }
+    gather_.picture_ended();
+    if (is_trial) return;
+    ++read;
+    late += now - length;
+  }
+
+  BurstGather gather_;
+};
+
+TEST(BurstGather, LearnsWhenPicturesEndAndNapsUntilThen) {
+  struct Case {
+    microseconds length;
+    double most_naps;
+    microseconds most_late;
+  };
+  const Case cases[] = {{microseconds(700), 1.2, microseconds(50)},
+                        {microseconds(1500), 1.2, microseconds(100)},
+                        {microseconds(3300), 1.8, microseconds(220)}};
+  for (const Case& c : cases) {
+    Trickle stream;
+    stream.run(600, c.length);
+    stream.run(320, c.length);
+    EXPECT_EQ(stream.read, 310) << c.length.count();
+    EXPECT_LE(stream.naps, c.most_naps * stream.read) << c.length.count();
+    EXPECT_LE(stream.late.count(), c.most_late.count() * stream.read) << c.length.count();
+  }
+}
+
+TEST(BurstGather, FollowsPicturesThatBecomeShorterOrLonger) {
+  Trickle stream;
+  stream.run(600, microseconds(3000));
+  stream.run(1500, microseconds(1000));
+  stream.run(320, microseconds(1000));
+  EXPECT_LE(stream.late.count(), 100 * stream.read);
+  stream.run(600, microseconds(3000));
+  stream.run(320, microseconds(3000));
+  EXPECT_LE(stream.naps, 1.8 * stream.read);
+}
+
+TEST(BurstGather, APicturesLargeBurstsAreNotLeftToGatherForTwiceAsLong) {
+  BurstGather gather;
+  for (int i = 0; i < 100; ++i) {
+    ASSERT_LE(gather.woken(), BurstGather::kLongest);
+    gather.received(40000);
+    ASSERT_LE(gather.goes_on(), BurstGather::kLongest);
+    gather.received(40000);
+    gather.picture_ended();
+  }
 }
 
 TEST(BurstGather, NapsNoLongerThanItsLimitFromTheNextBurstOn) {

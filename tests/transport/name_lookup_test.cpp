@@ -6,9 +6,8 @@
 #include <gtest/gtest.h>
 #include <netdb.h>
 
-#include <array>
 #include <atomic>
-#include <chrono>
+#include <condition_variable>
 #include <future>
 #include <mutex>
 #include <string>
@@ -20,8 +19,38 @@ namespace {
 constexpr const char* kSlowName = "slow.invalid";
 constexpr const char* kKnownName = "known.invalid";
 
-std::mutex gate;  // held while the resolver does not answer
+std::mutex gate;
+std::condition_variable answers;
+bool silent = false;  // under the gate
 std::atomic<int> asked{0};
+std::atomic<int> waiting{0};
+
+/// While it lasts, the resolver does not answer. Its end waits until every question has been answered.
+class Silence {
+ public:
+  Silence() { set(true); }
+  ~Silence() {
+    set(false);
+    while (waiting > 0) std::this_thread::yield();
+  }
+  Silence(const Silence&) = delete;
+  Silence& operator=(const Silence&) = delete;
+
+ private:
+  static void set(bool value) {
+    const std::lock_guard<std::mutex> lock(gate);
+    silent = value;
+    answers.notify_all();
+  }
+};
+
+void wait_for_the_resolver() {
+  ++asked;
+  ++waiting;
+  std::unique_lock<std::mutex> lock(gate);
+  answers.wait(lock, [] { return !silent; });
+  --waiting;
+}
 
 bool is(const char* name, const char* wanted) { return std::string(name) == wanted; }
 
@@ -32,10 +61,7 @@ extern "C" int gethostbyname_r(const char* name, hostent* entry, char* room, std
   using Resolver = int (*)(const char*, hostent*, char*, std::size_t, hostent**, int*);
   static const auto system_resolver = reinterpret_cast<Resolver>(dlsym(RTLD_NEXT, "gethostbyname_r"));
   if (!is(name, kSlowName) && !is(name, kKnownName)) return system_resolver(name, entry, room, size, result, error);
-  if (is(name, kSlowName)) {
-    ++asked;
-    const std::lock_guard<std::mutex> wait(gate);
-  }
+  if (is(name, kSlowName)) wait_for_the_resolver();
   return system_resolver("127.0.0.9", entry, room, size, result, error);
 }
 
@@ -67,30 +93,32 @@ TEST(NameLookup, OfANumberAsksNobody) {
 
 TEST(NameLookup, EndsWhenItIsCancelledAndThrowsAwayWhatIsFoundLater) {
   CancelSignal signal;
-  std::unique_lock<std::mutex> silence(gate);
   const int before = asked;
-  auto lookup = std::async(std::launch::async, [&] { return resolve_host(kSlowName, 80, {&signal}); });
-  while (asked == before) std::this_thread::yield();
-  signal.raise();
-  EXPECT_FALSE(lookup.get().address);
-  silence.unlock();
+  {
+    const Silence silence;
+    auto lookup = std::async(std::launch::async, [&] { return resolve_host(kSlowName, 80, {&signal}); });
+    while (asked == before) std::this_thread::yield();
+    signal.raise();
+    EXPECT_FALSE(lookup.get().address);
+  }
   const CancelSignal never;
   EXPECT_TRUE(resolve_host(kSlowName, 80, {&never}).address);
 }
 
 TEST(NameLookup, RunsAtMostSoManyBesideTheirCallers) {
-  std::unique_lock<std::mutex> silence(gate);
   const int before = asked;
   CancelSignal signal;
-  std::vector<std::future<ResolvedHost>> lookups;
-  for (int i = 0; i < kMostLookups + 4; ++i) {
-    lookups.push_back(std::async(std::launch::async, [&] { return resolve_host(kSlowName, 80, {&signal}); }));
+  {
+    const Silence silence;
+    std::vector<std::future<ResolvedHost>> lookups;
+    for (int i = 0; i < kMostLookups + 4; ++i) {
+      lookups.push_back(std::async(std::launch::async, [&] { return resolve_host(kSlowName, 80, {&signal}); }));
+    }
+    while (asked < before + kMostLookups) std::this_thread::yield();
+    signal.raise();
+    for (auto& lookup : lookups) EXPECT_FALSE(lookup.get().address);
+    EXPECT_EQ(asked, before + kMostLookups);
   }
-  while (asked < before + kMostLookups) std::this_thread::yield();
-  signal.raise();
-  for (auto& lookup : lookups) EXPECT_FALSE(lookup.get().address);
-  EXPECT_EQ(asked, before + kMostLookups);
-  silence.unlock();
   const CancelSignal never;
   EXPECT_TRUE(resolve_host(kSlowName, 80, {&never}).address);
 }

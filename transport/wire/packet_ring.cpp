@@ -1,5 +1,7 @@
 #include "transport/wire/packet_ring.h"
 
+#include <algorithm>
+
 namespace vexa {
 
 std::uint32_t PacketRing::next_offset() {
@@ -17,6 +19,7 @@ std::uint32_t PacketRing::next_offset() {
 void PacketRing::written(std::uint32_t length, std::vector<Slot>& overwritten) {
   last_offset_ = fill_;
   fill_ += length;
+  reach_ = std::max(reach_, fill_);
   while (oldest_ < earlier_rounds_.size() && earlier_rounds_[oldest_].offset < fill_) {
     overwritten.push_back(earlier_rounds_[oldest_++]);
   }
@@ -27,6 +30,7 @@ void PacketRing::restart() {
   earlier_rounds_.clear();
   oldest_ = 0;
   fill_ = 0;
+  reach_ = 0;
 }
 
 void PacketRing::keep(const SPacketInfo& packet) {

@@ -41,8 +41,12 @@ class PacketRing {
   /// No packet is kept any more: begins again at the start, whose memory is still in the cache.
   void restart();
 
+  /// The bytes at the buffer's start that were written since it last began there anew.
+  std::uint32_t reach() const { return reach_; }
+
  private:
   std::uint32_t fill_ = 0;
+  std::uint32_t reach_ = 0;
   std::uint32_t last_offset_ = 0;
   std::vector<Slot> this_round_;      // ascending by offset, below fill_
   std::vector<Slot> earlier_rounds_;  // ascending by offset; those from oldest_ on are at or after fill_

@@ -36,10 +36,14 @@ void StreamWindow::make_room(StartCode code) {
   // Kept: the unfinished frame is searched again from its front.
   places_.search = buffer_.data() + code.length;
   places_.write_end = buffer_.data() + length;
+  if (part_ == nullptr) return;
+  while (*part_ < buffer_.size() && free_room().size() < kLittleRoom) *part_ = std::min(2 * *part_, buffer_.size());
 }
 
 std::span<unsigned char> StreamWindow::free_room() const {
-  return buffer_.subspan(static_cast<std::size_t>(places_.write_end - buffer_.data()));
+  const auto filled = static_cast<std::size_t>(places_.write_end - buffer_.data());
+  const std::size_t part = part_ == nullptr ? buffer_.size() : std::min(*part_, buffer_.size());
+  return buffer_.subspan(filled, part - std::min(part, filled));
 }
 
 }  // namespace vexa

@@ -27,7 +27,10 @@ class StreamWindow {
     unsigned char*& write_end;    ///< end of the bytes received
   };
 
-  StreamWindow(std::span<unsigned char> buffer, Places places) : buffer_(buffer), places_(places) {}
+  /// `part`, when given, is how many bytes at the buffer's start are in use; it grows when a frame needs more. So small
+  /// frames do not wander through a large buffer.
+  StreamWindow(std::span<unsigned char> buffer, Places places, std::size_t* part = nullptr)
+      : buffer_(buffer), places_(places), part_(part) {}
 
   enum class Cut { kFrame, kNoneYet, kTooLong };
 
@@ -45,6 +48,7 @@ class StreamWindow {
  private:
   std::span<unsigned char> buffer_;
   Places places_;
+  std::size_t* part_;
 };
 
 }  // namespace vexa

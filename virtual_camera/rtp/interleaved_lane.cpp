@@ -1,5 +1,6 @@
 #include "virtual_camera/rtp/interleaved_lane.h"
 
+#include <algorithm>
 #include <asio/buffer.hpp>
 #include <span>
 #include <utility>
@@ -97,6 +98,16 @@ bool InterleavedPort::leaves(InterleavedLane& lane, const Outgoing& packet) {
   if (lane.offer(channel_, packet)) return true;
   cut_picture_ = packet.record.picture;
   return false;
+}
+
+void InterleavedPort::send_control(std::span<const std::uint8_t> packet) {
+  const std::shared_ptr<InterleavedLane> lane = lane_.lock();
+  if (!lane) return;
+  Outgoing outgoing;
+  const auto payload = packet.subspan(outgoing.header.size());
+  std::copy_n(packet.begin(), outgoing.header.size(), outgoing.header.begin());
+  outgoing.changed_payload.assign(payload.begin(), payload.end());
+  if (lane->offer(static_cast<std::uint8_t>(channel_ + 1), outgoing)) lane->flush();
 }
 
 const std::vector<SentPacket>& InterleavedPort::send(const std::vector<Outgoing>& packets, Hashing hashing) {

@@ -10,6 +10,7 @@
 #include <functional>
 #include <memory>
 #include <optional>
+#include <span>
 #include <string>
 #include <vector>
 
@@ -62,6 +63,8 @@ class InterleavedPort : public PacketPort {
       : lane_(std::move(lane)), channel_(channel) {}
 
   const std::vector<SentPacket>& send(const std::vector<Outgoing>& packets, Hashing hashing) override;
+  // On the channel after the stream's.
+  void send_control(std::span<const std::uint8_t> packet) override;
   void close() override { lane_.reset(); }
 
  private:

@@ -3,6 +3,8 @@
 #define VIRTUAL_CAMERA_RTP_PACKET_PORT_H_
 
 #include <chrono>
+#include <cstdint>
+#include <span>
 #include <vector>
 
 #include "virtual_camera/rtp/rtp_stream.h"
@@ -24,6 +26,10 @@ class PacketPort {
   // Sends the packets in order, without those marked lost. Returns a record for each; one that cannot leave is marked
   // lost. The result stays valid until the next call.
   virtual const std::vector<SentPacket>& send(const std::vector<Outgoing>& packets, Hashing hashing) = 0;
+  // Sends an RTCP packet of at least 12 bytes beside the stream; one that cannot leave is lost.
+  virtual void send_control(std::span<const std::uint8_t> packet) = 0;
+  // RTCP packets that have come from the host since the last call.
+  virtual std::uint64_t take_heard() { return 0; }
   // Nothing leaves any more.
   virtual void close() = 0;
 };

@@ -33,6 +33,7 @@ void RtpSender::play(Play play) {
   stream_.emplace(std::move(play.source), *options_, play.faults, RtpStream::Identity{session_, play.seed});
   impairment_.emplace(std::move(play.faults), play.seed);
   started_ = Clock::now() + play.pause;
+  reports_.emplace(options_->sender_reports, std::chrono::system_clock::now().time_since_epoch() + play.pause);
   wait_for_next();
 }
 
@@ -117,7 +118,15 @@ void RtpSender::begin_picture(Time now) {
   picture_began_ = now;
   offered_ = 0;
   offered_bytes_ = 0;
+  const std::chrono::nanoseconds due = stream_->loaded().due;
   stream_->take_picture(picture_, user_data_of(stream_->loaded()));
+  report(due);
+}
+
+void RtpSender::report(std::chrono::nanoseconds picture_time) {
+  if (picture_.empty() || !reports_->due(picture_.front().record.picture)) return;
+  port_->send_control(reports_->write(picture_.front(), picture_time));
+  sent_->add_heard(port_->take_heard());
 }
 
 void RtpSender::offer_burst(Time now) {

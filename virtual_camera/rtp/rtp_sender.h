@@ -15,6 +15,7 @@
 #include "virtual_camera/rtp/packet_impairment.h"
 #include "virtual_camera/rtp/packet_port.h"
 #include "virtual_camera/rtp/rtp_stream.h"
+#include "virtual_camera/rtp/sender_report.h"
 #include "virtual_camera/rtp/sent_log.h"
 #include "virtual_camera/source/picture_source.h"
 #include "virtual_camera/values/options.h"
@@ -57,6 +58,7 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
   void begin_picture(Time now);
   [[nodiscard]] bool holds(Time event);
   void run_event();
+  void report(std::chrono::nanoseconds picture_time);
   void offer_burst(Time now);
   void slip_if_far_behind(Time event);
 
@@ -69,6 +71,7 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
   std::function<std::string()> user_data_;
   std::optional<RtpStream> stream_;
   std::optional<PacketImpairment> impairment_;
+  std::optional<SenderReportWriter> reports_;
   Clock::time_point started_;
   Clock::time_point not_before_;   // the pause after a burst
   std::vector<Outgoing> picture_;  // the picture being sent

@@ -23,6 +23,16 @@ void SentLog::add_finished_stream() {
   changed_.notify_all();
 }
 
+void SentLog::add_heard(std::uint64_t packets) {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  heard_ += packets;
+}
+
+std::uint64_t SentLog::heard() const {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  return heard_;
+}
+
 std::vector<SentPacket> SentLog::snapshot() const {
   const std::lock_guard<std::mutex> lock(mutex_);
   return {packets_.begin(), packets_.end()};

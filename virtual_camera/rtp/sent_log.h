@@ -47,6 +47,9 @@ class SentLog {
   [[nodiscard]] bool keeps() const { return limit_ != 0; }
   void add(const std::vector<SentPacket>& packets);
   void add_finished_stream();
+  // RTCP packets that came from hosts.
+  void add_heard(std::uint64_t packets);
+  [[nodiscard]] std::uint64_t heard() const;
   [[nodiscard]] std::vector<SentPacket> snapshot() const;
   [[nodiscard]] std::uint64_t sent() const;              // datagrams that left, duplicates included
   [[nodiscard]] std::uint64_t finished_streams() const;  // streams that reached their last picture
@@ -62,6 +65,7 @@ class SentLog {
   std::deque<SentPacket> packets_;
   std::uint64_t sent_ = 0;
   std::uint64_t finished_ = 0;
+  std::uint64_t heard_ = 0;
 };
 
 }  // namespace vexa::camera

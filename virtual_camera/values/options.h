@@ -11,6 +11,7 @@
 #include <vector>
 
 #include "virtual_camera/values/faults.h"
+#include "virtual_camera/values/sender_reports.h"
 
 namespace vexa::camera {
 
@@ -104,6 +105,7 @@ struct CameraOptions {
 
   std::uint64_t seed = 1;
   PacketFaults packet_faults;
+  SenderReports sender_reports;  // to the port after the host's media port, or on the channel after it
   std::vector<RequestFault> request_faults;
 
   std::size_t journal_limit = 100000;    // requests kept

@@ -41,6 +41,23 @@ TEST(PacketRing, BeginsAgainAt0WhenTheFillExceeds2031616) {
   }
 }
 
+TEST(PacketRing, ReachesAsFarAsWasWrittenSinceTheRestart) {
+  PacketRing ring;
+  std::vector<PacketRing::Slot> overwritten;
+  EXPECT_EQ(ring.reach(), 0u);
+  for (int i = 0; i < 32; ++i) {
+    ring.next_offset();
+    ring.written(65536, overwritten);
+  }
+  EXPECT_EQ(ring.next_offset(), 0u);
+  EXPECT_EQ(ring.reach(), PacketRing::kSize) << "a new round takes none of it away";
+  ring.restart();
+  EXPECT_EQ(ring.reach(), 0u);
+  ring.next_offset();
+  ring.written(100, overwritten);
+  EXPECT_EQ(ring.reach(), 100u);
+}
+
 TEST(PacketRing, RestartedItBeginsAt0AndKnowsNoPacket) {
   PacketRing ring;
   std::vector<PacketRing::Slot> overwritten;

@@ -19,6 +19,7 @@ class WindowUnderTest {
  public:
   explicit WindowUnderTest(std::size_t size)
       : buffer_(size, 0xee), start_(buffer_.data()), search_(start_), end_(start_) {}
+  WindowUnderTest(std::size_t size, std::size_t first_part) : WindowUnderTest(size) { part_ = first_part; }
 
   /// Takes as much of `bytes` as there is room for.
   std::size_t receive(const std::string& bytes) {
@@ -49,12 +50,13 @@ class WindowUnderTest {
   std::ptrdiff_t write_end() const { return end_ - buffer_.data(); }
 
  private:
-  StreamWindow view() { return {buffer_, {start_, search_, end_}}; }
+  StreamWindow view() { return {buffer_, {start_, search_, end_}, part_ == 0 ? nullptr : &part_}; }
 
   std::vector<unsigned char> buffer_;
   unsigned char* start_;
   unsigned char* search_;
   unsigned char* end_;
+  std::size_t part_ = 0;
 };
 
 std::string code4() { return std::string("\0\0\0\1", 4); }
@@ -160,6 +162,27 @@ TEST(StreamWindow, SearchesAMovedFrameAgain) {
   EXPECT_EQ(window.search(), 14 - 4 + 1);
   window.make_room();
   EXPECT_EQ(window.search(), 4);
+}
+
+TEST(StreamWindow, SmallFramesStayInThePartThatIsInUse) {
+  WindowUnderTest window(1 << 22, 3 * kRoomLeft);
+  for (int i = 0; i < 1000; ++i) {
+    ASSERT_EQ(window.receive(code4() + std::string(900, 'x')), 904U);
+    ASSERT_EQ(window.cut(), i == 0 ? "frame " : "frame " + code4() + std::string(900, 'x'));
+    ASSERT_LE(window.write_end(), static_cast<std::ptrdiff_t>(3 * kRoomLeft));
+    window.make_room();
+  }
+}
+
+TEST(StreamWindow, ThePartInUseGrowsWithTheFrameUntilTheBufferIsFull) {
+  WindowUnderTest window(10 * kRoomLeft, 2 * kRoomLeft);
+  std::size_t taken = window.receive(code4() + std::string(20 * kRoomLeft, 'x'));
+  EXPECT_EQ(taken, 2 * kRoomLeft);
+  for (const std::size_t part : {4U, 8U, 10U, 10U}) {
+    window.make_room();
+    taken += window.receive(std::string(20 * kRoomLeft, 'x'));
+    EXPECT_EQ(taken, part * kRoomLeft);
+  }
 }
 
 TEST(StreamWindow, AFullBufferTakesNothingMore) {
