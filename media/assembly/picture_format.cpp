@@ -10,6 +10,7 @@ namespace {
 
 /// Where a frame opens with its parameters, they end within this.
 constexpr std::size_t kFront = 1024;
+constexpr std::size_t kParameters = 192;
 
 constexpr std::uint8_t kSequenceParameterSet = 7;
 constexpr std::uint8_t kFirstVideoObjectLayer = 0x20;
@@ -30,7 +31,8 @@ std::uint64_t hash_of(Bytes bytes) {
 /// The bytes after the first start code whose unit `is_wanted`, up to the next start code.
 template <typename IsWanted>
 Bytes unit_of(Bytes frame, IsWanted is_wanted) {
-  const Bytes front = frame.first(std::min(frame.size(), kFront));
+  // A search of few bytes: it is made for every key picture.
+  const Bytes front = frame.first(std::min(frame.size(), kParameters));
   const auto* end = front.data() + front.size();
   const auto next_code = [end](const unsigned char* from) {
     return find_start_code_mpeg4(from, static_cast<unsigned int>(end - from));
