@@ -54,7 +54,7 @@ class Cameras {
  private:
   void add(std::vector<RequestFault> faults) {
     vexa::camera::CameraOptions options;
-    options.address = own_address(static_cast<unsigned>(cameras_.size()) + 1);
+    options.address = own_loopback(static_cast<unsigned>(cameras_.size()) + 1);
     options.user = kUser;
     options.password = kPassword;
     options.clip_path = VEXA_CLIPS "/small.h264";
@@ -88,7 +88,7 @@ std::vector<std::string> command_for(const std::string& place, unsigned choice, 
       {vexactl, "ptz", place, "watch", timeout},
       {vexactl, "ptz", place, "pan", "50", "--for", "60", timeout},
       {vexactl, "edge", place, "list", timeout},
-      {camera, "--address", own_address(40 + choice % 20), "--rtsp-port", "0"},
+      {camera, "--address", own_loopback(40 + choice % 20), "--rtsp-port", "0"},
   };
   return commands[choice % commands.size()];
 }
