@@ -2,12 +2,6 @@
 // What a stream costs from the socket to the host: the driver beside a bare poll and recvfrom loop on the same stream.
 //   streaming_e2e [SECONDS [COUNT]]     COUNT measurements (8) of SECONDS (10); ends with 1 when a frame was lost
 // Needs port 554 on 127.0.1.x: run as root, or in `unshare -rn` with the loopback up.
-#include <arpa/inet.h>
-#include <fcntl.h>
-#include <netinet/in.h>
-#include <poll.h>
-#include <sys/resource.h>
-#include <sys/socket.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -24,6 +18,7 @@
 #include <thread>
 #include <vector>
 
+#include "bench/bare_stream.h"
 #include "vexa/vexa_common.h"
 #include "virtual_camera/codec/rtp_packetiser.h"
 #include "virtual_camera/virtual_camera.h"
@@ -34,6 +29,12 @@ using std::chrono::steady_clock;
 using vexa::camera::CameraOptions;
 using vexa::camera::PacketisedClip;
 using vexa::camera::VirtualCamera;
+using vexa_bench::bare_loop;
+using vexa_bench::CountingSink;
+using vexa_bench::made_clip;
+using vexa_bench::open_bare_stream;
+using vexa_bench::Usage;
+using vexa_bench::usage_now;
 
 constexpr int kHttpPort = 8080;
 constexpr std::size_t kSessionsACamera = 8;
@@ -50,17 +51,6 @@ struct Load {
   std::shared_ptr<const PacketisedClip> clip;
   unsigned link_megabits;  // of the camera's port; 0: a picture's datagrams leave 16 at a time
 };
-
-/// Access units of one size, each a key picture: what a camera of that bit rate would send.
-std::shared_ptr<const PacketisedClip> made_clip(std::size_t picture_size) {
-  std::vector<std::uint8_t> bytes;
-  for (int picture = 0; picture < 4; ++picture) {
-    const std::uint8_t sets[] = {0, 0, 0, 1, 0x67, 0x42, 0, 0x1e, 0, 0, 0, 1, 0x68, 0xce, 0, 0, 0, 1, 0x65, 0x88};
-    bytes.insert(bytes.end(), std::begin(sets), std::end(sets));
-    bytes.insert(bytes.end(), picture_size, static_cast<std::uint8_t>(0x51 + picture));
-  }
-  return std::make_shared<const PacketisedClip>(vexa::camera::Clip::from_annex_b(bytes), 1400);
-}
 
 std::string camera_address(std::size_t camera) { return "127.0.1." + std::to_string(camera + 1); }
 std::string address_of(std::size_t stream) { return camera_address(stream / kSessionsACamera); }
@@ -111,33 +101,12 @@ class Cameras {
   pid_t child_ = -1;
 };
 
-struct Usage {
-  double cpu = 0;
-  long wakeups = 0;
-};
-
-Usage usage_now() {
-  rusage usage = {};
-  getrusage(RUSAGE_SELF, &usage);
-  const auto seconds = [](timeval time) {
-    return static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_usec) / 1e6;
-  };
-  return {seconds(usage.ru_utime) + seconds(usage.ru_stime), usage.ru_nvcsw};
-}
-
 struct Result {
   double cpu = 0;
   long wakeups = 0;
   double gigabytes = 0;
   std::uint64_t lost = 0;
   double per_gigabyte() const { return cpu / gigabytes; }
-};
-
-/// Counts what the driver hands over; the bytes are dropped.
-class CountingSink : public CDataSink {
- public:
-  void Write(const unsigned char*, unsigned int length) override { bytes += length; }
-  std::uint64_t bytes = 0;
 };
 
 std::unique_ptr<CVexaCommon> streaming_driver(const std::string& address) {
@@ -200,52 +169,6 @@ Result run_driver(const Load& load, std::uint64_t pictures) {
   return result;
 }
 
-/// The fewest requests by which a client gets a stream from a camera; returns the media socket.
-int open_bare_stream(const std::string& address) {
-  const int control = socket(AF_INET, SOCK_STREAM, 0);
-  const int media = socket(AF_INET, SOCK_DGRAM, 0);
-  const int room = 524288;
-  setsockopt(media, SOL_SOCKET, SO_RCVBUF, &room, sizeof room);
-  sockaddr_in place = {};
-  place.sin_family = AF_INET;
-  bind(media, reinterpret_cast<sockaddr*>(&place), sizeof place);
-  socklen_t size = sizeof place;
-  getsockname(media, reinterpret_cast<sockaddr*>(&place), &size);
-  const int port = ntohs(place.sin_port);
-  inet_pton(AF_INET, address.c_str(), &place.sin_addr);
-  place.sin_port = htons(554);
-  if (connect(control, reinterpret_cast<sockaddr*>(&place), sizeof place) != 0) std::exit(1);
-  const std::string url = "rtsp://" + address + ":554/media/video1";
-  const std::string credentials = "Authorization: Basic YWRtaW46YWRtaW4=\r\n";
-  std::string session;
-  const auto exchange = [&](const std::string& request) {
-    if (send(control, request.data(), request.size(), MSG_NOSIGNAL) < 0) std::exit(1);
-    char answer[1024];
-    const ssize_t length = recv(control, answer, sizeof answer, 0);
-    const std::string text(answer, length > 0 ? static_cast<std::size_t>(length) : 0);
-    if (const auto at = text.find("Session: "); at != std::string::npos) {
-      session = text.substr(at + 9, text.find_first_of(";\r", at) - at - 9);
-    }
-  };
-  exchange("DESCRIBE " + url + " RTSP/1.0\r\nCSeq: 1\r\n" + credentials + "\r\n");
-  exchange("SETUP " + url + "/video RTSP/1.0\r\nCSeq: 2\r\nTransport: RTP/AVP;unicast;client_port=" +
-           std::to_string(port) + "-" + std::to_string(port + 1) + "\r\n" + credentials + "\r\n");
-  exchange("PLAY " + url + " RTSP/1.0\r\nCSeq: 3\r\nSession: " + session + "\r\n" + credentials + "\r\n");
-  return media;
-}
-
-void bare_loop(int media, std::uint64_t pictures, std::uint64_t* bytes) {
-  std::vector<char> buffer(65536);
-  pollfd entry = {media, POLLIN, 0};
-  while (pictures > 0 && poll(&entry, 1, 2000) > 0) {
-    const ssize_t length = recvfrom(media, buffer.data(), buffer.size(), 0, nullptr, nullptr);
-    if (length <= 12) continue;
-    *bytes += static_cast<std::uint64_t>(length - 12);
-    const bool marker = (static_cast<unsigned char>(buffer[1]) & 0x80) != 0;
-    if (marker) --pictures;
-  }
-}
-
 Result run_bare(const Load& load, std::uint64_t pictures) {
   const Cameras cameras(load, pictures);
   std::vector<int> media;
@@ -303,19 +226,11 @@ void measure_first_frame() {
                extra[extra.size() / 2], extra.back());
 }
 
-/// The driver's trace of its requests goes to standard output; the report keeps it to itself.
-void keep_standard_output() {
-  report = fdopen(dup(STDOUT_FILENO), "w");
-  const int nowhere = open("/dev/null", O_WRONLY);
-  dup2(nowhere, STDOUT_FILENO);
-  close(nowhere);
-}
-
 }  // namespace
 
 int main(int argc, char** argv) {
   const double seconds = argc > 1 ? std::strtod(argv[1], nullptr) : 10;
-  keep_standard_output();
+  report = vexa_bench::take_standard_output();
   std::fprintf(report, "%-28s %8s %8s %7s %10s %10s %8s\n", "CPU seconds per GB", "bare", "driver", "ratio", "wake-ups",
                "wake-ups", "lost");
   const auto eight = PacketisedClip::load(VEXA_CLIPS "/hd.h264", 1400);
