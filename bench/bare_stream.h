@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the benches of streaming share: a stream without a driver, beside which a driver is measured.
 #pragma once
 

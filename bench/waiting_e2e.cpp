@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a host that waits costs, beside a bare poll and recvfrom loop on the same streams, and how soon it has a frame.
 //   waiting_e2e [SECONDS [latency]]   each measurement takes SECONDS (10), or that of latency alone; ends with 1 when a
 //                                     frame was lost
