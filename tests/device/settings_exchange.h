@@ -106,7 +106,9 @@ class Played {
     driver.use(camera_.host(), camera_.port());
   }
   ~Played() {
-    if (ends_ == Ends::kPlayed) EXPECT_EQ(complaints(), "");
+    if (ends_ == Ends::kPlayed) {
+      EXPECT_EQ(complaints(), "");
+    }
   }
   Played(const Played&) = delete;
   Played& operator=(const Played&) = delete;

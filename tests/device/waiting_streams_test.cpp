@@ -92,7 +92,9 @@ std::uint32_t ready_streams(StreamingDriver& driver, vexa::WaitSet& set) {
   const std::uint32_t found = ready.empty() ? 0 : ready[0].streams;
   EXPECT_EQ(vexa::ReadyStreams(driver), found);
   // A timer that has fired is looked at by the wait; what is ready shows in the descriptor.
-  if (found != 0) EXPECT_TRUE(is_readable(set.Descriptor()));
+  if (found != 0) {
+    EXPECT_TRUE(is_readable(set.Descriptor()));
+  }
   return found;
 }
 

@@ -184,8 +184,8 @@ std::vector<Row> rows() {
        [settings] {
          auto kept = std::make_shared<std::vector<SLibDDetectionParam>>(settings);
          return Attempt{[kept](ShortDriver& d) {
-                          auto mode = LIBD_POSITION_PRESET;
-                          return d.GetObjectDetectionSetting(*kept, mode);
+                          auto position = LIBD_POSITION_PRESET;
+                          return d.GetObjectDetectionSetting(*kept, position);
                         },
                         [kept] { return text_of(*kept); }};
        }},
@@ -230,9 +230,15 @@ int failures_of(const Row& row, LiveCamera& camera) {
       code = attempt.call(driver);
       happened = failure.happened();
     }
-    if (code != LIBD_OK && (row.changes & kRecord) == 0) EXPECT_EQ(attempt.record(), record) << row.name << nth;
-    if (code != LIBD_OK && (row.changes & kDriver) == 0) EXPECT_EQ(driver.state_text(), state) << row.name << nth;
-    if (code != LIBD_OK) EXPECT_EQ(vexa::LastFailure(driver).operation, row.name) << nth;
+    if (code != LIBD_OK && (row.changes & kRecord) == 0) {
+      EXPECT_EQ(attempt.record(), record) << row.name << nth;
+    }
+    if (code != LIBD_OK && (row.changes & kDriver) == 0) {
+      EXPECT_EQ(driver.state_text(), state) << row.name << nth;
+    }
+    if (code != LIBD_OK) {
+      EXPECT_EQ(vexa::LastFailure(driver).operation, row.name) << nth;
+    }
     driver.StopVideoStreaming();
     driver.StopModRawData();
     if (!happened) return nth;

@@ -255,14 +255,14 @@ TEST(WaitForVideoFrame, ReturnsAtOnceForAFrameAndFalseWithoutOne) {
 }
 
 TEST(WaitForVideoFrame, IsWokenByAFrameAndByAReportOfSilence) {
-  for (const int milliseconds : {-1, kLong}) {
+  for (const int limit : {-1, kLong}) {
     for (const ELibDReturnCode result : {LIBD_OK, LIBD_TIMEOUT}) {
       FedDriver driver;
       std::atomic<long> waiter{0};
       bool woken = false;
       std::thread host([&] {
         waiter = kernel_thread_id();
-        woken = vexa::WaitForVideoFrame(driver, milliseconds);
+        woken = vexa::WaitForVideoFrame(driver, limit);
       });
       EXPECT_TRUE(eventually([&] { return waiter != 0 && is_sleeping(waiter); }));
       driver.feed(result);
@@ -390,7 +390,9 @@ TEST(WaitingLive, TheDescriptorServesOneStreamAfterTheOther) {
       pollfd entry = {descriptor, POLLIN, 0};
       ASSERT_EQ(poll(&entry, 1, kLong), 1);
       TakenFrame frame;
-      if (host.take(driver, frame) == LIBD_OK) EXPECT_TRUE(camera.sent(picture++, frame.bytes));
+      if (host.take(driver, frame) == LIBD_OK) {
+        EXPECT_TRUE(camera.sent(picture++, frame.bytes));
+      }
     }
     ASSERT_EQ(driver.StopVideoStreaming(), LIBD_OK);
     EXPECT_FALSE(is_readable(descriptor));
@@ -436,7 +438,9 @@ TEST(WaitingLive, PromptFramesArriveWholeAndTheSettingHoldsForARunningStream) {
     vexa::SetPromptFrames(driver, picture % 8 < 4);
     ASSERT_TRUE(vexa::WaitForVideoFrame(driver, kLong));
     TakenFrame frame;
-    if (host.take(driver, frame) == LIBD_OK) EXPECT_TRUE(camera.sent(picture++, frame.bytes));
+    if (host.take(driver, frame) == LIBD_OK) {
+      EXPECT_TRUE(camera.sent(picture++, frame.bytes));
+    }
   }
 }
 
