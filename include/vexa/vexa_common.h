@@ -255,10 +255,7 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   bool GetTextByTourSequenceList(const std::vector<int>& sequence, std::string& text);  // device/camera_tours.cpp
   bool GetTourSequenceListByText(std::string text, std::vector<int>& sequence);
   void Log(const char* direction, const char* message);  // device/connection.cpp
-  // What guards what: docs/architecture.md
-  CSimpleLock m_ConnectionLock, m_VideoStateLock, m_FrameQueueLock, m_CamPosLock;
-  CSimpleLock m_CameraInquiryLock, m_AudioLock, m_IoStreamLock, m_MdStreamLock;
-  // Identity, capabilities and current settings
+  // Identity, capabilities and current settings. What guards what: docs/architecture.md
   SLibDFixedSystemInfo m_FixedSystemInfo;
   SLibDFixedConnectionInfo m_FixedConnectionInfo;
   SLibDFixedCameraInfo m_FixedCameraInfo VEXA_GUARDED_BY(m_ConnectionLock);
@@ -292,11 +289,12 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   std::int64_t m_RangeClockSeconds = 0;  ///< start of the range clock, seconds since 1970-01-01 UTC
   int m_RangeClockMicros = 0;
   int m_RtpClockRate = 0;  ///< ticks a second
-  bool m_EdgeStoragePlayback = false, m_FirstPlaybackFrame = false, m_RtpLiveMode = false;
+  bool m_EdgeStoragePlayback = false;
   int m_PlaybackScale = 1;
   bool m_NoTearDown VEXA_GUARDED_BY(m_VideoStateLock) = false;
   int m_KeepAlivePeriod = 1;  ///< seconds
   std::time_t m_LastKeepAliveTime = 0;
+  bool m_FirstPlaybackFrame = false;
   std::uint32_t m_PlaybackBaseTimestamp = 0;
   std::string m_EdgeStorageCodec;                                            ///< of the playback under way
   SLibDEdgeStorageMode m_EdgeStorageMode VEXA_GUARDED_BY(m_ConnectionLock);  ///< as last sent
@@ -310,7 +308,9 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   unsigned char* m_StreamSearchPos = nullptr;   ///< where the next start code is looked for
   unsigned char* m_StreamWriteEnd = nullptr;    ///< end of the bytes received
   // The streaming thread and the frame queue
+  CSimpleLock m_VideoStateLock;
   bool m_StopVideoRequested VEXA_GUARDED_BY(m_VideoStateLock) = false;
+  CSimpleLock m_FrameQueueLock;
   std::deque<VideoFrameInfo> m_FrameQueue VEXA_GUARDED_BY(m_FrameQueueLock);
   bool m_VideoTimedOut VEXA_GUARDED_BY(m_FrameQueueLock) = false;
   bool m_LargeFrameBuffers VEXA_GUARDED_BY(m_FrameQueueLock) = false;
@@ -320,20 +320,27 @@ class VEXA_API CVexaCommon : public CLibraryDevice {
   typedHandle* m_StreamingThread = nullptr;
   typedHandle* m_StopVideoEvent = nullptr;
   int m_StreamWaitMs = 1;  ///< wait for the stop event after a read that did not wait for it itself
+  bool m_RtpLiveMode = false;
+  CSimpleLock m_CamPosLock;
   std::string m_CamPosText VEXA_GUARDED_BY(m_CamPosLock);
   // The polled streams and the cached camera inquiry
+  CSimpleLock m_CameraInquiryLock;
   std::string m_CameraInquiryCache VEXA_GUARDED_BY(m_CameraInquiryLock);
+  CSimpleLock m_AudioLock;
   int m_AudioSocket VEXA_GUARDED_BY(m_AudioLock) = -1;
   std::time_t m_LastAudioTime VEXA_GUARDED_BY(m_AudioLock) = 0;  ///< of the last data, or of the opening
+  CSimpleLock m_IoStreamLock;
   int m_IoStreamSocket VEXA_GUARDED_BY(m_IoStreamLock) = -1;
   std::vector<SLibDPinInfo> m_PendingPins VEXA_GUARDED_BY(m_IoStreamLock);
   std::time_t m_LastIoDataTime VEXA_GUARDED_BY(m_IoStreamLock) = 0;        ///< when pins were last handed out
   std::time_t m_TamperingActiveSince VEXA_GUARDED_BY(m_IoStreamLock) = 0;  ///< 0 while no tampering is reported
+  CSimpleLock m_MdStreamLock;
   int m_MdStreamSocket VEXA_GUARDED_BY(m_MdStreamLock) = -1;
   std::time_t m_LastMdDataTime VEXA_GUARDED_BY(m_MdStreamLock) = 0;  ///< of the last part, or of the opening
   std::map<std::string, int> m_InquirySizes;                         ///< answer buffer in bytes by inquiry name
   CFileLogger m_CGILogger;
   char m_CGILogPath[1024] VEXA_GUARDED_BY(m_ConnectionLock) = {};
+  CSimpleLock m_ConnectionLock;
   std::atomic<bool> m_CGILogEnabled{false};
 
   friend struct vexa::DriverState;

@@ -328,7 +328,7 @@ void PacketCollector::remove_passed_by() {
 }
 
 void PacketCollector::drop_overwritten(const std::vector<PacketRing::Slot>& slots) {
-  std::uint64_t lost = 0;
+  std::size_t lost = 0;
   for (const PacketRing::Slot& slot : slots) {
     SPacketInfo key;
     key.timestamp = slot.timestamp;

@@ -165,7 +165,8 @@ TEST(ShortMemory, FailsAStepOfBrightness) {
     mode.shutterSpeeds = {{"1/50", 4}, {"1/100", 33}};
     play.driver.m_FixedPTZControlInfo.brightModes = {mode};
     play.driver.m_PTZControlInfo.brightMode = mode.name;
-    EXPECT_EQ(shortage.run([&] { return play.driver.Bright(1); }), shortage.failed() ? LIBD_FAILED : LIBD_OK);
+    const ELibDReturnCode code = shortage.run([&] { return play.driver.Bright(1); });
+    EXPECT_EQ(code, shortage.failed() ? LIBD_FAILED : LIBD_OK);
   });
 }
 

@@ -113,6 +113,8 @@ TEST_F(AlarmsByCommand, WatchEndsWithCtrlC) {
   start_model("LMX-M300");
   ProgramRun watch(folder(), vexactl({"watch", place()}), kCredentials);
   ASSERT_TRUE(eventually([&] { return was_asked("inq=sensor"); }));
+  happen(Kind::kContact, 2, 1);
+  ASSERT_TRUE(eventually([&] { return !contents_of(folder() / ".out").empty(); }));
   watch.signal(SIGINT);
   EXPECT_EQ(watch.wait().exit_code, 130);
   EXPECT_TRUE(was_asked("AlarmData=off"));

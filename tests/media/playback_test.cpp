@@ -242,7 +242,8 @@ TEST(PlaybackStart, ThatRunsOutOfMemoryAnywhereFailsAndLeavesNothingBehind) {
         driver.m_NoTearDown = true;  // only the start's own allocations are counted
         const SLibDEdgeStorageStreamingInfo recording = camera.recording();
         const auto start = [&] { return driver.StartEdgeStorageVideoStreaming(recording); };
-        EXPECT_EQ(shortage.run(start), shortage.failed() ? LIBD_FAILED : LIBD_OK);
+        const ELibDReturnCode code = shortage.run(start);
+        EXPECT_EQ(code, shortage.failed() ? LIBD_FAILED : LIBD_OK);
         EXPECT_EQ(driver.m_ConnectionInfo.timeout, 5000);
         if (!shortage.failed()) return;
         EXPECT_EQ(driver.m_StreamSocket, -1);

@@ -95,7 +95,8 @@ TEST(VideoStart, ThatRunsOutOfMemoryAnywhereFailsAndLeavesNothingBehind) {
         camera.introduce(driver);
         driver.m_NoTearDown = true;  // only the start's own allocations are counted
         const auto start = [&] { return driver.StartVideoStreaming(); };
-        EXPECT_EQ(shortage.run(start), shortage.failed() ? LIBD_FAILED : LIBD_OK);
+        const ELibDReturnCode code = shortage.run(start);
+        EXPECT_EQ(code, shortage.failed() ? LIBD_FAILED : LIBD_OK);
         EXPECT_EQ(driver.m_ConnectionInfo.timeout, 5000);
         if (shortage.failed()) expect_stopped(driver);
       },

@@ -65,7 +65,8 @@ int fails_at_every_allocation(Attempt attempt, int few = 0) {
 /// Runs `call`, which fails and records why when an allocation does, and succeeds otherwise.
 template <typename Driver, typename Call>
 void expect_failure_told(Shortage& shortage, Driver& driver, Call call) {
-  EXPECT_EQ(shortage.run(call), shortage.failed() ? LIBD_FAILED : LIBD_OK);
+  const auto code = shortage.run(call);
+  EXPECT_EQ(code, shortage.failed() ? LIBD_FAILED : LIBD_OK);
   if (!shortage.failed()) return;
   std::string text;
   driver.GetLatestErrorText(text);
