@@ -9,10 +9,10 @@
 
 #include <cerrno>
 #include <cstdlib>
-#include <cstring>
 #include <fstream>
 #include <iostream>
 #include <string>
+#include <system_error>
 
 namespace {
 
@@ -125,7 +125,7 @@ int main(int argc, char** argv) {
   }
   camera.StopVideoStreaming();
   if (!recording.file.flush()) {
-    std::cerr << "cannot write " << argv[3] << ": " << std::strerror(errno) << "\n";
+    std::cerr << "cannot write " << argv[3] << ": " << std::generic_category().message(errno) << "\n";
     return 1;
   }
   return 0;

@@ -10,10 +10,10 @@
 #include <cerrno>
 #include <cstdint>
 #include <cstdlib>
-#include <cstring>
 #include <iostream>
 #include <memory>
 #include <string>
+#include <system_error>
 #include <vector>
 
 namespace {
@@ -79,7 +79,7 @@ class Tile final : public CDataSink {
 };
 
 int failed(const char* what) {
-  std::cerr << what << ": " << std::strerror(errno) << "\n";
+  std::cerr << what << ": " << std::generic_category().message(errno) << "\n";
   return 1;
 }
 
