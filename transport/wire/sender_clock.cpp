@@ -125,8 +125,8 @@ std::optional<std::int64_t> SenderClock::offset(Arrival now) const {
 }
 
 int local_time_minutes(std::int64_t offset) {
-  constexpr std::int64_t kQuarter = 15 * 60 * kSecond;
-  constexpr std::int64_t kMostQuarters = 14 * 4;
+  constexpr std::int64_t kQuarter = std::int64_t{15} * 60 * kSecond;
+  constexpr std::int64_t kMostQuarters = std::int64_t{14} * 4;
   constexpr std::int64_t kTolerance = 5 * kSecond;
   const std::int64_t quarters = (offset + (offset < 0 ? -kQuarter / 2 : kQuarter / 2)) / kQuarter;
   if (std::abs(quarters) > kMostQuarters || std::abs(offset - quarters * kQuarter) > kTolerance) return 0;
