@@ -43,7 +43,7 @@ class CameraProcess {
   pid_t child_ = -1;
 };
 
-/// Says "ready" from the new process.
+/// Reports "ready" from the new process.
 inline void report_ready(int ready) {
   if (write(ready, "r", 1) != 1) _exit(1);
 }

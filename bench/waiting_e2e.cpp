@@ -94,7 +94,7 @@ void serve(const Load& load, std::uint64_t pictures, int ready) {
     cameras.push_back(std::make_unique<VirtualCamera>(options));
     if (!cameras.back()->start()) return;
   }
-  vexa_bench::say_ready(ready);
+  vexa_bench::report_ready(ready);
   for (;;) pause();
 }
 
