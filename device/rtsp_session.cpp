@@ -54,7 +54,10 @@ Result<int> DriverState::open_rtp_over_udp(const std::string& url, int port) {
   chronicle->begin_stream(std::move(control), server->address.sin_addr.s_addr);
   const int scale = driver.m_EdgeStoragePlayback ? driver.m_PlaybackScale : 1;
   const auto number = session.open(*server, {info, url, scale, *media_port, stream_clock(), waits.cancels});
-  if (!number) return count_rtsp(session.requests(), number.failure());
+  if (!number) {
+    chronicle->end_stream();
+    return count_rtsp(session.requests(), number.failure());
+  }
   exchanges.rtsp(session.requests(), nullptr);
   keep_alive.reset();
   // Kept: the time of the last keep-alive is not reset; a new session's first one waits for the rest of the interval.
@@ -232,6 +235,7 @@ void CVexaCommon::rtp_stream_socket_close_all() {
   vexa::shutdown_and_close(std::exchange(m_RtspSocket, -1));
   vexa::shutdown_and_close(m_State->stream_socket());
   m_State->set_stream_socket(-1);
+  m_State->chronicle->end_stream();
 }
 
 unsigned char* CVexaCommon::base64Decode(const char* text, unsigned int& size, bool trim) {
