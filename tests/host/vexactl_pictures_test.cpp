@@ -113,7 +113,8 @@ TEST_F(PicturesByCommand, CtrlCEndsTheWaitForAPictureAndTheSession) {
   start_camera(options);
   ASSERT_NO_FATAL_FAILURE(set_a_window());
   ProgramRun draw(folder(), vexactl({"detection", place(), "draw", "--out", "windows.png"}), kCredentials);
-  ASSERT_TRUE(camera().journal().wait_for_count("PLAY", 1, std::chrono::seconds(30)));
+  // The first keep-alive comes when the session stands.
+  ASSERT_TRUE(camera().journal().wait_for_count("GET_PARAMETER", 1, std::chrono::seconds(30)));
   draw.signal(SIGINT);
   const ProgramResult result = draw.wait();
   EXPECT_EQ(result.exit_code, 130);
