@@ -29,7 +29,7 @@ class CameraProcess {
     const bool started = read(ready[0], &byte, 1) == 1;
     close(ready[0]);
     if (started) return;
-    std::fprintf(stderr, "the cameras did not start\n");
+    std::fprintf(stderr, "the cameras did not start: is port 554 free, and are you root?\n");
     std::exit(1);
   }
   ~CameraProcess() {

@@ -7,38 +7,25 @@
 #include <chrono>
 #include <cstdio>
 #include <cstdlib>
-#include <iterator>
 #include <memory>
 #include <string>
 #include <thread>
 #include <vector>
 
+#include "bench/bare_stream.h"
 #include "vexa/cancel.h"
 #include "vexa/trace.h"
 #include "vexa/vexa_common.h"
-#include "virtual_camera/codec/rtp_packetiser.h"
 #include "virtual_camera/virtual_camera.h"
 
 namespace {
 
 using std::chrono::steady_clock;
-using vexa::camera::PacketisedClip;
 using vexa::camera::RequestFault;
 
 constexpr int kHttpPort = 8080;
 constexpr double kFramesPerSecond = 25;
 constexpr const char* kAddress = "127.0.1.1";
-
-/// Key pictures of one size.
-std::shared_ptr<const PacketisedClip> clip_of(std::size_t picture_size) {
-  std::vector<std::uint8_t> bytes;
-  for (int picture = 0; picture < 4; ++picture) {
-    const std::uint8_t front[] = {0, 0, 0, 1, 0x67, 0x42, 0, 0x1e, 0, 0, 0, 1, 0x68, 0xce, 0, 0, 0, 1, 0x65, 0x88};
-    bytes.insert(bytes.end(), std::begin(front), std::end(front));
-    bytes.insert(bytes.end(), picture_size, static_cast<std::uint8_t>(0x51 + picture));
-  }
-  return std::make_shared<const PacketisedClip>(vexa::camera::Clip::from_annex_b(bytes), 1400);
-}
 
 /// What a stream of so many pictures came to.
 struct Played {
@@ -51,7 +38,7 @@ std::unique_ptr<vexa::camera::VirtualCamera> silent_camera(std::size_t picture_s
   vexa::camera::CameraOptions options;
   options.address = kAddress;
   options.http_port = kHttpPort;
-  options.clip = clip_of(picture_size);
+  options.clip = vexa_bench::made_clip(picture_size);
   options.frames_per_second = kFramesPerSecond;
   options.pictures = pictures;
   options.link_megabits = 100;

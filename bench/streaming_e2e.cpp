@@ -2,23 +2,19 @@
 // What a stream costs from the socket to the host: the driver beside a bare poll and recvfrom loop on the same stream.
 //   streaming_e2e [SECONDS [COUNT]]     COUNT measurements (8) of SECONDS (10); ends with 1 when a frame was lost
 // Needs port 554 on 127.0.1.x: run as root, or in `unshare -rn` with the loopback up.
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <chrono>
-#include <csignal>
 #include <cstdio>
 #include <cstdlib>
-#include <cstring>
-#include <functional>
-#include <iterator>
 #include <memory>
 #include <string>
 #include <thread>
 #include <vector>
 
 #include "bench/bare_stream.h"
+#include "bench/camera_process.h"
 #include "vexa/vexa_common.h"
 #include "virtual_camera/codec/rtp_packetiser.h"
 #include "virtual_camera/virtual_camera.h"
@@ -55,51 +51,24 @@ struct Load {
 std::string camera_address(std::size_t camera) { return "127.0.1." + std::to_string(camera + 1); }
 std::string address_of(std::size_t stream) { return camera_address(stream / kSessionsACamera); }
 
-/// The cameras, in a process of their own so that their work is not counted.
-class Cameras {
- public:
-  Cameras(const Load& load, std::uint64_t pictures) {
-    int ready[2];
-    if (pipe(ready) != 0) std::exit(1);
-    child_ = fork();
-    if (child_ == 0) serve(load, pictures, ready[1]);
-    close(ready[1]);
-    char byte = 0;
-    if (read(ready[0], &byte, 1) != 1) {
-      std::fprintf(stderr, "streaming_e2e: the cameras did not start: is port 554 free, and are you root?\n");
-      std::exit(1);
-    }
-    close(ready[0]);
+void serve(const Load& load, std::uint64_t pictures, int ready) {
+  std::vector<std::unique_ptr<VirtualCamera>> cameras;
+  for (std::size_t i = 0; i * kSessionsACamera < load.streams; ++i) {
+    CameraOptions options;
+    options.address = camera_address(i);
+    options.http_port = kHttpPort;
+    options.clip = load.clip;
+    options.frames_per_second = load.frames_per_second;
+    options.pictures = pictures;
+    options.link_megabits = load.link_megabits;
+    options.sent_log_limit = 0;
+    options.hash_packets = false;
+    cameras.push_back(std::make_unique<VirtualCamera>(options));
+    if (!cameras.back()->start()) return;
   }
-  ~Cameras() {
-    kill(child_, SIGKILL);
-    waitpid(child_, nullptr, 0);
-  }
-  Cameras(const Cameras&) = delete;
-  Cameras& operator=(const Cameras&) = delete;
-
- private:
-  [[noreturn]] static void serve(const Load& load, std::uint64_t pictures, int ready) {
-    std::vector<std::unique_ptr<VirtualCamera>> cameras;
-    for (std::size_t i = 0; i * kSessionsACamera < load.streams; ++i) {
-      CameraOptions options;
-      options.address = camera_address(i);
-      options.http_port = kHttpPort;
-      options.clip = load.clip;
-      options.frames_per_second = load.frames_per_second;
-      options.pictures = pictures;
-      options.link_megabits = load.link_megabits;
-      options.sent_log_limit = 0;
-      options.hash_packets = false;
-      cameras.push_back(std::make_unique<VirtualCamera>(options));
-      if (!cameras.back()->start()) _exit(1);
-    }
-    if (write(ready, "r", 1) != 1) _exit(1);
-    for (;;) pause();
-  }
-
-  pid_t child_ = -1;
-};
+  vexa_bench::report_ready(ready);
+  for (;;) pause();
+}
 
 struct Result {
   double cpu = 0;
@@ -151,7 +120,7 @@ std::uint64_t take_frames(std::vector<std::unique_ptr<CVexaCommon>>& drivers, Co
 
 // Measured from when all streams play: opening them is not the matter here.
 Result run_driver(const Load& load, std::uint64_t pictures) {
-  const Cameras cameras(load, pictures);
+  const vexa_bench::CameraProcess cameras([&](int ready) { serve(load, pictures, ready); });
   std::vector<std::unique_ptr<CVexaCommon>> drivers;
   for (std::size_t i = 0; i < load.streams; ++i) drivers.push_back(streaming_driver(address_of(i)));
   CountingSink warm_up;
@@ -170,7 +139,7 @@ Result run_driver(const Load& load, std::uint64_t pictures) {
 }
 
 Result run_bare(const Load& load, std::uint64_t pictures) {
-  const Cameras cameras(load, pictures);
+  const vexa_bench::CameraProcess cameras([&](int ready) { serve(load, pictures, ready); });
   std::vector<int> media;
   for (std::size_t i = 0; i < load.streams; ++i) media.push_back(open_bare_stream(address_of(i)));
   const Usage before = usage_now();

@@ -189,7 +189,7 @@ int measure(const Options& options) {
                after.cpu - before.cpu, seconds_between(before.time, after.time), after.wakeups - before.wakeups, first,
                at_share(received.delays, 0.5), at_share(received.delays, 0.99), threads, memory, memory_before,
                addresses, seconds_between(begin, before.time), seconds_between(stopping, stopped));
-  return std::fclose(result) == 0 ? 0 : 1;
+  return std::fclose(result) == 0 && received.frames > 0 ? 0 : 1;
 }
 
 }  // namespace
