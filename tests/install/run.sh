@@ -27,6 +27,9 @@ fail() {
 
 cmake --install "$build" --prefix "$prefix" >"$place/install.log" || fail "$(cat "$place/install.log")"
 libraries=$(dirname "$(find "$prefix" -name libVexaCommon.so.1)")
+for file in LICENSE NOTICE THIRD_PARTY_NOTICES.md; do
+  [[ -n $(find "$prefix" -name "$file") ]] || fail "$file is not installed"
+done
 
 echo "-- a host that finds the package with CMake"
 cmake -S "$here/host" -B "$place/host" -G Ninja "-DCMAKE_PREFIX_PATH=$prefix" "-DCMAKE_CXX_COMPILER=$compiler" \
