@@ -120,8 +120,9 @@ struct DriverState {
   void count_interleaved(const InterleavedPacket& packet, const char* payload);
   /// Sends a keep-alive when one is due and none is awaited.
   void begin_keep_alive();
-  /// Takes the answer of a keep-alive if it has come or is too late. Waits for nothing.
-  void look_for_keep_alive();
+  /// Takes the answer of a keep-alive if it has come or is too late. Waits for nothing. True when any of it had come,
+  /// or it is given up.
+  bool look_for_keep_alive();
   /// Waits for the answer of a keep-alive that is awaited.
   void finish_keep_alive();
 

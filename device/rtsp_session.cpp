@@ -131,8 +131,9 @@ void DriverState::begin_keep_alive() {
   });
 }
 
-void DriverState::look_for_keep_alive() {
-  if (!keep_alive) return;
+bool DriverState::look_for_keep_alive() {
+  if (!keep_alive) return false;
+  const bool begun = keep_alive->begun;
   errors.run([&]() -> Outcome {
     const auto outcome = session().keep_alive_outcome(driver.m_RtspSocket, *keep_alive);
     if (!outcome) return LIBD_OK;
@@ -141,6 +142,7 @@ void DriverState::look_for_keep_alive() {
     if (!*outcome) return outcome->failure();
     return LIBD_OK;
   });
+  return !keep_alive || keep_alive->begun != begun;
 }
 
 void DriverState::finish_keep_alive() {

@@ -180,10 +180,13 @@ void DriverState::take_frame(CVexaCommon::VideoFrameInfo& frame) {
 // A keep-alive is awaited while media are received: its answer may take a second, or never come.
 ELibDReturnCode DriverState::read_frame(CVexaCommon::VideoFrameInfo& frame) {
   if (!plays_rtp()) return driver.GetCurrentFrameData(frame);
-  const ELibDReturnCode result = driver.GetRtpCurrentVideoFrame(stream_codec(), frame);
-  look_for_keep_alive();
-  begin_keep_alive();
-  return result;
+  for (;;) {
+    const ELibDReturnCode result = driver.GetRtpCurrentVideoFrame(stream_codec(), frame);
+    const bool answered = look_for_keep_alive();
+    begin_keep_alive();
+    // A read that ended early, because the answer had come, is no empty read.
+    if (result != LIBD_NO_FRAME || !answered || stop_is_requested()) return result;
+  }
 }
 
 std::string DriverState::stream_codec() {
