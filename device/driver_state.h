@@ -107,6 +107,8 @@ struct DriverState {
   /// The media socket together with the event of a stop.
   StoppableSocket stream_source();
   void set_stream_socket(int socket);
+  /// Closes the media socket, and the control socket beside it.
+  void close_media();
 
   // The RTSP session; the starter's, then the streaming thread's, then the stopper's: device/rtsp_session.cpp
   RtspSession session();
@@ -181,7 +183,7 @@ struct DriverState {
   QueuedFacts leave_front() VEXA_REQUIRES(driver.m_FrameQueueLock);
   void free_frame(CVexaCommon::VideoFrameInfo& frame) VEXA_REQUIRES(driver.m_FrameQueueLock);
   void clear_frame_queue();
-  /// Ends each step that changes the queue or the report of a silence.
+  /// Ends each step that changes the queue or the report of a silence: hosts see the counts, and what is ready.
   void note_video() VEXA_REQUIRES(driver.m_FrameQueueLock);
 
   // Settings and the cached inquiry; any thread: device/video_settings.cpp, device/image_controls.cpp

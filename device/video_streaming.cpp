@@ -102,8 +102,7 @@ ELibDReturnCode DriverState::open_rtp_session(const std::string& path) {
   if (control) return LIBD_OK;
   Failure failure = control.failure();
   if (stream_socket() != -1) {
-    shutdown_and_close(stream_socket());
-    set_stream_socket(-1);
+    close_media();
     failure.code = LIBD_STREAM_OPEN_FAILED;
   }
   errors.record(failure);
@@ -269,7 +268,6 @@ ELibDReturnCode CVexaCommon::StopRtpVideoStreaming() {
 void CVexaCommon::ReleaseRtpPacketsPtr() {
   if (m_State->rtp != nullptr) m_State->rtp->collector.discard_all();
   m_State->ledger.end_stream();
-  m_State->chronicle->end_stream();
   m_State->rtp.reset();
   m_RtpPackets.clear();
   std::free(m_RtpPacketBuffer);
