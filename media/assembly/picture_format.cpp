@@ -10,29 +10,44 @@ namespace {
 
 /// Where a frame opens with its parameters, they end within this.
 constexpr std::size_t kFront = 1024;
-constexpr std::size_t kParameters = 192;
 
-constexpr std::uint8_t kSequenceParameterSet = 7;
+constexpr int kUnitKinds = 0x1f;
+constexpr int kFirstSlice = 1;
+constexpr int kLastSlice = 5;
+constexpr int kSequenceParameterSet = 7;
 constexpr std::uint8_t kFirstVideoObjectLayer = 0x20;
 constexpr std::uint8_t kLastVideoObjectLayer = 0x2f;
+constexpr std::uint8_t kVideoObjectPlane = 0xb6;
 
 constexpr std::uint8_t kMarker = 0xff;
 constexpr std::uint8_t kStartOfImage = 0xd8;
 constexpr std::uint8_t kStartOfFrame = 0xc0;
 constexpr std::uint8_t kStartOfScan = 0xda;
 
-/// FNV-1a; never 0.
+/// FNV-1a; 0 of no bytes alone.
 std::uint64_t hash_of(Bytes bytes) {
+  if (bytes.empty()) return 0;
   std::uint64_t hash = 0xcbf29ce484222325;
   for (const unsigned char byte : bytes) hash = (hash ^ byte) * 0x100000001b3;
   return hash == 0 ? 1 : hash;
 }
 
-/// The bytes after the first start code whose unit `is_wanted`, up to the next start code.
-template <typename IsWanted>
-Bytes unit_of(Bytes frame, IsWanted is_wanted) {
-  // A search of few bytes: it is made for every key picture.
-  const Bytes front = frame.first(std::min(frame.size(), kParameters));
+enum class Unit { kParameters, kPicture, kOther };
+
+Unit h264_unit(std::uint8_t header) {
+  const int kind = header & kUnitKinds;
+  if (kind == kSequenceParameterSet) return Unit::kParameters;
+  return kind >= kFirstSlice && kind <= kLastSlice ? Unit::kPicture : Unit::kOther;
+}
+
+Unit mpeg4_unit(std::uint8_t code) {
+  if (code >= kFirstVideoObjectLayer && code <= kLastVideoObjectLayer) return Unit::kParameters;
+  return code == kVideoObjectPlane ? Unit::kPicture : Unit::kOther;
+}
+
+/// The bytes of the first unit of parameters, up to the next start code; none where the picture comes first.
+Bytes parameters_of(Bytes frame, Unit (*unit_of)(std::uint8_t)) {
+  const Bytes front = frame.first(std::min(frame.size(), kFront));
   const auto* end = front.data() + front.size();
   const auto next_code = [end](const unsigned char* from) {
     return find_start_code_mpeg4(from, static_cast<unsigned int>(end - from));
@@ -40,8 +55,11 @@ Bytes unit_of(Bytes frame, IsWanted is_wanted) {
   constexpr std::size_t kCode = 3;
   for (const unsigned char* code = next_code(front.data()); code != nullptr;) {
     const unsigned char* unit = code + kCode;
+    if (unit == end) return {};
+    const Unit kind = unit_of(*unit);
+    if (kind == Unit::kPicture) return {};
     code = next_code(unit);
-    if (unit < end && is_wanted(*unit)) return {unit, code == nullptr ? end : code};
+    if (kind == Unit::kParameters) return {unit, code == nullptr ? end : code};
   }
   return {};
 }
@@ -71,15 +89,10 @@ std::uint64_t picture_format(CodecKind codec, Bytes frame) {
   switch (codec) {
     case CodecKind::kJpeg:
       return jpeg_format(frame);
-    case CodecKind::kMpeg4: {
-      const Bytes layer = unit_of(
-          frame, [](std::uint8_t code) { return code >= kFirstVideoObjectLayer && code <= kLastVideoObjectLayer; });
-      return layer.empty() ? 0 : hash_of(layer);
-    }
-    case CodecKind::kH264: {
-      const Bytes set = unit_of(frame, [](std::uint8_t header) { return (header & 0x1f) == kSequenceParameterSet; });
-      return set.empty() ? 0 : hash_of(set);
-    }
+    case CodecKind::kMpeg4:
+      return hash_of(parameters_of(frame, mpeg4_unit));
+    case CodecKind::kH264:
+      return hash_of(parameters_of(frame, h264_unit));
   }
   return 0;
 }

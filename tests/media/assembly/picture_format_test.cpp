@@ -35,6 +35,11 @@ TEST(PictureFormat, OfMpeg4ChangesWithTheVideoObjectLayerAlone) {
   EXPECT_NE(picture_format(CodecKind::kMpeg4, other_layer), format);
 }
 
+TEST(PictureFormat, IsSoughtInFrontOfThePictureAlone) {
+  EXPECT_EQ(picture_format(CodecKind::kH264, Frame{0, 0, 0, 1, 0x65, 4, 0, 0, 0, 1, 0x67, 1}), 0u);
+  EXPECT_EQ(picture_format(CodecKind::kMpeg4, Frame{0, 0, 1, 0xb6, 4, 0, 0, 1, 0x20, 7}), 0u);
+}
+
 TEST(PictureFormat, OfJpegIsWidthAndHeight) {
   const Frame frame = {0xff, 0xd8, 0xff, 0xe0, 0, 4, 9, 9, 0xff, 0xc0, 0, 17, 8, 0x01, 0xe0, 0x02, 0x80};
   EXPECT_EQ(picture_format(CodecKind::kJpeg, frame), 0x0280u << 16 | 0x01e0u);
