@@ -49,7 +49,7 @@ class Sender {
 class Reader : public CVexaCommon {
  public:
   explicit Reader(int socket) : buffer_(1200000) {
-    m_ConnectionInfo.timeout = 200;
+    m_ConnectionInfo.timeout = 60000;  // a loaded machine is no silence
     m_RtpClockRate = 90000;
     m_StreamSocket = socket;
     if (!m_State->allocate_packets()) std::abort();

@@ -21,29 +21,37 @@ using Clock = std::chrono::steady_clock;
 /// What has arrived is read for at least as long, whatever the time-out.
 constexpr std::chrono::milliseconds kLeastReading{100};
 
+/// Whether the stream is to end is asked under a lock; the wait for a datagram ends at once besides.
+constexpr unsigned kTurnsBetweenQuestions = 16;
+
 }  // namespace
 
 Result<std::optional<PacketRunPlace>> PictureReader::next() {
   ledger_.use_socket(source_.socket.socket);
-  const auto begin = Clock::now();
-  chronicle_.tend_control(source_.clock_rate, begin);
-  const auto give_up = begin + std::max(std::chrono::milliseconds(source_.timeout), kLeastReading);
-  for (;;) {
-    const auto now = Clock::now();
-    if (const auto place = rtp_.collector.next_picture(now)) return place;
+  now_ = Clock::now();
+  chronicle_.tend_control(source_.clock_rate, now_);
+  const auto give_up = now_ + std::max(std::chrono::milliseconds(source_.timeout), kLeastReading);
+  for (unsigned turn = 0;; ++turn) {
+    if (const auto place = rtp_.collector.next_picture(now_)) return place;
     // Packets that never make a picture must not keep the thread from its keep-alive and its stop.
-    if (now > give_up || source_.is_stopped()) return std::optional<PacketRunPlace>();
-    const auto deadline = rtp_.collector.deadline();
-    int until_look = deadline ? milliseconds_until(*deadline) : source_.timeout;
-    if (source_.errand) until_look = std::min(until_look, std::max(milliseconds_until(source_.errand->deadline), 0));
-    if (until_look < source_.timeout) ledger_.about_to_wait();
-    // The collector has to be asked again before the read would time out: that is no silence of the camera.
-    if (until_look < source_.timeout && !packet_waits(until_look)) {
-      if (errand_is_due()) return std::optional<PacketRunPlace>();
-      continue;
-    }
-    if (const auto received = receive(source_.timeout); !received) return received.failure();
+    const bool asks = turn % kTurnsBetweenQuestions == 0;
+    if (now_ > give_up || (asks && source_.is_stopped())) return std::optional<PacketRunPlace>();
+    const int until_look = milliseconds_until_look();
+    const auto received = receive(until_look);
+    if (received) continue;
+    if (received.failure().code != LIBD_TIMEOUT) return received.failure();
+    now_ = Clock::now();
+    if (errand_is_due()) return std::optional<PacketRunPlace>();
+    if (until_look == source_.timeout) return received.failure();
   }
+}
+
+// The collector may have to be asked again before the read would time out: that is no silence of the camera.
+int PictureReader::milliseconds_until_look() const {
+  int least = source_.timeout;
+  if (const auto deadline = rtp_.collector.deadline()) least = std::min(least, milliseconds_until(*deadline, now_));
+  if (source_.errand) least = std::min(least, std::max(milliseconds_until(source_.errand->deadline, now_), 0));
+  return least;
 }
 
 // Kept: a picture whose first packet is too long is reported damaged while it stays listed, and is taken out when it is
@@ -58,17 +66,10 @@ Result<std::optional<PacketRunPlace>> PictureReader::next_jpeg() {
   return next();
 }
 
-// Also true when the read would fail at once.
-bool PictureReader::packet_waits(int timeout) const {
-  const int errand = source_.errand ? source_.errand->descriptor : -1;
-  const WaitBudget budget({timeout, {nullptr, nullptr, errand}});
-  return budget.wait_readable_unless(source_.socket.socket, source_.socket.stop) != 0;
-}
-
 bool PictureReader::errand_is_due() const {
   if (!source_.errand) return false;
   const auto& [descriptor, deadline] = *source_.errand;
-  return Clock::now() >= deadline || (descriptor >= 0 && WaitBudget(0).wait_readable(descriptor) != 0);
+  return now_ >= deadline || (descriptor >= 0 && WaitBudget(0).wait_readable(descriptor) != 0);
 }
 
 void PictureReader::restart_ring() {
@@ -85,13 +86,14 @@ Result<int> PictureReader::receive(int timeout) {
   auto* place = reinterpret_cast<char*>(source_.buffer + rtp_.ring.next_offset());
   SPacketInfo packet;
   std::uint32_t sender = 0;
+  const WaitLimit limit{timeout, {nullptr, nullptr, source_.errand ? source_.errand->descriptor : -1}};
   const auto length =
-      receive_packet(source_.socket, {place, PacketRing::kDatagramRoom}, timeout,
+      receive_packet(source_.socket, {place, PacketRing::kDatagramRoom}, limit,
                      {&rtp_.gather, !rtp_.collector.is_empty(), &ledger_, source_.strict ? &sender : nullptr}, packet);
   if (!length) return length;
-  const auto now = Clock::now();
-  ledger_.datagram(static_cast<std::size_t>(*length), now);
-  take(packet, {static_cast<std::uint32_t>(*length), sender, now});
+  now_ = Clock::now();
+  ledger_.datagram(static_cast<std::size_t>(*length), now_);
+  take(packet, {static_cast<std::uint32_t>(*length), sender});
   return length;
 }
 
@@ -115,13 +117,13 @@ void PictureReader::take(const SPacketInfo& packet, const Datagram& datagram) {
   if (const auto refusal = refusal_of(packet, datagram)) return ledger_.refuse(*refusal);
   const auto arrival = ledger_.place(source_of({packet.data, packet.length}), packet.sequence);
   if (!rtp_.takes(packet)) return ledger_.refuse(StreamLedger::Refusal::kWrongPayloadType);
-  ledger_.media(packet.timestamp, source_.clock_rate, datagram.arrival);
-  chronicle_.arrived(packet, source_.socket.socket, datagram.arrival);
+  ledger_.media(packet.timestamp, source_.clock_rate, now_);
+  chronicle_.arrived(packet, source_.socket.socket, now_);
   if (packet.marker) rtp_.gather.picture_ended();
   // The ring keeps its bytes before it is listed: should memory run out in between, it is lost like one on the wire.
   rtp_.ring.keep(packet);
   const std::uint64_t restarts = rtp_.collector.counts().restarts;
-  if (!rtp_.collector.add(packet, source_.clock_rate, datagram.arrival, arrival)) rtp_.ring.take_back();
+  if (!rtp_.collector.add(packet, source_.clock_rate, now_, arrival)) rtp_.ring.take_back();
   if (rtp_.collector.counts().restarts != restarts) ledger_.restarted(packet.sequence);
 }
 

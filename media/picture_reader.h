@@ -56,17 +56,17 @@ class PictureReader {
   struct Datagram {
     std::uint32_t length;
     std::uint32_t sender;  ///< with strict reception alone
-    StreamLedger::Instant arrival;
   };
   void take(const SPacketInfo& packet, const Datagram& datagram);
   std::optional<StreamLedger::Refusal> refusal_of(const SPacketInfo& packet, const Datagram& datagram) const;
-  bool packet_waits(int timeout) const;
+  int milliseconds_until_look() const;
   bool errand_is_due() const;
 
   RtpReception& rtp_;
   StreamLedger& ledger_;
   FrameChronicle& chronicle_;
   Source source_;
+  StreamLedger::Instant now_{};  // when the latest datagram came, or the latest wait ended
 };
 
 /// A frame that grows by units, in its owner's fields.

@@ -30,7 +30,7 @@ ssize_t read_waiting(int socket, std::span<char> room, const Gathering& gatherin
 }
 
 /// Reads after a nap in the middle of a picture; returns as receive_waiting does.
-ssize_t receive_after_nap(int socket, std::span<char> room, Gathering gathering) {
+ssize_t receive_after_nap(int socket, std::span<char> room, const Gathering& gathering) {
   if (gathering.gather == nullptr || !gathering.in_picture) return -1;
   const std::chrono::microseconds pause = gathering.gather->goes_on();
   if (pause.count() == 0) return -1;
@@ -40,7 +40,8 @@ ssize_t receive_after_nap(int socket, std::span<char> room, Gathering gathering)
 
 }  // namespace
 
-Result<int> receive_datagram(StoppableSocket source, std::span<char> room, WaitLimit limit, Gathering gathering) {
+Result<int> receive_datagram(StoppableSocket source, std::span<char> room, const WaitLimit& limit,
+                             const Gathering& gathering) {
   ssize_t count = read_waiting(source.socket, room, gathering);
   if (count < 0 && is_empty(errno)) count = receive_after_nap(source.socket, room, gathering);
   if (count < 0 && is_empty(errno)) {
@@ -58,8 +59,8 @@ Result<int> receive_datagram(StoppableSocket source, std::span<char> room, WaitL
   return static_cast<int>(count);
 }
 
-Result<int> receive_packet(StoppableSocket source, std::span<char> room, WaitLimit limit, Gathering gathering,
-                           SPacketInfo& packet) {
+Result<int> receive_packet(StoppableSocket source, std::span<char> room, const WaitLimit& limit,
+                           const Gathering& gathering, SPacketInfo& packet) {
   if (room.size() < kLeastRoom) return kInvalidArgument;
   const auto length = receive_datagram(source, room, limit, gathering);
   if (!length) return length;

@@ -35,11 +35,12 @@ struct Gathering {
 
 /// Reads the next datagram into `room`: its length. Reads first and waits only when none is there, so that a
 /// datagram costs one system call while data keep coming. Fails without a text when the stream is to end.
-Result<int> receive_datagram(StoppableSocket source, std::span<char> room, WaitLimit limit, Gathering gathering);
+Result<int> receive_datagram(StoppableSocket source, std::span<char> room, const WaitLimit& limit,
+                             const Gathering& gathering);
 
 /// The same for an RTP packet, whose header's fields go to `packet`; one too short for a header leaves them but for
 /// `received`. `room` has 65535 bytes or more.
-Result<int> receive_packet(StoppableSocket source, std::span<char> room, WaitLimit limit, Gathering gathering,
-                           SPacketInfo& packet);
+Result<int> receive_packet(StoppableSocket source, std::span<char> room, const WaitLimit& limit,
+                           const Gathering& gathering, SPacketInfo& packet);
 
 }  // namespace vexa

@@ -249,6 +249,7 @@ std::optional<PacketCollector::Run> PacketCollector::next_picture(Instant now) {
     mark_used(*run);
   }
   changed_ = false;
+  if (standing_keys_.empty()) return std::nullopt;
   return first_standing_key(now);
 }
 
