@@ -1,9 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "device/driver_state.h"
 
-#include <chrono>
-
 #include "media/frame_chronicle.h"
+#include "runtime/base/moment.h"
 #include "transport/socket.h"
 #include "vexa/runtime.h"
 
@@ -20,8 +19,7 @@ DriverState::DriverState(CVexaCommon& owner)
       alarms({owner.m_IoStreamLock, owner.m_IoStreamSocket, owner.m_LastIoDataTime}, {readiness, kAlarmStream}),
       metadata({owner.m_MdStreamLock, owner.m_MdStreamSocket, owner.m_LastMdDataTime}, {readiness, kMetadataStream}),
       chronicle(std::make_unique<FrameChronicle>(ledger)),
-      created(std::chrono::duration_cast<std::chrono::nanoseconds>(std::chrono::system_clock::now().time_since_epoch())
-                  .count()) {}
+      created(nanoseconds_since_1970()) {}
 
 DriverState::~DriverState() = default;
 

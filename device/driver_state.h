@@ -158,8 +158,10 @@ struct DriverState {
   void part_is_ready(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec);
   void part_is_lost(const CVexaCommon::VideoFrameInfo& frame);
   /// `packets` are those of the frame; none of an HTTP stream's.
-  FrameFacts facts_of(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec, PacketRun packets);
-  void frame_is_ready(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec, const FrameFacts& facts);
+  FrameFacts facts_of(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec, PacketRun packets,
+                      StreamLedger::Instant assembled);
+  void frame_is_ready(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec, const FrameFacts& facts,
+                      StreamLedger::Instant assembled);
   void stamp_picture(CVexaCommon::VideoFrameInfo& frame, std::uint32_t timestamp);
   ELibDReturnCode read_elementary_frame(CVexaCommon::VideoFrameInfo& frame, const Codec& codec, int& received);
   bool reset_stream_buffer();

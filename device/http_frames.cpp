@@ -58,8 +58,7 @@ ELibDReturnCode CVexaCommon::GetCurrentJPEGFrameData(VideoFrameInfo& frame, int&
     return part.failure().code;
   }
   if (part->kind == vexa::PicturePart::Kind::kTooLarge) {
-    m_State->ledger.part_begun();
-    m_State->ledger.part_too_large();
+    m_State->ledger.part(vexa::StreamLedger::PartFate::kTooLarge, 0, std::chrono::steady_clock::now());
     m_State->errors.record({LIBD_BUFFER_TOO_SMALL, vexa::kBufferTooSmall.text});
     m_LastFrameTime = m_State->now();
     return LIBD_BUFFER_TOO_SMALL;
@@ -104,22 +103,17 @@ StreamWindow DriverState::stream_window(std::size_t* part) {
 }
 
 void DriverState::part_is_ready(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec) {
-  ledger.part_begun();
-  ledger.bytes(frame.length, std::chrono::steady_clock::now());
-  ledger.part_assembled();
-  frame_is_ready(frame, codec, facts_of(frame, codec, {}));
+  const auto assembled = std::chrono::steady_clock::now();
+  ledger.part(StreamLedger::PartFate::kAssembled, frame.length, assembled);
+  frame_is_ready(frame, codec, facts_of(frame, codec, {}, assembled), assembled);
 }
 
 // A frame that has begun and is not whole.
 void DriverState::part_is_lost(const CVexaCommon::VideoFrameInfo& frame) {
   if (frame.length == 0) return;
-  ledger.part_begun();
-  ledger.bytes(frame.length, std::chrono::steady_clock::now());
-  if (frame.length >= frame.capacity) {
-    ledger.part_too_large();
-  } else {
-    ledger.part_incomplete();
-  }
+  const bool too_large = frame.length >= frame.capacity;
+  ledger.part(too_large ? StreamLedger::PartFate::kTooLarge : StreamLedger::PartFate::kIncomplete, frame.length,
+              std::chrono::steady_clock::now());
   ledger.publish();
 }
 

@@ -9,6 +9,7 @@
 #include "media/assembly/picture_clock.h"
 #include "media/assembly/rtp_pictures.h"
 #include "media/frame_chronicle.h"
+#include "runtime/base/moment.h"
 #include "transport/wire/rtp_header.h"
 
 namespace {
@@ -137,10 +138,10 @@ void DriverState::begin_frame() {
   ledger.frame_taken();
 }
 
-void DriverState::frame_is_ready(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec,
-                                 const FrameFacts& facts) {
+void DriverState::frame_is_ready(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec, const FrameFacts& facts,
+                                 StreamLedger::Instant assembled) {
   ready_frame = {frame.data, false, facts};
-  ledger.frame_ready(frame.frameType == codec.key_frame, std::chrono::steady_clock::now());
+  ledger.frame_ready(frame.frameType == codec.key_frame, assembled);
   ledger.publish();
 }
 
@@ -180,13 +181,15 @@ ELibDReturnCode DriverState::finish_rtp_frame(CVexaCommon::VideoFrameInfo& frame
   driver.m_LastFrameTime = now();
   stamp_picture(frame, timestamp);
   const PacketRun packets = collector.packets(run);
-  const FrameFacts facts = facts_of(frame, rtp->codec, packets);
+  const auto assembled = std::chrono::steady_clock::now();
+  const FrameFacts facts = facts_of(frame, rtp->codec, packets, assembled);
   collector.use(run);
-  frame_is_ready(frame, rtp->codec, facts);
+  frame_is_ready(frame, rtp->codec, facts, assembled);
   return LIBD_OK;
 }
 
-FrameFacts DriverState::facts_of(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec, PacketRun packets) {
+FrameFacts DriverState::facts_of(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec, PacketRun packets,
+                                 StreamLedger::Instant assembled) {
   FrameChronicle::Picture picture{codec.kind,
                                   packets.empty() ? nullptr : &packets.front(),
                                   packets.empty() ? nullptr : &packets.back(),
@@ -195,11 +198,10 @@ FrameFacts DriverState::facts_of(const CVexaCommon::VideoFrameInfo& frame, const
                                   driver.m_RtpClockRate,
                                   std::nullopt};
   if (driver.m_EdgeStoragePlayback) {
-    constexpr std::int64_t kNanosecondsASecond = 1'000'000'000;
     constexpr std::int64_t kNanosecondsAMicrosecond = 1000;
     picture.range_time = frame.seconds * kNanosecondsASecond + frame.microseconds * kNanosecondsAMicrosecond;
   }
-  return chronicle->facts_of(picture);
+  return chronicle->facts_of(picture, assembled);
 }
 
 void DriverState::stamp_picture(CVexaCommon::VideoFrameInfo& frame, std::uint32_t timestamp) {

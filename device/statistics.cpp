@@ -8,6 +8,7 @@
 #include <cstring>
 
 #include "device/driver_state.h"
+#include "runtime/base/moment.h"
 
 namespace {
 
@@ -173,15 +174,9 @@ std::uint64_t microseconds_since(std::uint64_t moment, std::uint64_t now) {
   return now > moment ? (now - moment) / kNanosecondsAMicrosecond : 0;
 }
 
-template <typename Clock>
-std::uint64_t nanoseconds_on() {
-  return static_cast<std::uint64_t>(
-      std::chrono::duration_cast<std::chrono::nanoseconds>(Clock::now().time_since_epoch()).count());
-}
-
 void take_times(const vexa::StreamRecord& stream, StreamStatistics& out) {
-  const std::uint64_t now = nanoseconds_on<std::chrono::steady_clock>();
-  out.time = nanoseconds_on<std::chrono::system_clock>() / kNanosecondsAMicrosecond;
+  const auto now = static_cast<std::uint64_t>(vexa::nanoseconds_of(std::chrono::steady_clock::now()));
+  out.time = static_cast<std::uint64_t>(vexa::nanoseconds_since_1970()) / kNanosecondsAMicrosecond;
   out.epoch = stream.epoch;
   out.epochSince = stream.epoch_since / kNanosecondsAMicrosecond;
   out.wakeUps = stream.wakeups;

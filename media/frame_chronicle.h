@@ -10,6 +10,7 @@
 #include "media/assembly/codec.h"
 #include "media/stream_ledger.h"
 #include "runtime/base/bytes.h"
+#include "runtime/base/moment.h"
 #include "transport/socket.h"
 #include "transport/wire/sender_clock.h"
 #include "vexa/frame_facts.h"
@@ -28,15 +29,15 @@ class FrameChronicle {
   /// A stream starts. `control` is the RTCP socket, invalid where there is none; `camera` the camera's address in
   /// network order, from which alone reports are taken.
   void begin_stream(Socket control, std::uint32_t camera);
-  void end_stream() { control_ = {}; }
+  void end_stream() { stream_.control = {}; }
   /// The camera's address in network order; 0 where it is not known.
-  std::uint32_t camera() const { return camera_; }
+  std::uint32_t camera() const { return stream_.camera; }
 
   /// A packet of the stream came, through `socket`.
   void arrived(const SPacketInfo& packet, int socket, Instant now) {
-    Arrivals& latest = arrivals_[latest_];
+    Arrivals& latest = stream_.arrivals[stream_.latest];
     if (packet.timestamp != latest.timestamp || !latest.used) return arrived_elsewhere(packet, socket, now);
-    latest.last = now.time_since_epoch().count();
+    latest.last = nanoseconds_of(now);
     if (packet.marker) stamp(latest.last, latest, socket);
   }
 
@@ -55,8 +56,8 @@ class FrameChronicle {
     std::optional<std::int64_t> range_time;  ///< of a recording, nanoseconds since 1970
   };
 
-  /// The facts of a frame that stands assembled; its run has not left the list yet.
-  FrameFacts facts_of(const Picture& picture);
+  /// The facts of a frame that stands assembled since `now`; its run has not left the list yet.
+  FrameFacts facts_of(const Picture& picture, Instant now);
 
  private:
   struct Arrivals {
@@ -76,37 +77,43 @@ class FrameChronicle {
   void report_back(int clock_rate, Instant now);
   std::uint32_t discontinuity_before(const Picture& picture, Instant now);
   void add_packet_facts(const Picture& picture, FrameFacts& facts);
-  void add_clock_facts(const Picture& picture, FrameFacts& facts);
+  void add_clock_facts(const Picture& picture, FrameFacts& facts, Instant now);
+
+  /// All that is known of one stream.
+  struct Stream {
+    // Arrivals, of the latest pictures
+    std::array<Arrivals, 64> arrivals{};
+    std::size_t latest = 0;    ///< opened
+    std::uint32_t newest = 0;  ///< time stamp
+    // The frame before
+    bool started = false;
+    CodecKind codec = CodecKind::kJpeg;
+    std::uint64_t format = 0;
+    std::optional<std::uint32_t> ssrc{};
+    std::uint64_t runs = 0;
+    std::uint64_t last_sequence = 0;
+    std::uint64_t lost_frames = 0;  ///< of the driver's life, when it was handed on
+    std::uint32_t timestamp = 0;
+    std::int64_t unwrapped = 0;
+    Instant frame_time{};
+    // RTCP
+    Socket control{};
+    std::uint32_t camera = 0;
+    std::uint32_t reporter = 0;  ///< SSRC of this side
+    std::uint16_t peer_port = 0;
+    Instant looked{};
+    Instant reported{};
+    std::optional<SenderReport> waiting{};  ///< came before it was known whose the media are
+    SenderClock::Arrival waiting_arrival{};
+    std::uint64_t latest_ntp = 0;
+    Instant latest_report{};
+    std::uint64_t reported_expected = 0;
+    std::uint64_t reported_missing = 0;
+    SenderClock clock{};
+  };
 
   StreamLedger& ledger_;
-  // Arrivals, of the latest pictures
-  std::array<Arrivals, 64> arrivals_{};
-  std::size_t latest_ = 0;
-  // The frame before
-  bool started_ = false;
-  CodecKind codec_ = CodecKind::kJpeg;
-  std::uint64_t format_ = 0;
-  std::optional<std::uint32_t> ssrc_;
-  std::uint64_t runs_ = 0;
-  std::uint64_t last_sequence_ = 0;
-  std::uint64_t lost_frames_ = 0;  ///< of the driver's life, when it was handed on
-  std::uint32_t timestamp_ = 0;
-  std::int64_t unwrapped_ = 0;
-  Instant frame_time_{};
-  // RTCP
-  Socket control_;
-  std::uint32_t camera_ = 0;
-  std::uint32_t reporter_ = 0;  ///< SSRC of this side
-  std::uint16_t peer_port_ = 0;
-  Instant looked_{};
-  Instant reported_{};
-  std::optional<SenderReport> waiting_;  ///< came before media told whose it is
-  SenderClock::Arrival waiting_arrival_{};
-  std::uint64_t latest_ntp_ = 0;
-  Instant latest_report_{};
-  std::uint64_t reported_expected_ = 0;
-  std::uint64_t reported_missing_ = 0;
-  SenderClock clock_;
+  Stream stream_;
 };
 
 }  // namespace vexa

@@ -9,21 +9,14 @@
 namespace vexa {
 namespace {
 
-using Clock = std::chrono::steady_clock;
-
 /// How often the kernel is asked for its drops: a count of the past, which no one reads oftener.
-constexpr std::chrono::milliseconds kDropsInterval{250};
-
-std::uint64_t nanoseconds_since_1970() {
-  const auto now = std::chrono::system_clock::now().time_since_epoch();
-  return static_cast<std::uint64_t>(std::chrono::duration_cast<std::chrono::nanoseconds>(now).count());
-}
+constexpr std::uint64_t kDropsInterval = 250'000'000;  // nanoseconds
 
 }  // namespace
 
 void StreamLedger::begin_epoch() {
   ++counts_.epoch;
-  counts_.epoch_since = nanoseconds_since_1970();
+  counts_.epoch_since = static_cast<std::uint64_t>(nanoseconds_since_1970());
 }
 
 void StreamLedger::begin_stream(StreamTransport transport) {
@@ -133,36 +126,34 @@ void StreamLedger::measure_jitter(std::uint32_t timestamp, int clock_rate, Insta
   last_first_arrival_ = now;
 }
 
-void StreamLedger::bytes(std::size_t count, Instant now) {
-  counts_.bytes_received += count;
-  counts_.last_packet = static_cast<std::uint64_t>(now.time_since_epoch().count());
-}
-
-void StreamLedger::part_assembled() {
-  --counts_.collection.pictures_held;
-  ++counts_.collection.pictures_assembled;
-}
-
-void StreamLedger::part_incomplete() {
-  --counts_.collection.pictures_held;
-  ++counts_.collection.pictures_incomplete;
-}
-
-void StreamLedger::part_too_large() {
-  --counts_.collection.pictures_held;
-  ++counts_.collection.pictures_too_large;
+void StreamLedger::part(PartFate fate, std::size_t bytes, Instant now) {
+  CollectionCounts& collection = counts_.collection;
+  ++collection.pictures_begun;
+  switch (fate) {
+    case PartFate::kAssembled:
+      ++collection.pictures_assembled;
+      break;
+    case PartFate::kIncomplete:
+      ++collection.pictures_incomplete;
+      break;
+    case PartFate::kTooLarge:
+      ++collection.pictures_too_large;
+      break;
+  }
+  counts_.bytes_received += bytes;
+  counts_.last_packet = static_cast<std::uint64_t>(nanoseconds_of(now));
 }
 
 void StreamLedger::frame_ready(bool key, Instant now) {
   if (key) ++counts_.key_frames;
-  counts_.last_frame = static_cast<std::uint64_t>(now.time_since_epoch().count());
-  read_kernel_drops(now);
+  counts_.last_frame = static_cast<std::uint64_t>(nanoseconds_of(now));
+  read_kernel_drops(counts_.last_frame);
 }
 
 // SO_MEMINFO holds what SO_RXQ_OVFL would report with each datagram, for the price of a question now and then.
-void StreamLedger::read_kernel_drops(Instant now) {
-  if (socket_ == -1 || now - drops_read_ < kDropsInterval) return;
-  drops_read_ = now;
+void StreamLedger::read_kernel_drops(std::uint64_t moment) {
+  if (socket_ == -1 || moment < drops_read_ + kDropsInterval) return;
+  drops_read_ = moment;
   std::uint32_t memory[SK_MEMINFO_VARS] = {};
   socklen_t length = sizeof memory;
   if (getsockopt(socket_, SOL_SOCKET, SO_MEMINFO, memory, &length) != 0) return;
@@ -172,7 +163,7 @@ void StreamLedger::read_kernel_drops(Instant now) {
 }
 
 void StreamLedger::about_to_wait() {
-  read_kernel_drops(Clock::now());
+  read_kernel_drops(static_cast<std::uint64_t>(nanoseconds_of(std::chrono::steady_clock::now())));
   publish();
 }
 

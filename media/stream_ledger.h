@@ -8,6 +8,7 @@
 #include <optional>
 
 #include "media/assembly/collection_counts.h"
+#include "runtime/base/moment.h"
 #include "runtime/base/published.h"
 #include "transport/rtp_socket.h"
 #include "transport/wire/packet_order.h"
@@ -69,7 +70,7 @@ class StreamLedger final : public WaitObserver {
   void datagram(std::size_t bytes, Instant now) {
     ++counts_.packets_received;
     counts_.bytes_received += bytes;
-    const auto moment = static_cast<std::uint64_t>(now.time_since_epoch().count());
+    const auto moment = static_cast<std::uint64_t>(nanoseconds_of(now));
     const std::uint64_t gap = moment - counts_.last_packet;
     if (gap > counts_.longest_gap && gap_counts_) counts_.longest_gap = gap;
     gap_counts_ = true;
@@ -96,15 +97,10 @@ class StreamLedger final : public WaitObserver {
     measure_jitter(timestamp, clock_rate, now);
   }
 
-  // Frames of a stream that has no packets.
-  void part_begun() {
-    ++counts_.collection.pictures_begun;
-    ++counts_.collection.pictures_held;
-  }
-  void bytes(std::size_t count, Instant now);
-  void part_assembled();
-  void part_incomplete();
-  void part_too_large();
+  enum class PartFate { kAssembled, kIncomplete, kTooLarge };
+
+  /// A frame of a stream that has no packets has come, or what there is of it.
+  void part(PartFate fate, std::size_t bytes, Instant now);
 
   /// A frame stands assembled, of whatever transport; the one before it is out of the reader's hands.
   void frame_ready(bool key, Instant now);
@@ -136,7 +132,7 @@ class StreamLedger final : public WaitObserver {
   void adopt(std::uint32_t ssrc);
   void measure_jitter(std::uint32_t timestamp, int clock_rate, Instant now);
   void begin_epoch();
-  void read_kernel_drops(Instant now);
+  void read_kernel_drops(std::uint64_t moment);
 
   StreamRecord counts_;
   SequenceLedger sequence_;
@@ -156,7 +152,7 @@ class StreamLedger final : public WaitObserver {
   std::uint64_t jitter_16_ = 0;  // 16 times the nanoseconds
   int socket_ = -1;
   std::uint32_t socket_drops_ = 0;
-  Instant drops_read_{};
+  std::uint64_t drops_read_ = 0;  // moment
   Published<StreamRecord> published_;
 };
 

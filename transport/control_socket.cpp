@@ -7,21 +7,15 @@
 #include <sys/socket.h>
 
 #include <cerrno>
-#include <chrono>
 #include <cstring>
 
+#include "runtime/base/moment.h"
 #include "transport/tcp_connect.h"
 
 namespace vexa {
 namespace {
 
 constexpr int kLastPort = 65535;
-constexpr std::int64_t kNanosecondsASecond = 1'000'000'000;
-
-std::int64_t now_in_nanoseconds() {
-  const auto now = std::chrono::system_clock::now().time_since_epoch();
-  return std::chrono::duration_cast<std::chrono::nanoseconds>(now).count();
-}
 
 /// The time that the kernel put beside a datagram; this moment where it put none.
 std::int64_t arrival_in(msghdr& message) {
@@ -32,7 +26,7 @@ std::int64_t arrival_in(msghdr& message) {
     std::memcpy(&time, CMSG_DATA(part), sizeof time);
     return std::int64_t{time.tv_sec} * kNanosecondsASecond + time.tv_nsec;
   }
-  return now_in_nanoseconds();
+  return nanoseconds_since_1970();
 }
 
 sockaddr_in internet_address(std::uint32_t address, std::uint16_t port) {

@@ -4,6 +4,8 @@
 #include <algorithm>
 #include <utility>
 
+#include "runtime/base/moment.h"
+
 namespace vexa {
 namespace {
 
@@ -17,7 +19,6 @@ constexpr std::size_t kMostText = 255;
 constexpr std::int32_t kMostLost = 0x7fffff;
 constexpr std::int32_t kLeastLost = -0x800000;
 
-constexpr std::int64_t kNanosecondsASecond = 1'000'000'000;
 constexpr std::int64_t kSecondsTo1970 = 2'208'988'800;
 constexpr std::int64_t kSecondsOfAnEra = std::int64_t{1} << 32;
 constexpr std::uint32_t kFirstSecondOf1968 = 0x80000000;
