@@ -117,9 +117,10 @@ struct DriverState {
   Failure count_rtsp(std::uint64_t requests, const Failure& failure);
   Result<int> open_rtp_over_udp(const std::string& url, int port);
   Result<int> open_rtp_over_tcp(const std::string& url, int port);
-  /// Counts a datagram of `length` bytes that a model class reads itself.
-  void count_passed_on(Bytes packet, std::size_t length);
-  void count_interleaved(const InterleavedPacket& packet, const char* payload);
+  /// Counts a datagram of `length` bytes that a model class reads itself; no header where it is shorter than one.
+  void count_passed_on(std::size_t length, const std::optional<RtpHeader>& header);
+  /// The same for a packet inside a connection; one of the control channel goes to the chronicle.
+  void take_interleaved(const InterleavedPacket& packet, const char* payload);
   /// Sends a keep-alive when one is due and none is awaited.
   void begin_keep_alive();
   /// Takes the answer of a keep-alive if it has come or is too late. Waits for nothing. True when any of it had come,

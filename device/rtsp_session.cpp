@@ -12,6 +12,7 @@
 #include "device/driver_state.h"
 #include "media/frame_chronicle.h"
 #include "runtime/base/base64.h"
+#include "runtime/base/moment.h"
 #include "transport/control_socket.h"
 #include "transport/failure.h"
 #include "transport/interleaved_stream.h"
@@ -82,36 +83,24 @@ Result<int> DriverState::open_rtp_over_tcp(const std::string& url, int port) {
 }
 
 // A model class that reads packets itself does so in the thread that reads the stream.
-void DriverState::count_passed_on(Bytes packet, std::size_t length) {
-  ledger.datagram(length, std::chrono::steady_clock::now());
-  // A short one has left the fields of the packet before it.
-  const auto header = length < kRtpHeaderSize ? std::nullopt : parse_rtp_header(packet);
-  if (header) {
-    ledger.place(source_of(packet), header->sequence);
-    ledger.media(header->timestamp, driver.m_RtpClockRate, std::chrono::steady_clock::now());
-  }
+void DriverState::count_passed_on(std::size_t length, const std::optional<RtpHeader>& header) {
+  const auto arrival = std::chrono::steady_clock::now();
+  ledger.datagram(length, arrival);
   ledger.passed_on();
-  ledger.publish();
+  if (header) {
+    ledger.place(header->ssrc, header->sequence);
+    ledger.media(header->timestamp, driver.m_RtpClockRate, arrival);
+  }
+  if (!header || header->marker) ledger.publish();
 }
 
-void DriverState::count_interleaved(const InterleavedPacket& packet, const char* payload) {
-  const auto arrival = std::chrono::steady_clock::now();
+void DriverState::take_interleaved(const InterleavedPacket& packet, const char* payload) {
   const auto length = static_cast<std::size_t>(packet.length);
-  if (packet.control_front.empty()) {
-    ledger.datagram(kRtpHeaderSize + length, arrival);
-    ledger.place(packet.ssrc, packet.header.sequence);
-    ledger.media(packet.header.timestamp, driver.m_RtpClockRate, arrival);
-    ledger.passed_on();
-    if (packet.header.marker) ledger.publish();
-    return;
-  }
+  if (packet.control_front.empty()) return count_passed_on(kRtpHeaderSize + length, packet.header);
   std::vector<unsigned char> compound = packet.control_front;
   compound.insert(compound.end(), payload, payload + length);
-  using std::chrono::duration_cast;
-  using std::chrono::nanoseconds;
   chronicle->take_control(compound, driver.m_RtpClockRate,
-                          {duration_cast<nanoseconds>(std::chrono::system_clock::now().time_since_epoch()).count(),
-                           duration_cast<nanoseconds>(arrival.time_since_epoch()).count()});
+                          {nanoseconds_since_1970(), nanoseconds_of(std::chrono::steady_clock::now())});
   ledger.publish();
 }
 
@@ -260,7 +249,7 @@ int CVexaCommon::rtp_over_tcp_payload_recv(int socket, char* buffer, int size, b
   m_State->errors.clear();
   return m_State->errors.run([&]() -> vexa::Result<int> {
     const auto packet = vexa::receive_interleaved(socket, vexa::room_of(buffer, size), timeout);
-    if (packet && *packet) m_State->count_interleaved(**packet, buffer);
+    if (packet && *packet) m_State->take_interleaved(**packet, buffer);
     if (!packet || !*packet) m_State->ledger.publish();
     if (!packet) return packet.failure();
     if (!*packet) return 0;
@@ -281,9 +270,12 @@ int CVexaCommon::rtp_over_udp_recvn(int socket, char* buffer, int length, int ti
 int CVexaCommon::rtp_over_udp_payload_recv(int socket, char* buffer, int size, int timeout, SPacketInfo& packet) {
   m_State->errors.clear();
   return m_State->errors.run([&] {
+    const vexa::StoppableSocket source{socket, m_State->stream_source().stop};
     const auto length =
-        vexa::receive_packet({socket, m_State->stream_source().stop}, vexa::room_of(buffer, size), timeout, {}, packet);
-    if (length) m_State->count_passed_on({packet.data, packet.length}, static_cast<std::size_t>(*length));
+        vexa::receive_packet(source, vexa::room_of(buffer, size), timeout, {.observer = &m_State->ledger}, packet);
+    if (!length) return length;
+    const auto count = static_cast<std::size_t>(*length);
+    m_State->count_passed_on(count, vexa::parse_rtp_header({reinterpret_cast<unsigned char*>(buffer), count}));
     return length;
   });
 }

@@ -62,9 +62,8 @@ Result<std::optional<InterleavedPacket>> receive_interleaved(int socket, std::sp
   const auto payload = interleaved_payload(*length, front);
   if (!payload) return kPayloadLength;
   if (const auto read = receive_exactly(socket, room.first(*payload), limit); !read) return read.failure();
-  const Bytes header = bytes_of(fixed);
-  return std::optional(InterleavedPacket{static_cast<int>(*payload), parse_rtp_header(header).value_or(RtpHeader{}),
-                                         source_of(header), std::move(control_front)});
+  const RtpHeader header = parse_rtp_header(bytes_of(fixed)).value_or(RtpHeader{});
+  return std::optional(InterleavedPacket{static_cast<int>(*payload), header, std::move(control_front)});
 }
 
 }  // namespace vexa

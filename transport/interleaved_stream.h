@@ -19,7 +19,6 @@ Result<> receive_exactly(int socket, std::span<char> room, WaitLimit limit);
 struct InterleavedPacket {
   int length = 0;  ///< of the payload in the caller's room
   RtpHeader header{};
-  std::uint32_t ssrc = 0;
   /// What stood before the payload when the packet came on an odd channel, where control packets go; else empty.
   std::vector<unsigned char> control_front;
 };

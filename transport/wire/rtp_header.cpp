@@ -3,17 +3,17 @@
 
 namespace vexa {
 
+// One check and plain reads: it runs for every datagram. The first byte (version, padding, extension, CSRC count) is
+// not looked at: each transport has its own rule for it.
 std::optional<RtpHeader> parse_rtp_header(Bytes datagram) {
-  ByteReader in(datagram);
-  in.u8();  // version, padding, extension, CSRC count: each transport has its own rule for them
-  const std::uint8_t type = in.u8();
+  if (datagram.size() < kRtpHeaderSize) return std::nullopt;
   RtpHeader header;
-  header.marker = (type & 0x80) != 0;
-  header.payload_type = type & 0x7f;
-  header.sequence = in.u16();
-  header.timestamp = in.u32();
-  in.u32();  // SSRC: one source a session
-  if (!in.ok()) return std::nullopt;
+  header.marker = (datagram[1] & 0x80) != 0;
+  header.payload_type = datagram[1] & 0x7f;
+  header.sequence = static_cast<std::uint16_t>(datagram[2] << 8 | datagram[3]);
+  header.timestamp = std::uint32_t{datagram[4]} << 24 | std::uint32_t{datagram[5]} << 16 |
+                     std::uint32_t{datagram[6]} << 8 | datagram[7];
+  header.ssrc = source_of(datagram);
   return header;
 }
 

@@ -18,6 +18,7 @@ struct RtpHeader {
   std::uint8_t payload_type = 0;
   std::uint16_t sequence = 0;
   std::uint32_t timestamp = 0;
+  std::uint32_t ssrc = 0;
 };
 
 /// The SSRC of a packet of at least kRtpHeaderSize bytes.
