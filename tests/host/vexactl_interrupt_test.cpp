@@ -169,6 +169,22 @@ TEST(Interruption, EndsTheProgramsAtAnyMoment) {
 class Interrupted : public WithCamera {
  protected:
   static constexpr std::chrono::seconds kPatience{30};
+
+  /// A camera that turns, and leaves the first such request unanswered.
+  void start_without_answer(const std::string& request) {
+    vexa::camera::CameraOptions options;
+    options.profile_path = kTurningCamera;
+    options.request_faults = {RequestFault::no_answer(request).nth(1)};
+    start_camera(options);
+  }
+  /// Interrupts the program when the camera has got the request.
+  void expect_sent_again(ProgramRun& run, const std::string& request) {
+    ASSERT_TRUE(camera().journal().wait_for_count(request, 1, kPatience));
+    run.signal(SIGINT);
+    const ProgramResult result = run.wait();
+    EXPECT_EQ(result.exit_code, 130) << result.err;
+    EXPECT_EQ(camera().journal().count(request), 2u);
+  }
 };
 
 TEST_F(Interrupted, WhileTheCameraIsAskedIsReportedAsThatAndNotAsASilentCamera) {
@@ -181,6 +197,23 @@ TEST_F(Interrupted, WhileTheCameraIsAskedIsReportedAsThatAndNotAsASilentCamera) 
   const ProgramResult result = run.wait();
   EXPECT_EQ(result.exit_code, 130);
   EXPECT_THAT(result.err, testing::HasSubstr("interrupted while the camera was asked"));
+}
+
+TEST_F(Interrupted, WhileItStopsAMoveItSendsTheStopAgain) {
+  const std::string stop = "ptzf.cgi?ContinuousPanTiltZoom=0,0,";
+  start_without_answer(stop);
+  ProgramRun run(folder(), vexactl({"ptz", place(), "pan", "left", "--for", "0.01", "--timeout", "60000"}),
+                 kCredentials);
+  expect_sent_again(run, stop);
+}
+
+TEST_F(Interrupted, WhileItEndsTheAlarmDataItSendsTheEndAgain) {
+  const std::string end = "/command/system.cgi?AlarmData=off";
+  start_without_answer(end);
+  ProgramRun run(folder(), vexactl({"watch", place(), "--count", "1", "--timeout", "60000"}), kCredentials);
+  ASSERT_TRUE(camera().journal().wait_for_count("/command/alarmdata.cgi", 1, kPatience));
+  ASSERT_TRUE(camera().alarms().happen({vexa::camera::AlarmEvent::Kind::kMotion, 1, 9}));
+  expect_sent_again(run, end);
 }
 
 }  // namespace
