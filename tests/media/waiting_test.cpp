@@ -23,43 +23,6 @@ namespace {
 
 constexpr int kLong = 30000;  // milliseconds, never used up
 
-/// A driver whose frames come from the test in place of a camera.
-class FedDriver : public MediaDriver {
- public:
-  FedDriver() {
-    state().now = [] { return std::time_t{1000}; };
-    m_LastFrameTime = 1000;
-    use("127.0.0.1", 1, 5000);
-  }
-
-  /// What the streaming thread does with a frame.
-  void feed(ELibDReturnCode result = LIBD_OK, std::int32_t type = VIDEO_FRAME_JPEG) {
-    VideoFrameInfo frame = made_frame(type);
-    ProcessCurrentFrameData(this, frame, wait_key_, result);
-  }
-
-  static VideoFrameInfo made_frame(std::int32_t type) {
-    VideoFrameInfo frame;
-    frame.capacity = frame.length = 8;
-    frame.data = new unsigned char[frame.capacity]();
-    frame.frameType = type;
-    return frame;
-  }
-
-  std::size_t waiting() {
-    const vexa::Guard guard(m_FrameQueueLock);
-    return m_FrameQueue.size();
-  }
-
-  ELibDReturnCode take() {
-    SLibDVideoFrameInfo frame;
-    return GetCurrentVideoFrame(frame);
-  }
-
- private:
-  bool wait_key_ = false;
-};
-
 TEST(VideoFrameDescriptor, IsReadableAsLongAsAFrameWaits) {
   FedDriver driver;
   const int descriptor = vexa::VideoFrameDescriptor(driver);
@@ -118,11 +81,10 @@ TEST(VideoFrameDescriptor, IsReadableExactlyWhenThePollHasMoreThanNoFrame) {
 TEST(VideoFrameDescriptor, IsReadableForFramesThatAModelClassQueues) {
   FedDriver driver;
   const int descriptor = vexa::VideoFrameDescriptor(driver);
-  bool wait_key = false;
   auto frame = FedDriver::made_frame(VIDEO_FRAME_JPEG);
   {
     const vexa::Guard guard(driver.m_FrameQueueLock);
-    FedDriver::PropulateFrameInfoList(&driver, frame, wait_key);
+    FedDriver::PropulateFrameInfoList(&driver, frame, driver.wait_key);
   }
   EXPECT_TRUE(is_readable(descriptor));
 }
@@ -144,11 +106,6 @@ TEST(VideoFrameDescriptor, TakesOneSystemCallForAllFramesUntilTheQueueIsEmpty) {
   ASSERT_EQ(eventfd_read(descriptor, &writes), 0);
   EXPECT_EQ(writes, 1u);
 }
-
-class ThrowingSink : public CDataSink {
- public:
-  void Write(const unsigned char*, unsigned int) override { throw std::runtime_error("disk full"); }
-};
 
 TEST(VideoFrameDescriptor, StaysReadableForAFrameThatASinkHasRefused) {
   FedDriver driver;
@@ -431,8 +388,7 @@ TEST(WaitingLive, PromptFramesArriveWholeAndTheSettingHoldsForARunningStream) {
   auto options = camera_options();
   LiveCamera camera(options);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   FrameTaker host;
   for (std::uint64_t picture = 0; picture < 20;) {
     vexa::SetPromptFrames(driver, picture % 8 < 4);
