@@ -138,8 +138,7 @@ TEST_F(HttpLive, TheCamerasPositionIsTakenFromEveryCodec) {
     ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
     expect_frames(way, 10, options_.user_data);
     EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
-    const vexa::Guard guard(driver_.m_CamPosLock);
-    EXPECT_EQ(driver_.m_CamPosText, options_.user_data.substr(0, 24));
+    EXPECT_EQ(driver_.position_text(), options_.user_data.substr(0, 24));
   }
 }
 

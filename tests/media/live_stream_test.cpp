@@ -153,11 +153,6 @@ CameraOptions codec_options(const std::string& clip, unsigned index = 0) {
   return options;
 }
 
-std::string position_of(MediaDriver& driver) {
-  const vexa::Guard guard(driver.m_CamPosLock);
-  return driver.m_CamPosText;
-}
-
 class Codec : public testing::TestWithParam<const char*> {
  protected:
   static bool is_jpeg() { return std::string(GetParam()).ends_with(".mjpeg"); }
@@ -195,7 +190,7 @@ TEST_P(Codec, ReportsTheCamerasPositionAndLosesNoPicture) {
   const auto frames = FrameTaker().take_all(driver, 30);
   ASSERT_EQ(frames.size(), 30u);
   for (std::size_t i = 0; i < frames.size(); ++i) ASSERT_TRUE(camera.sent(i, frames[i].bytes)) << "picture " << i;
-  EXPECT_EQ(position_of(driver), "CamPos: 0123,4567,89ab,c");
+  EXPECT_EQ(driver.position_text(), "CamPos: 0123,4567,89ab,c");
 }
 
 INSTANTIATE_TEST_SUITE_P(Clips, Codec, testing::Values("small.m4v", "plain.mjpeg", "restart.mjpeg", "sliced.mjpeg"),
@@ -215,7 +210,7 @@ TEST(LiveH264, ReportsTheCamerasPosition) {
   const auto frames = FrameTaker().take_all(driver, 30);
   ASSERT_EQ(frames.size(), 30u);
   for (std::size_t i = 0; i < frames.size(); ++i) ASSERT_TRUE(camera.sent(i, frames[i].bytes)) << "picture " << i;
-  EXPECT_EQ(position_of(driver).substr(0, 17), "CamPos: 0123,4567");
+  EXPECT_EQ(driver.position_text().substr(0, 17), "CamPos: 0123,4567");
 }
 
 }  // namespace
