@@ -308,7 +308,7 @@ TEST(WaitSet, WakesAThreadThatWaits) {
         waiter = kernel_thread_id();
         set.Wait(ready, milliseconds);
       });
-      EXPECT_TRUE(eventually([&] { return waiter != 0; }));
+      EXPECT_TRUE(eventually([&] { return waiter != 0 && is_sleeping(waiter); }));
       if (bit == kVideoStream) {
         driver.state().readiness.set_video(true);
       } else {

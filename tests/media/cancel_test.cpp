@@ -41,15 +41,6 @@ class CancelDriver : public MediaDriver {
   }
 };
 
-bool eventually(const std::function<bool()>& holds) {
-  const auto deadline = std::chrono::steady_clock::now() + 60s;
-  while (!holds()) {
-    if (std::chrono::steady_clock::now() > deadline) return false;
-    std::this_thread::sleep_for(1ms);
-  }
-  return true;
-}
-
 using Call = std::function<ELibDReturnCode(CancelDriver&)>;
 
 struct CallRow {
@@ -128,12 +119,7 @@ std::vector<CallRow> calls() {
 
 std::size_t requests(LiveCamera& camera) { return camera->journal().snapshot().size(); }
 
-bool was_asked(LiveCamera& camera, const std::string& text) {
-  for (const auto& request : camera->journal().snapshot()) {
-    if (request.bytes.find(text) != std::string::npos) return true;
-  }
-  return false;
-}
+bool was_asked(LiveCamera& camera, const std::string& text) { return camera->journal().wait_for_count(text, 1, 30s); }
 
 /// Whether a call ended before `kSoon`; when it did not, the camera is made to answer by its end.
 template <typename Result>
@@ -200,7 +186,7 @@ TEST(Cancel, ReturnsTheCodeOfACameraThatDoesNotAnswer) {
   camera.introduce(driver, kEndless);
   camera->add_request_fault(RequestFault::no_answer("DESCRIBE"));
   auto start = std::async(std::launch::async, [&] { return driver.StartVideoStreaming(); });
-  ASSERT_TRUE(eventually([&] { return was_asked(camera, "DESCRIBE"); }));
+  ASSERT_TRUE(was_asked(camera, "DESCRIBE"));
   vexa::Cancel(driver);
   ASSERT_TRUE(ended(camera, start));
   EXPECT_EQ(start.get(), LIBD_STREAM_OPEN_FAILED);
@@ -227,13 +213,9 @@ TEST(Cancel, DoesNotTouchWhatBeginsAfterwards) {
 TEST(Cancel, LeavesVideoThatPlays) {
   LiveCamera camera(camera_options());
   CancelDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   vexa::Cancel(driver);
-  SLibDVideoFrameInfo frame;
-  for (int taken = 0; taken < 3;) {
-    if (driver.GetCurrentVideoFrame(frame) == LIBD_OK) ++taken;
-  }
+  EXPECT_EQ(FrameTaker().take_all(driver, 3).size(), 3u);
   driver.state().teardown_timeout = 15000;
   EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
 }
@@ -241,11 +223,10 @@ TEST(Cancel, LeavesVideoThatPlays) {
 TEST(Cancel, OfAStopSendsTearDownAndDoesNotWait) {
   LiveCamera camera(camera_options());
   CancelDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   camera->add_request_fault(RequestFault::no_answer("TEARDOWN"));
   auto stop = std::async(std::launch::async, [&] { return driver.StopVideoStreaming(); });
-  ASSERT_TRUE(eventually([&] { return was_asked(camera, "TEARDOWN"); }));
+  ASSERT_TRUE(was_asked(camera, "TEARDOWN"));
   vexa::Cancel(driver);
   ASSERT_TRUE(ended(camera, stop));
   EXPECT_EQ(stop.get(), LIBD_OK);
@@ -285,9 +266,13 @@ TEST(Cancel, EndsAStopThatWaitsForAStart) {
   camera.introduce(driver, kEndless);
   camera->add_request_fault(RequestFault::no_answer("DESCRIBE"));
   auto start = std::async(std::launch::async, [&] { return driver.StartVideoStreaming(); });
-  ASSERT_TRUE(eventually([&] { return was_asked(camera, "DESCRIBE"); }));
-  auto stop = std::async(std::launch::async, [&] { return driver.StopVideoStreaming(); });
-  std::this_thread::yield();
+  ASSERT_TRUE(was_asked(camera, "DESCRIBE"));
+  std::atomic<long> stopper{0};
+  auto stop = std::async(std::launch::async, [&] {
+    stopper = kernel_thread_id();
+    return driver.StopVideoStreaming();
+  });
+  EXPECT_TRUE(eventually([&] { return stopper != 0 && is_sleeping(stopper); }));
   vexa::Cancel(driver);
   EXPECT_TRUE(ended(camera, start));
   EXPECT_TRUE(ended(camera, stop));
@@ -333,7 +318,7 @@ TEST(CancelToken, EndsWhatWaitsAndWhatBeginsUntilItIsReset) {
   camera->add_request_fault(RequestFault::no_answer("inq=camera"));
   SLibDCameraInfo info;
   auto inquiry = std::async(std::launch::async, [&] { return driver.GetCameraInfo(info); });
-  ASSERT_TRUE(eventually([&] { return was_asked(camera, "inq=camera"); }));
+  ASSERT_TRUE(was_asked(camera, "inq=camera"));
   token.Cancel();
   EXPECT_TRUE(token.IsCancelled());
   ASSERT_TRUE(ended(camera, inquiry));
@@ -394,14 +379,13 @@ TEST(CancelToken, IsCancelledByASignalHandler) {
 TEST(CancelToken, LetsAStopSendTearDown) {
   LiveCamera camera(camera_options());
   CancelDriver driver;
-  camera.introduce(driver);
   vexa::CancelToken token;
   vexa::SetCancelToken(driver, token);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   camera->add_request_fault(RequestFault::no_answer("TEARDOWN"));
   token.Cancel();
   EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
-  EXPECT_TRUE(eventually([&] { return was_asked(camera, "TEARDOWN"); }));
+  EXPECT_TRUE(was_asked(camera, "TEARDOWN"));
 }
 
 // ---- Peers that have gone ----
@@ -409,8 +393,7 @@ TEST(CancelToken, LetsAStopSendTearDown) {
 TEST(GonePeer, EndsAStopAtOnce) {
   LiveCamera camera(camera_options());
   CancelDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   camera->stop();
   auto stop = std::async(std::launch::async, [&] { return driver.StopVideoStreaming(); });
   ASSERT_EQ(stop.wait_for(kSoon), std::future_status::ready);

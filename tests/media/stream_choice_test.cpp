@@ -32,10 +32,7 @@ TEST(SelectStream, OpensThatStreamAndReadsItInItsCodec) {
   EXPECT_EQ(driver.m_CameraInfo.codecName, "H.264");
   EXPECT_EQ(driver.m_CameraInfo.imageWidth, 640);
   ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
-  SLibDVideoFrameInfo frame;
-  for (int taken = 0; taken < 2;) {
-    if (driver.GetCurrentVideoFrame(frame) == LIBD_OK) ++taken;
-  }
+  EXPECT_EQ(FrameTaker().take_all(driver, 2).size(), 2u);
   EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
   bool opened = false;
   for (const auto& request : camera->journal().snapshot()) {
