@@ -200,6 +200,20 @@ TEST(Cancel, ReturnsTheCodeOfACameraThatDoesNotAnswer) {
   EXPECT_EQ(driver.m_RtspSocket, -1);
 }
 
+TEST(Cancel, OfAStartOfAlarmsLeavesTheTimeOut) {
+  LiveCamera camera(camera_options());
+  CancelDriver driver;
+  camera.introduce(driver, kEndless);
+  camera->add_request_fault(RequestFault::no_answer("alarmdata.cgi"));
+  auto start = std::async(std::launch::async, [&] { return driver.StartIoStreaming(); });
+  ASSERT_TRUE(was_asked(camera, "alarmdata.cgi"));
+  vexa::Cancel(driver);
+  ASSERT_TRUE(ended(camera, start));
+  EXPECT_NE(start.get(), LIBD_OK);
+  EXPECT_TRUE(vexa::LastFailure(driver).cancelled);
+  EXPECT_EQ(driver.ConnectionTimeout(), kEndless);
+}
+
 TEST(Cancel, DoesNotTouchWhatBeginsAfterwards) {
   LiveCamera camera(camera_options());
   CancelDriver driver;
