@@ -4,14 +4,16 @@
 namespace vexa::filter {
 namespace {
 
-// Heron: fixed HD cameras with a 16:9 sensor. Their MPEG-4 encoder is the one of the SD generation and stops at 640
-// pixels across; half the sensor's width remains for a picture that moves without a motor.
+// The MPEG-4 encoder of the SD generation stops at 640 pixels across.
+constexpr Size kSdMpeg4Sizes[] = {{640, 480}, {640, 368}, {320, 240}, {320, 192}, {160, 120}};
+
+// Heron: fixed HD cameras with a 16:9 sensor and the MPEG-4 encoder of the SD generation; half the sensor's width
+// remains for a picture that moves without a motor.
 constexpr Size kHeronSizes[] = {{1920, 1080}, {1280, 960}, {1280, 720}, {1024, 768}, {800, 600},
                                 {640, 480},   {640, 368},  {320, 240},  {320, 192},  {160, 120}};
-constexpr Size kHeronMpeg4Sizes[] = {{640, 480}, {640, 368}, {320, 240}, {320, 192}, {160, 120}};
 
 constexpr CodecTable kHeronCodecs[] = {{"JPEG", kHeronSizes, kRatesTo30, kQualities, {}},
-                                       {"MPEG4", kHeronMpeg4Sizes, kRatesTo30, {}, kSdBitRates},
+                                       {"MPEG4", kSdMpeg4Sizes, kRatesTo30, {}, kSdBitRates},
                                        {"H.264", kHeronSizes, kRatesTo30, {}, kHdBitRates}};
 
 constexpr ModelFamily kHeronFamily{"LMX-H", kHeronCodecs, {960, 768}};
@@ -19,10 +21,9 @@ constexpr ModelFamily kHeronFamily{"LMX-H", kHeronCodecs, {960, 768}};
 // Marlin: box cameras with an exchangeable iris lens and a 5:4 megapixel sensor. 16:9 pictures are cut out of it.
 constexpr Size kMarlinSizes[] = {{1280, 1024}, {1280, 960}, {1280, 720}, {1024, 768}, {800, 600},
                                  {640, 480},   {640, 368},  {320, 240},  {320, 192},  {160, 120}};
-constexpr Size kMarlinMpeg4Sizes[] = {{640, 480}, {640, 368}, {320, 240}, {320, 192}, {160, 120}};
 
 constexpr CodecTable kMarlinCodecs[] = {{"JPEG", kMarlinSizes, kRatesTo30, kQualities, {}},
-                                        {"MPEG4", kMarlinMpeg4Sizes, kRatesTo30, {}, kSdBitRates},
+                                        {"MPEG4", kSdMpeg4Sizes, kRatesTo30, {}, kSdBitRates},
                                         {"H.264", kMarlinSizes, kRatesTo30, {}, kHdBitRates}};
 
 constexpr ModelFamily kMarlinFamily{"LMX-M", kMarlinCodecs, {640, 512}};

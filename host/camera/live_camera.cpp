@@ -40,7 +40,7 @@ class PrivateLog {
 
 // Cancelled by Ctrl-C. Never destroyed, so that a signal finds it until the process has gone.
 const CancelToken& interruption() {
-  static CancelToken& token = [&]() -> CancelToken& {
+  static CancelToken& token = []() -> CancelToken& {
     auto* made = new CancelToken;
     cancelled_by_signal = made;
     Interrupt::also([] { cancelled_by_signal.load()->Cancel(); });
@@ -109,6 +109,13 @@ Result<CardMode> LiveCamera::card_mode() {
   mode.recording = read_card_mode(answer);
   mode.free_kilobytes = std::max(CheckEdgeStorageFreeSize(), 0);
   return mode;
+}
+
+ELibDReturnCode LiveCamera::end_alarm_data() {
+  const int socket = http_open("/command/system.cgi?AlarmData=off");
+  if (socket < 0) return LIBD_FAILED;
+  http_close(socket);
+  return LIBD_OK;
 }
 
 bool left_a_reason(CLibraryDevice& device) {

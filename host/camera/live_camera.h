@@ -72,6 +72,9 @@ class LiveCamera final : public CVexaCommon {
   // Asks the camera: the driver's own record holds only a mode that this driver has set.
   [[nodiscard]] Result<CardMode> card_mode();
 
+  // Lets the camera send no alarm data, whichever driver has asked it to.
+  ELibDReturnCode end_alarm_data();
+
  private:
   const CameraConnection connection_;
 };

@@ -75,6 +75,16 @@ Result<LiveCamera*> ModelCamera::live() const {
   return live_.get();
 }
 
+void ModelCamera::stop_alarms() const {
+  bool closed = false;
+  last_call([&](CLibraryDevice& device) {
+    if (!std::exchange(closed, true)) return device.StopIoStreaming();
+    // Interrupted, the stop has closed the stream all the same, and of a closed one it sends nothing.
+    allow_last_call(*live_, connection_);
+    return live_->end_alarm_data();
+  });
+}
+
 Problem ModelCamera::explain(ELibDReturnCode result) const { return explain_failure(*device_, result, connection_); }
 
 Problem ModelCamera::explain_change(const std::string& what, ELibDReturnCode result) const {

@@ -34,8 +34,19 @@ class ModelCamera {
   // it.
   [[nodiscard]] Result<LiveCamera*> live() const;
 
-  // As vexa::host::allow_last_call.
-  void allow_last_call() const { vexa::host::allow_last_call(*device_, connection_); }
+  // Makes a call that leaves the camera as it was found, `call(device)`: it reaches the camera also after an
+  // interruption, and once more where one comes meanwhile.
+  template <typename Call>
+  ELibDReturnCode last_call(Call call) const {
+    allow_last_call(*device_, connection_);
+    const ELibDReturnCode result = call(*device_);
+    if (result == LIBD_OK || !was_interrupted(*device_)) return result;
+    allow_last_call(*device_, connection_);
+    return call(*device_);
+  }
+
+  // Closes the alarm stream and ends the camera's alarm data, by a last call.
+  void stop_alarms() const;
 
   // Puts a failure to read from the camera into words.
   [[nodiscard]] Problem explain(ELibDReturnCode result) const;

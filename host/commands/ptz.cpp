@@ -60,8 +60,7 @@ ExitCode run_move(const ModelCamera& camera, Terminal& terminal, const Move& mov
   // Interrupted in the middle, the camera may move all the same.
   if (started != LIBD_OK && !Interrupt::requested()) return report_change(camera, terminal, move.what, started);
   if (!Interrupt::requested()) Interrupt::wait(std::chrono::milliseconds(std::lround(*seconds * 1000)));
-  camera.allow_last_call();
-  const ELibDReturnCode stopped = move.stop(camera.device());
+  const ELibDReturnCode stopped = camera.last_call(move.stop);
   if (stopped != LIBD_OK) return report_change(camera, terminal, move.what, stopped);
   return Interrupt::requested() ? ExitCode::kInterrupted : ExitCode::kOk;
 }

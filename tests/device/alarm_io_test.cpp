@@ -24,11 +24,7 @@ class IoBox : public testing::Test {
 
   template <typename Call>
   ELibDReturnCode with(Script script, Call call) {
-    ScriptedCamera camera(std::move(script));
-    driver_.use(camera.host(), camera.port(), kPatientTimeout);
-    const ELibDReturnCode result = call();
-    EXPECT_EQ(camera.finish(), "");
-    return result;
+    return with_script(driver_, std::move(script), call);
   }
   ELibDReturnCode ask(Script script, SLibDIoBoxInfo& info) {
     return with(std::move(script), [&] { return driver_.GetIoBoxInfo(info); });
@@ -115,20 +111,8 @@ TEST_F(IoBox, AppendsToTheListOfTheCaller) {
 
 TEST_F(IoBox, IsStoredWholeUnderTheDriversVmdType) {
   ASSERT_EQ(driver_.SetVMDtype(LIBD_VMD_VMF), LIBD_OK);
-  SLibDIoBoxInfo info;
-  info.reserved1 = 1;
-  info.reserved3 = 3;
-  info.reserved4 = 4;
-  info.reserved5 = 5;
-  info.detections1 = {marked_setting(1)};
-  info.reserved7 = 7;
-  info.reserved8 = 8;
-  info.reserved9 = 9;
-  info.reserved10 = 10;
-  info.detections2 = {marked_setting(2), marked_setting(3)};
-  info.reserved12 = 12;
-  info.tamperLevel = 13;
-  info.vmdType = 14;
+  SLibDIoBoxInfo info = {1,  {}, 3, 4, 5, {marked_setting(1)}, 7, 8, 9, 10, {marked_setting(2), marked_setting(3)},
+                         12, 13, 14};
   EXPECT_EQ(driver_.GetIoBoxInfo(info), LIBD_OK);
   EXPECT_EQ(info.vmdType, LIBD_VMD_VMF);
   const SLibDIoBoxInfo& kept = driver_.m_IoBoxInfo;
@@ -191,11 +175,13 @@ class StopIoStreaming : public testing::Test {
   StopIoStreaming() { driver_.m_PendingPins.resize(2); }
   ~StopIoStreaming() override { close(camera_end_); }
 
-  void stream() {
+  /// What the stop of a stream returns, of a camera that expects `step`.
+  ELibDReturnCode stop(const ScriptStep& step) {
     int ends[2];
-    ASSERT_EQ(socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends), 0);
+    EXPECT_EQ(socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends), 0);
     driver_.m_IoStreamSocket = ends[0];
     camera_end_ = ends[1];
+    return with_script(driver_, {step}, [this] { return driver_.StopIoStreaming(); });
   }
 
   TestDriver driver_;
@@ -209,24 +195,16 @@ TEST_F(StopIoStreaming, WithoutAStreamSendsNothingAndForgetsPendingPins) {
 }
 
 TEST_F(StopIoStreaming, ClosesTheStreamAndSwitchesTheCamerasOff) {
-  ScriptedCamera camera({command("/command/system.cgi?AlarmData=off")});
-  driver_.use(camera.host(), camera.port(), kPatientTimeout);
-  stream();
-  EXPECT_EQ(driver_.StopIoStreaming(), LIBD_OK);
+  EXPECT_EQ(stop(command("/command/system.cgi?AlarmData=off")), LIBD_OK);
   EXPECT_EQ(driver_.m_IoStreamSocket, -1);
   EXPECT_TRUE(driver_.m_PendingPins.empty());
   char nothing = 0;
   EXPECT_EQ(recv(camera_end_, &nothing, 1, MSG_DONTWAIT), 0);
-  EXPECT_EQ(camera.finish(), "");
 }
 
 TEST_F(StopIoStreaming, GivesTheLatestErrorsCodeAndIsStoppedAllTheSame) {
-  ScriptedCamera camera({refusal("/command/system.cgi?AlarmData=off")});
-  driver_.use(camera.host(), camera.port(), kPatientTimeout);
-  stream();
-  EXPECT_EQ(driver_.StopIoStreaming(), LIBD_UNAUTHORIZED);
+  EXPECT_EQ(stop(refusal("/command/system.cgi?AlarmData=off")), LIBD_UNAUTHORIZED);
   EXPECT_EQ(driver_.m_IoStreamSocket, -1);
-  EXPECT_EQ(camera.finish(), "");
 }
 
 }  // namespace

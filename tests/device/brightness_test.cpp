@@ -59,14 +59,7 @@ TEST(BrightAbsolute, ReportsTheLatestErrorWhenItsRequestIsRefused) {
   EXPECT_EQ(play.driver.BrightAbsolute(10000), LIBD_UNAUTHORIZED);
 }
 
-/// A driver in reach of no camera; the test fails when it turns to one.
-class BrightUnsent : public testing::Test {
- protected:
-  BrightUnsent() { driver_.expect_no_exchange(); }
-  ~BrightUnsent() override { EXPECT_TRUE(driver_.had_no_exchange()); }
-
-  SettingsDriver driver_;
-};
+using BrightUnsent = Unsent<SettingsDriver>;
 
 TEST_F(BrightUnsent, BecauseTheLevelIsOutOfRange) {
   give_lists(driver_, "Shutter Priority");

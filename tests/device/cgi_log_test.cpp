@@ -8,10 +8,10 @@
 #include <vector>
 
 #include "tests/media/live_camera.h"
+#include "tests/support/folder_fixture.h"
 #include "tests/support/in_child.h"
 #include "tests/support/log_text.h"
 #include "tests/support/scripted_camera.h"
-#include "tests/support/temporary_folder.h"
 #include "tests/support/test_driver.h"
 #include "vexa/real_time.h"
 
@@ -48,13 +48,15 @@ std::string request(const std::string& path) {
   return "GET http://{host}:{port}" + path + " HTTP/1.0\r\nAuthorization: Basic YWRtaW46c2VjcmV0\r\n\r\n";
 }
 
-TEST(CgiLog, BeginsOffAndWithoutAPath) {
+using CgiLog = InTemporaryFolder;
+
+TEST_F(CgiLog, BeginsOffAndWithoutAPath) {
   const LoggingDriver driver;
   EXPECT_FALSE(driver.m_CGILogEnabled);
   EXPECT_STREQ(driver.m_CGILogPath, "");
 }
 
-TEST(CgiLog, LevelSwitchesItOnAndOff) {
+TEST_F(CgiLog, LevelSwitchesItOnAndOff) {
   LoggingDriver driver;
   EXPECT_EQ(driver.SetCGILogLevel(true), LIBD_OK);
   EXPECT_TRUE(driver.m_CGILogEnabled);
@@ -62,7 +64,7 @@ TEST(CgiLog, LevelSwitchesItOnAndOff) {
   EXPECT_FALSE(driver.m_CGILogEnabled);
 }
 
-TEST(CgiLog, PathIsTakenUpTo1023Characters) {
+TEST_F(CgiLog, PathIsTakenUpTo1023Characters) {
   for (const std::size_t length :
        {std::size_t{0}, std::size_t{1}, kPathRoom - 2, kPathRoom - 1, kPathRoom, kPathRoom + 1, std::size_t{4096}}) {
     LoggingDriver driver;
@@ -74,145 +76,133 @@ TEST(CgiLog, PathIsTakenUpTo1023Characters) {
   }
 }
 
-TEST(CgiLog, NullPathIsIgnored) {
+TEST_F(CgiLog, NullPathIsIgnored) {
   LoggingDriver driver;
   driver.SetCGILogPath("kept");
   EXPECT_EQ(driver.SetCGILogPath(nullptr), LIBD_OK);
   EXPECT_STREQ(driver.m_CGILogPath, "kept");
 }
 
-TEST(CgiLog, ThePathCountsFromTheNextConnectionOn) {
-  const TemporaryFolder folder;
-  LoggingDriver driver(folder / "1");
-  driver.SetCGILogPath((folder / "2").c_str());
+TEST_F(CgiLog, ThePathCountsFromTheNextConnectionOn) {
+  LoggingDriver driver(folder_ / "1");
+  driver.SetCGILogPath((folder_ / "2").c_str());
   driver.Log("To", "/a");
-  EXPECT_NE(access((folder / "2").c_str(), F_OK), 0);
+  EXPECT_NE(access((folder_ / "2").c_str(), F_OK), 0);
   driver.reopen();
   driver.Log("To", "/b");
-  EXPECT_EQ(log_text(folder / "1"), opening_banner() + line("To", "/a") + closing_banner());
-  EXPECT_EQ(log_text(folder / "2"), opening_banner() + line("To", "/b"));
+  EXPECT_EQ(log_text(folder_ / "1"), opening_banner() + line("To", "/a") + closing_banner());
+  EXPECT_EQ(log_text(folder_ / "2"), opening_banner() + line("To", "/b"));
 }
 
-TEST(CgiLog, AnEmptyPathLeavesTheFormerName) {
-  const TemporaryFolder folder;
-  LoggingDriver driver(folder / "1");
+TEST_F(CgiLog, AnEmptyPathLeavesTheFormerName) {
+  LoggingDriver driver(folder_ / "1");
   driver.SetCGILogPath("");
   driver.reopen();
-  EXPECT_EQ(log_text(folder / "1"), opening_banner() + closing_banner() + opening_banner());
+  EXPECT_EQ(log_text(folder_ / "1"), opening_banner() + closing_banner() + opening_banner());
 }
 
-TEST(CgiLog, WithoutAPathTheFileIsLogTxtInTheWorkingFolder) {
-  const TemporaryFolder folder;
+TEST_F(CgiLog, WithoutAPathTheFileIsLogTxtInTheWorkingFolder) {
   EXPECT_EQ(in_child([&] {
-              if (chdir(folder.path().c_str()) != 0) return std::string("no folder");
+              if (chdir(folder_.path().c_str()) != 0) return std::string("no folder");
               LoggingDriver driver;
               driver.reopen();
-              return log_text(folder / "Log.txt");
+              return log_text(folder_ / "Log.txt");
             }),
             opening_banner());
 }
 
-TEST(CgiLog, TheFileIsOpenedAlsoWhileItIsOff) {
-  const TemporaryFolder folder;
+TEST_F(CgiLog, TheFileIsOpenedAlsoWhileItIsOff) {
   LoggingDriver driver;
-  driver.SetCGILogPath((folder / "Log.txt").c_str());
+  driver.SetCGILogPath((folder_ / "Log.txt").c_str());
   driver.reopen();
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner());
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner());
 }
 
-TEST(CgiLog, ALineIsBreakTimeDirectionAndMessage) {
-  const TemporaryFolder folder;
-  LoggingDriver driver(folder / "Log.txt");
+TEST_F(CgiLog, ALineIsBreakTimeDirectionAndMessage) {
+  LoggingDriver driver(folder_ / "Log.txt");
   driver.Log("To", "/command/inquiry.cgi?inq=system");
   driver.Log("From", "200 OK");
-  EXPECT_EQ(log_text(folder / "Log.txt"),
+  EXPECT_EQ(log_text(folder_ / "Log.txt"),
             opening_banner() + line("To", "/command/inquiry.cgi?inq=system") + line("From", "200 OK"));
 }
 
-TEST(CgiLog, ALineHasTheLocalTime) {
-  const TemporaryFolder folder;
-  LoggingDriver driver(folder / "Log.txt");
+TEST_F(CgiLog, ALineHasTheLocalTime) {
+  LoggingDriver driver(folder_ / "Log.txt");
   const std::string before = CRealTime::GetTheCurrentTime().Format("%Y%O%D%H%M%S%03L", true);
   driver.Log("To", "/");
   const std::string after = CRealTime::GetTheCurrentTime().Format("%Y%O%D%H%M%S%03L", true);
   CRealTime told;
-  ASSERT_EQ(told.Scan(contents_of(folder / "Log.txt").substr(opening_banner().size()).c_str(),
+  ASSERT_EQ(told.Scan(contents_of(folder_ / "Log.txt").substr(opening_banner().size()).c_str(),
                       "\n%D-%O-%Y\t%H:%M:%S.%L", false),
             7);
   EXPECT_GE(told.Format("%Y%O%D%H%M%S%03L", true), before);
   EXPECT_LE(told.Format("%Y%O%D%H%M%S%03L", true), after);
 }
 
-TEST(CgiLog, TextsEnterTheFileAsTheyAre) {
-  const TemporaryFolder folder;
-  LoggingDriver driver(folder / "Log.txt");
+TEST_F(CgiLog, TextsEnterTheFileAsTheyAre) {
+  LoggingDriver driver(folder_ / "Log.txt");
   const std::string long_text(100000, 'x');
   for (const std::string& text :
        {std::string("%n%s%d%%"), std::string("a\r\n\x01\x7F\xFF b"), std::string(), long_text}) {
     driver.Log(text.c_str(), text.c_str());
   }
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + line("%n%s%d%%", "%n%s%d%%") +
-                                              line("a\r\n\x01\x7F\xFF b", "a\r\n\x01\x7F\xFF b") + line("", "") +
-                                              line(long_text, long_text));
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + line("%n%s%d%%", "%n%s%d%%") +
+                                               line("a\r\n\x01\x7F\xFF b", "a\r\n\x01\x7F\xFF b") + line("", "") +
+                                               line(long_text, long_text));
 }
 
-TEST(CgiLog, NullTextsAreIgnored) {
-  const TemporaryFolder folder;
-  LoggingDriver driver(folder / "Log.txt");
+TEST_F(CgiLog, NullTextsAreIgnored) {
+  LoggingDriver driver(folder_ / "Log.txt");
   driver.Log(nullptr, "/");
   driver.Log("To", nullptr);
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner());
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner());
 }
 
-TEST(CgiLog, TheDriversEndClosesTheFile) {
-  const TemporaryFolder folder;
-  { const LoggingDriver driver(folder / "Log.txt"); }
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + closing_banner());
+TEST_F(CgiLog, TheDriversEndClosesTheFile) {
+  { const LoggingDriver driver(folder_ / "Log.txt"); }
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + closing_banner());
 }
 
-TEST(CgiLog, DriversOfOnePathShareTheFile) {
-  const TemporaryFolder folder;
-  LoggingDriver first(folder / "Log.txt");
-  auto second = std::make_unique<LoggingDriver>(folder / "Log.txt");
+TEST_F(CgiLog, DriversOfOnePathShareTheFile) {
+  LoggingDriver first(folder_ / "Log.txt");
+  auto second = std::make_unique<LoggingDriver>(folder_ / "Log.txt");
   first.Log("To", "/1");
   second->Log("To", "/2");
   second.reset();
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + line("To", "/1") + line("To", "/2"));
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + line("To", "/1") + line("To", "/2"));
 }
 
-TEST(CgiLog, HoldsEachRequestAndEachStatus) {
-  const TemporaryFolder folder;
+TEST_F(CgiLog, HoldsEachRequestAndEachStatus) {
   ScriptedCamera camera(
       {{.expected = request("/command/inquiry.cgi?inq=system"), .answer = "HTTP/1.0 200 OK\r\n\r\nModelName=V1&"},
        {.new_connection = true,
         .expected = request("/command/main.cgi?System=reset"),
         .answer = "HTTP/1.0 503 Busy now\r\n\r\n"}});
-  LoggingDriver driver(folder / "Log.txt");
+  LoggingDriver driver(folder_ / "Log.txt");
   driver.use(camera.host(), camera.port(), 5000);
   std::string answer;
   EXPECT_EQ(driver.SendInqCommand("system", answer), LIBD_OK);
   EXPECT_EQ(driver.http_open("/command/main.cgi?System=%s", "reset"), -1);
   EXPECT_EQ(camera.finish(), "");
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + line("To", "/command/inquiry.cgi?inq=system") +
-                                              line("From", "200 OK") + line("To", "/command/main.cgi?System=reset") +
-                                              line("From", "503 Busy now"));
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + line("To", "/command/inquiry.cgi?inq=system") +
+                                               line("From", "200 OK") + line("To", "/command/main.cgi?System=reset") +
+                                               line("From", "503 Busy now"));
 }
 
-TEST(CgiLog, HoldsNoPassword) {
-  const TemporaryFolder folder;
+TEST_F(CgiLog, HoldsNoPassword) {
   ScriptedCamera camera({{.expected = request("/"), .answer = "HTTP/1.0 401 Unauthorized\r\n\r\n"}});
-  LoggingDriver driver(folder / "Log.txt");
+  LoggingDriver driver(folder_ / "Log.txt");
   driver.use(camera.host(), camera.port(), 5000);
   driver.reopen();
   EXPECT_EQ(driver.http_open("/"), -1);
   EXPECT_EQ(camera.finish(), "");
-  const std::string text = contents_of(folder / "Log.txt");
+  const std::string text = contents_of(folder_ / "Log.txt");
   EXPECT_NE(text.find("CGI\tFrom\t401 Unauthorized"), std::string::npos);
   EXPECT_EQ(text.find("secret"), std::string::npos);
   EXPECT_EQ(text.find("YWRtaW46c2VjcmV0"), std::string::npos);
 }
 
-TEST(CgiLog, HidesTheCredentialsThatACameraSendsBack) {
+TEST_F(CgiLog, HidesTheCredentialsThatACameraSendsBack) {
   const struct {
     const char* reason;
     const char* logged;
@@ -232,34 +222,31 @@ TEST(CgiLog, HidesTheCredentialsThatACameraSendsBack) {
   }
 }
 
-TEST(CgiLog, HidesNothingForAnEmptyPassword) {
-  const TemporaryFolder folder;
+TEST_F(CgiLog, HidesNothingForAnEmptyPassword) {
   const std::string expected = "GET http://{host}:{port}/ HTTP/1.0\r\nAuthorization: Basic YWRtaW46\r\n\r\n";
   ScriptedCamera camera({{.expected = expected, .answer = "HTTP/1.0 500 YWRtaW46\r\n\r\n"}});
-  LoggingDriver driver(folder / "Log.txt");
+  LoggingDriver driver(folder_ / "Log.txt");
   driver.use(camera.host(), camera.port(), 5000);
   driver.m_ConnectionInfo.password.clear();
   EXPECT_EQ(driver.http_open("/"), -1);
   EXPECT_EQ(camera.finish(), "");
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + line("To", "/") + line("From", "500 YWRtaW46"));
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + line("To", "/") + line("From", "500 YWRtaW46"));
 }
 
-TEST(CgiLog, IsEmptyWhileItIsOff) {
-  const TemporaryFolder folder;
+TEST_F(CgiLog, IsEmptyWhileItIsOff) {
   ScriptedCamera camera({{.expected = request("/"), .answer = "HTTP/1.0 200 OK\r\n\r\n"}});
-  LoggingDriver driver(folder / "Log.txt");
+  LoggingDriver driver(folder_ / "Log.txt");
   driver.SetCGILogLevel(false);
   driver.use(camera.host(), camera.port(), 5000);
   const int socket = driver.http_open("/");
   EXPECT_GE(socket, 0);
   driver.http_close(socket);
   EXPECT_EQ(camera.finish(), "");
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner());
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner());
 }
 
-TEST(CgiLog, TheDriverGoesOnWhenTheFileCannotBeOpenedOrWritten) {
-  const TemporaryFolder folder;
-  for (const std::string& path : {folder / "gone/Log.txt", folder.path(), std::string("/dev/full")}) {
+TEST_F(CgiLog, TheDriverGoesOnWhenTheFileCannotBeOpenedOrWritten) {
+  for (const std::string& path : {folder_ / "gone/Log.txt", folder_.path(), std::string("/dev/full")}) {
     ScriptedCamera camera({{.expected = request("/"), .answer = "HTTP/1.0 204 No Content\r\n\r\n"}});
     stderr_of([&] {
       LoggingDriver driver(path);
@@ -273,7 +260,7 @@ TEST(CgiLog, TheDriverGoesOnWhenTheFileCannotBeOpenedOrWritten) {
   }
 }
 
-TEST(CgiLog, AStreamGoesOnWhenTheFileCannotBeWritten) {
+TEST_F(CgiLog, AStreamGoesOnWhenTheFileCannotBeWritten) {
   LiveCamera camera(camera_options());
   MediaDriver driver;
   driver.SetCGILogPath("/dev/full");
@@ -286,7 +273,7 @@ TEST(CgiLog, AStreamGoesOnWhenTheFileCannotBeWritten) {
   EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
 }
 
-TEST(CgiLog, LinesAndReopeningsOfSeveralThreadsDoNotRace) {
+TEST_F(CgiLog, LinesAndReopeningsOfSeveralThreadsDoNotRace) {
   const TemporaryFolder folder(memory_folder());
   constexpr int kWriters = 4;
   constexpr int kLinesEach = 500;

@@ -13,18 +13,7 @@ namespace {
 
 /// A connection in which no field has its default.
 SLibDConnectionInfo full_info() {
-  SLibDConnectionInfo info;
-  info.streamTransport = 1;
-  info.host = "camera.example";
-  info.port = 8080;
-  info.reserved4 = true;
-  info.useProxy = true;
-  info.proxyHost = "proxy.example";
-  info.proxyPort = 3128;
-  info.timeout = 4321;
-  info.userName = "admin";
-  info.password = "secret";
-  return info;
+  return {1, "camera.example", 8080, true, true, "proxy.example", 3128, 4321, "admin", "secret"};
 }
 
 void expect_full(const SLibDConnectionInfo& info) {

@@ -26,10 +26,7 @@ class Detection : public testing::Test {
 
   template <typename Call>
   ELibDReturnCode with(Script script, Call call) {
-    ScriptedCamera camera(std::move(script));
-    driver_.use(camera.host(), camera.port(), kPatientTimeout);
-    const ELibDReturnCode result = call();
-    EXPECT_EQ(camera.finish(), "");
+    const ELibDReturnCode result = with_script(driver_, std::move(script), call);
     EXPECT_EQ(driver_.timeout(), kPatientTimeout);
     return result;
   }

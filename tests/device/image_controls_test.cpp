@@ -86,16 +86,8 @@ TEST(SetIRIlluminator, SwitchesOffForAnyModeThatIsNotDayNight) {
   }
 }
 
-/// A driver in reach of no camera; the test fails when it turns to one.
-class Unsent : public testing::Test {
- protected:
-  Unsent() { driver_.expect_no_exchange(); }
-  ~Unsent() override { EXPECT_TRUE(driver_.had_no_exchange()); }
-
-  SettingsDriver driver_;
-};
-
-using RefusedArgument = Unsent;
+using RefusedArgument = Unsent<SettingsDriver>;
+using UnsentSetting = RefusedArgument;
 
 TEST_F(RefusedArgument, OfADayNightModeThatIsNone) {
   for (const int mode : {-1, 0, 1, 9, 11, 19, 21, 29, 31, 40, INT_MAX, INT_MIN}) {
@@ -118,7 +110,7 @@ TEST_F(RefusedArgument, OfADynamicRangeThatIsNone) {
 
 TEST_F(RefusedArgument, OfAnEmptyExposureMode) { EXPECT_EQ(set_bright_mode(driver_, ""), LIBD_INVALID_ARGUMENT); }
 
-TEST_F(Unsent, IsAnExposureModeThatIsUnknown) {
+TEST_F(UnsentSetting, IsAnExposureModeThatIsUnknown) {
   for (const char* mode : {"full", "Full Auto", "Full auto ", "Manual", "shutter"}) {
     EXPECT_EQ(set_bright_mode(driver_, mode), LIBD_FAILED) << mode;
   }

@@ -4,6 +4,7 @@
 
 #include <climits>
 #include <string>
+#include <tuple>
 
 #include "tests/device/ptz_reach.h"
 
@@ -186,35 +187,14 @@ TEST_F(PtzPosition, LeavesTheAnglesOfACallerWhenItHasNone) {
 }
 
 TEST_F(PtzUnsent, BecauseTheControlRecordIsTheDriversOwn) {
-  SLibDPTZControlInfo stored;
-  stored.reserved1 = 1;
-  stored.reserved2 = "two";
-  stored.reserved3 = 3;
-  stored.reserved4 = stored.reserved5 = true;
-  stored.brightMode = "Full auto";
-  stored.reserved7 = 7;
-  stored.reserved8 = "eight";
-  stored.reserved9 = 9;
-  stored.reserved10 = "ten";
-  stored.reserved11 = 11;
-  stored.reserved12 = "twelve";
-  stored.reserved13 = 13;
+  SLibDPTZControlInfo stored = {1, "two", 3, true, true, "Full auto", 7, "eight", 9, "ten", 11, "twelve", 13};
   EXPECT_EQ(driver_.SetPTZControlInfo(stored), LIBD_OK);
   stored.reserved2 = "the driver keeps its own";
   SLibDPTZControlInfo read;
   EXPECT_EQ(driver_.GetPTZControlInfo(read), LIBD_OK);
-  EXPECT_EQ(read.reserved1, 1);
-  EXPECT_EQ(read.reserved2, "two");
-  EXPECT_EQ(read.reserved3, 3);
-  EXPECT_TRUE(read.reserved4 && read.reserved5);
-  EXPECT_EQ(read.brightMode, "Full auto");
-  EXPECT_EQ(read.reserved7, 7);
-  EXPECT_EQ(read.reserved8, "eight");
-  EXPECT_EQ(read.reserved9, 9);
-  EXPECT_EQ(read.reserved10, "ten");
-  EXPECT_EQ(read.reserved11, 11);
-  EXPECT_EQ(read.reserved12, "twelve");
-  EXPECT_EQ(read.reserved13, 13);
+  const auto& [r1, r2, r3, r4, r5, mode, r7, r8, r9, r10, r11, r12, r13] = read;
+  EXPECT_EQ(std::tie(r1, r2, r3, r4, r5, mode, r7, r8, r9, r10, r11, r12, r13),
+            std::make_tuple(1, "two", 3, true, true, "Full auto", 7, "eight", 9, "ten", 11, "twelve", 13));
 }
 
 TEST_F(PtzUnsent, BecauseTheFixedRecordIsTheModels) {

@@ -52,13 +52,6 @@ inline void expect_refusal_told(const SentRow& row, const std::function<void(Ptz
   EXPECT_EQ(text_of_latest_error(play.driver), "Unauthorized");
 }
 
-/// A driver in reach of no camera; the test fails when it turns to one.
-class PtzUnsent : public testing::Test {
- protected:
-  PtzUnsent() { driver_.expect_no_exchange(); }
-  ~PtzUnsent() override { EXPECT_TRUE(driver_.had_no_exchange()); }
-
-  PtzDriver driver_;
-};
+using PtzUnsent = Unsent<PtzDriver>;
 
 }  // namespace vexa_test

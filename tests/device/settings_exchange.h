@@ -125,6 +125,26 @@ class Played {
   const Ends ends_;
 };
 
+/// A driver in reach of no camera; the test fails when it turns to one.
+template <typename Driver>
+class Unsent : public testing::Test {
+ protected:
+  Unsent() { driver_.expect_no_exchange(); }
+  ~Unsent() override { EXPECT_TRUE(driver_.had_no_exchange()); }
+
+  Driver driver_;
+};
+
+/// What `call` returns while a camera plays `script` for the driver, whole.
+template <typename Driver, typename Call>
+ELibDReturnCode with_script(Driver& driver, Script script, Call call) {
+  ScriptedCamera camera(std::move(script));
+  driver.use(camera.host(), camera.port(), kPatientTimeout);
+  const ELibDReturnCode result = call();
+  EXPECT_EQ(camera.finish(), "");
+  return result;
+}
+
 /// The driver's edge storage, as a model with a card sets it up.
 class EdgeStorageReach : public CVexaCommon {
  public:

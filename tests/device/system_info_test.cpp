@@ -153,45 +153,42 @@ TEST(CommonNetworkInfo, TakesTheAddressAndNothingElse) {
   EXPECT_EQ(info.macAddress, "00:11:22:33:44:55");
 }
 
-TEST(CurrentSystemInfo, AsksForSystemAndNetwork) {
-  ScriptedCamera camera({inquiry("system", "ModelName=X1&Serial=7"), inquiry("network", "MacAddress=00:11")});
-  TestDriver driver;
-  driver.use(camera.host(), camera.port(), kPatientTimeout);
+class CurrentSystemInfo : public testing::Test {
+ protected:
+  ELibDReturnCode ask(SLibDSystemInfo& info, Script script) {
+    return with_script(driver_, std::move(script), [&] { return driver_.GetCurrentSystemInfo(info); });
+  }
+
+  TestDriver driver_;
+};
+
+TEST_F(CurrentSystemInfo, AsksForSystemAndNetwork) {
   SLibDSystemInfo info;
-  EXPECT_EQ(driver.GetCurrentSystemInfo(info), LIBD_OK);
+  EXPECT_EQ(ask(info, {inquiry("system", "ModelName=X1&Serial=7"), inquiry("network", "MacAddress=00:11")}), LIBD_OK);
   EXPECT_EQ(info.maker, "Vexa Corporation");
   EXPECT_EQ(info.modelName, "X1");
   EXPECT_EQ(info.serialNumber, "7");
   EXPECT_EQ(info.macAddress, "00:11");
-  EXPECT_EQ(camera.finish(), "");
 }
 
-TEST(CurrentSystemInfo, AsksNothingMoreAfterAFailure) {
-  ScriptedCamera camera({refusal("/command/inquiry.cgi?inq=system")});
-  TestDriver driver;
-  driver.use(camera.host(), camera.port(), kPatientTimeout);
+TEST_F(CurrentSystemInfo, AsksNothingMoreAfterAFailure) {
   SLibDSystemInfo info = info_from_before();
-  EXPECT_EQ(driver.GetCurrentSystemInfo(info), LIBD_UNAUTHORIZED);
+  EXPECT_EQ(ask(info, {refusal("/command/inquiry.cgi?inq=system")}), LIBD_UNAUTHORIZED);
   EXPECT_EQ(info.maker, "maker");
-  EXPECT_EQ(driver.LatestErrorText(), "Unauthorized");
-  EXPECT_EQ(camera.finish(), "");
+  EXPECT_EQ(driver_.LatestErrorText(), "Unauthorized");
 }
 
-TEST(CurrentSystemInfo, KeepsWhatWasReadBeforeAFailure) {
-  ScriptedCamera camera({inquiry("system", "ModelName=X1"), refusal("/command/inquiry.cgi?inq=network")});
-  TestDriver driver;
-  driver.use(camera.host(), camera.port(), kPatientTimeout);
+TEST_F(CurrentSystemInfo, KeepsWhatWasReadBeforeAFailure) {
   SLibDSystemInfo info = info_from_before();
-  EXPECT_EQ(driver.GetCurrentSystemInfo(info), LIBD_UNAUTHORIZED);
+  EXPECT_EQ(ask(info, {inquiry("system", "ModelName=X1"), refusal("/command/inquiry.cgi?inq=network")}),
+            LIBD_UNAUTHORIZED);
   EXPECT_EQ(info.modelName, "X1");
   EXPECT_EQ(info.macAddress, "mac");
-  EXPECT_EQ(camera.finish(), "");
 }
 
-TEST(CurrentSystemInfo, CannotBeSet) {
-  TestDriver driver;
+TEST_F(CurrentSystemInfo, CannotBeSet) {
   SLibDSystemInfo info;
-  EXPECT_EQ(driver.SetCurrentSystemInfo(info), LIBD_NOT_SUPPORTED);
+  EXPECT_EQ(driver_.SetCurrentSystemInfo(info), LIBD_NOT_SUPPORTED);
 }
 
 }  // namespace

@@ -36,29 +36,7 @@ auto fields_of(const SLibDAudioInfo& i) {
 }
 
 SLibDAudioInfo any_record() {
-  SLibDAudioInfo info;
-  info.reserved1 = 1;
-  info.codec = "two";
-  info.reserved3 = "three";
-  info.bitRateLabel = "four";
-  info.bitRate = 5;
-  info.frameSizeLabel = "six";
-  info.frameSize = 7;
-  info.samplingRateLabel = "eight";
-  info.samplingRate = 9;
-  info.reserved10 = 10;
-  info.label1 = "11";
-  info.value1 = 12;
-  info.label2 = "13";
-  info.value2 = 14;
-  info.label3 = "15";
-  info.value3 = 16;
-  info.label4 = "17";
-  info.value4 = 18;
-  info.label5 = "19";
-  info.value5 = 20;
-  info.reserved21 = 21;
-  return info;
+  return {1, "two", "three", "four", 5, "six", 7, "eight", 9, 10, "11", 12, "13", 14, "15", 16, "17", 18, "19", 20, 21};
 }
 
 TEST(GetFixedAudioInfo, IsNotSupportedByACameraWithoutAudio) {
@@ -97,11 +75,7 @@ class AudioSettings : public testing::Test {
   }
   template <typename Call>
   ELibDReturnCode with(Script script, Call call) {
-    ScriptedCamera camera(std::move(script));
-    driver_.use(camera.host(), camera.port(), 5000);
-    const ELibDReturnCode result = call();
-    EXPECT_EQ(camera.finish(), "");
-    return result;
+    return with_script(driver_, std::move(script), call);
   }
 
   AudioDriver driver_;

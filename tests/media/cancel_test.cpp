@@ -41,15 +41,6 @@ class CancelDriver : public MediaDriver {
   }
 };
 
-bool eventually(const std::function<bool()>& holds) {
-  const auto deadline = std::chrono::steady_clock::now() + 60s;
-  while (!holds()) {
-    if (std::chrono::steady_clock::now() > deadline) return false;
-    std::this_thread::sleep_for(1ms);
-  }
-  return true;
-}
-
 using Call = std::function<ELibDReturnCode(CancelDriver&)>;
 
 struct CallRow {
@@ -128,12 +119,7 @@ std::vector<CallRow> calls() {
 
 std::size_t requests(LiveCamera& camera) { return camera->journal().snapshot().size(); }
 
-bool was_asked(LiveCamera& camera, const std::string& text) {
-  for (const auto& request : camera->journal().snapshot()) {
-    if (request.bytes.find(text) != std::string::npos) return true;
-  }
-  return false;
-}
+bool was_asked(LiveCamera& camera, const std::string& text) { return camera->journal().wait_for_count(text, 1, 30s); }
 
 /// Whether a call ended before `kSoon`; when it did not, the camera is made to answer by its end.
 template <typename Result>
@@ -169,141 +155,140 @@ bool cancel_at(LiveCamera& camera, const CallRow& row, std::uint32_t step) {
   return reached;
 }
 
-TEST(Cancel, EndsEachOperationAtEachOfItsRequests) {
-  LiveCamera camera(camera_options());
+using Cancel = LiveVideo<CancelDriver>;
+using CancelToken = Cancel;
+using GonePeer = Cancel;
+
+TEST_F(Cancel, EndsEachOperationAtEachOfItsRequests) {
   for (const CallRow& row : calls()) {
     std::uint32_t step = 1;
-    while (cancel_at(camera, row, step) && step < 20) ++step;
+    while (cancel_at(camera(), row, step) && step < 20) ++step;
     EXPECT_GT(step, 1u) << row.name << " asks nothing";
     EXPECT_LT(step, 20u) << row.name;
   }
 }
 
-TEST(Cancel, LeavesNoDescriptorBehind) {
-  CancelDriver driver;
+TEST_F(Cancel, LeavesNoDescriptorBehind) {
   const FullListener camera;
-  driver.use(camera.host(), camera.port(), kEndless);
+  driver_.use(camera.host(), camera.port(), kEndless);
   const std::size_t descriptors = open_descriptors();
   const CallRow inquiry = calls().front();
-  auto call = std::async(std::launch::async, [&] { return inquiry.call(driver); });
+  auto call = std::async(std::launch::async, [&] { return inquiry.call(driver_); });
   ASSERT_TRUE(eventually([&] { return open_descriptors() > descriptors + 1; }));
-  vexa::Cancel(driver);
+  vexa::Cancel(driver_);
   ASSERT_EQ(call.wait_for(kSoon), std::future_status::ready);
   EXPECT_EQ(call.get(), LIBD_TIMEOUT);
-  EXPECT_EQ(driver.LatestErrorText(), "Connection timed out");
+  EXPECT_EQ(driver_.LatestErrorText(), "Connection timed out");
   EXPECT_EQ(open_descriptors(), descriptors);
 }
 
-TEST(Cancel, ReturnsTheCodeOfACameraThatDoesNotAnswer) {
-  LiveCamera camera(camera_options());
-  CancelDriver driver;
-  camera.introduce(driver, kEndless);
-  camera->add_request_fault(RequestFault::no_answer("DESCRIBE"));
-  auto start = std::async(std::launch::async, [&] { return driver.StartVideoStreaming(); });
-  ASSERT_TRUE(eventually([&] { return was_asked(camera, "DESCRIBE"); }));
-  vexa::Cancel(driver);
-  ASSERT_TRUE(ended(camera, start));
+TEST_F(Cancel, ReturnsTheCodeOfACameraThatDoesNotAnswer) {
+  introduce(kEndless);
+  camera()->add_request_fault(RequestFault::no_answer("DESCRIBE"));
+  auto start = std::async(std::launch::async, [&] { return driver_.StartVideoStreaming(); });
+  ASSERT_TRUE(was_asked(camera(), "DESCRIBE"));
+  vexa::Cancel(driver_);
+  ASSERT_TRUE(ended(camera(), start));
   EXPECT_EQ(start.get(), LIBD_STREAM_OPEN_FAILED);
-  const vexa::FailureReport failure = vexa::LastFailure(driver);
+  const vexa::FailureReport failure = vexa::LastFailure(driver_);
   EXPECT_EQ(failure.code, LIBD_STREAM_OPEN_FAILED);
   EXPECT_EQ(failure.text, "Receive timed out");
   EXPECT_EQ(failure.operation, "StartVideoStreaming");
-  EXPECT_EQ(failure.camera, camera->address() + ":" + std::to_string(camera->http_port()));
+  EXPECT_EQ(failure.camera, camera()->address() + ":" + std::to_string(camera()->http_port()));
   EXPECT_TRUE(failure.cancelled);
-  EXPECT_EQ(driver.ConnectionTimeout(), kEndless);
-  EXPECT_EQ(driver.m_RtspSocket, -1);
+  EXPECT_EQ(driver_.ConnectionTimeout(), kEndless);
+  EXPECT_EQ(driver_.m_RtspSocket, -1);
 }
 
-TEST(Cancel, DoesNotTouchWhatBeginsAfterwards) {
-  LiveCamera camera(camera_options());
-  CancelDriver driver;
-  camera.introduce(driver);
-  vexa::Cancel(driver);
+TEST_F(Cancel, OfAStartOfAlarmsLeavesTheTimeOut) {
+  introduce(kEndless);
+  camera()->add_request_fault(RequestFault::no_answer("alarmdata.cgi"));
+  auto start = std::async(std::launch::async, [&] { return driver_.StartIoStreaming(); });
+  ASSERT_TRUE(was_asked(camera(), "alarmdata.cgi"));
+  vexa::Cancel(driver_);
+  ASSERT_TRUE(ended(camera(), start));
+  EXPECT_NE(start.get(), LIBD_OK);
+  EXPECT_TRUE(vexa::LastFailure(driver_).cancelled);
+  EXPECT_EQ(driver_.ConnectionTimeout(), kEndless);
+}
+
+TEST_F(Cancel, DoesNotTouchWhatBeginsAfterwards) {
+  introduce();
+  vexa::Cancel(driver_);
   SLibDCameraInfo info;
-  EXPECT_EQ(driver.GetCameraInfo(info), LIBD_OK);
-  EXPECT_EQ(vexa::LastFailure(driver).code, LIBD_OK);
+  EXPECT_EQ(driver_.GetCameraInfo(info), LIBD_OK);
+  EXPECT_EQ(vexa::LastFailure(driver_).code, LIBD_OK);
 }
 
-TEST(Cancel, LeavesVideoThatPlays) {
-  LiveCamera camera(camera_options());
-  CancelDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
-  vexa::Cancel(driver);
-  SLibDVideoFrameInfo frame;
-  for (int taken = 0; taken < 3;) {
-    if (driver.GetCurrentVideoFrame(frame) == LIBD_OK) ++taken;
-  }
-  driver.state().teardown_timeout = 15000;
-  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+TEST_F(Cancel, LeavesVideoThatPlays) {
+  play();
+  vexa::Cancel(driver_);
+  EXPECT_EQ(FrameTaker().take_all(driver_, 3).size(), 3u);
+  driver_.state().teardown_timeout = 15000;
+  EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
 }
 
-TEST(Cancel, OfAStopSendsTearDownAndDoesNotWait) {
-  LiveCamera camera(camera_options());
-  CancelDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
-  camera->add_request_fault(RequestFault::no_answer("TEARDOWN"));
-  auto stop = std::async(std::launch::async, [&] { return driver.StopVideoStreaming(); });
-  ASSERT_TRUE(eventually([&] { return was_asked(camera, "TEARDOWN"); }));
-  vexa::Cancel(driver);
-  ASSERT_TRUE(ended(camera, stop));
+TEST_F(Cancel, OfAStopSendsTearDownAndDoesNotWait) {
+  play();
+  camera()->add_request_fault(RequestFault::no_answer("TEARDOWN"));
+  auto stop = std::async(std::launch::async, [&] { return driver_.StopVideoStreaming(); });
+  ASSERT_TRUE(was_asked(camera(), "TEARDOWN"));
+  vexa::Cancel(driver_);
+  ASSERT_TRUE(ended(camera(), stop));
   EXPECT_EQ(stop.get(), LIBD_OK);
-  const vexa::FailureReport failure = vexa::LastFailure(driver);
+  const vexa::FailureReport failure = vexa::LastFailure(driver_);
   EXPECT_TRUE(failure.cancelled);
   EXPECT_EQ(failure.code, LIBD_TIMEOUT);
   EXPECT_EQ(failure.operation, "StopVideoStreaming");
-  EXPECT_EQ(driver.m_RtspSocket, -1);
+  EXPECT_EQ(driver_.m_RtspSocket, -1);
 }
 
-TEST(Cancel, EndsTheCallsOfAllThreadsAtOnce) {
-  LiveCamera camera(camera_options());
-  CancelDriver driver;
-  camera.introduce(driver, kEndless);
-  camera->add_request_fault(RequestFault::no_answer(""));
+TEST_F(Cancel, EndsTheCallsOfAllThreadsAtOnce) {
+  introduce(kEndless);
+  camera()->add_request_fault(RequestFault::no_answer(""));
   std::vector<std::future<ELibDReturnCode>> waiting;
-  waiting.push_back(std::async(std::launch::async, [&] { return driver.StartVideoStreaming(); }));
-  waiting.push_back(std::async(std::launch::async, [&] { return driver.StartAudioStreaming(); }));
-  waiting.push_back(std::async(std::launch::async, [&] { return driver.StartIoStreaming(); }));
+  waiting.push_back(std::async(std::launch::async, [&] { return driver_.StartVideoStreaming(); }));
+  waiting.push_back(std::async(std::launch::async, [&] { return driver_.StartAudioStreaming(); }));
+  waiting.push_back(std::async(std::launch::async, [&] { return driver_.StartIoStreaming(); }));
   for (int i = 0; i < 3; ++i) {
     waiting.push_back(std::async(std::launch::async, [&] {
       SLibDSystemInfo info;
-      return driver.GetCurrentSystemInfo(info);
+      return driver_.GetCurrentSystemInfo(info);
     }));
   }
-  ASSERT_TRUE(eventually([&] { return requests(camera) == waiting.size(); }));
-  vexa::Cancel(driver);
+  ASSERT_TRUE(eventually([&] { return requests(camera()) == waiting.size(); }));
+  vexa::Cancel(driver_);
   for (auto& call : waiting) {
-    EXPECT_TRUE(ended(camera, call));
+    EXPECT_TRUE(ended(camera(), call));
     EXPECT_NE(call.get(), LIBD_OK);
   }
 }
 
-TEST(Cancel, EndsAStopThatWaitsForAStart) {
-  LiveCamera camera(camera_options());
-  CancelDriver driver;
-  camera.introduce(driver, kEndless);
-  camera->add_request_fault(RequestFault::no_answer("DESCRIBE"));
-  auto start = std::async(std::launch::async, [&] { return driver.StartVideoStreaming(); });
-  ASSERT_TRUE(eventually([&] { return was_asked(camera, "DESCRIBE"); }));
-  auto stop = std::async(std::launch::async, [&] { return driver.StopVideoStreaming(); });
-  std::this_thread::yield();
-  vexa::Cancel(driver);
-  EXPECT_TRUE(ended(camera, start));
-  EXPECT_TRUE(ended(camera, stop));
+TEST_F(Cancel, EndsAStopThatWaitsForAStart) {
+  introduce(kEndless);
+  camera()->add_request_fault(RequestFault::no_answer("DESCRIBE"));
+  auto start = std::async(std::launch::async, [&] { return driver_.StartVideoStreaming(); });
+  ASSERT_TRUE(was_asked(camera(), "DESCRIBE"));
+  std::atomic<long> stopper{0};
+  auto stop = std::async(std::launch::async, [&] {
+    stopper = kernel_thread_id();
+    return driver_.StopVideoStreaming();
+  });
+  EXPECT_TRUE(eventually([&] { return stopper != 0 && is_sleeping(stopper); }));
+  vexa::Cancel(driver_);
+  EXPECT_TRUE(ended(camera(), start));
+  EXPECT_TRUE(ended(camera(), stop));
   EXPECT_EQ(stop.get(), LIBD_OK);
 }
 
-TEST(Cancel, FromManyThreadsWhileCallsComeAndGo) {
-  LiveCamera camera(camera_options());
-  CancelDriver driver;
-  camera.introduce(driver, kEndless);
+TEST_F(Cancel, FromManyThreadsWhileCallsComeAndGo) {
+  introduce(kEndless);
   std::atomic<bool> over{false};
   std::vector<std::thread> cancellers;
   for (int i = 0; i < 3; ++i) {
     cancellers.emplace_back([&] {
       while (!over) {
-        vexa::Cancel(driver);
+        vexa::Cancel(driver_);
         std::this_thread::sleep_for(1ms);
       }
     });
@@ -313,9 +298,9 @@ TEST(Cancel, FromManyThreadsWhileCallsComeAndGo) {
     callers.emplace_back([&] {
       for (int call = 0; call < 20; ++call) {
         SLibDCameraInfo info;
-        const ELibDReturnCode code = driver.GetCameraInfo(info);
+        const ELibDReturnCode code = driver_.GetCameraInfo(info);
         EXPECT_TRUE(code == LIBD_OK || code == LIBD_TIMEOUT || code == LIBD_FAILED) << code;
-        static_cast<void>(vexa::LastFailure(driver));
+        static_cast<void>(vexa::LastFailure(driver_));
       }
     });
   }
@@ -324,40 +309,37 @@ TEST(Cancel, FromManyThreadsWhileCallsComeAndGo) {
   for (std::thread& canceller : cancellers) canceller.join();
 }
 
-TEST(CancelToken, EndsWhatWaitsAndWhatBeginsUntilItIsReset) {
-  LiveCamera camera(camera_options());
-  CancelDriver driver;
-  camera.introduce(driver, kEndless);
+TEST_F(CancelToken, EndsWhatWaitsAndWhatBeginsUntilItIsReset) {
+  introduce(kEndless);
   vexa::CancelToken token;
-  vexa::SetCancelToken(driver, token);
-  camera->add_request_fault(RequestFault::no_answer("inq=camera"));
+  vexa::SetCancelToken(driver_, token);
+  camera()->add_request_fault(RequestFault::no_answer("inq=camera"));
   SLibDCameraInfo info;
-  auto inquiry = std::async(std::launch::async, [&] { return driver.GetCameraInfo(info); });
-  ASSERT_TRUE(eventually([&] { return was_asked(camera, "inq=camera"); }));
+  auto inquiry = std::async(std::launch::async, [&] { return driver_.GetCameraInfo(info); });
+  ASSERT_TRUE(was_asked(camera(), "inq=camera"));
   token.Cancel();
   EXPECT_TRUE(token.IsCancelled());
-  ASSERT_TRUE(ended(camera, inquiry));
+  ASSERT_TRUE(ended(camera(), inquiry));
   EXPECT_NE(inquiry.get(), LIBD_OK);
-  const std::size_t asked = requests(camera);
+  const std::size_t asked = requests(camera());
   for (const CallRow& row : calls()) {
-    EXPECT_NE(row.call(driver), LIBD_OK) << row.name;
-    EXPECT_TRUE(vexa::LastFailure(driver).cancelled) << row.name;
-    EXPECT_EQ(vexa::LastFailure(driver).operation, row.name);
+    EXPECT_NE(row.call(driver_), LIBD_OK) << row.name;
+    EXPECT_TRUE(vexa::LastFailure(driver_).cancelled) << row.name;
+    EXPECT_EQ(vexa::LastFailure(driver_).operation, row.name);
   }
-  EXPECT_EQ(requests(camera), asked);
+  EXPECT_EQ(requests(camera()), asked);
   token.Reset();
   EXPECT_FALSE(token.IsCancelled());
-  camera->clear_request_faults();
-  EXPECT_EQ(driver.GetCameraInfo(info), LIBD_OK);
+  camera()->clear_request_faults();
+  EXPECT_EQ(driver_.GetCameraInfo(info), LIBD_OK);
 }
 
-TEST(CancelToken, IsOneForManyDriversAndMayEndBeforeThem) {
-  LiveCamera camera(camera_options());
+TEST_F(CancelToken, IsOneForManyDriversAndMayEndBeforeThem) {
   std::vector<std::unique_ptr<CancelDriver>> drivers;
   auto token = std::make_unique<vexa::CancelToken>();
   for (int i = 0; i < 5; ++i) {
     drivers.push_back(std::make_unique<CancelDriver>());
-    camera.introduce(*drivers.back());
+    camera().introduce(*drivers.back());
     vexa::SetCancelToken(*drivers.back(), *token);
   }
   token->Cancel();
@@ -373,12 +355,10 @@ TEST(CancelToken, IsOneForManyDriversAndMayEndBeforeThem) {
 
 vexa::CancelToken* handled = nullptr;
 
-TEST(CancelToken, IsCancelledByASignalHandler) {
-  LiveCamera camera(camera_options());
-  CancelDriver driver;
-  camera.introduce(driver);
+TEST_F(CancelToken, IsCancelledByASignalHandler) {
+  introduce();
   vexa::CancelToken token;
-  vexa::SetCancelToken(driver, token);
+  vexa::SetCancelToken(driver_, token);
   handled = &token;
   struct sigaction before {};
   struct sigaction action {};
@@ -386,39 +366,33 @@ TEST(CancelToken, IsCancelledByASignalHandler) {
   sigaction(SIGUSR1, &action, &before);
   raise(SIGUSR1);
   SLibDCameraInfo info;
-  EXPECT_NE(driver.GetCameraInfo(info), LIBD_OK);
-  EXPECT_TRUE(vexa::LastFailure(driver).cancelled);
+  EXPECT_NE(driver_.GetCameraInfo(info), LIBD_OK);
+  EXPECT_TRUE(vexa::LastFailure(driver_).cancelled);
   sigaction(SIGUSR1, &before, nullptr);
 }
 
-TEST(CancelToken, LetsAStopSendTearDown) {
-  LiveCamera camera(camera_options());
-  CancelDriver driver;
-  camera.introduce(driver);
+TEST_F(CancelToken, LetsAStopSendTearDown) {
   vexa::CancelToken token;
-  vexa::SetCancelToken(driver, token);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
-  camera->add_request_fault(RequestFault::no_answer("TEARDOWN"));
+  vexa::SetCancelToken(driver_, token);
+  play();
+  camera()->add_request_fault(RequestFault::no_answer("TEARDOWN"));
   token.Cancel();
-  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
-  EXPECT_TRUE(eventually([&] { return was_asked(camera, "TEARDOWN"); }));
+  EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
+  EXPECT_TRUE(was_asked(camera(), "TEARDOWN"));
 }
 
 // ---- Peers that have gone ----
 
-TEST(GonePeer, EndsAStopAtOnce) {
-  LiveCamera camera(camera_options());
-  CancelDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
-  camera->stop();
-  auto stop = std::async(std::launch::async, [&] { return driver.StopVideoStreaming(); });
+TEST_F(GonePeer, EndsAStopAtOnce) {
+  play();
+  camera()->stop();
+  auto stop = std::async(std::launch::async, [&] { return driver_.StopVideoStreaming(); });
   ASSERT_EQ(stop.wait_for(kSoon), std::future_status::ready);
   EXPECT_EQ(stop.get(), LIBD_OK);
-  EXPECT_FALSE(vexa::LastFailure(driver).cancelled);
+  EXPECT_FALSE(vexa::LastFailure(driver_).cancelled);
 }
 
-TEST(GonePeer, EndsAStartWithTheCodeAndTextOfSilence) {
+TEST_F(GonePeer, EndsAStartWithTheCodeAndTextOfSilence) {
   for (const char* request : {"DESCRIBE", "SETUP", "PLAY"}) {
     LiveCamera camera(camera_options());
     CancelDriver driver;

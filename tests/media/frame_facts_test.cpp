@@ -14,6 +14,7 @@
 
 #include "tests/media/live_camera.h"
 #include "tests/media/statistics_equations.h"
+#include "tests/support/descriptors.h"
 #include "tests/support/process_state.h"
 #include "vexa/reception.h"
 
@@ -36,8 +37,7 @@ class FactsOfALiveStream : public testing::Test {
  protected:
   void start(const vexa::camera::CameraOptions& options) {
     camera_.emplace(options);
-    camera_->introduce(driver_);
-    ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+    camera_->play(driver_);
   }
   /// Takes frames until one's facts are `wanted`; false after ten seconds.
   bool take_until(const std::function<bool(const FrameFacts&)>& wanted) {
@@ -161,21 +161,23 @@ TEST_F(FactsOfALiveStream, AreThoseOfTheSlotsFrames) {
 }
 
 TEST_F(FactsOfALiveStream, ComeFromTheCameraAloneWithStrictReception) {
-  auto options = reporting();
-  options.speed = 1;
   vexa::SetStrictReception(driver_, true);
-  start(options);
+  start(reporting());
   ASSERT_TRUE(take(3));
   EXPECT_EQ(statistics_of(driver_).packetsDiscardedForeignSource, 0u);
   // A stranger's datagrams, from this machine's usual address.
+  const int port = port_of(driver_.state().stream_socket());
+  ASSERT_NE(port, 0);
   sockaddr_in address{};
-  socklen_t length = sizeof address;
-  ASSERT_EQ(getsockname(driver_.state().stream_socket(), reinterpret_cast<sockaddr*>(&address), &length), 0);
+  address.sin_family = AF_INET;
+  address.sin_port = htons(static_cast<std::uint16_t>(port));
   address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
   vexa::Socket stranger(socket(AF_INET, SOCK_DGRAM | SOCK_CLOEXEC, 0));
   for (int i = 0; i < 100; ++i) {
     unsigned char datagram[20] = {0x80, 96, 1, static_cast<unsigned char>(i)};
-    ASSERT_EQ(sendto(stranger.get(), datagram, sizeof datagram, 0, reinterpret_cast<sockaddr*>(&address), length), 20);
+    ASSERT_EQ(
+        sendto(stranger.get(), datagram, sizeof datagram, 0, reinterpret_cast<sockaddr*>(&address), sizeof address),
+        20);
   }
   EXPECT_TRUE(
       take_until([this](const FrameFacts&) { return statistics_of(driver_).packetsDiscardedForeignSource == 100; }));
@@ -184,10 +186,9 @@ TEST_F(FactsOfALiveStream, ComeFromTheCameraAloneWithStrictReception) {
 TEST_F(FactsOfALiveStream, NameTheControlPortBesideTheMediaPort) {
   start(reporting());
   ASSERT_TRUE(take(1));
-  sockaddr_in address{};
-  socklen_t length = sizeof address;
-  ASSERT_EQ(getsockname(driver_.state().stream_socket(), reinterpret_cast<sockaddr*>(&address), &length), 0);
-  EXPECT_EQ(statistics_of(driver_).rtcpPort, ntohs(address.sin_port) + 1u);
+  const int port = port_of(driver_.state().stream_socket());
+  ASSERT_NE(port, 0);
+  EXPECT_EQ(statistics_of(driver_).rtcpPort, static_cast<unsigned>(port) + 1);
 }
 
 }  // namespace

@@ -9,29 +9,8 @@
 namespace vexa_test {
 namespace {
 
-std::time_t frame_clock_now = 1000;
-
 class FrameQueue : public testing::Test {
  protected:
-  FrameQueue() {
-    driver_.state().now = [] { return frame_clock_now; };
-    frame_clock_now = 1000;
-    driver_.m_LastFrameTime = 1000;
-    driver_.use("127.0.0.1", 1, 5000);
-  }
-
-  /// What the streaming thread does with a frame of `type` whose one byte is `mark`.
-  void process(std::int32_t type, ELibDReturnCode result, char mark = 'x') {
-    CVexaCommon::VideoFrameInfo frame;
-    frame.capacity = 8;
-    frame.data = new unsigned char[frame.capacity];
-    frame.data[0] = static_cast<unsigned char>(mark);
-    frame.length = 1;
-    frame.frameType = type;
-    MediaDriver::ProcessCurrentFrameData(&driver_, frame, wait_key_, result);
-    EXPECT_EQ(frame.data, nullptr) << "the frame is the queue's, or freed";
-  }
-
   std::string marks() {
     std::string all;
     FrameTaker host;
@@ -40,8 +19,7 @@ class FrameQueue : public testing::Test {
     return all;
   }
 
-  MediaDriver driver_;
-  bool wait_key_ = false;
+  FedDriver driver_;
 };
 
 struct ResultCase {
@@ -64,8 +42,8 @@ TEST_F(FrameQueue, EveryResultHasItsEffectOnTimeOutQueueAndBuffers) {
   for (const ResultCase& c : cases) {
     driver_.m_VideoTimedOut = c.timed_out_before;
     driver_.m_LargeFrameBuffers = false;
-    frame_clock_now = driver_.m_LastFrameTime + c.silence;
-    process(VIDEO_FRAME_JPEG, c.result);
+    FedDriver::clock_now = driver_.m_LastFrameTime + c.silence;
+    driver_.feed(c.result, VIDEO_FRAME_JPEG);
     EXPECT_EQ(driver_.m_VideoTimedOut, c.timed_out_after) << c.result;
     EXPECT_EQ(driver_.m_FrameQueue.size(), c.queued) << c.result;
     EXPECT_EQ(driver_.m_LargeFrameBuffers, c.large_buffers) << c.result;
@@ -74,34 +52,34 @@ TEST_F(FrameQueue, EveryResultHasItsEffectOnTimeOutQueueAndBuffers) {
 }
 
 TEST_F(FrameQueue, WithTenJpegFramesWaitingTheNextRemovesTheOldest) {
-  for (char mark = 'a'; mark < 'a' + 10; ++mark) process(VIDEO_FRAME_JPEG, LIBD_OK, mark);
-  process(VIDEO_FRAME_JPEG, LIBD_OK, 'z');
+  for (char mark = 'a'; mark < 'a' + 10; ++mark) driver_.feed(LIBD_OK, VIDEO_FRAME_JPEG, mark);
+  driver_.feed(LIBD_OK, VIDEO_FRAME_JPEG, 'z');
   EXPECT_EQ(marks(), "bcdefghijz");
 }
 
 TEST_F(FrameQueue, WithThirtyOneH264FramesWaitingTheNextDeltaEmptiesTheQueueUntilAKeyFrame) {
-  process(VIDEO_FRAME_H264_KEY, LIBD_OK, 'k');
-  for (int i = 0; i < 30; ++i) process(VIDEO_FRAME_H264_DELTA, LIBD_OK, 'd');
+  driver_.feed(LIBD_OK, VIDEO_FRAME_H264_KEY, 'k');
+  for (int i = 0; i < 30; ++i) driver_.feed(LIBD_OK, VIDEO_FRAME_H264_DELTA, 'd');
   EXPECT_EQ(driver_.m_FrameQueue.size(), 31u);
-  process(VIDEO_FRAME_H264_DELTA, LIBD_OK, 'x');
+  driver_.feed(LIBD_OK, VIDEO_FRAME_H264_DELTA, 'x');
   EXPECT_EQ(driver_.m_FrameQueue.size(), 0u);
-  process(VIDEO_FRAME_H264_DELTA, LIBD_OK, 'y');
-  process(VIDEO_FRAME_H264_KEY, LIBD_OK, 'K');
-  process(VIDEO_FRAME_H264_DELTA, LIBD_OK, 'D');
+  driver_.feed(LIBD_OK, VIDEO_FRAME_H264_DELTA, 'y');
+  driver_.feed(LIBD_OK, VIDEO_FRAME_H264_KEY, 'K');
+  driver_.feed(LIBD_OK, VIDEO_FRAME_H264_DELTA, 'D');
   EXPECT_EQ(marks(), "KD");
 }
 
 TEST_F(FrameQueue, AFrameWithoutATypeIsNeverHandedOutAndAKeyFrameMustFollow) {
-  process(VIDEO_FRAME_INVALID, LIBD_OK, 'i');
-  process(VIDEO_FRAME_H264_DELTA, LIBD_OK, 'd');
-  process(VIDEO_FRAME_H264_KEY, LIBD_OK, 'k');
+  driver_.feed(LIBD_OK, VIDEO_FRAME_INVALID, 'i');
+  driver_.feed(LIBD_OK, VIDEO_FRAME_H264_DELTA, 'd');
+  driver_.feed(LIBD_OK, VIDEO_FRAME_H264_KEY, 'k');
   EXPECT_EQ(marks(), "k");
 }
 
 TEST_F(FrameQueue, AnEmptyQueueGivesNoFrameAndATimeOutOnce) {
   SLibDVideoFrameInfo frame;
   EXPECT_EQ(driver_.GetCurrentVideoFrame(frame), LIBD_NO_FRAME);
-  process(VIDEO_FRAME_JPEG, LIBD_TIMEOUT);
+  driver_.feed(LIBD_TIMEOUT, VIDEO_FRAME_JPEG);
   EXPECT_EQ(driver_.GetCurrentVideoFrame(frame), LIBD_TIMEOUT);
   EXPECT_EQ(driver_.GetCurrentVideoFrame(frame), LIBD_NO_FRAME);
 }
@@ -113,7 +91,7 @@ TEST_F(FrameQueue, TheHostGetsTypeAndTimeStampOfTheOldestFrame) {
   queued.frameType = VIDEO_FRAME_H264_KEY;
   queued.seconds = 1706745599;
   queued.microseconds = 250000;
-  MediaDriver::PropulateFrameInfoList(&driver_, queued, wait_key_);
+  FedDriver::PropulateFrameInfoList(&driver_, queued, driver_.wait_key);
   TakenFrame frame;
   ASSERT_EQ(FrameTaker().take(driver_, frame), LIBD_OK);
   EXPECT_EQ(frame.bytes, "abc");
@@ -123,7 +101,7 @@ TEST_F(FrameQueue, TheHostGetsTypeAndTimeStampOfTheOldestFrame) {
 }
 
 TEST_F(FrameQueue, AFrameForAHostWithoutASinkIsTakenAllTheSame) {
-  process(VIDEO_FRAME_JPEG, LIBD_OK);
+  driver_.feed(LIBD_OK, VIDEO_FRAME_JPEG);
   SLibDVideoFrameInfo frame;
   EXPECT_EQ(driver_.GetCurrentVideoFrame(frame), LIBD_OK);
   EXPECT_EQ(driver_.GetCurrentVideoFrame(frame), LIBD_NO_FRAME);
@@ -138,34 +116,26 @@ TEST_F(FrameQueue, AFrameThatFindsNoMemoryInTheQueueIsFreedAsATimeOut) {
   for (const ShortMemoryCase& c :
        {ShortMemoryCase{VIDEO_FRAME_JPEG, false}, ShortMemoryCase{VIDEO_FRAME_H264_DELTA, true},
         ShortMemoryCase{VIDEO_FRAME_MPEG4_KEY, true}}) {
-    wait_key_ = false;
+    driver_.wait_key = false;
     bool failed = false;
     for (int i = 0; i < 1000 && !failed; ++i) {  // the queue fetches memory for several frames at a time
-      CVexaCommon::VideoFrameInfo frame;
-      frame.capacity = 8;
-      frame.data = new unsigned char[frame.capacity];
-      frame.frameType = c.type;
+      auto frame = FedDriver::made_frame(c.type);
       const std::size_t waiting = driver_.m_FrameQueue.size();
       const AllocationFailure failure(0);
-      MediaDriver::ProcessCurrentFrameData(&driver_, frame, wait_key_, LIBD_OK);
+      FedDriver::ProcessCurrentFrameData(&driver_, frame, driver_.wait_key, LIBD_OK);
       failed = failure.happened();
       EXPECT_EQ(frame.data, nullptr);
       EXPECT_TRUE(!failed || driver_.m_FrameQueue.size() <= waiting);
       EXPECT_EQ(driver_.m_VideoTimedOut, failed);
     }
     EXPECT_TRUE(failed) << c.type;
-    EXPECT_EQ(wait_key_, c.waits_for_key) << c.type;
+    EXPECT_EQ(driver_.wait_key, c.waits_for_key) << c.type;
     driver_.state().clear_frame_queue();
   }
 }
 
-class ThrowingSink : public CDataSink {
- public:
-  void Write(const unsigned char*, unsigned int) override { throw std::runtime_error("disk full"); }
-};
-
 TEST_F(FrameQueue, AThrowingSinkLeavesTheFrameQueuedAndTheLockFree) {
-  process(VIDEO_FRAME_JPEG, LIBD_OK, 'j');
+  driver_.feed(LIBD_OK, VIDEO_FRAME_JPEG, 'j');
   ThrowingSink sink;
   SLibDVideoFrameInfo frame;
   frame.sink = &sink;

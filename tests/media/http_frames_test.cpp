@@ -34,10 +34,6 @@ class HttpDriver : public MediaDriver {
     const vexa::Guard guard(m_ConnectionLock);
     m_ConnectionInfo.timeout = timeout;
   }
-  std::string position() {
-    const vexa::Guard guard(m_CamPosLock);
-    return m_CamPosText;
-  }
 };
 
 class HttpFrames : public testing::Test {
@@ -213,7 +209,7 @@ TEST_F(HttpFrames, TakeTheCamerasPositionFromUserData) {
     pair_.say(c.unit + (c.codec[0] == 'H' ? kSlice + kSlice : kPicture + kPicture));
     read(c.codec);
     EXPECT_EQ(read(c.codec), LIBD_OK);
-    EXPECT_EQ(driver_.position(), c.position) << c.unit;
+    EXPECT_EQ(driver_.position_text(), c.position) << c.unit;
   }
 }
 

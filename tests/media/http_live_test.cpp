@@ -59,6 +59,11 @@ class HttpLive : public testing::Test {
     driver_.m_CameraInfo.codecName = way.codec;
   }
 
+  void play(const HttpWay& way, int timeout = 5000) {
+    run(way, timeout);
+    ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+  }
+
   /// Picture `index` of the stream, as it must arrive.
   static std::string picture(const HttpWay& way, std::size_t index, const std::string& user_data = "") {
     static std::map<std::string, std::shared_ptr<const vexa::camera::ImageClip>> clips;
@@ -110,8 +115,7 @@ class HttpLive : public testing::Test {
 TEST_F(HttpLive, EveryFrameIsTheEncoders) {
   for (const HttpWay& way : kHttpWays) {
     options_.image_path = way.clip;
-    run(way);
-    ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+    play(way);
     expect_frames(way, 120);
     EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
   }
@@ -122,8 +126,7 @@ TEST_F(HttpLive, PicturesMayComeInPiecesOfAnyLength) {
     for (const std::size_t piece : {1U, 7U, 1021U}) {
       options_.image_path = way.clip;
       options_.stream_piece = piece;
-      run(way, 600000);  // a try for each byte of a picture, which is what a busy machine may need
-      ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+      play(way, 600000);  // a try for each byte of a picture, which is what a busy machine may need
       expect_frames(way, 4);
       EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
     }
@@ -134,19 +137,16 @@ TEST_F(HttpLive, TheCamerasPositionIsTakenFromEveryCodec) {
   for (const HttpWay& way : kHttpWays) {
     options_.image_path = way.clip;
     options_.user_data = std::string("CamPos: ") + way.codec + " 0123456789abcdef";
-    run(way);
-    ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+    play(way);
     expect_frames(way, 10, options_.user_data);
     EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
-    const vexa::Guard guard(driver_.m_CamPosLock);
-    EXPECT_EQ(driver_.m_CamPosText, options_.user_data.substr(0, 24));
+    EXPECT_EQ(driver_.position_text(), options_.user_data.substr(0, 24));
   }
 }
 
 TEST_F(HttpLive, TextBetweenThePartsIsPassedOver) {
   strike(Action::kBefore, 2, "garbage of a camera\r\nDataLen\r\n");
-  run(kJpegWay);
-  ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+  play(kJpegWay);
   expect_frames(kJpegWay, 10);
 }
 
@@ -157,8 +157,7 @@ TEST_F(HttpLive, PicturesOfAMegabyteKeepUp) {
   for (int i = 0; i < 15; ++i) large.insert(2, "\xff\xfe\xff\xff" + std::string(65533, 'x'));
   std::ofstream(path, std::ios::binary) << large;
   options_.image_path = path;
-  run(kJpegWay);
-  ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+  play(kJpegWay);
   const auto frames = taker_.take_all(driver_, 50);
   EXPECT_EQ(frames.size(), 50U);
   for (const TakenFrame& frame : frames) EXPECT_TRUE(frame.bytes == large);
@@ -172,8 +171,7 @@ TEST_F(HttpLive, ALargePartIsDroppedAndTakenAfterARestart) {
   for (int i = 0; i < 25; ++i) large.insert(2, "\xff\xfe\xff\xff" + std::string(65533, 'x'));
   std::ofstream(path, std::ios::binary) << picture(kJpegWay, 1) << large;
   options_.image_path = path;
-  run(kJpegWay, 1000);
-  ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+  play(kJpegWay, 1000);
   EXPECT_EQ(taker_.take_all(driver_, 1).size(), 1U);
   EXPECT_TRUE(times_out());
   ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
@@ -277,14 +275,12 @@ const BrokenStream kDisturbedStreams[] = {
 INSTANTIATE_TEST_SUITE_P(Of, DisturbedHttpLive, testing::ValuesIn(kDisturbedStreams), name_of_broken_stream);
 
 TEST_F(HttpLive, ACodecThatIsChangedComesWithTheNextStart) {
-  run(kJpegWay);
-  ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+  play(kJpegWay);
   expect_frames(kJpegWay, 3);
   driver_.StopVideoStreaming();
   camera_->stop();
   options_.image_path = kMpeg4Way.clip;
-  run(kMpeg4Way);
-  ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+  play(kMpeg4Way);
   expect_frames(kMpeg4Way, 30);
   driver_.StopVideoStreaming();
 }

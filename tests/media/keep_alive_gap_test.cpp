@@ -9,6 +9,7 @@
 #include "tests/media/live_camera.h"
 #include "vexa/cancel.h"
 #include "vexa/trace.h"
+#include "vexa/waiting.h"
 
 namespace vexa_test {
 namespace {
@@ -22,7 +23,6 @@ constexpr int kManyFrames = 20;
 TEST(UnansweredKeepAlive, DoesNotHoldThePicturesUp) {
   LiveCamera camera(camera_options());
   MediaDriver driver;
-  camera.introduce(driver);
   camera->add_request_fault(RequestFault::raw("inq=edgestorage", "HTTP/1.0 200 OK\r\n\r\nA=1&EsRTSPRec1Timeout=1"));
   camera->add_request_fault(RequestFault::no_answer("GET_PARAMETER"));
   std::atomic<int> taken{0};
@@ -31,12 +31,13 @@ TEST(UnansweredKeepAlive, DoesNotHoldThePicturesUp) {
     if (line.rfind("send <GET_PARAMETER", 0) == 0) taken_before = taken.load();
     if (line == "error receiving getparameter") taken_before = kNone;
   }));
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   SLibDVideoFrameInfo frame;
   bool went_on = false;
   // A machine under load may need more than a second for so many frames: then there is another keep-alive.
   const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(60);
   while (!went_on && std::chrono::steady_clock::now() < deadline) {
+    vexa::WaitForVideoFrame(driver, 100);
     if (driver.GetCurrentVideoFrame(frame) != LIBD_OK) continue;
     ++taken;
     const int before = taken_before;

@@ -95,4 +95,25 @@ class LiveCamera {
   vexa::camera::VirtualCamera camera_;
 };
 
+/// A camera that starts when it is first needed, and a driver for it.
+template <typename Driver>
+class LiveVideo : public testing::Test {
+ protected:
+  LiveCamera& camera() {
+    if (!camera_) camera_.emplace(options_);
+    return *camera_;
+  }
+  void start() { camera(); }
+  void introduce(int timeout = 5000) { camera().introduce(driver_, timeout); }
+  void play() { camera().play(driver_); }
+
+  vexa::camera::CameraOptions options_ = camera_options();
+
+ private:
+  std::optional<LiveCamera> camera_;
+
+ protected:
+  Driver driver_;
+};
+
 }  // namespace vexa_test

@@ -22,26 +22,22 @@ void expect_clip(const LiveCamera& camera, const std::vector<TakenFrame>& frames
   }
 }
 
-TEST(LiveStream, EveryFrameEqualsTheEncodersAcrossTheLoopOfTheClip) {
-  auto options = camera_options();
-  options.pictures = 300;
-  LiveCamera camera(options);
-  MediaDriver driver;
-  camera.play(driver);
-  expect_clip(camera, FrameTaker().take_all(driver, 300), 300);
+using LiveStream = LiveVideo<MediaDriver>;
+
+TEST_F(LiveStream, EveryFrameEqualsTheEncodersAcrossTheLoopOfTheClip) {
+  options_.pictures = 300;
+  play();
+  expect_clip(camera(), FrameTaker().take_all(driver_, 300), 300);
 }
 
-TEST(LiveStream, PicturesOfSeveralSlicesArriveWhole) {
-  auto options = camera_options();
-  options.clip_path = VEXA_CLIPS "/slices.h264";
-  options.pictures = 100;
-  LiveCamera camera(options);
-  MediaDriver driver;
-  camera.play(driver);
-  expect_clip(camera, FrameTaker().take_all(driver, 100), 100);
+TEST_F(LiveStream, PicturesOfSeveralSlicesArriveWhole) {
+  options_.clip_path = VEXA_CLIPS "/slices.h264";
+  options_.pictures = 100;
+  play();
+  expect_clip(camera(), FrameTaker().take_all(driver_, 100), 100);
 }
 
-TEST(LiveStream, EightCamerasAtOnceLoseNothing) {
+TEST_F(LiveStream, EightCamerasAtOnceLoseNothing) {
   constexpr std::size_t kCameras = 8;
   constexpr std::size_t kPictures = 200;
   std::vector<std::unique_ptr<LiveCamera>> cameras;
@@ -61,23 +57,21 @@ TEST(LiveStream, EightCamerasAtOnceLoseNothing) {
   for (std::thread& host : hosts) host.join();
 }
 
-TEST(LiveStream, AProcessWith5000OpenDescriptorsStreamsAsWellAsAny) {
+TEST_F(LiveStream, AProcessWith5000OpenDescriptorsStreamsAsWellAsAny) {
   rlimit limit = {};
   ASSERT_EQ(getrlimit(RLIMIT_NOFILE, &limit), 0);
   limit.rlim_cur = std::min<rlim_t>(limit.rlim_max, 6000);
   ASSERT_EQ(setrlimit(RLIMIT_NOFILE, &limit), 0);
   ASSERT_GE(limit.rlim_cur, 5200u) << "raise the hard limit of open files (ulimit -Hn) to 6000";
-  auto options = camera_options();
-  options.pictures = 50;
-  LiveCamera camera(options);
+  options_.pictures = 50;
+  start();
   std::vector<int> descriptors;
   while (descriptors.size() < 5000) descriptors.push_back(open("/dev/null", O_RDONLY | O_CLOEXEC));
   ASSERT_GE(descriptors.back(), 5000);
-  MediaDriver driver;
-  camera.play(driver);
-  EXPECT_GT(driver.m_StreamSocket, 1023);
-  expect_clip(camera, FrameTaker().take_all(driver, 50), 50);
-  driver.StopVideoStreaming();
+  play();
+  EXPECT_GT(driver_.m_StreamSocket, 1023);
+  expect_clip(camera(), FrameTaker().take_all(driver_, 50), 50);
+  driver_.StopVideoStreaming();
   for (const int descriptor : descriptors) close(descriptor);
 }
 
@@ -128,20 +122,17 @@ INSTANTIATE_TEST_SUITE_P(All, LiveStreamRestart,
                                          RestartCase{"Both", true, true}),
                          [](const auto& tested) { return tested.param.name; });
 
-TEST(LiveStream, CorruptedPacketsEndInNeitherCrashNorHang) {
-  auto options = camera_options();
-  options.pictures = 300;
-  options.packet_faults.corrupt_header = 0.02;
-  options.packet_faults.corrupt_payload = 0.02;
-  options.packet_faults.missing_marker = 0.02;
-  options.packet_faults.last_picture = 200;
-  LiveCamera camera(options);
-  MediaDriver driver;
-  camera.play(driver);
-  const auto frames = take_to_the_end(camera, driver, 299);
+TEST_F(LiveStream, CorruptedPacketsEndInNeitherCrashNorHang) {
+  options_.pictures = 300;
+  options_.packet_faults.corrupt_header = 0.02;
+  options_.packet_faults.corrupt_payload = 0.02;
+  options_.packet_faults.missing_marker = 0.02;
+  options_.packet_faults.last_picture = 200;
+  play();
+  const auto frames = take_to_the_end(camera(), driver_, 299);
   ASSERT_GE(frames.size(), 25u);
   for (std::size_t back = 1; back <= 25; ++back) {
-    EXPECT_EQ(frames[frames.size() - back].bytes, camera.picture(300 - back)) << "the clean end of the stream";
+    EXPECT_EQ(frames[frames.size() - back].bytes, camera().picture(300 - back)) << "the clean end of the stream";
   }
 }
 
@@ -151,11 +142,6 @@ CameraOptions codec_options(const std::string& clip, unsigned index = 0) {
   auto options = camera_options(index);
   options.clip_path = std::string(VEXA_CLIPS) + "/" + clip;
   return options;
-}
-
-std::string position_of(MediaDriver& driver) {
-  const vexa::Guard guard(driver.m_CamPosLock);
-  return driver.m_CamPosText;
 }
 
 class Codec : public testing::TestWithParam<const char*> {
@@ -195,7 +181,7 @@ TEST_P(Codec, ReportsTheCamerasPositionAndLosesNoPicture) {
   const auto frames = FrameTaker().take_all(driver, 30);
   ASSERT_EQ(frames.size(), 30u);
   for (std::size_t i = 0; i < frames.size(); ++i) ASSERT_TRUE(camera.sent(i, frames[i].bytes)) << "picture " << i;
-  EXPECT_EQ(position_of(driver), "CamPos: 0123,4567,89ab,c");
+  EXPECT_EQ(driver.position_text(), "CamPos: 0123,4567,89ab,c");
 }
 
 INSTANTIATE_TEST_SUITE_P(Clips, Codec, testing::Values("small.m4v", "plain.mjpeg", "restart.mjpeg", "sliced.mjpeg"),
@@ -215,7 +201,7 @@ TEST(LiveH264, ReportsTheCamerasPosition) {
   const auto frames = FrameTaker().take_all(driver, 30);
   ASSERT_EQ(frames.size(), 30u);
   for (std::size_t i = 0; i < frames.size(); ++i) ASSERT_TRUE(camera.sent(i, frames[i].bytes)) << "picture " << i;
-  EXPECT_EQ(position_of(driver).substr(0, 17), "CamPos: 0123,4567");
+  EXPECT_EQ(driver.position_text().substr(0, 17), "CamPos: 0123,4567");
 }
 
 }  // namespace

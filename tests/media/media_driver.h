@@ -2,13 +2,16 @@
 // The driver with its streaming members in reach, and a host that takes its frames.
 #pragma once
 
+#include <gtest/gtest.h>
 #include <sys/ioctl.h>
 #include <sys/socket.h>
 
 #include <algorithm>
 #include <chrono>
+#include <ctime>
 #include <memory>
 #include <mutex>
+#include <stdexcept>
 #include <string>
 #include <thread>
 #include <vector>
@@ -87,6 +90,47 @@ inline bool KeptPace::is_behind() {
   return std::any_of(drivers_.begin(), drivers_.end(), [](MediaDriver* driver) { return driver->is_behind(); });
 }
 
+/// A driver whose frames come from the test in place of a camera.
+class FedDriver : public MediaDriver {
+ public:
+  FedDriver() {
+    state().now = [] { return clock_now; };
+    m_LastFrameTime = clock_now = 1000;
+    use("127.0.0.1", 1, 5000);
+  }
+
+  /// A frame whose one byte is `mark`; its bytes are the caller's.
+  static VideoFrameInfo made_frame(std::int32_t type, char mark = 'x') {
+    VideoFrameInfo frame;
+    frame.capacity = 8;
+    frame.data = new unsigned char[frame.capacity]();
+    frame.data[0] = static_cast<unsigned char>(mark);
+    frame.length = 1;
+    frame.frameType = type;
+    return frame;
+  }
+
+  /// What the streaming thread does with a frame that it has read.
+  void feed(ELibDReturnCode result = LIBD_OK, std::int32_t type = VIDEO_FRAME_JPEG, char mark = 'x') {
+    VideoFrameInfo frame = made_frame(type, mark);
+    ProcessCurrentFrameData(this, frame, wait_key, result);
+    EXPECT_EQ(frame.data, nullptr) << "the frame is the queue's, or freed";
+  }
+
+  std::size_t waiting() {
+    const vexa::Guard guard(m_FrameQueueLock);
+    return m_FrameQueue.size();
+  }
+
+  ELibDReturnCode take() {
+    SLibDVideoFrameInfo frame;
+    return GetCurrentVideoFrame(frame);
+  }
+
+  static inline std::time_t clock_now = 1000;  ///< seconds, as these drivers see them
+  bool wait_key = false;                       ///< whether the next frame must be a key frame
+};
+
 /// A frame as the host got it.
 struct TakenFrame {
   std::string bytes;
@@ -126,6 +170,12 @@ class FrameTaker : public CDataSink {
 
  private:
   std::string bytes_;
+};
+
+/// A host's sink that takes no frame.
+class ThrowingSink : public CDataSink {
+ public:
+  void Write(const unsigned char*, unsigned int) override { throw std::runtime_error("disk full"); }
 };
 
 /// For H.264 and MPEG-4, of which 30 frames wait for the host.

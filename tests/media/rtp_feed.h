@@ -75,10 +75,6 @@ class RtpFeed : public testing::Test {
 
   ELibDReturnCode read() { return driver_.GetRtpCurrentVideoFrame(codec_, frame_); }
   Payload frame_bytes() const { return {buffer_.begin(), buffer_.begin() + frame_.length}; }
-  std::string stored_position() {
-    const vexa::Guard guard(driver_.m_CamPosLock);
-    return driver_.m_CamPosText;
-  }
 
   static inline std::time_t clock_now = 1000;  ///< seconds, as the driver sees them
 

@@ -120,10 +120,10 @@ TEST_F(RtpFrames, ThePositionIsTakenFromEachSingleUnitOfType6) {
   slice[0] = 0x65;
   send_picture({{0x67, 1}, slice});
   EXPECT_EQ(read(), LIBD_OK);
-  EXPECT_EQ(stored_position(), "");
+  EXPECT_EQ(driver_.position_text(), "");
   send_picture({sei, {0x41, 0x9a}});
   EXPECT_EQ(read(), LIBD_OK);
-  EXPECT_EQ(stored_position(), "CamPos: 1/2/3");
+  EXPECT_EQ(driver_.position_text(), "CamPos: 1/2/3");
 }
 
 TEST_F(RtpFrames, AnotherCodecBeginsWithAnEmptyListAndWaitsForAKeyPicture) {

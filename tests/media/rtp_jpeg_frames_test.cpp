@@ -162,7 +162,7 @@ TEST_F(RtpJpegFrames, UserDataInFrontGivesTheCamerasPosition) {
   first.insert(first.end(), header.begin(), header.end());
   send_picture({first, jpeg_packet(2, {7, 2, 3})});
   expect_small_picture(7);
-  EXPECT_EQ(stored_position(), "CamPos: 0001000200030004");
+  EXPECT_EQ(driver_.position_text(), "CamPos: 0001000200030004");
 }
 
 TEST_F(RtpJpegFrames, WithoutUserDataInFrontNoPositionIsSearchedFor) {
@@ -170,7 +170,7 @@ TEST_F(RtpJpegFrames, WithoutUserDataInFrontNoPositionIsSearchedFor) {
   for (const char c : std::string("CamPos: 5")) scan.push_back(static_cast<unsigned char>(c));
   send_picture({jpeg_packet(0, scan)});
   EXPECT_EQ(read(), LIBD_OK);
-  EXPECT_EQ(stored_position(), "");
+  EXPECT_EQ(driver_.position_text(), "");
 }
 
 TEST_F(RtpJpegFrames, APictureAfterALossBeginsAfreshWithoutTheBrokenOne) {

@@ -70,12 +70,12 @@ TEST_F(RtpMpeg4Frames, ThePositionIsTakenFromTheFirst256BytesOfThePicture) {
   user_data.insert(user_data.end(), text.begin(), text.end());
   send_picture({kMpeg4Key[0], user_data, kMpeg4Key[1]});
   EXPECT_EQ(read(), LIBD_OK);
-  EXPECT_EQ(stored_position(), text.substr(0, 24));
+  EXPECT_EQ(driver_.position_text(), text.substr(0, 24));
   user_data[12] = '0';
   user_data.insert(user_data.begin() + 4, 256, 'x');
   send_picture({kMpeg4Key[0], user_data, kMpeg4Key[1]});
   EXPECT_EQ(read(), LIBD_OK);
-  EXPECT_EQ(stored_position(), text.substr(0, 24)) << "the other one lies too far behind";
+  EXPECT_EQ(driver_.position_text(), text.substr(0, 24)) << "the other one lies too far behind";
 }
 
 TEST_F(RtpMpeg4Frames, WithoutABufferOrRoomNothingIsRead) {

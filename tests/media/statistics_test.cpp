@@ -36,6 +36,12 @@ class Statistics : public RtpFeed {
     if (result == LIBD_OK) driver_.state().ready_frame.data = copy;
     MediaDriver::ProcessCurrentFrameData(&driver_, queued, wait_key_, result);
   }
+  /// A picture of one packet, from the camera into the queue.
+  void pass(const Payload& payload) {
+    send_picture({payload});
+    ASSERT_EQ(read(), LIBD_OK);
+    queue(LIBD_OK);
+  }
   ELibDReturnCode take() {
     SLibDVideoFrameInfo info;
     return driver_.GetCurrentVideoFrame(info);
@@ -154,21 +160,15 @@ TEST_F(Statistics, DroppedFramesHaveTheirReasons) {
 }
 
 TEST_F(Statistics, AFullQueueAndAStopDropFrames) {
-  send_picture({kIdr});
-  ASSERT_EQ(read(), LIBD_OK);
-  queue(LIBD_OK);
+  pass(kIdr);
   for (int i = 0; i < 31; ++i) {
-    send_picture({kSlice});
-    ASSERT_EQ(read(), LIBD_OK);
-    queue(LIBD_OK);
+    pass(kSlice);
     now();
   }
   vexa::StreamStatistics s = now();
   EXPECT_EQ(s.framesDroppedQueue, 31u);
   EXPECT_EQ(s.framesDroppedWithoutKey, 1u) << "the one that found the queue full";
-  send_picture({kIdr});
-  ASSERT_EQ(read(), LIBD_OK);
-  queue(LIBD_OK);
+  pass(kIdr);
   driver_.state().clear_frame_queue();
   s = now();
   EXPECT_EQ(s.framesDroppedAfterStop, 1u);
@@ -364,20 +364,12 @@ TEST_F(Statistics, WithoutAFrameNoFactIsValidAndTheResultIsTheSlots) {
 }
 
 TEST_F(Statistics, FramesDroppedInTheQueueAreLostBeforeTheNextOneHandedOut) {
-  send_picture({kIdr});
-  ASSERT_EQ(read(), LIBD_OK);
-  queue(LIBD_OK);
+  pass(kIdr);
   for (int i = 0; i < 31; ++i) {
-    send_picture({kSlice});
-    ASSERT_EQ(read(), LIBD_OK);
-    const vexa::QueuedFacts known = driver_.state().ready_frame;
-    queue(LIBD_OK);
+    pass(kSlice);
     EXPECT_EQ(driver_.state().ready_frame.data, nullptr);
-    (void)known;
   }
-  send_picture({kIdr});
-  ASSERT_EQ(read(), LIBD_OK);
-  queue(LIBD_OK);
+  pass(kIdr);
   SLibDVideoFrameInfo info;
   vexa::FrameFacts facts;
   ASSERT_EQ(vexa::GetCurrentVideoFrame(driver_, info, facts), LIBD_OK);

@@ -26,52 +26,49 @@ TEST(StreamingThread, EndsAtOnceForNoDriverAndForOneThatIsStopping) {
   EXPECT_EQ(MediaDriver::StreamingThread(static_cast<CVexaCommon*>(&driver)), 0u);
 }
 
-TEST(VideoStreaming, BeginsWithoutAStreamAndWithTheWaitsOfOne) {
-  MediaDriver driver;
-  EXPECT_EQ(driver.m_RtspSocket, -1);
-  EXPECT_EQ(driver.m_StreamSocket, -1);
-  EXPECT_EQ(driver.m_PlaybackScale, 1);
-  EXPECT_EQ(driver.m_KeepAlivePeriod, 1);
-  EXPECT_EQ(driver.m_LastKeepAliveTime, 0);
-  EXPECT_EQ(driver.m_StreamWaitMs, 1);
-  EXPECT_FALSE(driver.m_NoTearDown);
-  EXPECT_FALSE(driver.m_StopVideoRequested);
-  EXPECT_EQ(WaitForSingleObject(driver.m_StopVideoEvent, 0), static_cast<unsigned long>(WAIT_TIMEOUT));
-  const vexa::Guard guard(driver.m_FrameQueueLock);
-  EXPECT_FALSE(driver.m_LargeFrameBuffers);
-  EXPECT_FALSE(driver.m_VideoTimedOut);
+using VideoStreaming = LiveVideo<MediaDriver>;
+
+TEST_F(VideoStreaming, BeginsWithoutAStreamAndWithTheWaitsOfOne) {
+  EXPECT_EQ(driver_.m_RtspSocket, -1);
+  EXPECT_EQ(driver_.m_StreamSocket, -1);
+  EXPECT_EQ(driver_.m_PlaybackScale, 1);
+  EXPECT_EQ(driver_.m_KeepAlivePeriod, 1);
+  EXPECT_EQ(driver_.m_LastKeepAliveTime, 0);
+  EXPECT_EQ(driver_.m_StreamWaitMs, 1);
+  EXPECT_FALSE(driver_.m_NoTearDown);
+  EXPECT_FALSE(driver_.m_StopVideoRequested);
+  EXPECT_EQ(WaitForSingleObject(driver_.m_StopVideoEvent, 0), static_cast<unsigned long>(WAIT_TIMEOUT));
+  const vexa::Guard guard(driver_.m_FrameQueueLock);
+  EXPECT_FALSE(driver_.m_LargeFrameBuffers);
+  EXPECT_FALSE(driver_.m_VideoTimedOut);
 }
 
-TEST(VideoStreaming, StopOfADriverThatNeverStartedIsOkAndDoesNothing) {
-  MediaDriver driver;
-  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
-  EXPECT_EQ(driver.LatestErrorText(), "");
+TEST_F(VideoStreaming, StopOfADriverThatNeverStartedIsOkAndDoesNothing) {
+  EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
+  EXPECT_EQ(driver_.LatestErrorText(), "");
 }
 
-TEST(VideoStreaming, StartIsRefusedWhileAStopIsInProgress) {
-  MediaDriver driver;
-  driver.m_StopVideoRequested = true;
-  EXPECT_EQ(driver.StartVideoStreaming(), LIBD_FAILED);
+TEST_F(VideoStreaming, StartIsRefusedWhileAStopIsInProgress) {
+  driver_.m_StopVideoRequested = true;
+  EXPECT_EQ(driver_.StartVideoStreaming(), LIBD_FAILED);
 }
 
-TEST(VideoStreaming, OpensTheSessionByItsTextsAndEndsItWithTearDown) {
-  LiveCamera camera(camera_options());
-  MediaDriver driver;
-  camera.play(driver);
-  EXPECT_NE(driver.m_StagingBuffer, nullptr);
-  EXPECT_EQ(driver.m_RtpClockRate, 90000);
-  ASSERT_EQ(driver.StopVideoStreaming(), LIBD_OK);
-  EXPECT_EQ(driver.m_StreamSocket, -1);
-  EXPECT_EQ(driver.m_RtspSocket, -1);
-  EXPECT_EQ(driver.m_StagingBuffer, nullptr);
-  EXPECT_EQ(driver.m_RtpPacketBuffer, nullptr);
-  EXPECT_EQ(driver.m_StreamingThread, nullptr);
-  EXPECT_EQ(driver.m_ConnectionInfo.timeout, 5000);
+TEST_F(VideoStreaming, OpensTheSessionByItsTextsAndEndsItWithTearDown) {
+  play();
+  EXPECT_NE(driver_.m_StagingBuffer, nullptr);
+  EXPECT_EQ(driver_.m_RtpClockRate, 90000);
+  ASSERT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
+  EXPECT_EQ(driver_.m_StreamSocket, -1);
+  EXPECT_EQ(driver_.m_RtspSocket, -1);
+  EXPECT_EQ(driver_.m_StagingBuffer, nullptr);
+  EXPECT_EQ(driver_.m_RtpPacketBuffer, nullptr);
+  EXPECT_EQ(driver_.m_StreamingThread, nullptr);
+  EXPECT_EQ(driver_.m_ConnectionInfo.timeout, 5000);
   std::string lines;
-  for (const auto& request : camera->journal().snapshot())
+  for (const auto& request : camera()->journal().snapshot())
     lines += request.bytes.substr(0, request.bytes.find('\r')) + "\n";
-  const std::string url = "rtsp://" + camera->address() + ":554/media/video1";
-  const std::string http = "http://" + camera->address() + ":" + std::to_string(camera->http_port());
+  const std::string url = "rtsp://" + camera()->address() + ":554/media/video1";
+  const std::string http = "http://" + camera()->address() + ":" + std::to_string(camera()->http_port());
   const std::string opening = "GET " + http + "/command/camera.cgi?RTSPTimeout=60 HTTP/1.0\n" +  //
                               "GET " + http + "/command/edgestorage.cgi?EsRTSPRec1Timeout=60 HTTP/1.0\n" + "GET " +
                               http + "/command/inquiry.cgi?inq=edgestorage HTTP/1.0\n" +  //
@@ -79,49 +76,44 @@ TEST(VideoStreaming, OpensTheSessionByItsTextsAndEndsItWithTearDown) {
                               " RTSP/1.0\n";
   EXPECT_EQ(lines.substr(0, opening.size()), opening);
   EXPECT_EQ(lines.substr(lines.rfind("TEARDOWN")), "TEARDOWN " + url + " RTSP/1.0\n");
-  EXPECT_EQ(camera->sessions(), 0u);
+  EXPECT_EQ(camera()->sessions(), 0u);
 }
 
-TEST(VideoStreaming, WithoutTearDownNothingIsSentAtTheEnd) {
-  LiveCamera camera(camera_options());
-  MediaDriver driver;
-  camera.introduce(driver);
-  driver.m_NoTearDown = true;
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
-  ASSERT_EQ(driver.StopVideoStreaming(), LIBD_OK);
-  for (const auto& request : camera->journal().snapshot()) EXPECT_EQ(request.bytes.find("TEARDOWN"), std::string::npos);
-  EXPECT_EQ(driver.m_RtspSocket, -1);
+TEST_F(VideoStreaming, WithoutTearDownNothingIsSentAtTheEnd) {
+  introduce();
+  driver_.m_NoTearDown = true;
+  ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+  ASSERT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
+  for (const auto& request : camera()->journal().snapshot())
+    EXPECT_EQ(request.bytes.find("TEARDOWN"), std::string::npos);
+  EXPECT_EQ(driver_.m_RtspSocket, -1);
 }
 
-TEST(VideoStreaming, PicturesOverRtpDoNotWaitForEachOther) {
-  auto options = camera_options();
-  options.pictures = 3;
-  LiveCamera camera(options);
-  MediaDriver driver;
-  camera.introduce(driver);
-  driver.m_StreamWaitMs = 600000;
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
-  EXPECT_EQ(FrameTaker().take_all(driver, 3).size(), 3u);
+TEST_F(VideoStreaming, PicturesOverRtpDoNotWaitForEachOther) {
+  options_.pictures = 3;
+  introduce();
+  driver_.m_StreamWaitMs = 600000;
+  ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+  EXPECT_EQ(FrameTaker().take_all(driver_, 3).size(), 3u);
 }
 
-TEST(VideoStreaming, ADestroyedDriverStopsVideoFirstAndTheAlarmStreamLast) {
-  LiveCamera camera(camera_options());
+TEST_F(VideoStreaming, ADestroyedDriverStopsVideoFirstAndTheAlarmStreamLast) {
   int ends[2] = {-1, -1};
   ASSERT_EQ(socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends), 0);
   {
     MediaDriver driver;
-    camera.play(driver);
+    camera().play(driver);
     const vexa::Guard guard(driver.m_IoStreamLock);
     driver.m_IoStreamSocket = ends[0];
   }
   close(ends[1]);
   std::vector<std::string> lines;
-  for (const auto& request : camera->journal().snapshot())
+  for (const auto& request : camera()->journal().snapshot())
     lines.push_back(request.bytes.substr(0, request.bytes.find(' ')));
   ASSERT_GE(lines.size(), 2u);
   EXPECT_EQ(lines[lines.size() - 2], "TEARDOWN");
   EXPECT_EQ(lines.back(), "GET");
-  EXPECT_NE(camera->journal().snapshot().back().bytes.find("AlarmData=off"), std::string::npos);
+  EXPECT_NE(camera()->journal().snapshot().back().bytes.find("AlarmData=off"), std::string::npos);
 }
 
 struct RefusalCase {
@@ -132,7 +124,7 @@ struct RefusalCase {
   const char* text;
 };
 
-TEST(VideoStreaming, AFailedStartGivesItsCodeAndClosesEverything) {
+TEST_F(VideoStreaming, AFailedStartGivesItsCodeAndClosesEverything) {
   const RefusalCase cases[] = {
       {"keep-alive set-up refused", RequestFault::status("RTSPTimeout", "500 No"), 20000, LIBD_FAILED, "No"},
       {"keep-alive inquiry refused", RequestFault::status("inq=edgestorage", "401 Who"), 20000, LIBD_FAILED, "Who"},
@@ -140,14 +132,13 @@ TEST(VideoStreaming, AFailedStartGivesItsCodeAndClosesEverything) {
       {"session unauthorized", RequestFault::status("SETUP", "401 Who"), 20000, LIBD_STREAM_OPEN_FAILED, "Who"},
       {"play refused", RequestFault::status("PLAY", "453 Full"), 20000, LIBD_STREAM_OPEN_FAILED, "Full"},
   };
-  LiveCamera camera(camera_options());
   for (const RefusalCase& c : cases) {
-    camera->clear_request_faults();
-    camera->add_request_fault(c.fault);
+    camera()->clear_request_faults();
+    camera()->add_request_fault(c.fault);
     const auto descriptors = open_descriptors();
     {
       MediaDriver driver;
-      camera.introduce(driver, c.timeout);
+      camera().introduce(driver, c.timeout);
       EXPECT_EQ(driver.StartVideoStreaming(), c.code) << c.what;
       EXPECT_EQ(driver.LatestErrorText(), c.text) << c.what;
       EXPECT_EQ(driver.m_StreamSocket, -1) << c.what;
@@ -159,76 +150,67 @@ TEST(VideoStreaming, AFailedStartGivesItsCodeAndClosesEverything) {
   }
 }
 
-TEST(VideoStreaming, AnUnreachableRtspServiceGivesStreamOpenFailed) {
-  auto options = camera_options();
-  options.rtsp_port = 0;  // any port but the one that drivers ask for
-  LiveCamera camera(options);
-  MediaDriver driver;
-  camera.introduce(driver);
-  EXPECT_EQ(driver.StartVideoStreaming(), LIBD_STREAM_OPEN_FAILED);
-  EXPECT_EQ(driver.m_StreamSocket, -1);
-  EXPECT_EQ(driver.m_RtspSocket, -1);
+TEST_F(VideoStreaming, AnUnreachableRtspServiceGivesStreamOpenFailed) {
+  options_.rtsp_port = 0;  // any port but the one that drivers ask for
+  introduce();
+  EXPECT_EQ(driver_.StartVideoStreaming(), LIBD_STREAM_OPEN_FAILED);
+  EXPECT_EQ(driver_.m_StreamSocket, -1);
+  EXPECT_EQ(driver_.m_RtspSocket, -1);
 }
 
-TEST(VideoStreaming, OnHttpARefusedImageStreamGivesTheExchangesCode) {
-  LiveCamera camera(camera_options());
-  camera->add_request_fault(RequestFault::wrong_credentials("/image"));
-  MediaDriver driver;
-  camera.introduce(driver);
-  driver.m_ConnectionInfo.streamTransport = 0;
-  EXPECT_EQ(driver.StartVideoStreaming(), LIBD_UNAUTHORIZED);
-  EXPECT_EQ(driver.m_StreamSocket, -1);
+TEST_F(VideoStreaming, OnHttpARefusedImageStreamGivesTheExchangesCode) {
+  camera()->add_request_fault(RequestFault::wrong_credentials("/image"));
+  introduce();
+  driver_.m_ConnectionInfo.streamTransport = 0;
+  EXPECT_EQ(driver_.StartVideoStreaming(), LIBD_UNAUTHORIZED);
+  EXPECT_EQ(driver_.m_StreamSocket, -1);
 }
 
-TEST(VideoStreaming, ASecondStopWhileTheFirstStillWaitsGivesFailed) {
-  LiveCamera camera(camera_options());
-  camera->add_request_fault(RequestFault::no_answer("GET_PARAMETER"));  // keeps the thread for a second
-  MediaDriver driver;
-  camera.play(driver);
-  ASSERT_TRUE(camera->journal().wait_for(
+TEST_F(VideoStreaming, ASecondStopWhileTheFirstStillWaitsGivesFailed) {
+  camera()->add_request_fault(RequestFault::no_answer("GET_PARAMETER"));  // keeps the thread for a second
+  play();
+  ASSERT_TRUE(camera()->journal().wait_for(
       [](const auto& requests) { return !requests.empty() && requests.back().bytes.rfind("GET_PARAMETER", 0) == 0; },
       std::chrono::seconds(10)));
-  std::thread first([&] { EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK); });
+  std::thread first([&] { EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_OK); });
   int stop_event = -1;
-  ASSERT_TRUE(eventFd(driver.m_StopVideoEvent, stop_event));
+  ASSERT_TRUE(eventFd(driver_.m_StopVideoEvent, stop_event));
   ASSERT_EQ(vexa::WaitBudget(20000).wait_readable(stop_event), 1);
-  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_FAILED);
-  EXPECT_EQ(driver.StartVideoStreaming(), LIBD_FAILED);
+  EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_FAILED);
+  EXPECT_EQ(driver_.StartVideoStreaming(), LIBD_FAILED);
   first.join();
-  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+  EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
 }
 
-TEST(VideoStreaming, AStartWhileStreamingEndsTheRunningStreamFirst) {
-  LiveCamera camera(camera_options());
-  MediaDriver driver;
-  camera.introduce(driver);
+TEST_F(VideoStreaming, AStartWhileStreamingEndsTheRunningStreamFirst) {
+  introduce();
   FrameTaker host;
   for (int i = 0; i < 3; ++i) {
-    ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
-    const auto frames = host.take_all(driver, 3);
+    ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
+    const auto frames = host.take_all(driver_, 3);
     ASSERT_EQ(frames.size(), 3u);
-    EXPECT_EQ(frames[0].bytes, camera.picture(0));
+    EXPECT_EQ(frames[0].bytes, camera().picture(0));
   }
-  EXPECT_EQ(camera->sessions(), 1u);
-  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+  EXPECT_EQ(camera()->sessions(), 1u);
+  EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
 }
 
-TEST(VideoStreaming, ADriverDestroyedWhileStreamingLeavesNothingBehind) {
-  LiveCamera camera(camera_options());
+TEST_F(VideoStreaming, ADriverDestroyedWhileStreamingLeavesNothingBehind) {
+  start();
   const std::size_t descriptors = open_descriptors();
   const std::size_t threads = running_threads();
   {
     MediaDriver driver;
-    camera.play(driver);
+    camera().play(driver);
     ASSERT_EQ(FrameTaker().take_all(driver, 2).size(), 2u);
   }
   EXPECT_TRUE(eventually([&] { return running_threads() == threads; })) << running_threads() << " of " << threads;
   EXPECT_TRUE(eventually([&] { return open_descriptors() == descriptors; }));
-  EXPECT_EQ(camera->sessions(), 0u);
+  EXPECT_EQ(camera()->sessions(), 0u);
 }
 
-TEST(VideoStreaming, FiveHundredStartsAndStopsLeakNoDescriptorAndNoThread) {
-  LiveCamera camera(camera_options());
+TEST_F(VideoStreaming, FiveHundredStartsAndStopsLeakNoDescriptorAndNoThread) {
+  start();
   const std::size_t descriptors = open_descriptors();
   const std::size_t threads = running_threads();
   std::atomic<int> failures{0};
@@ -236,7 +218,7 @@ TEST(VideoStreaming, FiveHundredStartsAndStopsLeakNoDescriptorAndNoThread) {
   for (int h = 0; h < 10; ++h) {
     hosts.emplace_back([&] {
       MediaDriver driver;
-      camera.introduce(driver);
+      camera().introduce(driver);
       for (int i = 0; i < 50; ++i) {
         if (driver.StartVideoStreaming() != LIBD_OK) ++failures;
         if (i % 5 == 0 && FrameTaker().take_all(driver, 1).size() != 1) ++failures;
@@ -248,34 +230,31 @@ TEST(VideoStreaming, FiveHundredStartsAndStopsLeakNoDescriptorAndNoThread) {
   EXPECT_EQ(failures, 0);
   EXPECT_TRUE(eventually([&] { return running_threads() == threads; })) << running_threads() << " of " << threads;
   EXPECT_TRUE(eventually([&] { return open_descriptors() == descriptors; }));
-  EXPECT_EQ(camera->sessions(), 0u);
+  EXPECT_EQ(camera()->sessions(), 0u);
 }
 
-TEST(VideoStreaming, ACameraThatFallsSilentGivesOneTimeOut) {
+TEST_F(VideoStreaming, ACameraThatFallsSilentGivesOneTimeOut) {
   static std::atomic<std::time_t> now;
   now = 5000;
-  auto options = camera_options();
-  options.pictures = 3;
-  LiveCamera camera(options);
-  MediaDriver driver;
-  camera.introduce(driver, 4000);
-  driver.state().now = [] { return now.load(); };
-  driver.m_KeepAlivePeriod = 60;
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  options_.pictures = 3;
+  introduce(4000);
+  driver_.state().now = [] { return now.load(); };
+  driver_.m_KeepAlivePeriod = 60;
+  ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
   FrameTaker host;
-  ASSERT_EQ(host.take_all(driver, 3).size(), 3u);
+  ASSERT_EQ(host.take_all(driver_, 3).size(), 3u);
   TakenFrame frame;
-  EXPECT_EQ(host.take(driver, frame), LIBD_NO_FRAME);
+  EXPECT_EQ(host.take(driver_, frame), LIBD_NO_FRAME);
   now += 5;  // more than the time-out
   const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(30);
   ELibDReturnCode code = LIBD_NO_FRAME;
   while (code == LIBD_NO_FRAME && std::chrono::steady_clock::now() < end) {
-    code = host.take(driver, frame);
+    code = host.take(driver_, frame);
     std::this_thread::sleep_for(milliseconds(1));
   }
   EXPECT_EQ(code, LIBD_TIMEOUT);
-  EXPECT_EQ(host.take(driver, frame), LIBD_NO_FRAME);
-  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+  EXPECT_EQ(host.take(driver_, frame), LIBD_NO_FRAME);
+  EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
 }
 
 }  // namespace

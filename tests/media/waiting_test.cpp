@@ -23,43 +23,6 @@ namespace {
 
 constexpr int kLong = 30000;  // milliseconds, never used up
 
-/// A driver whose frames come from the test in place of a camera.
-class FedDriver : public MediaDriver {
- public:
-  FedDriver() {
-    state().now = [] { return std::time_t{1000}; };
-    m_LastFrameTime = 1000;
-    use("127.0.0.1", 1, 5000);
-  }
-
-  /// What the streaming thread does with a frame.
-  void feed(ELibDReturnCode result = LIBD_OK, std::int32_t type = VIDEO_FRAME_JPEG) {
-    VideoFrameInfo frame = made_frame(type);
-    ProcessCurrentFrameData(this, frame, wait_key_, result);
-  }
-
-  static VideoFrameInfo made_frame(std::int32_t type) {
-    VideoFrameInfo frame;
-    frame.capacity = frame.length = 8;
-    frame.data = new unsigned char[frame.capacity]();
-    frame.frameType = type;
-    return frame;
-  }
-
-  std::size_t waiting() {
-    const vexa::Guard guard(m_FrameQueueLock);
-    return m_FrameQueue.size();
-  }
-
-  ELibDReturnCode take() {
-    SLibDVideoFrameInfo frame;
-    return GetCurrentVideoFrame(frame);
-  }
-
- private:
-  bool wait_key_ = false;
-};
-
 TEST(VideoFrameDescriptor, IsReadableAsLongAsAFrameWaits) {
   FedDriver driver;
   const int descriptor = vexa::VideoFrameDescriptor(driver);
@@ -118,11 +81,10 @@ TEST(VideoFrameDescriptor, IsReadableExactlyWhenThePollHasMoreThanNoFrame) {
 TEST(VideoFrameDescriptor, IsReadableForFramesThatAModelClassQueues) {
   FedDriver driver;
   const int descriptor = vexa::VideoFrameDescriptor(driver);
-  bool wait_key = false;
   auto frame = FedDriver::made_frame(VIDEO_FRAME_JPEG);
   {
     const vexa::Guard guard(driver.m_FrameQueueLock);
-    FedDriver::PropulateFrameInfoList(&driver, frame, wait_key);
+    FedDriver::PropulateFrameInfoList(&driver, frame, driver.wait_key);
   }
   EXPECT_TRUE(is_readable(descriptor));
 }
@@ -144,11 +106,6 @@ TEST(VideoFrameDescriptor, TakesOneSystemCallForAllFramesUntilTheQueueIsEmpty) {
   ASSERT_EQ(eventfd_read(descriptor, &writes), 0);
   EXPECT_EQ(writes, 1u);
 }
-
-class ThrowingSink : public CDataSink {
- public:
-  void Write(const unsigned char*, unsigned int) override { throw std::runtime_error("disk full"); }
-};
 
 TEST(VideoFrameDescriptor, StaysReadableForAFrameThatASinkHasRefused) {
   FedDriver driver;
@@ -378,68 +335,61 @@ TEST(WaitSet, ServesThreeHundredDriversWithThreeDescriptors) {
   for (auto& driver : drivers) EXPECT_EQ(taken[driver.get()], kFrames);
 }
 
-TEST(WaitingLive, TheDescriptorServesOneStreamAfterTheOther) {
-  LiveCamera camera(camera_options());
-  MediaDriver driver;
-  camera.introduce(driver);
-  const int descriptor = vexa::VideoFrameDescriptor(driver);
+using WaitingLive = LiveVideo<MediaDriver>;
+
+TEST_F(WaitingLive, TheDescriptorServesOneStreamAfterTheOther) {
+  introduce();
+  const int descriptor = vexa::VideoFrameDescriptor(driver_);
   FrameTaker host;
   for (int i = 0; i < 3; ++i) {
-    ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+    ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
     for (std::uint64_t picture = 0; picture < 3;) {
       pollfd entry = {descriptor, POLLIN, 0};
       ASSERT_EQ(poll(&entry, 1, kLong), 1);
       TakenFrame frame;
-      if (host.take(driver, frame) == LIBD_OK) {
-        EXPECT_TRUE(camera.sent(picture++, frame.bytes));
+      if (host.take(driver_, frame) == LIBD_OK) {
+        EXPECT_TRUE(camera().sent(picture++, frame.bytes));
       }
     }
-    ASSERT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+    ASSERT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
     EXPECT_FALSE(is_readable(descriptor));
-    EXPECT_EQ(vexa::VideoFrameDescriptor(driver), descriptor);
+    EXPECT_EQ(vexa::VideoFrameDescriptor(driver_), descriptor);
   }
 }
 
-TEST(WaitingLive, AHostThatOnlyWaitsLearnsOfACameraThatFallsSilent) {
+TEST_F(WaitingLive, AHostThatOnlyWaitsLearnsOfACameraThatFallsSilent) {
   static std::atomic<std::time_t> now;
   now = 5000;
-  auto options = camera_options();
-  options.pictures = 3;
-  LiveCamera camera(options);
-  MediaDriver driver;
-  camera.introduce(driver);
-  driver.state().now = [] { return now.load(); };
-  driver.m_KeepAlivePeriod = 60;
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  options_.pictures = 3;
+  introduce();
+  driver_.state().now = [] { return now.load(); };
+  driver_.m_KeepAlivePeriod = 60;
+  ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);
   FrameTaker host;
   TakenFrame frame;
   for (int frames = 0; frames < 3;) {
-    ASSERT_TRUE(vexa::WaitForVideoFrame(driver, kLong));
-    if (host.take(driver, frame) == LIBD_OK) ++frames;
+    ASSERT_TRUE(vexa::WaitForVideoFrame(driver_, kLong));
+    if (host.take(driver_, frame) == LIBD_OK) ++frames;
   }
   {
-    const vexa::Guard guard(driver.m_ConnectionLock);
-    driver.m_ConnectionInfo.timeout = 50;
+    const vexa::Guard guard(driver_.m_ConnectionLock);
+    driver_.m_ConnectionInfo.timeout = 50;
   }
   now += 1;  // more than the time-out's whole seconds
-  ASSERT_TRUE(vexa::WaitForVideoFrame(driver, kLong));
-  EXPECT_EQ(host.take(driver, frame), LIBD_TIMEOUT);
-  EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);
+  ASSERT_TRUE(vexa::WaitForVideoFrame(driver_, kLong));
+  EXPECT_EQ(host.take(driver_, frame), LIBD_TIMEOUT);
+  EXPECT_EQ(driver_.StopVideoStreaming(), LIBD_OK);
 }
 
-TEST(WaitingLive, PromptFramesArriveWholeAndTheSettingHoldsForARunningStream) {
-  auto options = camera_options();
-  LiveCamera camera(options);
-  MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+TEST_F(WaitingLive, PromptFramesArriveWholeAndTheSettingHoldsForARunningStream) {
+  play();
   FrameTaker host;
   for (std::uint64_t picture = 0; picture < 20;) {
-    vexa::SetPromptFrames(driver, picture % 8 < 4);
-    ASSERT_TRUE(vexa::WaitForVideoFrame(driver, kLong));
+    vexa::SetPromptFrames(driver_, picture % 8 < 4);
+    ASSERT_TRUE(vexa::WaitForVideoFrame(driver_, kLong));
     TakenFrame frame;
-    if (host.take(driver, frame) == LIBD_OK) {
-      EXPECT_TRUE(camera.sent(picture++, frame.bytes));
+    if (host.take(driver_, frame) == LIBD_OK) {
+      EXPECT_TRUE(camera().sent(picture++, frame.bytes));
     }
   }
 }

@@ -12,12 +12,7 @@
 namespace vexa_test {
 namespace {
 
-std::unique_ptr<CLibraryDevice> device_of(const std::string& name) {
-  vexa::Profile profile;
-  vexa::ProfileError error;
-  EXPECT_TRUE(vexa::LoadProfile(name, profile, error)) << error.Message();
-  return vexa::MakeDevice(profile);
-}
+std::unique_ptr<CLibraryDevice> device_of(const std::string& name) { return vexa::MakeDevice(installed_profile(name)); }
 
 template <typename Driver>
 bool is_a(const std::string& name) {

@@ -42,6 +42,7 @@ TEST(ProfileRefusal, NamesWhatTheSchemaForbids) {
       {"\"model\": \"T-1\"", "\"model\": 1", "p.json:4: model: must be a text"},
       {"\"model\": \"T-1\"", "\"model\": null", "p.json:4: model: must be a text"},
       {"\"T-1\"", "\"\"", "p.json:4: model: must have 1 to 64 characters"},
+      {"\"model\": \"T-1\",", "", "p.json:1: model: is missing"},
       {"\"common\"", "\"Common\"",
        "p.json:3: driver: must be one of \"common\", \"heron\", \"marlin\", \"simple-hd\", \"simple-ptz\""},
       {"[\"fixed\"]", "[]", "p.json:5: cameraTypes: must have at least 1 items"},
@@ -53,7 +54,21 @@ TEST(ProfileRefusal, NamesWhatTheSchemaForbids) {
       {"\"frameRate\": 25,", "\"frameRate\": 61,", "p.json:7: video.streams[0].frameRate: must be from 1 to 60"},
       {"\"frameRate\": 25,", "", "p.json:7: video.streams[0].frameRate: is missing"},
       {"[1, 25], \"bitRates\"", "[], \"bitRates\"", "p.json:10: video.codecs[1].frameRates: must have 1 to 32 items"},
+      {"[1, 25], \"bitRates\"", "25, \"bitRates\"", "p.json:10: video.codecs[1].frameRates: must be a list"},
+      {"[1, 25], \"bitRates\"", "[25,\n 1], \"bitRates\"",
+       "p.json:11: video.codecs[1].frameRates[1]: must be above the one before it"},
+      {"\"640x480\", \"320x240\"", "\"640x480\", \"640x480\"",
+       "p.json:10: video.codecs[1].sizes[1]: occurs twice in its list"},
       {"\"inputs\": 1", "\"inputs\": 17", "p.json:18: io.inputs: must be from 0 to 16"},
+      {"\"inputs\": 1", "\"inputs\": 18446744073709551615", "p.json:18: too large"},
+      {"\"inputs\": 1", "\"inputs\": true", "p.json:18: io.inputs: must be a whole number"},
+      {"\"inputs\": 1", "\"inputs\": 1.0", "p.json:18: io.inputs: must be a whole number"},
+      {"\"inputs\": 1, \"outputs\": 0", "\"inputs\": 1,\n \"outputs\": 0,\n \"audioDetection\":\n 1",
+       "p.json:20: io.audioDetection: must be true or false"},
+      {"\"outputs\": 0", "\"inputs\": 1", "p.json:18: inputs: occurs twice"},
+      {"\"io\"", "\"oi\"",
+       "p.json:18: oi: is not known here; known are: $schema, description, driver, model, cameraTypes, video, image, "
+       "ptz, audio, io, edgeStorage"},
       {"\"inputs\": 1,", "\"inputs\": 1, \"imputs\": 1,",
        "p.json:18: io.imputs: is not known here; known are: inputs, outputs, videoDetection, tamperingDetection, "
        "audioDetection"},
@@ -68,6 +83,8 @@ TEST(ProfileRefusal, NamesWhatTheSchemaCannotSay) {
   expect_refusals({
       {"\"640x480\", \"320x240\"", "\"640*480\"",
        "p.json:10: video.codecs[1].sizes[0]: must be WIDTHxHEIGHT in pixels, for instance \"640x480\""},
+      {"\"size\": \"640x480\"", "\"size\": \"640*480\"",
+       "p.json:7: video.streams[0].size: must be WIDTHxHEIGHT in pixels, for instance \"640x480\""},
       {"\"name\": \"H.264\"", "\"name\": \"JPEG\"", "p.json:10: video.codecs[1].qualities: is missing: JPEG needs it"},
       {"\"qualities\": [1, 5]", "\"bitRates\": [1, 5]",
        "p.json:9: video.codecs[0].qualities: is missing: JPEG needs it"},
@@ -201,6 +218,8 @@ TEST(ProfileRefusal, ChecksTheMotorsAndTheZoomCurve) {
 TEST(ProfileRefusal, NamesTheLineOfAMistakeInJson) {
   EXPECT_EQ(refusal_of(changed_profile("\"model\": \"T-1\",", "\"model\": \"T-1\"")),
             "p.json:5: not JSON: something is missing, too many or misspelt here");
+  EXPECT_EQ(refusal_of(changed_profile("\"io\": {", "\"io\": [")),
+            "p.json:18: not JSON: something is missing, too many or misspelt here");
   EXPECT_EQ(refusal_of(changed_profile("\"model\"", "\"driver\"")), "p.json:4: driver: occurs twice");
   EXPECT_EQ(refusal_of("[]"), "p.json:1: must be an object");
   EXPECT_EQ(refusal_of(std::string(16, '[') + std::string(16, ']')), "p.json:1: must be an object");

@@ -6,6 +6,8 @@
 
 #include <string>
 
+#include "vexa/models.h"
+
 namespace vexa_test {
 
 inline const std::string kSmallProfile = R"({
@@ -28,6 +30,14 @@ inline const std::string kSmallProfile = R"({
   "io": {"inputs": 1, "outputs": 0}
 }
 )";
+
+/// A profile that is installed.
+inline vexa::Profile installed_profile(const std::string& name) {
+  vexa::Profile profile;
+  vexa::ProfileError error;
+  EXPECT_TRUE(vexa::LoadProfile(name, profile, error)) << error.Message();
+  return profile;
+}
 
 /// The small profile with `from`, which occurs in it, replaced by `to`, once.
 inline std::string changed_profile(const std::string& from, const std::string& to) {

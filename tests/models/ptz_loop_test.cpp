@@ -10,6 +10,7 @@
 #include <string>
 #include <vector>
 
+#include "tests/models/profile_text.h"
 #include "tests/support/model_camera.h"
 
 namespace vexa_test {
@@ -98,10 +99,7 @@ class ModelAtWork : private ModelCamera {
 std::vector<std::string> moving_models() {
   std::vector<std::string> names;
   for (const std::string& name : vexa::ProfileNames()) {
-    vexa::Profile profile;
-    vexa::ProfileError error;
-    EXPECT_TRUE(vexa::LoadProfile(name, profile, error)) << error.Message();
-    if ((profile.cameraTypes & vexa::kPtzCamera) != 0) names.push_back(name);
+    if ((installed_profile(name).cameraTypes & vexa::kPtzCamera) != 0) names.push_back(name);
   }
   return names;
 }

@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "tests/models/profile_text.h"
 #include "vexa/models.h"
 #include "vexa/resolution_filter.h"
 
@@ -14,10 +15,7 @@ namespace {
 
 std::vector<vexa::Profile> shipped_profiles() {
   std::vector<vexa::Profile> profiles;
-  for (const std::string& name : vexa::ProfileNames()) {
-    vexa::ProfileError error;
-    EXPECT_TRUE(vexa::LoadProfile(name, profiles.emplace_back(), error)) << error.Message();
-  }
+  for (const std::string& name : vexa::ProfileNames()) profiles.push_back(installed_profile(name));
   return profiles;
 }
 
@@ -79,9 +77,7 @@ TEST(ShippedProfiles, OfferWhatTheFilterOffersWithoutACriterion) {
 }
 
 TEST(ShippedProfiles, FillEveryRecord) {
-  vexa::Profile profile;
-  vexa::ProfileError error;
-  ASSERT_TRUE(vexa::LoadProfile("LMX-P200", profile, error)) << error.Message();
+  const vexa::Profile profile = installed_profile("LMX-P200");
   EXPECT_EQ(profile.description,
             "HD dome with pan, tilt and zoom by motor, moved by signed speeds, with audio and a card");
   EXPECT_EQ(profile.driver, vexa::DriverClass::kCommon);
@@ -114,9 +110,7 @@ TEST(ShippedProfiles, FillEveryRecord) {
 }
 
 TEST(ShippedProfiles, FillTheControlRecord) {
-  vexa::Profile profile;
-  vexa::ProfileError error;
-  ASSERT_TRUE(vexa::LoadProfile("LMX-P200", profile, error)) << error.Message();
+  const vexa::Profile profile = installed_profile("LMX-P200");
   const SLibDFixedPTZControlInfo& control = profile.control;
   EXPECT_TRUE(profile.hasControl);
   EXPECT_FALSE(control.noMoveSpeed);
@@ -159,9 +153,7 @@ TEST(ShippedProfiles, FillTheControlRecord) {
 }
 
 TEST(ShippedProfiles, FillAudioAndIo) {
-  vexa::Profile profile;
-  vexa::ProfileError error;
-  ASSERT_TRUE(vexa::LoadProfile("LMX-P200", profile, error)) << error.Message();
+  const vexa::Profile profile = installed_profile("LMX-P200");
   EXPECT_EQ(profile.audio.available, 1);
   ASSERT_EQ(profile.audio.inputCodecs.size(), 2U);
   EXPECT_EQ(profile.audio.inputCodecs[0].name, "G711");

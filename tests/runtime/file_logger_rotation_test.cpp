@@ -8,9 +8,9 @@
 #include <vector>
 
 #include "runtime/handle.h"
+#include "tests/support/folder_fixture.h"
 #include "tests/support/in_child.h"
 #include "tests/support/log_text.h"
-#include "tests/support/temporary_folder.h"
 #include "vexa/file_logger.h"
 
 namespace vexa_test {
@@ -37,7 +37,9 @@ class RotatingLogger : public CFileLogger {
 /// A file that was rotated away after one text.
 std::string ended(const std::string& text) { return opening_banner() + text + closing_banner(); }
 
-TEST(FileLoggerRotation, ComesAtExactlyTheLimit) {
+using FileLoggerRotation = InTemporaryFolder;
+
+TEST_F(FileLoggerRotation, ComesAtExactlyTheLimit) {
   const struct {
     int kilobytes;
     std::size_t size;
@@ -54,45 +56,41 @@ TEST(FileLoggerRotation, ComesAtExactlyTheLimit) {
   }
 }
 
-TEST(FileLoggerRotation, CountsWhatTheFileHeldBefore) {
-  const TemporaryFolder folder;
+TEST_F(FileLoggerRotation, CountsWhatTheFileHeldBefore) {
   const std::string old(1023 - opening_banner().size(), 'o');
-  folder.make_file("Log.txt", old);
-  RotatingLogger logger(folder / "Log.txt", 1, 1);
-  EXPECT_FALSE(is_there(folder / "Log1.txt"));
+  folder_.make_file("Log.txt", old);
+  RotatingLogger logger(folder_ / "Log.txt", 1, 1);
+  EXPECT_FALSE(is_there(folder_ / "Log1.txt"));
   logger.Log("1");
-  EXPECT_EQ(log_text(folder / "Log1.txt"), old + ended("1"));
+  EXPECT_EQ(log_text(folder_ / "Log1.txt"), old + ended("1"));
 }
 
-TEST(FileLoggerRotation, MovesEachCopyUpAndDropsTheLast) {
-  const TemporaryFolder folder;
-  RotatingLogger logger(folder / "Log.txt", 0, 3);
+TEST_F(FileLoggerRotation, MovesEachCopyUpAndDropsTheLast) {
+  RotatingLogger logger(folder_ / "Log.txt", 0, 3);
   for (const char* text : {"1", "2", "3", "4", "5"}) logger.Log(text);
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner());
-  EXPECT_EQ(log_text(folder / "Log1.txt"), ended("5"));
-  EXPECT_EQ(log_text(folder / "Log2.txt"), ended("4"));
-  EXPECT_EQ(log_text(folder / "Log3.txt"), ended("3"));
-  EXPECT_FALSE(is_there(folder / "Log4.txt"));
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner());
+  EXPECT_EQ(log_text(folder_ / "Log1.txt"), ended("5"));
+  EXPECT_EQ(log_text(folder_ / "Log2.txt"), ended("4"));
+  EXPECT_EQ(log_text(folder_ / "Log3.txt"), ended("3"));
+  EXPECT_FALSE(is_there(folder_ / "Log4.txt"));
 }
 
-TEST(FileLoggerRotation, ALimitOfZeroRotatesAfterEveryWrite) {
-  const TemporaryFolder folder;
-  RotatingLogger logger(folder / "Log.txt", 0, 1);
+TEST_F(FileLoggerRotation, ALimitOfZeroRotatesAfterEveryWrite) {
+  RotatingLogger logger(folder_ / "Log.txt", 0, 1);
   logger.Log("1");
-  EXPECT_EQ(log_text(folder / "Log1.txt"), ended("1"));
+  EXPECT_EQ(log_text(folder_ / "Log1.txt"), ended("1"));
   logger.Log("");
-  EXPECT_EQ(log_text(folder / "Log1.txt"), ended(""));
+  EXPECT_EQ(log_text(folder_ / "Log1.txt"), ended(""));
 }
 
-TEST(FileLoggerRotation, ALimitAndACopyCountOfZeroMeanNoLimit) {
-  const TemporaryFolder folder;
-  RotatingLogger logger(folder / "Log.txt", 0, 0);
+TEST_F(FileLoggerRotation, ALimitAndACopyCountOfZeroMeanNoLimit) {
+  RotatingLogger logger(folder_ / "Log.txt", 0, 0);
   logger.Log("1");
   logger.Log("2");
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "12");
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + "12");
 }
 
-TEST(FileLoggerRotation, WithoutCopiesTheSameFileGrowsAndEveryLineRotatesAgain) {
+TEST_F(FileLoggerRotation, WithoutCopiesTheSameFileGrowsAndEveryLineRotatesAgain) {
   for (const int copies : {0, -1}) {
     const TemporaryFolder folder;
     RotatingLogger logger(folder / "Log.txt", 1, copies);
@@ -106,7 +104,7 @@ TEST(FileLoggerRotation, WithoutCopiesTheSameFileGrowsAndEveryLineRotatesAgain) 
   }
 }
 
-TEST(FileLoggerRotation, TheNumberComesBeforeTheExtension) {
+TEST_F(FileLoggerRotation, TheNumberComesBeforeTheExtension) {
   const struct {
     const char* name;
     const char* copy;
@@ -122,10 +120,9 @@ TEST(FileLoggerRotation, TheNumberComesBeforeTheExtension) {
   }
 }
 
-TEST(FileLoggerRotation, NamesTheFilesOfTheWorkingFolder) {
-  const TemporaryFolder folder;
+TEST_F(FileLoggerRotation, NamesTheFilesOfTheWorkingFolder) {
   EXPECT_EQ(in_child([&] {
-              if (chdir(folder.path().c_str()) != 0) return std::string("no folder");
+              if (chdir(folder_.path().c_str()) != 0) return std::string("no folder");
               RotatingLogger logger("Log.txt", 0, 2);
               logger.Log("1");
               logger.Log("2");
@@ -134,70 +131,64 @@ TEST(FileLoggerRotation, NamesTheFilesOfTheWorkingFolder) {
             ended("1") + ended("2") + opening_banner());
 }
 
-TEST(FileLoggerRotation, IsThatOfTheFileNotOfTheNameSetSince) {
-  const TemporaryFolder folder;
-  RotatingLogger logger(folder / "Log.txt", 0, 1);
-  logger.SetFileName((folder / "Other.txt").c_str());
+TEST_F(FileLoggerRotation, IsThatOfTheFileNotOfTheNameSetSince) {
+  RotatingLogger logger(folder_ / "Log.txt", 0, 1);
+  logger.SetFileName((folder_ / "Other.txt").c_str());
   logger.Log("1");
-  EXPECT_EQ(log_text(folder / "Log1.txt"), ended("1"));
-  EXPECT_FALSE(is_there(folder / "Other.txt"));
-  EXPECT_FALSE(is_there(folder / "Other1.txt"));
+  EXPECT_EQ(log_text(folder_ / "Log1.txt"), ended("1"));
+  EXPECT_FALSE(is_there(folder_ / "Other.txt"));
+  EXPECT_FALSE(is_there(folder_ / "Other1.txt"));
 }
 
-TEST(FileLoggerRotation, SharersGoOnInTheNewFile) {
-  const TemporaryFolder folder;
-  RotatingLogger small(folder / "Log.txt", 0, 1);
-  RotatingLogger large(folder / "Log.txt", 1024, 1);
+TEST_F(FileLoggerRotation, SharersGoOnInTheNewFile) {
+  RotatingLogger small(folder_ / "Log.txt", 0, 1);
+  RotatingLogger large(folder_ / "Log.txt", 1024, 1);
   large.Log("a");
   small.Log("b");
   large.Log("c");
   EXPECT_EQ(small.m_FileId, large.m_FileId);
   EXPECT_EQ(small.entry().referenceCount, 2);
-  EXPECT_EQ(log_text(folder / "Log1.txt"), ended("ab"));
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "c");
+  EXPECT_EQ(log_text(folder_ / "Log1.txt"), ended("ab"));
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + "c");
 }
 
-TEST(FileLoggerRotation, ACopyThatCannotBeMovedEndsItAndNothingIsLost) {
-  const TemporaryFolder folder;
-  folder.make_folder("Log2.txt/in the way");
-  folder.make_file("Log1.txt", "older");
-  RotatingLogger logger(folder / "Log.txt", 0, 2);
-  const std::string one = folder / "Log1.txt";
-  const std::string two = folder / "Log2.txt";
+TEST_F(FileLoggerRotation, ACopyThatCannotBeMovedEndsItAndNothingIsLost) {
+  folder_.make_folder("Log2.txt/in the way");
+  folder_.make_file("Log1.txt", "older");
+  RotatingLogger logger(folder_ / "Log.txt", 0, 2);
+  const std::string one = folder_ / "Log1.txt";
+  const std::string two = folder_ / "Log2.txt";
   EXPECT_EQ(stderr_of([&] { logger.Log("1"); }), "DeleteFile unlink " + two + ": Is a directory\nMoveFile rename " +
                                                      one + " to " + two + ": Is a directory\n");
   EXPECT_EQ(contents_of(one), "older");
-  EXPECT_EQ(log_text(folder / "Log.txt"), ended("1") + opening_banner());
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), ended("1") + opening_banner());
 }
 
-TEST(FileLoggerRotation, ANameWithoutRoomForTheNumberIsNotDeleted) {
-  const TemporaryFolder folder;
+TEST_F(FileLoggerRotation, ANameWithoutRoomForTheNumberIsNotDeleted) {
   const std::string name(255, 'n');
-  RotatingLogger logger(folder / name, 0, 2);
+  RotatingLogger logger(folder_ / name, 0, 2);
   logger.Log("1");
   logger.Log("2");
-  EXPECT_EQ(log_text(folder / name), ended("1") + ended("2") + opening_banner());
+  EXPECT_EQ(log_text(folder_ / name), ended("1") + ended("2") + opening_banner());
 }
 
-TEST(FileLoggerRotation, ACopysNameIsCutAt255Characters) {
-  const TemporaryFolder folder;
+TEST_F(FileLoggerRotation, ACopysNameIsCutAt255Characters) {
   const std::string name(254, 'n');
-  RotatingLogger logger(folder / name, 0, 1);
+  RotatingLogger logger(folder_ / name, 0, 1);
   logger.Log("1");
-  EXPECT_EQ(log_text(folder / (name + "1")), ended("1"));
+  EXPECT_EQ(log_text(folder_ / (name + "1")), ended("1"));
 }
 
-TEST(FileLoggerRotation, AfterAFailedReopeningNothingIsWrittenUntilAllHaveLeft) {
-  const TemporaryFolder folder;
-  const std::string path = folder.make_folder("sub") + "/Log.txt";
+TEST_F(FileLoggerRotation, AfterAFailedReopeningNothingIsWrittenUntilAllHaveLeft) {
+  const std::string path = folder_.make_folder("sub") + "/Log.txt";
   RotatingLogger first(path, 0, 1);
   RotatingLogger second(path, 0, 1);
   ASSERT_EQ(unlink(path.c_str()), 0);
-  ASSERT_EQ(rmdir((folder / "sub").c_str()), 0);
+  ASSERT_EQ(rmdir((folder_ / "sub").c_str()), 0);
   EXPECT_EQ(stderr_of([&] { first.Log("1"); }), "CreateFile fopen " + path + ": No such file or directory\n");
   EXPECT_EQ(first.entry().fileHandle, nullptr);
   EXPECT_EQ(first.entry().referenceCount, 2);
-  folder.make_folder("sub");
+  folder_.make_folder("sub");
   EXPECT_EQ(stderr_of([&] {
               first.Log("2");
               second.Log("3");
@@ -212,25 +203,23 @@ TEST(FileLoggerRotation, AfterAFailedReopeningNothingIsWrittenUntilAllHaveLeft) 
   EXPECT_EQ(log_text(path), opening_banner());
 }
 
-TEST(FileLoggerRotation, AFailedSizeQuerySkipsIt) {
-  const TemporaryFolder folder;
-  RotatingLogger logger(folder / "Log.txt", 0, 1);
+TEST_F(FileLoggerRotation, AFailedSizeQuerySkipsIt) {
+  RotatingLogger logger(folder_ / "Log.txt", 0, 1);
   auto* file = vexa::record_of<vexa::FileHandle>(logger.entry().fileHandle);
   const int descriptor = std::exchange(file->fd, -1);
   EXPECT_EQ(stderr_of([&] { logger.CycleFiles(); }), "GetFileSize fstat: Bad file descriptor\n");
   file->fd = descriptor;
-  EXPECT_FALSE(is_there(folder / "Log1.txt"));
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner());
+  EXPECT_FALSE(is_there(folder_ / "Log1.txt"));
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner());
 }
 
-TEST(FileLoggerRotation, OpeningAFileThatIsOpenKeepsIt) {
-  const TemporaryFolder folder;
-  RotatingLogger logger(folder / "Log.txt", 1, 1);
+TEST_F(FileLoggerRotation, OpeningAFileThatIsOpenKeepsIt) {
+  RotatingLogger logger(folder_ / "Log.txt", 1, 1);
   logger.CycleOpenFile();
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner());
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner());
   logger.CycleCloseFile();
   logger.CycleCloseFile();
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + closing_banner());
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + closing_banner());
 }
 
 }  // namespace

@@ -15,10 +15,10 @@
 #include <type_traits>
 
 #include "runtime/base/sync.h"
+#include "tests/support/folder_fixture.h"
 #include "tests/support/in_child.h"
 #include "tests/support/log_text.h"
 #include "tests/support/process_state.h"
-#include "tests/support/temporary_folder.h"
 #include "vexa/real_time.h"
 
 namespace vexa_test {
@@ -55,7 +55,9 @@ class OpenLogger : public CFileLogger {
 // Its destructor runs after those of nearly all other statics.
 OpenLogger early_logger __attribute__((init_priority(102)));
 
-TEST(FileLogger, BeginsClosedWithItsDefaults) {
+using FileLogger = InTemporaryFolder;
+
+TEST_F(FileLogger, BeginsClosedWithItsDefaults) {
   const OpenLogger logger;
   EXPECT_EQ(logger.m_FileName, "Log.txt");
   EXPECT_EQ(logger.m_MaxSize, 1024);
@@ -63,7 +65,7 @@ TEST(FileLogger, BeginsClosedWithItsDefaults) {
   EXPECT_EQ(logger.m_FileId, 0);
 }
 
-TEST(FileLogger, HasItsStaticsUnderTheirNamesAndTypes) {
+TEST_F(FileLogger, HasItsStaticsUnderTheirNamesAndTypes) {
   static_assert(std::is_same<decltype(OpenLogger::m_FileHandleSeed), std::int64_t>::value, "seed");
   static_assert(std::is_same<std::remove_reference_t<decltype(OpenLogger::m_FileInfoList)>,
                              std::map<long long, CFileLogger::FileInfo>>::value,
@@ -72,7 +74,7 @@ TEST(FileLogger, HasItsStaticsUnderTheirNamesAndTypes) {
                 "lock");
 }
 
-TEST(FileLogger, HasItsMembersFirstAndInOrder) {
+TEST_F(FileLogger, HasItsMembersFirstAndInOrder) {
   const OpenLogger logger;
   const auto* begin = reinterpret_cast<const char*>(static_cast<const CFileLogger*>(&logger));
   const auto place = [begin](const void* member) {
@@ -87,7 +89,7 @@ TEST(FileLogger, HasItsMembersFirstAndInOrder) {
   EXPECT_LT(offsetof(CFileLogger::FileInfo, fileHandle), offsetof(CFileLogger::FileInfo, referenceCount));
 }
 
-TEST(FileLogger, SetFileNameIsTheSlotAfterTheDestructors) {
+TEST_F(FileLogger, SetFileNameIsTheSlotAfterTheDestructors) {
   struct Renamed : CFileLogger {
     void SetFileName(const char* name) override { given = name; }
     std::string given;
@@ -99,7 +101,7 @@ TEST(FileLogger, SetFileNameIsTheSlotAfterTheDestructors) {
   EXPECT_EQ(logger.given, "the third slot");
 }
 
-TEST(FileLogger, AnEmptyOrNullNameKeepsThePreviousOne) {
+TEST_F(FileLogger, AnEmptyOrNullNameKeepsThePreviousOne) {
   OpenLogger logger;
   logger.SetFileName("");
   logger.SetFileName(nullptr);
@@ -109,23 +111,21 @@ TEST(FileLogger, AnEmptyOrNullNameKeepsThePreviousOne) {
   EXPECT_EQ(logger.m_FileName, "Other.txt");
 }
 
-TEST(FileLogger, WritesItsBannersAroundTheTextAsItIs) {
-  const TemporaryFolder folder;
-  OpenLogger logger(folder / "Log.txt");
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner());
+TEST_F(FileLogger, WritesItsBannersAroundTheTextAsItIs) {
+  OpenLogger logger(folder_ / "Log.txt");
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner());
   logger.Log("first");
   logger.Log("\r\n%n%s%d\t");
   logger.Log("");
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "first\r\n%n%s%d\t");
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + "first\r\n%n%s%d\t");
   logger.CloseFile();
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "first\r\n%n%s%d\t" + closing_banner());
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + "first\r\n%n%s%d\t" + closing_banner());
 }
 
-TEST(FileLogger, BannersTellTheLocalTime) {
-  const TemporaryFolder folder;
+TEST_F(FileLogger, BannersTellTheLocalTime) {
   const CRealTime before = CRealTime::GetTheCurrentTime();
-  { const OpenLogger logger(folder / "Log.txt"); }
-  const std::string text = contents_of(folder / "Log.txt");
+  { const OpenLogger logger(folder_ / "Log.txt"); }
+  const std::string text = contents_of(folder_ / "Log.txt");
   for (const std::size_t at : {std::size_t{105}, text.find("\tLogFile Closed") - 23}) {
     CRealTime told;
     EXPECT_EQ(told.Scan(text.substr(at, 23).c_str(), "%D-%O-%Y %H:%M:%S.%L", false), 7);
@@ -134,17 +134,15 @@ TEST(FileLogger, BannersTellTheLocalTime) {
   }
 }
 
-TEST(FileLogger, ContinuesAFileThatIsThere) {
-  const TemporaryFolder folder;
-  folder.make_file("Log.txt", "old");
-  const OpenLogger logger(folder / "Log.txt");
-  EXPECT_EQ(log_text(folder / "Log.txt"), "old" + opening_banner());
+TEST_F(FileLogger, ContinuesAFileThatIsThere) {
+  folder_.make_file("Log.txt", "old");
+  const OpenLogger logger(folder_ / "Log.txt");
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), "old" + opening_banner());
 }
 
-TEST(FileLogger, LoggersOfOneNameShareOneFile) {
-  const TemporaryFolder folder;
-  OpenLogger first(folder / "Log.txt");
-  OpenLogger second(folder / "Log.txt");
+TEST_F(FileLogger, LoggersOfOneNameShareOneFile) {
+  OpenLogger first(folder_ / "Log.txt");
+  OpenLogger second(folder_ / "Log.txt");
   EXPECT_EQ(first.m_FileId, second.m_FileId);
   EXPECT_EQ(first.references(), 2);
   first.Log("1");
@@ -153,74 +151,68 @@ TEST(FileLogger, LoggersOfOneNameShareOneFile) {
   EXPECT_EQ(first.m_FileId, 0);
   first.Log("lost");
   second.Log("3");
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "123");
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + "123");
   second.CloseFile();
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "123" + closing_banner());
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + "123" + closing_banner());
   second.CloseFile();
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + "123" + closing_banner());
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + "123" + closing_banner());
 }
 
-TEST(FileLogger, NamesAreSharedByTheirBytesAlone) {
-  const TemporaryFolder folder;
-  const OpenLogger first(folder / "Log.txt");
-  const OpenLogger second(folder / "./Log.txt");
-  const OpenLogger third(folder / "log.txt");
+TEST_F(FileLogger, NamesAreSharedByTheirBytesAlone) {
+  const OpenLogger first(folder_ / "Log.txt");
+  const OpenLogger second(folder_ / "./Log.txt");
+  const OpenLogger third(folder_ / "log.txt");
   EXPECT_NE(first.m_FileId, second.m_FileId);
   EXPECT_NE(first.m_FileId, third.m_FileId);
   EXPECT_EQ(first.references(), 1);
 }
 
-TEST(FileLogger, IdsCountUpAndAreNotUsedAgain) {
-  const TemporaryFolder folder;
+TEST_F(FileLogger, IdsCountUpAndAreNotUsedAgain) {
   const std::int64_t seed = OpenLogger::m_FileHandleSeed;
-  OpenLogger first(folder / "1");
+  OpenLogger first(folder_ / "1");
   EXPECT_EQ(first.m_FileId, seed + 1);
-  EXPECT_EQ(OpenLogger(folder / "1").m_FileId, seed + 1);
-  EXPECT_EQ(OpenLogger(folder / "2").m_FileId, seed + 2);
-  EXPECT_EQ(OpenLogger(folder / "gone/3").m_FileId, 0);
+  EXPECT_EQ(OpenLogger(folder_ / "1").m_FileId, seed + 1);
+  EXPECT_EQ(OpenLogger(folder_ / "2").m_FileId, seed + 2);
+  EXPECT_EQ(OpenLogger(folder_ / "gone/3").m_FileId, 0);
   first.OpenFile();
   EXPECT_EQ(first.m_FileId, seed + 3);
   EXPECT_EQ(OpenLogger::m_FileHandleSeed, seed + 3);
 }
 
-TEST(FileLogger, OpeningLeavesTheFormerFile) {
-  const TemporaryFolder folder;
-  OpenLogger logger(folder / "1");
-  logger.SetFileName((folder / "2").c_str());
+TEST_F(FileLogger, OpeningLeavesTheFormerFile) {
+  OpenLogger logger(folder_ / "1");
+  logger.SetFileName((folder_ / "2").c_str());
   logger.Log("still the first");
   logger.OpenFile();
   logger.Log("the second");
-  EXPECT_EQ(log_text(folder / "1"), opening_banner() + "still the first" + closing_banner());
-  EXPECT_EQ(log_text(folder / "2"), opening_banner() + "the second");
+  EXPECT_EQ(log_text(folder_ / "1"), opening_banner() + "still the first" + closing_banner());
+  EXPECT_EQ(log_text(folder_ / "2"), opening_banner() + "the second");
   EXPECT_EQ(OpenLogger::m_FileInfoList.size(), 1U);
 }
 
-TEST(FileLogger, DestructionClosesItsShare) {
-  const TemporaryFolder folder;
+TEST_F(FileLogger, DestructionClosesItsShare) {
   const std::size_t before = open_descriptors();
-  { const OpenLogger logger(folder / "Log.txt"); }
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + closing_banner());
+  { const OpenLogger logger(folder_ / "Log.txt"); }
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + closing_banner());
   EXPECT_TRUE(OpenLogger::m_FileInfoList.empty());
   EXPECT_EQ(open_descriptors(), before);
 }
 
-TEST(FileLogger, ALoggerInAStaticMayOutliveAllElse) {
-  const TemporaryFolder folder;
+TEST_F(FileLogger, ALoggerInAStaticMayOutliveAllElse) {
   const pid_t child = fork();
   if (child == 0) {
-    early_logger.SetFileName((folder / "Log.txt").c_str());
+    early_logger.SetFileName((folder_ / "Log.txt").c_str());
     early_logger.OpenFile();
     std::exit(0);  // NOLINT(concurrency-mt-unsafe): the child has one thread
   }
   int status = -1;
   ASSERT_EQ(waitpid(child, &status, 0), child);
   EXPECT_EQ(status, 0);
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + closing_banner());
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + closing_banner());
 }
 
-TEST(FileLogger, AFileThatCannotBeOpenedLeavesTheLoggerSilent) {
-  const TemporaryFolder folder;
-  for (const std::string& name : {folder / "gone/Log.txt", folder.path(), folder / std::string(4096, 'n')}) {
+TEST_F(FileLogger, AFileThatCannotBeOpenedLeavesTheLoggerSilent) {
+  for (const std::string& name : {folder_ / "gone/Log.txt", folder_.path(), folder_ / std::string(4096, 'n')}) {
     OpenLogger logger;
     stderr_of([&] {
       logger.SetFileName(name.c_str());
@@ -238,10 +230,9 @@ TEST(FileLogger, AFileThatCannotBeOpenedLeavesTheLoggerSilent) {
   }
 }
 
-TEST(FileLogger, AReadOnlyFileIsNotWritten) {
-  const TemporaryFolder folder;
-  ASSERT_EQ(chmod(folder.path().c_str(), 0755), 0);
-  const std::string path = folder.make_file("Log.txt", "old");
+TEST_F(FileLogger, AReadOnlyFileIsNotWritten) {
+  ASSERT_EQ(chmod(folder_.path().c_str(), 0755), 0);
+  const std::string path = folder_.make_file("Log.txt", "old");
   ASSERT_EQ(chmod(path.c_str(), 0444), 0);
   EXPECT_EQ(in_child([&] {
               if (!become_unprivileged()) return std::string("still privileged");
@@ -253,14 +244,13 @@ TEST(FileLogger, AReadOnlyFileIsNotWritten) {
   EXPECT_EQ(contents_of(path), "old");
 }
 
-TEST(FileLogger, IgnoresNullText) {
-  const TemporaryFolder folder;
-  OpenLogger logger(folder / "Log.txt");
+TEST_F(FileLogger, IgnoresNullText) {
+  OpenLogger logger(folder_ / "Log.txt");
   logger.Log(nullptr);
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner());
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner());
 }
 
-TEST(FileLogger, AFullDeviceIsNoFailure) {
+TEST_F(FileLogger, AFullDeviceIsNoFailure) {
   OpenLogger logger("/dev/full");
   EXPECT_EQ(stderr_of([&] {
               logger.Log("lost");
@@ -269,11 +259,10 @@ TEST(FileLogger, AFullDeviceIsNoFailure) {
             "");
 }
 
-TEST(FileLogger, AShortWriteSkipsTheRotation) {
-  const TemporaryFolder folder;
+TEST_F(FileLogger, AShortWriteSkipsTheRotation) {
   const std::string report = in_child([&] {
     std::signal(SIGXFSZ, SIG_IGN);
-    OpenLogger logger(folder / "Log.txt");
+    OpenLogger logger(folder_ / "Log.txt");
     logger.limit(1, 1);
     const rlimit limit = {1024, 1024};
     if (setrlimit(RLIMIT_FSIZE, &limit) != 0) return std::string("no limit");
@@ -281,17 +270,16 @@ TEST(FileLogger, AShortWriteSkipsTheRotation) {
       logger.Log(text_up_to(1025).c_str());
       logger.Log("lost");
     });
-    return told + std::to_string(contents_of(folder / "Log.txt").size());
+    return told + std::to_string(contents_of(folder_ / "Log.txt").size());
   });
   EXPECT_EQ(report, "1024");
-  EXPECT_FALSE(is_there(folder / "Log1.txt"));
+  EXPECT_FALSE(is_there(folder_ / "Log1.txt"));
 }
 
-TEST(FileLogger, GoesOnWhenTheDiskHasRoomAgain) {
-  const TemporaryFolder folder;
+TEST_F(FileLogger, GoesOnWhenTheDiskHasRoomAgain) {
   const std::string report = in_child([&] {
     std::signal(SIGXFSZ, SIG_IGN);
-    OpenLogger logger(folder / "Log.txt");
+    OpenLogger logger(folder_ / "Log.txt");
     rlimit limit = {};
     getrlimit(RLIMIT_FSIZE, &limit);
     const rlim_t former = limit.rlim_cur;
@@ -302,16 +290,15 @@ TEST(FileLogger, GoesOnWhenTheDiskHasRoomAgain) {
     limit.rlim_cur = former;
     if (setrlimit(RLIMIT_FSIZE, &limit) != 0) return std::string("no limit");
     logger.Log(" again");
-    return log_text(folder / "Log.txt");
+    return log_text(folder_ / "Log.txt");
   });
   EXPECT_EQ(report, opening_banner() + "cut again");
 }
 
-TEST(FileLogger, IsDestroyedThroughItsBase) {
-  const TemporaryFolder folder;
-  CFileLogger* logger = new OpenLogger(folder / "Log.txt");
+TEST_F(FileLogger, IsDestroyedThroughItsBase) {
+  CFileLogger* logger = new OpenLogger(folder_ / "Log.txt");
   delete logger;
-  EXPECT_EQ(log_text(folder / "Log.txt"), opening_banner() + closing_banner());
+  EXPECT_EQ(log_text(folder_ / "Log.txt"), opening_banner() + closing_banner());
 }
 
 }  // namespace

@@ -14,8 +14,8 @@
 #include <utility>
 #include <vector>
 
+#include "tests/support/folder_fixture.h"
 #include "tests/support/in_child.h"
-#include "tests/support/temporary_folder.h"
 #include "vexa/runtime.h"
 
 namespace vexa_test {
@@ -79,7 +79,9 @@ std::string home_of(const std::string& user) {
   return found == nullptr ? "" : found->pw_dir;
 }
 
-TEST(PathGlob, ResultsAndFlagsHaveTheirNumbers) {
+using PathGlob = InTemporaryFolder;
+
+TEST_F(PathGlob, ResultsAndFlagsHaveTheirNumbers) {
   EXPECT_EQ(PATHGLOB_NOSPACE, -1);
   EXPECT_EQ(PATHGLOB_ABORTED, -2);
   EXPECT_EQ(PATHGLOB_NOMATCH, -3);
@@ -89,82 +91,74 @@ TEST(PathGlob, ResultsAndFlagsHaveTheirNumbers) {
   EXPECT_EQ(PATHGLOB_NOSORT, 0x20);
 }
 
-TEST(PathGlob, GivesMinusThreeWhenNothingMatches) {
-  const TemporaryFolder folder;
-  folder.make_file("a");
+TEST_F(PathGlob, GivesMinusThreeWhenNothingMatches) {
+  folder_.make_file("a");
   for (const char* pattern : {"b", "b*", "?b", "b/*", "a/*", "a/", "*/", "[b]", "a\\", "\\a"}) {
-    const Found found = find(folder / pattern);
+    const Found found = find(folder_ / pattern);
     EXPECT_EQ(found.result, -3) << pattern;
     EXPECT_EQ(found.paths, Paths()) << pattern;
   }
   EXPECT_EQ(find("").result, -3);
 }
 
-TEST(PathGlob, FindsPathsWithoutMetaCharacters) {
-  const TemporaryFolder folder;
-  folder.make_folder("sub");
-  EXPECT_EQ(find(folder / "sub").paths, Paths{folder / "sub"});
-  EXPECT_EQ(find(folder / "sub/").paths, Paths{folder / "sub/"});
-  EXPECT_EQ(find(folder / "sub/..//sub").paths, Paths{folder / "sub/..//sub"});
+TEST_F(PathGlob, FindsPathsWithoutMetaCharacters) {
+  folder_.make_folder("sub");
+  EXPECT_EQ(find(folder_ / "sub").paths, Paths{folder_ / "sub"});
+  EXPECT_EQ(find(folder_ / "sub/").paths, Paths{folder_ / "sub/"});
+  EXPECT_EQ(find(folder_ / "sub/..//sub").paths, Paths{folder_ / "sub/..//sub"});
   EXPECT_EQ(find("/").paths, Paths{"/"});
 }
 
-TEST(PathGlob, FindsAlongSeveralComponents) {
-  const TemporaryFolder folder;
-  folder.make_folder("a1/x/deep");
-  folder.make_folder("a2/x");
-  folder.make_folder("b1/x");
-  folder.make_file("a1/x/f.txt");
-  folder.make_file("a2/x/g.txt");
-  folder.make_file("b1/x/h.txt");
-  folder.make_file("a3");
-  EXPECT_EQ(names(folder, "a*/x/*.txt"), (Paths{"a1/x/f.txt", "a2/x/g.txt"}));
-  EXPECT_EQ(names(folder, "*/x/[gh].*"), (Paths{"a2/x/g.txt", "b1/x/h.txt"}));
-  EXPECT_EQ(names(folder, "a?/*/deep"), (Paths{"a1/x/deep"}));
-  EXPECT_EQ(names(folder, "a*/"), (Paths{"a1/", "a2/"}));
-  EXPECT_EQ(names(folder, "a1//x///*"), (Paths{"a1//x///deep", "a1//x///f.txt"}));
-  EXPECT_EQ(names(folder, "a1/./x/../x/d*"), (Paths{"a1/./x/../x/deep"}));
-  EXPECT_EQ(names(folder, "*"), (Paths{"a1", "a2", "a3", "b1"}));
+TEST_F(PathGlob, FindsAlongSeveralComponents) {
+  folder_.make_folder("a1/x/deep");
+  folder_.make_folder("a2/x");
+  folder_.make_folder("b1/x");
+  folder_.make_file("a1/x/f.txt");
+  folder_.make_file("a2/x/g.txt");
+  folder_.make_file("b1/x/h.txt");
+  folder_.make_file("a3");
+  EXPECT_EQ(names(folder_, "a*/x/*.txt"), (Paths{"a1/x/f.txt", "a2/x/g.txt"}));
+  EXPECT_EQ(names(folder_, "*/x/[gh].*"), (Paths{"a2/x/g.txt", "b1/x/h.txt"}));
+  EXPECT_EQ(names(folder_, "a?/*/deep"), (Paths{"a1/x/deep"}));
+  EXPECT_EQ(names(folder_, "a*/"), (Paths{"a1/", "a2/"}));
+  EXPECT_EQ(names(folder_, "a1//x///*"), (Paths{"a1//x///deep", "a1//x///f.txt"}));
+  EXPECT_EQ(names(folder_, "a1/./x/../x/d*"), (Paths{"a1/./x/../x/deep"}));
+  EXPECT_EQ(names(folder_, "*"), (Paths{"a1", "a2", "a3", "b1"}));
 }
 
-TEST(PathGlob, SetEndsWithItsComponent) {
-  const TemporaryFolder folder;
-  folder.make_folder("[a");
-  folder.make_file("[a/b]");
-  EXPECT_EQ(names(folder, "[a/b]"), Paths{"[a/b]"});
-  EXPECT_EQ(names(folder, "[a/?]"), Paths{"[a/b]"});
+TEST_F(PathGlob, SetEndsWithItsComponent) {
+  folder_.make_folder("[a");
+  folder_.make_file("[a/b]");
+  EXPECT_EQ(names(folder_, "[a/b]"), Paths{"[a/b]"});
+  EXPECT_EQ(names(folder_, "[a/?]"), Paths{"[a/b]"});
 }
 
-TEST(PathGlob, TakesABackslashAsItself) {
-  const TemporaryFolder folder;
-  folder.make_file("a*");
-  folder.make_file("a\\x");
-  EXPECT_EQ(names(folder, "a\\*"), Paths{"a\\x"});
+TEST_F(PathGlob, TakesABackslashAsItself) {
+  folder_.make_file("a*");
+  folder_.make_file("a\\x");
+  EXPECT_EQ(names(folder_, "a\\*"), Paths{"a\\x"});
 }
 
-TEST(PathGlob, HiddenNamesNeedADot) {
-  const TemporaryFolder folder;
-  folder.make_file(".hidden");
-  folder.make_file("seen");
-  EXPECT_EQ(names(folder, "*"), Paths{"seen"});
-  EXPECT_EQ(names(folder, "?hidden"), Paths());
-  EXPECT_EQ(names(folder, "[.]hidden"), Paths());
-  EXPECT_EQ(names(folder, ".*"), (Paths{".", "..", ".hidden"}));
+TEST_F(PathGlob, HiddenNamesNeedADot) {
+  folder_.make_file(".hidden");
+  folder_.make_file("seen");
+  EXPECT_EQ(names(folder_, "*"), Paths{"seen"});
+  EXPECT_EQ(names(folder_, "?hidden"), Paths());
+  EXPECT_EQ(names(folder_, "[.]hidden"), Paths());
+  EXPECT_EQ(names(folder_, ".*"), (Paths{".", "..", ".hidden"}));
 }
 
-TEST(PathGlob, FindsLinksThatPointNowhere) {
-  const TemporaryFolder folder;
-  ASSERT_EQ(symlink("nowhere", (folder / "link").c_str()), 0);
-  EXPECT_EQ(names(folder, "l*"), Paths{"link"});
-  EXPECT_EQ(names(folder, "link"), Paths{"link"});
+TEST_F(PathGlob, FindsLinksThatPointNowhere) {
+  ASSERT_EQ(symlink("nowhere", (folder_ / "link").c_str()), 0);
+  EXPECT_EQ(names(folder_, "l*"), Paths{"link"});
+  EXPECT_EQ(names(folder_, "link"), Paths{"link"});
 }
 
-TEST(PathGlob, FindsInTheWorkingFolder) {
-  const TemporaryFolder folder;
-  folder.make_file("a");
-  folder.make_file("b");
+TEST_F(PathGlob, FindsInTheWorkingFolder) {
+  folder_.make_file("a");
+  folder_.make_file("b");
   EXPECT_EQ(in_child([&] {
-              if (chdir(folder.path().c_str()) != 0) return std::string("no folder");
+              if (chdir(folder_.path().c_str()) != 0) return std::string("no folder");
               std::string all;
               for (const std::string& path : find("*").paths) all += path + ";";
               return all;
@@ -172,75 +166,69 @@ TEST(PathGlob, FindsInTheWorkingFolder) {
             "a;b;");
 }
 
-TEST(PathGlob, ATildeIsTheVariableHome) {
-  const TemporaryFolder folder;
-  folder.make_file("a");
-  const Home home(folder.path().c_str());
-  EXPECT_EQ(find("~").paths, Paths{folder.path()});
-  EXPECT_EQ(find("~/a").paths, Paths{folder / "a"});
-  EXPECT_EQ(find("~/*").paths, Paths{folder / "a"});
-  EXPECT_EQ(find("~//a").paths, Paths{folder.path() + "//a"});
+TEST_F(PathGlob, ATildeIsTheVariableHome) {
+  folder_.make_file("a");
+  const Home home(folder_.path().c_str());
+  EXPECT_EQ(find("~").paths, Paths{folder_.path()});
+  EXPECT_EQ(find("~/a").paths, Paths{folder_ / "a"});
+  EXPECT_EQ(find("~/*").paths, Paths{folder_ / "a"});
+  EXPECT_EQ(find("~//a").paths, Paths{folder_.path() + "//a"});
 }
 
-TEST(PathGlob, AnEmptyHomeCountsAsSet) {
+TEST_F(PathGlob, AnEmptyHomeCountsAsSet) {
   const Home home("");
   EXPECT_EQ(find("~/").paths, Paths{"/"});
   EXPECT_EQ(find("~").result, -3);
 }
 
-TEST(PathGlob, WithoutHomeATildeIsThePasswordDatabases) {
+TEST_F(PathGlob, WithoutHomeATildeIsThePasswordDatabases) {
   const Home home(nullptr);
   ASSERT_NE(home_of(""), "");
   EXPECT_EQ(find("~", PATHGLOB_NOCHECK).result, 0);
   EXPECT_EQ(find("~").paths, Paths{home_of("")});
 }
 
-TEST(PathGlob, ATildeAndANameAreThatUsersHome) {
+TEST_F(PathGlob, ATildeAndANameAreThatUsersHome) {
   const Home home("/nowhere");
   EXPECT_EQ(find("~root").paths, Paths{home_of("root")});
   EXPECT_EQ(find("~root/").paths, Paths{home_of("root") + "/"});
   EXPECT_EQ(find("~roo[t]").result, -3);
 }
 
-TEST(PathGlob, ATildeAndAnUnknownNameStayAsTheyAre) {
-  const TemporaryFolder folder;
-  folder.make_folder("~no-such-user");
-  folder.make_file("~no-such-user/a");
+TEST_F(PathGlob, ATildeAndAnUnknownNameStayAsTheyAre) {
+  folder_.make_folder("~no-such-user");
+  folder_.make_file("~no-such-user/a");
   EXPECT_EQ(in_child([&] {
-              if (chdir(folder.path().c_str()) != 0) return std::string("no folder");
+              if (chdir(folder_.path().c_str()) != 0) return std::string("no folder");
               const Paths found = find("~no-such-user/*").paths;
               return found.empty() ? std::string("none") : found[0];
             }),
             "~no-such-user/a");
 }
 
-TEST(PathGlob, ATildeElsewhereIsItself) {
-  const TemporaryFolder folder;
-  folder.make_file("~");
-  folder.make_file("a~");
-  EXPECT_EQ(names(folder, "*~"), (Paths{"a~", "~"}));
-  EXPECT_EQ(names(folder, "~"), Paths{"~"});
+TEST_F(PathGlob, ATildeElsewhereIsItself) {
+  folder_.make_file("~");
+  folder_.make_file("a~");
+  EXPECT_EQ(names(folder_, "*~"), (Paths{"a~", "~"}));
+  EXPECT_EQ(names(folder_, "~"), Paths{"~"});
 }
 
-TEST(PathGlob, MetaCharactersOfAHomeDirectoryCount) {
-  const TemporaryFolder folder;
-  folder.make_file("a");
-  const Home home((folder.path().substr(0, folder.path().size() - 1) + "?").c_str());
-  EXPECT_EQ(find("~/a").paths, Paths{folder / "a"});
+TEST_F(PathGlob, MetaCharactersOfAHomeDirectoryCount) {
+  folder_.make_file("a");
+  const Home home((folder_.path().substr(0, folder_.path().size() - 1) + "?").c_str());
+  EXPECT_EQ(find("~/a").paths, Paths{folder_ / "a"});
 }
 
-TEST(PathGlob, SortsInTheOrderOfStrcoll) {
-  const TemporaryFolder folder;
+TEST_F(PathGlob, SortsInTheOrderOfStrcoll) {
   Paths expected = {"B", "C", "_", "a", "b", "c", "1", "10", "2"};
-  for (const std::string& name : expected) folder.make_file(name);
+  for (const std::string& name : expected) folder_.make_file(name);
   std::sort(expected.begin(), expected.end(),
             [](const std::string& a, const std::string& b) { return strcoll(a.c_str(), b.c_str()) < 0; });
-  EXPECT_EQ(names(folder, "*"), expected);
+  EXPECT_EQ(names(folder_, "*"), expected);
 }
 
-TEST(PathGlob, FollowsTheLocalesOrder) {
-  const TemporaryFolder folder;
-  for (const char* name : {"B", "a", "C", "b"}) folder.make_file(name);
+TEST_F(PathGlob, FollowsTheLocalesOrder) {
+  for (const char* name : {"B", "a", "C", "b"}) folder_.make_file(name);
   const std::string report = in_child([&] {
     if (std::setlocale(LC_COLLATE, "en_US.UTF-8") == nullptr && std::setlocale(LC_COLLATE, "C.UTF-8") == nullptr) {
       return std::string("no locale");
@@ -248,36 +236,33 @@ TEST(PathGlob, FollowsTheLocalesOrder) {
     Paths expected = {"B", "a", "C", "b"};
     std::sort(expected.begin(), expected.end(),
               [](const std::string& a, const std::string& b) { return strcoll(a.c_str(), b.c_str()) < 0; });
-    return std::string(names(folder, "*") == expected ? "as strcoll" : "otherwise");
+    return std::string(names(folder_, "*") == expected ? "as strcoll" : "otherwise");
   });
   EXPECT_EQ(report, "as strcoll");
 }
 
-TEST(PathGlob, WithoutSortingStillFindsAll) {
-  const TemporaryFolder folder;
-  for (const char* name : {"c", "a", "b"}) folder.make_file(name);
-  Paths found = names(folder, "*", PATHGLOB_NOSORT);
+TEST_F(PathGlob, WithoutSortingStillFindsAll) {
+  for (const char* name : {"c", "a", "b"}) folder_.make_file(name);
+  Paths found = names(folder_, "*", PATHGLOB_NOSORT);
   std::sort(found.begin(), found.end());
   EXPECT_EQ(found, (Paths{"a", "b", "c"}));
 }
 
-TEST(PathGlob, MarksFolders) {
-  const TemporaryFolder folder;
-  folder.make_folder("sub");
-  folder.make_file("file");
-  ASSERT_EQ(symlink("sub", (folder / "to_sub").c_str()), 0);
-  ASSERT_EQ(symlink("nowhere", (folder / "to_nowhere").c_str()), 0);
-  EXPECT_EQ(names(folder, "*", PATHGLOB_MARK), (Paths{"file", "sub/", "to_nowhere", "to_sub/"}));
-  EXPECT_EQ(names(folder, "sub/", PATHGLOB_MARK), (Paths{"sub/"}));
+TEST_F(PathGlob, MarksFolders) {
+  folder_.make_folder("sub");
+  folder_.make_file("file");
+  ASSERT_EQ(symlink("sub", (folder_ / "to_sub").c_str()), 0);
+  ASSERT_EQ(symlink("nowhere", (folder_ / "to_nowhere").c_str()), 0);
+  EXPECT_EQ(names(folder_, "*", PATHGLOB_MARK), (Paths{"file", "sub/", "to_nowhere", "to_sub/"}));
+  EXPECT_EQ(names(folder_, "sub/", PATHGLOB_MARK), (Paths{"sub/"}));
 }
 
-TEST(PathGlob, ReturnsThePatternItselfOnRequest) {
-  const TemporaryFolder folder;
-  EXPECT_EQ(find(folder / "*", PATHGLOB_NOCHECK).paths, Paths{folder / "*"});
+TEST_F(PathGlob, ReturnsThePatternItselfOnRequest) {
+  EXPECT_EQ(find(folder_ / "*", PATHGLOB_NOCHECK).paths, Paths{folder_ / "*"});
   EXPECT_EQ(find("~no-such-user", PATHGLOB_NOCHECK).paths, Paths{"~no-such-user"});
   EXPECT_EQ(find("", PATHGLOB_NOCHECK).paths, Paths{""});
-  folder.make_file("a");
-  EXPECT_EQ(find(folder / "*", PATHGLOB_NOCHECK).paths, Paths{folder / "a"});
+  folder_.make_file("a");
+  EXPECT_EQ(find(folder_ / "*", PATHGLOB_NOCHECK).paths, Paths{folder_ / "a"});
 }
 
 std::vector<std::pair<std::string, int>> told;
@@ -292,67 +277,63 @@ int stop(const char* path, int code) {
   return 1;
 }
 
-TEST(PathGlob, CallsTheCallbackForFoldersItCannotRead) {
-  const TemporaryFolder folder;
+TEST_F(PathGlob, CallsTheCallbackForFoldersItCannotRead) {
   told.clear();
-  EXPECT_EQ(find(folder / "gone/*", 0, &go_on).result, -3);
-  EXPECT_EQ(told, (std::vector<std::pair<std::string, int>>{{folder / "gone/", ENOENT}}));
+  EXPECT_EQ(find(folder_ / "gone/*", 0, &go_on).result, -3);
+  EXPECT_EQ(told, (std::vector<std::pair<std::string, int>>{{folder_ / "gone/", ENOENT}}));
   told.clear();
-  EXPECT_EQ(find(folder / "gone/*", 0, &stop).result, -2);
-  EXPECT_EQ(told, (std::vector<std::pair<std::string, int>>{{folder / "gone/", ENOENT}}));
+  EXPECT_EQ(find(folder_ / "gone/*", 0, &stop).result, -2);
+  EXPECT_EQ(told, (std::vector<std::pair<std::string, int>>{{folder_ / "gone/", ENOENT}}));
   told.clear();
-  EXPECT_EQ(find(folder / "gone/*", PATHGLOB_ERR, &go_on).result, -2);
+  EXPECT_EQ(find(folder_ / "gone/*", PATHGLOB_ERR, &go_on).result, -2);
   EXPECT_EQ(told.size(), 1U);
-  EXPECT_EQ(find(folder / "gone/*", PATHGLOB_ERR).result, -2);
-  EXPECT_EQ(find(folder / "gone/*").result, -3);
+  EXPECT_EQ(find(folder_ / "gone/*", PATHGLOB_ERR).result, -2);
+  EXPECT_EQ(find(folder_ / "gone/*").result, -3);
 }
 
-TEST(PathGlob, AFileOnTheWayIsNoFolderThatCannotBeRead) {
-  const TemporaryFolder folder;
-  folder.make_file("a");
-  folder.make_folder("b");
-  folder.make_file("b/c");
+TEST_F(PathGlob, AFileOnTheWayIsNoFolderThatCannotBeRead) {
+  folder_.make_file("a");
+  folder_.make_folder("b");
+  folder_.make_file("b/c");
   told.clear();
-  EXPECT_EQ(find(folder / "*/*", PATHGLOB_ERR, &stop).paths, Paths{folder / "b/c"});
+  EXPECT_EQ(find(folder_ / "*/*", PATHGLOB_ERR, &stop).paths, Paths{folder_ / "b/c"});
   EXPECT_TRUE(told.empty());
 }
 
-TEST(PathGlob, KeepsWhatWasFoundBeforeTheEnd) {
-  const TemporaryFolder folder;
-  folder.make_folder("a");
-  folder.make_file("a/x");
-  folder.make_folder("b");
-  ASSERT_EQ(chmod(folder.path().c_str(), 0755), 0);
-  ASSERT_EQ(chmod((folder / "b").c_str(), 0), 0);
+TEST_F(PathGlob, KeepsWhatWasFoundBeforeTheEnd) {
+  folder_.make_folder("a");
+  folder_.make_file("a/x");
+  folder_.make_folder("b");
+  ASSERT_EQ(chmod(folder_.path().c_str(), 0755), 0);
+  ASSERT_EQ(chmod((folder_ / "b").c_str(), 0), 0);
   const std::string report = in_child([&] {
     if (!become_unprivileged()) return std::string("still privileged");
-    const Found open = find(folder / "*/*");
-    const Found strict = find(folder / "*/*", PATHGLOB_ERR);
+    const Found open = find(folder_ / "*/*");
+    const Found strict = find(folder_ / "*/*", PATHGLOB_ERR);
     return std::to_string(open.result) + ":" + std::to_string(open.paths.size()) + " " + std::to_string(strict.result) +
            ":" + (strict.paths.size() <= 1 ? "some" : "too many");
   });
-  ASSERT_EQ(chmod((folder / "b").c_str(), 0755), 0);
+  ASSERT_EQ(chmod((folder_ / "b").c_str(), 0755), 0);
   EXPECT_EQ(report, "0:1 -2:some");
 }
 
-TEST(PathGlob, TakesNoDescriptorPerLevel) {
-  const TemporaryFolder folder;
+TEST_F(PathGlob, TakesNoDescriptorPerLevel) {
   std::string deep;
   std::string pattern;
   for (int level = 0; level < 200; ++level) {
     deep += "d/";
     pattern += "*/";
   }
-  folder.make_folder(deep);
+  folder_.make_folder(deep);
   const std::string report = in_child([&] {
     const rlimit few = {16, 16};
     if (setrlimit(RLIMIT_NOFILE, &few) != 0) return std::string("no limit");
-    return std::to_string(find(folder / pattern).paths.size());
+    return std::to_string(find(folder_ / pattern).paths.size());
   });
   EXPECT_EQ(report, "1");
 }
 
-TEST(PathGlob, IsSilentAndBoundedForPatternsOfFourKilobytes) {
+TEST_F(PathGlob, IsSilentAndBoundedForPatternsOfFourKilobytes) {
   std::string nested = "/";
   for (int i = 0; i < 2048; ++i) nested += "*/";
   for (const std::string& pattern :
@@ -362,7 +343,7 @@ TEST(PathGlob, IsSilentAndBoundedForPatternsOfFourKilobytes) {
   }
 }
 
-TEST(PathGlob, NullArgumentsAreNoCrash) {
+TEST_F(PathGlob, NullArgumentsAreNoCrash) {
   pathglob_t matches;
   EXPECT_EQ(pathglob(nullptr, 0, nullptr, &matches), -3);
   pathglobfree(&matches);
@@ -370,7 +351,7 @@ TEST(PathGlob, NullArgumentsAreNoCrash) {
   pathglobfree(nullptr);
 }
 
-TEST(PathGlob, FreeingTwiceIsHarmless) {
+TEST_F(PathGlob, FreeingTwiceIsHarmless) {
   pathglob_t matches;
   ASSERT_EQ(pathglob("/", 0, nullptr, &matches), 0);
   pathglobfree(&matches);

@@ -3,8 +3,11 @@
 #pragma once
 
 #include <fcntl.h>
+#include <netinet/in.h>
 #include <poll.h>
 #include <sys/resource.h>
+#include <sys/socket.h>
+#include <unistd.h>
 
 #include <set>
 #include <string>
@@ -31,12 +34,23 @@ inline std::set<std::string> inherited_descriptors() {
   return found;
 }
 
+/// The local port of a socket of IPv4; 0 when it has none.
+inline int port_of(int socket) {
+  sockaddr_in address{};
+  socklen_t length = sizeof address;
+  getsockname(socket, reinterpret_cast<sockaddr*>(&address), &length);
+  return ntohs(address.sin_port);
+}
+
 /// While it lives the process gets no further descriptor; those it has stay good.
 class NoDescriptorsLeft {
  public:
   NoDescriptorsLeft() {
     getrlimit(RLIMIT_NOFILE, &before_);
-    const rlimit none = {0, before_.rlim_max};
+    // The lowest free number and not 0: poll refuses more entries than the limit.
+    const int lowest = open("/", O_PATH | O_CLOEXEC);
+    close(lowest);
+    const rlimit none = {static_cast<rlim_t>(lowest), before_.rlim_max};
     setrlimit(RLIMIT_NOFILE, &none);
   }
   ~NoDescriptorsLeft() { setrlimit(RLIMIT_NOFILE, &before_); }

@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 
 #include <string>
+#include <type_traits>
 
 #include "vexa/return_codes.h"
 
@@ -27,13 +28,18 @@ class Shortage {
  public:
   explicit Shortage(int nth) : nth_(nth) {}
 
-  /// What `call` returns while its allocation number nth() fails.
+  /// What `call` returns, if it returns anything, while its allocation number nth() fails.
   template <typename Call>
   auto run(Call call) {
     const AllocationFailure failure(nth_);
-    auto result = call();
-    failed_ = failure.happened();
-    return result;
+    if constexpr (std::is_void_v<decltype(call())>) {
+      call();
+      failed_ = failure.happened();
+    } else {
+      auto result = call();
+      failed_ = failure.happened();
+      return result;
+    }
   }
 
   int nth() const { return nth_; }

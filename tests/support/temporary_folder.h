@@ -53,9 +53,9 @@ class TemporaryFolder {
   std::string path_;
 };
 
-/// The whole of a file; empty when it cannot be read.
 inline bool is_there(const std::string& path) { return access(path.c_str(), F_OK) == 0; }
 
+/// The whole of a file; empty when it cannot be read.
 inline std::string contents_of(const std::string& path) {
   std::ifstream file(path, std::ios::binary);
   return {std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};

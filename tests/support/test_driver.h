@@ -42,6 +42,11 @@ class TestDriver : public Reach<CVexaCommon> {
   vexa::DriverState& state() { return *m_State; }
   vexa::CameraLink& camera() { return m_State->camera; }
   int ConnectionTimeout() { return m_State->connection.timeout(); }
+  /// The camera's position, as it was last stored.
+  std::string position_text() {
+    const vexa::Guard guard(m_CamPosLock);
+    return m_CamPosText;
+  }
   /// A media socket as an open makes it: its port.
   int bind_media_socket() {
     m_State->set_stream_socket(vexa::make_media_socket().release());

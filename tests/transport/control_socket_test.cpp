@@ -9,6 +9,7 @@
 #include <chrono>
 #include <cstdlib>
 
+#include "tests/support/descriptors.h"
 #include "transport/rtsp_session.h"
 
 namespace vexa {
@@ -19,13 +20,6 @@ constexpr std::int64_t kMinute = 60'000'000'000;
 std::int64_t now() {
   return std::chrono::duration_cast<std::chrono::nanoseconds>(std::chrono::system_clock::now().time_since_epoch())
       .count();
-}
-
-int port_of(int socket) {
-  sockaddr_in address{};
-  socklen_t length = sizeof address;
-  getsockname(socket, reinterpret_cast<sockaddr*>(&address), &length);
-  return ntohs(address.sin_port);
 }
 
 /// A media socket whose next port is free, and that port's socket.
@@ -49,7 +43,7 @@ Pair bound_pair() {
 
 TEST(ControlSocket, StandsOnThePortAfterTheMediaPort) {
   const Pair pair = bound_pair();
-  EXPECT_EQ(port_of(pair.control.get()), pair.port + 1);
+  EXPECT_EQ(vexa_test::port_of(pair.control.get()), pair.port + 1);
 }
 
 TEST(ControlSocket, IsInvalidWhereThePortIsTakenOrThereIsNone) {

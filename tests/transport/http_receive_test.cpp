@@ -50,6 +50,15 @@ class HttpReceive : public testing::Test {
     EXPECT_EQ(driver_.LatestErrorText(), text);
   }
 
+  /// `receive`, called with a descriptor, fails as the system does.
+  template <typename Receive>
+  void expect_system_errors(Receive receive) {
+    EXPECT_EQ(receive(-1), -1);
+    expect_error(LIBD_FAILED, "Bad file descriptor");
+    EXPECT_EQ(receive(no_socket()), -1);
+    expect_error(LIBD_FAILED, "Socket operation on non-socket");
+  }
+
   TestDriver driver_;
   int socket_ = -1;
   int camera_ = -1;
@@ -110,10 +119,7 @@ TEST_F(HttpHeaderRecv, LooksNoFurtherThanItsLength) {
 }
 
 TEST_F(HttpHeaderRecv, ReportsSystemErrors) {
-  EXPECT_EQ(driver_.http_header_recv(-1, buffer_, 1023, 5000), -1);
-  expect_error(LIBD_FAILED, "Bad file descriptor");
-  EXPECT_EQ(driver_.http_header_recv(no_socket(), buffer_, 1023, 5000), -1);
-  expect_error(LIBD_FAILED, "Socket operation on non-socket");
+  expect_system_errors([this](int socket) { return driver_.http_header_recv(socket, buffer_, 1023, 5000); });
 }
 
 using HttpRecv = HttpReceive;
@@ -133,10 +139,7 @@ TEST_F(HttpRecv, GivesZeroInSilenceAndAtTheEnd) {
 }
 
 TEST_F(HttpRecv, ReportsSystemErrors) {
-  EXPECT_EQ(driver_.http_recv(-1, buffer_, 1024, 5000), -1);
-  expect_error(LIBD_FAILED, "Bad file descriptor");
-  EXPECT_EQ(driver_.http_recv(no_socket(), buffer_, 1024, 5000), -1);
-  expect_error(LIBD_FAILED, "Socket operation on non-socket");
+  expect_system_errors([this](int socket) { return driver_.http_recv(socket, buffer_, 1024, 5000); });
 }
 
 using HttpRecvn = HttpReceive;
@@ -177,10 +180,7 @@ TEST_F(HttpRecvn, TimesOut) {
 }
 
 TEST_F(HttpRecvn, ReportsSystemErrors) {
-  EXPECT_EQ(driver_.http_recvn(-1, buffer_, 1, 5000), -1);
-  expect_error(LIBD_FAILED, "Bad file descriptor");
-  EXPECT_EQ(driver_.http_recvn(no_socket(), buffer_, 1, 5000), -1);
-  expect_error(LIBD_FAILED, "Socket operation on non-socket");
+  expect_system_errors([this](int socket) { return driver_.http_recvn(socket, buffer_, 1, 5000); });
 }
 
 using HttpRecvnText = HttpReceive;
@@ -222,10 +222,7 @@ TEST_F(HttpRecvnText, KeepsWhatCameBeforeAFailure) {
     expect_error(LIBD_TIMEOUT, "Receive timed out");
   }
   EXPECT_EQ(text, "abc");
-  EXPECT_EQ(driver_.http_recvn(-1, text, 0, 5000), -1);
-  expect_error(LIBD_FAILED, "Bad file descriptor");
-  EXPECT_EQ(driver_.http_recvn(no_socket(), text, 0, 5000), -1);
-  expect_error(LIBD_FAILED, "Socket operation on non-socket");
+  expect_system_errors([&](int socket) { return driver_.http_recvn(socket, text, 0, 5000); });
   EXPECT_EQ(text, "abc");
 }
 

@@ -35,10 +35,6 @@ class JpegPart : public HttpStream {
     return driver_.http_multipart_jpeg_recv(pair_.driver_end(), buffer_.data(), capacity, timeout);
   }
   std::string received(std::size_t length) const { return {buffer_.data(), length}; }
-  std::string position() {
-    const vexa::Guard guard(driver_.m_CamPosLock);
-    return driver_.m_CamPosText;
-  }
 };
 
 std::string jpeg_part(const std::string& image, const std::string& length) {
@@ -149,12 +145,12 @@ TEST_F(JpegPart, GivesTheCamerasPosition) {
     std::thread camera([&] { pair_.say(jpeg_part(c.image)); });
     EXPECT_EQ(receive(200000, 5000), static_cast<int>(c.image.size()));
     camera.join();
-    EXPECT_EQ(position(), c.position);
+    EXPECT_EQ(driver_.position_text(), c.position);
     pair_.left();
   }
   pair_.say(jpeg_part("CamPos:without a blank"));
   receive();
-  EXPECT_EQ(position(), "CamPos: first 16 letters");
+  EXPECT_EQ(driver_.position_text(), "CamPos: first 16 letters");
 }
 
 TEST_F(JpegPart, ComesAByteAtATime) {

@@ -7,15 +7,22 @@
 #include <gtest/gtest.h>
 #include <netdb.h>
 
+#include <algorithm>
+#include <array>
 #include <atomic>
 #include <condition_variable>
 #include <future>
 #include <mutex>
 #include <string>
-#include <thread>
 #include <vector>
 
+#include "tests/support/process_state.h"
+
 namespace {
+
+using vexa_test::eventually;
+using vexa_test::is_sleeping;
+using vexa_test::kernel_thread_id;
 
 constexpr const char* kSlowName = "slow.invalid";
 constexpr const char* kKnownName = "known.invalid";
@@ -32,7 +39,7 @@ class Silence {
   Silence() { set(true); }
   ~Silence() {
     set(false);
-    while (waiting > 0) std::this_thread::yield();
+    EXPECT_TRUE(eventually([] { return waiting == 0; }));
   }
   Silence(const Silence&) = delete;
   Silence& operator=(const Silence&) = delete;
@@ -98,7 +105,7 @@ TEST(NameLookup, EndsWhenItIsCancelledAndThrowsAwayWhatIsFoundLater) {
   {
     const Silence silence;
     auto lookup = std::async(std::launch::async, [&] { return resolve_host(kSlowName, 80, {&signal}); });
-    while (asked == before) std::this_thread::yield();
+    EXPECT_TRUE(eventually([before] { return asked > before; }));
     signal.raise();
     EXPECT_FALSE(lookup.get().address);
   }
@@ -111,11 +118,20 @@ TEST(NameLookup, RunsAtMostSoManyBesideTheirCallers) {
   CancelSignal signal;
   {
     const Silence silence;
+    std::array<std::atomic<long>, kMostLookups + 4> callers{};
     std::vector<std::future<ResolvedHost>> lookups;
-    for (int i = 0; i < kMostLookups + 4; ++i) {
-      lookups.push_back(std::async(std::launch::async, [&] { return resolve_host(kSlowName, 80, {&signal}); }));
+    for (std::atomic<long>& caller : callers) {
+      lookups.push_back(std::async(std::launch::async, [&] {
+        caller = kernel_thread_id();
+        return resolve_host(kSlowName, 80, {&signal});
+      }));
     }
-    while (asked < before + kMostLookups) std::this_thread::yield();
+    EXPECT_TRUE(eventually([&] {
+      return asked >= before + kMostLookups && std::all_of(callers.begin(), callers.end(), [](const auto& caller) {
+               return caller != 0 && is_sleeping(caller);
+             });
+    }));
+    EXPECT_EQ(asked, before + kMostLookups);
     signal.raise();
     for (auto& lookup : lookups) EXPECT_FALSE(lookup.get().address);
     EXPECT_EQ(asked, before + kMostLookups);

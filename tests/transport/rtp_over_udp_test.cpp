@@ -38,14 +38,15 @@ class RtpOverUdp : public testing::Test {
   void send_datagram(const std::vector<unsigned char>& bytes) {
     ASSERT_EQ(send(camera_, bytes.data(), bytes.size(), 0), static_cast<ssize_t>(bytes.size()));
   }
-  int receive(SPacketInfo& packet, int timeout = 1000) {
-    return driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), kSize, timeout, packet);
+  int receive(int timeout = 1000) {
+    return driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), kSize, timeout, packet_);
   }
 
   MediaDriver driver_;
   int camera_ = -1;
   int socket_ = -1;
   std::vector<char> buffer_ = std::vector<char>(kSize);
+  SPacketInfo packet_;
 };
 
 const std::vector<unsigned char> kPacket = {0x80, 0xe0, 0xff, 0xfe, 0, 0, 0, 5, 9, 9, 9, 9, 0x65, 0x88};
@@ -53,17 +54,17 @@ const std::vector<unsigned char> kPacket = {0x80, 0xe0, 0xff, 0xfe, 0, 0, 0, 5, 
 TEST_F(RtpOverUdp, FillsThePacketFromTheHeaderInHostOrder) {
   for (const bool twin : {false, true}) {
     send_datagram(kPacket);
-    SPacketInfo packet;
+    packet_ = {};
     const int length =
-        twin ? driver_.rtp_over_udp_payload_recv_h264(socket_, buffer_.data(), kSize, 1000, packet) : receive(packet);
+        twin ? driver_.rtp_over_udp_payload_recv_h264(socket_, buffer_.data(), kSize, 1000, packet_) : receive();
     EXPECT_EQ(length, 14);
-    EXPECT_TRUE(packet.received);
-    EXPECT_TRUE(packet.marker);
-    EXPECT_EQ(packet.payloadType, 96);
-    EXPECT_EQ(packet.sequence, 65534);
-    EXPECT_EQ(packet.length, 14u);
-    EXPECT_EQ(packet.timestamp, 5u);
-    EXPECT_EQ(packet.data, reinterpret_cast<unsigned char*>(buffer_.data()));
+    EXPECT_TRUE(packet_.received);
+    EXPECT_TRUE(packet_.marker);
+    EXPECT_EQ(packet_.payloadType, 96);
+    EXPECT_EQ(packet_.sequence, 65534);
+    EXPECT_EQ(packet_.length, 14u);
+    EXPECT_EQ(packet_.timestamp, 5u);
+    EXPECT_EQ(packet_.data, reinterpret_cast<unsigned char*>(buffer_.data()));
     EXPECT_EQ(driver_.LatestErrorCode(), LIBD_FAILED);
   }
 }
@@ -71,49 +72,45 @@ TEST_F(RtpOverUdp, FillsThePacketFromTheHeaderInHostOrder) {
 TEST_F(RtpOverUdp, ADatagramOf11BytesSetsTheReceivedFlagAlone) {
   send_datagram(std::vector<unsigned char>(11, 0xff));
   unsigned char byte = 0;
-  SPacketInfo packet;
-  packet.data = &byte;
-  packet.marker = true;
-  packet.payloadType = 7;
-  packet.sequence = 8;
-  packet.length = 9;
-  packet.timestamp = 10;
-  EXPECT_EQ(receive(packet), 11);
-  EXPECT_TRUE(packet.received);
-  EXPECT_EQ(packet.data, &byte);
-  EXPECT_TRUE(packet.marker);
-  EXPECT_EQ(packet.payloadType, 7);
-  EXPECT_EQ(packet.sequence, 8);
-  EXPECT_EQ(packet.length, 9u);
-  EXPECT_EQ(packet.timestamp, 10u);
+  packet_.data = &byte;
+  packet_.marker = true;
+  packet_.payloadType = 7;
+  packet_.sequence = 8;
+  packet_.length = 9;
+  packet_.timestamp = 10;
+  EXPECT_EQ(receive(), 11);
+  EXPECT_TRUE(packet_.received);
+  EXPECT_EQ(packet_.data, &byte);
+  EXPECT_TRUE(packet_.marker);
+  EXPECT_EQ(packet_.payloadType, 7);
+  EXPECT_EQ(packet_.sequence, 8);
+  EXPECT_EQ(packet_.length, 9u);
+  EXPECT_EQ(packet_.timestamp, 10u);
 }
 
 TEST_F(RtpOverUdp, ABufferOf65534BytesIsRefusedAndOneMoreIsTaken) {
-  SPacketInfo packet;
   send_datagram(kPacket);
-  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), 65534, 0, packet), -1);
+  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), 65534, 0, packet_), -1);
   EXPECT_EQ(driver_.LatestErrorText(), "Invalid argument");
   EXPECT_EQ(driver_.LatestErrorCode(), LIBD_FAILED);
-  EXPECT_FALSE(packet.received);
+  EXPECT_FALSE(packet_.received);
   EXPECT_EQ(driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), 65534, nullptr, nullptr, 0, nullptr, nullptr),
             -1);
-  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), 65535, 0, packet), 14);
+  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(socket_, buffer_.data(), 65535, 0, packet_), 14);
 }
 
 TEST_F(RtpOverUdp, NoDatagramInTimeGivesReceiveTimedOut) {
-  SPacketInfo packet;
   for (const int timeout : {20, 0, -1}) {
     driver_.soil_latest_error();
-    EXPECT_EQ(receive(packet, timeout), -1);
+    EXPECT_EQ(receive(timeout), -1);
     EXPECT_EQ(driver_.LatestErrorText(), "Receive timed out");
     EXPECT_EQ(driver_.LatestErrorCode(), LIBD_TIMEOUT);
-    EXPECT_FALSE(packet.received);
+    EXPECT_FALSE(packet_.received);
   }
 }
 
 TEST_F(RtpOverUdp, AFailingReadGivesTheSystemText) {
-  SPacketInfo packet;
-  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(-1, buffer_.data(), kSize, 20, packet), -1);
+  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(-1, buffer_.data(), kSize, 20, packet_), -1);
   EXPECT_EQ(driver_.LatestErrorText(), "Bad file descriptor");
   EXPECT_EQ(driver_.LatestErrorCode(), LIBD_FAILED);
 }
@@ -147,13 +144,12 @@ TEST_F(RtpOverUdp, ThePointerFormTakesNullPointersAndShortDatagrams) {
 }
 
 TEST_F(RtpOverUdp, DatagramsOfEveryLengthAreTaken) {
-  SPacketInfo packet;
   for (int length = 0; length <= 64; ++length) {
     send_datagram(std::vector<unsigned char>(static_cast<std::size_t>(length), 0x80));
-    EXPECT_EQ(receive(packet), length);
+    EXPECT_EQ(receive(), length);
   }
   send_datagram(std::vector<unsigned char>(65535, 0x80));
-  EXPECT_EQ(receive(packet), 65535);
+  EXPECT_EQ(receive(), 65535);
 }
 
 TEST_F(RtpOverUdp, ADatagramThatComesDuringTheWaitIsTaken) {
@@ -162,15 +158,13 @@ TEST_F(RtpOverUdp, ADatagramThatComesDuringTheWaitIsTaken) {
     EXPECT_TRUE(eventually([reader] { return is_sleeping(reader); }));
     send_datagram(kPacket);
   });
-  SPacketInfo packet;
-  EXPECT_EQ(receive(packet, 20000), 14);
+  EXPECT_EQ(receive(20000), 14);
   late.join();
 }
 
 TEST_F(RtpOverUdp, AStopEndsTheWaitAtOnceAndIsNoTimeOut) {
   SetEvent(driver_.m_StopVideoEvent);
-  SPacketInfo packet;
-  EXPECT_EQ(receive(packet, 600000), -1);
+  EXPECT_EQ(receive(600000), -1);
   EXPECT_EQ(driver_.LatestErrorCode(), LIBD_FAILED);
   EXPECT_EQ(driver_.LatestErrorText(), "from before");
 }
@@ -195,8 +189,7 @@ TEST_F(RtpOverUdp, ASignalDoesNotEndTheWait) {
     EXPECT_TRUE(eventually([reader_id] { return is_sleeping(reader_id); }));
     send_datagram(kPacket);
   });
-  SPacketInfo packet;
-  EXPECT_EQ(receive(packet, 60000), 14);
+  EXPECT_EQ(receive(60000), 14);
   disturber.join();
 }
 
@@ -208,9 +201,8 @@ TEST_F(RtpOverUdp, ADescriptorAbove1023IsAsGoodAsAny) {
   const int high = fcntl(socket_, F_DUPFD_CLOEXEC, 1500);
   ASSERT_GE(high, 1500);
   send_datagram(kPacket);
-  SPacketInfo packet;
-  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(high, buffer_.data(), kSize, 1000, packet), 14);
-  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(high, buffer_.data(), kSize, 10, packet), -1);
+  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(high, buffer_.data(), kSize, 1000, packet_), 14);
+  EXPECT_EQ(driver_.rtp_over_udp_payload_recv(high, buffer_.data(), kSize, 10, packet_), -1);
   EXPECT_EQ(driver_.LatestErrorText(), "Receive timed out");
   close(high);
 }

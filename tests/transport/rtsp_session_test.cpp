@@ -12,6 +12,7 @@
 #include <climits>
 #include <set>
 
+#include "tests/support/descriptors.h"
 #include "tests/support/exchange_file.h"
 #include "tests/support/in_child.h"
 #include "tests/support/interruptions.h"
@@ -101,15 +102,14 @@ TEST_F(RtspSession, TracesEveryRequestWhole) {
   const std::string trace = open(camera);
   std::string expected;
   for (const ScriptStep& step : script) expected += "send <" + step.expected + ">\n";
-  sockaddr_in address{};
-  socklen_t length = sizeof address;
-  ASSERT_EQ(getsockname(driver_.m_StreamSocket, reinterpret_cast<sockaddr*>(&address), &length), 0);
+  const int port = port_of(driver_.m_StreamSocket);
+  ASSERT_NE(port, 0);
   const struct {
     std::string name, value;
   } names[] = {{"{host}", camera.host()},
                {"{port}", std::to_string(camera.port())},
-               {"{udp}", std::to_string(ntohs(address.sin_port))},
-               {"{udp+1}", std::to_string(ntohs(address.sin_port) + 1)}};
+               {"{udp}", std::to_string(port)},
+               {"{udp+1}", std::to_string(port + 1)}};
   for (const auto& name : names) {
     for (std::size_t at = 0; (at = expected.find(name.name)) != std::string::npos;) {
       expected.replace(at, name.name.size(), name.value);

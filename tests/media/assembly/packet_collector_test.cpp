@@ -94,89 +94,84 @@ std::vector<std::uint32_t> timestamps_of(std::initializer_list<ModelPicture> pic
   return all;
 }
 
-TEST(PacketCollector, PicturesInOrderAreHandedOutWhenTheirMarkerArrives) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(3);
-  const ModelPicture delta = stream.delta_picture(2);
-  Collection collection;
-  collection.arrive_without(key, key.packets.size() - 1);
-  EXPECT_TRUE(collection.shown().empty());
-  collection.arrive(key.packets.back());
-  EXPECT_EQ(collection.shown(), timestamps_of({key}));
-  collection.arrive(delta);
-  EXPECT_EQ(collection.shown(), timestamps_of({key, delta}));
-  EXPECT_EQ(collection.listed(), 0u);
+/// A camera's stream, and what is collected of it.
+class PacketCollection : public testing::Test {
+ protected:
+  ModelStream stream_;
+  Collection collection_;
+};
+
+/// The same after the stream's first picture.
+class PacketCollectionAfterAKey : public PacketCollection {
+ protected:
+  PacketCollectionAfterAKey() { collection_.arrive(key_); }
+
+  const ModelPicture key_ = stream_.key_picture(2);
+};
+
+TEST_F(PacketCollection, PicturesInOrderAreHandedOutWhenTheirMarkerArrives) {
+  const ModelPicture key = stream_.key_picture(3);
+  const ModelPicture delta = stream_.delta_picture(2);
+  collection_.arrive_without(key, key.packets.size() - 1);
+  EXPECT_TRUE(collection_.shown().empty());
+  collection_.arrive(key.packets.back());
+  EXPECT_EQ(collection_.shown(), timestamps_of({key}));
+  collection_.arrive(delta);
+  EXPECT_EQ(collection_.shown(), timestamps_of({key, delta}));
+  EXPECT_EQ(collection_.listed(), 0u);
 }
 
-TEST(PacketCollector, PicturesBeforeTheFirstKeyPictureAreDropped) {
-  ModelStream stream;
-  const ModelPicture early = stream.delta_picture(2);
-  const ModelPicture key = stream.key_picture(2);
-  Collection collection;
-  collection.arrive(early);
-  EXPECT_TRUE(collection.shown().empty());
-  EXPECT_EQ(collection.listed(), 0u);
-  collection.arrive(key);
-  EXPECT_EQ(collection.shown(), timestamps_of({key}));
+TEST_F(PacketCollection, PicturesBeforeTheFirstKeyPictureAreDropped) {
+  const ModelPicture early = stream_.delta_picture(2);
+  const ModelPicture key = stream_.key_picture(2);
+  collection_.arrive(early);
+  EXPECT_TRUE(collection_.shown().empty());
+  EXPECT_EQ(collection_.listed(), 0u);
+  collection_.arrive(key);
+  EXPECT_EQ(collection_.shown(), timestamps_of({key}));
 }
 
-TEST(PacketCollector, ALostPacketCostsItsPictureAndThoseUpToTheNextKeyPicture) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(2);
-  const ModelPicture broken = stream.delta_picture(4);
-  const ModelPicture follower = stream.delta_picture(2);
-  const ModelPicture next_key = stream.key_picture(2);
-  const ModelPicture after = stream.delta_picture(2);
-  Collection collection;
-  collection.arrive(key);
-  collection.arrive_without(broken, 1);
-  collection.arrive(follower);
-  collection.arrive(next_key);
-  collection.arrive(after);
-  EXPECT_EQ(collection.shown(), timestamps_of({key}));
-  collection.pass(milliseconds(200));
-  EXPECT_EQ(collection.shown(), timestamps_of({key, next_key, after}));
+TEST_F(PacketCollectionAfterAKey, ALostPacketCostsItsPictureAndThoseUpToTheNextKeyPicture) {
+  const ModelPicture broken = stream_.delta_picture(4);
+  const ModelPicture follower = stream_.delta_picture(2);
+  const ModelPicture next_key = stream_.key_picture(2);
+  const ModelPicture after = stream_.delta_picture(2);
+  collection_.arrive_without(broken, 1);
+  collection_.arrive(follower);
+  collection_.arrive(next_key);
+  collection_.arrive(after);
+  EXPECT_EQ(collection_.shown(), timestamps_of({key_}));
+  collection_.pass(milliseconds(200));
+  EXPECT_EQ(collection_.shown(), timestamps_of({key_, next_key, after}));
 }
 
-TEST(PacketCollector, AKeyPictureAfterAGapIsHeldBackFor200MillisecondsAndNoLonger) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(2);
-  stream.delta_picture(2);  // never arrives
-  const ModelPicture next_key = stream.key_picture(2);
-  Collection collection;
-  collection.arrive(key);
-  collection.arrive(next_key);
-  collection.pass(milliseconds(199));
-  EXPECT_EQ(collection.shown(), timestamps_of({key}));
-  collection.pass(milliseconds(1));
-  EXPECT_EQ(collection.shown(), timestamps_of({key, next_key}));
+TEST_F(PacketCollectionAfterAKey, AKeyPictureAfterAGapIsHeldBackFor200MillisecondsAndNoLonger) {
+  stream_.delta_picture(2);  // never arrives
+  const ModelPicture next_key = stream_.key_picture(2);
+  collection_.arrive(next_key);
+  collection_.pass(milliseconds(199));
+  EXPECT_EQ(collection_.shown(), timestamps_of({key_}));
+  collection_.pass(milliseconds(1));
+  EXPECT_EQ(collection_.shown(), timestamps_of({key_, next_key}));
 }
 
-TEST(PacketCollector, WhatArrivesLateWithinThe200MillisecondsLosesNoPicture) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(2);
-  const ModelPicture late = stream.delta_picture(3);
-  const ModelPicture next_key = stream.key_picture(2);
-  Collection collection;
-  collection.arrive(key);
-  collection.arrive_without(late, 0);
-  collection.arrive(next_key);
-  collection.pass(milliseconds(150));
-  collection.arrive(late.packets[0]);
-  EXPECT_EQ(collection.shown(), timestamps_of({key, late, next_key}));
+TEST_F(PacketCollectionAfterAKey, WhatArrivesLateWithinThe200MillisecondsLosesNoPicture) {
+  const ModelPicture late = stream_.delta_picture(3);
+  const ModelPicture next_key = stream_.key_picture(2);
+  collection_.arrive_without(late, 0);
+  collection_.arrive(next_key);
+  collection_.pass(milliseconds(150));
+  collection_.arrive(late.packets[0]);
+  EXPECT_EQ(collection_.shown(), timestamps_of({key_, late, next_key}));
 }
 
-TEST(PacketCollector, ACompletePictureAfterAGapWaitsForWhatIsMissing) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(2);
-  const ModelPicture late = stream.delta_picture(1);
-  const ModelPicture delta = stream.delta_picture(2);
-  Collection collection;
-  collection.arrive(key);
-  collection.arrive(delta);
-  EXPECT_EQ(collection.shown(), timestamps_of({key}));
-  collection.arrive(late);
-  EXPECT_EQ(collection.shown(), timestamps_of({key, late, delta}));
+TEST_F(PacketCollectionAfterAKey, ACompletePictureAfterAGapWaitsForWhatIsMissing) {
+  const ModelPicture late = stream_.delta_picture(1);
+  const ModelPicture delta = stream_.delta_picture(2);
+  collection_.arrive(delta);
+  EXPECT_EQ(collection_.shown(), timestamps_of({key_}));
+  collection_.arrive(late);
+  EXPECT_EQ(collection_.shown(), timestamps_of({key_, late, delta}));
 }
 
 TEST(PacketCollector, ExactlyOnePointTwoSecondsOldIsRemovedAndOneTickLessIsNot) {
@@ -197,25 +192,20 @@ TEST(PacketCollector, ExactlyOnePointTwoSecondsOldIsRemovedAndOneTickLessIsNot) 
   }
 }
 
-TEST(PacketCollector, TheAgeLimitEndsTheWaitAndTheNextKeyPictureStartsAfresh) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(2);
-  const ModelPicture broken = stream.delta_picture(3);
-  Collection collection;
-  collection.arrive(key);
-  collection.arrive_without(broken, 0);
-  for (int i = 0; i < 30; ++i) collection.arrive(stream.delta_picture(2));
-  EXPECT_EQ(collection.shown(), timestamps_of({key}));
-  EXPECT_TRUE(collection.collector().waiting_for_key());
-  EXPECT_EQ(collection.listed(), 0u);
-  const ModelPicture next_key = stream.key_picture(2);
-  collection.arrive(next_key);
-  EXPECT_EQ(collection.shown(), timestamps_of({key, next_key}));
+TEST_F(PacketCollectionAfterAKey, TheAgeLimitEndsTheWaitAndTheNextKeyPictureStartsAfresh) {
+  const ModelPicture broken = stream_.delta_picture(3);
+  collection_.arrive_without(broken, 0);
+  for (int i = 0; i < 30; ++i) collection_.arrive(stream_.delta_picture(2));
+  EXPECT_EQ(collection_.shown(), timestamps_of({key_}));
+  EXPECT_TRUE(collection_.collector().waiting_for_key());
+  EXPECT_EQ(collection_.listed(), 0u);
+  const ModelPicture next_key = stream_.key_picture(2);
+  collection_.arrive(next_key);
+  EXPECT_EQ(collection_.shown(), timestamps_of({key_, next_key}));
 }
 
-TEST(PacketCollector, AClockWithoutARateSetsNoAge) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(2);
+TEST_F(PacketCollection, AClockWithoutARateSetsNoAge) {
+  const ModelPicture key = stream_.key_picture(2);
   std::vector<SPacketInfo> list;
   for (const int rate : {0, -90000}) {
     PacketCollector collector(list, kH264Rules);
@@ -225,33 +215,29 @@ TEST(PacketCollector, AClockWithoutARateSetsNoAge) {
   }
 }
 
-TEST(PacketCollector, DuplicatesOfListedAndOfUsedPacketsAreDiscarded) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(3);
-  const ModelPicture delta = stream.delta_picture(3);
-  Collection collection;
+TEST_F(PacketCollection, DuplicatesOfListedAndOfUsedPacketsAreDiscarded) {
+  const ModelPicture key = stream_.key_picture(3);
+  const ModelPicture delta = stream_.delta_picture(3);
   for (const SPacketInfo& packet : key.packets) {
-    collection.arrive(packet);
-    collection.arrive(packet);
+    collection_.arrive(packet);
+    collection_.arrive(packet);
   }
-  collection.arrive(key);  // once more, all of it
-  collection.arrive(delta);
-  EXPECT_EQ(collection.shown(), timestamps_of({key, delta}));
-  EXPECT_EQ(collection.listed(), 0u);
+  collection_.arrive(key);  // once more, all of it
+  collection_.arrive(delta);
+  EXPECT_EQ(collection_.shown(), timestamps_of({key, delta}));
+  EXPECT_EQ(collection_.listed(), 0u);
 }
 
-TEST(PacketCollector, ALateDuplicateDoesNotBlockAStreamThatWaitsForAKeyPicture) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(3);
-  const ModelPicture broken = stream.delta_picture(3);
-  Collection collection;
-  collection.arrive(key);
-  collection.arrive_without(broken, 1);
-  for (int i = 0; i < 31; ++i) collection.arrive(stream.delta_picture(2));
-  collection.arrive(key.packets[1]);
-  const ModelPicture next_key = stream.key_picture(2);
-  collection.arrive(next_key);
-  EXPECT_EQ(collection.shown(), timestamps_of({key, next_key}));
+TEST_F(PacketCollection, ALateDuplicateDoesNotBlockAStreamThatWaitsForAKeyPicture) {
+  const ModelPicture key = stream_.key_picture(3);
+  const ModelPicture broken = stream_.delta_picture(3);
+  collection_.arrive(key);
+  collection_.arrive_without(broken, 1);
+  for (int i = 0; i < 31; ++i) collection_.arrive(stream_.delta_picture(2));
+  collection_.arrive(key.packets[1]);
+  const ModelPicture next_key = stream_.key_picture(2);
+  collection_.arrive(next_key);
+  EXPECT_EQ(collection_.shown(), timestamps_of({key, next_key}));
 }
 
 TEST(PacketCollector, AKeyPictureWhoseFirstPacketIsLostIsNeverHandedOut) {
@@ -269,13 +255,11 @@ TEST(PacketCollector, AKeyPictureWhoseFirstPacketIsLostIsNeverHandedOut) {
   }
 }
 
-TEST(PacketCollector, AtTheStartAKeyPictureWithoutItsFirstPacketIsNotTaken) {
-  ModelStream stream;
-  const ModelPicture damaged = stream.key_picture(4);
-  Collection collection;
-  collection.arrive_without(damaged, 0);
-  collection.pass(milliseconds(500));
-  EXPECT_TRUE(collection.shown().empty());
+TEST_F(PacketCollection, AtTheStartAKeyPictureWithoutItsFirstPacketIsNotTaken) {
+  const ModelPicture damaged = stream_.key_picture(4);
+  collection_.arrive_without(damaged, 0);
+  collection_.pass(milliseconds(500));
+  EXPECT_TRUE(collection_.shown().empty());
 }
 
 /// A stream whose key pictures are known to open with parameter sets, then lost pictures, then a bare key picture,
@@ -288,100 +272,84 @@ struct BareKeyBehindAGap {
   ModelPicture bare = source.bare_key_picture();
 };
 
-TEST(PacketCollector, ALatePacketProvesTheFrontOfTheKeyPictureThatFollowsIt) {
+TEST_F(PacketCollection, ALatePacketProvesTheFrontOfTheKeyPictureThatFollowsIt) {
   BareKeyBehindAGap stream;
-  Collection collection;
-  collection.arrive(stream.key);
-  collection.arrive(stream.bare);
-  collection.pass(milliseconds(500));
-  EXPECT_EQ(collection.shown(), timestamps_of({stream.key})) << "nothing proves it yet";
-  collection.arrive(stream.late.packets[1]);
-  collection.pass(milliseconds(199));
-  EXPECT_EQ(collection.shown(), timestamps_of({stream.key}));
-  collection.pass(milliseconds(1));
-  EXPECT_EQ(collection.shown(), timestamps_of({stream.key, stream.bare}));
+  collection_.arrive(stream.key);
+  collection_.arrive(stream.bare);
+  collection_.pass(milliseconds(500));
+  EXPECT_EQ(collection_.shown(), timestamps_of({stream.key})) << "nothing proves it yet";
+  collection_.arrive(stream.late.packets[1]);
+  collection_.pass(milliseconds(199));
+  EXPECT_EQ(collection_.shown(), timestamps_of({stream.key}));
+  collection_.pass(milliseconds(1));
+  EXPECT_EQ(collection_.shown(), timestamps_of({stream.key, stream.bare}));
 }
 
-TEST(PacketCollector, AFrontOnceProvenStaysProvenWhenItsProofIsOverwritten) {
+TEST_F(PacketCollection, AFrontOnceProvenStaysProvenWhenItsProofIsOverwritten) {
   BareKeyBehindAGap stream;
-  Collection collection;
-  collection.arrive(stream.key);
-  collection.arrive(stream.late.packets[1]);
-  collection.arrive(stream.bare);
-  collection.collector().drop_overwritten({{0, timestamp_of(stream.late), stream.late.packets[1].sequence}});
-  collection.pass(milliseconds(200));
-  EXPECT_EQ(collection.shown(), timestamps_of({stream.key, stream.bare}));
+  collection_.arrive(stream.key);
+  collection_.arrive(stream.late.packets[1]);
+  collection_.arrive(stream.bare);
+  collection_.collector().drop_overwritten({{0, timestamp_of(stream.late), stream.late.packets[1].sequence}});
+  collection_.pass(milliseconds(200));
+  EXPECT_EQ(collection_.shown(), timestamps_of({stream.key, stream.bare}));
 }
 
-TEST(PacketCollector, AProvenFrontDoesNotSpeakForAPictureWhoseFirstPacketIsOverwritten) {
+TEST_F(PacketCollection, AProvenFrontDoesNotSpeakForAPictureWhoseFirstPacketIsOverwritten) {
   BareKeyBehindAGap stream;
-  Collection collection;
-  collection.arrive(stream.key);
-  collection.arrive(stream.late.packets[1]);
-  collection.arrive(stream.bare);
-  collection.collector().drop_overwritten({{0, timestamp_of(stream.late), stream.late.packets[1].sequence},
-                                           {0, timestamp_of(stream.bare), stream.bare.packets[0].sequence}});
-  collection.pass(milliseconds(500));
-  EXPECT_EQ(collection.shown(), timestamps_of({stream.key}));
+  collection_.arrive(stream.key);
+  collection_.arrive(stream.late.packets[1]);
+  collection_.arrive(stream.bare);
+  collection_.collector().drop_overwritten({{0, timestamp_of(stream.late), stream.late.packets[1].sequence},
+                                            {0, timestamp_of(stream.bare), stream.bare.packets[0].sequence}});
+  collection_.pass(milliseconds(500));
+  EXPECT_EQ(collection_.shown(), timestamps_of({stream.key}));
 }
 
-TEST(PacketCollector, AnAbandonedPictureIsUsedUpAndAKeyPictureMustCome) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(2);
+TEST_F(PacketCollection, AnAbandonedPictureIsUsedUpAndAKeyPictureMustCome) {
+  const ModelPicture key = stream_.key_picture(2);
   std::vector<SPacketInfo> list;
   PacketCollector collector(list, kH264Rules);
   for (const SPacketInfo& packet : key.packets) collector.add(packet, ModelStream::kClockRate, Instant{});
   collector.abandon(*collector.next_picture(Instant{}));
   EXPECT_TRUE(list.empty());
   EXPECT_TRUE(collector.waiting_for_key());
-  for (const SPacketInfo& packet : stream.delta_picture(2).packets) {
+  for (const SPacketInfo& packet : stream_.delta_picture(2).packets) {
     collector.add(packet, ModelStream::kClockRate, Instant{});
   }
   EXPECT_FALSE(collector.next_picture(Instant{}).has_value());
   EXPECT_TRUE(list.empty());
-  for (const SPacketInfo& packet : stream.key_picture(2).packets) {
+  for (const SPacketInfo& packet : stream_.key_picture(2).packets) {
     collector.add(packet, ModelStream::kClockRate, Instant{});
   }
   EXPECT_TRUE(collector.next_picture(Instant{}).has_value());
 }
 
-TEST(PacketCollector, OverwrittenPacketsLeaveTheListAndTheSequenceIsForgotten) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(2);
-  const ModelPicture broken = stream.delta_picture(3);
-  Collection collection;
-  collection.arrive(key);
-  collection.arrive_without(broken, 1);
-  ASSERT_EQ(collection.listed(), 2u);
-  collection.collector().drop_overwritten({{0, timestamp_of(broken), broken.packets[0].sequence}});
-  EXPECT_EQ(collection.listed(), 1u);
-  EXPECT_TRUE(collection.collector().waiting_for_key());
-  const ModelPicture next_key = stream.key_picture(2);
-  collection.arrive(next_key);
-  collection.pass(milliseconds(200));
-  EXPECT_EQ(collection.shown(), timestamps_of({key, next_key}));
+TEST_F(PacketCollectionAfterAKey, OverwrittenPacketsLeaveTheListAndTheSequenceIsForgotten) {
+  const ModelPicture broken = stream_.delta_picture(3);
+  collection_.arrive_without(broken, 1);
+  ASSERT_EQ(collection_.listed(), 2u);
+  collection_.collector().drop_overwritten({{0, timestamp_of(broken), broken.packets[0].sequence}});
+  EXPECT_EQ(collection_.listed(), 1u);
+  EXPECT_TRUE(collection_.collector().waiting_for_key());
+  const ModelPicture next_key = stream_.key_picture(2);
+  collection_.arrive(next_key);
+  collection_.pass(milliseconds(200));
+  EXPECT_EQ(collection_.shown(), timestamps_of({key_, next_key}));
 }
 
-TEST(PacketCollector, AnOverwrittenKeyPictureIsNotHandedOutWhenItsWaitEnds) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(2);
-  stream.delta_picture(1);  // never arrives
-  const ModelPicture next_key = stream.key_picture(3);
-  Collection collection;
-  collection.arrive(key);
-  collection.arrive(next_key);
-  collection.collector().drop_overwritten({{0, timestamp_of(next_key), next_key.packets[0].sequence}});
-  collection.pass(milliseconds(300));
-  EXPECT_EQ(collection.shown(), timestamps_of({key}));
+TEST_F(PacketCollectionAfterAKey, AnOverwrittenKeyPictureIsNotHandedOutWhenItsWaitEnds) {
+  stream_.delta_picture(1);  // never arrives
+  const ModelPicture next_key = stream_.key_picture(3);
+  collection_.arrive(next_key);
+  collection_.collector().drop_overwritten({{0, timestamp_of(next_key), next_key.packets[0].sequence}});
+  collection_.pass(milliseconds(300));
+  EXPECT_EQ(collection_.shown(), timestamps_of({key_}));
 }
 
-TEST(PacketCollector, OverwrittenSlotsOfUsedPacketsChangeNothing) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(2);
-  Collection collection;
-  collection.arrive(key);
-  collection.collector().drop_overwritten({{0, timestamp_of(key), key.packets[0].sequence}});
-  EXPECT_FALSE(collection.collector().waiting_for_key());
+TEST_F(PacketCollectionAfterAKey, OverwrittenSlotsOfUsedPacketsChangeNothing) {
+  collection_.collector().drop_overwritten({{0, timestamp_of(key_), key_.packets[0].sequence}});
+  EXPECT_FALSE(collection_.collector().waiting_for_key());
 }
 
 struct Restart {
@@ -444,82 +412,72 @@ TEST(PacketCollector, ARestartIsFollowedWhateverClockRateTheCameraNames) {
   }
 }
 
-TEST(PacketCollector, ARestartThatBeginsWithAKeyPictureLosesNoPictureOfIt) {
+TEST_F(PacketCollection, ARestartThatBeginsWithAKeyPictureLosesNoPictureOfIt) {
   ModelStream before({.sequence = 30000, .timestamp = 1'000'000'000});
-  Collection collection;
-  collection.arrive(before.key_picture(3));
+  collection_.arrive(before.key_picture(3));
   ModelStream after({.sequence = 100, .timestamp = 50'000'000});
   const ModelPicture key = after.key_picture(3);
-  collection.arrive(key);
-  EXPECT_EQ(collection.shown().back(), timestamp_of(key));
+  collection_.arrive(key);
+  EXPECT_EQ(collection_.shown().back(), timestamp_of(key));
 }
 
-TEST(PacketCollector, LatecomersOfAPictureThatWasGivenUpAreNoRestart) {
-  ModelStream stream;
-  Collection collection;
-  collection.arrive(stream.key_picture(2));
-  const ModelPicture given_up = stream.delta_picture(6);
-  collection.arrive(given_up.packets[0]);
-  const ModelPicture key = stream.key_picture(2);
-  collection.arrive(key);
-  collection.pass(milliseconds(200));
-  for (std::size_t late = 1; late < 5; ++late) collection.arrive(given_up.packets[late]);
-  const ModelPicture delta = stream.delta_picture(2);
-  collection.arrive(delta);
-  EXPECT_EQ(collection.shown().back(), timestamp_of(delta));
+TEST_F(PacketCollection, LatecomersOfAPictureThatWasGivenUpAreNoRestart) {
+  collection_.arrive(stream_.key_picture(2));
+  const ModelPicture given_up = stream_.delta_picture(6);
+  collection_.arrive(given_up.packets[0]);
+  const ModelPicture key = stream_.key_picture(2);
+  collection_.arrive(key);
+  collection_.pass(milliseconds(200));
+  for (std::size_t late = 1; late < 5; ++late) collection_.arrive(given_up.packets[late]);
+  const ModelPicture delta = stream_.delta_picture(2);
+  collection_.arrive(delta);
+  EXPECT_EQ(collection_.shown().back(), timestamp_of(delta));
 }
 
-TEST(PacketCollector, CountsWhatBecameOfEachPacketAndPicture) {
-  ModelStream stream;
-  const ModelPicture early = stream.delta_picture(2);
-  const ModelPicture key = stream.key_picture(2);
-  const ModelPicture broken = stream.delta_picture(3);
-  const ModelPicture next_key = stream.key_picture(2);
-  Collection collection;
-  collection.arrive(early);
-  collection.arrive(key);
-  collection.arrive(key.packets[0]);
-  collection.arrive_without(broken, 1);
-  collection.arrive(next_key);
-  const CollectionCounts& counts = collection.collector().counts();
+TEST_F(PacketCollection, CountsWhatBecameOfEachPacketAndPicture) {
+  const ModelPicture early = stream_.delta_picture(2);
+  const ModelPicture key = stream_.key_picture(2);
+  const ModelPicture broken = stream_.delta_picture(3);
+  const ModelPicture next_key = stream_.key_picture(2);
+  collection_.arrive(early);
+  collection_.arrive(key);
+  collection_.arrive(key.packets[0]);
+  collection_.arrive_without(broken, 1);
+  collection_.arrive(next_key);
+  const CollectionCounts& counts = collection_.collector().counts();
   EXPECT_EQ(counts.pictures_without_key, 1u);
   EXPECT_EQ(counts.duplicated, 1u);
   EXPECT_EQ(counts.pictures_held, 2u);
   EXPECT_EQ(counts.held, 2u + 4u);
-  collection.pass(milliseconds(200));
+  collection_.pass(milliseconds(200));
   EXPECT_EQ(counts.pictures_incomplete, 1u);
   EXPECT_EQ(counts.given_up, 2u);
   EXPECT_EQ(counts.pictures_assembled, 2u);
   EXPECT_EQ(counts.used, 2u + 4u + 4u);
-  collection.arrive(broken.packets[1]);
+  collection_.arrive(broken.packets[1]);
   EXPECT_EQ(counts.late, 1u);
 }
 
-TEST(PacketCollector, WhatIsHeldWhenTheStreamEndsIsCountedSo) {
-  ModelStream stream;
-  const ModelPicture key = stream.key_picture(2);
-  const ModelPicture delta = stream.delta_picture(3);
-  Collection collection;
-  collection.arrive(key);
-  collection.arrive_without(delta, 0);
-  collection.collector().discard_all();
-  collection.expect_counted();
-  EXPECT_EQ(collection.collector().counts().stopped, 2u);
-  EXPECT_EQ(collection.collector().counts().pictures_stopped, 1u);
-  EXPECT_TRUE(collection.collector().is_empty());
+TEST_F(PacketCollectionAfterAKey, WhatIsHeldWhenTheStreamEndsIsCountedSo) {
+  const ModelPicture delta = stream_.delta_picture(3);
+  collection_.arrive_without(delta, 0);
+  collection_.collector().discard_all();
+  collection_.expect_counted();
+  EXPECT_EQ(collection_.collector().counts().stopped, 2u);
+  EXPECT_EQ(collection_.collector().counts().pictures_stopped, 1u);
+  EXPECT_TRUE(collection_.collector().is_empty());
 }
 
-TEST(PacketCollector, APacketThatPartsARunOfEqualPlacesCountsAsTwoPicturesMore) {
+TEST_F(PacketCollection, APacketThatPartsARunOfEqualPlacesCountsAsTwoPicturesMore) {
   ModelStream stream({1, 10'000'005});
   const ModelPicture picture = stream.delta_picture(3);
   SPacketInfo between = picture.packets[1];
   between.timestamp = 5;  // of the same place in the order as 10000005
-  Collection collection;
-  collection.arrive(picture.packets[0]);
-  collection.arrive(picture.packets[2]);
-  EXPECT_EQ(collection.collector().counts().pictures_held, 1u);
-  collection.arrive(between);
-  EXPECT_EQ(collection.collector().counts().pictures_held, 3u);
+  collection_.arrive(picture.packets[0]);
+  collection_.arrive(picture.packets[2]);
+  EXPECT_EQ(collection_.collector().counts().pictures_held, 1u);
+  collection_.arrive(between);
+  EXPECT_EQ(collection_.collector().counts().pictures_held, 3u);
 }
 
 // The channel between camera and driver, and what it must let through.

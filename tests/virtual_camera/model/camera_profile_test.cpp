@@ -7,6 +7,7 @@
 #include <filesystem>
 #include <string>
 
+#include "tests/models/profile_text.h"
 #include "virtual_camera/model/setting_rules.h"
 #include "virtual_camera/model/settings_store.h"
 #include "virtual_camera/wire/message.h"
@@ -16,69 +17,19 @@ namespace {
 
 const std::string kProfileFolder = VEXA_SOURCE_DIR "/models/profiles/";
 
-const std::string kPlainProfile = R"({
-  "description": "plain", "driver": "common", "model": "T-1", "cameraTypes": ["fixed"],
-  "video": {
-    "streams": [{"codec": "H.264", "size": "640x480", "frameRate": 25, "bitRate": 2000}],
-    "codecs": [{"name": "H.264", "sizes": ["640x480", "320x240"], "frameRates": [1, 25], "bitRates": [512, 2000]}]
-  },
-  "io": {"inputs": 1, "outputs": 0}
-})";
-
-std::string mistake_in(const std::string& from, const std::string& to) {
-  std::string text = kPlainProfile;
-  text.replace(text.find(from), from.size(), to);
-  const auto parsed = parse_camera_profile(text, "p.json");
+std::string mistake_in(const std::string& profile) {
+  const auto parsed = parse_camera_profile(profile, "p.json");
   const auto* error = std::get_if<std::string>(&parsed);
   return error == nullptr ? "taken" : *error;
 }
 
 TEST(CameraProfile, NamesFileAndKeyOfWhatItCannotRead) {
-  const struct {
-    const char* from;
-    const char* to;
-    const char* error;
-  } cases[] = {
-      {"\"plain\"", "\"plain again\"", "taken"},
-      {"\"T-1\"", "1", "p.json:2: model: must be a text"},
-      {"\"T-1\"", "\"\"", "p.json:2: model: must have 1 to 64 characters"},
-      {"\"model\": \"T-1\", ", "", "p.json:1: model: is missing"},
-      {"\"common\"", "\"rare\"",
-       "p.json:2: driver: must be one of \"common\", \"heron\", \"marlin\", \"simple-hd\", \"simple-ptz\""},
-      {"\"io\"", "\"oi\"",
-       "p.json:7: oi: is not known here; known are: $schema, description, driver, model, cameraTypes, video, image, "
-       "ptz, "
-       "audio, io, edgeStorage"},
-      {"\"model\"", "\"driver\"", "p.json:2: driver: occurs twice"},
-      {"\"outputs\": 0", "\"inputs\": 1", "p.json:7: inputs: occurs twice"},
-      {"\"inputs\": 1", "\"inputs\": 17", "p.json:7: io.inputs: must be from 0 to 16"},
-      {"\"inputs\": 1", "\"inputs\": 18446744073709551615", "p.json:7: too large"},
-      {"\"inputs\": 1", "\"inputs\": true", "p.json:7: io.inputs: must be a whole number"},
-      {"\"inputs\": 1", "\"inputs\": 1.0", "p.json:7: io.inputs: must be a whole number"},
-      {"\"inputs\": 1, \"outputs\": 0", "\"inputs\": 1,\n \"outputs\": 0,\n \"audioDetection\":\n 1",
-       "p.json:9: io.audioDetection: must be true or false"},
-      {"\"size\": \"640x480\"", "\"size\": \"640*480\"",
-       "p.json:4: video.streams[0].size: must be WIDTHxHEIGHT in pixels, for instance \"640x480\""},
-      {"\"size\": \"640x480\"", "\"size\": \"800x600\"",
-       "p.json:4: video.streams[0].size: is not one of those that the codec offers"},
-      {"\"codec\": \"H.264\"", "\"codec\": \"JPEG\"",
-       "p.json:4: video.streams[0].codec: is not one of the camera's codecs"},
-      {"[1, 25]", "[25,\n 1]", "p.json:6: video.codecs[0].frameRates[1]: must be above the one before it"},
-      {"[1, 25]", "[]", "p.json:5: video.codecs[0].frameRates: must have 1 to 32 items"},
-      {"[1, 25]", "25", "p.json:5: video.codecs[0].frameRates: must be a list"},
-      {"\"bitRates\"", "\"qualities\": [1], \"bitRates\"", "p.json:5: video.codecs[0].qualities: is for JPEG only"},
-      {"\"640x480\", \"320x240\"", "\"640x480\", \"640x480\"",
-       "p.json:5: video.codecs[0].sizes[1]: occurs twice in its list"},
-      {"[\"fixed\"]", "[\"ptz\"]",
-       "p.json:2: cameraTypes: must name \"ptz\" exactly when the profile has a part \"ptz\""},
-      {"\"io\": {", "\"io\": [", "p.json:7: not JSON: something is missing, too many or misspelt here"}};
-  for (const auto& c : cases) EXPECT_EQ(mistake_in(c.from, c.to), c.error);
+  EXPECT_EQ(mistake_in(vexa_test::kSmallProfile), "taken");
+  EXPECT_EQ(mistake_in(vexa_test::changed_profile("\"inputs\": 1", "\"inputs\": 17")),
+            "p.json:18: io.inputs: must be from 0 to 16");
+  EXPECT_EQ(mistake_in("[]"), "p.json:1: must be an object");
   EXPECT_EQ(std::get<std::string>(load_camera_profile("/nowhere.json")),
             "/nowhere.json: cannot be read: No such file or directory");
-  EXPECT_EQ(std::get<std::string>(parse_camera_profile("[]", "p.json")), "p.json:1: must be an object");
-  const std::string deep(17, '[');
-  EXPECT_EQ(std::get<std::string>(parse_camera_profile(deep + std::string(17, ']'), "p.json")),
-            "p.json:1: nested too deeply");
 }
 
 TEST(CameraProfile, ReadsEveryProfileThatIsShipped) {

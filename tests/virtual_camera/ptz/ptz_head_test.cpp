@@ -5,7 +5,6 @@
 
 #include <gtest/gtest.h>
 
-#include <functional>
 #include <map>
 #include <string>
 
@@ -44,6 +43,15 @@ class PtzHeadTest : public testing::Test {
     ASSERT_TRUE(presets(60, "PresetSet=2,middle,on"));
     ASSERT_TRUE(move(60, "AbsolutePanTilt=03E8,0000,20"));
     ASSERT_TRUE(presets(100, "PresetSet=3,right,off"));
+  }
+
+  // A shadow tour B: right for two seconds, then zoomed in.
+  void record_a_tour() {
+    ASSERT_TRUE(presets(10, "STourRecord=B"));
+    ASSERT_TRUE(move(11, "Move=right,24"));
+    ASSERT_TRUE(move(13, "Move=stop,motor"));
+    ASSERT_TRUE(move(15, "AbsoluteZoom=0FA0"));
+    ASSERT_TRUE(presets(24.5, "STourRecord=stop"));
   }
 
   PtzHead::Time start_ = PtzHead::Time(std::chrono::hours(1000));
@@ -290,17 +298,8 @@ TEST_F(PtzHeadTest, AModelWithoutToursHasNoSettingsOfThem) {
   EXPECT_EQ(head.preset_settings(at(0)), (PtzHead::Pairs{{"PresetNum", "0"}}));
 }
 
-// Right for two seconds, then zoomed in.
-void record_a_tour(PtzHead& head, const std::function<PtzHead::Time(double)>& at) {
-  ASSERT_TRUE(head.command_presets({{"STourRecord", "B"}}, at(10)));
-  ASSERT_TRUE(head.move({{"Move", "right,24"}}, {}, at(11)));
-  ASSERT_TRUE(head.move({{"Move", "stop,motor"}}, {}, at(13)));
-  ASSERT_TRUE(head.move({{"AbsoluteZoom", "0FA0"}}, {}, at(15)));
-  ASSERT_TRUE(head.command_presets({{"STourRecord", "stop"}}, at(24.5)));
-}
-
 TEST_F(PtzHeadTest, AShadowTourIsPlayedAsItWasRecorded) {
-  record_a_tour(head_, [this](double seconds) { return at(seconds); });
+  record_a_tour();
   EXPECT_EQ(setting(25, "STourBRecordedTime"), "15") << "seconds begun";
   EXPECT_EQ(setting(25, "STourARecordedTime"), "none");
   std::map<double, PtzPlace> recorded;
@@ -321,7 +320,7 @@ TEST_F(PtzHeadTest, AShadowTourIsPlayedAsItWasRecorded) {
 }
 
 TEST_F(PtzHeadTest, APreviewPlaysOnce) {
-  record_a_tour(head_, [this](double seconds) { return at(seconds); });
+  record_a_tour();
   const PtzPlace end = head_.place(at(30));
   ASSERT_TRUE(move(30, "AbsolutePanTilt=1000,0000,20"));
   ASSERT_TRUE(presets(60, "STourPreview=B"));
@@ -331,7 +330,7 @@ TEST_F(PtzHeadTest, APreviewPlaysOnce) {
 }
 
 TEST_F(PtzHeadTest, APreviewCanBeStopped) {
-  record_a_tour(head_, [this](double seconds) { return at(seconds); });
+  record_a_tour();
   ASSERT_TRUE(presets(60, "STourPreview=B"));
   ASSERT_TRUE(presets(61, "STourPreview=stop"));
   const PtzPlace place = head_.place(at(63));
