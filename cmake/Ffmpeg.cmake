@@ -1,6 +1,7 @@
 # vexa_ffmpeg: FFmpeg's libraries, for the virtual camera's live pictures and vexactl's containers. Debian has them for the
-# machine's own word size; builds without them have no such target and no VEXA_WITH_FFMPEG, and work without those parts.
-if(CMAKE_SIZEOF_VOID_P EQUAL 8)
+# machine's own word size, not for -m32; builds without them have no such target and no VEXA_WITH_FFMPEG, and work without
+# those parts.
+if(NOT CMAKE_CXX_FLAGS MATCHES "-m32")
   if(VEXA_REQUIRE_ALL)
     find_package(PkgConfig REQUIRED)
     pkg_check_modules(VEXA_FFMPEG REQUIRED IMPORTED_TARGET libavcodec libavformat libavutil libswscale)

@@ -1,10 +1,15 @@
-# What a host developer gets: headers, both libraries, a CMake package and a pkg-config file.
+# What a host developer gets: headers, the libraries, a CMake package, pkg-config files, the licence and the documents.
 include(CMakePackageConfigHelpers)
 
 set_target_properties(VexaCommon VexaCommonFilter PROPERTIES INSTALL_RPATH "$ORIGIN")
 install(TARGETS VexaCommon VexaCommonFilter EXPORT VexaCommonTargets
   LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/vexa DESTINATION ${CMAKE_INSTALL_INCLUDEDIR} FILES_MATCHING PATTERN "*.h")
+install(FILES ${PROJECT_SOURCE_DIR}/LICENSE ${PROJECT_SOURCE_DIR}/NOTICE ${PROJECT_SOURCE_DIR}/README.md
+  ${PROJECT_SOURCE_DIR}/CHANGELOG.md DESTINATION ${CMAKE_INSTALL_DOCDIR})
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/docs DESTINATION ${CMAKE_INSTALL_DOCDIR}
+  FILES_MATCHING PATTERN "*.md" PATTERN "*.png")
+install(DIRECTORY ${PROJECT_SOURCE_DIR}/host/example DESTINATION ${CMAKE_INSTALL_DOCDIR})
 install(EXPORT VexaCommonTargets NAMESPACE Vexa:: DESTINATION ${CMAKE_INSTALL_LIBDIR}/cmake/VexaCommon)
 
 configure_package_config_file(cmake/VexaCommonConfig.cmake.in ${CMAKE_BINARY_DIR}/VexaCommonConfig.cmake

@@ -13,7 +13,7 @@ vexa_batch(vexa_objects)
 vexa_check_locks(vexa_objects)
 vexa_measure(vexa_objects)
 
-add_library(vexa_testable STATIC $<TARGET_OBJECTS:vexa_objects>)
+add_library(vexa_testable STATIC EXCLUDE_FROM_ALL $<TARGET_OBJECTS:vexa_objects>)
 target_include_directories(vexa_testable PUBLIC ${PROJECT_SOURCE_DIR}/include ${PROJECT_SOURCE_DIR})
 target_link_libraries(vexa_testable PUBLIC VexaCommonFilter Threads::Threads ${CMAKE_DL_LIBS})
 
@@ -30,5 +30,7 @@ if(NOT VEXA_SANITIZE)
 endif()
 set_target_properties(VexaCommon PROPERTIES SOVERSION ${PROJECT_VERSION_MAJOR} VERSION ${PROJECT_VERSION}
   EXPORT_NAME Common LINK_DEPENDS ${vexa_version_script})
+
+vexa_static(VexaCommon vexa_objects VexaCommonFilterStatic Threads::Threads ${CMAKE_DL_LIBS})
 
 include(cmake/Install.cmake)

@@ -1,7 +1,5 @@
 // Alarm pins: what the camera has, the polled stream of their states, and the outputs.
 #include <cerrno>
-#include <chrono>
-#include <thread>
 #include <utility>
 
 #include "device/cgi/alarm_text.h"
@@ -16,7 +14,11 @@ namespace {
 constexpr int kAlarmRequestTimeout = 10000;  // milliseconds
 constexpr int kFailedStreamTimeout = 3000;   // milliseconds
 constexpr int kSilenceGrace = 15000;         // milliseconds
-constexpr std::chrono::milliseconds kAlarmDataSettles{100};
+constexpr int kAlarmDataSettles = 100;       // milliseconds
+
+std::int64_t patience_of(vexa::Connection& connection) {
+  return vexa::whole_seconds(connection.timeout()) + kSilenceGrace;
+}
 
 ELibDReturnCode ask_tampering(vexa::CameraLink& camera, int number, SLibDIoBoxInfo& info) {
   std::string answer;
@@ -36,12 +38,14 @@ ELibDReturnCode ask_audio_detection(vexa::CameraLink& camera, int number, SLibDI
 }  // namespace
 
 ELibDReturnCode CVexaCommon::GetFixedIoboxInfo(SLibDFixedIoBoxInfo& info) {
-  if (!m_FixedIoBoxInfoAvailable) return LIBD_NOT_SUPPORTED;
+  vexa::Operation operation(*m_State, __func__);
+  if (!m_FixedIoBoxInfoAvailable) return operation.returns(LIBD_NOT_SUPPORTED);
   info = m_FixedIoBoxInfo;
   return LIBD_OK;
 }
 
 ELibDReturnCode CVexaCommon::GetIoBoxInfo(SLibDIoBoxInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     // Kept: the list is not emptied first; hosts hand in an empty one.
     vexa::append_pins(m_FixedIoBoxInfo, info.pins);
@@ -63,20 +67,21 @@ ELibDReturnCode CVexaCommon::GetIoBoxInfo(SLibDIoBoxInfo& info) {
 }
 
 ELibDReturnCode CVexaCommon::StartIoStreaming() {
+  vexa::Operation operation(*m_State, __func__);
   StopIoStreaming();
   {
     const vexa::RaisedTimeout slow = m_State->connection.raised(kAlarmRequestTimeout);
     const ELibDReturnCode sent = m_State->camera.send("/command/system.cgi?AlarmData=on");
     if (sent != LIBD_OK) return sent;
   }
-  std::this_thread::sleep_for(kAlarmDataSettles);
+  vexa::WaitBudget(m_State->limit(kAlarmDataSettles)).pause();
   const ELibDReturnCode opened = m_State->open_alarms();
   if (opened != LIBD_OK) return opened;
   std::string answer;
   if (m_State->camera.inquire("sensor", answer) != LIBD_OK) {
     // Kept: the stop has an exchange of its own, and its outcome is the one that is returned.
     const ELibDReturnCode stopped = StopIoStreaming();
-    return stopped == LIBD_OK ? LIBD_FAILED : stopped;
+    return operation.returns(stopped == LIBD_OK ? LIBD_FAILED : stopped);
   }
   std::vector<SLibDPinInfo> pins;
   if (!vexa::within_memory([&] { pins = vexa::sensor_pins(answer); })) {
@@ -85,11 +90,12 @@ ELibDReturnCode CVexaCommon::StartIoStreaming() {
   }
   const vexa::TurnGuard guard(m_IoStreamLock, m_State->alarms.turn());
   m_PendingPins = std::move(pins);
-  m_LastIoDataTime = m_State->now();
+  m_State->alarms.note_other_data(!m_PendingPins.empty(), m_State->now, patience_of(m_State->connection));
   return LIBD_OK;
 }
 
 ELibDReturnCode CVexaCommon::StopIoStreaming() {
+  vexa::Operation operation(*m_State, __func__);
   const bool was_open = m_State->alarms.stop();
   {
     const vexa::TurnGuard guard(m_IoStreamLock, m_State->alarms.turn());
@@ -104,7 +110,7 @@ ELibDReturnCode CVexaCommon::GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>&
       const vexa::TurnGuard guard(m_IoStreamLock, m_State->alarms.turn());
       if (m_IoStreamSocket != -1 && !m_PendingPins.empty()) {
         pins = std::exchange(m_PendingPins, {});
-        m_LastIoDataTime = m_State->now();
+        m_State->alarms.note_other_data(false, m_State->now, patience_of(m_State->connection));
         return LIBD_OK;
       }
     }
@@ -116,8 +122,7 @@ ELibDReturnCode CVexaCommon::GetCurrentIoStatusDetail(std::vector<SLibDPinInfo>&
       if (part && *part > 0) vexa::take_status_pins(masks, m_FixedIoBoxInfo, pins);
       return part;
     };
-    const std::int64_t patience = vexa::whole_seconds(m_State->connection.timeout()) + kSilenceGrace;
-    const vexa::Outcome polled = m_State->alarms.poll(read, m_State->now, patience);
+    const vexa::Outcome polled = m_State->alarms.poll(read, m_State->now, patience_of(m_State->connection));
     return polled && *polled == LIBD_OK && pins.empty() ? vexa::Outcome(LIBD_NO_FRAME) : polled;
   });
 }
@@ -135,6 +140,7 @@ int CVexaCommon::http_multipart_input_recv(int socket, unsigned int& mask, unsig
 }
 
 ELibDReturnCode CVexaCommon::GetCurrentIoStatus(std::vector<SLibDPinInfo>& pins) {
+  vexa::Operation operation(*m_State, __func__);
   const ELibDReturnCode read = GetCurrentIoStatusDetail(pins);
   if (read != LIBD_OK) return read;
   for (const SLibDPinInfo& pin : pins) {
@@ -146,6 +152,7 @@ ELibDReturnCode CVexaCommon::GetCurrentIoStatus(std::vector<SLibDPinInfo>& pins)
 }
 
 ELibDReturnCode CVexaCommon::SetOutput(SLibDPinInfo& pin) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->camera.send("/command/main.cgi?Trigger=alarmout%d%s", pin.number, pin.state != 0 ? "on" : "off");
 }
 
@@ -153,8 +160,9 @@ namespace vexa {
 
 ELibDReturnCode DriverState::open_alarms() {
   const ELibDReturnCode opened = errors.run([&] {
+    const std::int64_t patience = patience_of(connection);
     const RaisedTimeout slow = connection.raised(kAlarmRequestTimeout);
-    return alarms.start([&] { return camera.open("/command/alarmdata.cgi?interval=1"); }, now);
+    return alarms.start([&] { return camera.open("/command/alarmdata.cgi?interval=1"); }, now, patience);
   });
   if (opened == LIBD_OK) return LIBD_OK;
   const Guard guard(driver.m_ConnectionLock);
@@ -166,7 +174,7 @@ ELibDReturnCode DriverState::open_alarms() {
 Result<int> DriverState::read_alarm_part(int socket, PinMasks& masks) {
   errors.clear();
   char part[kPartHeaderRoom];
-  const auto length = receive_header(socket, part, connection.timeout());
+  const auto length = receive_header(socket, part, limit());
   if (!length || *length == 0) return length;
   const MotionReport motion{vmd_type() != LIBD_VMD_WINDOW, driver.m_UseMotionDetection};
   masks = parse_input_part({part, static_cast<std::size_t>(*length)}, motion);

@@ -1,8 +1,11 @@
 #include "device/camera_link.h"
 
 #include <cstdarg>
+#include <cstdio>
 #include <utility>
 
+#include "device/operation.h"
+#include "runtime/base/result.h"
 #include "runtime/base/text.h"
 #include "transport/failure.h"
 #include "transport/wire/http_request.h"
@@ -32,21 +35,35 @@ int Connection::timeout() {
   return info_.timeout;
 }
 
+void Connection::write_name(std::span<char> room) {
+  const Guard guard(lock_);
+  std::snprintf(room.data(), room.size(), "%s:%d", info_.host.c_str(), info_.port);
+}
+
 RaisedTimeout Connection::raised(int milliseconds) {
   const Guard guard(lock_);
   return {info_.timeout, saved_timeout_, lock_, milliseconds};
 }
 
 // A line begins with its line break, so that the file ends without one.
+//
+// An exchange does not fail for its log: what the camera was asked is done all the same. A line that memory is too
+// short for is missing.
 void CgiLog::write(const char* direction, const char* message) {
-  std::string line = CRealTime::GetTheCurrentTime().Format("\r\n%D-%O-%Y\t%H:%M:%S.%03L\t", false);
-  line.append("CGI\t").append(direction).append("\t").append(message);
-  file_.Log(line.c_str());
+  (void)within_memory([&] {
+    std::string line = CRealTime::GetTheCurrentTime().Format("\r\n%D-%O-%Y\t%H:%M:%S.%03L\t", false);
+    line.append("CGI\t").append(direction).append("\t").append(message);
+    file_.Log(line.c_str());
+  });
 }
+
+HttpPeer CameraLink::peer() { return {connection_.copy(), log_, Operation::cancels_of(errors_)}; }
 
 Result<Socket> CameraLink::open(const std::string& path) {
   errors_.clear();
-  return open_http({connection_.copy(), log_}, path);
+  auto socket = open_http(peer(), path);
+  exchanges_.http(1, socket ? nullptr : &socket.failure());
+  return socket;
 }
 
 ELibDReturnCode CameraLink::send(const char* format, ...) {
@@ -67,7 +84,8 @@ ELibDReturnCode CameraLink::inquire(const std::string& name, std::string& answer
   return errors_.run([&]() -> Outcome {
     const auto size = inquiry_sizes_.find(name);
     if (size == inquiry_sizes_.end()) return LIBD_FAILED;
-    auto received = vexa::inquire({connection_.copy(), log_}, name, size->second);
+    auto received = vexa::inquire(peer(), name, size->second);
+    exchanges_.http(1, received ? nullptr : &received.failure());
     if (!received) return received.failure();
     answer = std::move(*received);
     return LIBD_OK;

@@ -3,9 +3,11 @@
 
 #include <atomic>
 #include <map>
+#include <span>
 #include <string>
 
 #include "device/error_record.h"
+#include "device/exchange_ledger.h"
 #include "runtime/base/sync.h"
 #include "transport/http_exchange.h"
 #include "vexa/file_logger.h"
@@ -38,6 +40,8 @@ class Connection {
 
   SLibDConnectionInfo copy();
   int timeout();
+  /// Writes "HOST:PORT", cut where it does not fit.
+  void write_name(std::span<char> room);
   /// The time-out is `milliseconds` for the life of what this returns.
   RaisedTimeout raised(int milliseconds) VEXA_EXCLUDES(lock_);
 
@@ -64,8 +68,9 @@ class CgiLog final : public ExchangeLog {
 /// most twice.
 class CameraLink {
  public:
-  CameraLink(Connection& connection, CgiLog& log, ErrorRecord& errors, const std::map<std::string, int>& inquiry_sizes)
-      : connection_(connection), log_(log), errors_(errors), inquiry_sizes_(inquiry_sizes) {}
+  CameraLink(Connection& connection, CgiLog& log, ErrorRecord& errors, ExchangeLedger& exchanges,
+             const std::map<std::string, int>& inquiry_sizes)
+      : connection_(connection), log_(log), errors_(errors), exchanges_(exchanges), inquiry_sizes_(inquiry_sizes) {}
 
   /// Requests a path; a new exchange begins. Not recorded: the member that asks does.
   Result<Socket> open(const std::string& path);
@@ -77,9 +82,12 @@ class CameraLink {
   ELibDReturnCode inquire(const std::string& name, std::string& answer);
 
  private:
+  HttpPeer peer();
+
   Connection& connection_;
   CgiLog& log_;
   ErrorRecord& errors_;
+  ExchangeLedger& exchanges_;
   const std::map<std::string, int>& inquiry_sizes_;
 };
 

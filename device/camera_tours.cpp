@@ -4,6 +4,7 @@
 #include "device/driver_state.h"
 
 ELibDReturnCode CVexaCommon::GetCameraTourInfo(SLibDCameraTourInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     std::string answer;
     if (const auto asked = m_State->camera.inquire("presetposition", answer); asked != LIBD_OK) return asked;
@@ -13,6 +14,7 @@ ELibDReturnCode CVexaCommon::GetCameraTourInfo(SLibDCameraTourInfo& info) {
 }
 
 ELibDReturnCode CVexaCommon::SetCameraTourInfo(SLibDCameraTourInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     const auto request =
         vexa::camera_tour_request(info, m_FixedPTZControlInfo.tourCount, m_FixedPTZControlInfo.presetCount);

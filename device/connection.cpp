@@ -6,6 +6,7 @@
 #include "runtime/base/sync.h"
 
 ELibDReturnCode CVexaCommon::GetCurrentConnectionInfo(SLibDConnectionInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     info = m_State->connection.copy();
     return LIBD_OK;
@@ -13,11 +14,13 @@ ELibDReturnCode CVexaCommon::GetCurrentConnectionInfo(SLibDConnectionInfo& info)
 }
 
 ELibDReturnCode CVexaCommon::SetCurrentConnectionInfo(SLibDConnectionInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     SLibDConnectionInfo stored = info;
     const vexa::Guard guard(m_ConnectionLock);
     m_SavedTimeout = stored.timeout;
     m_ConnectionInfo = std::move(stored);
+    // A log that cannot be opened is no failure.
     // Kept: the log is opened on every call, also while logging is off; hosts look for its file.
     m_CGILogger.SetFileName(m_CGILogPath);
     m_CGILogger.OpenFile();

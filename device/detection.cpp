@@ -1,6 +1,8 @@
 // Detection settings, and the switches of the detectors.
 #include "device/cgi/detection_text.h"
 
+#include <utility>
+
 #include "device/cgi/alarm_text.h"
 #include "device/driver_state.h"
 #include "runtime/base/text.h"
@@ -19,31 +21,32 @@ ELibDReturnCode ask_object_detection(vexa::DriverState& state, std::string& answ
 
 ELibDReturnCode CVexaCommon::GetObjectDetectionSetting(std::vector<SLibDDetectionParam>& params,
                                                        ELibDPositionMode& mode) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     std::string answer;
     const ELibDReturnCode asked =
         m_LodDetection ? m_State->camera.inquire("lod", answer) : ask_object_detection(*m_State, answer);
     if (asked != LIBD_OK) return asked;
+    auto settings = m_LodDetection ? vexa::lod_settings(answer)
+                                   : vexa::object_settings(answer, m_FixedPTZControlInfo.presetCount > 0);
     ClearCachedObjectDetectionSetting(params);
-    if (m_LodDetection) {
-      params = vexa::lod_settings(answer);
-      return params.empty() ? LIBD_FAILED : LIBD_OK;
-    }
+    params = std::move(settings);
+    if (m_LodDetection) return params.empty() ? LIBD_FAILED : LIBD_OK;
     mode = vexa::position_mode_of(answer).value_or(mode);
-    params = vexa::object_settings(answer, m_FixedPTZControlInfo.presetCount > 0);
     return LIBD_OK;
   });
 }
 
 ELibDReturnCode CVexaCommon::SetDetectionParam(SLibDDetectionParam& param) {
+  vexa::Operation operation(*m_State, __func__);
   if (!m_LodDetection) {
     int socket = -1;
-    if (CheckDetectionParamDetectionArea(param) != LIBD_OK) return LIBD_INVALID_ARGUMENT;
+    if (CheckDetectionParamDetectionArea(param) != LIBD_OK) return operation.returns(LIBD_INVALID_ARGUMENT);
     return SetObjectDetectionParameter(param, socket);
   }
   std::string size;
-  if (CheckDetectionParamSensitivity(param) != LIBD_OK) return LIBD_INVALID_ARGUMENT;
-  if (ConverObjectWidthValueToString(param, size) != LIBD_OK) return LIBD_INVALID_ARGUMENT;
+  if (CheckDetectionParamSensitivity(param) != LIBD_OK) return operation.returns(LIBD_INVALID_ARGUMENT);
+  if (ConverObjectWidthValueToString(param, size) != LIBD_OK) return operation.returns(LIBD_INVALID_ARGUMENT);
   return m_State->camera.send("/command/lod.cgi?LODMinObjectSize=%s&LODSensitivity=%d", size.c_str(),
                               param.windows[0].sensitivity);
 }
@@ -79,14 +82,16 @@ ELibDReturnCode CVexaCommon::CheckDetectionParamDetectionArea(SLibDDetectionPara
 }
 
 ELibDReturnCode CVexaCommon::SetPositionMode(ELibDPositionMode mode) {
+  vexa::Operation operation(*m_State, __func__);
   // Kept: any mode but preset is the current view; there is no wrong mode.
   const char* word = mode != LIBD_POSITION_PRESET ? "current" : "preset";
   return m_State->camera.send("/command/objectdetection.cgi?PositionMode=%s", word);
 }
 
 ELibDReturnCode CVexaCommon::SetTamperingAlarm(bool on, ELibDTamperLevel level) {
+  vexa::Operation operation(*m_State, __func__);
   const char* word = vexa::word_of(vexa::kTamperWords, level);
-  if (word == nullptr) return LIBD_INVALID_ARGUMENT;
+  if (word == nullptr) return operation.returns(LIBD_INVALID_ARGUMENT);
   {
     const vexa::Guard guard(m_ConnectionLock);
     // Kept: the level is stored before the camera is asked, and stays when it refuses.
@@ -96,12 +101,14 @@ ELibDReturnCode CVexaCommon::SetTamperingAlarm(bool on, ELibDTamperLevel level) 
 }
 
 ELibDReturnCode CVexaCommon::SetAudioDetection(bool on) {
-  if (!m_FixedIoBoxInfo.audioDetection) return LIBD_NOT_SUPPORTED;
+  vexa::Operation operation(*m_State, __func__);
+  if (!m_FixedIoBoxInfo.audioDetection) return operation.returns(LIBD_NOT_SUPPORTED);
   return m_State->camera.send("/command/audiodetection.cgi?ADFunc=%s", on ? "on" : "off");
 }
 
 ELibDReturnCode CVexaCommon::SetVMDtype(ELibDVMDType type) {
-  if (type != LIBD_VMD_WINDOW && type != LIBD_VMD_VMF) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (type != LIBD_VMD_WINDOW && type != LIBD_VMD_VMF) return operation.returns(LIBD_INVALID_ARGUMENT);
   const vexa::Guard guard(m_ConnectionLock);
   m_IoBoxInfo.vmdType = type;
   return LIBD_OK;

@@ -1,5 +1,8 @@
 #include "device/driver_state.h"
 
+#include <chrono>
+
+#include "media/frame_chronicle.h"
 #include "vexa/runtime.h"
 
 namespace vexa {
@@ -9,10 +12,16 @@ DriverState::DriverState(CVexaCommon& owner)
       errors(owner.m_LatestErrorCode, owner.m_LatestErrorText),
       connection(owner.m_ConnectionInfo, owner.m_SavedTimeout, owner.m_ConnectionLock),
       log(owner.m_CGILogger, owner.m_CGILogEnabled),
-      camera(connection, log, errors, owner.m_InquirySizes),
-      audio(owner.m_AudioLock, owner.m_AudioSocket, owner.m_LastAudioTime),
-      alarms(owner.m_IoStreamLock, owner.m_IoStreamSocket, owner.m_LastIoDataTime),
-      metadata(owner.m_MdStreamLock, owner.m_MdStreamSocket, owner.m_LastMdDataTime) {}
+      camera(connection, log, errors, exchanges, owner.m_InquirySizes),
+      readiness(&owner, now),
+      audio({owner.m_AudioLock, owner.m_AudioSocket, owner.m_LastAudioTime}, {readiness, kAudioStream}),
+      alarms({owner.m_IoStreamLock, owner.m_IoStreamSocket, owner.m_LastIoDataTime}, {readiness, kAlarmStream}),
+      metadata({owner.m_MdStreamLock, owner.m_MdStreamSocket, owner.m_LastMdDataTime}, {readiness, kMetadataStream}),
+      chronicle(std::make_unique<FrameChronicle>(ledger)),
+      created(std::chrono::duration_cast<std::chrono::nanoseconds>(std::chrono::system_clock::now().time_since_epoch())
+                  .count()) {}
+
+DriverState::~DriverState() = default;
 
 std::string DriverState::bright_mode() {
   const Guard guard(driver.m_ConnectionLock);

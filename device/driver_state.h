@@ -1,26 +1,36 @@
 // What a driver object keeps besides the fields of its class, and the steps that several of its members share.
 #pragma once
 
+#include <atomic>
 #include <ctime>
+#include <deque>
 #include <memory>
+#include <optional>
 #include <span>
 #include <string>
 
 #include "device/camera_link.h"
+#include "device/cancellation.h"
 #include "device/cgi/input_part.h"
 #include "device/error_record.h"
+#include "device/exchange_ledger.h"
+#include "device/operation.h"
 #include "device/polled_stream.h"
+#include "device/queue_counts.h"
+#include "device/readiness.h"
+#include "device/request_echo.h"
 #include "media/assembly/picture_rules.h"
 #include "media/frame_store.h"
 #include "media/picture_reader.h"
 #include "media/rtp_reception.h"
+#include "media/stream_ledger.h"
+#include "transport/interleaved_stream.h"
 #include "transport/rtsp_session.h"
 #include "vexa/vexa_common.h"
 
 namespace vexa {
 
-/// The time of day in whole seconds; tests put their own in its place.
-using SecondsClock = std::time_t (*)();
+class FrameChronicle;
 
 inline std::time_t system_seconds() { return std::time(nullptr); }
 
@@ -33,20 +43,49 @@ inline std::span<char> room_of(char* buffer, int length) {
 /// runs a step is said with the group it stands in.
 struct DriverState {
   explicit DriverState(CVexaCommon& owner);
+  DriverState(const DriverState&) = delete;
+  DriverState& operator=(const DriverState&) = delete;
+  ~DriverState();
+
+  /// For functions of the interface that are not the class's.
+  static DriverState& of(CVexaCommon& driver) { return *driver.m_State; }
 
   CVexaCommon& driver;
+  Cancellation cancellation;
+  RequestEcho echo;
   ErrorRecord errors;
   Connection connection;
   CgiLog log;
+  ExchangeLedger exchanges;
   CameraLink camera;
+  Readiness readiness;
   PolledStream audio;
   PolledStream alarms;
   PolledStream metadata;
   CSimpleLock start_stop_lock;  ///< held by a start or stop of video from begin to end; outermost
   SecondsClock now = system_seconds;
+  std::atomic<bool> prompt_frames{false};
   int teardown_timeout = 15000;       ///< milliseconds for the answer to a TEARDOWN; tests put less in its place
   std::unique_ptr<RtpReception> rtp;  ///< the streaming thread's; null while no RTP streams
+  StreamLedger ledger;                ///< the streaming thread's, or a starter's or stopper's while there is none
+  std::unique_ptr<FrameChronicle> chronicle;  ///< as `ledger`; never null
+  std::atomic<bool> strict_reception{false};  ///< any thread's
+  QueuedFacts ready_frame;                    ///< assembled and on its way to the queue; as `ledger`
   FrameStore spare_frames VEXA_GUARDED_BY(driver.m_FrameQueueLock);
+  QueueCounts queue VEXA_GUARDED_BY(driver.m_FrameQueueLock);
+  LostFrames lost_before_next VEXA_GUARDED_BY(driver.m_FrameQueueLock);           ///< of the next frame to be queued
+  std::deque<QueuedFacts> queued_facts VEXA_GUARDED_BY(driver.m_FrameQueueLock);  ///< in the queue's order
+  Published<QueueCounts> published_queue;  ///< published under the lock, read without it
+  const std::int64_t created;              ///< nanoseconds since 1970
+
+  /// A property has changed, and what is offered has not been filtered by it.
+  bool offer_is_stale VEXA_GUARDED_BY(driver.m_ConnectionLock) = false;
+
+  std::optional<AwaitedAnswer> keep_alive;  ///< sent and not answered yet; the RTSP session's owner's
+
+  /// The connection's time-out, or another time, for waits of the call that the calling thread makes.
+  WaitLimit limit() { return limit(connection.timeout()); }
+  WaitLimit limit(int milliseconds) { return {milliseconds, Operation::cancels_of(errors)}; }
 
   // Copies of settings, each under its lock; any thread: device/driver_state.cpp
   std::string bright_mode();
@@ -68,8 +107,19 @@ struct DriverState {
   // The RTSP session; the starter's, then the streaming thread's, then the stopper's: device/rtsp_session.cpp
   RtspSession session();
   StreamClock stream_clock();
+  /// Counts a session's open that failed after so many requests.
+  Failure count_rtsp(std::uint64_t requests, const Failure& failure);
   Result<int> open_rtp_over_udp(const std::string& url, int port);
   Result<int> open_rtp_over_tcp(const std::string& url, int port);
+  /// Counts a datagram of `length` bytes that a model class reads itself.
+  void count_passed_on(Bytes packet, std::size_t length);
+  void count_interleaved(const InterleavedPacket& packet, const char* payload);
+  /// Sends a keep-alive when one is due and none is awaited.
+  void begin_keep_alive();
+  /// Takes the answer of a keep-alive if it has come or is too late. Waits for nothing.
+  void look_for_keep_alive();
+  /// Waits for the answer of a keep-alive that is awaited.
+  void finish_keep_alive();
 
   // Starting and stopping video, with the start-stop lock held: device/video_streaming.cpp
   ELibDReturnCode start_video(const SLibDEdgeStorageStreamingInfo* recording);
@@ -92,8 +142,17 @@ struct DriverState {
   ELibDReturnCode nothing_yet();
   ELibDReturnCode begin_rtp_frame(CVexaCommon::VideoFrameInfo& frame, const Codec& codec);
   ELibDReturnCode collect_picture(PacketRunPlace& run);
+  /// What the streaming thread awaits besides media.
+  std::optional<Errand> errand() const;
   ELibDReturnCode finish_rtp_frame(CVexaCommon::VideoFrameInfo& frame, PacketRunPlace run,
                                    const AssembledPicture& picture);
+  /// The frame that was assembled before was read past the queue, if it is not in it.
+  void begin_frame();
+  void part_is_ready(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec);
+  void part_is_lost(const CVexaCommon::VideoFrameInfo& frame);
+  /// `packets` are those of the frame; none of an HTTP stream's.
+  FrameFacts facts_of(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec, PacketRun packets);
+  void frame_is_ready(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec, const FrameFacts& facts);
   void stamp_picture(CVexaCommon::VideoFrameInfo& frame, std::uint32_t timestamp);
   ELibDReturnCode read_elementary_frame(CVexaCommon::VideoFrameInfo& frame, const Codec& codec, int& received);
   bool reset_stream_buffer();
@@ -104,10 +163,21 @@ struct DriverState {
 
   // The frame queue; the streaming thread and the host's: device/frame_queue.cpp
   void queue_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key, ELibDReturnCode result);
-  void append_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key) VEXA_REQUIRES(driver.m_FrameQueueLock);
-  ELibDReturnCode take_oldest_frame(SLibDVideoFrameInfo& frame);
+  void append_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key, bool is_notice)
+      VEXA_REQUIRES(driver.m_FrameQueueLock);
+  ELibDReturnCode take_oldest_frame(SLibDVideoFrameInfo& frame, FrameFacts& facts);
+  /// What is known of a frame that comes to the queue; counts it unless it is a notice.
+  QueuedFacts arrived_at_queue(const CVexaCommon::VideoFrameInfo& frame, bool is_notice)
+      VEXA_REQUIRES(driver.m_FrameQueueLock);
+  /// False when memory ran out, and the frame stays the caller's.
+  bool enqueue(const CVexaCommon::VideoFrameInfo& frame, const QueuedFacts& facts)
+      VEXA_REQUIRES(driver.m_FrameQueueLock);
+  /// Frees the frame at the front and takes it out: what was known of it.
+  QueuedFacts leave_front() VEXA_REQUIRES(driver.m_FrameQueueLock);
   void free_frame(CVexaCommon::VideoFrameInfo& frame) VEXA_REQUIRES(driver.m_FrameQueueLock);
   void clear_frame_queue();
+  /// Ends each step that changes the queue or the report of a silence.
+  void note_video() VEXA_REQUIRES(driver.m_FrameQueueLock);
 
   // Settings and the cached inquiry; any thread: device/video_settings.cpp, device/image_controls.cpp
   void store_camera_inquiry(const std::string& answer);
@@ -117,7 +187,11 @@ struct DriverState {
   void read_camera_answer(const std::string& answer, SLibDCameraInfo& info);
   bool read_camera_properties(const std::string& answer) VEXA_REQUIRES(driver.m_ConnectionLock);
   void read_stream_settings(const std::string& answer, int stream) VEXA_REQUIRES(driver.m_ConnectionLock);
+  /// Makes `stream` the one that is played, with what the answer says of it.
+  ELibDReturnCode choose_stream(const std::string& answer, int stream);
   void read_video_ports(const std::string& answer) VEXA_REQUIRES(driver.m_ConnectionLock);
+  /// Offers what the filter leaves.
+  void offer_filtered() VEXA_REQUIRES(driver.m_ConnectionLock);
   void filter_by(const char* item, const std::string& value);
 
   // Alarms; any thread: device/alarm_io.cpp

@@ -5,6 +5,7 @@
 #include "device/driver_state.h"
 #include "runtime/base/calendar.h"
 #include "runtime/base/sync.h"
+#include "runtime/base/undo.h"
 #include "transport/http_receive.h"
 #include "transport/wire/http_request.h"
 
@@ -18,16 +19,18 @@ constexpr const char* kNextCommand = "&";  // what separates the commands of a r
 }  // namespace
 
 ELibDReturnCode CVexaCommon::GetEdgeStorageMode(SLibDEdgeStorageMode& mode) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     if (!m_EdgeStorageSupported) return LIBD_NOT_SUPPORTED;
     const vexa::Guard guard(m_ConnectionLock);
-    mode = m_EdgeStorageMode;
+    vexa::put_whole(mode, m_EdgeStorageMode);
     return LIBD_OK;
   });
 }
 
 ELibDReturnCode CVexaCommon::SetEdgeStorageMode(const SLibDEdgeStorageMode& mode) {
-  if (!m_EdgeStorageSupported) return LIBD_NOT_SUPPORTED;
+  vexa::Operation operation(*m_State, __func__);
+  if (!m_EdgeStorageSupported) return operation.returns(LIBD_NOT_SUPPORTED);
   SLibDEdgeStorageMode stored;
   const ELibDReturnCode sent = m_State->errors.run([&]() -> vexa::Outcome {
     stored = mode;
@@ -40,7 +43,7 @@ ELibDReturnCode CVexaCommon::SetEdgeStorageMode(const SLibDEdgeStorageMode& mode
         address.c_str());
   });
   // Kept: whatever the reason, a mode that the camera does not take is a time-out.
-  if (sent != LIBD_OK) return LIBD_TIMEOUT;
+  if (sent != LIBD_OK) return operation.returns(LIBD_TIMEOUT);
   bool was_enabled = false;
   {
     const vexa::Guard guard(m_ConnectionLock);
@@ -55,13 +58,14 @@ ELibDReturnCode CVexaCommon::SetEdgeStorageMode(const SLibDEdgeStorageMode& mode
 }
 
 ELibDReturnCode CVexaCommon::GetEdgeStorageRecordList(SLibDEdgeStorageRecordList& list) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     std::string answer;
     {
       const vexa::RaisedTimeout slow = m_State->connection.raised(kListTimeout);
       const auto socket = m_State->camera.open("/command/search?Order=oldest");
       if (!socket) return socket.failure();
-      const auto received = vexa::receive_text(socket->get(), answer, 0, m_State->connection.timeout());
+      const auto received = vexa::receive_text(socket->get(), answer, 0, m_State->limit());
       if (!received) return received.failure();
     }
     list.records = vexa::read_recordings(answer);
@@ -70,11 +74,13 @@ ELibDReturnCode CVexaCommon::GetEdgeStorageRecordList(SLibDEdgeStorageRecordList
 }
 
 ELibDReturnCode CVexaCommon::DeleteAllEdgeStorageRecord() {
+  vexa::Operation operation(*m_State, __func__);
   const vexa::RaisedTimeout slow = m_State->connection.raised(kDeleteAllTimeout);
   return m_State->camera.send("/command/edgestorage.cgi?delete=all");
 }
 
 ELibDReturnCode CVexaCommon::DeleteEdgeStorageRecordByName(const SLibDEdgeStorageStreamingInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     if (info.streamName.empty()) return LIBD_FAILED;
     // Safe: a name with blanks, line ends or "&" adds neither a header nor another command, such as "delete=all".
@@ -85,7 +91,8 @@ ELibDReturnCode CVexaCommon::DeleteEdgeStorageRecordByName(const SLibDEdgeStorag
 }
 
 ELibDReturnCode CVexaCommon::SetEdgeStorageNoTearDown(bool noTearDown) {
-  if (!m_EdgeStorageSupported) return LIBD_NOT_SUPPORTED;
+  vexa::Operation operation(*m_State, __func__);
+  if (!m_EdgeStorageSupported) return operation.returns(LIBD_NOT_SUPPORTED);
   const vexa::Guard guard(m_VideoStateLock);
   m_NoTearDown = noTearDown;
   return LIBD_OK;

@@ -1,4 +1,5 @@
 // The frames that wait for the host.
+#include <algorithm>
 #include <utility>
 
 #include "device/driver_state.h"
@@ -6,9 +7,10 @@
 
 namespace {
 
-/// Appends the frame; false when memory ran out, and the frame stays the caller's.
-bool fits(std::deque<CVexaCommon::VideoFrameInfo>& queue, const CVexaCommon::VideoFrameInfo& frame) {
-  return vexa::within_memory([&] { queue.push_back(frame); });
+/// Appends; false when memory ran out, and the queue stays as it was.
+template <typename Item>
+bool fits(std::deque<Item>& queue, const Item& item) {
+  return vexa::within_memory([&] { queue.push_back(item); });
 }
 
 }  // namespace
@@ -21,11 +23,13 @@ void CVexaCommon::ProcessCurrentFrameData(CVexaCommon* driver, VideoFrameInfo& f
 void CVexaCommon::PropulateFrameInfoList(CVexaCommon* driver, VideoFrameInfo& frame, bool& waitKey) {
   vexa::DriverState& state = *driver->m_State;
   const vexa::Guard guard(state.driver.m_FrameQueueLock);  // the caller's already
-  state.append_frame(frame, waitKey);
+  state.append_frame(frame, waitKey, false);
+  state.note_video();
 }
 
 ELibDReturnCode CVexaCommon::GetCurrentVideoFrame(SLibDVideoFrameInfo& frame) {
-  return m_State->take_oldest_frame(frame);
+  vexa::FrameFacts facts;
+  return m_State->take_oldest_frame(frame, facts);
 }
 
 namespace vexa {
@@ -37,8 +41,8 @@ void DriverState::queue_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key
     case LIBD_OK:
     case LIBD_FRAME_DAMAGED:
       driver.m_VideoTimedOut = false;
-      append_frame(frame, wait_key);
-      return;
+      append_frame(frame, wait_key, result == LIBD_FRAME_DAMAGED);
+      break;
     case LIBD_BUFFER_TOO_SMALL:
       driver.m_LargeFrameBuffers = true;
       driver.m_VideoTimedOut = false;
@@ -59,20 +63,69 @@ void DriverState::queue_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key
     case LIBD_UNAUTHORIZED:
       break;
   }
-  free_frame(frame);
+  free_frame(frame);  // unless it is the queue's now
+  note_video();
 }
 
-void DriverState::append_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key) {
-  auto& queue = driver.m_FrameQueue;
-  const QueueDecision decision = decide_queue(frame.frameType, queue.size(), wait_key);
-  for (std::size_t i = 0; i < decision.oldest_to_drop; ++i) {
-    free_frame(queue.front());
-    queue.pop_front();
+QueuedFacts DriverState::arrived_at_queue(const CVexaCommon::VideoFrameInfo& frame, bool is_notice) {
+  QueuedFacts known;
+  known.is_notice = is_notice;
+  if (is_notice) {
+    known.data = frame.data;
+    return known;
   }
-  if (decision.append && fits(queue, frame)) {
+  const bool from_reader = ready_frame.data != nullptr && ready_frame.data == frame.data;
+  if (from_reader) known = std::exchange(ready_frame, {});
+  known.data = frame.data;
+  ++(from_reader ? queue.from_reader : queue.from_elsewhere);
+  known.add(std::exchange(lost_before_next, {}));
+  return known;
+}
+
+bool DriverState::enqueue(const CVexaCommon::VideoFrameInfo& frame, const QueuedFacts& facts) {
+  if (!fits(queued_facts, facts)) return false;
+  if (fits(driver.m_FrameQueue, frame)) return true;
+  queued_facts.pop_back();
+  return false;
+}
+
+QueuedFacts DriverState::leave_front() {
+  CVexaCommon::VideoFrameInfo& front = driver.m_FrameQueue.front();
+  std::deque<QueuedFacts>& all = queued_facts;
+  const auto is_front = [&front](const QueuedFacts& known) { return known.data == front.data; };
+  const auto found = std::find_if(all.begin(), all.end(), is_front);
+  QueuedFacts known;
+  if (found != all.end()) {
+    known = *found;
+    all.erase(all.begin(), found + 1);
+  } else {
+    ++queue.from_elsewhere;  // a model class put it there itself
+  }
+  free_frame(front);
+  driver.m_FrameQueue.pop_front();
+  return known;
+}
+
+void DriverState::append_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_key, bool is_notice) {
+  QueuedFacts known = arrived_at_queue(frame, is_notice);
+  const QueueDecision decision = decide_queue(frame.frameType, driver.m_FrameQueue.size(), wait_key);
+  LostFrames lost;
+  for (std::size_t i = 0; i < decision.oldest_to_drop; ++i) {
+    QueuedFacts oldest = leave_front();
+    if (oldest.is_notice) continue;
+    ++queue.dropped_full;
+    oldest.add(std::exchange(lost, {}));
+    lost = oldest.as_lost();
+  }
+  (queued_facts.empty() ? known : queued_facts.front()).add(lost);
+  if (decision.append && enqueue(frame, known)) {
     frame.data = nullptr;  // the queue's from here on
+    published_queue.publish(queue);
     return;
   }
+  if (!is_notice) ++(decision.append ? queue.dropped_no_memory : queue.dropped_without_key);
+  lost_before_next = known.as_lost();
+  published_queue.publish(queue);
   free_frame(frame);
   if (!decision.append) return;
   // Out of memory, which counts as a time-out; no picture is shown that may refer to the lost one.
@@ -80,21 +133,28 @@ void DriverState::append_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_ke
   if (frame.frameType != VIDEO_FRAME_JPEG) wait_key = true;
 }
 
-ELibDReturnCode DriverState::take_oldest_frame(SLibDVideoFrameInfo& frame) {
+ELibDReturnCode DriverState::take_oldest_frame(SLibDVideoFrameInfo& frame, FrameFacts& facts) {
+  facts = {};
   const Guard guard(driver.m_FrameQueueLock);
   if (driver.m_FrameQueue.empty()) {
     const bool timed_out = std::exchange(driver.m_VideoTimedOut, false);
+    note_video();
     return timed_out ? LIBD_TIMEOUT : LIBD_NO_FRAME;
   }
-  CVexaCommon::VideoFrameInfo& oldest = driver.m_FrameQueue.front();
+  const CVexaCommon::VideoFrameInfo& oldest = driver.m_FrameQueue.front();
   if (frame.sink != nullptr) frame.sink->Write(oldest.data, oldest.length);
   frame.frameType = oldest.frameType;
   frame.seconds = oldest.seconds;
   frame.microseconds = oldest.microseconds;
-  free_frame(oldest);
-  driver.m_FrameQueue.pop_front();
+  const QueuedFacts known = leave_front();
+  facts = known.facts;
+  if (!known.is_notice) ++queue.handed_out;
+  published_queue.publish(queue);
+  note_video();
   return LIBD_OK;
 }
+
+void DriverState::note_video() { readiness.set_video(!driver.m_FrameQueue.empty() || driver.m_VideoTimedOut); }
 
 void DriverState::free_frame(CVexaCommon::VideoFrameInfo& frame) {
   spare_frames.give_back(frame.data, frame.capacity);
@@ -103,12 +163,17 @@ void DriverState::free_frame(CVexaCommon::VideoFrameInfo& frame) {
 
 void DriverState::clear_frame_queue() {
   const Guard guard(driver.m_FrameQueueLock);
-  for (CVexaCommon::VideoFrameInfo& frame : driver.m_FrameQueue) free_frame(frame);
-  driver.m_FrameQueue.clear();
+  while (!driver.m_FrameQueue.empty()) {
+    if (!leave_front().is_notice) ++queue.dropped_at_stop;
+  }
+  queued_facts.clear();
+  lost_before_next = {};
+  published_queue.publish(queue);
   spare_frames.clear();
   delete[] std::exchange(driver.m_StagingBuffer, nullptr);
   driver.m_StagingBufferSize = 0;
   driver.m_VideoTimedOut = false;
+  note_video();
 }
 
 }  // namespace vexa

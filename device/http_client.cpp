@@ -21,6 +21,7 @@ constexpr const char* kSparedInUrls = "$-_.+!*'(),/?&#=";
 }  // namespace
 
 int CVexaCommon::http_open(const char* format, ...) {
+  vexa::Operation operation(*m_State, __func__);
   va_list arguments;
   va_start(arguments, format);
   const int opened = m_State->errors.run([&]() -> vexa::Result<int> {
@@ -33,23 +34,30 @@ int CVexaCommon::http_open(const char* format, ...) {
 }
 
 int CVexaCommon::http_header_recv(int socket, char* buffer, int length, int timeout) {
+  vexa::Operation operation(*m_State, __func__);
   m_State->errors.clear();
-  return m_State->errors.run([&] { return vexa::receive_header(socket, vexa::room_of(buffer, length), timeout); });
+  return m_State->errors.run(
+      [&] { return vexa::receive_header(socket, vexa::room_of(buffer, length), m_State->limit(timeout)); });
 }
 
 int CVexaCommon::http_recv(int socket, char* buffer, int length, int timeout) {
+  vexa::Operation operation(*m_State, __func__);
   m_State->errors.clear();
-  return m_State->errors.run([&] { return vexa::receive_some(socket, vexa::room_of(buffer, length), timeout); });
+  return m_State->errors.run(
+      [&] { return vexa::receive_some(socket, vexa::room_of(buffer, length), m_State->limit(timeout)); });
 }
 
 int CVexaCommon::http_recvn(int socket, char* buffer, int length, int timeout) {
+  vexa::Operation operation(*m_State, __func__);
   m_State->errors.clear();
-  return m_State->errors.run([&] { return vexa::receive_all(socket, vexa::room_of(buffer, length), timeout); });
+  return m_State->errors.run(
+      [&] { return vexa::receive_all(socket, vexa::room_of(buffer, length), m_State->limit(timeout)); });
 }
 
 int CVexaCommon::http_recvn(int socket, std::string& text, int length, int timeout) {
+  vexa::Operation operation(*m_State, __func__);
   m_State->errors.clear();
-  return m_State->errors.run([&] { return vexa::receive_text(socket, text, length, timeout); });
+  return m_State->errors.run([&] { return vexa::receive_text(socket, text, length, m_State->limit(timeout)); });
 }
 
 void CVexaCommon::http_close(int socket) { vexa::shutdown_and_close(socket); }
@@ -74,6 +82,7 @@ bool CVexaCommon::GetUrlParameter(const std::string& answer, std::string key, in
 }
 
 ELibDReturnCode CVexaCommon::SendInqCommand(const std::string& name, std::string& answer) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->camera.inquire(name, answer) == LIBD_OK ? LIBD_OK : LIBD_FAILED;
 }
 
@@ -83,9 +92,10 @@ void CVexaCommon::base64Encode(const char* text, char* output) {
 }
 
 int CVexaCommon::http_multipart_jpeg_recv(int socket, char* buffer, int capacity, int timeout) {
+  vexa::Operation operation(*m_State, __func__);
   m_State->errors.clear();
   return m_State->errors.run([&]() -> vexa::Result<int> {
-    const auto part = vexa::receive_picture_part(socket, vexa::room_of(buffer, capacity), timeout);
+    const auto part = vexa::receive_picture_part(socket, vexa::room_of(buffer, capacity), m_State->limit(timeout));
     if (!part) return part.failure();
     if (part->kind == vexa::PicturePart::Kind::kTooLarge) return vexa::kBufferTooSmall;
     const auto* picture = reinterpret_cast<const unsigned char*>(buffer);
@@ -95,9 +105,10 @@ int CVexaCommon::http_multipart_jpeg_recv(int socket, char* buffer, int capacity
 }
 
 int CVexaCommon::http_multipart_mddata_recv(int socket, char* buffer, int capacity, int timeout) {
+  vexa::Operation operation(*m_State, __func__);
   m_State->errors.clear();
   return m_State->errors.run(
-      [&] { return vexa::receive_metadata_part(socket, vexa::room_of(buffer, capacity), timeout); });
+      [&] { return vexa::receive_metadata_part(socket, vexa::room_of(buffer, capacity), m_State->limit(timeout)); });
 }
 
 int CVexaCommon::http_stream_recv(int socket, char* buffer, int capacity, StartCodeFinder finder, int codeLength,

@@ -1,6 +1,7 @@
 // Frames from the camera's HTTP image stream.
 #include <sys/time.h>
 
+#include <chrono>
 #include <new>
 #include <utility>
 
@@ -41,15 +42,21 @@ ELibDReturnCode CVexaCommon::GetCurrentFrameData(VideoFrameInfo& frame) {
 
 ELibDReturnCode CVexaCommon::GetCurrentJPEGFrameData(VideoFrameInfo& frame, int& received) {
   frame.frameType = VIDEO_FRAME_JPEG;
+  m_State->begin_frame();
   m_State->errors.clear();
   received = -1;
-  const auto part = vexa::receive_picture_part(
-      m_State->stream_socket(), {reinterpret_cast<char*>(frame.data), frame.capacity}, m_State->connection.timeout());
+  const vexa::StoppableSocket source = m_State->stream_source();
+  const vexa::WaitLimit limit{m_State->connection.timeout(), {nullptr, nullptr, source.stop}};
+  const auto part =
+      vexa::receive_picture_part(source.socket, {reinterpret_cast<char*>(frame.data), frame.capacity}, limit);
+  if (!part && m_State->stop_is_requested()) return LIBD_NO_FRAME;
   if (!part) {
     m_State->errors.record(part.failure());
     return part.failure().code;
   }
   if (part->kind == vexa::PicturePart::Kind::kTooLarge) {
+    m_State->ledger.part_begun();
+    m_State->ledger.part_too_large();
     m_State->errors.record({LIBD_BUFFER_TOO_SMALL, vexa::kBufferTooSmall.text});
     m_LastFrameTime = m_State->now();
     return LIBD_BUFFER_TOO_SMALL;
@@ -59,6 +66,7 @@ ELibDReturnCode CVexaCommon::GetCurrentJPEGFrameData(VideoFrameInfo& frame, int&
   frame.length = static_cast<unsigned int>(received);
   m_State->store_position({frame.data, frame.length});
   m_LastFrameTime = m_State->now();
+  m_State->part_is_ready(frame, vexa::kJpegCodec);
   return LIBD_OK;
 }
 
@@ -90,11 +98,32 @@ StreamWindow DriverState::stream_window() {
           {driver.m_StreamFrameStart, driver.m_StreamSearchPos, driver.m_StreamWriteEnd}};
 }
 
+void DriverState::part_is_ready(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec) {
+  ledger.part_begun();
+  ledger.bytes(frame.length, std::chrono::steady_clock::now());
+  ledger.part_assembled();
+  frame_is_ready(frame, codec, facts_of(frame, codec, {}));
+}
+
+// A frame that has begun and is not whole.
+void DriverState::part_is_lost(const CVexaCommon::VideoFrameInfo& frame) {
+  if (frame.length == 0) return;
+  ledger.part_begun();
+  ledger.bytes(frame.length, std::chrono::steady_clock::now());
+  if (frame.length >= frame.capacity) {
+    ledger.part_too_large();
+  } else {
+    ledger.part_incomplete();
+  }
+  ledger.publish();
+}
+
 // Kept: units in front of a picture are lost when the stream falls silent after them; the next read begins anew.
 ELibDReturnCode DriverState::read_elementary_frame(CVexaCommon::VideoFrameInfo& frame, const Codec& codec,
                                                    int& received) {
   frame.frameType = VIDEO_FRAME_INVALID;
   frame.length = 0;
+  begin_frame();
   StreamWindow window = stream_window();
   const StoppableSocket source = stream_source();
   const auto user_data = [this](Bytes text) {
@@ -106,17 +135,23 @@ ELibDReturnCode DriverState::read_elementary_frame(CVexaCommon::VideoFrameInfo& 
                                 connection.timeout(), user_data);
     received = unit ? unit->length : -1;
     if (!unit) {
+      part_is_lost(frame);
       errors.record(unit.failure());
       return unit.failure().code;
     }
-    if (unit->kind == UnitRead::Kind::kSilence) return nothing_yet();
     if (unit->kind == UnitRead::Kind::kPicture) {
       stamp_now(frame);
       driver.m_LastFrameTime = now();
+      part_is_ready(frame, codec);
       return LIBD_OK;
     }
-    if (nothing_yet() == LIBD_TIMEOUT) return LIBD_TIMEOUT;
+    const ELibDReturnCode waited = nothing_yet();
+    if (unit->kind == UnitRead::Kind::kSilence || waited == LIBD_TIMEOUT) {
+      part_is_lost(frame);
+      return waited;
+    }
   }
+  part_is_lost(frame);
   return LIBD_FAILED;
 }
 

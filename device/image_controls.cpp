@@ -49,18 +49,21 @@ bool step_along(const vexa::ExposureSteps& steps, int step, int& value) {
 }  // namespace
 
 ELibDReturnCode CVexaCommon::SetBrightMode(std::string& mode) {
-  if (mode.empty()) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (mode.empty()) return operation.returns(LIBD_INVALID_ARGUMENT);
   const char* word = vexa::exposure_word_of(mode);
-  if (word == nullptr) return LIBD_FAILED;
+  if (word == nullptr) return operation.returns(LIBD_FAILED);
   // Kept: the stored mode stays; the host stores it with SetPTZControlInfo once the camera has taken it.
   return m_State->camera.send("/command/camera.cgi?ExpMode=%s", word);
 }
 
 ELibDReturnCode CVexaCommon::SetBackLightCompMode(bool on) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->camera.send("/command/camera.cgi?BLComp=%s", on ? "on" : "off");
 }
 
 ELibDReturnCode CVexaCommon::Bright(int step) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     const ELibDReturnCode amount = CheckAmountOfBrightness(step);
     if (amount != LIBD_OK) return amount;
@@ -123,6 +126,7 @@ bool CVexaCommon::GetIrisPositionFromIrisList(int step, int& value, unsigned ent
 }
 
 ELibDReturnCode CVexaCommon::BrightAbsolute(int level) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     if (static_cast<unsigned>(level) > kLargestLevel) return LIBD_INVALID_ARGUMENT;
     const std::string mode = m_State->bright_mode();
@@ -166,6 +170,7 @@ ELibDReturnCode DriverState::after_image_change(ELibDReturnCode sent) {
 }  // namespace vexa
 
 ELibDReturnCode CVexaCommon::GetDayNightMode(ELibDDayNightType& mode) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     std::string answer;
     if (const auto asked = m_State->camera_inquiry(answer); asked != LIBD_OK) return asked;
@@ -177,12 +182,14 @@ ELibDReturnCode CVexaCommon::GetDayNightMode(ELibDDayNightType& mode) {
 }
 
 ELibDReturnCode CVexaCommon::SetDayNightMode(ELibDDayNightType mode) {
+  vexa::Operation operation(*m_State, __func__);
   const char* request = vexa::word_of(vexa::kDayNightRequests, mode);
-  if (request == nullptr) return LIBD_INVALID_ARGUMENT;
+  if (request == nullptr) return operation.returns(LIBD_INVALID_ARGUMENT);
   return m_State->camera.send("/command/camera.cgi?DayNightMode=%s", request);
 }
 
 ELibDReturnCode CVexaCommon::GetVisibilityEnhancerMode(ELibDVisibilityEnhancerType& mode) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     std::string answer;
     if (const auto asked = m_State->camera_inquiry(answer); asked != LIBD_OK) return asked;
@@ -191,12 +198,14 @@ ELibDReturnCode CVexaCommon::GetVisibilityEnhancerMode(ELibDVisibilityEnhancerTy
 }
 
 ELibDReturnCode CVexaCommon::SetVisibilityEnhancerMode(ELibDVisibilityEnhancerType mode) {
+  vexa::Operation operation(*m_State, __func__);
   const char* word = vexa::word_of(vexa::kVisibilityWords, mode);
-  if (word == nullptr) return LIBD_INVALID_ARGUMENT;
+  if (word == nullptr) return operation.returns(LIBD_INVALID_ARGUMENT);
   return m_State->after_image_change(m_State->camera.send("/command/camera.cgi?VisibilityEnhancer=%s", word));
 }
 
 ELibDReturnCode CVexaCommon::GetXdnrMode(ELibDXdnrType& mode) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     std::string answer;
     if (const auto asked = m_State->camera_inquiry(answer); asked != LIBD_OK) return asked;
@@ -205,12 +214,14 @@ ELibDReturnCode CVexaCommon::GetXdnrMode(ELibDXdnrType& mode) {
 }
 
 ELibDReturnCode CVexaCommon::SetXdnrMode(ELibDXdnrType mode) {
+  vexa::Operation operation(*m_State, __func__);
   const char* word = vexa::word_of(vexa::kXdnrWords, mode);
-  if (word == nullptr) return LIBD_INVALID_ARGUMENT;
+  if (word == nullptr) return operation.returns(LIBD_INVALID_ARGUMENT);
   return m_State->after_image_change(m_State->camera.send("/command/camera.cgi?XDNR=%s", word));
 }
 
 ELibDReturnCode CVexaCommon::GetViewDR(ELibDViewDRMode& mode) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     std::string answer;
     if (const auto asked = m_State->camera_inquiry(answer); asked != LIBD_OK) return asked;
@@ -219,12 +230,14 @@ ELibDReturnCode CVexaCommon::GetViewDR(ELibDViewDRMode& mode) {
 }
 
 ELibDReturnCode CVexaCommon::SetViewDR(ELibDViewDRMode mode) {
+  vexa::Operation operation(*m_State, __func__);
   const char* word = vexa::word_of(vexa::kViewDrWords, mode);
-  if (word == nullptr) return LIBD_INVALID_ARGUMENT;
+  if (word == nullptr) return operation.returns(LIBD_INVALID_ARGUMENT);
   return m_State->after_image_change(m_State->camera.send("/command/camera.cgi?ViewDR=%s", word));
 }
 
 ELibDReturnCode CVexaCommon::GetIRIlluminator(ELibIRIlluminatorMode& mode, int& strength) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     std::string answer;
     if (const auto asked = m_State->camera_inquiry(answer); asked != LIBD_OK) return asked;
@@ -235,6 +248,7 @@ ELibDReturnCode CVexaCommon::GetIRIlluminator(ELibIRIlluminatorMode& mode, int& 
 
 // Kept: any mode that is not day/night switches the illuminator off; there is no wrong mode.
 ELibDReturnCode CVexaCommon::SetIRIlluminator(ELibIRIlluminatorMode mode, int strength) {
+  vexa::Operation operation(*m_State, __func__);
   const char* word = mode == LIB_IR_DAYNIGHT ? "daynight" : "off";
   return m_State->after_image_change(
       m_State->camera.send("/command/camera.cgi?IRLed=%s&IRLedMaxStrength=%d", word, strength));

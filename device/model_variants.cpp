@@ -61,6 +61,7 @@ ELibDReturnCode DriverState::ask_video_out_mode(ELibVideoOutMode& mode) {
 }  // namespace vexa
 
 ELibDReturnCode CVexaHeronCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     std::string system;
     if (const auto asked = m_State->camera.inquire("system", system); asked != LIBD_OK) return asked;
@@ -72,42 +73,55 @@ ELibDReturnCode CVexaHeronCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) {
   });
 }
 
-ELibDReturnCode CVexaHeronCommon::SetBrightMode(std::string&) { return LIBD_NOT_SUPPORTED; }
+ELibDReturnCode CVexaHeronCommon::SetBrightMode(std::string&) {
+  vexa::Operation operation(*m_State, __func__);
+  return operation.returns(LIBD_NOT_SUPPORTED);
+}
 
 ELibDReturnCode CVexaMarlinCommon::SetBrightMode(std::string& mode) {
+  vexa::Operation operation(*m_State, __func__);
   constexpr char kRequest[] = "/command/camera.cgi?ExpMode=%s&AutoShutter=%s&AutoSlowShutter=%s";
-  if (mode.empty()) return LIBD_INVALID_ARGUMENT;
+  if (mode.empty()) return operation.returns(LIBD_INVALID_ARGUMENT);
   // Kept: full automation goes with the manual iris lens: such a camera regulates by its shutter alone.
   if (mode == vexa::kFullAuto) return m_State->camera.send(kRequest, "manualirislens", "on", "on");
   if (mode == vexa::kShutterPriority) return m_State->camera.send(kRequest, "autoirislens", "off", "off");
-  return LIBD_FAILED;
+  return operation.returns(LIBD_FAILED);
 }
 
 ELibDReturnCode CVexaSimpleHDCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return GetCurrentSystemInfo(info, !is_one_of(kSimpleHdOutputModels, m_FixedSystemInfo.modelName));
 }
 
 ELibDReturnCode CVexaSimpleHDCommon::GetCurrentSystemInfo(SLibDSystemInfo& info, bool probe) {
+  vexa::Operation operation(*m_State, __func__);
   return probe ? m_State->read_system_bringing_video(info) : CVexaCommon::GetCurrentSystemInfo(info);
 }
 
-ELibDReturnCode CVexaSimpleHDCommon::SetBrightMode(std::string&) { return LIBD_NOT_SUPPORTED; }
+ELibDReturnCode CVexaSimpleHDCommon::SetBrightMode(std::string&) {
+  vexa::Operation operation(*m_State, __func__);
+  return operation.returns(LIBD_NOT_SUPPORTED);
+}
 
 ELibDReturnCode CVexaSimpleHDCommon::GetVideoOutMode(ELibVideoOutMode& mode) {
+  vexa::Operation operation(*m_State, __func__);
   if (is_one_of(kSimpleHdAskedModels, m_FixedSystemInfo.modelName)) return m_State->ask_video_out_mode(mode);
   mode = LIB_VIDEO_OUT_IP;
   return LIBD_OK;
 }
 
 ELibDReturnCode CVexaSimplePTZCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return GetCurrentSystemInfo(info, !is_one_of(kSimplePtzModels, m_FixedSystemInfo.modelName));
 }
 
 ELibDReturnCode CVexaSimplePTZCommon::GetCurrentSystemInfo(SLibDSystemInfo& info, bool probe) {
+  vexa::Operation operation(*m_State, __func__);
   return probe ? m_State->read_system_bringing_video(info) : CVexaCommon::GetCurrentSystemInfo(info);
 }
 
 ELibDReturnCode CVexaSimplePTZCommon::GetVideoOutMode(ELibVideoOutMode& mode) {
+  vexa::Operation operation(*m_State, __func__);
   if (is_one_of(kSimplePtzModels, m_FixedSystemInfo.modelName)) return m_State->ask_video_out_mode(mode);
   mode = LIB_VIDEO_OUT_IP;
   return LIBD_OK;

@@ -14,6 +14,7 @@ bool is_one_of(int count, int index) { return index >= 0 && index < count; }
 }  // namespace
 
 ELibDReturnCode CVexaCommon::SetPreset(SLibDPresetInfo& preset) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     const std::string name = AddUrlEncoding(preset.name, true);
     if (!is_one_of(m_FixedPTZControlInfo.presetCount, preset.index) || name.empty()) return LIBD_INVALID_ARGUMENT;
@@ -23,17 +24,20 @@ ELibDReturnCode CVexaCommon::SetPreset(SLibDPresetInfo& preset) {
 }
 
 ELibDReturnCode CVexaCommon::RecallPreset(int index) {
-  if (!is_one_of(m_FixedPTZControlInfo.presetCount, index)) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (!is_one_of(m_FixedPTZControlInfo.presetCount, index)) return operation.returns(LIBD_INVALID_ARGUMENT);
   return m_State->camera.send("/command/presetposition.cgi?PresetCall=%d,%d", index + 1,
                               vexa::recall_speed(m_FixedPTZControlInfo.panTilt));
 }
 
 ELibDReturnCode CVexaCommon::ClearPreset(int index) {
-  if (!is_one_of(m_FixedPTZControlInfo.presetCount, index)) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (!is_one_of(m_FixedPTZControlInfo.presetCount, index)) return operation.returns(LIBD_INVALID_ARGUMENT);
   return m_State->camera.send("/command/presetposition.cgi?PresetClear=%d", index + 1);
 }
 
 ELibDReturnCode CVexaCommon::GetPresets(std::vector<SLibDPresetInfo>& presets) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     presets = vexa::unnamed_presets(m_FixedPTZControlInfo.presetCount);
     std::string answer;

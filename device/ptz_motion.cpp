@@ -28,7 +28,8 @@ ELibDReturnCode send_stop(vexa::CameraLink& camera, bool continuous) {
 }  // namespace
 
 ELibDReturnCode CVexaCommon::PanTilt(int pan, int tilt) {
-  if (!vexa::is_host_speed(pan) || !vexa::is_host_speed(tilt)) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (!vexa::is_host_speed(pan) || !vexa::is_host_speed(tilt)) return operation.returns(LIBD_INVALID_ARGUMENT);
   const SLibDFixedPanTiltInfo& camera = m_FixedPTZControlInfo.panTilt;
   const bool continuous = m_State->takes_continuous_ptz();
   const int pan_speed = continuous ? vexa::continuous_speed(pan) : vexa::move_speed(pan, camera.panMaxSpeed);
@@ -58,7 +59,8 @@ int CVexaCommon::SendPTZCommandForCenterDirection() {
 }
 
 ELibDReturnCode CVexaCommon::PanTiltAbsolute(int pan, int tilt) {
-  if (!vexa::is_host_position(pan) || !vexa::is_host_position(tilt)) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (!vexa::is_host_position(pan) || !vexa::is_host_position(tilt)) return operation.returns(LIBD_INVALID_ARGUMENT);
   const SLibDFixedPanTiltInfo& camera = m_FixedPTZControlInfo.panTilt;
   // Kept: a negative position is eight digits long, as its sign is widened; cameras read the last four.
   return m_State->camera.send("/command/ptzf.cgi?AbsolutePanTilt=%04X,%04X,%d",
@@ -68,14 +70,16 @@ ELibDReturnCode CVexaCommon::PanTiltAbsolute(int pan, int tilt) {
 }
 
 ELibDReturnCode CVexaCommon::PanTiltDirect(int x, int y, const SLibDResolutionInfo& picture) {
-  if (!vexa::is_host_position(x) || !vexa::is_host_position(y)) return LIBD_INVALID_ARGUMENT;
-  if (!vexa::has_size(picture)) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (!vexa::is_host_position(x) || !vexa::is_host_position(y)) return operation.returns(LIBD_INVALID_ARGUMENT);
+  if (!vexa::has_size(picture)) return operation.returns(LIBD_INVALID_ARGUMENT);
   return m_State->camera.send("/command/ptzf.cgi?AreaZoom=%d,%d,0,0,%s", vexa::centre_offset(x, picture.width),
                               vexa::centre_offset(y, picture.height), vexa::kAreaImage);
 }
 
 ELibDReturnCode CVexaCommon::Zoom(int speed) {
-  if (!vexa::is_host_speed(speed)) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (!vexa::is_host_speed(speed)) return operation.returns(LIBD_INVALID_ARGUMENT);
   const bool continuous = m_State->takes_continuous_ptz();
   if (speed == 0) {
     return continuous ? m_State->camera.send("/command/ptzf.cgi?ContinuousPanTiltZoom=,,0")
@@ -89,7 +93,8 @@ ELibDReturnCode CVexaCommon::Zoom(int speed) {
 }
 
 ELibDReturnCode CVexaCommon::ZoomAbsolute(int position) {
-  if (!vexa::is_host_position(position)) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (!vexa::is_host_position(position)) return operation.returns(LIBD_INVALID_ARGUMENT);
   const SLibDFixedZoomInfo& camera = m_FixedPTZControlInfo.zoom;
   return m_State->camera.send(
       "/command/ptzf.cgi?AbsoluteZoom=%04X",
@@ -97,27 +102,31 @@ ELibDReturnCode CVexaCommon::ZoomAbsolute(int position) {
 }
 
 ELibDReturnCode CVexaCommon::ZoomRelative(int step) {
-  if (step < -kLargestZoomStep || step > kLargestZoomStep) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (step < -kLargestZoomStep || step > kLargestZoomStep) return operation.returns(LIBD_INVALID_ARGUMENT);
   return m_State->camera.send("/command/ptzf.cgi?RelativeZoom=%04X", static_cast<unsigned>(vexa::zoom_step(step)));
 }
 
 // Kept: the first pair is the centre of the area, not its corner.
 ELibDReturnCode CVexaCommon::ZoomArea(int x, int y, int width, int height, const SLibDResolutionInfo& picture) {
+  vexa::Operation operation(*m_State, __func__);
   for (const int place : {x, y, width, height}) {
-    if (!vexa::is_host_position(place)) return LIBD_INVALID_ARGUMENT;
+    if (!vexa::is_host_position(place)) return operation.returns(LIBD_INVALID_ARGUMENT);
   }
-  if (!vexa::has_size(picture)) return LIBD_INVALID_ARGUMENT;
+  if (!vexa::has_size(picture)) return operation.returns(LIBD_INVALID_ARGUMENT);
   return m_State->camera.send("/command/ptzf.cgi?AreaZoom=%d,%d,%d,%d,%s", vexa::centre_offset(x, picture.width),
                               vexa::centre_offset(y, picture.height), vexa::area_extent(width, picture.width),
                               vexa::area_extent(height, picture.height), vexa::kAreaImage);
 }
 
 ELibDReturnCode CVexaCommon::SetFocusMode(bool automatic) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->camera.send("/command/camera.cgi?FocusMode=%s", automatic ? "auto" : "manual");
 }
 
 ELibDReturnCode CVexaCommon::Focus(int speed) {
-  if (!vexa::is_host_speed(speed)) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (!vexa::is_host_speed(speed)) return operation.returns(LIBD_INVALID_ARGUMENT);
   if (speed == 0) return m_State->camera.send("/command/ptzf.cgi?Move=stop,focus");
   const SLibDFixedFocusInfo& camera = m_FixedPTZControlInfo.focus;
   return m_State->camera.send("/command/ptzf.cgi?Move=%s,%d", speed > 0 ? "near" : "far",
@@ -125,7 +134,8 @@ ELibDReturnCode CVexaCommon::Focus(int speed) {
 }
 
 ELibDReturnCode CVexaCommon::FocusAbsolute(int position) {
-  if (!vexa::is_host_position(position)) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (!vexa::is_host_position(position)) return operation.returns(LIBD_INVALID_ARGUMENT);
   const SLibDFixedFocusInfo& camera = m_FixedPTZControlInfo.focus;
   return m_State->camera.send(
       "/command/ptzf.cgi?AbsoluteFocus=%04X",

@@ -5,6 +5,7 @@
 #include "device/cgi/position_text.h"
 #include "device/driver_state.h"
 #include "runtime/base/sync.h"
+#include "runtime/base/undo.h"
 
 namespace {
 
@@ -13,17 +14,18 @@ constexpr int kUpsideDown = 180;
 }  // namespace
 
 ELibDReturnCode CVexaCommon::GetCurrentPosition(SLibDPTZStatus& status) {
+  vexa::Operation operation(*m_State, __func__);
   std::optional<vexa::CameraPosition> position;
   {
     const vexa::Guard guard(m_CamPosLock);
     position = vexa::read_position_text(m_CamPosText);
   }
-  if (!position) return LIBD_FAILED;
+  if (!position) return operation.returns(LIBD_FAILED);
   // Kept: the flag is set and never cleared, as the host clears it when it has seen it.
   if (position->moving) status.moving = true;
   const int flip = m_State->rotation() == kUpsideDown ? -1 : 1;
   if (!GetViewingAngles(position->zoom_valid ? position->zoom : 0, status.horizontalAngle, status.verticalAngle)) {
-    return LIBD_FAILED;
+    return operation.returns(LIBD_FAILED);
   }
   const SLibDFixedPanTiltInfo& camera = m_FixedPTZControlInfo.panTilt;
   const std::int64_t tilt_offset = static_cast<std::int64_t>(camera.tiltOffset) * flip;
@@ -43,14 +45,16 @@ bool CVexaCommon::GetViewingAngles(int zoom, int& horizontal, int& vertical) {
 }
 
 ELibDReturnCode CVexaCommon::GetPTZControlInfo(SLibDPTZControlInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     const vexa::Guard guard(m_ConnectionLock);
-    info = m_PTZControlInfo;
+    vexa::put_whole(info, m_PTZControlInfo);
     return LIBD_OK;
   });
 }
 
 ELibDReturnCode CVexaCommon::SetPTZControlInfo(SLibDPTZControlInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     SLibDPTZControlInfo stored = info;
     const vexa::Guard guard(m_ConnectionLock);
@@ -60,9 +64,10 @@ ELibDReturnCode CVexaCommon::SetPTZControlInfo(SLibDPTZControlInfo& info) {
 }
 
 ELibDReturnCode CVexaCommon::GetFixedPTZControlInfo(SLibDFixedPTZControlInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     if (!m_FixedPTZControlInfoAvailable) return LIBD_NOT_SUPPORTED;
-    info = m_FixedPTZControlInfo;
+    vexa::put_whole(info, m_FixedPTZControlInfo);
     return LIBD_OK;
   });
 }

@@ -1,4 +1,5 @@
 // Frames from the pictures of an RTP session.
+#include <chrono>
 #include <optional>
 #include <utility>
 
@@ -6,6 +7,7 @@
 #include "media/assembly/elementary_unit.h"
 #include "media/assembly/picture_clock.h"
 #include "media/assembly/rtp_pictures.h"
+#include "media/frame_chronicle.h"
 #include "transport/wire/rtp_header.h"
 
 namespace {
@@ -121,16 +123,35 @@ ELibDReturnCode DriverState::begin_rtp_frame(CVexaCommon::VideoFrameInfo& frame,
   if (driver.m_RtpPacketBuffer == nullptr) return LIBD_NO_FRAME;
   frame.length = 0;
   if (frame.capacity < kLeastCapacity) return LIBD_FAILED;
+  begin_frame();
   if (rtp->codec.kind == codec.kind) return LIBD_OK;
-  driver.m_RtpPackets.clear();  // of another codec
-  rtp = std::make_unique<RtpReception>(driver.m_RtpPackets, codec);
+  rtp->collector.discard_all();  // of another codec
+  rtp = std::make_unique<RtpReception>(driver.m_RtpPackets, codec, ledger.collection());
   return LIBD_OK;
+}
+
+void DriverState::begin_frame() {
+  if (std::exchange(ready_frame, {}).data != nullptr) ledger.frame_taken();
+}
+
+void DriverState::frame_is_ready(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec,
+                                 const FrameFacts& facts) {
+  ready_frame = {frame.data, false, facts};
+  ledger.frame_ready(frame.frameType == codec.key_frame, std::chrono::steady_clock::now());
+  ledger.publish();
+}
+
+std::optional<Errand> DriverState::errand() const {
+  if (!keep_alive) return std::nullopt;
+  return Errand{keep_alive->begun ? -1 : driver.m_RtspSocket, keep_alive->give_up};
 }
 
 ELibDReturnCode DriverState::collect_picture(PacketRunPlace& run) {
   errors.clear();
-  PictureReader reader(*rtp, {stream_source(), driver.m_RtpPacketBuffer, driver.m_RtpClockRate, connection.timeout(),
-                              [this] { return stop_is_requested(); }});
+  rtp->gather.limit(prompt_frames ? BurstGather::kPrompt : BurstGather::kLongest);
+  PictureReader reader(*rtp, ledger, *chronicle,
+                       {stream_source(), driver.m_RtpPacketBuffer, driver.m_RtpClockRate, connection.timeout(),
+                        [this] { return stop_is_requested(); }, strict_reception, errand()});
   const auto picture = rtp->codec.kind == CodecKind::kJpeg ? reader.next_jpeg() : reader.next();
   if (!picture) {
     const Failure& failure = picture.failure();
@@ -147,15 +168,35 @@ ELibDReturnCode DriverState::finish_rtp_frame(CVexaCommon::VideoFrameInfo& frame
   PacketCollector& collector = rtp->collector;
   const std::uint32_t timestamp = collector.packets(run).front().timestamp;
   if (picture.outcome != Assembly::kWhole) {
-    collector.abandon(run);
+    collector.abandon(run, picture.outcome == Assembly::kTooLarge ? PictureLoss::kTooLarge : PictureLoss::kDamaged);
+    ledger.publish();
     return code_of(picture.outcome);
   }
-  collector.use(run);
   frame.length = picture.length;
   frame.frameType = picture.frame_type;
   driver.m_LastFrameTime = now();
   stamp_picture(frame, timestamp);
+  const PacketRun packets = collector.packets(run);
+  const FrameFacts facts = facts_of(frame, rtp->codec, packets);
+  collector.use(run);
+  frame_is_ready(frame, rtp->codec, facts);
   return LIBD_OK;
+}
+
+FrameFacts DriverState::facts_of(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec, PacketRun packets) {
+  FrameChronicle::Picture picture{codec.kind,
+                                  packets.empty() ? nullptr : &packets.front(),
+                                  packets.empty() ? nullptr : &packets.back(),
+                                  {frame.data, frame.length},
+                                  frame.frameType == codec.key_frame,
+                                  driver.m_RtpClockRate,
+                                  std::nullopt};
+  if (driver.m_EdgeStoragePlayback) {
+    constexpr std::int64_t kNanosecondsASecond = 1'000'000'000;
+    constexpr std::int64_t kNanosecondsAMicrosecond = 1000;
+    picture.range_time = frame.seconds * kNanosecondsASecond + frame.microseconds * kNanosecondsAMicrosecond;
+  }
+  return chronicle->facts_of(picture);
 }
 
 void DriverState::stamp_picture(CVexaCommon::VideoFrameInfo& frame, std::uint32_t timestamp) {

@@ -4,6 +4,7 @@
 #include "device/driver_state.h"
 
 ELibDReturnCode CVexaCommon::GetShadowTourInfo(SLibDShadowTourInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     if (m_FixedPTZControlInfo.shadowTourCount < 1) return LIBD_NOT_SUPPORTED;
     std::string answer;
@@ -14,6 +15,7 @@ ELibDReturnCode CVexaCommon::GetShadowTourInfo(SLibDShadowTourInfo& info) {
 }
 
 ELibDReturnCode CVexaCommon::SetShadowTourInfo(SLibDShadowTourInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     if (m_FixedPTZControlInfo.shadowTourCount < 1) return LIBD_NOT_SUPPORTED;
     const auto request = vexa::shadow_tour_request(info, m_FixedPTZControlInfo.shadowTourCount);
@@ -23,6 +25,7 @@ ELibDReturnCode CVexaCommon::SetShadowTourInfo(SLibDShadowTourInfo& info) {
 }
 
 ELibDReturnCode CVexaCommon::StartShadowTour(int number) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     const int count = m_FixedPTZControlInfo.shadowTourCount;
     if (!vexa::is_shadow_tour(number, count)) return LIBD_INVALID_ARGUMENT;
@@ -32,23 +35,30 @@ ELibDReturnCode CVexaCommon::StartShadowTour(int number) {
 
 // Kept: four shadow tours are named, however many there are; cameras pass over those they lack.
 ELibDReturnCode CVexaCommon::StopShadowTour() {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->camera.send("/command/presetposition.cgi?STour=off&STourA=off&STourB=off&STourC=off&STourD=off");
 }
 
 ELibDReturnCode CVexaCommon::StartRecordShadowTour(int number) {
-  if (!vexa::is_shadow_tour(number, m_FixedPTZControlInfo.shadowTourCount)) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (!vexa::is_shadow_tour(number, m_FixedPTZControlInfo.shadowTourCount))
+    return operation.returns(LIBD_INVALID_ARGUMENT);
   return m_State->camera.send("/command/presetposition.cgi?STourRecord=%s", vexa::tour_letter(number));
 }
 
 ELibDReturnCode CVexaCommon::StopRecordShadowTour() {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->camera.send("/command/presetposition.cgi?STourRecord=stop");
 }
 
 ELibDReturnCode CVexaCommon::StartPreviewShadowTour(int number) {
-  if (!vexa::is_shadow_tour(number, m_FixedPTZControlInfo.shadowTourCount)) return LIBD_INVALID_ARGUMENT;
+  vexa::Operation operation(*m_State, __func__);
+  if (!vexa::is_shadow_tour(number, m_FixedPTZControlInfo.shadowTourCount))
+    return operation.returns(LIBD_INVALID_ARGUMENT);
   return m_State->camera.send("/command/presetposition.cgi?STourPreview=%s", vexa::tour_letter(number));
 }
 
 ELibDReturnCode CVexaCommon::StopPreviewShadowTour() {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->camera.send("/command/presetposition.cgi?STourPreview=stop");
 }

@@ -3,6 +3,7 @@
 #include "device/driver_state.h"
 #include "runtime/base/sync.h"
 #include "runtime/base/text.h"
+#include "runtime/base/undo.h"
 #include "transport/wire/http_answer.h"
 
 namespace {
@@ -17,20 +18,23 @@ void take_value(std::string_view answer, std::string_view key, std::string& text
 }  // namespace
 
 ELibDReturnCode CVexaCommon::GetFixedSystemInfo(SLibDFixedSystemInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
-    info = m_FixedSystemInfo;
+    vexa::put_whole(info, m_FixedSystemInfo);
     return LIBD_OK;
   });
 }
 
 ELibDReturnCode CVexaCommon::GetFixedConnectionInfo(SLibDFixedConnectionInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
-    info = m_FixedConnectionInfo;
+    vexa::put_whole(info, m_FixedConnectionInfo);
     return LIBD_OK;
   });
 }
 
 ELibDReturnCode CVexaCommon::GetCurrentSystemInfo(SLibDSystemInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     std::string answer;
     if (const auto asked = m_State->camera.inquire("system", answer); asked != LIBD_OK) return asked;

@@ -55,6 +55,7 @@ ELibDReturnCode CVexaCommon::GetCameraType(ELibCameraType type) {
 }
 
 ELibDReturnCode CVexaCommon::SetCameraInfoFromID(unsigned int id) {
+  vexa::Operation operation(*m_State, __func__);
   {
     const vexa::Guard guard(m_ConnectionLock);
     if (m_FixedCameraInfo.streamCount1 < 2 && m_FixedCameraInfo.streamCount2 < 2) return LIBD_OK;

@@ -6,6 +6,7 @@
 #include "runtime/base/scanned_number.h"
 #include "runtime/base/sync.h"
 #include "runtime/base/text.h"
+#include "runtime/base/undo.h"
 
 namespace {
 
@@ -54,6 +55,7 @@ bool replace(Value& stored, Value value) {
 }  // namespace
 
 ELibDReturnCode CVexaCommon::GetCameraInfo(SLibDCameraInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     m_State->store_camera_inquiry({});
     std::string answer;
@@ -80,18 +82,24 @@ void DriverState::read_camera_answer(const std::string& answer, SLibDCameraInfo&
   {
     const Guard guard(driver.m_ConnectionLock);
     driver.m_ResolutionFilter.Initialize(driver.m_FixedSystemInfo.modelName);
-    changed = read_camera_properties(answer);
+    Undo properties(driver.m_CameraInfo);
+    if (read_camera_properties(answer)) offer_is_stale = true;
+    properties.keep();
+    changed = offer_is_stale;
     standard = static_cast<ELibDVideoStandard>(driver.m_CameraInfo.videoStandard);
     width = driver.m_CameraInfo.captureWidth;
     height = driver.m_CameraInfo.captureHeight;
   }
   if (changed) driver.InitializeFixedVideoParams(standard, width, height);
   const Guard guard(driver.m_ConnectionLock);
-  if (changed) driver.m_ResolutionFilter.GetFilteredResolutionList(driver.m_FixedCameraInfo.codecs);
+  if (changed) offer_filtered();
+  offer_is_stale = false;
+  Undo change(driver.m_CameraInfo);
   read_stream_settings(answer, info.streamNumber);
   read_video_ports(answer);
   // Kept: the record comes back whole, the driver's stream number with it; hosts set the number before each call.
-  info = driver.m_CameraInfo;
+  put_whole(info, driver.m_CameraInfo);
+  change.keep();
 }
 
 bool DriverState::read_camera_properties(const std::string& answer) {
@@ -119,6 +127,18 @@ void DriverState::read_stream_settings(const std::string& answer, int stream) {
   driver.m_CameraInfo.codecType = codec_type;
 }
 
+ELibDReturnCode DriverState::choose_stream(const std::string& answer, int stream) {
+  const std::string key = stream_key("ImageCodec", stream);
+  std::size_t pos = 0;
+  if (!find_key(answer, key, pos) || video_codec_of(value_at(answer, pos, key)) == nullptr) return LIBD_NOT_SUPPORTED;
+  const Guard guard(driver.m_ConnectionLock);
+  Undo change(driver.m_CameraInfo);
+  read_stream_settings(answer, stream);
+  driver.m_CameraInfo.streamNumber = stream;
+  change.keep();
+  return LIBD_OK;
+}
+
 void DriverState::read_video_ports(const std::string& answer) {
   const struct {
     const char* key;
@@ -138,7 +158,13 @@ void DriverState::filter_by(const char* item, const std::string& value) {
   const Guard guard(driver.m_ConnectionLock);
   driver.m_ResolutionFilter.Initialize(driver.m_FixedSystemInfo.modelName);
   driver.m_ResolutionFilter.SetFilterItemCriteria(item, value);
-  driver.m_ResolutionFilter.GetFilteredResolutionList(driver.m_FixedCameraInfo.codecs);
+  offer_filtered();
+}
+
+void DriverState::offer_filtered() {
+  std::vector<SLibDVideoCodecInfo> left;
+  driver.m_ResolutionFilter.GetFilteredResolutionList(left);
+  driver.m_FixedCameraInfo.codecs.swap(left);
 }
 
 }  // namespace vexa
@@ -207,6 +233,7 @@ void CVexaCommon::SetCurrentQualityBitrate(const std::string& answer, std::size_
 }
 
 ELibDReturnCode CVexaCommon::SetCameraInfo(SLibDCameraInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     SLibDCameraInfo stored = info;  // first, so that nothing is sent that cannot be stored
     const vexa::CodecRequest codec = vexa::codec_request(info);
@@ -224,21 +251,24 @@ ELibDReturnCode CVexaCommon::SetCameraInfo(SLibDCameraInfo& info) {
 }
 
 ELibDReturnCode CVexaCommon::GetFixedCameraInfo(SLibDFixedCameraInfo& info) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     const vexa::Guard guard(m_ConnectionLock);
     if (!m_FixedCameraInfoAvailable) return LIBD_NOT_SUPPORTED;
-    info = m_FixedCameraInfo;
+    vexa::put_whole(info, m_FixedCameraInfo);
     return LIBD_OK;
   });
 }
 
 // Kept: the standard is passed on and not stored; what is offered stays until the camera reports the standard.
 ELibDReturnCode CVexaCommon::SetVideoStandard(ELibDVideoStandard standard) {
+  vexa::Operation operation(*m_State, __func__);
   InitializeFixedVideoParams(standard, kNoSize, kNoSize);
   return LIBD_OK;
 }
 
 ELibDReturnCode CVexaCommon::SetVidCapSize(int width, int height) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     InitializeFixedVideoParams(m_State->video_standard(), width, height);
     m_State->filter_by(kCaptureSizeFilter, vexa::format_within(kCaptureSizeRoom, "%d,%d", width, height).text);
@@ -247,6 +277,7 @@ ELibDReturnCode CVexaCommon::SetVidCapSize(int width, int height) {
 }
 
 ELibDReturnCode CVexaCommon::SetSolidPTZState(bool on) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     InitializeFixedVideoParams(m_State->video_standard(), kNoSize, kNoSize);
     m_State->filter_by(kSolidPtzFilter, on ? "on" : "off");
@@ -255,6 +286,7 @@ ELibDReturnCode CVexaCommon::SetSolidPTZState(bool on) {
 }
 
 ELibDReturnCode CVexaCommon::SetImageMaxSize(int width, int height, ELibDVideoStandard standard) {
+  vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
     InitializeFixedVideoParams(standard, width, height);
     m_State->filter_by(kMaxSizeFilter, vexa::format_within(kMaxSizeRoom, "%d,%d", width, height).text);

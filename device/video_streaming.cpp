@@ -7,6 +7,7 @@
 
 #include "device/driver_state.h"
 #include "media/assembly/codec.h"
+#include "media/frame_chronicle.h"
 #include "runtime/base/text.h"
 #include "transport/failure.h"
 #include "transport/wire/http_request.h"
@@ -24,10 +25,14 @@ constexpr useconds_t kExitPoll = 100000;  // microseconds
 
 }  // namespace
 
-ELibDReturnCode CVexaCommon::StartVideoStreaming() { return m_State->start_video(nullptr); }
+ELibDReturnCode CVexaCommon::StartVideoStreaming() {
+  vexa::Operation operation(*m_State, __func__);
+  return operation.returns(m_State->start_video(nullptr));
+}
 
 ELibDReturnCode CVexaCommon::StartEdgeStorageVideoStreaming(const SLibDEdgeStorageStreamingInfo& info) {
-  return m_State->start_video(&info);
+  vexa::Operation operation(*m_State, __func__);
+  return operation.returns(m_State->start_video(&info));
 }
 
 namespace vexa {
@@ -64,6 +69,8 @@ ELibDReturnCode DriverState::open_live_http(int stream) {
   driver.m_RtpLiveMode = false;
   driver.m_EdgeStoragePlayback = false;
   if (!reset_stream_buffer()) return LIBD_FAILED;
+  ledger.begin_stream(StreamTransport::kHttp);
+  chronicle->begin_stream({}, 0);
   const ELibDReturnCode opened = errors.run([&]() -> Outcome {
     auto socket = camera.open(format_within(kRequestRoom, "/image%d", stream).text);
     set_stream_socket(socket ? socket->release() : -1);
@@ -131,7 +138,9 @@ bool DriverState::allocate_packets() {
   driver.m_RtpPacketBuffer = static_cast<unsigned char*>(std::malloc(PacketRing::kSize));
   if (driver.m_RtpPacketBuffer == nullptr) return false;
   driver.m_RtpPackets.clear();
-  rtp = std::make_unique<RtpReception>(driver.m_RtpPackets, kH264Codec);
+  rtp = std::make_unique<RtpReception>(driver.m_RtpPackets, kH264Codec, ledger.collection());
+  ledger.begin_stream(StreamTransport::kUdp);
+  chronicle->begin_stream({}, 0);
   return true;
 }
 
@@ -165,11 +174,12 @@ void DriverState::take_frame(CVexaCommon::VideoFrameInfo& frame) {
   frame.data = spare_frames.take(frame.capacity);
 }
 
-// The keep-alive waits for its answer up to a second, between two pictures.
+// A keep-alive is awaited while media are received: its answer may take a second, or never come.
 ELibDReturnCode DriverState::read_frame(CVexaCommon::VideoFrameInfo& frame) {
   if (!plays_rtp()) return driver.GetCurrentFrameData(frame);
   const ELibDReturnCode result = driver.GetRtpCurrentVideoFrame(stream_codec(), frame);
-  driver.KeepAlive();
+  look_for_keep_alive();
+  begin_keep_alive();
   return result;
 }
 
@@ -198,12 +208,14 @@ unsigned int CVexaCommon::StreamingThread(void* driver) {
   vexa::DriverState& state = *self->m_State;
   bool wait_key = false;
   do {
+    const vexa::Operation reading(state, __func__);
     VideoFrameInfo frame;
     ELibDReturnCode result = LIBD_TIMEOUT;
     const bool fitted = vexa::within_memory([&] {
       state.take_frame(frame);
       result = state.read_frame(frame);
     });
+    if (!fitted) state.ledger.settle_lost_packet();
     ProcessCurrentFrameData(self, frame, wait_key, fitted ? result : LIBD_TIMEOUT);
     // After a picture from RTP the next read waits for a datagram and for the stop event in one: a wait of its own
     // would cost a wake-up a picture, which is most of what a slow stream costs.
@@ -215,10 +227,11 @@ unsigned int CVexaCommon::StreamingThread(void* driver) {
 }
 
 ELibDReturnCode CVexaCommon::StopVideoStreaming() {
+  vexa::Operation operation(*m_State, __func__);
   {
     const vexa::Guard guard(m_VideoStateLock);
     if (m_StreamSocket == -1) return LIBD_OK;
-    if (m_StopVideoRequested) return LIBD_FAILED;
+    if (m_StopVideoRequested) return operation.returns(LIBD_FAILED);
     m_StopVideoRequested = true;
   }
   // A start in another thread is let finish: what it opens is its own until then.
@@ -229,6 +242,7 @@ ELibDReturnCode CVexaCommon::StopVideoStreaming() {
   } else {
     http_close(m_State->stream_socket());
     m_State->release_stream_buffer();
+    m_State->ledger.end_stream();
     m_State->set_stream_socket(-1);
   }
   m_State->clear_frame_queue();
@@ -245,6 +259,9 @@ ELibDReturnCode CVexaCommon::StopRtpVideoStreaming() {
 }
 
 void CVexaCommon::ReleaseRtpPacketsPtr() {
+  if (m_State->rtp != nullptr) m_State->rtp->collector.discard_all();
+  m_State->ledger.end_stream();
+  m_State->chronicle->end_stream();
   m_State->rtp.reset();
   m_RtpPackets.clear();
   std::free(m_RtpPacketBuffer);

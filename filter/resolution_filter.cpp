@@ -49,7 +49,7 @@ SLibDVideoCodecInfo codec_of(const CodecTable& table, const SizeCriteria& criter
 }  // namespace
 
 struct CResolutionFilterFacade::Criteria {
-  const ModelFamily* family = &vexa::filter::kGeneralFamily;
+  const ModelFamily* family = &vexa::filter::family_of({});
   SizeCriteria sizes{family->largest_moving};
 };
 

@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "command_line/description.h"
 #include "host/commands/command.h"
 #include "host/console/terminal.h"
 
@@ -131,6 +132,7 @@ ExitCode run_command_line(const Invocation& invocation, Terminal& terminal) {
   CLI::App program{kDescription, "vexactl"};
   program.footer(kFooter);
   program.set_version_flag("--version", "vexactl " VEXA_VERSION);
+  command_line::add_help_json(program);
   program.require_subcommand(1);
   std::vector<KnownCommand> commands;
   for (auto& command : all_commands()) {

@@ -1,17 +1,27 @@
 // From the datagrams of an RTP stream to the packets of its next picture.
 #pragma once
 
+#include <chrono>
 #include <functional>
 #include <optional>
 #include <span>
 
 #include "media/assembly/codec.h"
+#include "media/frame_chronicle.h"
 #include "media/rtp_reception.h"
+#include "media/stream_ledger.h"
 #include "runtime/base/result.h"
 #include "transport/socket.h"
 #include "transport/wire/stream_window.h"
 
 namespace vexa {
+
+/// Something that the reader's thread awaits besides media: what becomes readable when it comes (-1: none), and when it
+/// is too late.
+struct Errand {
+  int descriptor;
+  std::chrono::steady_clock::time_point deadline;
+};
 
 /// A picture is a run of packets in the list; a frame is what is assembled of them in a host's buffer.
 ///
@@ -25,9 +35,12 @@ class PictureReader {
     int clock_rate;         ///< ticks a second
     int timeout;            ///< milliseconds that a read may take
     std::function<bool()> is_stopped;
+    bool strict;  ///< takes packets of the camera's address and of the stream's SSRC alone
+    std::optional<Errand> errand = {};  ///< ends the wait for a datagram, with no picture yet
   };
 
-  PictureReader(RtpReception& rtp, Source source) : rtp_(rtp), source_(std::move(source)) {}
+  PictureReader(RtpReception& rtp, StreamLedger& ledger, FrameChronicle& chronicle, Source source)
+      : rtp_(rtp), ledger_(ledger), chronicle_(chronicle), source_(std::move(source)) {}
 
   /// The next picture. None when there is none yet and the stream goes on: packets have come that made no picture, or
   /// it is to end. LIBD_TIMEOUT when no datagram came in time.
@@ -38,9 +51,19 @@ class PictureReader {
 
  private:
   Result<int> receive(int timeout);
+  struct Datagram {
+    std::uint32_t length;
+    std::uint32_t sender;  ///< with strict reception alone
+    StreamLedger::Instant arrival;
+  };
+  void take(const SPacketInfo& packet, const Datagram& datagram);
+  std::optional<StreamLedger::Refusal> refusal_of(const SPacketInfo& packet, const Datagram& datagram) const;
   bool packet_waits(int timeout) const;
+  bool errand_is_due() const;
 
   RtpReception& rtp_;
+  StreamLedger& ledger_;
+  FrameChronicle& chronicle_;
   Source source_;
 };
 

@@ -23,8 +23,8 @@ inline PictureName name_of(const SPacketInfo& first) { return {first.timestamp, 
 
 /// Made anew for every stream and every change of codec; the streaming thread's.
 struct RtpReception {
-  RtpReception(std::vector<SPacketInfo>& packets, const Codec& stream_codec)
-      : codec(stream_codec), collector(packets, stream_codec.rules) {
+  RtpReception(std::vector<SPacketInfo>& packets, const Codec& stream_codec, CollectionCounts& counts)
+      : codec(stream_codec), collector(packets, stream_codec.rules, counts) {
     overwritten.reserve(PacketRing::kMostOverwritten);
   }
 

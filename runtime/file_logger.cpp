@@ -7,6 +7,7 @@
 #include <string_view>
 #include <utility>
 
+#include "runtime/base/result.h"
 #include "runtime/base/sync.h"
 #include "vexa/real_time.h"
 #include "vexa/runtime.h"
@@ -53,10 +54,13 @@ OpenLog open_log(const std::string& name) {
   return file;
 }
 
+// Safe: a logger's end needs memory for its banner alone, which is left out when there is none.
 void close_log(typedHandle* file) {
   if (file == nullptr) return;
   const OpenLog closing(file);
-  write_text(file, local_time("\n%D-%O-%Y %H:%M:%S.%03L\tLogFile Closed\n") + std::string(kBannerRule, '-') + "\n");
+  (void)vexa::within_memory([&] {
+    write_text(file, local_time("\n%D-%O-%Y %H:%M:%S.%03L\tLogFile Closed\n") + std::string(kBannerRule, '-') + "\n");
+  });
 }
 
 /// The name of copy `number` of a file: "dir/Log.txt" and 2 give "dir/Log2.txt"; copy 0 is the file itself.
@@ -103,21 +107,26 @@ CFileLogger::~CFileLogger() { CloseFile(); }
 
 void CFileLogger::SetFileName(const char* name) {
   if (name == nullptr || *name == '\0') return;
-  const vexa::Guard guard(m_FileListLock);
-  m_FileName = name;
+  // Without memory the name stays, as everything does that a logger cannot do.
+  (void)vexa::within_memory([&] {
+    const vexa::Guard guard(m_FileListLock);
+    m_FileName = name;
+  });
 }
 
 // Safe: the lock is held from leaving the old file to having the new one, so that a thread that logs or opens meanwhile
 // neither loses its line nor leaves a share behind.
 void CFileLogger::OpenFile() {
-  const vexa::Guard guard(m_FileListLock);
-  CloseFile();
-  if (JoinFile()) return;
-  OpenLog file = open_log(m_FileName);
-  if (file == nullptr) return;
-  m_FileInfoList.insert_or_assign(m_FileHandleSeed + 1, FileInfo{m_FileName, file.get(), 1});
-  m_FileId = ++m_FileHandleSeed;
-  (void)file.release();  // the list's
+  (void)vexa::within_memory([this] {
+    const vexa::Guard guard(m_FileListLock);
+    CloseFile();
+    if (JoinFile()) return;
+    OpenLog file = open_log(m_FileName);
+    if (file == nullptr) return;
+    m_FileInfoList.insert_or_assign(m_FileHandleSeed + 1, FileInfo{m_FileName, file.get(), 1});
+    m_FileId = ++m_FileHandleSeed;
+    (void)file.release();  // the list's
+  });
 }
 
 bool CFileLogger::JoinFile() {
@@ -158,9 +167,11 @@ void CFileLogger::CycleFiles() {
   const std::uint32_t size = GetFileSize(entry->fileHandle, nullptr);
   if (size == INVALID_FILE_SIZE || size < m_MaxSize * kBytesPerKilobyte) return;
   CycleCloseFile();
-  // Kept: without copies the same file is opened again and grows on; every later line rotates again.
-  int number = m_CopyCount;
-  while (number >= 1 && move_up(entry->fileName, number)) --number;
+  (void)vexa::within_memory([this, entry] {
+    // Kept: without copies the same file is opened again and grows on; every later line rotates again.
+    int number = m_CopyCount;
+    while (number >= 1 && move_up(entry->fileName, number)) --number;
+  });
   CycleOpenFile();
 }
 
@@ -175,7 +186,8 @@ void CFileLogger::CycleCloseFile() {
 void CFileLogger::CycleOpenFile() {
   const vexa::Guard guard(m_FileListLock);
   FileInfo* entry = FindEntry();
-  if (entry != nullptr && entry->fileHandle == nullptr) entry->fileHandle = open_log(entry->fileName).release();
+  if (entry == nullptr || entry->fileHandle != nullptr) return;
+  (void)vexa::within_memory([entry] { entry->fileHandle = open_log(entry->fileName).release(); });
 }
 
 CFileLogger::FileInfo* CFileLogger::FindEntry() {

@@ -16,6 +16,7 @@
 #include <vector>
 
 #include "runtime/base/glob_pattern.h"
+#include "runtime/base/result.h"
 #include "vexa/runtime.h"
 
 namespace {
@@ -180,14 +181,12 @@ int search(std::string_view pattern, int flags, ErrorCallback on_error, pathglob
 int pathglob(const char* pattern, int flags, int (*errfunc)(const char* path, int code), pathglob_t* result) {
   if (result == nullptr) return PATHGLOB_NOSPACE;
   *result = {};
-  try {
-    const int outcome = search(pattern == nullptr ? "" : pattern, flags, errfunc, *result);
-    if (outcome == PATHGLOB_NOSPACE) errno = ENOMEM;
-    return outcome;
-  } catch (const std::bad_alloc&) {
-    errno = ENOMEM;
-    return PATHGLOB_NOSPACE;
-  }
+  int outcome = PATHGLOB_NOSPACE;
+  const bool fitted =
+      vexa::within_memory([&] { outcome = search(pattern == nullptr ? "" : pattern, flags, errfunc, *result); });
+  if (!fitted) outcome = PATHGLOB_NOSPACE;
+  if (outcome == PATHGLOB_NOSPACE) errno = ENOMEM;
+  return outcome;
 }
 
 void pathglobfree(pathglob_t* result) {

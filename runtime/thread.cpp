@@ -8,6 +8,7 @@
 #include <new>
 #include <utility>
 
+#include "runtime/base/result.h"
 #include "runtime/handle.h"
 
 namespace {
@@ -51,13 +52,13 @@ ThreadMap& threads() VEXA_REQUIRES(thread_lock) {
 
 // A map entry made ahead, so that entering a thread that runs already cannot fail. Empty when memory is short.
 ThreadMap::node_type entry_for(ThreadHandle* handle) {
-  try {
+  ThreadMap::node_type entry;
+  const bool fitted = vexa::within_memory([&] {
     ThreadMap single;
     single.emplace(0, handle);
-    return single.extract(single.begin());
-  } catch (const std::bad_alloc&) {
-    return {};
-  }
+    entry = single.extract(single.begin());
+  });
+  return fitted ? std::move(entry) : ThreadMap::node_type();
 }
 
 // The calling thread's handle; null for a thread of other making.

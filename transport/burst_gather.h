@@ -17,6 +17,13 @@ class BurstGather {
   static constexpr std::chrono::microseconds kLongest{2000};
   static constexpr std::chrono::microseconds kShortest{125};
   static constexpr std::chrono::microseconds kFirst{500};
+  static constexpr std::chrono::microseconds kPrompt{250};
+
+  /// The longest nap from here on: kLongest, or kPrompt where a picture's last datagram must not wait.
+  void limit(std::chrono::microseconds longest) {
+    longest_ = longest;
+    nap_ = std::min(nap_, longest);
+  }
 
   /// The thread was woken by a datagram: how long to nap before reading; 0 for not at all.
   std::chrono::microseconds woken() {
@@ -61,10 +68,11 @@ class BurstGather {
       const auto fitting = static_cast<std::uint64_t>(nap_.count()) * kLargeBurst / bytes_;
       nap_ = std::max(std::chrono::microseconds(static_cast<std::chrono::microseconds::rep>(fitting)), kShortest);
     } else if (bytes_ < kSmallBurst) {
-      nap_ = std::min(nap_ + nap_ / 8, kLongest);
+      nap_ = std::min(nap_ + nap_ / 8, longest_);
     }
   }
 
+  std::chrono::microseconds longest_ = kLongest;
   std::chrono::microseconds nap_ = kFirst;
   double taken_at_once_ = 1;
   double taken_after_nap_ = 4;

@@ -29,15 +29,19 @@ std::string loggable(const std::string& reason, const SLibDConnectionInfo& info)
   return masked(masked(reason, as_sent), info.password);
 }
 
-Result<Socket> connect_http(const SLibDConnectionInfo& info) {
-  const ResolvedHost host =
-      info.useProxy ? resolve_host(info.proxyHost, info.proxyPort) : resolve_host(info.host, info.port);
+WaitLimit limit_of(const HttpPeer& peer) { return {peer.connection.timeout, peer.cancels}; }
+
+Result<Socket> connect_http(const HttpPeer& peer) {
+  const SLibDConnectionInfo& info = peer.connection;
+  const ResolvedHost host = info.useProxy ? resolve_host(info.proxyHost, info.proxyPort, peer.cancels)
+                                          : resolve_host(info.host, info.port, peer.cancels);
+  if (peer.cancels.raised()) return kConnectTimedOut;
   // Kept: the resolver's number is shown as a system error; hosts know the texts that this gives.
   if (!host.address) return system_failure(host.error);
   Socket socket = make_socket(SOCK_STREAM);
   if (!socket.valid() || !set_receive_buffer(socket.get(), kReceiveBuffer)) return system_failure();
   if (!make_nonblocking(socket.get())) return system_failure();
-  const int connected = connect_within(socket.get(), *host.address, info.timeout);
+  const int connected = connect_within(socket.get(), *host.address, limit_of(peer));
   if (connected != 1) return wait_failure(connected, kConnectTimedOut);
   if (!make_blocking(socket.get())) return system_failure();
   return socket;
@@ -55,7 +59,7 @@ Result<> send_request(int socket, const HttpPeer& peer, const std::string& path)
 
 Result<> read_status(int socket, const HttpPeer& peer) {
   char header[kHeaderRoom];
-  const auto length = receive_header(socket, header, peer.connection.timeout);
+  const auto length = receive_header(socket, header, limit_of(peer));
   if (!length) return length.failure();
   if (*length == 0) return kNoReason;
   const auto line = parse_status_line({header, static_cast<std::size_t>(*length)}, "HTTP/");
@@ -71,7 +75,7 @@ Result<> read_status(int socket, const HttpPeer& peer) {
 }  // namespace
 
 Result<Socket> open_http(const HttpPeer& peer, const std::string& path) {
-  Result<Socket> socket = connect_http(peer.connection);
+  Result<Socket> socket = connect_http(peer);
   if (!socket) return socket;
   // A path that was cut when it was formatted makes a request that does not fit either, and is refused here.
   const auto sent = send_request(socket->get(), peer, path);
@@ -86,8 +90,7 @@ Result<std::string> inquire(const HttpPeer& peer, const std::string& name, int m
   std::vector<char> bytes(static_cast<std::size_t>(most) + 1);
   auto socket = open_http(peer, format_within(kRequestRoom, "/command/inquiry.cgi?inq=%s", name.c_str()).text);
   if (!socket) return socket.failure();
-  const auto received =
-      receive_all(socket->get(), {bytes.data(), static_cast<std::size_t>(most)}, peer.connection.timeout);
+  const auto received = receive_all(socket->get(), {bytes.data(), static_cast<std::size_t>(most)}, limit_of(peer));
   shutdown_and_close(socket->release());
   if (!received) return received.failure();
   return std::string(bytes.data());

@@ -5,6 +5,7 @@
 
 #include "runtime/base/result.h"
 #include "transport/socket.h"
+#include "transport/wait_budget.h"
 #include "vexa/system_info.h"
 
 namespace vexa {
@@ -24,6 +25,7 @@ class ExchangeLog {
 struct HttpPeer {
   SLibDConnectionInfo connection;
   ExchangeLog& log;
+  Cancels cancels = {};
 };
 
 /// Requests `path` and reads the header of the answer: the non-blocking socket with the body left on it. An answer

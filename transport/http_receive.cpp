@@ -2,13 +2,10 @@
 
 #include <sys/socket.h>
 
-#include <chrono>
 #include <cstdint>
-#include <thread>
 #include <vector>
 
 #include "transport/failure.h"
-#include "transport/wait_budget.h"
 #include "transport/wire/http_answer.h"
 
 namespace vexa {
@@ -18,15 +15,14 @@ constexpr int kHeaderPause = 10;  // milliseconds between two looks at a header 
 constexpr std::size_t kPieceRoom = 4096;
 constexpr std::size_t kEndlessAnswer = std::size_t{32} << 20;
 
-void pause_before_next_look() { std::this_thread::sleep_for(std::chrono::milliseconds(kHeaderPause)); }
-
 }  // namespace
 
-Result<int> receive_header(int socket, std::span<char> room, int timeout) {
-  const int ready = WaitBudget(timeout).wait_readable(socket);
+Result<int> receive_header(int socket, std::span<char> room, WaitLimit limit) {
+  const int ready = WaitBudget(limit).wait_readable(socket);
   if (ready == 0) return 0;
   if (ready != 1) return wait_failure(ready, kReceiveTimedOut);
-  for (int looks_left = timeout / kHeaderPause;; --looks_left) {
+  bool closed = false;
+  for (int looks_left = limit.milliseconds / kHeaderPause;; --looks_left) {
     const ssize_t peeked = recv(socket, room.data(), room.size(), MSG_PEEK);
     if (peeked < 0) return system_failure();
     const std::size_t header = header_length({room.data(), static_cast<std::size_t>(peeked)});
@@ -34,13 +30,13 @@ Result<int> receive_header(int socket, std::span<char> room, int timeout) {
       if (recv(socket, room.data(), header, 0) < 0) return system_failure();
       return static_cast<int>(header);
     }
-    if (looks_left <= 0) return 0;
-    pause_before_next_look();
+    if (looks_left <= 0 || closed || limit.cancels.raised()) return 0;
+    closed = WaitBudget(limit.of(kHeaderPause)).wait_closed(socket) == 1;
   }
 }
 
-Result<int> receive_some(int socket, std::span<char> room, int timeout) {
-  const int ready = WaitBudget(timeout).wait_readable(socket);
+Result<int> receive_some(int socket, std::span<char> room, WaitLimit limit) {
+  const int ready = WaitBudget(limit).wait_readable(socket);
   if (ready == 0) return 0;
   if (ready != 1) return wait_failure(ready, kReceiveTimedOut);
   const ssize_t received = recv(socket, room.data(), room.size(), 0);
@@ -48,8 +44,8 @@ Result<int> receive_some(int socket, std::span<char> room, int timeout) {
   return static_cast<int>(received);
 }
 
-Result<int> receive_all(int socket, std::span<char> room, int timeout) {
-  const WaitBudget budget(timeout);
+Result<int> receive_all(int socket, std::span<char> room, WaitLimit limit) {
+  const WaitBudget budget(limit);
   std::size_t filled = 0;
   while (filled < room.size()) {
     const int ready = budget.wait_readable(socket);
@@ -62,8 +58,8 @@ Result<int> receive_all(int socket, std::span<char> room, int timeout) {
   return static_cast<int>(filled);
 }
 
-Result<int> receive_text(int socket, std::string& text, int length, int timeout) {
-  const WaitBudget budget(timeout);
+Result<int> receive_text(int socket, std::string& text, int length, WaitLimit limit) {
+  const WaitBudget budget(limit);
   const bool until_closed = length <= 0;
   std::vector<char> piece(until_closed ? kPieceRoom : static_cast<std::size_t>(length));
   for (std::int64_t missing = length;;) {

@@ -26,17 +26,19 @@ constexpr std::chrono::milliseconds kPause{kMillisecondsPerTry};
 /// Milliseconds that only waiting uses up: the pauses between the waits do not count.
 class WaitingTime {
  public:
-  explicit WaitingTime(int milliseconds) : left_(std::chrono::milliseconds(milliseconds)) {}
+  explicit WaitingTime(WaitLimit limit) : limit_(limit), left_(std::chrono::milliseconds(limit.milliseconds)) {}
 
   int wait_readable(StoppableSocket source) {
     const auto begin = TryClock::now();
     const auto milliseconds = std::chrono::ceil<std::chrono::milliseconds>(left_).count();
-    const int ready = WaitBudget(static_cast<int>(milliseconds)).wait_readable_unless(source.socket, source.stop);
+    const int ready =
+        WaitBudget(limit_.of(static_cast<int>(milliseconds))).wait_readable_unless(source.socket, source.stop);
     left_ -= std::min(TryClock::now() - begin, left_);
     return ready;
   }
 
  private:
+  const WaitLimit limit_;
   TryClock::duration left_;
 };
 
@@ -51,27 +53,27 @@ Result<> receive_into(StreamWindow& window, int socket) {
 
 }  // namespace
 
-Result<PicturePart> receive_picture_part(int socket, std::span<char> room, int timeout) {
+Result<PicturePart> receive_picture_part(int socket, std::span<char> room, WaitLimit limit) {
   char header[kPartHeaderRoom];
-  const auto header_length = receive_header(socket, header, kPartHeaderWait);
+  const auto header_length = receive_header(socket, header, limit.of(kPartHeaderWait));
   if (!header_length) return header_length.failure();
   if (*header_length == 0) return PicturePart{PicturePart::Kind::kSilence};
   const auto length = announced_length({header, static_cast<std::size_t>(*header_length)});
   if (!length) return kDataLenNotFound;
   const auto wanted = static_cast<std::size_t>(*length);
   if (wanted > room.size()) return PicturePart{PicturePart::Kind::kTooLarge};
-  const auto received = receive_all(socket, room.first(wanted), timeout);
+  const auto received = receive_all(socket, room.first(wanted), limit);
   if (!received) return received.failure();
   if (*received != *length) return kNoReason;
   return PicturePart{PicturePart::Kind::kPicture, *length};
 }
 
-Result<int> receive_metadata_part(int socket, std::span<char> room, int timeout) {
+Result<int> receive_metadata_part(int socket, std::span<char> room, WaitLimit limit) {
   if (room.size() <= kMetadataLength) return kNoReason;
   char header[kPartHeaderRoom];
-  const auto header_length = receive_header(socket, header, kPartHeaderWait);
+  const auto header_length = receive_header(socket, header, limit.of(kPartHeaderWait));
   if (!header_length || *header_length == 0) return header_length;
-  const auto received = receive_all(socket, room.first(kMetadataLength), timeout);
+  const auto received = receive_all(socket, room.first(kMetadataLength), limit);
   if (!received) return received;
   if (*received != kMetadataLength) return kNoReason;
   room[kMetadataLength] = '\0';
@@ -79,10 +81,10 @@ Result<int> receive_metadata_part(int socket, std::span<char> room, int timeout)
 }
 
 Result<int> receive_unit(StoppableSocket source, StreamWindow& window, StartCode code, std::span<unsigned char> room,
-                         int timeout) {
-  WaitingTime waiting(timeout);
+                         WaitLimit limit) {
+  WaitingTime waiting(limit);
   TryClock::duration pause = kFirstPause;
-  for (int tries = timeout / kMillisecondsPerTry; tries > 0; --tries) {
+  for (int tries = limit.milliseconds / kMillisecondsPerTry; tries > 0; --tries) {
     std::size_t length = 0;
     const StreamWindow::Cut cut = window.cut_frame(code, room, length);
     if (cut == StreamWindow::Cut::kFrame) return static_cast<int>(length);

@@ -1,6 +1,8 @@
 #include "transport/interleaved_stream.h"
 
 #include <cerrno>
+#include <iterator>
+#include <utility>
 
 #include "transport/failure.h"
 #include "transport/socket.h"
@@ -19,8 +21,8 @@ Bytes bytes_of(std::span<const char> room) {
 
 }  // namespace
 
-Result<> receive_exactly(int socket, std::span<char> room, int timeout) {
-  const WaitBudget budget(timeout);
+Result<> receive_exactly(int socket, std::span<char> room, WaitLimit limit) {
+  const WaitBudget budget(limit);
   for (std::size_t filled = 0; filled < room.size();) {
     const ssize_t received = receive_waiting(socket, room.data() + filled, room.size() - filled);
     if (received == 0) return kConnectionClosed;
@@ -35,26 +37,33 @@ Result<> receive_exactly(int socket, std::span<char> room, int timeout) {
   return {};
 }
 
-Result<std::optional<InterleavedPacket>> receive_interleaved(int socket, std::span<char> room, int timeout) {
+Result<std::optional<InterleavedPacket>> receive_interleaved(int socket, std::span<char> room, WaitLimit limit) {
   if (room.size() < kLeastPacketRoom) return kInvalidArgument;
-  const int ready = WaitBudget(kPacketWait).wait_readable(socket);
+  const int ready = WaitBudget(limit.of(kPacketWait)).wait_readable(socket);
   if (ready == 0) return std::optional<InterleavedPacket>();
   if (ready != 1) return wait_failure(ready, kReceiveTimedOut);
   char prefix[kInterleavedPrefixSize];
-  if (const auto read = receive_exactly(socket, prefix, timeout); !read) return read.failure();
+  if (const auto read = receive_exactly(socket, prefix, limit); !read) return read.failure();
   const auto length = interleaved_length(bytes_of(prefix));
   if (!length) return kNoDollar;
   char fixed[kRtpHeaderSize];
-  if (const auto read = receive_exactly(socket, fixed, timeout); !read) return read.failure();
+  if (const auto read = receive_exactly(socket, fixed, limit); !read) return read.failure();
   const RtpFront front = rtp_front(static_cast<std::uint8_t>(fixed[0]));
   if (front.version != kRtpVersionNumber) return kRtpVersion;
   // The contributing sources go where the payload will.
-  if (const auto read = receive_exactly(socket, room.first(front.csrc_bytes), timeout); !read) return read.failure();
+  if (const auto read = receive_exactly(socket, room.first(front.csrc_bytes), limit); !read) return read.failure();
+  std::vector<unsigned char> control_front;
+  if (is_control_channel(bytes_of(prefix))) {
+    control_front.assign(std::begin(fixed), std::end(fixed));
+    control_front.insert(control_front.end(), room.begin(),
+                         room.begin() + static_cast<std::ptrdiff_t>(front.csrc_bytes));
+  }
   const auto payload = interleaved_payload(*length, front);
   if (!payload) return kPayloadLength;
-  if (const auto read = receive_exactly(socket, room.first(*payload), timeout); !read) return read.failure();
-  return std::optional(
-      InterleavedPacket{static_cast<int>(*payload), parse_rtp_header(bytes_of(fixed)).value_or(RtpHeader{})});
+  if (const auto read = receive_exactly(socket, room.first(*payload), limit); !read) return read.failure();
+  const Bytes header = bytes_of(fixed);
+  return std::optional(InterleavedPacket{static_cast<int>(*payload), parse_rtp_header(header).value_or(RtpHeader{}),
+                                         source_of(header), std::move(control_front)});
 }
 
 }  // namespace vexa

@@ -4,15 +4,13 @@
 
 #include <algorithm>
 #include <chrono>
-#include <cstdio>
 #include <cstring>
-#include <thread>
 #include <utility>
 
 #include "runtime/base/base64.h"
+#include "runtime/base/deadline.h"
 #include "transport/failure.h"
 #include "transport/tcp_connect.h"
-#include "transport/wait_budget.h"
 #include "transport/wire/http_answer.h"
 #include "transport/wire/http_request.h"
 #include "transport/wire/rtsp_answer.h"
@@ -21,11 +19,13 @@
 namespace vexa {
 namespace {
 
+using Clock = std::chrono::steady_clock;
+
 constexpr int kMediaReceiveBuffer = 524288;
 constexpr int kSharedReceiveBuffer = 131072;  // of a connection that carries media too
 constexpr int kAnswerRoom = 1023;
 constexpr int kMillisecondsPerSecond = 1000;
-constexpr int kKeepAliveAnswerTimeout = 1000;  // milliseconds
+constexpr std::chrono::milliseconds kKeepAliveAnswerTimeout{1000};
 
 constexpr int kRtspOk = 200;
 constexpr int kRtspUnauthorized = 401;
@@ -40,28 +40,46 @@ Socket make_control_socket(int timeout) {
   return control;
 }
 
-Result<> connect_rtsp(const RtspServer& server, int timeout) {
-  const int connected = connect_within(server.socket.get(), server.address, timeout);
+Result<> connect_rtsp(const RtspServer& server, WaitLimit limit) {
+  const int connected = connect_within(server.socket.get(), server.address, limit);
   if (connected != 1) return wait_failure(connected, kConnectTimedOut);
   if (!make_blocking(server.socket.get())) return system_failure();
   return {};
 }
 
-bool send_rtsp(int socket, const std::string& request) {
-  // Kept: the trace shows each request whole, credentials included; support reads it from the host's console.
-  std::printf("send <%s>\n", request.c_str());
-  return send_once(socket, request.data(), request.size());
-}
-
-Result<std::string> receive_accepted(int socket, int timeout) {
+Result<std::string> receive_accepted(int socket, WaitLimit limit) {
   char text[kAnswerRoom];
-  const auto length = receive_rtsp_answer(socket, text, timeout);
+  const auto length = receive_rtsp_answer(socket, text, limit);
   if (!length) return length.failure();
   std::string answer(text, static_cast<std::size_t>(*length));
   const auto line = parse_status_line(answer, "RTSP/");
   if (!line) return kStatusNotFound;
   if (line->status == kRtspOk) return answer;
   return Failure{line->status == kRtspUnauthorized ? LIBD_UNAUTHORIZED : LIBD_FAILED, line->reason};
+}
+
+/// As receive_rtsp_answer of one look, in steps that do not wait: what came of it, none while it is not known.
+std::optional<Result<>> take_keep_alive_answer(int socket, AwaitedAnswer& awaited) {
+  const bool too_late = Clock::now() >= awaited.give_up;
+  if (awaited.begun) {
+    if (!too_late && WaitBudget(0).wait_closed(socket) == 0) return std::nullopt;
+    return kReceiveTimedOut;
+  }
+  const int ready = WaitBudget(0).wait_readable(socket);
+  if (ready < 0) return system_failure();
+  if (ready == 0 && !too_late) return std::nullopt;
+  if (ready == 0) return kReceiveTimedOut;
+  char room[kAnswerRoom];
+  const ssize_t peeked = recv(socket, room, sizeof room, MSG_PEEK);
+  if (peeked < 0) return system_failure();
+  const auto length = static_cast<std::size_t>(peeked);
+  if (!rtsp_header_complete({room, length}, 0)) {
+    awaited.begun = true;
+    awaited.give_up = Clock::now() + kKeepAliveAnswerTimeout;
+    return std::nullopt;
+  }
+  if (recv(socket, room + length, sizeof room - length, 0) < 0) return system_failure();
+  return Result<>();
 }
 
 Result<int> clock_rate_of(const std::string& description) {
@@ -91,13 +109,13 @@ bool take_range_clock(std::string_view text, StreamClock clock) {
 // Kept: every look is appended to the one before, and the answer is read after the last look, as far as there is room.
 // An answer that comes in one piece and fills no more than half the buffer stands whole at the buffer's beginning; of a
 // longer one, or one that came in pieces, only a part is seen.
-Result<int> receive_rtsp_answer(int socket, std::span<char> room, int timeout) {
-  const int ready = WaitBudget(timeout).wait_readable(socket);
+Result<int> receive_rtsp_answer(int socket, std::span<char> room, WaitLimit limit) {
+  const int ready = WaitBudget(limit).wait_readable(socket);
   if (ready != 1) return wait_failure(ready, kReceiveTimedOut);
   // Safe: nothing that stood in the buffer before is taken for the camera's.
   std::fill(room.begin(), room.end(), '\0');
   // Kept: one look a second, for whole seconds; a time-out below a second sees no answer.
-  const int looks = timeout / kMillisecondsPerSecond;
+  const int looks = limit.milliseconds / kMillisecondsPerSecond;
   std::size_t filled = 0;
   int looked = 0;
   while (looked < looks) {
@@ -106,7 +124,8 @@ Result<int> receive_rtsp_answer(int socket, std::span<char> room, int timeout) {
     const std::size_t latest = std::exchange(filled, filled + static_cast<std::size_t>(peeked));
     if (rtsp_header_complete({room.data(), filled}, latest)) break;
     ++looked;
-    std::this_thread::sleep_for(std::chrono::seconds(1));
+    // The looks that are left see what is there when the peer has closed, and end soon.
+    (void)WaitBudget(limit.of(kMillisecondsPerSecond)).wait_closed(socket);
   }
   if (looked == looks) return kReceiveTimedOut;
   const ssize_t received = recv(socket, room.data() + filled, room.size() - filled, 0);
@@ -129,11 +148,18 @@ Result<int> bind_media_socket(int socket) {
   return ntohs(address.sin_port);
 }
 
-Result<RtspServer> RtspSession::begin(const std::string& host, int port, int timeout) {
+// Kept: the trace shows each request whole, credentials included; support reads it from the host's console.
+bool RtspSession::send(int socket, const std::string& request) {
+  trace_.write("send <" + request + ">", fields_.credentials);
+  return send_once(socket, request.data(), request.size());
+}
+
+Result<RtspServer> RtspSession::begin(const std::string& host, int port, WaitLimit limit) {
   fields_.cseq = 0;
-  const ResolvedHost resolved = resolve_host(host, port);
+  const ResolvedHost resolved = resolve_host(host, port, limit.cancels);
+  if (limit.cancels.raised()) return kConnectTimedOut;
   if (!resolved.address) return system_failure(resolved.error);
-  RtspServer server{make_control_socket(timeout), *resolved.address};
+  RtspServer server{make_control_socket(limit.milliseconds), *resolved.address};
   if (!server.socket.valid()) return system_failure();
   return server;
 }
@@ -141,7 +167,8 @@ Result<RtspServer> RtspSession::begin(const std::string& host, int port, int tim
 Result<int> RtspSession::open(const RtspServer& server, const Opening& opening) {
   const SLibDConnectionInfo& info = opening.connection;
   if (opening.media_port == kInterleaved) set_receive_buffer(server.socket.get(), kSharedReceiveBuffer);
-  if (const auto connected = connect_rtsp(server, info.timeout); !connected) return connected.failure();
+  if (const auto connected = connect_rtsp(server, {info.timeout, opening.cancels}); !connected)
+    return connected.failure();
   socket_ = server.socket.get();
   const std::string encoded = base64_encode(joined_credentials(info.userName, info.password));
   std::memcpy(fields_.credentials, encoded.c_str(), encoded.size() + 1);
@@ -159,8 +186,9 @@ Result<int> RtspSession::open(const RtspServer& server, const Opening& opening) 
 
 Result<std::string> RtspSession::exchange(const Formatted& request, const Opening& opening) {
   if (request.cut) return kUrlTooLong;
-  if (!send_rtsp(socket_, request.text)) return system_failure();
-  return receive_accepted(socket_, opening.connection.timeout);
+  ++requests_;
+  if (!send(socket_, request.text)) return system_failure();
+  return receive_accepted(socket_, {opening.connection.timeout, opening.cancels});
 }
 
 Result<> RtspSession::take_clocks(const std::string& description, const Opening& opening) const {
@@ -185,31 +213,44 @@ Result<int> RtspSession::set_up(const Opening& opening) {
   return *number;
 }
 
-Result<> RtspSession::keep_alive(int socket) {
+AwaitedAnswer RtspSession::send_keep_alive(int socket) {
   const RtspHead head{fields_.url, ++fields_.cseq, fields_.credentials};
   const Formatted request = rtsp_get_parameter(head, fields_.session);
-  const bool sent = send_rtsp(socket, request.text);
-  std::puts(sent ? "successfully sending getparameter" : "error sending getparameter");
-  char answer[kAnswerRoom];
-  const auto received = receive_rtsp_answer(socket, answer, kKeepAliveAnswerTimeout);
-  if (!received) {
-    std::puts("error receiving getparameter");
-    return received.failure();
-  }
-  // Kept: a keep-alive that is too long is sent cut; the text of the error ends in a line break, which hosts compare.
-  if (request.cut) return kKeepAliveTooLong;
-  return {};
+  const bool sent = send(socket, request.text);
+  trace_.write(sent ? "successfully sending getparameter" : "error sending getparameter", fields_.credentials);
+  return {Clock::now() + kKeepAliveAnswerTimeout, false, request.cut};
 }
 
-Result<> RtspSession::tear_down(int socket, int timeout) {
+std::optional<Result<>> RtspSession::keep_alive_outcome(int socket, AwaitedAnswer& awaited) {
+  auto taken = take_keep_alive_answer(socket, awaited);
+  if (!taken) return std::nullopt;
+  if (!*taken) {
+    trace_.write("error receiving getparameter", fields_.credentials);
+    return taken;
+  }
+  // Kept: a keep-alive that is too long is sent cut; the text of the error ends in a line break, which hosts compare.
+  if (awaited.request_cut) return kKeepAliveTooLong;
+  return taken;
+}
+
+Result<> RtspSession::wait_for_keep_alive(int socket, AwaitedAnswer& awaited, Cancels cancels) {
+  for (;;) {
+    if (cancels.raised()) awaited.give_up = {};
+    if (auto outcome = keep_alive_outcome(socket, awaited)) return *std::move(outcome);
+    const WaitBudget budget({milliseconds_until(awaited.give_up), cancels});
+    (void)(awaited.begun ? budget.wait_closed(socket) : budget.wait_readable(socket));
+  }
+}
+
+Result<> RtspSession::tear_down(int socket, WaitLimit limit) {
   const RtspHead head{fields_.url, ++fields_.cseq, fields_.credentials};
   const Formatted request = rtsp_teardown(head, fields_.session);
   // Kept: a text that is too long is sent cut, for the camera to refuse. The answer is read whatever came before, and
   // the last failure is the one that is reported.
   Result<> result;
   if (request.cut) result = kUrlTooLong;
-  if (!send_rtsp(socket, request.text)) result = system_failure();
-  const auto answer = receive_accepted(socket, timeout);
+  if (!send(socket, request.text)) result = system_failure();
+  const auto answer = receive_accepted(socket, limit);
   if (!answer) return answer.failure();
   return result;
 }

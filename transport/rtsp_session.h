@@ -3,7 +3,9 @@
 
 #include <netinet/in.h>
 
+#include <chrono>
 #include <cstdint>
+#include <optional>
 #include <span>
 #include <string>
 #include <string_view>
@@ -11,6 +13,7 @@
 #include "runtime/base/result.h"
 #include "runtime/base/text.h"
 #include "transport/socket.h"
+#include "transport/wait_budget.h"
 #include "vexa/system_info.h"
 
 namespace vexa {
@@ -29,7 +32,8 @@ struct StreamClock {
 bool take_range_clock(std::string_view text, StreamClock clock);
 
 /// Takes an answer's header off the socket into `room`, and of what follows as much as has come: its length.
-Result<int> receive_rtsp_answer(int socket, std::span<char> room, int timeout);
+/// Once the peer has closed, the wait is over: no answer can come.
+Result<int> receive_rtsp_answer(int socket, std::span<char> room, WaitLimit limit);
 
 /// Binds a datagram socket to a port of its own: the port. The socket stays the caller's, also on failure.
 Result<int> bind_media_socket(int socket);
@@ -46,8 +50,25 @@ struct RtspServer {
   sockaddr_in address;
 };
 
+/// A keep-alive's answer that has not come yet.
+struct AwaitedAnswer {
+  std::chrono::steady_clock::time_point give_up;
+  bool begun = false;        ///< a part of it was there at the look
+  bool request_cut = false;  ///< the request did not fit and was sent cut
+};
+
+/// Takes what a session traces: each request, and how the keep-alives went. Used by the thread that owns the session.
+class RequestTrace {
+ public:
+  /// `line` has no line break at its end; a request has those of the protocol. It may hold `credentials`.
+  virtual void write(const std::string& line, const char* credentials) = 0;
+
+ protected:
+  ~RequestTrace() = default;
+};
+
 /// Makes the requests of one session. Its state is in fields of its owner, which outlive it; used by the thread that
-/// owns them. Every request is traced to standard output.
+/// owns them. Every request is traced.
 class RtspSession {
  public:
   struct Fields {
@@ -57,10 +78,10 @@ class RtspSession {
     const int& session;
   };
 
-  explicit RtspSession(Fields fields) : fields_(fields) {}
+  RtspSession(Fields fields, RequestTrace& trace) : fields_(fields), trace_(trace) {}
 
-  /// What every open begins with. `timeout` in milliseconds is for single reads and sends, in whole seconds.
-  Result<RtspServer> begin(const std::string& host, int port, int timeout);
+  /// What every open begins with. The limit is for single reads and sends, in whole seconds.
+  Result<RtspServer> begin(const std::string& host, int port, WaitLimit limit);
 
   struct Opening {
     const SLibDConnectionInfo& connection;
@@ -68,25 +89,37 @@ class RtspSession {
     int scale;       ///< of the playback
     int media_port;  ///< where RTP goes, or kInterleaved
     StreamClock clock;
+    Cancels cancels = {};
   };
 
   /// Connects, describes, sets up and plays: the session's number. A description without a range clock is refused
   /// inside the connection and taken over UDP.
   Result<int> open(const RtspServer& server, const Opening& opening);
 
-  /// One GET_PARAMETER, whose answer is taken off the socket and not read.
-  Result<> keep_alive(int socket);
+  /// Sends one GET_PARAMETER, whose answer is awaited from then on.
+  AwaitedAnswer send_keep_alive(int socket);
+  /// What came of the keep-alive: none while its answer is awaited. Takes the answer off the socket and does not read
+  /// it. Waits for nothing.
+  std::optional<Result<>> keep_alive_outcome(int socket, AwaitedAnswer& awaited);
+  /// The same, once it is known; a cancel counts as an answer that has not come in time.
+  Result<> wait_for_keep_alive(int socket, AwaitedAnswer& awaited, Cancels cancels = {});
 
-  /// One TEARDOWN. `timeout` is that of the answer.
-  Result<> tear_down(int socket, int timeout);
+  /// One TEARDOWN. The limit is that of the answer.
+  Result<> tear_down(int socket, WaitLimit limit);
+
+  /// Requests that were sent, or tried to be.
+  std::uint64_t requests() const { return requests_; }
 
  private:
+  bool send(int socket, const std::string& request);
   Result<std::string> exchange(const Formatted& request, const Opening& opening);
   Result<> take_clocks(const std::string& description, const Opening& opening) const;
   Result<int> set_up(const Opening& opening);
 
   Fields fields_;
+  RequestTrace& trace_;
   int socket_ = -1;  ///< of the session being opened
+  std::uint64_t requests_ = 0;
 };
 
 }  // namespace vexa

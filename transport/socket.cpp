@@ -1,6 +1,7 @@
 #include "transport/socket.h"
 
 #include <fcntl.h>
+#include <netinet/in.h>
 #include <sys/socket.h>
 #include <unistd.h>
 
@@ -29,6 +30,17 @@ ssize_t receive_waiting(int socket, char* buffer, std::size_t length) {
   do {
     count = recv(socket, buffer, length, MSG_DONTWAIT);
   } while (count < 0 && errno == EINTR);
+  return count;
+}
+
+ssize_t receive_waiting_from(int socket, char* buffer, std::size_t length, std::uint32_t& sender) {
+  sockaddr_in address{};
+  ssize_t count = 0;
+  do {
+    socklen_t size = sizeof address;
+    count = recvfrom(socket, buffer, length, MSG_DONTWAIT, reinterpret_cast<sockaddr*>(&address), &size);
+  } while (count < 0 && errno == EINTR);
+  sender = address.sin_family == AF_INET ? address.sin_addr.s_addr : 0;
   return count;
 }
 

@@ -4,6 +4,7 @@
 #include <sys/types.h>
 
 #include <cstddef>
+#include <cstdint>
 #include <utility>
 
 namespace vexa {
@@ -39,6 +40,9 @@ bool send_once(int socket, const char* bytes, std::size_t length);
 
 /// What waits at the socket, one read; -1 with errno, EAGAIN when nothing does. A signal does not end it.
 ssize_t receive_waiting(int socket, char* buffer, std::size_t length);
+
+/// The same for a datagram, with the IPv4 address that sent it, in network order; 0 where it has none.
+ssize_t receive_waiting_from(int socket, char* buffer, std::size_t length, std::uint32_t& sender);
 
 /// Shuts the socket down both ways and closes it; errors and -1 are passed over.
 void shutdown_and_close(int socket);

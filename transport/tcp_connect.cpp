@@ -1,30 +1,19 @@
 #include "transport/tcp_connect.h"
 
 #include <arpa/inet.h>
-#include <netdb.h>
 #include <sys/socket.h>
 
 #include <cerrno>
-#include <cstdint>
-#include <cstring>
 
-#include "transport/wait_budget.h"
+#include "transport/name_lookup.h"
 
 namespace vexa {
 
-ResolvedHost resolve_host(const std::string& host, int port) {
-  hostent entry{};
-  hostent* found = nullptr;
-  char work[1024];
-  ResolvedHost resolved;
-  const int result = gethostbyname_r(host.c_str(), &entry, work, sizeof work, &found, &resolved.error);
-  if (result != 0 || found == nullptr || found->h_addr_list[0] == nullptr) return resolved;
-  sockaddr_in address{};
-  address.sin_family = AF_INET;
-  address.sin_port = htons(static_cast<std::uint16_t>(port));
-  std::memcpy(&address.sin_addr, found->h_addr_list[0], sizeof address.sin_addr);
-  resolved.address = address;
-  return resolved;
+ResolvedHost resolve_host(const std::string& host, int port, Cancels cancels) {
+  in_addr number{};
+  const bool is_name = inet_aton(host.c_str(), &number) == 0;
+  return is_name && (cancels.call != nullptr || cancels.token != nullptr) ? look_up_beside(host, port, cancels)
+                                                                          : look_up(host, port);
 }
 
 Socket make_socket(int type) { return Socket(socket(AF_INET, type | SOCK_CLOEXEC, 0)); }
@@ -33,11 +22,11 @@ bool set_receive_buffer(int socket, int bytes) {
   return setsockopt(socket, SOL_SOCKET, SO_RCVBUF, &bytes, sizeof bytes) == 0;
 }
 
-int connect_within(int socket, const sockaddr_in& address, int timeout) {
+int connect_within(int socket, const sockaddr_in& address, WaitLimit limit) {
   const int result = connect(socket, reinterpret_cast<const sockaddr*>(&address), sizeof address);
   if (result != 0 && errno != EINPROGRESS) return -1;
   // Kept: a connection refused during the wait counts as made; hosts know the text that the first send then gives.
-  return WaitBudget(timeout).wait_writable(socket);
+  return WaitBudget(limit).wait_writable(socket);
 }
 
 }  // namespace vexa

@@ -4,18 +4,13 @@
 #include <fmt/format.h>
 #include <unistd.h>
 
-#include <array>
-#include <cerrno>
-#include <cstdio>
-#include <string>
+#include <string_view>
+#include <utility>
 
 #include "host/base/printable.h"
 
 namespace vexa::host {
 namespace {
-
-// The driver's requests are at most this long; a longer line is shown in pieces.
-constexpr std::size_t kLongestLine = 4096;
 
 // For reading only: writing to a standard output that was closed must still fail.
 bool open_standard_descriptors() {
@@ -40,52 +35,17 @@ UniqueFd take_standard_output() {
   return results;
 }
 
-std::unique_ptr<DriverTrace> DriverTrace::start(Terminal& terminal, Redactor redactor) {
-  int ends[2];
-  if (pipe2(ends, O_CLOEXEC) != 0) return nullptr;
-  UniqueFd lines(ends[0]);
-  const UniqueFd entry(ends[1]);
-  if (!point_standard_output_at(entry.get())) return nullptr;
-  // Lines appear when they are printed, not when a block is full.
-  if (std::setvbuf(stdout, nullptr, _IOLBF, BUFSIZ) != 0) return nullptr;
-  return std::unique_ptr<DriverTrace>(new DriverTrace(std::move(lines), terminal, std::move(redactor)));
-}
-
-DriverTrace::DriverTrace(UniqueFd lines, Terminal& terminal, Redactor redactor)
-    : lines_(std::move(lines)),
-      terminal_(terminal),
-      redactor_(std::move(redactor)),
-      thread_([this] { show_lines(); }) {}
-
-DriverTrace::~DriverTrace() {
-  std::fflush(stdout);
-  silence_standard_output();  // closes the pipe's last entry, which ends the thread
-  thread_.join();
-}
-
-void DriverTrace::show_lines() {
-  std::string pending;
-  const auto show = [&](std::size_t length) {
-    std::string_view line(pending.data(), length);
-    if (line.ends_with('\r')) line.remove_suffix(1);
-    terminal_.say(fmt::format("driver: {}", printable(redactor_(line))));
+std::function<void(const char*)> shown_trace(Terminal& terminal, Redactor redactor) {
+  return [&terminal, redactor = std::move(redactor)](const char* text) {
+    for (std::string_view rest = text;;) {
+      const std::size_t end = rest.find('\n');
+      std::string_view line = rest.substr(0, end);
+      if (line.ends_with('\r')) line.remove_suffix(1);
+      terminal.say(fmt::format("driver: {}", printable(redactor(line))));
+      if (end == std::string_view::npos) return;
+      rest.remove_prefix(end + 1);
+    }
   };
-  std::array<char, 1024> piece{};
-  for (;;) {
-    const ssize_t count = read(lines_.get(), piece.data(), piece.size());
-    if (count < 0 && errno == EINTR) continue;
-    if (count <= 0) break;
-    pending.append(piece.data(), static_cast<std::size_t>(count));
-    for (std::size_t end = pending.find('\n'); end != std::string::npos; end = pending.find('\n')) {
-      show(end);
-      pending.erase(0, end + 1);
-    }
-    if (pending.size() > kLongestLine) {
-      show(pending.size());
-      pending.clear();
-    }
-  }
-  if (!pending.empty()) show(pending.size());
 }
 
 }  // namespace vexa::host

@@ -1,11 +1,8 @@
-// The driver traces its RTSP requests, credentials included, on standard output. vexactl's own output must hold
-// neither.
+// What a driver traces of its RTSP sessions, on standard error; and standard output kept for vexactl's results.
 #ifndef HOST_ACCESS_DRIVER_TRACE_H_
 #define HOST_ACCESS_DRIVER_TRACE_H_
 
-#include <memory>
-#include <optional>
-#include <thread>
+#include <functional>
 
 #include "host/access/redactor.h"
 #include "host/base/unique_fd.h"
@@ -13,30 +10,13 @@
 
 namespace vexa::host {
 
-// Takes descriptor 1 away from the driver, which then writes to /dev/null, and returns what it was for the results of
+// Takes descriptor 1 away from the libraries, which then write to /dev/null, and returns what it was for the results of
 // vexactl. Standard descriptors that are closed are opened on /dev/null first, so that no socket takes their numbers.
 // Call it once, before anything is printed. Invalid when the system refuses, with errno set.
 [[nodiscard]] UniqueFd take_standard_output();
 
-// While it lives, the driver's trace is shown on standard error, line by line, redacted.
-// Owned by the command that asked for it. Its own thread reads the lines; made and ended by the main thread.
-class DriverTrace {
- public:
-  // Null when the system refuses, with errno set.
-  [[nodiscard]] static std::unique_ptr<DriverTrace> start(Terminal& terminal, Redactor redactor);
-  ~DriverTrace();
-  DriverTrace(const DriverTrace&) = delete;
-  DriverTrace& operator=(const DriverTrace&) = delete;
-
- private:
-  DriverTrace(UniqueFd lines, Terminal& terminal, Redactor redactor);
-  void show_lines();
-
-  UniqueFd lines_;
-  Terminal& terminal_;
-  const Redactor redactor_;
-  std::thread thread_;
-};
+// Shows a driver's trace on standard error, line by line, redacted. The terminal outlives the driver.
+[[nodiscard]] std::function<void(const char*)> shown_trace(Terminal& terminal, Redactor redactor);
 
 }  // namespace vexa::host
 

@@ -3,8 +3,7 @@
 #include <fmt/format.h>
 
 #include <CLI/CLI.hpp>
-#include <cerrno>
-#include <system_error>
+#include <memory>
 
 #include "host/cgi_log/cgi_log.h"
 
@@ -13,11 +12,6 @@ namespace {
 
 constexpr int kLongestTimeout = 600000;
 constexpr int kMostStreams = 16;
-
-Problem out_of_descriptors() {
-  return {ExitCode::kUsage, fmt::format("cannot show the driver's trace: {}", std::generic_category().message(errno)),
-          "Leave --trace out, or raise the limit of open files."};
-}
 
 }  // namespace
 
@@ -72,18 +66,13 @@ Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal)
   if (!address) return fail(address.error());
   const Result<Credentials> credentials = load_credentials(options.credentials);
   if (!credentials) return fail(credentials.error());
-  const CameraConnection connection{*address, *credentials, options.timeout_ms, options.transport, options.cgi_log};
+  CameraConnection connection{*address, *credentials, options.timeout_ms, options.transport, options.cgi_log};
   if (const auto problem = check_name(connection.address)) return fail(*problem);
   if (connection.cgi_log) {
     if (const auto problem = check_cgi_log_target(*connection.cgi_log)) return fail(*problem);
   }
-  OpenCamera camera{connection.address, nullptr, nullptr};
-  if (options.trace) {
-    camera.trace = DriverTrace::start(terminal, Redactor(connection.credentials));
-    if (!camera.trace) return fail(out_of_descriptors());
-  }
-  camera.driver = std::make_unique<LiveCamera>(connection);
-  return camera;
+  if (options.trace) connection.trace = shown_trace(terminal, Redactor(connection.credentials));
+  return OpenCamera{connection.address, std::make_unique<LiveCamera>(connection)};
 }
 
 }  // namespace vexa::host

@@ -46,7 +46,6 @@ void add_model_options(CLI::App& command, ModelOptions& options, const char* con
 // A driver that knows its camera; no camera has been contacted yet.
 struct OpenCamera {
   CameraAddress address;
-  std::unique_ptr<DriverTrace> trace;  // outlives the driver, which traces to its end
   std::unique_ptr<LiveCamera> driver;
 };
 

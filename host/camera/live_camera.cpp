@@ -4,6 +4,7 @@
 #include <sys/mman.h>
 
 #include <algorithm>
+#include <atomic>
 #include <cstring>
 #include <string_view>
 
@@ -11,12 +12,20 @@
 #include "host/base/number_text.h"
 #include "host/base/printable.h"
 #include "host/base/unique_fd.h"
+#include "host/console/interrupt.h"
+#include "vexa/cancel.h"
+#include "vexa/failure.h"
+#include "vexa/trace.h"
 
 namespace vexa::host {
 namespace {
 
 constexpr int kOverHttp = 0;
 constexpr int kOverRtsp = 1;
+constexpr int kLastCallTimeout = 300;  // milliseconds, of which a request may take two
+
+std::atomic<CancelToken*> cancelled_by_signal{nullptr};
+static_assert(std::atomic<CancelToken*>::is_always_lock_free);
 
 // The driver opens its CGI log with every connection; unnamed, it would be a file in the working folder. This one is in
 // memory and gone with the driver. /dev/null would not do: the driver syncs the log to disk and reports a failure
@@ -29,11 +38,18 @@ class PrivateLog {
   UniqueFd memory_{memfd_create("vexactl-cgi-log", MFD_CLOEXEC)};
 };
 
-bool mentions_unauthorized(const std::string& text) { return strcasestr(text.c_str(), "unauthorized") != nullptr; }
+// Cancelled by Ctrl-C. Never destroyed, so that a signal finds it until the process has gone.
+const CancelToken& interruption() {
+  static CancelToken& token = [&]() -> CancelToken& {
+    auto* made = new CancelToken;
+    cancelled_by_signal = made;
+    Interrupt::also([] { cancelled_by_signal.load()->Cancel(); });
+    return *made;
+  }();
+  return token;
+}
 
-}  // namespace
-
-void introduce(CLibraryDevice& device, const CameraConnection& connection) {
+void connect(CLibraryDevice& device, const CameraConnection& connection, int timeout_ms) {
   const PrivateLog unshown;
   device.SetCGILogPath(connection.cgi_log.value_or(unshown.path()).c_str());
   device.SetCGILogLevel(connection.cgi_log.has_value());
@@ -41,10 +57,28 @@ void introduce(CLibraryDevice& device, const CameraConnection& connection) {
   info.streamTransport = connection.transport == VideoTransport::kHttp ? kOverHttp : kOverRtsp;
   info.host = connection.address.host;
   info.port = connection.address.port;
-  info.timeout = connection.timeout_ms;
+  info.timeout = timeout_ms;
   info.userName = connection.credentials.user;
   info.password = connection.credentials.password;
   device.SetCurrentConnectionInfo(info);
+}
+
+bool mentions_unauthorized(const std::string& text) { return strcasestr(text.c_str(), "unauthorized") != nullptr; }
+
+}  // namespace
+
+void introduce(CLibraryDevice& device, const CameraConnection& connection) {
+  if (auto* driver = dynamic_cast<CVexaCommon*>(&device)) {
+    SetTrace(*driver, connection.trace);
+    SetCancelToken(*driver, interruption());
+  }
+  connect(device, connection, connection.timeout_ms);
+}
+
+void allow_last_call(CLibraryDevice& device, const CameraConnection& connection) {
+  if (!Interrupt::requested()) return;
+  if (auto* driver = dynamic_cast<CVexaCommon*>(&device)) RemoveCancelToken(*driver);
+  connect(device, connection, std::min(connection.timeout_ms, kLastCallTimeout));
 }
 
 LiveCamera::LiveCamera(const CameraConnection& connection) : connection_(connection) { introduce(*this, connection); }
@@ -95,7 +129,15 @@ bool left_a_reason(CLibraryDevice& device) {
   return !text.empty();
 }
 
+bool was_interrupted(CLibraryDevice& device) {
+  auto* driver = dynamic_cast<CVexaCommon*>(&device);
+  return Interrupt::requested() && driver != nullptr && LastFailure(*driver).cancelled;
+}
+
+Problem interrupted() { return {ExitCode::kInterrupted, "interrupted while the camera was asked", ""}; }
+
 Problem explain_failure(CLibraryDevice& device, ELibDReturnCode result, const CameraConnection& connection) {
+  if (was_interrupted(device)) return interrupted();
   std::string text;
   device.GetLatestErrorText(text);
   const std::string why = text.empty() ? "no answer" : printable(Redactor(connection.credentials)(text));

@@ -2,6 +2,7 @@
 #ifndef HOST_CAMERA_LIVE_CAMERA_H_
 #define HOST_CAMERA_LIVE_CAMERA_H_
 
+#include <functional>
 #include <optional>
 #include <string>
 
@@ -21,14 +22,25 @@ struct CameraConnection {
   int timeout_ms = 0;
   VideoTransport transport = VideoTransport::kUdp;
   std::optional<std::string> cgi_log = {};  // the file that requests and statuses are appended to
+  // Takes what the driver traces of RTSP.
+  std::function<void(const char* text)> trace = [](const char*) {};
 };
 
-// Gives a driver its camera's address and the file of its CGI log. Contacts no camera.
+// Gives a driver its camera's address, the file of its CGI log and the receiver of its trace, and lets an interruption
+// end what waits for the camera. Contacts no camera.
 void introduce(CLibraryDevice& device, const CameraConnection& connection);
+
+// Before a call that leaves the camera as it was found: after an interruption it still reaches the camera, and waits
+// for it no longer than a moment.
+void allow_last_call(CLibraryDevice& device, const CameraConnection& connection);
 
 // Puts a driver's latest failure into words; `result` is what the failed operation returned.
 [[nodiscard]] Problem explain_failure(CLibraryDevice& device, ELibDReturnCode result,
                                       const CameraConnection& connection);
+
+// Whether Ctrl-C, and not the camera, ended the operation that failed last; and how that is reported.
+[[nodiscard]] bool was_interrupted(CLibraryDevice& device);
+[[nodiscard]] Problem interrupted();
 
 // Whether the latest failure has a text: a failed exchange leaves one, an answer that lacks a key none.
 [[nodiscard]] bool left_a_reason(CLibraryDevice& device);

@@ -77,6 +77,7 @@ Result<LiveCamera*> ModelCamera::live() const {
 Problem ModelCamera::explain(ELibDReturnCode result) const { return explain_failure(*device_, result, connection_); }
 
 Problem ModelCamera::explain_change(const std::string& what, ELibDReturnCode result) const {
+  if (was_interrupted(*device_)) return interrupted();
   const std::string camera = to_string(connection_.address);
   if (result == LIBD_NOT_SUPPORTED) {
     return {ExitCode::kUsage, fmt::format("cameras of model {} have no {}", printable(profile_.model), what),

@@ -32,6 +32,9 @@ class ModelCamera {
   // it.
   [[nodiscard]] Result<LiveCamera*> live() const;
 
+  // As vexa::host::allow_last_call.
+  void allow_last_call() const { vexa::host::allow_last_call(*device_, connection_); }
+
   // Puts a failure to read from the camera into words.
   [[nodiscard]] Problem explain(ELibDReturnCode result) const;
   // Puts a failure to change `what` on a reachable camera into words.
@@ -39,14 +42,10 @@ class ModelCamera {
 
  private:
   ModelCamera(OpenCamera asked, int stream)
-      : trace_(std::move(asked.trace)),
-        live_(std::move(asked.driver)),
-        connection_(live_->connection()),
-        stream_(stream) {}
+      : live_(std::move(asked.driver)), connection_(live_->connection()), stream_(stream) {}
 
   [[nodiscard]] std::optional<Problem> find_profile(const ModelOptions& options, const std::string& model);
 
-  std::unique_ptr<DriverTrace> trace_;  // outlives the drivers
   std::unique_ptr<LiveCamera> live_;
   CameraConnection connection_;
   int stream_;

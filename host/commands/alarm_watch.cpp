@@ -22,6 +22,7 @@ ExitCode AlarmWatch::run() {
   } else {
     end(follow_alarms());
   }
+  camera_.allow_last_call();
   camera_.device().StopIoStreaming();
   if (failure_) return terminal_.report(*failure_);
   return Interrupt::requested() ? ExitCode::kInterrupted : ExitCode::kOk;

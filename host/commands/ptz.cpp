@@ -56,8 +56,10 @@ ExitCode run_move(const ModelCamera& camera, Terminal& terminal, const Move& mov
   if (!seconds) return report_change(camera, terminal, move.what, move.start(camera.device()));
   Interrupt::finish_orderly();  // a started move is stopped also after Ctrl-C
   const ELibDReturnCode started = move.start(camera.device());
-  if (started != LIBD_OK) return report_change(camera, terminal, move.what, started);
+  // Interrupted in the middle, the camera may move all the same.
+  if (started != LIBD_OK && !Interrupt::requested()) return report_change(camera, terminal, move.what, started);
   if (!Interrupt::requested()) Interrupt::wait(std::chrono::milliseconds(std::lround(*seconds * 1000)));
+  camera.allow_last_call();
   const ELibDReturnCode stopped = move.stop(camera.device());
   if (stopped != LIBD_OK) return report_change(camera, terminal, move.what, stopped);
   return Interrupt::requested() ? ExitCode::kInterrupted : ExitCode::kOk;

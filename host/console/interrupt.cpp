@@ -23,6 +23,7 @@ std::atomic<bool> orderly{false};
 std::atomic<bool> raised{false};
 std::atomic<int> wake_read{-1};
 std::atomic<int> wake_write{-1};
+std::atomic<void (*)()> act_too{nullptr};
 static_assert(std::atomic<bool>::is_always_lock_free && std::atomic<int>::is_always_lock_free);
 
 [[noreturn]] void end_at_once() {
@@ -36,6 +37,7 @@ void on_signal(int) {
   if (!orderly || second) end_at_once();
   const char byte = 0;
   [[maybe_unused]] const ssize_t written = write(wake_write, &byte, 1);
+  if (void (*const act)() = act_too) act();
   errno = saved_errno;
 }
 
@@ -61,6 +63,11 @@ bool Interrupt::install() {
 void Interrupt::finish_orderly() { orderly = true; }
 
 bool Interrupt::requested() { return raised; }
+
+void Interrupt::also(void (*act)()) {
+  act_too = act;
+  if (raised) act();
+}
 
 void Interrupt::wait(std::chrono::milliseconds time) {
   // The byte stays in the pipe: after a signal no call waits any more.

@@ -19,6 +19,9 @@ class Interrupt {
   [[nodiscard]] static bool install();
   static void finish_orderly();
   [[nodiscard]] static bool requested();
+  // Lets `act` run too when a signal is taken, in its handler, and at once when one has been taken. One for the
+  // process.
+  static void also(void (*act)());
   // Sleeps up to `time`, less when a signal comes.
   static void wait(std::chrono::milliseconds time);
 };

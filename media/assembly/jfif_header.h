@@ -9,15 +9,6 @@
 
 namespace vexa {
 
-struct JpegShape {
-  std::uint8_t width_in_8;         ///< units of 8 pixels
-  std::uint8_t height_in_8;        ///< units of 8 pixels
-  std::uint16_t restart_interval;  ///< 0: no DRI
-};
-
-/// Appends SOI, DQT, DRI, SOF0, DHT and SOS (ITU-T T.81). `fits` of the writer tells whether there was room.
-void append_jfif_header(FrameWriter& out, const JpegShape& shape, const QuantisationTables& tables);
-
 using QuantisationTable = std::array<unsigned char, 64>;
 
 struct QuantisationTables {
@@ -36,5 +27,14 @@ struct HuffmanTable {
 
 /// ITU-T T.81, tables K.3 to K.6: luminance DC and AC, chrominance DC and AC.
 extern const std::array<HuffmanTable, 4> kHuffmanTables;
+
+struct JpegShape {
+  std::uint8_t width_in_8;         ///< units of 8 pixels
+  std::uint8_t height_in_8;        ///< units of 8 pixels
+  std::uint16_t restart_interval;  ///< 0: no DRI
+};
+
+/// Appends SOI, DQT, DRI, SOF0, DHT and SOS (ITU-T T.81). `fits` of the writer tells whether there was room.
+void append_jfif_header(FrameWriter& out, const JpegShape& shape, const QuantisationTables& tables);
 
 }  // namespace vexa

@@ -1,6 +1,7 @@
 #include "media/assembly/packet_collector.h"
 
 #include <algorithm>
+#include <utility>
 
 #include "transport/wire/packet_order.h"
 
@@ -14,23 +15,39 @@ constexpr std::chrono::milliseconds kKeyPicturePatience{200};
 constexpr std::size_t kRestartProof = 3;
 
 /// 1.2 s in ticks.
-std::int64_t most_age(int clock_rate) { return static_cast<std::int64_t>(clock_rate) * 12 / 10; }
+constexpr std::int64_t most_age(int clock_rate) { return static_cast<std::int64_t>(clock_rate) * 12 / 10; }
+
+/// Faster than the clock of any camera. A rate beyond it, which a description may name, would take a restart for a
+/// latecomer: 1.2 s of it are half of all timestamps and more.
+constexpr int kFastestClock = 1'000'000;
 
 }  // namespace
 
-bool PacketCollector::add(const SPacketInfo& packet, int clock_rate, Instant now) {
+bool PacketCollector::add(const SPacketInfo& packet, int clock_rate, Instant now, SequenceLedger::Arrival arrival) {
   remove_too_old(packet, clock_rate);
-  if (is_listed(packet)) return false;
   const bool ahead = last_used_ && sequence_is_ahead(packet.sequence, *last_used_);
-  if (!ahead && recent_.holds(packet.timestamp, packet.sequence)) return false;
+  if (is_listed(packet) || (!ahead && recent_.holds(packet.timestamp, packet.sequence))) {
+    ++counts_.duplicated;
+    return false;
+  }
   if (last_used_ && !ahead) {
-    if (is_latecomer(packet, clock_rate)) return false;
+    if (is_latecomer(packet, clock_rate)) {
+      ++(arrival == SequenceLedger::Arrival::kDuplicate ? counts_.duplicated : counts_.late);
+      return false;
+    }
     take_stray(packet, now);
     return true;
   }
-  strays_.clear();
+  drop_strays();
   insert(packet, now);
   return true;
+}
+
+// They were no restart.
+void PacketCollector::drop_strays() {
+  counts_.late += strays_.size();
+  counts_.held -= strays_.size();
+  strays_.clear();
 }
 
 // A rate that is no rate sets no age.
@@ -45,7 +62,9 @@ void PacketCollector::remove_too_old(const SPacketInfo& newest, int clock_rate) 
     return timestamp_is_after(newest.timestamp, packet.timestamp);
   });
   if (old == end) return;
+  const std::size_t listed = packets_.size();
   packets_.erase(old, end);
+  count_given_up(listed);
   forget_sequence();
 }
 
@@ -63,20 +82,28 @@ bool PacketCollector::follows_last_used(std::uint16_t sequence) const {
 // A packet of a picture that was given up: a camera that restarts is not that close to its former timestamps.
 bool PacketCollector::is_latecomer(const SPacketInfo& packet, int clock_rate) const {
   const std::uint32_t age = last_used_timestamp_ - packet.timestamp;
-  return age != 0 && age <= most_age(clock_rate);
+  return age != 0 && age <= most_age(std::min(clock_rate, kFastestClock));
 }
 
 // Packets that go on behind the last one used are a camera that began its sequence again.
 void PacketCollector::take_stray(const SPacketInfo& packet, Instant now) {
   const bool goes_on = !strays_.empty() && packet.sequence == static_cast<std::uint16_t>(strays_.back().sequence + 1);
-  if (!goes_on) strays_.clear();
+  if (!goes_on) drop_strays();
   strays_.push_back(packet);
+  ++counts_.held;
   if (strays_.size() < kRestartProof) return;
+  // So that no insertion below can fail, and leave some of them listed twice.
+  packets_.reserve(kRestartProof);
+  standing_keys_.reserve(kRestartProof);
+  const std::vector<SPacketInfo> restarted = std::exchange(strays_, {});
+  counts_.held -= restarted.size();
+  const std::size_t listed = packets_.size();
   packets_.clear();
+  count_given_up(listed);
   forget_sequence();
   recent_ = RecentPictures{};
-  for (const SPacketInfo& stray : strays_) insert(stray, now);
-  strays_.clear();
+  ++counts_.restarts;
+  for (const SPacketInfo& stray : restarted) insert(stray, now);
 }
 
 void PacketCollector::insert(const SPacketInfo& packet, Instant now) {
@@ -84,12 +111,57 @@ void PacketCollector::insert(const SPacketInfo& packet, Instant now) {
   const auto place = place_of(packets_, packet);
   const bool at_end = place == packets_.end();
   const auto inserted = packets_.insert(place, packet);
+  count_inserted(static_cast<std::size_t>(inserted - packets_.begin()));
   // In order and without the marker, a packet completes nothing.
   if (at_end && !packet.marker) return;
   changed_ = true;
   const auto index = static_cast<std::size_t>(inserted - packets_.begin());
   note_key_picture(index, now);
   note_proven_follower(index, now);
+}
+
+// A picture is a run of one timestamp. Where the order of timestamps turns, a packet may part a run in two.
+void PacketCollector::count_inserted(std::size_t index) {
+  ++counts_.held;
+  const std::uint32_t timestamp = packets_[index].timestamp;
+  const bool has_next = index + 1 < packets_.size();
+  const bool joins_previous = index > 0 && packets_[index - 1].timestamp == timestamp;
+  if (joins_previous && !has_next) return;
+  const bool joins_next = has_next && packets_[index + 1].timestamp == timestamp;
+  if (joins_previous || joins_next) return;
+  const bool parts = index > 0 && has_next && packets_[index - 1].timestamp == packets_[index + 1].timestamp;
+  const std::uint64_t begun = parts ? 2 : 1;
+  counts_.pictures_begun += begun;
+  counts_.pictures_held += begun;
+}
+
+std::uint64_t PacketCollector::pictures_listed() const {
+  std::uint64_t pictures = packets_.empty() ? 0 : 1;
+  for (std::size_t i = 1; i < packets_.size(); ++i) {
+    if (packets_[i].timestamp != packets_[i - 1].timestamp) ++pictures;
+  }
+  return pictures;
+}
+
+// Packets have left the list, and no picture was made of them.
+void PacketCollector::count_given_up(std::size_t listed_before) {
+  const std::size_t packets = listed_before - packets_.size();
+  counts_.given_up += packets;
+  counts_.held -= packets;
+  const std::uint64_t pictures = pictures_listed();
+  counts_.pictures_incomplete += counts_.pictures_held - pictures;
+  counts_.pictures_held = pictures;
+}
+
+void PacketCollector::discard_all() {
+  counts_.stopped += counts_.held;
+  counts_.held = 0;
+  counts_.pictures_stopped += counts_.pictures_held;
+  counts_.pictures_held = 0;
+  packets_.clear();
+  strays_.clear();
+  standing_keys_.clear();
+  forget_sequence();
 }
 
 // A late packet may be the one right before a picture that stands complete already.
@@ -171,6 +243,7 @@ std::optional<PacketCollector::Run> PacketCollector::next_picture(Instant now) {
     if (last_used_ && (key || !waiting_for_key_)) return run;
     if (key && is_trusted_key(*run)) return run;
     if (key) break;
+    ++counts_.pictures_without_key;
     mark_used(*run);
   }
   changed_ = false;
@@ -188,8 +261,10 @@ std::optional<PacketCollector::Run> PacketCollector::first_standing_key(Instant 
         standing_keys_.begin(), standing_keys_.end(),
         [](const KeyPicture& a, const KeyPicture& b) { return timestamp_is_after(b.timestamp, a.timestamp); });
     const std::uint32_t timestamp = earliest->timestamp;
+    const std::size_t listed = packets_.size();
     std::erase_if(packets_,
                   [timestamp](const SPacketInfo& packet) { return timestamp_is_after(timestamp, packet.timestamp); });
+    if (packets_.size() != listed) count_given_up(listed);
     const std::optional<Run> run = run_of(timestamp);
     if (run && still_stands(*earliest, *run)) return run;
     standing_keys_.erase(earliest);
@@ -207,10 +282,12 @@ std::optional<PacketCollector::Run> PacketCollector::run_of(std::uint32_t timest
 
 void PacketCollector::use(Run run) {
   if (rules_.is_key(packets(run))) waiting_for_key_ = false;
+  ++counts_.pictures_assembled;
   mark_used(run);
 }
 
-void PacketCollector::abandon(Run run) {
+void PacketCollector::abandon(Run run, PictureLoss loss) {
+  ++(loss == PictureLoss::kTooLarge ? counts_.pictures_too_large : counts_.pictures_damaged);
   mark_used(run);
   waiting_for_key_ = true;
 }
@@ -222,7 +299,15 @@ void PacketCollector::mark_used(Run run) {
   last_used_ = (end - 1)->sequence;
   last_used_timestamp_ = timestamp;
   recent_.add(timestamp, first->sequence, *last_used_);
-  packets_.erase(first, end);
+  const auto next = packets_.erase(first, end);
+  counts_.used += run.count;
+  counts_.held -= run.count;
+  --counts_.pictures_held;
+  if (next != packets_.begin() && next != packets_.end() && (next - 1)->timestamp == next->timestamp) {
+    // It stood in the middle of another, which is one again.
+    --counts_.pictures_held;
+    ++counts_.pictures_incomplete;
+  }
   std::erase_if(standing_keys_, [timestamp](const KeyPicture& key) { return key.timestamp == timestamp; });
   changed_ = true;
   remove_passed_by();
@@ -233,21 +318,30 @@ void PacketCollector::remove_passed_by() {
   if (packets_.empty()) return;
   const auto passed = [this](const SPacketInfo& packet) { return !sequence_is_ahead(packet.sequence, *last_used_); };
   if (!passed(packets_.front()) && !passed(packets_.back())) return;
+  const std::size_t listed = packets_.size();
   std::erase_if(packets_, passed);
+  count_given_up(listed);
 }
 
 void PacketCollector::drop_overwritten(const std::vector<PacketRing::Slot>& slots) {
-  bool lost = false;
+  std::uint64_t lost = 0;
   for (const PacketRing::Slot& slot : slots) {
     SPacketInfo key;
     key.timestamp = slot.timestamp;
     key.sequence = slot.sequence;
-    std::erase_if(strays_, [&key](const SPacketInfo& stray) { return stray.sequence == key.sequence; });
+    const std::size_t strays =
+        std::erase_if(strays_, [&key](const SPacketInfo& stray) { return stray.sequence == key.sequence; });
+    counts_.overwritten += strays;
+    counts_.held -= strays;
     if (!is_listed(key)) continue;
     packets_.erase(place_of(packets_, key) - 1);
-    lost = true;
+    ++lost;
   }
-  if (lost) forget_sequence();
+  if (lost == 0) return;
+  count_given_up(packets_.size() + lost);
+  counts_.given_up -= lost;
+  counts_.overwritten += lost;
+  forget_sequence();
 }
 
 std::optional<PacketCollector::Instant> PacketCollector::deadline() const {

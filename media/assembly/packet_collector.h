@@ -6,9 +6,11 @@
 #include <optional>
 #include <vector>
 
+#include "media/assembly/collection_counts.h"
 #include "media/assembly/picture_rules.h"
 #include "media/assembly/recent_pictures.h"
 #include "transport/wire/packet_ring.h"
+#include "transport/wire/sequence_ledger.h"
 #include "vexa/video_info.h"
 
 namespace vexa {
@@ -18,6 +20,9 @@ struct PacketRunPlace {
   std::size_t first = 0;
   std::size_t count = 0;
 };
+
+/// Why a complete picture became no frame.
+enum class PictureLoss { kDamaged, kTooLarge };
 
 /// Keeps the ordered packet list of one stream and picks pictures from it. docs/packet_list.md tells its rules.
 ///
@@ -30,11 +35,19 @@ class PacketCollector {
   using Run = PacketRunPlace;
 
   /// `packets` is the list; it must outlive the collector, which alone changes it.
-  PacketCollector(std::vector<SPacketInfo>& packets, const PictureRules& rules) : packets_(packets), rules_(rules) {}
+  PacketCollector(std::vector<SPacketInfo>& packets, const PictureRules& rules)
+      : PacketCollector(packets, rules, own_counts_) {}
+  /// Counts into `counts`, which outlive it.
+  PacketCollector(std::vector<SPacketInfo>& packets, const PictureRules& rules, CollectionCounts& counts)
+      : packets_(packets), rules_(rules), counts_(counts) {}
+  PacketCollector(const PacketCollector&) = delete;
+  PacketCollector& operator=(const PacketCollector&) = delete;
 
   /// Takes a packet of at least 12 bytes; `clock_rate` is the RTP clock's, in ticks a second. True when it is
-  /// remembered, so that drop_overwritten must be told when its bytes are gone.
-  bool add(const SPacketInfo& packet, int clock_rate, Instant now);
+  /// remembered, so that drop_overwritten must be told when its bytes are gone. `arrival` decides nothing but how a
+  /// packet that comes too late is counted.
+  bool add(const SPacketInfo& packet, int clock_rate, Instant now,
+           SequenceLedger::Arrival arrival = SequenceLedger::Arrival::kNew);
 
   /// The packets of these slots have been overwritten.
   void drop_overwritten(const std::vector<PacketRing::Slot>& slots);
@@ -45,7 +58,9 @@ class PacketCollector {
   /// The run was shown: its packets are used and leave the list.
   void use(Run run);
   /// The run could not be assembled: its packets are used, and a key picture must come next.
-  void abandon(Run run);
+  void abandon(Run run, PictureLoss loss = PictureLoss::kDamaged);
+  /// The stream ends: all that is held is given up, and counted so.
+  void discard_all();
 
   /// When next_picture may have a new answer without a new packet.
   std::optional<Instant> deadline() const;
@@ -54,6 +69,7 @@ class PacketCollector {
   /// No packet's bytes are needed any more.
   bool is_empty() const { return packets_.empty() && strays_.empty(); }
   bool waiting_for_key() const { return waiting_for_key_; }
+  const CollectionCounts& counts() const { return counts_; }
 
  private:
   struct KeyPicture {
@@ -81,6 +97,10 @@ class PacketCollector {
   void mark_used(Run run);
   void remove_passed_by();
   void forget_sequence();
+  void drop_strays();
+  void count_inserted(std::size_t index);
+  void count_given_up(std::size_t listed_before);
+  std::uint64_t pictures_listed() const;
 
   std::vector<SPacketInfo>& packets_;
   const PictureRules& rules_;
@@ -93,6 +113,8 @@ class PacketCollector {
   std::vector<KeyPicture> standing_keys_;
   std::vector<SPacketInfo> strays_;  // consecutive packets that are not ahead: a restart, if they go on
   RecentPictures recent_;
+  CollectionCounts own_counts_;
+  CollectionCounts& counts_;
 };
 
 }  // namespace vexa

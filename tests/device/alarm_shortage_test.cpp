@@ -44,7 +44,7 @@ class AlarmShortage : public testing::Test {
   AlarmCamera camera_;
 };
 
-SLibDDetectionParam short_setting = marked_setting(1);
+SLibDDetectionParam setting = marked_setting(1);
 
 TEST_F(AlarmShortage, FailsEachRequest) {
   fail_each("GetIoBoxInfo", [](AlarmDriver& d) {
@@ -60,7 +60,7 @@ TEST_F(AlarmShortage, FailsEachRequest) {
     auto mode = LIBD_POSITION_PRESET;
     return d.GetObjectDetectionSetting(settings, mode);
   });
-  fail_each("SetDetectionParam", [](AlarmDriver& d) { return d.SetDetectionParam(short_setting); });
+  fail_each("SetDetectionParam", [](AlarmDriver& d) { return d.SetDetectionParam(setting); });
   fail_each("SetPositionMode", [](AlarmDriver& d) { return d.SetPositionMode(LIBD_POSITION_CURRENT); });
   fail_each("SetTamperingAlarm", [](AlarmDriver& d) { return d.SetTamperingAlarm(true, LIBD_TAMPER_LOW); });
   fail_each("SetAudioDetection", [](AlarmDriver& d) { return d.SetAudioDetection(true); });

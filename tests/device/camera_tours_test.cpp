@@ -37,7 +37,7 @@ auto with_tours(int count) {
   };
 }
 
-std::string tours_path(const std::string& rest) { return "/command/presetposition.cgi?" + rest; }
+std::string path_of(const std::string& rest) { return "/command/presetposition.cgi?" + rest; }
 
 void expect_tours_sent(const SLibDCameraTourInfo& info, const std::string& rest, int count = -1) {
   const int tours = count < 0 ? static_cast<int>(info.tours.size()) : count;
@@ -45,7 +45,7 @@ void expect_tours_sent(const SLibDCameraTourInfo& info, const std::string& rest,
     SLibDCameraTourInfo copy = info;
     return driver.SetCameraTourInfo(copy);
   };
-  expect_sent({{set, tours_path(rest)}}, with_tours(tours));
+  expect_sent({{set, path_of(rest)}}, with_tours(tours));
 }
 
 TEST(TourSelector, HoldsTheLettersInOrder) {
@@ -53,8 +53,6 @@ TEST(TourSelector, HoldsTheLettersInOrder) {
   for (const char* letter : g_TourSelector) letters += std::string(letter) + "|";
   EXPECT_EQ(letters, "A|B|C|D|E|");
 }
-
-// ---- Setting ----
 
 TEST(SetCameraTourInfo, SendsAllToursAtOnce) {
   expect_tours_sent(tours_of(true, 30, {tour_of(true, {1, 2, 3}), tour_of(false, {4, 5}, 5, 12)}),
@@ -92,8 +90,8 @@ TEST(SetCameraTourInfo, TellsTheLatestErrorWhenItsRequestIsRefused) {
     SLibDCameraTourInfo info = tours_of(false, 0, {tour_of(false, {1})});
     return driver.SetCameraTourInfo(info);
   };
-  expect_refusal_told({set, tours_path("Tour=off&TourResume=off&TourA=off&TourASequence=1&TourAStaytime=10"
-                                       "&TourAPeriod=always&TourASpeed=24")},
+  expect_refusal_told({set, path_of("Tour=off&TourResume=off&TourA=off&TourASequence=1&TourAStaytime=10"
+                                    "&TourAPeriod=always&TourASpeed=24")},
                       with_tours(1));
 }
 
@@ -146,9 +144,7 @@ TEST_F(CameraToursUnsent, BecauseANegativePresetIsAboveANegativeCount) {
   EXPECT_EQ(driver_.SetCameraTourInfo(info), LIBD_INVALID_ARGUMENT);
 }
 
-// ---- Reading ----
-
-SLibDCameraTourInfo asked_tours(const std::string& answer, int count, int result = 1) {
+SLibDCameraTourInfo asked(const std::string& answer, int count, int result = 1) {
   PtzPlay play({inquiry("presetposition", answer)});
   with_tours(count)(play.driver);
   SLibDCameraTourInfo info = tours_of(true, 77, std::vector(7, tour_of(true, {9})));
@@ -157,7 +153,7 @@ SLibDCameraTourInfo asked_tours(const std::string& answer, int count, int result
 }
 
 TEST(GetCameraTourInfo, ReadsEveryTour) {
-  const SLibDCameraTourInfo info = asked_tours(
+  const SLibDCameraTourInfo info = asked(
       "PresetName=&Tour=on&TourResume=on&TourRsmTime=30"
       "&TourA=on&TourASequence=1,2,3&TourAStaytime=5&TourAPeriod=always&TourASpeed=12"
       "&TourB=off&TourBSequence=4,5&TourBStaytime=6&TourBSpeed=13",
@@ -181,7 +177,7 @@ TEST(GetCameraTourInfo, ReadsEveryTour) {
 TEST(GetCameraTourInfo, HasDefaultsForWhatTheAnswerLacks) {
   for (const char* answer : {"", "Tour=on", "TourA=on", "A=1&STour=on&STourA=on&STourResume=on", "A=1&Tour=On&TourA=ON",
                              "A=1&TourASequence=&TourAStaytime=&TourASpeed=", "A=1&TourRsmTime=30&TourResume=off"}) {
-    const SLibDCameraTourInfo info = asked_tours(answer, 1);
+    const SLibDCameraTourInfo info = asked(answer, 1);
     EXPECT_FALSE(info.enabled) << answer;
     EXPECT_EQ(info.resumeTime, 0) << answer;
     ASSERT_EQ(info.tours.size(), 1U);
@@ -194,23 +190,23 @@ TEST(GetCameraTourInfo, HasDefaultsForWhatTheAnswerLacks) {
 }
 
 TEST(GetCameraTourInfo, HasAResumeTimeOfZeroWhereItIsMissing) {
-  EXPECT_EQ(asked_tours("A=1&TourResume=on", 1).resumeTime, 0);
-  EXPECT_EQ(asked_tours("A=1&TourResume=on&TourRsmTime=", 1).resumeTime, 0);
-  EXPECT_EQ(asked_tours("A=1&TourResume=on&TourRsmTime=x", 1).resumeTime, 0);
-  EXPECT_EQ(asked_tours("A=1&TourResume=on&TourRsmTime=-3x", 1).resumeTime, -3);
+  EXPECT_EQ(asked("A=1&TourResume=on", 1).resumeTime, 0);
+  EXPECT_EQ(asked("A=1&TourResume=on&TourRsmTime=", 1).resumeTime, 0);
+  EXPECT_EQ(asked("A=1&TourResume=on&TourRsmTime=x", 1).resumeTime, 0);
+  EXPECT_EQ(asked("A=1&TourResume=on&TourRsmTime=-3x", 1).resumeTime, -3);
 }
 
 TEST(GetCameraTourInfo, ReadsASequenceOfOnePresetAsEmpty) {
-  EXPECT_TRUE(asked_tours("A=1&TourASequence=5", 1).tours.at(1).sequence.empty());
+  EXPECT_TRUE(asked("A=1&TourASequence=5", 1).tours.at(1).sequence.empty());
 }
 
 TEST(GetCameraTourInfo, ReadsAsManyToursAsThereAreLetters) {
-  EXPECT_EQ(asked_tours("A=1&TourE=on", 5).tours.size(), 5U);
-  EXPECT_TRUE(asked_tours("A=1&TourE=on", 5).tours.at(5).enabled);
-  EXPECT_EQ(asked_tours("A=1&TourF=on", 6).tours.size(), 5U);
-  EXPECT_EQ(asked_tours("A=1&TourF=on", INT_MAX).tours.size(), 5U);
-  EXPECT_TRUE(asked_tours("A=1&TourA=on", 0).tours.empty());
-  EXPECT_TRUE(asked_tours("A=1&TourA=on", -1).tours.empty());
+  EXPECT_EQ(asked("A=1&TourE=on", 5).tours.size(), 5U);
+  EXPECT_TRUE(asked("A=1&TourE=on", 5).tours.at(5).enabled);
+  EXPECT_EQ(asked("A=1&TourF=on", 6).tours.size(), 5U);
+  EXPECT_EQ(asked("A=1&TourF=on", INT_MAX).tours.size(), 5U);
+  EXPECT_TRUE(asked("A=1&TourA=on", 0).tours.empty());
+  EXPECT_TRUE(asked("A=1&TourA=on", -1).tours.empty());
 }
 
 TEST(GetCameraTourInfo, LeavesTheRecordWhenTheInquiryFails) {
@@ -221,8 +217,6 @@ TEST(GetCameraTourInfo, LeavesTheRecordWhenTheInquiryFails) {
   EXPECT_EQ(info.resumeTime, 77);
   EXPECT_EQ(info.tours.size(), 1U);
 }
-
-// ---- Sequences ----
 
 TEST(TourSequence, IsReadFromItsText) {
   const struct {

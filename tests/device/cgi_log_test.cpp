@@ -279,8 +279,7 @@ TEST(CgiLog, AStreamGoesOnWhenTheFileCannotBeWritten) {
   SLibDConnectionInfo info;
   driver.SetCurrentConnectionInfo(info);
   driver.SetCGILogLevel(true);
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   FrameTaker host;
   EXPECT_EQ(host.take_all(driver, 10).size(), 10U);
   EXPECT_EQ(driver.StopVideoStreaming(), LIBD_OK);

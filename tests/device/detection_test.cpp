@@ -58,8 +58,6 @@ SLibDDetectionParam lod_setting(int size, int sensitivity) {
   return param;
 }
 
-// ---- Reading ----
-
 TEST_F(Detection, OfAnLodCameraIsReadAsSeventeenSettings) {
   driver_.m_LodDetection = true;
   EXPECT_EQ(ask({inquiry("lod", "LODMinObjectSize=middle&LODSensitivity=40")}), LIBD_OK);
@@ -131,8 +129,6 @@ TEST_F(Detection, ThatMemoryDoesNotHoldFails) {
       },
       3);
 }
-
-// ---- Setting ----
 
 TEST_F(Detection, OfAnLodCameraIsSetByOneRequest) {
   driver_.m_LodDetection = true;
@@ -239,8 +235,6 @@ TEST_F(Detection, ChecksLookAtTheFirstWindow) {
   EXPECT_EQ(text, "large");
   EXPECT_EQ(driver_.CheckDetectionParamDetectionArea(param), LIBD_INVALID_ARGUMENT);
 }
-
-// ---- Switches ----
 
 TEST_F(Detection, PositionModeIsCurrentForAnyModeButPreset) {
   const struct {

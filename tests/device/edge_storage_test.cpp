@@ -13,8 +13,6 @@
 namespace vexa_test {
 namespace {
 
-// ---- The keep-alive period ----
-
 const ScriptStep kLiveTimeout = command("/command/camera.cgi?RTSPTimeout=60");
 const ScriptStep kPlaybackTimeout = command("/command/edgestorage.cgi?EsRTSPRec1Timeout=60");
 
@@ -49,8 +47,6 @@ TEST(KeepAlivePeriod, IsNotFoundWhenOneOfItsRequestsFails) {
     EXPECT_EQ(play.driver.LatestErrorCode(), LIBD_UNAUTHORIZED);
   }
 }
-
-// ---- The mode ----
 
 std::string mode_path(const std::string& on, int image, const std::string& times, const std::string& address) {
   return "/command/edgestorage.cgi?Edgestorage=" + on + "&EsOverWrite=off&EsRec1=image" + std::to_string(image) +
@@ -178,8 +174,6 @@ TEST(EdgeStorage, FreeSpaceIsMinusOneWhenTheInquiryFails) {
   EXPECT_EQ(play.driver.CheckEdgeStorageFreeSize(), 5);
 }
 
-// ---- The list ----
-
 const std::string kOneRecord =
     "StreamName=a,Start=20240131T235959,End=20240201T000000,ImageCodec=h264,ImageSize=640,480,FrameRate=25,"
     "BitRate=512,AudioCodec=none,Size=1,Status=ok\r\n";
@@ -249,8 +243,6 @@ TEST(RecordList, ThatDoesNotEndIsGivenUpAndTheOneBeforeStays) {
   }
 }
 
-// ---- Deletion ----
-
 SLibDEdgeStorageStreamingInfo recording(const std::string& name) {
   SLibDEdgeStorageStreamingInfo info;
   info.streamName = name;
@@ -283,8 +275,6 @@ TEST(RecordDeletion, HasANameThatAddsNeitherAHeaderNorAnotherCommand) {
   EXPECT_EQ(play.driver.DeleteEdgeStorageRecordByName(recording(std::string(4096, 'n'))), LIBD_FAILED);
   EXPECT_EQ(text_of_latest_error(play.driver), "URL too long");
 }
-
-// ---- Time-outs ----
 
 struct SlowRow {
   std::string path;
@@ -328,8 +318,6 @@ TEST(RecordRequests, WaitLongerThanTheConnectionAllowsAndPutTheTimeOutBack) {
     }
   }
 }
-
-// ---- Shortage ----
 
 struct ShortRow {
   Script script;
@@ -377,8 +365,6 @@ TEST(EdgeStorage, FreeSpaceIsMinusOneWhenAnyOneAllocationFails) {
       },
       4);
 }
-
-// ---- The calendar ----
 
 TEST(MakeGmTime, CountsSecondsSince1970) {
   EdgeDriver driver;

@@ -16,8 +16,6 @@ namespace {
 
 using Driver = Played<CVexaCommon>;
 
-// ---- Setters ----
-
 using Setter = ELibDReturnCode (*)(SettingsDriver&);
 
 struct SetterRow {
@@ -131,8 +129,6 @@ TEST(SetBrightMode, LeavesTheStoredModeAsItWas) {
   EXPECT_EQ(set_bright_mode(play.driver, "Iris Priority"), LIBD_OK);
   EXPECT_EQ(play.driver.m_PTZControlInfo.brightMode, "Full auto");
 }
-
-// ---- Getters ----
 
 /// What a getter says: its result, and the numbers it hands out.
 struct Said {
@@ -273,8 +269,6 @@ TEST(ImageGetters, AskAgainAfterAnEmptyAnswer) {
   EXPECT_EQ(kXdnr(play.driver), (Said{0, kUntouched}));
   EXPECT_EQ(kXdnr(play.driver), (Said{1, 2}));
 }
-
-// ---- The cache behind a change ----
 
 TEST(ImageCache, TellsTheValueBeforeTheChangeUntilTheCameraIsAskedAnew) {
   Driver play({inquiry("camera", "A=1&ViewDR=off&XDNR=low&VisibilityEnhancer=low&IRLed=off&IRLedMaxStrength=3"),

@@ -249,8 +249,6 @@ TEST_F(IoStream, LeavesNothingOpen) {
   EXPECT_TRUE(eventually([&] { return open_descriptors() == before + 3; })) << open_descriptors() << ' ' << before;
 }
 
-// ---- Tampering ----
-
 TEST_F(IoStream, ClearsTamperingOnceWhenItHasBeenActiveForMoreThan59Seconds) {
   stream();
   for (const int after : {0, 30, 59}) {
@@ -300,8 +298,6 @@ TEST_F(IoStream, DoesNotWatchTamperingInTheDetailedStatus) {
   EXPECT_EQ(driver_.GetCurrentIoStatusDetail(pins_), LIBD_OK);
   EXPECT_EQ(driver_.m_TamperingActiveSince, 0);
 }
-
-// ---- One virtual hour ----
 
 TEST_F(IoStream, LosesNoChangeInAnHourAndClearsTamperingOnceAMinute) {
   stream();

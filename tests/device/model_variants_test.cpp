@@ -19,8 +19,6 @@ ELibDReturnCode set_bright_mode(Settings<Variant>& driver, std::string mode) {
   return driver.SetBrightMode(mode);
 }
 
-// ---- Exposure modes ----
-
 TEST(HeronAndSimpleHd, OfferNoExposureModes) {
   for (const char* mode : {"", "Full auto", "Shutter Priority", "Iris Priority", "Manual"}) {
     Settings<CVexaHeronCommon> heron;
@@ -68,8 +66,6 @@ TEST(Marlin, ReadsTheSystemWithoutMindingTheOutput) {
   SLibDSystemInfo info;
   EXPECT_EQ(play.driver.GetCurrentSystemInfo(info), LIBD_OK);
 }
-
-// ---- The video output, in GetCurrentSystemInfo ----
 
 struct OutputRow {
   const char* system;
@@ -179,8 +175,6 @@ TEST(SimpleHdAndSimplePtz, EndWithTheLatestErrorWhenTheOutputIsRefused) {
   EXPECT_EQ(info_of_refused<CVexaSimpleHDCommon>(script).macAddress, "");
   EXPECT_EQ(info_of_refused<CVexaSimplePTZCommon>(script).macAddress, "");
 }
-
-// ---- GetVideoOutMode ----
 
 constexpr auto kUntouchedMode = static_cast<ELibVideoOutMode>(77);
 

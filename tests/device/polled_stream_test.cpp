@@ -44,6 +44,16 @@ TEST(VideoSilence, CountsWholeSecondsOfTheTimeOut) {
   }
 }
 
+TEST(Silence, BeginsInTheSecondThatIsNamed) {
+  for (const std::int64_t patience :
+       {std::int64_t{0}, std::int64_t{1}, std::int64_t{999}, std::int64_t{1000}, std::int64_t{1001},
+        std::int64_t{INT_MAX} + 15000, std::int64_t{-1}, std::int64_t{-1000}, std::int64_t{-1001}}) {
+    const auto from = static_cast<std::time_t>(silent_from(100, patience));
+    EXPECT_TRUE(is_silent(from, 100, patience)) << patience;
+    EXPECT_FALSE(is_silent(from - 1, 100, patience)) << patience;
+  }
+}
+
 class Polled : public testing::Test {
  protected:
   static Result<Socket> open() { return Socket(socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0)); }
@@ -54,7 +64,8 @@ class Polled : public testing::Test {
   }
 
   ELibDReturnCode start() {
-    const Outcome outcome = stream_.start(open, [this] { return now_; });
+    const Outcome outcome = stream_.start(
+        open, [this] { return now_; }, 5000);
     return outcome ? *outcome : outcome.failure().code;
   }
 
@@ -62,7 +73,9 @@ class Polled : public testing::Test {
   int socket_ = -1;
   std::time_t last_ = 0;
   std::time_t now_ = 100;
-  PolledStream stream_{lock_, socket_, last_};
+  SecondsClock system_clock_ = [] { return std::time_t{100}; };
+  Readiness readiness_{nullptr, system_clock_};
+  PolledStream stream_{{lock_, socket_, last_}, {readiness_, kAudioStream}};
   const std::size_t descriptors_ = vexa_test::open_descriptors();
 };
 
@@ -114,7 +127,7 @@ TEST_F(Polled, StaysClosedWhenItCannotBeOpened) {
       []() -> Result<Socket> {
         return Failure{LIBD_UNAUTHORIZED, "no"};
       },
-      [] { return std::time_t{7}; });
+      [] { return std::time_t{7}; }, 5000);
   ASSERT_FALSE(outcome);
   EXPECT_EQ(outcome.failure().code, LIBD_UNAUTHORIZED);
   EXPECT_EQ(socket_, -1);

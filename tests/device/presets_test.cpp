@@ -34,23 +34,22 @@ TEST(UnnamedPresets, OfANegativeCountAreNone) {
   for (const int count : {0, -1, INT_MIN}) EXPECT_TRUE(vexa::unnamed_presets(count).empty()) << count;
 }
 
-std::string presets_path(const std::string& rest) { return "/command/presetposition.cgi?" + rest; }
+std::string path_of(const std::string& rest) { return "/command/presetposition.cgi?" + rest; }
 
 TEST(Presets, AreCountedFromOneOnTheWire) {
   std::vector<SentRow> rows;
   for (int index = 0; index < kCount; ++index) {
     const std::string number = std::to_string(index + 1);
+    rows.push_back({[index](PtzDriver& d) { return d.RecallPreset(index); }, path_of("PresetCall=" + number + ",18")});
+    rows.push_back({[index](PtzDriver& d) { return d.ClearPreset(index); }, path_of("PresetClear=" + number)});
     rows.push_back(
-        {[index](PtzDriver& d) { return d.RecallPreset(index); }, presets_path("PresetCall=" + number + ",18")});
-    rows.push_back({[index](PtzDriver& d) { return d.ClearPreset(index); }, presets_path("PresetClear=" + number)});
-    rows.push_back({[index](PtzDriver& d) { return set_preset(d, index, "Gate"); },
-                    presets_path("PresetSet=" + number + ",Gate,on")});
+        {[index](PtzDriver& d) { return set_preset(d, index, "Gate"); }, path_of("PresetSet=" + number + ",Gate,on")});
   }
   expect_sent(rows, give_presets);
 }
 
 TEST(Presets, AreRecalledAtTheSmallerOfTheLargestSpeeds) {
-  const SentRow row = {[](PtzDriver& d) { return d.RecallPreset(0); }, presets_path("PresetCall=1,5")};
+  const SentRow row = {[](PtzDriver& d) { return d.RecallPreset(0); }, path_of("PresetCall=1,5")};
   expect_sent({row}, [](PtzDriver& driver) {
     give_presets(driver);
     driver.m_FixedPTZControlInfo.panTilt.panMaxSpeed = 5;
@@ -65,10 +64,10 @@ TEST(Presets, HaveEveryByteOfTheirNamesEncoded) {
     const std::string name(1, static_cast<char>(byte));
     const std::string encoded = plain ? name : std::string("%") + digits[byte / 16] + digits[byte % 16];
     rows.push_back(
-        {[name](PtzDriver& d) { return set_preset(d, 2, name); }, presets_path("PresetSet=3," + encoded + ",on")});
+        {[name](PtzDriver& d) { return set_preset(d, 2, name); }, path_of("PresetSet=3," + encoded + ",on")});
   }
   rows.push_back({[](PtzDriver& d) { return set_preset(d, 0, "a\r\nHost: x\r\n\r\nGET /b,&=?#%"); },
-                  presets_path("PresetSet=1,a%0D%0AHost%3A%20x%0D%0A%0D%0AGET%20%2Fb%2C%26%3D%3F%23%25,on")});
+                  path_of("PresetSet=1,a%0D%0AHost%3A%20x%0D%0A%0D%0AGET%20%2Fb%2C%26%3D%3F%23%25,on")});
   expect_sent(rows, give_presets);
 }
 
@@ -80,17 +79,14 @@ TEST(Presets, WithANameThatIsTooLongForARequestAreNotSent) {
 }
 
 TEST(Presets, TellTheLatestErrorWhenTheyAreRefused) {
-  expect_refusal_told({[](PtzDriver& d) { return d.RecallPreset(0); }, presets_path("PresetCall=1,18")}, give_presets);
-  expect_refusal_told({[](PtzDriver& d) { return d.ClearPreset(0); }, presets_path("PresetClear=1")}, give_presets);
-  expect_refusal_told({[](PtzDriver& d) { return set_preset(d, 0, "x"); }, presets_path("PresetSet=1,x,on")},
-                      give_presets);
+  expect_refusal_told({[](PtzDriver& d) { return d.RecallPreset(0); }, path_of("PresetCall=1,18")}, give_presets);
+  expect_refusal_told({[](PtzDriver& d) { return d.ClearPreset(0); }, path_of("PresetClear=1")}, give_presets);
+  expect_refusal_told({[](PtzDriver& d) { return set_preset(d, 0, "x"); }, path_of("PresetSet=1,x,on")}, give_presets);
 }
-
-// ---- The time-out of storing ----
 
 TEST(SetPreset, PutsTheSavedTimeoutBackWhetherOrNotItSucceeded) {
   for (const bool taken : {true, false}) {
-    const std::string path = presets_path("PresetSet=1,x,on");
+    const std::string path = path_of("PresetSet=1,x,on");
     PtzPlay play({taken ? command(path) : refusal(path)});
     give_presets(play.driver);
     play.driver.m_ConnectionInfo.timeout = 4321;
@@ -101,7 +97,7 @@ TEST(SetPreset, PutsTheSavedTimeoutBackWhetherOrNotItSucceeded) {
 }
 
 TEST(SetPreset, WaitsLongerThanTheConnectionAllows) {
-  ScriptStep slow = command(presets_path("PresetSet=1,x,on"));
+  ScriptStep slow = command(path_of("PresetSet=1,x,on"));
   slow.piece = 9;
   slow.pause = 60;
   PtzPlay play({slow});
@@ -109,8 +105,6 @@ TEST(SetPreset, WaitsLongerThanTheConnectionAllows) {
   play.driver.m_ConnectionInfo.timeout = play.driver.m_SavedTimeout = 20;
   EXPECT_EQ(set_preset(play.driver, 0, "x"), LIBD_OK);
 }
-
-// ---- Refusals ----
 
 using PresetsUnsent = PtzUnsent;
 
@@ -130,8 +124,6 @@ TEST_F(PresetsUnsent, BecauseTheNameIsEmpty) {
   give_presets(driver_);
   EXPECT_EQ(set_preset(driver_, 0, ""), LIBD_INVALID_ARGUMENT);
 }
-
-// ---- The list ----
 
 struct PresetListRow {
   const char* answer;

@@ -13,7 +13,7 @@
 namespace vexa_test {
 namespace {
 
-constexpr std::size_t kProfiledPictures = 60;
+constexpr std::size_t kPictures = 60;
 constexpr int kSideStream = 2;  // the one that is set; the first one streams
 
 /// One of two records that differ in every field that is set.
@@ -116,10 +116,10 @@ TEST_P(ProfiledThreads, SeeWholeRecordsWhileVideoStreams) {
       for (; !over && !HasFatalFailure(); ++rounds) act(mark);
     });
   }
-  const auto frames = FrameTaker().take_all(*device_, kProfiledPictures);
+  const auto frames = FrameTaker().take_all(*device_, kPictures);
   over = true;
   for (std::thread& host : hosts) host.join();
-  EXPECT_EQ(frames.size(), kProfiledPictures);
+  EXPECT_EQ(frames.size(), kPictures);
   EXPECT_GT(rounds, 1);
   EXPECT_EQ(device_->StopVideoStreaming(), LIBD_OK);
 }

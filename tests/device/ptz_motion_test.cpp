@@ -13,8 +13,6 @@
 namespace vexa_test {
 namespace {
 
-// ---- The model: magnitudes without signs, digits made one by one ----
-
 /// a * b / divisor without its fraction.
 long long model_part(long long a, long long b, unsigned long long divisor) {
   const auto magnitude = [](long long value) {
@@ -44,8 +42,6 @@ std::string model_hex_of_16_bits(long long value) {
   const long long low = ((value % 65536) + 65536) % 65536;
   return low < 32768 ? model_hex(low) : "FFFF" + model_hex(low);
 }
-
-// ---- Cameras ----
 
 struct CameraUnits {
   const char* name;
@@ -104,8 +100,6 @@ class Motion : public testing::TestWithParam<CameraUnits> {
 
 INSTANTIATE_TEST_SUITE_P(Cameras, Motion, testing::ValuesIn(kCameras),
                          [](const auto& param) { return std::string(param.param.name); });
-
-// ---- Pan and tilt ----
 
 std::string model_move(int pan, int tilt, const CameraUnits& camera) {
   long long pan_speed = model_part(std::abs(pan), camera.pan_speed, 10000);
@@ -171,8 +165,6 @@ TEST_P(Motion, SendsAbsolutePositionsAsSixteenBitsAndTheSmallerOfTheLargestSpeed
   expect(rows, true);
 }
 
-// ---- Areas ----
-
 struct PictureSize {
   int width, height;
 };
@@ -220,8 +212,6 @@ TEST_P(Motion, SendsAnAreaByItsCentre) {
   }
   expect(rows);
 }
-
-// ---- Zoom and focus ----
 
 std::string model_lens_speed(int speed, const int (&range)[2]) {
   return std::to_string(model_bounded(
@@ -287,8 +277,6 @@ TEST(ZoomRelative, SendsItsShareOf4096AsSixteenBits) {
   expect_sent(rows, [](PtzDriver&) {});
 }
 
-// ---- Written down ----
-
 TEST(PtzRequests, AreAsWrittenDown) {
   using D = PtzDriver&;
   const SLibDResolutionInfo vga = picture_of({640, 480});
@@ -319,8 +307,6 @@ TEST(PtzRequests, AreAsWrittenDown) {
                {[](D d) { return d.Focus(10000); }, ptzf("Move=near,8")}},
               usual(true));
 }
-
-// ---- Refusals ----
 
 using MotionUnsent = PtzUnsent;
 

@@ -184,8 +184,6 @@ TEST_F(PtzPosition, LeavesTheAnglesOfACallerWhenItHasNone) {
   EXPECT_EQ(vertical, 6);
 }
 
-// ---- Records ----
-
 TEST_F(PtzUnsent, BecauseTheControlRecordIsTheDriversOwn) {
   SLibDPTZControlInfo stored;
   stored.reserved1 = 1;

@@ -15,7 +15,7 @@ auto with_shadow_tours(int count) {
   return [count](PtzDriver& driver) { driver.m_FixedPTZControlInfo.shadowTourCount = count; };
 }
 
-SentRow shadow_row(std::function<ELibDReturnCode(PtzDriver&)> call, const std::string& rest) {
+SentRow row_of(std::function<ELibDReturnCode(PtzDriver&)> call, const std::string& rest) {
   return {std::move(call), "/command/presetposition.cgi?" + rest};
 }
 
@@ -36,7 +36,7 @@ SLibDShadowTourInfo shadow_info(bool on, int resume, const std::vector<bool>& to
 }
 
 SentRow setting(const SLibDShadowTourInfo& info, const std::string& rest) {
-  return shadow_row(
+  return row_of(
       [info](PtzDriver& driver) {
         SLibDShadowTourInfo copy = info;
         return driver.SetShadowTourInfo(copy);
@@ -44,26 +44,22 @@ SentRow setting(const SLibDShadowTourInfo& info, const std::string& rest) {
       rest);
 }
 
-// ---- Starting and stopping ----
-
-const SentRow kStops[] = {shadow_row([](PtzDriver& d) { return d.StopShadowTour(); },
-                                     "STour=off&STourA=off&STourB=off&STourC=off&STourD=off"),
-                          shadow_row([](PtzDriver& d) { return d.StopRecordShadowTour(); }, "STourRecord=stop"),
-                          shadow_row([](PtzDriver& d) { return d.StopPreviewShadowTour(); }, "STourPreview=stop")};
+const SentRow kStops[] = {
+    row_of([](PtzDriver& d) { return d.StopShadowTour(); }, "STour=off&STourA=off&STourB=off&STourC=off&STourD=off"),
+    row_of([](PtzDriver& d) { return d.StopRecordShadowTour(); }, "STourRecord=stop"),
+    row_of([](PtzDriver& d) { return d.StopPreviewShadowTour(); }, "STourPreview=stop")};
 
 TEST(ShadowTours, AreStartedByLetterWithAllOthersOff) {
-  expect_sent({shadow_row([](PtzDriver& d) { return d.StartShadowTour(2); },
-                          "STour=on&STourA=off&STourB=on&STourC=off&STourD=off"),
-               shadow_row([](PtzDriver& d) { return d.StartShadowTour(1); },
-                          "STour=on&STourA=on&STourB=off&STourC=off&STourD=off"),
-               shadow_row([](PtzDriver& d) { return d.StartShadowTour(4); },
-                          "STour=on&STourA=off&STourB=off&STourC=off&STourD=on")},
-              with_shadow_tours(4));
-  expect_sent({shadow_row([](PtzDriver& d) { return d.StartShadowTour(1); }, "STour=on&STourA=on")},
-              with_shadow_tours(1));
+  expect_sent(
+      {row_of([](PtzDriver& d) { return d.StartShadowTour(2); }, "STour=on&STourA=off&STourB=on&STourC=off&STourD=off"),
+       row_of([](PtzDriver& d) { return d.StartShadowTour(1); }, "STour=on&STourA=on&STourB=off&STourC=off&STourD=off"),
+       row_of([](PtzDriver& d) { return d.StartShadowTour(4); },
+              "STour=on&STourA=off&STourB=off&STourC=off&STourD=on")},
+      with_shadow_tours(4));
+  expect_sent({row_of([](PtzDriver& d) { return d.StartShadowTour(1); }, "STour=on&STourA=on")}, with_shadow_tours(1));
   for (const int count : {5, 6, INT_MAX}) {
-    expect_sent({shadow_row([](PtzDriver& d) { return d.StartShadowTour(5); },
-                            "STour=on&STourA=off&STourB=off&STourC=off&STourD=off&STourE=on")},
+    expect_sent({row_of([](PtzDriver& d) { return d.StartShadowTour(5); },
+                        "STour=on&STourA=off&STourB=off&STourC=off&STourD=off&STourE=on")},
                 with_shadow_tours(count));
   }
 }
@@ -72,10 +68,9 @@ TEST(ShadowTours, AreRecordedAndPreviewedByLetter) {
   std::vector<SentRow> rows;
   for (int number = 1; number <= 5; ++number) {
     const std::string letter(1, "ABCDE"[number - 1]);
+    rows.push_back(row_of([number](PtzDriver& d) { return d.StartRecordShadowTour(number); }, "STourRecord=" + letter));
     rows.push_back(
-        shadow_row([number](PtzDriver& d) { return d.StartRecordShadowTour(number); }, "STourRecord=" + letter));
-    rows.push_back(
-        shadow_row([number](PtzDriver& d) { return d.StartPreviewShadowTour(number); }, "STourPreview=" + letter));
+        row_of([number](PtzDriver& d) { return d.StartPreviewShadowTour(number); }, "STourPreview=" + letter));
   }
   expect_sent(rows, with_shadow_tours(5));
 }
@@ -89,9 +84,9 @@ TEST(ShadowTours, AreStoppedWithFourNamedWhateverTheirNumber) {
 TEST(ShadowTours, TellTheLatestErrorWhenTheyAreRefused) {
   const auto prepare = with_shadow_tours(1);
   for (const SentRow& row : kStops) expect_refusal_told(row, prepare);
-  expect_refusal_told(shadow_row([](PtzDriver& d) { return d.StartShadowTour(1); }, "STour=on&STourA=on"), prepare);
-  expect_refusal_told(shadow_row([](PtzDriver& d) { return d.StartRecordShadowTour(1); }, "STourRecord=A"), prepare);
-  expect_refusal_told(shadow_row([](PtzDriver& d) { return d.StartPreviewShadowTour(1); }, "STourPreview=A"), prepare);
+  expect_refusal_told(row_of([](PtzDriver& d) { return d.StartShadowTour(1); }, "STour=on&STourA=on"), prepare);
+  expect_refusal_told(row_of([](PtzDriver& d) { return d.StartRecordShadowTour(1); }, "STourRecord=A"), prepare);
+  expect_refusal_told(row_of([](PtzDriver& d) { return d.StartPreviewShadowTour(1); }, "STourPreview=A"), prepare);
   expect_refusal_told(
       setting(shadow_info(false, 0, {false}), "STour=off&STourResume=off&STourA=off&STourAPeriod=always"), prepare);
 }
@@ -122,8 +117,6 @@ TEST_F(ShadowToursUnsent, BecauseTheCameraHasNone) {
     EXPECT_EQ(info.resumeTime, 5);
   }
 }
-
-// ---- Settings ----
 
 TEST(SetShadowTourInfo, SendsAllShadowToursAtOnce) {
   expect_sent({setting(shadow_info(true, 30, {false, true}),
@@ -162,7 +155,7 @@ TEST_F(ShadowToursUnsent, BecauseTwoAreOnOrTheRecordIsNotForAll) {
   }
 }
 
-SLibDShadowTourInfo asked_shadow_tours(const std::string& answer, int count) {
+SLibDShadowTourInfo asked(const std::string& answer, int count) {
   PtzPlay play({inquiry("presetposition", answer)});
   with_shadow_tours(count)(play.driver);
   SLibDShadowTourInfo info = shadow_info(true, 55, std::vector<bool>(7, true));
@@ -171,7 +164,7 @@ SLibDShadowTourInfo asked_shadow_tours(const std::string& answer, int count) {
 }
 
 TEST(GetShadowTourInfo, ReadsEveryShadowTour) {
-  const SLibDShadowTourInfo info = asked_shadow_tours(
+  const SLibDShadowTourInfo info = asked(
       "PresetName=&Tour=off&TourA=off&STour=on&STourResume=on&STourRsmTime=30&STourMaxRecordTime=120"
       "&STourA=off&STourARecordedTime=12&STourB=on&STourBRecordedTime=0&STourC=on",
       3);
@@ -191,7 +184,7 @@ TEST(GetShadowTourInfo, ReadsEveryShadowTour) {
 TEST(GetShadowTourInfo, HasZeroForWhatTheAnswerLacks) {
   for (const char* answer : {"", "STour=on", "STourA=on", "A=1&Tour=on&TourA=on", "A=1&STourRsmTime=30",
                              "A=1&STourResume=on&STourMaxRecordTime=", "A=1&STourResume=on&STourRsmTime=x&STour=ON"}) {
-    const SLibDShadowTourInfo info = asked_shadow_tours(answer, 1);
+    const SLibDShadowTourInfo info = asked(answer, 1);
     EXPECT_FALSE(info.enabled) << answer;
     EXPECT_EQ(info.resumeTime, 0) << answer;
     EXPECT_EQ(info.maxRecordTime, 0) << answer;
@@ -202,9 +195,9 @@ TEST(GetShadowTourInfo, HasZeroForWhatTheAnswerLacks) {
 }
 
 TEST(GetShadowTourInfo, ReadsAsManyAsThereAreLetters) {
-  EXPECT_EQ(asked_shadow_tours("A=1", 5).tours.size(), 5U);
-  EXPECT_EQ(asked_shadow_tours("A=1", 6).tours.size(), 5U);
-  EXPECT_EQ(asked_shadow_tours("A=1", INT_MAX).tours.size(), 5U);
+  EXPECT_EQ(asked("A=1", 5).tours.size(), 5U);
+  EXPECT_EQ(asked("A=1", 6).tours.size(), 5U);
+  EXPECT_EQ(asked("A=1", INT_MAX).tours.size(), 5U);
 }
 
 TEST(GetShadowTourInfo, LeavesTheRecordWhenTheInquiryFails) {

@@ -49,8 +49,6 @@ std::vector<std::string> sizes(const std::vector<SLibDVideoCodecInfo>& codecs, c
   return {};
 }
 
-// ---- Tables ----
-
 const std::vector<std::string> kGeneralSizes = {"1920x1080", "1280x1024", "1280x960", "1280x800", "1280x720",
                                                 "1024x768",  "800x600",   "768x576",  "720x576",  "704x576",
                                                 "720x480",   "704x480",   "640x480",  "640x368",  "384x288",
@@ -176,8 +174,6 @@ TEST(FilterTables, LabelTheirSteps) {
   EXPECT_EQ(codecs[2].bitRates.back().label, "8192kbit/s");
   EXPECT_EQ(codecs[2].bitRates.back().value, 8192);
 }
-
-// ---- Criteria ----
 
 struct CriteriaRow {
   const char* model;

@@ -2,15 +2,52 @@
 #include <gtest/gtest.h>
 
 #include <chrono>
+#include <cstdint>
 #include <iterator>
+#include <map>
 #include <string>
 #include <thread>
 #include <vector>
 
-#include "tests/media/whole_stream.h"
+#include "tests/media/live_camera.h"
+#include "tests/media/statistics_equations.h"
 
 namespace vexa_test {
 namespace {
+
+/// What must arrive of the stream that the camera logged: a picture whose packets all left, behind a key picture
+/// without a gap.
+std::vector<std::uint64_t> predicted(const LiveCamera& camera, const std::vector<vexa::camera::SentPacket>& sent) {
+  std::map<std::uint64_t, std::size_t> left;
+  std::map<std::uint64_t, std::size_t> packets;
+  for (const vexa::camera::SentPacket& packet : sent) {
+    packets[packet.picture] = packet.picture_packets;
+    if (!packet.lost && !packet.duplicate) ++left[packet.picture];
+  }
+  std::vector<std::uint64_t> delivered;
+  bool chain = false;
+  for (const auto& [picture, count] : packets) {
+    chain = left[picture] == count && (chain || camera.is_key(picture));
+    if (chain) delivered.push_back(picture);
+  }
+  return delivered;
+}
+
+/// The frames of a stream that ends by itself, `wanted` by now at the latest; one more when there is one too many.
+std::vector<TakenFrame> take_whole_stream(LiveCamera& camera, MediaDriver& driver, std::vector<std::uint64_t>& wanted) {
+  FrameTaker host;
+  std::vector<TakenFrame> frames;
+  const auto take_more = [&](std::size_t count, std::chrono::milliseconds patience) {
+    const auto more = host.take_all(driver, count, patience);
+    frames.insert(frames.end(), more.begin(), more.end());
+    expect_equations(statistics_of(driver));
+  };
+  while (camera->sent().finished_streams() == 0) take_more(frames.max_size(), std::chrono::milliseconds(50));
+  wanted = predicted(camera, camera->sent().snapshot());
+  if (frames.size() < wanted.size()) take_more(wanted.size() - frames.size(), std::chrono::seconds(10));
+  take_more(1, std::chrono::milliseconds(300));  // longer than a picture is ever held back
+  return frames;
+}
 
 struct Impairment {
   const char* name;
@@ -62,6 +99,7 @@ WholeFrames take_from_assembly(LiveCamera& camera, MediaDriver& driver) {
     frame.data = buffer.data();
     frame.capacity = static_cast<unsigned int>(buffer.size());
     const ELibDReturnCode code = driver.GetRtpCurrentVideoFrame(driver.state().stream_codec(), frame);
+    expect_equations(statistics_of(driver));
     if (code == LIBD_OK) frames.emplace_back(buffer.begin(), buffer.begin() + frame.length);
     return code;
   };
@@ -95,6 +133,10 @@ class Impaired : public testing::TestWithParam<Impairment> {
     MediaDriver driver;
     camera.introduce(driver);
     const WholeFrames frames = stream.take(camera, driver);
+    const vexa::StreamStatistics counted = statistics_of(driver);
+    expect_equations(counted);
+    EXPECT_EQ(counted.packetsReceived + counted.packetsDroppedByKernel, camera->sent().sent());
+    EXPECT_EQ(counted.framesHandedOut + counted.framesHeldInQueue, frames.size());
     const std::vector<std::uint64_t> wanted = predicted(camera, camera->sent().snapshot());
     ASSERT_EQ(frames.size(), wanted.size()) << stream.clip << " " << stream.index;
     for (std::size_t i = 0; i < frames.size(); ++i) {

@@ -46,6 +46,11 @@ class LiveCamera {
     driver.use_live(codec_name());
     driver.keep_pace(pace_);
   }
+  /// Introduces itself, and its video begins.
+  void play(MediaDriver& driver) {
+    introduce(driver);
+    ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  }
 
   bool is_key(std::uint64_t index) const { return camera_.clip()->is_key(place(index)); }
 

@@ -26,8 +26,7 @@ TEST(LiveStream, EveryFrameEqualsTheEncodersAcrossTheLoopOfTheClip) {
   options.pictures = 300;
   LiveCamera camera(options);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   expect_clip(camera, FrameTaker().take_all(driver, 300), 300);
 }
 
@@ -37,8 +36,7 @@ TEST(LiveStream, PicturesOfSeveralSlicesArriveWhole) {
   options.pictures = 100;
   LiveCamera camera(options);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   expect_clip(camera, FrameTaker().take_all(driver, 100), 100);
 }
 
@@ -55,8 +53,7 @@ TEST(LiveStream, EightCamerasAtOnceLoseNothing) {
   for (auto& camera : cameras) {
     hosts.emplace_back([&camera] {
       MediaDriver driver;
-      camera->introduce(driver);
-      ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+      camera->play(driver);
       expect_clip(*camera, FrameTaker().take_all(driver, kPictures), kPictures);
     });
   }
@@ -76,8 +73,7 @@ TEST(LiveStream, AProcessWith5000OpenDescriptorsStreamsAsWellAsAny) {
   while (descriptors.size() < 5000) descriptors.push_back(open("/dev/null", O_RDONLY | O_CLOEXEC));
   ASSERT_GE(descriptors.back(), 5000);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   EXPECT_GT(driver.m_StreamSocket, 1023);
   expect_clip(camera, FrameTaker().take_all(driver, 50), 50);
   driver.StopVideoStreaming();
@@ -117,8 +113,7 @@ TEST_P(LiveStreamRestart, IsFollowedFromTheNextKeyPicture) {
   if (GetParam().timestamp) options.packet_faults.timestamp_restarts = {{kBefore, 50000000}};
   LiveCamera camera(options);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   const auto frames = take_to_the_end(camera, driver, kAll - 1);
   ASSERT_GE(frames.size(), kBefore + kLast);
   for (std::size_t i = 0; i < kBefore; ++i) ASSERT_EQ(frames[i].bytes, camera.picture(i)) << i;
@@ -141,13 +136,85 @@ TEST(LiveStream, CorruptedPacketsEndInNeitherCrashNorHang) {
   options.packet_faults.last_picture = 200;
   LiveCamera camera(options);
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   const auto frames = take_to_the_end(camera, driver, 299);
   ASSERT_GE(frames.size(), 25u);
   for (std::size_t back = 1; back <= 25; ++back) {
     EXPECT_EQ(frames[frames.size() - back].bytes, camera.picture(300 - back)) << "the clean end of the stream";
   }
+}
+
+using vexa::camera::CameraOptions;
+
+CameraOptions codec_options(const std::string& clip, unsigned index = 0) {
+  auto options = camera_options(index);
+  options.clip_path = std::string(VEXA_CLIPS) + "/" + clip;
+  return options;
+}
+
+std::string position_of(MediaDriver& driver) {
+  const vexa::Guard guard(driver.m_CamPosLock);
+  return driver.m_CamPosText;
+}
+
+class Codec : public testing::TestWithParam<const char*> {
+ protected:
+  static bool is_jpeg() { return std::string(GetParam()).ends_with(".mjpeg"); }
+  static std::int32_t type_of(const LiveCamera& camera, std::uint64_t picture) {
+    if (is_jpeg()) return VIDEO_FRAME_JPEG;
+    return camera.is_key(picture) ? VIDEO_FRAME_MPEG4_KEY : VIDEO_FRAME_MPEG4_DELTA;
+  }
+};
+
+TEST_P(Codec, DeliversEveryPictureAcrossTheLoopOfTheClip) {
+  auto options = codec_options(GetParam());
+  options.pictures = 120;
+  options.start_sequence = 65500;
+  options.start_timestamp = 4294900000;
+  LiveCamera camera(options);
+  MediaDriver driver;
+  camera.play(driver);
+  const auto frames = FrameTaker().take_all(driver, 120);
+  ASSERT_EQ(frames.size(), 120u);
+  for (std::size_t i = 0; i < frames.size(); ++i) {
+    ASSERT_TRUE(camera.sent(i, frames[i].bytes)) << "picture " << i;
+    EXPECT_EQ(frames[i].info.frameType, type_of(camera, i)) << "picture " << i;
+    EXPECT_EQ(frames[i].info.seconds, 0);
+    EXPECT_EQ(frames[i].info.microseconds, 0);
+  }
+}
+
+TEST_P(Codec, TellsWhereTheCameraLooksAndLosesNoPictureByIt) {
+  auto options = codec_options(GetParam());
+  options.pictures = 30;
+  options.user_data = "CamPos: 0123,4567,89ab,cdef and more";
+  LiveCamera camera(options);
+  MediaDriver driver;
+  camera.play(driver);
+  const auto frames = FrameTaker().take_all(driver, 30);
+  ASSERT_EQ(frames.size(), 30u);
+  for (std::size_t i = 0; i < frames.size(); ++i) ASSERT_TRUE(camera.sent(i, frames[i].bytes)) << "picture " << i;
+  EXPECT_EQ(position_of(driver), "CamPos: 0123,4567,89ab,c");
+}
+
+INSTANTIATE_TEST_SUITE_P(Clips, Codec, testing::Values("small.m4v", "plain.mjpeg", "restart.mjpeg", "sliced.mjpeg"),
+                         [](const auto& tested) {
+                           std::string name = tested.param;
+                           name[name.find('.')] = '_';
+                           return name;
+                         });
+
+TEST(LiveH264, TellsWhereTheCameraLooks) {
+  auto options = codec_options("small.h264");
+  options.pictures = 30;
+  options.user_data = "CamPos: 0123,4567";
+  LiveCamera camera(options);
+  MediaDriver driver;
+  camera.play(driver);
+  const auto frames = FrameTaker().take_all(driver, 30);
+  ASSERT_EQ(frames.size(), 30u);
+  for (std::size_t i = 0; i < frames.size(); ++i) ASSERT_TRUE(camera.sent(i, frames[i].bytes)) << "picture " << i;
+  EXPECT_EQ(position_of(driver).substr(0, 17), "CamPos: 0123,4567");
 }
 
 }  // namespace

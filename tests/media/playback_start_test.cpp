@@ -147,8 +147,7 @@ TEST(PlaybackStart, HasANameThatAddsNeitherAHeaderNorARequest) {
 TEST(PlaybackStart, EndsTheStreamThatRunsAlsoWhenItFails) {
   LiveCamera camera(camera_options());
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   EXPECT_EQ(driver.StartEdgeStorageVideoStreaming(recording_named("missing")), LIBD_STREAM_OPEN_FAILED);
   expect_nothing_open(driver);
   EXPECT_EQ(camera->sessions(), 0u);

@@ -2,17 +2,70 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
+#include <chrono>
+#include <cstdint>
 #include <map>
+#include <memory>
 #include <string>
 #include <thread>
 #include <vector>
 
-#include "tests/media/recorded_camera.h"
+#include "tests/media/live_camera.h"
 #include "tests/support/failing_new.h"
 #include "tests/support/process_state.h"
 
 namespace vexa_test {
 namespace {
+
+/// A camera with a recording on its card.
+class RecordedCamera : public LiveCamera {
+ public:
+  static constexpr std::int64_t kStart = 1706745599;  // 2024-01-31 23:59:59 UTC, and a quarter of a second
+  static constexpr int kStartMicros = 250000;
+  static constexpr int kInterval = 33300;  // microseconds between two pictures
+
+  explicit RecordedCamera(const vexa::camera::CameraOptions& options, std::uint64_t pictures = 60)
+      : LiveCamera(with_card(options)), name_(record(pictures)) {}
+
+  const std::string& name() const { return name_; }
+
+  SLibDEdgeStorageStreamingInfo recording(int scale = 1) {
+    SLibDEdgeStorageStreamingInfo info;
+    info.streamName = name_;
+    info.codecName = codec_name();
+    info.scale = scale;
+    return info;
+  }
+
+  /// Microseconds since 1970 at which picture `index` was stored.
+  static std::int64_t stored_at(std::uint64_t index) {
+    return kStart * 1000000 + kStartMicros + static_cast<std::int64_t>(index) * kInterval;
+  }
+
+ private:
+  static vexa::camera::CameraOptions with_card(vexa::camera::CameraOptions options) {
+    options.card_bytes = 64U << 20U;
+    return options;
+  }
+
+  std::string record(std::uint64_t pictures) {
+    if ((*this)->clip() == nullptr) return {};  // the failure has been told
+    vexa::camera::Card& card = (*this)->card();
+    vexa::camera::RecordingHead head;
+    head.codec = (*this)->clip()->codec();
+    head.frame_rate = 30;
+    head.start = std::chrono::seconds(kStart) + std::chrono::microseconds(kStartMicros);
+    const std::string name = card.begin(head);
+    for (std::uint64_t i = 0; i < pictures; ++i) {
+      EXPECT_TRUE(card.add({std::make_shared<const std::string>(picture(i)), is_key(i),
+                            std::chrono::microseconds(i * static_cast<std::uint64_t>(kInterval))}));
+    }
+    card.finish();
+    return name;
+  }
+
+  std::string name_;
+};
 
 std::int64_t stamp_of(const TakenFrame& frame) {
   return std::int64_t{frame.info.seconds} * 1000000 + frame.info.microseconds;
@@ -127,8 +180,6 @@ TEST(PlaybackStream, IsNotTornDownWhenTheHostWantsItSo) {
   }
 }
 
-// ---- What goes wrong while it plays ----
-
 /// Moves the driver's clock until the host has been told of the silence.
 ELibDReturnCode code_of_silence(MediaDriver& driver, std::atomic<std::time_t>& now) {
   FrameTaker host;
@@ -200,8 +251,6 @@ TEST(PlaybackStart, ThatRunsOutOfMemoryAnywhereFailsAndLeavesNothingBehind) {
       19);
   EXPECT_TRUE(eventually([&] { return open_descriptors() == descriptors; }));
 }
-
-// ---- Back and forth ----
 
 /// Everything that names a session, with the URL that the session was set up for; true when all agree.
 std::size_t requests_within_sessions(LiveCamera& camera, const std::string& method) {

@@ -56,8 +56,7 @@ TEST(VideoStreaming, StartIsRefusedWhileAStopIsInProgress) {
 TEST(VideoStreaming, OpensTheSessionByItsTextsAndEndsItWithTearDown) {
   LiveCamera camera(camera_options());
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   EXPECT_NE(driver.m_StagingBuffer, nullptr);
   EXPECT_EQ(driver.m_RtpClockRate, 90000);
   ASSERT_EQ(driver.StopVideoStreaming(), LIBD_OK);
@@ -110,8 +109,7 @@ TEST(VideoStreaming, ADestroyedDriverStopsVideoFirstAndTheAlarmStreamLast) {
   ASSERT_EQ(socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends), 0);
   {
     MediaDriver driver;
-    camera.introduce(driver);
-    ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+    camera.play(driver);
     const vexa::Guard guard(driver.m_IoStreamLock);
     driver.m_IoStreamSocket = ends[0];
   }
@@ -185,8 +183,7 @@ TEST(VideoStreaming, ASecondStopWhileTheFirstStillWaitsGivesFailed) {
   LiveCamera camera(camera_options());
   camera->add_request_fault(RequestFault::no_answer("GET_PARAMETER"));  // keeps the thread for a second
   MediaDriver driver;
-  camera.introduce(driver);
-  ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+  camera.play(driver);
   ASSERT_TRUE(camera->journal().wait_for(
       [](const auto& requests) { return !requests.empty() && requests.back().bytes.rfind("GET_PARAMETER", 0) == 0; },
       std::chrono::seconds(10)));
@@ -221,8 +218,7 @@ TEST(VideoStreaming, ADriverDestroyedWhileStreamingLeavesNothingBehind) {
   const std::size_t threads = running_threads();
   {
     MediaDriver driver;
-    camera.introduce(driver);
-    ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+    camera.play(driver);
     ASSERT_EQ(FrameTaker().take_all(driver, 2).size(), 2u);
   }
   EXPECT_TRUE(eventually([&] { return running_threads() == threads; })) << running_threads() << " of " << threads;

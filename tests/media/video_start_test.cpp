@@ -106,8 +106,7 @@ TEST(VideoStop, ThatRunsOutOfMemoryClosesEverythingAllTheSame) {
   fails_at_every_allocation(
       [&camera](Shortage& shortage) {
         MediaDriver driver;
-        camera.introduce(driver);
-        ASSERT_EQ(driver.StartVideoStreaming(), LIBD_OK);
+        camera.play(driver);
         EXPECT_EQ(shortage.run([&] { return driver.StopVideoStreaming(); }), LIBD_OK);
         expect_stopped(driver);
       },

@@ -28,6 +28,7 @@ class Stream {
   int naps() const { return naps_; }
   microseconds latest() const { return nap_; }
   microseconds goes_on() { return gather_.goes_on(); }
+  void limit(microseconds longest) { gather_.limit(longest); }
 
  private:
   BurstGather gather_;
@@ -98,6 +99,18 @@ TEST(BurstGather, DoesNotNapInTheMiddleOfAPictureWhereItDidNotAtItsBeginning) {
   stream.run(641, {10, 1400}, {10, 1400});
   ASSERT_EQ(stream.latest(), microseconds(0));
   EXPECT_EQ(stream.goes_on(), microseconds(0));
+}
+
+TEST(BurstGather, NapsNoLongerThanItsLimitFromTheNextBurstOn) {
+  Stream stream;
+  stream.run(319, {1, 1400}, {4, 1400});
+  ASSERT_EQ(stream.latest(), BurstGather::kLongest);
+  stream.limit(BurstGather::kPrompt);
+  stream.run(320, {1, 1400}, {4, 1400});
+  EXPECT_EQ(stream.latest(), BurstGather::kPrompt);
+  stream.limit(BurstGather::kLongest);
+  stream.run(320, {1, 1400}, {4, 1400});
+  EXPECT_EQ(stream.latest(), BurstGather::kLongest);
 }
 
 }  // namespace

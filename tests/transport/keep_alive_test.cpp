@@ -134,6 +134,31 @@ TEST_F(KeepAlive, OfACameraThatHasClosedRaisesNoSignal) {
   EXPECT_EQ(trace(), "send <" + request(4) + ">\nerror sending getparameter\nerror receiving getparameter\n");
 }
 
+TEST_F(KeepAlive, IsSentAgainOnlyWhenTheOneBeforeIsOver) {
+  vexa::DriverState& state = driver_.state();
+  testing::internal::CaptureStdout();
+  state.begin_keep_alive();
+  set_time += 100;
+  state.begin_keep_alive();
+  state.look_for_keep_alive();
+  EXPECT_EQ(heard(), request(4));
+  answer();
+  state.look_for_keep_alive();
+  state.begin_keep_alive();
+  EXPECT_EQ(heard(), request(5));
+  EXPECT_EQ(testing::internal::GetCapturedStdout(), "send <" + request(4) + ">\nsuccessfully sending getparameter\n" +
+                                                        "send <" + request(5) +
+                                                        ">\nsuccessfully sending getparameter\n");
+}
+
+TEST_F(KeepAlive, ThatIsBegunAndCutOffByTheCameraTimesOutAtOnce) {
+  driver_.soil_latest_error();
+  answer("RTSP/1.0 200");
+  EXPECT_EQ(shutdown(camera_, SHUT_WR), 0);
+  EXPECT_EQ(trace(), "send <" + request(4) + ">\nsuccessfully sending getparameter\nerror receiving getparameter\n");
+  EXPECT_EQ(driver_.LatestErrorText(), "Receive timed out");
+}
+
 TEST(KeepAliveClock, IsTheSystemsUnlessATestSetsIt) {
   TestDriver driver;
   const std::time_t before = std::time(nullptr);

@@ -3,6 +3,7 @@
 #define TESTS_VIRTUAL_CAMERA_CAMERA_CLIENT_H_
 
 #include <fmt/format.h>
+#include <gtest/gtest.h>
 #include <poll.h>
 #include <sys/socket.h>
 #include <unistd.h>
@@ -14,7 +15,7 @@
 #include <vector>
 
 #include "tests/support/own_address.h"
-#include "virtual_camera/values/options.h"
+#include "virtual_camera/virtual_camera.h"
 
 namespace vexa::camera {
 
@@ -29,6 +30,12 @@ inline CameraOptions test_options() {
   options.rtsp_port = 0;
   return options;
 }
+
+/// A camera that runs as long as its test.
+class StartedCamera : public VirtualCamera {
+ public:
+  explicit StartedCamera(const CameraOptions& options) : VirtualCamera(options) { EXPECT_TRUE(start()) << error(); }
+};
 
 enum class Ended { kNot, kClosed, kReset };
 

@@ -137,8 +137,6 @@ TEST_F(CardCamera, EndsARecordingWhenTheCardIsFullOrFails) {
   EXPECT_EQ(camera_.card().recordings()->size(), 1U);
 }
 
-// ---- Playing ----
-
 class CardPlayback : public CardCamera {
  protected:
   void SetUp() override {

@@ -106,8 +106,7 @@ TEST_F(HttpCamera, StopsRefusingAndStartsAgainOnTheSamePort) {
 TEST(HttpCameraLimits, ARequestThatDawdlesIsCutOffAndJournaled) {
   CameraOptions options = test_options();
   options.request_time_limit = milliseconds(50);
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   Client client(camera.address(), camera.http_port());
   client.send("GET /slow");
   EXPECT_EQ(client.read_to_end(), "");
@@ -118,8 +117,7 @@ TEST(HttpCameraLimits, ARequestThatDawdlesIsCutOffAndJournaled) {
 TEST(HttpCameraLimits, ATrickleOfBytesDoesNotStretchTheLimit) {
   CameraOptions options = test_options();
   options.request_time_limit = milliseconds(100);
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   Client client(camera.address(), camera.http_port());
   int sent = 0;
   for (; sent < 1000 && client.ended() == Ended::kNot; ++sent) {

@@ -98,8 +98,7 @@ void expect_those_that_left(const SharedConnection& host, VirtualCamera& camera)
 TEST(InterleavedCamera, SendsWhatItSendsInDatagrams) {
   CameraOptions options = interleaved_options();
   options.pictures = 260;
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   SharedConnection host(camera);
   EXPECT_EQ(host.ask(kAsk.setup_interleaved(1)),
             "RTSP/1.0 200 OK\r\nCSeq: 1\r\nSession: 12345678;timeout=60\r\n"
@@ -131,8 +130,7 @@ TEST(InterleavedCamera, AnswersAndPacketsNeverTearEachOther) {
   CameraOptions options = interleaved_options();
   options.speed = 100;
   options.request_faults.push_back(RequestFault::byte_at_a_time("CSeq: 7\r\n", milliseconds(1)));
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   SharedConnection host(camera);
   host.ask(kAsk.setup_interleaved(1));
   host.ask(kAsk.play(2, kFirstSession));
@@ -146,8 +144,7 @@ TEST(InterleavedCamera, AnswersAndPacketsNeverTearEachOther) {
 }
 
 TEST(InterleavedCamera, AHostsReportsBetweenItsRequestsArePassedOver) {
-  VirtualCamera camera(interleaved_options());
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(interleaved_options());
   SharedConnection host(camera);
   host.ask(kAsk.setup_interleaved(1));
   const std::string report = std::string("$\1\0\x8", 4) + "12\r\n\r\n34";
@@ -161,8 +158,7 @@ TEST(InterleavedCamera, AHostsReportsBetweenItsRequestsArePassedOver) {
 TEST(InterleavedCamera, EachSessionOfAConnectionHasChannelsOfItsOwn) {
   CameraOptions options = interleaved_options();
   options.pictures = 5;
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   SharedConnection host(camera);
   host.ask(kAsk.setup_interleaved(1));
   EXPECT_NE(host.ask(kAsk.setup_interleaved(2)).find(";interleaved=2-3\r\n"), std::string::npos);
@@ -176,8 +172,7 @@ TEST(InterleavedCamera, EachSessionOfAConnectionHasChannelsOfItsOwn) {
 }
 
 TEST(InterleavedCamera, TeardownEndsThePacketsAndLeavesTheConnection) {
-  VirtualCamera camera(interleaved_options());
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(interleaved_options());
   SharedConnection host(camera);
   host.ask(kAsk.setup_interleaved(1));
   host.ask(kAsk.play(2, kFirstSession));
@@ -194,8 +189,7 @@ TEST(InterleavedCamera, SkipsPacketsOfAHostThatDoesNotRead) {
   CameraOptions options = interleaved_options();
   options.speed = 10000;
   options.burst_gap = std::chrono::microseconds(0);
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   SharedConnection host(camera);
   host.ask(kAsk.setup_interleaved(1));
   host.ask(kAsk.play(2, kFirstSession));
@@ -217,8 +211,7 @@ TEST(InterleavedCamera, GivesUpAHostThatNeverReads) {
   options.speed = 10000;
   options.burst_gap = std::chrono::microseconds(0);
   options.interleaved_patience = milliseconds(50);
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   Client host(camera.address(), camera.rtsp_port());
   host.ask(kAsk.setup_interleaved(1));
   host.send(kAsk.play(2, kFirstSession));
@@ -229,8 +222,7 @@ TEST(InterleavedCamera, GivesUpAHostThatNeverReads) {
 TEST(InterleavedCamera, BeginsAWhileAfterTheAnswerToPlay) {
   CameraOptions options = interleaved_options();
   options.interleaved_pause = milliseconds(120);
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   SharedConnection host(camera);
   host.ask(kAsk.setup_interleaved(1));
   host.ask(kAsk.play(2, kFirstSession));

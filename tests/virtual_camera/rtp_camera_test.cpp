@@ -92,8 +92,7 @@ TEST(RtpCamera, PicturesArriveAsTheClipHoldsThemAndTheClipStartsOver) {
   for (const char* clip : {"small", "slices"}) {
     CameraOptions options = streaming_options(clip);
     options.pictures = 260;
-    VirtualCamera camera(options);
-    ASSERT_TRUE(camera.start()) << camera.error();
+    StartedCamera camera(options);
     Player player(camera);
     std::size_t packets = 0;
     for (std::size_t i = 0; i < 260; ++i) packets += camera.clip()->pictures()[i % 250].packets();
@@ -114,8 +113,7 @@ TEST(RtpCamera, TheSentLogIsWhatArrived) {
   options.packet_faults.delay_time = milliseconds(30);
   options.packet_faults.corrupt_payload = 0.02;
   options.packet_faults.corrupt_header = 0.02;
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   Player player(camera);
   const std::vector<Buffer> datagrams = player.take_all(camera.sent());
   std::vector<SentPacket> sent = camera.sent().snapshot();
@@ -155,8 +153,7 @@ TEST(RtpCamera, TheSameSeedSendsTheSameRun) {
 TEST(RtpCamera, PacketFaultsSetLaterHoldForTheNextStream) {
   CameraOptions options = streaming_options("small");
   options.pictures = 10;
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   PacketFaults faults;
   faults.loss = 1;
   camera.set_packet_faults(faults);
@@ -170,8 +167,7 @@ TEST(RtpCamera, PicturesFarApartInTimeKeepTheirTimestamps) {
   CameraOptions options = streaming_options("small");
   options.pictures = 5;
   options.start_timestamp = 4294967295U - 3599;
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   const Player player(camera);
   ASSERT_TRUE(camera.sent().wait_for_finished(1, milliseconds(kPatience)));
   for (const SentPacket& packet : camera.sent().snapshot()) {
@@ -183,8 +179,7 @@ TEST(RtpCamera, LargePicturesLeaveInBurstsOfTheSetSize) {
   CameraOptions options = streaming_options("hd");
   options.pictures = 10;
   options.burst_packets = 8;
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   const Player player(camera);
   ASSERT_TRUE(camera.sent().wait_for_finished(1, milliseconds(kPatience)));
   const std::vector<SentPacket> sent = camera.sent().snapshot();
@@ -199,8 +194,7 @@ TEST(RtpCamera, LargePicturesLeaveInBurstsOfTheSetSize) {
 TEST(RtpCamera, SeveralClientsGetStreamsOfTheirOwn) {
   CameraOptions options = streaming_options("small");
   options.pictures = 50;
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   std::vector<std::unique_ptr<Player>> players;
   for (int i = 0; i < 4; ++i) players.push_back(std::make_unique<Player>(camera));
   std::size_t packets = 0;
@@ -213,8 +207,7 @@ TEST(RtpCamera, SeveralClientsGetStreamsOfTheirOwn) {
 }
 
 TEST(RtpCamera, TeardownEndsTheStream) {
-  VirtualCamera camera(streaming_options("small"));
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(streaming_options("small"));
   Player player(camera);
   EXPECT_EQ(player.take(20).size(), 20U);
   EXPECT_EQ(player.rtsp.ask(kAsk.teardown(3, player.session)), "RTSP/1.0 200 OK\r\nCSeq: 3\r\n\r\n");
@@ -227,8 +220,7 @@ TEST(RtpCamera, TeardownEndsTheStream) {
 TEST(RtpCamera, AClientWhosePortIsClosedDisturbsNoOther) {
   CameraOptions options = streaming_options("small");
   options.pictures = 50;
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   // Held, so that nobody else is given the port, by a socket that hears another peer alone.
   asio::io_context context;
   const auto loopback = asio::ip::make_address("127.0.0.1");

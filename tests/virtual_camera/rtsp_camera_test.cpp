@@ -134,8 +134,7 @@ TEST(RtspCameraAnswers, StayWithinHalfOfWhatAHostReads) {
   options.range_clock = "20240131T235959.250Z";
   options.session_timeout = std::chrono::seconds(2000000000);
   options.first_session = 4000000000U;
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   Client client(camera.address(), camera.rtsp_port());
   const std::string description = client.ask(kAsk.describe(2147483647));
   EXPECT_NE(description.find("sprop-parameter-sets="), std::string::npos);
@@ -149,8 +148,7 @@ TEST(RtspCameraExpiry, ASilentSessionEndsAfterItsTimeout) {
   CameraOptions options = test_options();
   options.session_timeout = std::chrono::seconds(1);
   options.session_expiry = SessionExpiry::kWhenSilent;
-  VirtualCamera camera(options);
-  ASSERT_TRUE(camera.start()) << camera.error();
+  StartedCamera camera(options);
   Client client(camera.address(), camera.rtsp_port());
   client.ask(kAsk.setup(1, 5000));
   EXPECT_EQ(client.ask(kAsk.get_parameter(2, 12345678)).substr(0, 15), "RTSP/1.0 200 OK");

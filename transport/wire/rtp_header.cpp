@@ -19,7 +19,7 @@ std::optional<RtpHeader> parse_rtp_header(Bytes datagram) {
 std::optional<std::uint16_t> interleaved_length(Bytes prefix) {
   ByteReader in(prefix);
   const bool dollar = in.u8() == '$';
-  // Kept: the channel is not looked at, so control packets pass for media; cameras send none.
+  // Kept: the channel is not looked at, so control packets pass for media; what they report is read beside.
   in.u8();
   const std::uint16_t length = in.u16();
   if (!dollar || !in.ok()) return std::nullopt;

@@ -19,6 +19,11 @@ struct RtpHeader {
   std::uint32_t timestamp = 0;
 };
 
+/// The SSRC of a packet of at least kRtpHeaderSize bytes.
+inline std::uint32_t source_of(Bytes packet) {
+  return std::uint32_t{packet[8]} << 24 | std::uint32_t{packet[9]} << 16 | std::uint32_t{packet[10]} << 8 | packet[11];
+}
+
 /// None when the datagram is shorter than the header.
 std::optional<RtpHeader> parse_rtp_header(Bytes datagram);
 
@@ -27,6 +32,9 @@ inline constexpr int kRtpVersionNumber = 2;
 
 /// Bytes of the packet that follows; nothing when the prefix does not begin with "$". Whatever the channel.
 std::optional<std::uint16_t> interleaved_length(Bytes prefix);
+
+/// Control packets (RTCP) go on the odd channels.
+inline bool is_control_channel(Bytes prefix) { return (prefix[1] & 1) != 0; }
 
 /// What the first byte of an RTP header (RFC 3550, 5.1) tells on this way.
 struct RtpFront {

@@ -6,6 +6,7 @@
 #include <fstream>
 #include <iostream>
 
+#include "command_line/description.h"
 #include "virtual_camera/program/fault_arguments.h"
 
 namespace vexa::camera {
@@ -116,6 +117,8 @@ CommandLine parse_command_line(int argc, const char* const* argv) {
   camera.hash_packets = false;
   camera.journal_limit = 0;
   CLI::App app(kAbout, "vexa-camera");
+  app.set_version_flag("--version", "vexa-camera " VEXA_VERSION);
+  command_line::add_help_json(app);
   FaultArguments faults;
   add_place(app, line.options);
   add_credentials(app, camera);

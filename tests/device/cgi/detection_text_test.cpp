@@ -16,8 +16,6 @@ using vexa_test::marked_setting;
 using vexa_test::numbers_of;
 using vexa_test::setting_rows;
 
-// ---- LOD ----
-
 TEST(LodSettings, AreSeventeenAlike) {
   const auto settings = lod_settings("LODFunc=on&LODMinObjectSize=middle&LODSensitivity=40");
   ASSERT_EQ(settings.size(), 17U);
@@ -77,8 +75,6 @@ TEST(Areas, AreTwoPointsInEachWindow) {
     }
   }
 }
-
-// ---- Object detection ----
 
 TEST(PositionMode, IsCurrentForThatWordAlone) {
   const struct {
@@ -255,8 +251,6 @@ TEST(ObjectSettings, AreReadFromAnAnswerCutAnywhere) {
   }
   EXPECT_EQ(object_settings(answer, true).size(), 2U);
 }
-
-// ---- Requests ----
 
 TEST(ObjectRequests, AreWholeAndInTheirOrder) {
   const SLibDDetectionParam param = marked_setting(7);

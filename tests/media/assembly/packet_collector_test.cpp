@@ -17,11 +17,15 @@ using Instant = PacketCollector::Instant;
 /// A collector on a clock of its own, and what it handed out.
 class Collection {
  public:
-  explicit Collection(const PictureRules& rules = kH264Rules) : collector_(packets_, rules) {}
+  explicit Collection(const PictureRules& rules = kH264Rules, int clock_rate = ModelStream::kClockRate)
+      : collector_(packets_, rules), clock_rate_(clock_rate) {}
 
   void arrive(const SPacketInfo& packet) {
-    collector_.add(packet, ModelStream::kClockRate, now_);
+    collector_.add(packet, clock_rate_, now_);
+    ++given_;
+    expect_counted();
     drain();
+    expect_counted();
   }
   void arrive(const ModelPicture& picture) {
     for (const SPacketInfo& packet : picture.packets) arrive(packet);
@@ -42,6 +46,22 @@ class Collection {
       if (shown_.size() == before) break;
     }
     now_ = end;
+    expect_counted();
+  }
+
+  /// Each packet given stands in one of the packets' numbers, each picture begun in one of the pictures'.
+  void expect_counted() {
+    const CollectionCounts& c = collector_.counts();
+    const bool packets = given_ == c.used + c.duplicated + c.late + c.given_up + c.overwritten + c.stopped + c.held;
+    const bool held = collector_.is_empty() ? c.held == 0 : c.held >= packets_.size() && c.held <= packets_.size() + 2;
+    const bool pictures = c.pictures_begun == c.pictures_assembled + c.pictures_incomplete + c.pictures_damaged +
+                                                  c.pictures_without_key + c.pictures_too_large + c.pictures_stopped +
+                                                  c.pictures_held;
+    std::uint64_t listed = packets_.empty() ? 0 : 1;
+    for (std::size_t i = 1; i < packets_.size(); ++i) listed += packets_[i].timestamp != packets_[i - 1].timestamp;
+    if (packets && held && pictures && c.pictures_held == listed && c.pictures_assembled == shown_.size()) return;
+    ADD_FAILURE() << "after " << given_ << " packets: packets " << packets << ", held " << held << " (" << c.held << "/"
+                  << packets_.size() << "), pictures " << pictures << " (" << c.pictures_held << "/" << listed << ")";
   }
 
   const std::vector<std::uint32_t>& shown() const { return shown_; }
@@ -59,7 +79,9 @@ class Collection {
 
   std::vector<SPacketInfo> packets_;
   PacketCollector collector_;
+  const int clock_rate_;
   Instant now_{};
+  std::uint64_t given_ = 0;
   std::vector<std::uint32_t> shown_;
 };
 
@@ -407,6 +429,20 @@ INSTANTIATE_TEST_SUITE_P(
       return name;
     });
 
+TEST(PacketCollector, ARestartIsFollowedWhateverClockRateTheCameraNames) {
+  for (const int rate : {-2147483647 - 1, 0, 1, 90000, 1'000'000, 100'000'000, 2147483647}) {
+    ModelStream before({.sequence = 30000, .timestamp = 2'000'000'000});
+    Collection collection(kH264Rules, rate);
+    const ModelPicture key = before.key_picture(3);
+    collection.arrive(key);
+    ModelStream after({.sequence = static_cast<std::uint16_t>(key.packets.back().sequence + 40000),
+                       .timestamp = timestamp_of(key) - (1U << 30)});
+    const ModelPicture new_key = after.key_picture(3);
+    collection.arrive(new_key);
+    EXPECT_EQ(collection.shown().back(), timestamp_of(new_key)) << rate;
+  }
+}
+
 TEST(PacketCollector, ARestartThatBeginsWithAKeyPictureLosesNoPictureOfIt) {
   ModelStream before({.sequence = 30000, .timestamp = 1'000'000'000});
   Collection collection;
@@ -430,6 +466,59 @@ TEST(PacketCollector, LatecomersOfAPictureThatWasGivenUpAreNoRestart) {
   const ModelPicture delta = stream.delta_picture(2);
   collection.arrive(delta);
   EXPECT_EQ(collection.shown().back(), timestamp_of(delta));
+}
+
+TEST(PacketCollector, CountsWhatBecameOfEachPacketAndPicture) {
+  ModelStream stream;
+  const ModelPicture early = stream.delta_picture(2);
+  const ModelPicture key = stream.key_picture(2);
+  const ModelPicture broken = stream.delta_picture(3);
+  const ModelPicture next_key = stream.key_picture(2);
+  Collection collection;
+  collection.arrive(early);
+  collection.arrive(key);
+  collection.arrive(key.packets[0]);
+  collection.arrive_without(broken, 1);
+  collection.arrive(next_key);
+  const CollectionCounts& counts = collection.collector().counts();
+  EXPECT_EQ(counts.pictures_without_key, 1u);
+  EXPECT_EQ(counts.duplicated, 1u);
+  EXPECT_EQ(counts.pictures_held, 2u);
+  EXPECT_EQ(counts.held, 2u + 4u);
+  collection.pass(milliseconds(200));
+  EXPECT_EQ(counts.pictures_incomplete, 1u);
+  EXPECT_EQ(counts.given_up, 2u);
+  EXPECT_EQ(counts.pictures_assembled, 2u);
+  EXPECT_EQ(counts.used, 2u + 4u + 4u);
+  collection.arrive(broken.packets[1]);
+  EXPECT_EQ(counts.late, 1u);
+}
+
+TEST(PacketCollector, WhatIsHeldWhenTheStreamEndsIsCountedSo) {
+  ModelStream stream;
+  const ModelPicture key = stream.key_picture(2);
+  const ModelPicture delta = stream.delta_picture(3);
+  Collection collection;
+  collection.arrive(key);
+  collection.arrive_without(delta, 0);
+  collection.collector().discard_all();
+  collection.expect_counted();
+  EXPECT_EQ(collection.collector().counts().stopped, 2u);
+  EXPECT_EQ(collection.collector().counts().pictures_stopped, 1u);
+  EXPECT_TRUE(collection.collector().is_empty());
+}
+
+TEST(PacketCollector, APacketThatPartsARunOfEqualPlacesCountsAsTwoPicturesMore) {
+  ModelStream stream({1, 10'000'005});
+  const ModelPicture picture = stream.delta_picture(3);
+  SPacketInfo between = picture.packets[1];
+  between.timestamp = 5;  // of the same place in the order as 10000005
+  Collection collection;
+  collection.arrive(picture.packets[0]);
+  collection.arrive(picture.packets[2]);
+  EXPECT_EQ(collection.collector().counts().pictures_held, 1u);
+  collection.arrive(between);
+  EXPECT_EQ(collection.collector().counts().pictures_held, 3u);
 }
 
 // The channel between camera and driver, and what it must let through.

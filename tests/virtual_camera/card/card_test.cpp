@@ -131,8 +131,6 @@ TEST(Card, MomentsAreWholeTenthsOfAMillisecond) {
   EXPECT_EQ(in_tenths_of_milliseconds(33333333ns), 33300us);
 }
 
-// ---- Commands ----
-
 Answer ask(Card& card, const std::string& path, const std::string& query) {
   RequestHead head;
   head.method = "GET";
@@ -177,8 +175,6 @@ TEST(CardCommands, ReadOnlyWholeEncodedBytes) {
     EXPECT_EQ(ask(card, "/command/edgestorage.cgi", std::string("DeletebyName=") + name).status, 400) << name;
   }
 }
-
-// ---- Playing ----
 
 struct Played {
   std::vector<int> places;      // of the stored pictures, which are a second apart
@@ -243,8 +239,6 @@ TEST(CardSource, ScalesAreTakenToTheNearestOffered) {
   EXPECT_EQ(offered_scale({1}, -1), 1);
   EXPECT_EQ(offered_scale({}, 4), 1);
 }
-
-// ---- Settings ----
 
 TEST(RecorderSettings, NameAStreamWhenStorageIsOnAndWatchesAnAddress) {
   const struct {

@@ -23,33 +23,33 @@ std::string drawn(Draw draw, const DrawnVideo& video, std::uint64_t pictures) {
   return bytes;
 }
 
-struct DrawnCase {
+struct Case {
   const char* format;  // the decoder's word
   Draw draw;
   DrawnVideo video;
   const char* size;
 };
 
-constexpr DrawnCase kDrawnCases[] = {{"h264", draw_h264, {1920, 1080, 5}, "1920x1080"},
-                                     {"h264", draw_h264, {640, 480, 30}, "640x480"},
-                                     {"h264", draw_h264, {640, 368, 25}, "640x368"},
-                                     {"h264", draw_h264, {160, 120, 60}, "160x120"},
-                                     {"h264", draw_h264, {2, 2, 1}, "2x2"},
-                                     {"h264", draw_h264, {319, 191, 2}, "320x192"},
-                                     {"m4v", draw_mpeg4, {1920, 1080, 5}, "1920x1080"},
-                                     {"m4v", draw_mpeg4, {640, 480, 30}, "640x480"},
-                                     {"m4v", draw_mpeg4, {720, 576, 1}, "720x576"},
-                                     {"m4v", draw_mpeg4, {160, 120, 60}, "160x120"},
-                                     {"m4v", draw_mpeg4, {16, 16, 2}, "16x16"},
-                                     {"m4v", draw_mpeg4, {319, 191, 3}, "319x191"},
-                                     {"mjpeg", draw_jpeg, {1920, 1080, 2}, "1920x1080"},
-                                     {"mjpeg", draw_jpeg, {640, 480, 5}, "640x480"},
-                                     {"mjpeg", draw_jpeg, {320, 192, 30}, "320x192"},
-                                     {"mjpeg", draw_jpeg, {8, 8, 2}, "8x8"},
-                                     {"mjpeg", draw_jpeg, {319, 191, 3}, "319x191"}};
+constexpr Case kCases[] = {{"h264", draw_h264, {1920, 1080, 5}, "1920x1080"},
+                           {"h264", draw_h264, {640, 480, 30}, "640x480"},
+                           {"h264", draw_h264, {640, 368, 25}, "640x368"},
+                           {"h264", draw_h264, {160, 120, 60}, "160x120"},
+                           {"h264", draw_h264, {2, 2, 1}, "2x2"},
+                           {"h264", draw_h264, {319, 191, 2}, "320x192"},
+                           {"m4v", draw_mpeg4, {1920, 1080, 5}, "1920x1080"},
+                           {"m4v", draw_mpeg4, {640, 480, 30}, "640x480"},
+                           {"m4v", draw_mpeg4, {720, 576, 1}, "720x576"},
+                           {"m4v", draw_mpeg4, {160, 120, 60}, "160x120"},
+                           {"m4v", draw_mpeg4, {16, 16, 2}, "16x16"},
+                           {"m4v", draw_mpeg4, {319, 191, 3}, "319x191"},
+                           {"mjpeg", draw_jpeg, {1920, 1080, 2}, "1920x1080"},
+                           {"mjpeg", draw_jpeg, {640, 480, 5}, "640x480"},
+                           {"mjpeg", draw_jpeg, {320, 192, 30}, "320x192"},
+                           {"mjpeg", draw_jpeg, {8, 8, 2}, "8x8"},
+                           {"mjpeg", draw_jpeg, {319, 191, 3}, "319x191"}};
 
 TEST(DrawnVideo, ADecoderFindsEveryPictureInTheSizeAskedFor) {
-  for (const DrawnCase& c : kDrawnCases) {
+  for (const Case& c : kCases) {
     SCOPED_TRACE(std::string(c.format) + " " + c.size);
     const vexa_test::TemporaryFolder folder(vexa_test::memory_folder());
     const std::size_t pictures = 2 * static_cast<std::size_t>(c.video.frame_rate);

@@ -17,10 +17,10 @@
 namespace vexa::camera {
 namespace {
 
-constexpr PictureSize kEncodedSize{320, 192};
+constexpr PictureSize kSize{320, 192};
 
 // Somebody walks through the scene while the camera turns.
-I420Picture seen(int index, PictureSize size = kEncodedSize) {
+I420Picture seen(int index, PictureSize size = kSize) {
   const View view{{index * 0.5, -2, 50, ""}, size, false};
   SceneMoment moment;
   moment.clock = std::chrono::milliseconds(40 * index);
@@ -31,7 +31,7 @@ I420Picture seen(int index, PictureSize size = kEncodedSize) {
   return picture;
 }
 
-LiveEncoding small_encoding(Codec codec) { return {codec, kEncodedSize.width, kEncodedSize.height, 25, 1000, 8, 5}; }
+LiveEncoding small_encoding(Codec codec) { return {codec, kSize.width, kSize.height, 25, 1000, 8, 5}; }
 
 EncodedPicture encoded(LiveEncoder& encoder, const I420Picture& picture) {
   auto result = encoder.encode(picture);
@@ -77,13 +77,13 @@ double signal_to_noise(const std::uint8_t* original, const char* decoded, std::s
   return 10 * std::log10(255.0 * 255.0 * static_cast<double>(bytes) / (squares + 1e-9));
 }
 
-struct EncoderCase {
+struct Case {
   Codec codec;
   const char* format;
   const char* name;
 };
 
-class LiveEncoderOf : public testing::TestWithParam<EncoderCase> {};
+class LiveEncoderOf : public testing::TestWithParam<Case> {};
 
 TEST_P(LiveEncoderOf, GivesOneAccessUnitAPictureThatDecodesToIt) {
   constexpr int kPictures = 12;
@@ -150,9 +150,8 @@ TEST_P(LiveEncoderOf, MakesMoreBytesOfMoreBitsOrBetterQuality) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Codecs, LiveEncoderOf,
-                         testing::Values(EncoderCase{Codec::kJpeg, "mjpeg", "Jpeg"},
-                                         EncoderCase{Codec::kMpeg4, "m4v", "Mpeg4"},
-                                         EncoderCase{Codec::kH264, "h264", "H264"}),
+                         testing::Values(Case{Codec::kJpeg, "mjpeg", "Jpeg"}, Case{Codec::kMpeg4, "m4v", "Mpeg4"},
+                                         Case{Codec::kH264, "h264", "H264"}),
                          [](const auto& tested) { return std::string(tested.param.name); });
 
 TEST(LiveH264, BeginsKeyPicturesWithParameterSetsAndHasNoOtherUnits) {

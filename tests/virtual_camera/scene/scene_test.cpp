@@ -9,10 +9,10 @@
 namespace vexa::camera {
 namespace {
 
-constexpr PictureSize kSceneSize{640, 360};
+constexpr PictureSize kSize{640, 360};
 
 View looking(double pan, double tilt, double angle, bool rotated = false) {
-  return {{pan, tilt, angle, ""}, kSceneSize, rotated};
+  return {{pan, tilt, angle, ""}, kSize, rotated};
 }
 
 I420Picture rendered(const View& view, const SceneMoment& moment = {}) {
@@ -75,7 +75,7 @@ TEST(Scene, ShowsTheNorthPostUnderItsBearing) {
     for (const double pan : {0.0, 20.0, 340.0, 359.9, -10.0}) {
       const View view = looking(pan, -20, 60, rotated);
       const Found post = find_colour(rendered(view), kNorthPost);
-      ASSERT_GT(post.pixels, kSceneSize.height) << pan;
+      ASSERT_GT(post.pixels, kSize.height) << pan;
       EXPECT_NEAR((post.left + post.right + 1) / 2.0, Projection(view).column(0), 1.5) << pan;
     }
   }
@@ -92,7 +92,7 @@ TEST(Scene, TicksStandAtWholeDegrees) {
   const I420Picture picture = rendered(view);
   const int above_horizon = static_cast<int>(projection.row(0)) - 2;
   std::vector<int> ticks;
-  for (int column = 0; column < kSceneSize.width; ++column) {
+  for (int column = 0; column < kSize.width; ++column) {
     if (picture.at(column, above_horizon).y == kScale.y) ticks.push_back(column);
   }
   ASSERT_EQ(ticks.size(), 40U);
@@ -145,9 +145,9 @@ TEST(Scene, RotatedIsTheUprightPictureTurnedButForTheClock) {
   const I420Picture upright = rendered(looking(7, -4, 50), moment);
   const I420Picture rotated = rendered(looking(7, -4, 50, true), moment);
   constexpr int kClockRows = 12;
-  for (int row = kClockRows; row < kSceneSize.height - kClockRows; ++row) {
-    for (int column = 0; column < kSceneSize.width; ++column) {
-      ASSERT_EQ(rotated.at(column, row), upright.at(kSceneSize.width - 1 - column, kSceneSize.height - 1 - row))
+  for (int row = kClockRows; row < kSize.height - kClockRows; ++row) {
+    for (int column = 0; column < kSize.width; ++column) {
+      ASSERT_EQ(rotated.at(column, row), upright.at(kSize.width - 1 - column, kSize.height - 1 - row))
           << column << " " << row;
     }
   }
