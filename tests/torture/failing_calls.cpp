@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The library that is loaded before all others: its functions take the place of the system's, count calls and make the
 // chosen one fail. Nothing here allocates.
 #include <dlfcn.h>
@@ -5,7 +6,9 @@
 #include <netdb.h>
 #include <poll.h>
 #include <pthread.h>
+#include <sys/epoll.h>
 #include <sys/socket.h>
+#include <sys/timerfd.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -222,8 +225,33 @@ int rename(const char* from, const char* to) { return fails(Function::kRename) ?
 
 int fsync(int fd) { return fails(Function::kSync) ? failure() : REAL(fsync)(fd); }
 
-int getaddrinfo(const char* host, const char* service, const addrinfo* hints, addrinfo** result) {
-  return fails(Function::kResolve) ? fault.error : REAL(getaddrinfo)(host, service, hints, result);
+int gethostbyname_r(const char* name, hostent* host, char* buffer, std::size_t length, hostent** result, int* error) {
+  if (!fails(Function::kResolve)) return REAL(gethostbyname_r)(name, host, buffer, length, result, error);
+  *result = nullptr;
+  *error = fault.error;
+  return EAGAIN;
+}
+
+int epoll_create1(int flags) { return fails(Function::kEpoll) ? failure() : REAL(epoll_create1)(flags); }
+
+int epoll_ctl(int set, int operation, int fd, epoll_event* event) {
+  return fails(Function::kEpollAdd) ? failure() : REAL(epoll_ctl)(set, operation, fd, event);
+}
+
+int timerfd_create(clockid_t clock, int flags) {
+  return fails(Function::kTimer) ? failure() : REAL(timerfd_create)(clock, flags);
+}
+
+int getsockname(int fd, sockaddr* address, socklen_t* length) {
+  return fails(Function::kSocketName) ? failure() : REAL(getsockname)(fd, address, length);
+}
+
+int getsockopt(int fd, int level, int option, void* value, socklen_t* length) {
+  return fails(Function::kSocketOption) ? failure() : REAL(getsockopt)(fd, level, option, value, length);
+}
+
+int pthread_mutex_init(pthread_mutex_t* mutex, const pthread_mutexattr_t* attributes) {
+  return fails(Function::kMutex) ? EAGAIN : REAL(pthread_mutex_init)(mutex, attributes);
 }
 
 }  // extern "C"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What tests/torture's two halves share: the library that is loaded before all others and makes calls fail, and the
 // program that decides which call.
 #ifndef TESTS_TORTURE_FAULT_CONTROL_H_
@@ -25,7 +26,13 @@ enum class Function : std::int32_t {
   kWrite,
   kRename,
   kSync,
-  kResolve
+  kResolve,
+  kEpoll,
+  kEpollAdd,
+  kTimer,
+  kSocketName,
+  kSocketOption,
+  kMutex
 };
 
 enum class Kind : std::int32_t { kError, kShort };
@@ -33,7 +40,7 @@ enum class Kind : std::int32_t { kError, kShort };
 struct Fault {
   Function function;
   Kind kind;
-  std::int32_t error;    ///< errno of a call that fails; EAI_* for kResolve
+  std::int32_t error;    ///< errno of a call that fails; h_errno for kResolve
   std::int32_t forever;  ///< 0: the one call, 1: it and all later ones
   std::uint64_t at;      ///< counted from 1
 };

@@ -1,17 +1,13 @@
-// Makes each fallible call of each scenario fail, the first, the second, and so on until none is left: once, and from
-// then on. After each the driver has to answer with a stated code, do its whole work again, and leave no descriptor,
-// thread or byte.
-//   torture CAMERA_PROGRAM [--scenario NAME] [--function NAME] [--one-in N --seed S]
-// Runs with libvexa_torture_calls.so loaded before all others (scripts/torture does that).
+// SPDX-License-Identifier: Apache-2.0
+// Makes each fallible call of a scenario fail, the first, the second, and so on until none is left: once, and from then
+// on. After each the driver has to answer with a stated code, do its whole work again, and leave no descriptor, thread
+// or byte. Is linked so that libvexa_torture_calls.so comes before the C library; scripts/torture runs it.
 #include <dirent.h>
-#include <dlfcn.h>
 #include <fcntl.h>
 #include <malloc.h>
 #include <netdb.h>
 #include <poll.h>
 #include <signal.h>
-#include <sys/prctl.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -20,29 +16,23 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
-#include <functional>
 #include <memory>
-#include <new>
 #include <random>
 #include <string>
 #include <string_view>
-#include <vector>
 
+#include "tests/torture/camera_process.h"
 #include "tests/torture/fault_control.h"
-#include "vexa/file_logger.h"
+#include "tests/torture/scenarios.h"
 #include "vexa/models.h"
-#include "vexa/runtime.h"
 
 namespace vexa::torture {
 namespace {
 
 using Clock = std::chrono::steady_clock;
 
-constexpr std::chrono::seconds kLongestRun{20};
-constexpr std::chrono::seconds kLongestWait{3};
-constexpr unsigned long kStillActive = 259;
-constexpr int kCameraTimeout = 1000;  // milliseconds
-constexpr const char* kCamera = "127.0.0.2";
+constexpr int kAttempts = 3;  // of what a busy machine may keep from succeeding
+constexpr std::chrono::seconds kProgressInterval{10};
 
 struct FaultRow {
   const char* name;
@@ -58,6 +48,8 @@ constexpr FaultRow kFaults[] = {
     {"connect", Function::kConnect, Kind::kError, ENETUNREACH, true},
     {"bind", Function::kBind, Kind::kError, EADDRINUSE, true},
     {"setsockopt", Function::kSetsockopt, Kind::kError, ENOBUFS, true},
+    {"getsockopt", Function::kSocketOption, Kind::kError, ENOBUFS, true},
+    {"getsockname", Function::kSocketName, Kind::kError, ENOBUFS, true},
     {"fcntl", Function::kFcntl, Kind::kError, EINVAL, true},
     {"poll", Function::kPoll, Kind::kError, ENOMEM, true},
     {"poll-interrupted", Function::kPoll, Kind::kError, EINTR, false},
@@ -71,7 +63,11 @@ constexpr FaultRow kFaults[] = {
     {"recv-empty", Function::kReceive, Kind::kError, EAGAIN, false},
     {"pipe2", Function::kPipe, Kind::kError, EMFILE, true},
     {"eventfd", Function::kEventfd, Kind::kError, EMFILE, true},
+    {"epoll_create1", Function::kEpoll, Kind::kError, EMFILE, true},
+    {"epoll_ctl", Function::kEpollAdd, Kind::kError, ENOSPC, true},
+    {"timerfd_create", Function::kTimer, Kind::kError, EMFILE, true},
     {"pthread_create", Function::kThread, Kind::kError, EAGAIN, true},
+    {"pthread_mutex_init", Function::kMutex, Kind::kError, EAGAIN, true},
     {"open", Function::kOpen, Kind::kError, EMFILE, true},
     {"read", Function::kRead, Kind::kError, EIO, true},
     {"read-short", Function::kRead, Kind::kShort, 0, false},
@@ -79,190 +75,7 @@ constexpr FaultRow kFaults[] = {
     {"write-short", Function::kWrite, Kind::kShort, 0, false},
     {"rename", Function::kRename, Kind::kError, EACCES, true},
     {"fsync", Function::kSync, Kind::kError, EIO, true},
-    {"getaddrinfo", Function::kResolve, Kind::kError, EAI_AGAIN, true},
-};
-
-// What one run of a scenario came to: the first code that is none of a success, and the first that no contract states.
-struct Outcome {
-  const char* step = nullptr;
-  long code = LIBD_OK;
-  bool unstated = false;
-};
-
-// Collects the codes of one run. Allocates nothing, as allocations may be failing.
-class Run {
- public:
-  // A success is LIBD_OK, or no frame yet.
-  void expect(const char* step, ELibDReturnCode code) {
-    if (code == LIBD_OK || outcome_.unstated) return;
-    switch (code) {
-      case LIBD_OK:
-        return;
-      case LIBD_FAILED:
-      case LIBD_STREAM_OPEN_FAILED:
-      case LIBD_TIMEOUT:
-      case LIBD_UNAUTHORIZED:
-      case LIBD_NO_FRAME:
-      case LIBD_FRAME_DAMAGED:
-      case LIBD_BUFFER_TOO_SMALL:
-        break;
-      case LIBD_NOT_SUPPORTED:
-      case LIBD_INVALID_ARGUMENT:
-      case LIBD_INVALID_MODE:
-        outcome_.unstated = true;
-        break;
-    }
-    if (outcome_.step == nullptr || outcome_.unstated) {
-      outcome_.step = step;
-      outcome_.code = code;
-    }
-  }
-
-  void expect_true(const char* step, bool success) {
-    if (!success) expect(step, LIBD_FAILED);
-  }
-
-  [[nodiscard]] const Outcome& outcome() const { return outcome_; }
-
- private:
-  Outcome outcome_;
-};
-
-struct CountingSink : CDataSink {
-  void Write(const unsigned char*, unsigned int) override { ++frames; }
-  int frames = 0;
-};
-
-// Takes frames until three have come or the stream ends.
-void take_frames(Run& run, CLibraryDevice& driver) {
-  CountingSink sink;
-  SLibDVideoFrameInfo frame;
-  frame.sink = &sink;
-  const auto deadline = Clock::now() + kLongestWait;
-  ELibDReturnCode code = LIBD_NO_FRAME;
-  while (sink.frames < 3 && Clock::now() < deadline && (code == LIBD_OK || code == LIBD_NO_FRAME)) {
-    code = driver.GetCurrentVideoFrame(frame);
-    if (code == LIBD_NO_FRAME) poll(nullptr, 0, 3);
-  }
-  run.expect("frames", sink.frames >= 3 ? LIBD_OK : code);
-}
-
-void connect(Run& run, CLibraryDevice& driver, int transport) {
-  SLibDConnectionInfo connection;
-  connection.host = kCamera;
-  connection.port = 80;
-  connection.streamTransport = transport;
-  connection.timeout = kCameraTimeout;
-  connection.userName = "admin";
-  connection.password = "admin";
-  run.expect("SetCurrentConnectionInfo", driver.SetCurrentConnectionInfo(connection));
-}
-
-void inquire(Run& run, CLibraryDevice& driver) {
-  connect(run, driver, 1);
-  SLibDSystemInfo system;
-  run.expect("GetCurrentSystemInfo", driver.GetCurrentSystemInfo(system));
-  SLibDCameraInfo camera;
-  camera.streamNumber = 1;
-  run.expect("GetCameraInfo", driver.GetCameraInfo(camera));
-  run.expect("SetCameraInfo", driver.SetCameraInfo(camera));
-  SLibDIoBoxInfo pins;
-  run.expect("GetIoBoxInfo", driver.GetIoBoxInfo(pins));
-}
-
-void set(Run& run, CLibraryDevice& driver) {
-  connect(run, driver, 1);
-  ELibDDayNightType mode{};
-  run.expect("GetDayNightMode", driver.GetDayNightMode(mode));
-  run.expect("PanTilt", driver.PanTilt(2000, 0));
-  run.expect("PanTilt stop", driver.PanTilt(0, 0));
-  run.expect("Zoom", driver.Zoom(0));
-  SLibDPresetInfo preset;
-  preset.index = 0;
-  preset.name = "gate";
-  run.expect("SetPreset", driver.SetPreset(preset));
-  std::vector<SLibDPresetInfo> presets;
-  run.expect("GetPresets", driver.GetPresets(presets));
-  run.expect("RecallPreset", driver.RecallPreset(0));
-}
-
-void stream(Run& run, CLibraryDevice& driver, int transport) {
-  connect(run, driver, transport);
-  SLibDCameraInfo camera;
-  camera.streamNumber = 1;
-  run.expect("GetCameraInfo", driver.GetCameraInfo(camera));
-  const ELibDReturnCode started = driver.StartVideoStreaming();
-  run.expect("StartVideoStreaming", started);
-  if (started == LIBD_OK) take_frames(run, driver);
-  run.expect("StopVideoStreaming", driver.StopVideoStreaming());
-}
-
-void rtp(Run& run, CLibraryDevice& driver) { stream(run, driver, 1); }
-void http(Run& run, CLibraryDevice& driver) { stream(run, driver, 0); }
-
-void polled(Run& run, CLibraryDevice& driver) {
-  connect(run, driver, 1);
-  run.expect("StartIoStreaming", driver.StartIoStreaming());
-  std::vector<SLibDPinInfo> pins;
-  const ELibDReturnCode status = driver.GetCurrentIoStatus(pins);
-  run.expect("GetCurrentIoStatus", status == LIBD_NO_FRAME ? LIBD_OK : status);
-  run.expect("StopIoStreaming", driver.StopIoStreaming());
-  run.expect("StartModRawData", driver.StartModRawData());
-  run.expect("StopModRawData", driver.StopModRawData());
-}
-
-void card(Run& run, CLibraryDevice& driver) {
-  connect(run, driver, 1);
-  SLibDEdgeStorageMode mode;
-  run.expect("GetEdgeStorageMode", driver.GetEdgeStorageMode(mode));
-  SLibDEdgeStorageRecordList list;
-  run.expect("GetEdgeStorageRecordList", driver.GetEdgeStorageRecordList(list));
-}
-
-void runtime_layer(Run& run, CLibraryDevice&) {
-  typedHandle* const event = CreateEvent(nullptr, 1, 0, nullptr);
-  run.expect_true("CreateEvent", event != nullptr);
-  if (event != nullptr) {
-    run.expect_true("SetEvent", SetEvent(event) != 0);
-    run.expect_true("WaitForSingleObject", WaitForSingleObject(event, 100) == 0);
-    CloseHandle(event);
-  }
-  typedHandle* const thread = _beginthreadex(
-      nullptr, 0, [](void*) -> unsigned { return 7; }, nullptr, 0, nullptr);
-  run.expect_true("_beginthreadex", thread != nullptr);
-  if (thread != nullptr) {
-    unsigned long code = kStillActive;
-    const auto deadline = Clock::now() + kLongestWait;
-    while (code == kStillActive && Clock::now() < deadline && GetExitCodeThread(thread, &code) != 0)
-      poll(nullptr, 0, 1);
-    run.expect_true("GetExitCodeThread", code == 7);
-    CloseHandle(thread);
-  }
-  typedHandle* const file = CreateFile("torture.tmp", GENERIC_WRITE, 0, nullptr, CREATE_ALWAYS, 0, nullptr);
-  run.expect_true("CreateFile", file != nullptr);
-  if (file != nullptr) {
-    unsigned long written = 0;
-    run.expect_true("WriteFile", WriteFile(file, "text", 4, &written, nullptr) != 0 && written == 4);
-    CloseHandle(file);
-  }
-  run.expect_true("DeleteFile", DeleteFile("torture.tmp") != 0);
-}
-
-void logger(Run& run, CLibraryDevice& driver) {
-  run.expect("SetCGILogPath", driver.SetCGILogPath("torture.log"));
-  run.expect("SetCGILogLevel", driver.SetCGILogLevel(true));
-  inquire(run, driver);
-  run.expect("SetCGILogLevel off", driver.SetCGILogLevel(false));
-}
-
-struct Scenario {
-  const char* name;
-  void (*body)(Run&, CLibraryDevice&);
-};
-
-constexpr Scenario kScenarios[] = {
-    {"inquire", inquire},       {"set", set},       {"rtp", rtp}, {"http", http}, {"polled", polled}, {"card", card},
-    {"runtime", runtime_layer}, {"logger", logger},
+    {"gethostbyname_r", Function::kResolve, Kind::kError, TRY_AGAIN, true},
 };
 
 int entries_of(const char* folder) {
@@ -281,169 +94,254 @@ struct Held {
   std::size_t bytes = mallinfo2().uordblks;
 };
 
-// Threads that have ended leave /proc a moment later.
-Held settled(int threads) {
+// Threads that have ended leave /proc a moment later, and so do those that look up names.
+Held settled(const Held& before) {
   const auto deadline = Clock::now() + std::chrono::seconds(2);
   Held held;
-  while (held.threads > threads && Clock::now() < deadline) {
+  while ((held.threads > before.threads || held.descriptors > before.descriptors) && Clock::now() < deadline) {
     poll(nullptr, 0, 2);
     held = Held();
   }
   return held;
 }
 
-class Camera {
- public:
-  explicit Camera(const char* program) {
-    int ends[2];
-    if (pipe2(ends, O_CLOEXEC) != 0) return;
-    process_ = fork();
-    if (process_ == 0) {
-      prctl(PR_SET_PDEATHSIG, SIGTERM);
-      dup2(ends[1], STDOUT_FILENO);
-      unsetenv("LD_PRELOAD");
-      execl(program, program, "--address", kCamera, "--profile", VEXA_SOURCE_DIR "/models/profiles/LMX-P200.json",
-            "--drawn", "--card", "16", static_cast<char*>(nullptr));
-      _exit(127);
-    }
-    close(ends[1]);
-    char line[256];
-    ready_ = ::read(ends[0], line, sizeof(line)) > 0;
-    close(ends[0]);
-  }
-  Camera(const Camera&) = delete;
-  Camera& operator=(const Camera&) = delete;
-  ~Camera() {
-    if (process_ <= 0) return;
-    kill(process_, SIGTERM);
-    waitpid(process_, nullptr, 0);
-  }
-  [[nodiscard]] bool ready() const { return ready_; }
-
- private:
-  pid_t process_ = -1;
-  bool ready_ = false;
-};
-
 struct Options {
   const char* camera = nullptr;
   std::string scenario, function;
   std::uint64_t one_in = 1, seed = 1;
+  std::uint64_t call = 0;  // 0: all
+  bool and_later = false;  // with `call`
+  unsigned limit = 60;     // seconds, of one fault
 };
 
-class Torture {
- public:
-  explicit Torture(const Options& options) : options_(options), choose_(options.seed) {}
+// Where findings and progress go; the library traces to standard output.
+int report_fd = STDOUT_FILENO;
 
-  bool run() {
-    if (ProfileError error; !LoadProfile(VEXA_SOURCE_DIR "/models/profiles/LMX-P200.json", profile_, error)) {
-      std::fprintf(stderr, "torture: %s\n", error.Message().c_str());
-      return false;
-    }
-    for (const Scenario& scenario : kScenarios) {
-      if (!options_.scenario.empty() && options_.scenario != scenario.name) continue;
-      for (const FaultRow& row : kFaults) {
-        if (options_.function.empty() || options_.function == row.name) try_row(scenario, row);
+// What is under way, for the handler of signals.
+char under_way[160];
+
+void write_text(const char* text) { [[maybe_unused]] const ssize_t written = write(report_fd, text, strlen(text)); }
+
+void ended_by(int number) {
+  write_text("FOUND ");
+  write_text(under_way);
+  write_text(number == SIGALRM ? ": hangs\n" : ": ends the process\n");
+  _exit(1);
+}
+
+// Runs one scenario under one kind of fault.
+class Row {
+ public:
+  Row(const Scenario& scenario, const FaultRow& fault, const Profile& profile, const Options& options)
+      : scenario_(scenario), fault_(fault), profile_(profile), options_(options) {}
+
+  // False when the scenario fails without a fault.
+  bool run(std::mt19937_64& choose) {
+    if (!runs_without_fault()) return false;
+    began_ = reported_ = Clock::now();
+    for (int lasting = 0; lasting <= (fault_.lasts ? 1 : 0); ++lasting) {
+      for (std::uint64_t at = 1; at <= std::max(calls_, options_.call); ++at) {
+        if (options_.call != 0 && (at != options_.call || options_.and_later != (lasting != 0))) continue;
+        if (options_.call == 0 && choose() % options_.one_in != 0) continue;
+        try_fault(at, lasting);
+        report_progress(at, lasting);
       }
     }
-    std::printf("%llu faults, %d findings\n", static_cast<unsigned long long>(faults_), findings_);
-    return findings_ == 0 && faults_ > 0;
+    if (calls_ != 0) {
+      dprintf(report_fd, "%-30s %5llu calls, %5llu faults, %d found, %.1f s\n", name().c_str(), as_long(calls_),
+              as_long(faults_), findings_, seconds_since(began_));
+    }
+    return true;
   }
 
+  [[nodiscard]] std::uint64_t faults() const { return faults_; }
+  [[nodiscard]] int findings() const { return findings_; }
+
  private:
-  // Runs the scenario and destroys its driver under the fault; the calls counted.
-  std::uint64_t run_faulted(const Scenario& scenario, const Fault& fault, Outcome& outcome) {
+  static unsigned long long as_long(std::uint64_t number) { return number; }
+  static double seconds_since(Clock::time_point then) {
+    return std::chrono::duration<double>(Clock::now() - then).count();
+  }
+
+  [[nodiscard]] std::string name() const { return std::string(scenario_.name) + "." + fault_.name; }
+  [[nodiscard]] Fault fault(std::uint64_t at, int lasting) const {
+    return {fault_.function, fault_.kind, fault_.error, lasting, at};
+  }
+
+  // Counts the calls of a run that goes well.
+  bool runs_without_fault() {
+    std::snprintf(under_way, sizeof(under_way), "%s without a fault", name().c_str());
+    Outcome outcome;
+    for (int attempt = 0; attempt < kAttempts; ++attempt) {
+      if (run_once(fault(0, 0), outcome); outcome.step == nullptr) return true;
+    }
+    report("fails", outcome);
+    return false;
+  }
+
+  // Runs the scenario and destroys its driver under the fault.
+  void run_once(const Fault& fault, Outcome& outcome) {
     Run run;
     auto driver = MakeDevice(profile_);
+    alarm(options_.limit);
     vexa_torture_arm(&fault);
-    scenario.body(run, *driver);
+    scenario_.body(run, *driver);
     const std::uint64_t calls = vexa_torture_disarm();
+    if (fault.at == 0) calls_ = calls;
     outcome = run.outcome();
-    // The driver is usable again.
-    Run again;
-    driver->StopVideoStreaming();
-    scenario.body(again, *driver);
-    if (again.outcome().step != nullptr) {
-      std::string text;
-      driver->GetLatestErrorText(text);
-      report("is not usable again", again.outcome());
-      std::printf("      %s\n", text.c_str());
-    }
-    // And ends while the fault lasts.
+    if (fault.at != 0) use_again(*driver);
     vexa_torture_arm(&fault);
     driver.reset();
     vexa_torture_disarm();
-    return calls;
+    alarm(0);
   }
 
-  void try_row(const Scenario& scenario, const FaultRow& row) {
-    name_ = std::string(scenario.name) + "." + row.name;
+  void use_again(CLibraryDevice& driver) {
     Outcome outcome;
-    const std::uint64_t calls = run_faulted(scenario, {row.function, row.kind, row.error, 0, 0}, outcome);
-    if (outcome.step != nullptr) {
-      at_ = 0;
-      report("fails without a fault", outcome);
-      return;
+    for (int attempt = 0; attempt < kAttempts; ++attempt) {
+      Run again;
+      driver.StopVideoStreaming();
+      scenario_.body(again, driver);
+      outcome = again.outcome();
+      if (outcome.step == nullptr) return;
     }
-    for (int forever = 0; forever <= (row.lasts ? 1 : 0); ++forever) {
-      for (at_ = 1; at_ <= calls; ++at_) {
-        if (options_.one_in > 1 && choose_() % options_.one_in != 0) continue;
-        forever_ = forever;
-        try_fault(scenario, {row.function, row.kind, row.error, forever, at_});
-      }
-    }
-    std::printf("%-28s %5llu calls\n", name_.c_str(), static_cast<unsigned long long>(calls));
-    std::fflush(stdout);
+    std::string text;
+    driver.GetLatestErrorText(text);
+    report("is not usable again", outcome);
+    dprintf(report_fd, "      %s\n", text.c_str());
   }
 
-  void try_fault(const Scenario& scenario, const Fault& fault) {
-    const Held before = settled(0);
-    const auto began = Clock::now();
+  void try_fault(std::uint64_t at, int lasting) {
+    std::snprintf(under_way, sizeof(under_way), "%s: --scenario %s --function %s --call %llu%s", name().c_str(),
+                  scenario_.name, fault_.name, as_long(at), lasting != 0 ? "+" : "");
+    const Held before;
     Outcome outcome;
     ++faults_;
-    run_faulted(scenario, fault, outcome);
+    run_once(fault(at, lasting), outcome);
     if (outcome.unstated) report("answers with a code that is not stated", outcome);
-    if (Clock::now() - began > kLongestRun) report("takes too long", outcome);
-    const Held after = settled(before.threads);
-    if (after.descriptors != before.descriptors) note("descriptors", after.descriptors - before.descriptors);
-    if (after.threads != before.threads) note("threads", after.threads - before.threads);
-    // The C library keeps what it has made once, hence only the second time counts.
-    if (after.bytes > before.bytes) {
-      run_faulted(scenario, fault, outcome);
-      const Held second = settled(before.threads);
-      if (second.bytes > after.bytes) note("bytes", static_cast<long>(second.bytes - after.bytes));
+    const Held after = settled(before);
+    if (after.descriptors > before.descriptors) note_left(after.descriptors - before.descriptors, "descriptors");
+    if (after.threads > before.threads) note_left(after.threads - before.threads, "threads");
+    if (after.bytes > before.bytes) compare_bytes(fault(at, lasting), after);
+  }
+
+  // The C library and the scenario keep what they have made once: only what grows with each run counts.
+  void compare_bytes(const Fault& fault, Held held) {
+    std::size_t grown = 0;
+    for (int attempt = 0; attempt < kAttempts; ++attempt) {
+      Outcome outcome;
+      run_once(fault, outcome);
+      const Held now = settled(held);
+      if (now.bytes <= held.bytes) return;
+      grown = now.bytes - held.bytes;
+      held = now;
     }
+    note_left(static_cast<long>(grown), "bytes");
   }
 
   void report(const char* what, const Outcome& outcome) {
     ++findings_;
-    std::printf("FOUND %s call %llu%s: %s (%s: %ld)\n", name_.c_str(), static_cast<unsigned long long>(at_),
-                forever_ != 0 ? " and all later ones" : "", what, outcome.step == nullptr ? "-" : outcome.step,
-                outcome.code);
+    dprintf(report_fd, "FOUND %s: %s (%s: code %ld)\n", under_way, what, outcome.step == nullptr ? "-" : outcome.step,
+            outcome.code);
   }
 
-  void note(const char* what, long number) {
+  void note_left(long number, const char* what) {
     ++findings_;
-    std::printf("FOUND %s call %llu%s: leaves %ld %s\n", name_.c_str(), static_cast<unsigned long long>(at_),
-                forever_ != 0 ? " and all later ones" : "", number, what);
+    dprintf(report_fd, "FOUND %s: leaves %ld %s\n", under_way, number, what);
   }
 
-  Options options_;
-  std::mt19937_64 choose_;
-  Profile profile_;
-  std::string name_;
-  std::uint64_t at_ = 0, faults_ = 0;
-  int forever_ = 0, findings_ = 0;
+  void report_progress(std::uint64_t at, int lasting) {
+    if (Clock::now() - reported_ < kProgressInterval) return;
+    reported_ = Clock::now();
+    dprintf(report_fd, "%-30s at call %llu%s of %llu\n", name().c_str(), as_long(at), lasting != 0 ? "+" : "",
+            as_long(calls_));
+  }
+
+  const Scenario& scenario_;
+  const FaultRow& fault_;
+  const Profile& profile_;
+  const Options& options_;
+  std::uint64_t calls_ = 0, faults_ = 0;
+  int findings_ = 0;
+  Clock::time_point began_, reported_;
 };
 
+const Scenario* find(const std::vector<Scenario>& scenarios, const std::string& name) {
+  const auto found =
+      std::find_if(scenarios.begin(), scenarios.end(), [&](const Scenario& s) { return s.name == name; });
+  return found == scenarios.end() ? nullptr : &*found;
+}
+
+// 0: nothing was found, 1: something was.
+int run_scenario(const Scenario& scenario, const Options& options) {
+  Profile profile;
+  if (ProfileError error; !LoadProfile(VEXA_SOURCE_DIR "/models/profiles/LMX-P200.json", profile, error)) {
+    std::fprintf(stderr, "torture: %s\n", error.Message().c_str());
+    return 2;
+  }
+  std::mt19937_64 choose(options.seed);
+  std::uint64_t faults = 0;
+  int findings = 0;
+  for (const FaultRow& fault : kFaults) {
+    if (!options.function.empty() && options.function != fault.name) continue;
+    Row row(scenario, fault, profile, options);
+    const bool tried = row.run(choose);
+    faults += row.faults();
+    findings += row.findings();
+    if (!tried) break;
+  }
+  dprintf(report_fd, "%s: %llu faults, %d findings\n", scenario.name, static_cast<unsigned long long>(faults),
+          findings);
+  return findings == 0 && faults > 0 ? 0 : 1;
+}
+
 int usage() {
-  std::fputs("usage: torture CAMERA_PROGRAM [--scenario NAME] [--function NAME] [--one-in N] [--seed S]\nscenarios:",
-             stderr);
-  for (const Scenario& scenario : kScenarios) std::fprintf(stderr, " %s", scenario.name);
-  std::fputs("\nfunctions:", stderr);
+  std::fputs(
+      "usage: torture --list | --scenario NAME [--camera PROGRAM] [--function NAME] [--call N | --call N+]\n"
+      "               [--one-in N] [--seed S] [--limit SECONDS]\n"
+      "functions:",
+      stderr);
   for (const FaultRow& row : kFaults) std::fprintf(stderr, " %s", row.name);
   std::fputs("\n", stderr);
   return 2;
+}
+
+bool read_options(int argc, char** argv, Options& options) {
+  for (int i = 1; i < argc; i += 2) {
+    if (i + 1 == argc) return false;
+    const std::string_view name = argv[i];
+    const char* const value = argv[i + 1];
+    if (name == "--camera") {
+      options.camera = value;
+    } else if (name == "--scenario") {
+      options.scenario = value;
+    } else if (name == "--function") {
+      options.function = value;
+    } else if (name == "--call") {
+      options.call = std::strtoull(value, nullptr, 10);
+      options.and_later = std::strchr(value, '+') != nullptr;
+    } else if (name == "--one-in") {
+      options.one_in = std::max(1ULL, std::strtoull(value, nullptr, 10));
+    } else if (name == "--seed") {
+      options.seed = std::strtoull(value, nullptr, 10);
+    } else if (name == "--limit") {
+      options.limit = static_cast<unsigned>(std::strtoul(value, nullptr, 10));
+    } else {
+      return false;
+    }
+  }
+  return true;
+}
+
+// Of one call that is tried alone, the library's own output is shown.
+void quieten(const Options& options) {
+  report_fd = dup(STDOUT_FILENO);
+  const int nowhere = open("/dev/null", O_WRONLY | O_CLOEXEC);
+  if (options.call == 0) {
+    dup2(nowhere, STDOUT_FILENO);
+    dup2(nowhere, STDERR_FILENO);
+  }
+  close(nowhere);
 }
 
 }  // namespace
@@ -451,28 +349,25 @@ int usage() {
 
 int main(int argc, char** argv) {
   using namespace vexa::torture;
-  Options options;
-  if (argc < 2 || argc % 2 != 0) return usage();
-  options.camera = argv[1];
-  for (int i = 2; i + 1 < argc; i += 2) {
-    const std::string_view name = argv[i];
-    if (name == "--scenario") {
-      options.scenario = argv[i + 1];
-    } else if (name == "--function") {
-      options.function = argv[i + 1];
-    } else if (name == "--one-in") {
-      options.one_in = std::max(1ULL, std::strtoull(argv[i + 1], nullptr, 10));
-    } else if (name == "--seed") {
-      options.seed = std::strtoull(argv[i + 1], nullptr, 10);
-    } else {
-      return usage();
-    }
+  if (argc == 2 && std::string_view(argv[1]) == "--list") {
+    for (const Scenario& scenario : usual_scenarios()) std::puts(scenario.name);
+    return 0;
   }
-  signal(SIGPIPE, SIG_DFL);  // a host that does not ignore it must live too
-  const Camera camera(options.camera);
+  Options options;
+  if (!read_options(argc, argv, options)) return usage();
+
+  for (const int number : {SIGABRT, SIGSEGV, SIGBUS, SIGFPE, SIGILL, SIGPIPE, SIGALRM}) signal(number, ended_by);
+  if (const Scenario* const planted = find(planted_scenarios(), options.scenario)) {
+    quieten(options);
+    return run_scenario(*planted, options);
+  }
+  const Scenario* const scenario = find(usual_scenarios(), options.scenario);
+  if (scenario == nullptr || options.camera == nullptr) return usage();
+  const CameraProcess camera(options.camera, options.scenario == "playback");
   if (!camera.ready()) {
-    std::fprintf(stderr, "torture: %s did not start\n", options.camera);
+    std::fprintf(stderr, "torture: %s did not start as it should\n", options.camera);
     return 2;
   }
-  return Torture(options).run() ? 0 : 1;
+  quieten(options);
+  return run_scenario(*scenario, options);
 }
