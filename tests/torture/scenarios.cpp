@@ -166,7 +166,43 @@ SLibDShadowTourInfo& shadow_tours() {
   return info;
 }
 
+SLibDEdgeStorageMode& recording_mode() {
+  static SLibDEdgeStorageMode mode{true, 1, 0, 0, "10.0.0.1"};
+  return mode;
+}
+
+SLibDDetectionParam& detection() {
+  static SLibDDetectionParam setting = [] {
+    SLibDDetectionParam whole;
+    whole.number = 1;
+    for (SLibDDetectionWindow& window : whole.windows) {
+      window.area = {{0, 0}, {320, 192}};
+      window.enabled = 1;
+      window.mode = 0;
+      window.minObjectWidth = window.minObjectHeight = 10;
+      window.maxObjectWidth = window.maxObjectHeight = 100;
+      window.sensitivity = 50;
+    }
+    return whole;
+  }();
+  return setting;
+}
+
+SLibDPinInfo& output() {
+  static SLibDPinInfo pin{1, PIN_TYPE_SENSOR_INPUT, true, 1, 0, false};
+  return pin;
+}
+
 constexpr Operation kSettings[] = {
+    {"SetVideoStandard", [](D& driver) { return driver.SetVideoStandard(LIBD_VIDEO_NTSC); }},
+    {"SetSolidPTZState", [](D& driver) { return driver.SetSolidPTZState(true); }},
+    {"SetImageMaxSize", [](D& driver) { return driver.SetImageMaxSize(1280, 720, LIBD_VIDEO_NTSC); }},
+    {"SetVMDtype", [](D& driver) { return driver.SetVMDtype(LIBD_VMD_WINDOW); }},
+    {"SetOutput", [](D& driver) { return driver.SetOutput(output()); }},
+    {"SetDetectionParam", [](D& driver) { return driver.SetDetectionParam(detection()); }},
+    {"SetEdgeStorageMode", [](D& driver) { return driver.SetEdgeStorageMode(recording_mode()); }},
+    {"SetEdgeStorageNoTearDown", [](D& driver) { return driver.SetEdgeStorageNoTearDown(false); }},
+    {"DeleteAllEdgeStorageRecord", plain<&D::DeleteAllEdgeStorageRecord>},
     {"SetCameraInfo", with<SLibDCameraInfo, &D::SetCameraInfo>},
     {"SetAudioInfo", with<SLibDAudioInfo, &D::SetAudioInfo>},
     {"SetPTZControlInfo", with<SLibDPTZControlInfo, &D::SetPTZControlInfo>},
@@ -193,6 +229,17 @@ void set(Run& run, CLibraryDevice& driver) {
   run_all(run, driver, kSettings);
 }
 
+SLibDPTZControlInfo& by_shutter() {
+  static SLibDPTZControlInfo control = [] {
+    SLibDPTZControlInfo shutter;
+    shutter.brightMode = "Shutter Priority";
+    return shutter;
+  }();
+  return control;
+}
+
+const SLibDResolutionInfo kPicture{"1280x720", 1280, 720};
+
 constexpr Operation kMoves[] = {
     {"PanTilt", [](D& driver) { return driver.PanTilt(2000, 0); }},
     {"PanTilt to a stop", [](D& driver) { return driver.PanTilt(0, 0); }},
@@ -200,6 +247,21 @@ constexpr Operation kMoves[] = {
     {"Zoom", [](D& driver) { return driver.Zoom(0); }},
     {"ZoomAbsolute", [](D& driver) { return driver.ZoomAbsolute(100); }},
     {"Focus", [](D& driver) { return driver.Focus(0); }},
+    {"PanTiltDirect", [](D& driver) { return driver.PanTiltDirect(5000, 5000, kPicture); }},
+    {"ZoomRelative", [](D& driver) { return driver.ZoomRelative(10); }},
+    {"ZoomArea", [](D& driver) { return driver.ZoomArea(5000, 5000, 1000, 1000, kPicture); }},
+    {"FocusAbsolute", [](D& driver) { return driver.FocusAbsolute(100); }},
+    {"SetBrightMode", [](D& driver) { return driver.SetBrightMode(by_shutter().brightMode); }},
+    {"Bright",
+     [](D& driver) {
+       const ELibDReturnCode stored = driver.SetPTZControlInfo(by_shutter());
+       return stored == LIBD_OK ? driver.Bright(1) : stored;
+     }},
+    {"BrightAbsolute",
+     [](D& driver) {
+       const ELibDReturnCode stored = driver.SetPTZControlInfo(by_shutter());
+       return stored == LIBD_OK ? driver.BrightAbsolute(5000) : stored;
+     }},
     {"SetPreset", [](D& driver) { return driver.SetPreset(preset()); }},
     {"RecallPreset", [](D& driver) { return driver.RecallPreset(0); }},
     {"ClearPreset", [](D& driver) { return driver.ClearPreset(0); }},
@@ -207,6 +269,8 @@ constexpr Operation kMoves[] = {
     {"StopRecordShadowTour", plain<&D::StopRecordShadowTour>},
     {"StartShadowTour", [](D& driver) { return driver.StartShadowTour(1); }},
     {"StopShadowTour", plain<&D::StopShadowTour>},
+    {"StartPreviewShadowTour", [](D& driver) { return driver.StartPreviewShadowTour(1); }},
+    {"StopPreviewShadowTour", plain<&D::StopPreviewShadowTour>},
 };
 
 void move(Run& run, CLibraryDevice& driver) {
