@@ -7,7 +7,7 @@
 #include <pthread.h>
 
 #include <atomic>
-#include <climits>
+#include <chrono>
 #include <csignal>
 #include <cstdint>
 #include <cstring>
@@ -18,7 +18,8 @@ namespace vexa {
 namespace {
 
 constexpr std::size_t kStackSize = std::size_t{512} * 1024;
-constexpr int kPlacePause = 20;  // milliseconds between two tries for a place
+constexpr int kPlacePause = 20;    // milliseconds between two tries for a place
+constexpr int kLookInterval = 50;  // milliseconds, at a lookup whose end could not be signalled
 
 std::atomic<int> running{0};
 
@@ -27,7 +28,8 @@ struct Lookup {
 
   const std::string host;
   const int port;
-  ResolvedHost found;  // the thread's until `done` is raised
+  ResolvedHost found;  // the thread's until it has ended
+  std::atomic<bool> ended{false};
   CancelSignal done;
 };
 
@@ -36,6 +38,7 @@ using Shared = std::shared_ptr<Lookup>;
 void* run_lookup(void* argument) {
   const std::unique_ptr<Shared> lookup(static_cast<Shared*>(argument));
   (*lookup)->found = look_up((*lookup)->host, (*lookup)->port);
+  (*lookup)->ended = true;
   (*lookup)->done.raise();
   --running;
   return nullptr;
@@ -64,6 +67,18 @@ bool begin_thread(pthread_t& thread, Shared* lookup) {
   pthread_sigmask(SIG_SETMASK, &before, nullptr);
   pthread_attr_destroy(&attributes);
   return begun;
+}
+
+/// False when the wait is cancelled.
+bool wait_for_end(const Lookup& lookup, Cancels cancels) {
+  for (;;) {
+    const auto begun = std::chrono::steady_clock::now();
+    if (WaitBudget({kLookInterval, cancels}).wait_readable(lookup.done.descriptor()) != 0) return lookup.ended;
+    // Safe: a system that refuses the write of the signal does not keep the caller waiting for ever.
+    if (lookup.ended) return true;
+    // A wait that is cancelled ends early: this one or, at once, the next.
+    if (std::chrono::steady_clock::now() - begun < std::chrono::milliseconds(kLookInterval / 2)) return false;
+  }
 }
 
 /// Safe: a thread that nobody joins still has this library's code to run when the host unloads the library; so it stays
@@ -103,7 +118,7 @@ ResolvedHost look_up_beside(const std::string& host, int port, Cancels cancels) 
     return look_up(host, port);
   }
   static_cast<void>(for_thread.release());  // the thread's
-  if (WaitBudget({INT_MAX, cancels}).wait_readable(lookup->done.descriptor()) == 1) {
+  if (wait_for_end(*lookup, cancels)) {
     pthread_join(thread, nullptr);
     return lookup->found;
   }

@@ -113,6 +113,20 @@ TEST_F(RtpFrames, AnAggregationPacketAbandonsItsPictureAndAKeyPictureMustFollow)
   EXPECT_TRUE(driver_.m_RtpPackets.empty());
 }
 
+TEST_F(RtpFrames, AReportOnTheMediaPortDoesNotEndTheStream) {
+  send_picture(kKey);
+  EXPECT_EQ(read(), LIBD_OK);
+  const Payload report = {0x80, 200, 0, 6, 0, 0, 0, 1, 0xe9, 0, 0, 1, 0, 0, 0, 0, 0, 1, 2, 3, 0, 0, 0, 9, 0, 0, 1, 0};
+  EXPECT_EQ(send(camera_, report.data(), report.size(), 0), static_cast<ssize_t>(report.size()));
+  ELibDReturnCode code = LIBD_FAILED;
+  for (int picture = 0; picture < 5 && code != LIBD_OK; ++picture) {
+    send_picture(kKey);
+    code = read();
+  }
+  EXPECT_EQ(code, LIBD_OK);
+  EXPECT_EQ(frame_.frameType, VIDEO_FRAME_H264_KEY);
+}
+
 TEST_F(RtpFrames, ThePositionIsTakenFromEachSingleUnitOfType6) {
   Payload sei = {0x06, 5, 40};
   for (const char c : std::string("CamPos: 1/2/3")) sei.push_back(static_cast<unsigned char>(c));

@@ -4,6 +4,7 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <climits>
 #include <cstring>
 #include <thread>
@@ -99,6 +100,17 @@ TEST_F(HttpHeaderRecv, LooksAgainEveryTenMilliseconds) {
   say("HTTP/1.0 200 OK\r\n");
   std::thread camera([this] { say("\r\n"); });
   EXPECT_EQ(driver_.http_header_recv(socket_, buffer_, 1023, 20000), 19);
+  camera.join();
+}
+
+TEST_F(HttpHeaderRecv, EndsATrickleWithItsTimeOut) {
+  std::atomic<bool> ended{false};
+  std::thread camera([&] {
+    while (!ended && send(camera_, "x", 1, MSG_NOSIGNAL) == 1) std::this_thread::yield();
+  });
+  EXPECT_EQ(driver_.http_header_recv(socket_, buffer_, 1023, 50), 0);
+  ended = true;
+  shutdown(camera_, SHUT_RDWR);
   camera.join();
 }
 

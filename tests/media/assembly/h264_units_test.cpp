@@ -95,6 +95,14 @@ TEST(H264Units, OtherPacketKindsAreNotOffered) {
   }
 }
 
+TEST(H264Units, TheLengthsInAnAggregationPacketAreNotRead) {
+  for (const Payload& packet : {Payload{0x78}, Payload{0x78, 0}, Payload{0x78, 0, 0}, Payload{0x78, 0xff, 0xff, 0x65},
+                                Payload{0x78, 0, 2, 0x65, 1, 0xff, 0xff}}) {
+    Payload frame(100);
+    EXPECT_EQ(assemble_h264(Packets(std::vector<Payload>{packet}), frame).outcome, Assembly::kUnsupported);
+  }
+}
+
 TEST(H264Units, AFragmentCutBeforeItsHeaderIsNotTaken) {
   Payload frame(100);
   EXPECT_EQ(assemble_h264(Packets(std::vector<Payload>{{0x7c}}), frame).outcome, Assembly::kUnsupported);
