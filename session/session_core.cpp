@@ -190,9 +190,15 @@ int SessionCore::turn(Moment now) {
   take_results(now);
   watch_silence(now);
   if (close_due_ && !job_ && !side_job_) begin_close();
-  if (!job_ && !close_due_ && machine_.is_due(now)) begin_attempt(now);
+  if (!job_ && !close_due_ && (machine_.is_due(now) || waits_for_turn())) begin_attempt(now);
   if (lost_ != 0 && running_ && !close_due_ && !side_job_ && now >= side_due_) begin_side(now);
   return publish();
+}
+
+// Its turn comes at no time that could be planned: each wake-up may be it.
+bool SessionCore::waits_for_turn() const {
+  const SessionStatus& latest = machine_.status();
+  return latest.state == SessionState::kWaiting && latest.cause == SessionCause::kTurn && !machine_.is_stopping();
 }
 
 void SessionCore::obey(Moment now) {

@@ -72,6 +72,7 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   void take_results(Moment now);
   void after_open(const Opened& opened, Moment now);
   void begin_attempt(Moment now);
+  [[nodiscard]] bool waits_for_turn() const;
   void begin_close();
   void begin_side(Moment now);
   void watch_silence(Moment now);

@@ -259,8 +259,8 @@ TEST_F(SessionWithCamera, AttemptsAtOnceAreBounded) {
   start_camera();
   SessionGroupOptions narrow;
   narrow.attempts = 2;
-  SessionGroup group(narrow);
   SessionHost hosts[8];
+  SessionGroup group(narrow);
   for (SessionHost& host : hosts) ASSERT_TRUE(group.Open(options(), host.callbacks()));
   for (SessionHost& host : hosts) ASSERT_TRUE(host.wait_for_live());
   EXPECT_LE(group.Metrics().mostAttemptsAtOnce, 2U);
