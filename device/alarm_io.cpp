@@ -165,7 +165,7 @@ ELibDReturnCode DriverState::open_alarms() {
     const RaisedTimeout slow = connection.raised(kAlarmRequestTimeout);
     return alarms.start([&] { return camera.open("/command/alarmdata.cgi?interval=1"); }, now, patience);
   });
-  if (opened == LIBD_OK) return LIBD_OK;
+  if (opened == LIBD_OK || limit().cancels.raised()) return opened;
   const Guard guard(driver.m_ConnectionLock);
   // Kept: a camera that takes no alarm stream is asked with this time-out until the connection is set anew.
   driver.m_ConnectionInfo.timeout = kFailedStreamTimeout;

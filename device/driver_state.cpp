@@ -4,6 +4,7 @@
 #include <chrono>
 
 #include "media/frame_chronicle.h"
+#include "transport/socket.h"
 #include "vexa/runtime.h"
 
 namespace vexa {
@@ -87,6 +88,12 @@ int DriverState::stream_socket() {
 void DriverState::set_stream_socket(int socket) {
   const Guard guard(driver.m_VideoStateLock);
   driver.m_StreamSocket = socket;
+}
+
+void DriverState::close_media() {
+  shutdown_and_close(stream_socket());
+  set_stream_socket(-1);
+  chronicle->end_stream();
 }
 
 StoppableSocket DriverState::stream_source() {

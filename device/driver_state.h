@@ -107,6 +107,8 @@ struct DriverState {
   /// The media socket together with the event of a stop.
   StoppableSocket stream_source();
   void set_stream_socket(int socket);
+  /// Closes the media socket, and the control socket beside it.
+  void close_media();
 
   // The RTSP session; the starter's, then the streaming thread's, then the stopper's: device/rtsp_session.cpp
   RtspSession session();
@@ -120,8 +122,9 @@ struct DriverState {
   void count_interleaved(const InterleavedPacket& packet, const char* payload);
   /// Sends a keep-alive when one is due and none is awaited.
   void begin_keep_alive();
-  /// Takes the answer of a keep-alive if it has come or is too late. Waits for nothing.
-  void look_for_keep_alive();
+  /// Takes the answer of a keep-alive if it has come or is too late. Waits for nothing. True when any of it had come,
+  /// or it is given up.
+  bool look_for_keep_alive();
   /// Waits for the answer of a keep-alive that is awaited.
   void finish_keep_alive();
 
@@ -180,7 +183,7 @@ struct DriverState {
   QueuedFacts leave_front() VEXA_REQUIRES(driver.m_FrameQueueLock);
   void free_frame(CVexaCommon::VideoFrameInfo& frame) VEXA_REQUIRES(driver.m_FrameQueueLock);
   void clear_frame_queue();
-  /// Ends each step that changes the queue or the report of a silence.
+  /// Ends each step that changes the queue or the report of a silence: hosts see the counts, and what is ready.
   void note_video() VEXA_REQUIRES(driver.m_FrameQueueLock);
 
   // Settings and the cached inquiry; any thread: device/video_settings.cpp, device/image_controls.cpp

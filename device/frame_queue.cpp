@@ -121,12 +121,10 @@ void DriverState::append_frame(CVexaCommon::VideoFrameInfo& frame, bool& wait_ke
   (queued_facts.empty() ? known : queued_facts.front()).add(lost);
   if (decision.append && enqueue(frame, known)) {
     frame.data = nullptr;  // the queue's from here on
-    published_queue.publish(queue);
     return;
   }
   if (!is_notice) ++(decision.append ? queue.dropped_no_memory : queue.dropped_without_key);
   lost_before_next = known.as_lost();
-  published_queue.publish(queue);
   free_frame(frame);
   if (!decision.append) return;
   // Out of memory, which counts as a time-out; no picture is shown that may refer to the lost one.
@@ -150,12 +148,14 @@ ELibDReturnCode DriverState::take_oldest_frame(SLibDVideoFrameInfo& frame, Frame
   const QueuedFacts known = leave_front();
   facts = known.facts;
   if (!known.is_notice) ++queue.handed_out;
-  published_queue.publish(queue);
   note_video();
   return LIBD_OK;
 }
 
-void DriverState::note_video() { readiness.set_video(!driver.m_FrameQueue.empty() || driver.m_VideoTimedOut); }
+void DriverState::note_video() {
+  published_queue.publish(queue);
+  readiness.set_video(!driver.m_FrameQueue.empty() || driver.m_VideoTimedOut);
+}
 
 void DriverState::free_frame(CVexaCommon::VideoFrameInfo& frame) {
   spare_frames.give_back(frame.data, frame.capacity, frame.length);
@@ -169,7 +169,6 @@ void DriverState::clear_frame_queue() {
   }
   queued_facts.clear();
   lost_before_next = {};
-  published_queue.publish(queue);
   spare_frames.clear();
   delete[] std::exchange(driver.m_StagingBuffer, nullptr);
   driver.m_StagingBufferSize = 0;

@@ -132,7 +132,9 @@ ELibDReturnCode DriverState::begin_rtp_frame(CVexaCommon::VideoFrameInfo& frame,
 }
 
 void DriverState::begin_frame() {
-  if (std::exchange(ready_frame, {}).data != nullptr) ledger.frame_taken();
+  if (ready_frame.data == nullptr) return;
+  ready_frame.data = nullptr;
+  ledger.frame_taken();
 }
 
 void DriverState::frame_is_ready(const CVexaCommon::VideoFrameInfo& frame, const Codec& codec,

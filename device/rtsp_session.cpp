@@ -50,14 +50,11 @@ Result<int> DriverState::open_rtp_over_udp(const std::string& url, int port) {
   if (!media_port) return media_port;
   // Without the port beside it there are no sender reports, and the stream goes on as well.
   Socket control = bind_control_socket(*media_port);
-  ledger.control_port(control.valid() ? *media_port + 1 : 0);
-  chronicle->begin_stream(std::move(control), server->address.sin_addr.s_addr);
   const int scale = driver.m_EdgeStoragePlayback ? driver.m_PlaybackScale : 1;
   const auto number = session.open(*server, {info, url, scale, *media_port, stream_clock(), waits.cancels});
-  if (!number) {
-    chronicle->end_stream();
-    return count_rtsp(session.requests(), number.failure());
-  }
+  if (!number) return count_rtsp(session.requests(), number.failure());
+  ledger.control_port(control.valid() ? *media_port + 1 : 0);
+  chronicle->begin_stream(std::move(control), server->address.sin_addr.s_addr);
   exchanges.rtsp(session.requests(), nullptr);
   keep_alive.reset();
   // Kept: the time of the last keep-alive is not reset; a new session's first one waits for the rest of the interval.
@@ -131,8 +128,9 @@ void DriverState::begin_keep_alive() {
   });
 }
 
-void DriverState::look_for_keep_alive() {
-  if (!keep_alive) return;
+bool DriverState::look_for_keep_alive() {
+  if (!keep_alive) return false;
+  const bool begun = keep_alive->begun;
   errors.run([&]() -> Outcome {
     const auto outcome = session().keep_alive_outcome(driver.m_RtspSocket, *keep_alive);
     if (!outcome) return LIBD_OK;
@@ -141,6 +139,7 @@ void DriverState::look_for_keep_alive() {
     if (!*outcome) return outcome->failure();
     return LIBD_OK;
   });
+  return !keep_alive || keep_alive->begun != begun;
 }
 
 void DriverState::finish_keep_alive() {
@@ -233,9 +232,7 @@ void CVexaCommon::rtp_over_tcp_close(int socket) { vexa::shutdown_and_close(sock
 void CVexaCommon::rtp_stream_socket_close_all() {
   m_State->keep_alive.reset();
   vexa::shutdown_and_close(std::exchange(m_RtspSocket, -1));
-  vexa::shutdown_and_close(m_State->stream_socket());
-  m_State->set_stream_socket(-1);
-  m_State->chronicle->end_stream();
+  m_State->close_media();
 }
 
 unsigned char* CVexaCommon::base64Decode(const char* text, unsigned int& size, bool trim) {
@@ -251,7 +248,7 @@ int CVexaCommon::rtp_over_tcp_recvn(int socket, char* buffer, int length, int ti
   vexa::Operation operation(*m_State, __func__);
   m_State->errors.clear();
   return m_State->errors.run([&]() -> vexa::Result<int> {
-    const auto read = vexa::receive_exactly(socket, vexa::room_of(buffer, length), m_State->limit(timeout));
+    const auto read = vexa::receive_exactly(socket, vexa::room_of(buffer, length), timeout);
     if (!read) return read.failure();
     return 0;
   });
@@ -262,7 +259,7 @@ int CVexaCommon::rtp_over_tcp_payload_recv(int socket, char* buffer, int size, b
   vexa::Operation operation(*m_State, __func__);
   m_State->errors.clear();
   return m_State->errors.run([&]() -> vexa::Result<int> {
-    const auto packet = vexa::receive_interleaved(socket, vexa::room_of(buffer, size), m_State->limit(timeout));
+    const auto packet = vexa::receive_interleaved(socket, vexa::room_of(buffer, size), timeout);
     if (packet && *packet) m_State->count_interleaved(**packet, buffer);
     if (!packet || !*packet) m_State->ledger.publish();
     if (!packet) return packet.failure();

@@ -42,7 +42,7 @@ CVexaCommon::~CVexaCommon() {
   // Kept: the motion-metadata stream is the host's to stop; a driver's end leaves it open.
   ReleaseRtpPacketsPtr();
   m_State->release_stream_buffer();
-  delete[] m_StagingBuffer;
+  m_State->clear_frame_queue();  // a model class may have queued frames without a stream
   CloseHandle(m_StopVideoEvent);
 }
 

@@ -102,8 +102,7 @@ ELibDReturnCode DriverState::open_rtp_session(const std::string& path) {
   if (control) return LIBD_OK;
   Failure failure = control.failure();
   if (stream_socket() != -1) {
-    shutdown_and_close(stream_socket());
-    set_stream_socket(-1);
+    close_media();
     failure.code = LIBD_STREAM_OPEN_FAILED;
   }
   errors.record(failure);
@@ -180,10 +179,13 @@ void DriverState::take_frame(CVexaCommon::VideoFrameInfo& frame) {
 // A keep-alive is awaited while media are received: its answer may take a second, or never come.
 ELibDReturnCode DriverState::read_frame(CVexaCommon::VideoFrameInfo& frame) {
   if (!plays_rtp()) return driver.GetCurrentFrameData(frame);
-  const ELibDReturnCode result = driver.GetRtpCurrentVideoFrame(stream_codec(), frame);
-  look_for_keep_alive();
-  begin_keep_alive();
-  return result;
+  for (;;) {
+    const ELibDReturnCode result = driver.GetRtpCurrentVideoFrame(stream_codec(), frame);
+    const bool answered = look_for_keep_alive();
+    begin_keep_alive();
+    // A read that ended early, because the answer had come, is no empty read.
+    if (result != LIBD_NO_FRAME || !answered || stop_is_requested()) return result;
+  }
 }
 
 std::string DriverState::stream_codec() {
@@ -266,7 +268,6 @@ ELibDReturnCode CVexaCommon::StopRtpVideoStreaming() {
 void CVexaCommon::ReleaseRtpPacketsPtr() {
   if (m_State->rtp != nullptr) m_State->rtp->collector.discard_all();
   m_State->ledger.end_stream();
-  m_State->chronicle->end_stream();
   m_State->rtp.reset();
   m_RtpPackets.clear();
   std::free(m_RtpPacketBuffer);

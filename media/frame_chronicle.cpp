@@ -78,11 +78,16 @@ void FrameChronicle::stamp(std::int64_t& moment, Arrivals& arrivals, int socket)
   moment = *arrival - arrivals.real_ahead;
 }
 
+FrameChronicle::Arrivals* FrameChronicle::find(std::uint32_t timestamp) {
+  const auto same = [timestamp](const Arrivals& known) { return known.used && known.timestamp == timestamp; };
+  if (same(arrivals_[latest_])) return &arrivals_[latest_];
+  const auto found = std::find_if(arrivals_.begin(), arrivals_.end(), same);
+  return found != arrivals_.end() ? &*found : nullptr;
+}
+
 // A picture's first packet, or a packet out of order.
 void FrameChronicle::arrived_elsewhere(const SPacketInfo& packet, int socket, Instant now) {
-  const auto same = [&packet](const Arrivals& known) { return known.used && known.timestamp == packet.timestamp; };
-  const auto found = std::find_if(arrivals_.begin(), arrivals_.end(), same);
-  if (found != arrivals_.end()) {
+  if (Arrivals* const found = find(packet.timestamp)) {
     found->last = count_of(now);
     if (packet.marker) stamp(found->last, *found, socket);
     return;
@@ -132,7 +137,7 @@ void FrameChronicle::take_control(Bytes compound, int clock_rate, SenderClock::A
 void FrameChronicle::take_report(const SenderReport& report, SenderClock::Arrival arrival, int clock_rate) {
   ledger_.report_taken();
   latest_ntp_ = report.ntp;
-  latest_report_ = Clock::now();
+  latest_report_ = Instant(std::chrono::duration_cast<Instant::duration>(std::chrono::nanoseconds(arrival.monotonic)));
   clock_.report(report, arrival, clock_rate);
 }
 
@@ -243,11 +248,8 @@ void FrameChronicle::add_packet_facts(const Picture& picture, FrameFacts& facts)
     facts.packetsLostBefore = facts.firstSequence - last_sequence_ - 1;
   }
   last_sequence_ = facts.lastSequence;
-  const auto same = [&picture](const Arrivals& known) {
-    return known.used && known.timestamp == picture.first->timestamp;
-  };
-  const auto arrivals = std::find_if(arrivals_.begin(), arrivals_.end(), same);
-  if (arrivals == arrivals_.end()) return;
+  const Arrivals* const arrivals = find(picture.first->timestamp);
+  if (arrivals == nullptr) return;
   facts.valid |= FRAME_FACTS_ARRIVAL;
   facts.arrivalSource = arrivals->source;
   facts.firstArrivalMonotonicTime = arrivals->first;
@@ -272,7 +274,8 @@ void FrameChronicle::add_clock_facts(const Picture& picture, FrameFacts& facts) 
     facts.valid |= FRAME_FACTS_CAMERA_CLOCK;
     facts.cameraClockState = FRAME_CAMERA_CLOCK_FROZEN;
   }
-  if (const auto offset = clock_.offset({real_now(), count_of(Clock::now())})) {
+  const bool runs = clock_.state() == SenderClock::State::kRunning;
+  if (const auto offset = runs ? clock_.offset({real_now(), count_of(Clock::now())}) : std::nullopt) {
     facts.valid |= FRAME_FACTS_CAMERA_CLOCK;
     facts.cameraClockOffset = *offset;
     facts.cameraClockLocalTimeMinutes = local_time_minutes(*offset);

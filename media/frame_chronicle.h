@@ -68,6 +68,8 @@ class FrameChronicle {
     std::int64_t real_ahead = 0;  ///< of the monotonic clock
   };
 
+  /// Those of the picture of this time stamp; null when it is not among the latest.
+  Arrivals* find(std::uint32_t timestamp);
   void arrived_elsewhere(const SPacketInfo& packet, int socket, Instant now);
   static void stamp(std::int64_t& moment, Arrivals& arrivals, int socket);
   void take_report(const SenderReport& report, SenderClock::Arrival arrival, int clock_rate);

@@ -110,6 +110,7 @@ SequenceLedger::Arrival StreamLedger::place_other_source(std::uint32_t ssrc, std
 }
 
 void StreamLedger::restarted(std::uint16_t latest_sequence) {
+  has_timestamp_ = false;              // jitter begins anew: the time stamps may have gone back
   constexpr std::uint16_t kProof = 3;  // packets that the collector takes for a proof
   if (static_cast<std::uint16_t>(sequence_.highest()) == latest_sequence) return;  // this ledger has followed already
   sequence_.begin_run();

@@ -127,7 +127,6 @@ class StreamLedger final : public WaitObserver {
   void publish();
   /// Any thread.
   StreamRecord read() const { return published_.read(); }
-  std::uint32_t version() const { return published_.version(); }
 
   void about_to_wait() override;
   void woken() override { ++counts_.wakeups; }
