@@ -129,6 +129,13 @@ std::optional<LineFailure> CameraLine::start(std::uint32_t stream) {
   return failure(started);
 }
 
+std::optional<LineFailure> CameraLine::ask() {
+  SLibDSystemInfo system;
+  const ELibDReturnCode asked = device_->GetCurrentSystemInfo(system);
+  if (asked == LIBD_OK) return std::nullopt;
+  return failure(asked);
+}
+
 void CameraLine::close() {
   if (!device_) return;
   token_.Cancel();

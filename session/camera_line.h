@@ -50,6 +50,9 @@ class CameraLine {
   /// Ends what waits, and what begins until the next open().
   void cancel() noexcept { token_.Cancel(); }
 
+  /// Sends the camera its cheapest request while its streams run.
+  [[nodiscard]] std::optional<LineFailure> ask();
+
   /// Null before the first open().
   [[nodiscard]] CVexaCommon* driver() const { return driver_; }
   [[nodiscard]] std::string latest_text() const;

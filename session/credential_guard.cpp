@@ -8,10 +8,22 @@
 namespace vexa {
 namespace {
 
+// Kept at most though nobody holds them: hosts may try any number of users.
+constexpr std::size_t kMostUnheld = 1024;
+
 struct Registry {
   std::mutex mutex;
-  std::map<std::string, std::weak_ptr<CredentialGuard>> guards;
+  std::map<std::string, std::shared_ptr<CredentialGuard>> guards;
 };
+
+void drop_unheld(Registry& all) {
+  std::size_t kept = 0;
+  for (auto entry = all.guards.begin(); entry != all.guards.end();) {
+    const bool is_held = entry->second.use_count() > 1;
+    const bool stays = is_held || (entry->second->is_refused() && ++kept <= kMostUnheld);
+    entry = stays ? std::next(entry) : all.guards.erase(entry);
+  }
+}
 
 // Never destroyed: sessions may outlive the objects of main's end.
 Registry& registry() {
@@ -25,12 +37,9 @@ std::shared_ptr<CredentialGuard> CredentialGuard::of(const SLibDConnectionInfo& 
   const std::string key = connection.host + ':' + std::to_string(connection.port) + '\n' + connection.userName;
   Registry& all = registry();
   const std::lock_guard<std::mutex> lock(all.mutex);
-  for (auto entry = all.guards.begin(); entry != all.guards.end();) {
-    entry = entry->second.expired() ? all.guards.erase(entry) : std::next(entry);
-  }
-  std::weak_ptr<CredentialGuard>& held = all.guards[key];
-  std::shared_ptr<CredentialGuard> guard = held.lock();
-  if (!guard) held = guard = std::make_shared<CredentialGuard>();
+  drop_unheld(all);
+  std::shared_ptr<CredentialGuard>& guard = all.guards[key];
+  if (!guard) guard = std::make_shared<CredentialGuard>();
   return guard;
 }
 
@@ -78,6 +87,11 @@ void CredentialGuard::accepted() {
 
 void CredentialGuard::refused(Moment now) {
   change([&] { breaker_.refused(now); });
+}
+
+void CredentialGuard::doubt() {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  breaker_.doubt();
 }
 
 void CredentialGuard::abandoned() {

@@ -25,7 +25,8 @@ class CredentialWaiter {
 /// A breaker with the password that it judges. Any thread.
 class CredentialGuard {
  public:
-  /// That of a camera's address and user; the same for all who ask while one of them holds it.
+  /// That of a camera's address and user, the same for all who ask while one of them holds it; and for as long as its
+  /// credentials are refused, so that a host which begins a session anew does not send them again.
   static std::shared_ptr<CredentialGuard> of(const SLibDConnectionInfo& connection);
 
   void add_waiter(const std::weak_ptr<CredentialWaiter>& waiter);
@@ -35,6 +36,7 @@ class CredentialGuard {
   [[nodiscard]] CredentialBreaker::Answer ask(Moment now);
   void accepted();
   void refused(Moment now);
+  void doubt();
   void abandoned();
   void retry();
   [[nodiscard]] Moment retry_at() const;

@@ -8,6 +8,7 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <cstring>
 
 namespace vexa {
 namespace {
@@ -23,14 +24,29 @@ int open_netlink() {
   return -1;
 }
 
-bool is_good_news(const nlmsghdr& message) {
+bool is_good_news(const nlmsghdr& message, const char* content) {
   if (message.nlmsg_type == RTM_NEWROUTE || message.nlmsg_type == RTM_NEWADDR) return true;
   if (message.nlmsg_type != RTM_NEWLINK || message.nlmsg_len < NLMSG_LENGTH(sizeof(ifinfomsg))) return false;
-  const auto* link = static_cast<const ifinfomsg*>(NLMSG_DATA(const_cast<nlmsghdr*>(&message)));
-  return (link->ifi_flags & IFF_RUNNING) != 0;
+  ifinfomsg link;
+  std::memcpy(&link, content, sizeof link);
+  return (link.ifi_flags & IFF_RUNNING) != 0;
 }
 
 }  // namespace
+
+bool reports_a_link(const char* messages, std::size_t length) {
+  while (length >= sizeof(nlmsghdr)) {
+    nlmsghdr header;
+    std::memcpy(&header, messages, sizeof header);
+    if (header.nlmsg_len < sizeof header || header.nlmsg_len > length) return false;
+    if (is_good_news(header, messages + NLMSG_HDRLEN)) return true;
+    const std::size_t step = NLMSG_ALIGN(header.nlmsg_len);
+    if (step >= length) return false;
+    messages += step;
+    length -= step;
+  }
+  return false;
+}
 
 LinkWatch::LinkWatch() : socket_(open_netlink()) {}
 
@@ -40,7 +56,7 @@ LinkWatch::~LinkWatch() {
 
 bool LinkWatch::read_news() const {
   bool good = false;
-  alignas(nlmsghdr) char news[8192];
+  char news[8192];
   for (;;) {
     const ssize_t length = recv(socket_, news, sizeof news, 0);
     if (length < 0 && errno == EINTR) continue;
@@ -50,11 +66,7 @@ bool LinkWatch::read_news() const {
       continue;
     }
     if (length <= 0) return good;
-    auto left = static_cast<unsigned>(length);
-    for (auto* message = reinterpret_cast<nlmsghdr*>(news); NLMSG_OK(message, left);
-         message = NLMSG_NEXT(message, left)) {
-      good = good || is_good_news(*message);
-    }
+    good = good || reports_a_link(news, static_cast<std::size_t>(length));
   }
 }
 

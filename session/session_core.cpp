@@ -9,6 +9,8 @@
 #include "session/clock.h"
 #include "session/core/failure_cause.h"
 #include "session/keeper.h"
+#include "vexa/frame_facts.h"
+#include "vexa/statistics.h"
 #include "vexa/waiting.h"
 
 namespace vexa {
@@ -17,6 +19,10 @@ namespace {
 // Taken before other cameras have their turn.
 constexpr int kMostPictures = 64;
 constexpr std::size_t kSoundPiece = 8192;
+// Of a connection that goes on; a new one has new ones of all of these.
+constexpr std::uint32_t kStreamChanges = FRAME_DISCONTINUITY_SSRC | FRAME_DISCONTINUITY_SEQUENCE_RESTART |
+                                         FRAME_DISCONTINUITY_TIME_JUMP | FRAME_DISCONTINUITY_CODEC |
+                                         FRAME_DISCONTINUITY_SIZE;
 
 std::string name_of(const SessionOptions& options) {
   if (!options.name.empty()) return options.name;
@@ -81,12 +87,7 @@ void SessionCore::stop() {
 
 void SessionCore::retry() {
   if (over_) return;
-  std::shared_ptr<CredentialGuard> guard;
-  {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    guard = guard_;
-  }
-  guard->retry();
+  guard()->retry();
   retry_wanted_ = true;
   wake_(number_);
 }
@@ -129,13 +130,11 @@ void SessionCore::credentials_changed() {
   wake_(number_);
 }
 
-void SessionCore::credentials_accepted() {
-  std::shared_ptr<CredentialGuard> guard;
-  {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    guard = guard_;
-  }
-  guard->accepted();
+void SessionCore::credentials_accepted() { guard()->accepted(); }
+
+std::shared_ptr<CredentialGuard> SessionCore::guard() const {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  return guard_;
 }
 
 std::shared_ptr<Session> SessionCore::handle() {
@@ -147,16 +146,19 @@ std::shared_ptr<Session> SessionCore::handle() {
 
 // Jobs
 
-void SessionCore::run_open(std::shared_ptr<CredentialGuard> guard, std::string user) {
-  Opened opened{line_.open(user, guard->password(), *this)};
-  if (opened.failure) {
-    const SessionCause cause = cause_of(opened.failure->code, opened.failure->text);
-    if (cause == SessionCause::kCredentials) {
-      guard->refused(monotonic_now());
-    } else {
-      guard->abandoned();
-    }
+void SessionCore::report(CredentialGuard& judge, const std::optional<LineFailure>& failure) {
+  if (!failure) {
+    judge.accepted();
+  } else if (cause_of(failure->code, failure->text) == SessionCause::kCredentials) {
+    judge.refused(monotonic_now());
+  } else {
+    judge.abandoned();
   }
+}
+
+void SessionCore::run_open(const std::shared_ptr<CredentialGuard>& judge, const std::string& user) {
+  Opened opened{line_.open(user, judge->password(), *this)};
+  if (opened.failure) report(*judge, opened.failure);
   {
     const std::lock_guard<std::mutex> lock(mutex_);
     opened_ = std::move(opened);
@@ -165,11 +167,23 @@ void SessionCore::run_open(std::shared_ptr<CredentialGuard> guard, std::string u
   wake_(number_);
 }
 
-void SessionCore::run_side(std::uint32_t stream) {
+void SessionCore::run_side(std::uint32_t stream, const std::shared_ptr<CredentialGuard>& judge) {
   Opened opened{line_.start(stream)};
+  report(*judge, opened.failure);
   {
     const std::lock_guard<std::mutex> lock(mutex_);
     side_ = std::make_pair(stream, std::move(opened));
+  }
+  wake_(number_);
+}
+
+void SessionCore::run_probe(const std::shared_ptr<CredentialGuard>& judge) {
+  const std::optional<LineFailure> failure = line_.ask();
+  report(*judge, failure);
+  const bool answered = !failure || is_refusal(cause_of(failure->code, failure->text));
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    probed_ = answered ? monotonic_now() : Moment::min();
   }
   wake_(number_);
 }
@@ -215,11 +229,13 @@ void SessionCore::obey(Moment now) {
 void SessionCore::take_results(Moment now) {
   std::optional<Opened> opened;
   std::optional<std::pair<std::uint32_t, Opened>> side;
+  std::optional<Moment> probed;
   bool closed = false;
   {
     const std::lock_guard<std::mutex> lock(mutex_);
     opened.swap(opened_);
     side.swap(side_);
+    probed.swap(probed_);
     closed = std::exchange(closed_, false);
   }
   if (opened) after_open(*opened, now);
@@ -231,6 +247,11 @@ void SessionCore::take_results(Moment now) {
       lost_ &= ~side->first;
       side_due_ = lost_ == 0 ? kNever : now;
     }
+  }
+  if (probed) {
+    side_job_ = false;
+    evidence_.answer = *probed;
+    if (running_ && !close_due_ && machine_.status().state == SessionState::kStalled) judge_silence(now);
   }
   if (closed) {
     job_ = running_ = false;
@@ -245,6 +266,7 @@ void SessionCore::after_open(const Opened& opened, Moment now) {
     running_ = true;
     first_ = true;
     evidence_ = {};
+    asked_ = false;
     lost_ = 0;
     side_due_ = kNever;
     machine_.opened(now);
@@ -260,12 +282,7 @@ void SessionCore::after_open(const Opened& opened, Moment now) {
     machine_.failed(failure.code, failure.text, chance(), now);
     return;
   }
-  std::shared_ptr<CredentialGuard> guard;
-  {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    guard = guard_;
-  }
-  machine_.refused_credentials(failure.code, failure.text, guard->retry_at(), now);
+  machine_.refused_credentials(failure.code, failure.text, guard()->retry_at(), now);
 }
 
 void SessionCore::begin_attempt(Moment now) {
@@ -273,34 +290,35 @@ void SessionCore::begin_attempt(Moment now) {
     machine_.hold(SessionCause::kTurn, kNever, now);
     return;
   }
-  std::shared_ptr<CredentialGuard> guard;
+  std::shared_ptr<CredentialGuard> judge;
   std::string user;
   {
     const std::lock_guard<std::mutex> lock(mutex_);
-    guard = guard_;
+    judge = guard_;
     user = user_;
   }
-  const CredentialBreaker::Answer answer = guard->ask(now);
+  const CredentialBreaker::Answer answer = judge->ask(now);
   if (answer == CredentialBreaker::Answer::kWait || answer == CredentialBreaker::Answer::kRefused) {
     parts_.turns.leave(number_);
-    const bool refused = guard->is_refused();
+    const bool refused = judge->is_refused();
     machine_.hold(refused ? SessionCause::kCredentials : SessionCause::kOtherTrial,
-                  refused ? guard->retry_at() : kNever, now);
+                  refused ? judge->retry_at() : kNever, now);
     return;
   }
   ++parts_.counts.attempts;
   machine_.connecting(now);
   job_ = true;
   auto self = shared_from_this();
-  if (parts_.connectors.post([self, guard, user] { self->run_open(guard, user); })) return;
+  if (parts_.connectors.post([self, judge, user] { self->run_open(judge, user); })) return;
   job_ = false;
-  guard->abandoned();
+  judge->abandoned();
   parts_.turns.leave(number_);
   machine_.failed(LIBD_FAILED, "no thread could be made", chance(), now);
 }
 
 void SessionCore::begin_close() {
   close_due_ = false;
+  if (!stop_wanted_) guard()->doubt();
   job_ = true;
   running_ = false;
   auto self = shared_from_this();
@@ -308,27 +326,48 @@ void SessionCore::begin_close() {
 }
 
 void SessionCore::begin_side(Moment now) {
-  side_due_ = kNever;
-  std::shared_ptr<CredentialGuard> guard;
-  {
-    const std::lock_guard<std::mutex> lock(mutex_);
-    guard = guard_;
-  }
+  const std::shared_ptr<CredentialGuard> judge = guard();
   const std::uint32_t stream = lost_ & (~lost_ + 1);  // the lowest
   auto self = shared_from_this();
-  if (guard->ask(now) != CredentialBreaker::Answer::kGo) {
-    guard->abandoned();
-    side_due_ = now + BackOff::kLastLimit;
-    return;
-  }
-  side_job_ = parts_.connectors.post([self, stream] { self->run_side(stream); });
-  if (!side_job_) side_due_ = now + BackOff::kLastLimit;
+  side_due_ = now + BackOff::kLastLimit;
+  const CredentialBreaker::Answer answer = judge->ask(now);
+  if (answer == CredentialBreaker::Answer::kWait || answer == CredentialBreaker::Answer::kRefused) return;
+  side_job_ = parts_.connectors.post([self, stream, judge] { self->run_side(stream, judge); });
+  if (!side_job_) judge->abandoned();
+}
+
+// Whether the camera answers while it sends nothing; once a silence. It may have been set up anew meanwhile, so that of
+// its sessions one finds out whether it still takes the credentials.
+void SessionCore::begin_probe(Moment now) {
+  asked_ = true;
+  const std::shared_ptr<CredentialGuard> judge = guard();
+  judge->doubt();
+  if (judge->ask(now) != CredentialBreaker::Answer::kTry) return;
+  auto self = shared_from_this();
+  side_job_ = parts_.connectors.post([self, judge] { self->run_probe(judge); });
+  if (!side_job_) judge->abandoned();
+}
+
+void SessionCore::read_evidence(Moment now) {
+  StreamStatistics statistics;
+  GetStreamStatistics(*line_.driver(), statistics);
+  if (statistics.timeSinceLastPacket == UINT64_MAX) return;
+  const auto since = std::chrono::microseconds(statistics.timeSinceLastPacket);
+  evidence_.video = now - std::chrono::duration_cast<Moment>(since);
 }
 
 void SessionCore::watch_silence(Moment now) {
-  if (!running_ || now < machine_.deadline()) return;
+  if (running_ && now >= machine_.deadline()) judge_silence(now);
+}
+
+void SessionCore::judge_silence(Moment now) {
+  read_evidence(now);
   machine_.evidence(evidence_);
-  if (machine_.is_hopeless(chance(), now)) close_due_ = true;
+  if (machine_.is_hopeless(chance(), now)) {
+    close_due_ = true;
+  } else if (machine_.status().cause == SessionCause::kNoBytes && !asked_ && !side_job_) {
+    begin_probe(now);
+  }
 }
 
 Moment SessionCore::deadline() const {
@@ -376,23 +415,25 @@ int SessionCore::take_video(Moment now) {
     Sink sink(picture_);
     SLibDVideoFrameInfo frame;
     frame.sink = &sink;
-    const ELibDReturnCode result = line_.driver()->GetCurrentVideoFrame(frame);
+    FrameFacts facts;
+    const ELibDReturnCode result = GetCurrentVideoFrame(*line_.driver(), frame, facts);
     // Silence is the machine's to judge.
     if (result == LIBD_NO_FRAME || result == LIBD_TIMEOUT) break;
     if (result != LIBD_OK) {
       lose(kVideoStream, result, now);
       break;
     }
-    made += show(frame, now);
+    made += show(frame, facts.discontinuity, now);
   }
   return made;
 }
 
-int SessionCore::show(const SLibDVideoFrameInfo& frame, Moment now) {
+int SessionCore::show(const SLibDVideoFrameInfo& frame, std::uint32_t discontinuity, Moment now) {
   machine_.picture(now);
+  asked_ = false;
   int made = publish();
   const std::int32_t codec = codec_of(frame.frameType);
-  if (codec_ >= 0 && codec_ != codec) {
+  if ((codec_ >= 0 && codec_ != codec) || (discontinuity & kStreamChanges) != 0) {
     machine_.stream_changed(now);
     made += publish();
   }

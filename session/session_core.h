@@ -63,9 +63,13 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   };
   struct Sink;
 
+  [[nodiscard]] std::shared_ptr<CredentialGuard> guard() const;
+
   // Jobs.
-  void run_open(std::shared_ptr<CredentialGuard> guard, std::string user);
-  void run_side(std::uint32_t stream);
+  static void report(CredentialGuard& judge, const std::optional<LineFailure>& failure);
+  void run_open(const std::shared_ptr<CredentialGuard>& judge, const std::string& user);
+  void run_side(std::uint32_t stream, const std::shared_ptr<CredentialGuard>& judge);
+  void run_probe(const std::shared_ptr<CredentialGuard>& judge);
   void run_close();
 
   // Steps of a turn.
@@ -76,7 +80,10 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   [[nodiscard]] bool waits_for_turn() const;
   void begin_close();
   void begin_side(Moment now);
+  void begin_probe(Moment now);
+  void read_evidence(Moment now);
   void watch_silence(Moment now);
+  void judge_silence(Moment now);
   int publish();
 
   int take_video(Moment now);
@@ -84,7 +91,7 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   int take_metadata(Moment now);
   int take_audio(Moment now);
   void lose(std::uint32_t stream, ELibDReturnCode code, Moment now);
-  int show(const SLibDVideoFrameInfo& frame, Moment now);
+  int show(const SLibDVideoFrameInfo& frame, std::uint32_t discontinuity, Moment now);
 
   template <typename Call>
   int call(const Call& host);
@@ -116,6 +123,7 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   std::optional<Opened> opened_;                          ///< what a job has left
   std::optional<std::pair<std::uint32_t, Opened>> side_;  ///< the same, of one stream
   bool closed_ = false;                                   ///< the same, of a close
+  std::optional<Moment> probed_;                          ///< the same, of a probe: when the camera answered it
   std::weak_ptr<Session> handle_;
 
   // Of the job under way, or else the keeper.
@@ -124,9 +132,9 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   // Of the keeper.
   SessionMachine machine_;
   std::minstd_rand random_;
-  bool job_ = false;  ///< one that opens or closes is under way
-  bool side_job_ = false;
-  bool running_ = false;  ///< streams are open
+  bool job_ = false;       ///< one that opens or closes is under way
+  bool side_job_ = false;  ///< one that starts a stream or asks for an answer, beside those that run
+  bool running_ = false;   ///< streams are open
   bool close_due_ = false;
   bool first_ = true;  ///< the next picture is the first of its connection
   std::int32_t codec_ = -1;
@@ -134,6 +142,7 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   BackOff side_back_off_;
   Moment side_due_ = kNever;
   MediaEvidence evidence_;
+  bool asked_ = false;  ///< for an answer, since the latest picture
   std::vector<unsigned char> picture_;
   std::vector<unsigned char> sound_;
 };

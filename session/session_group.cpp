@@ -78,7 +78,7 @@ class SessionGroup::Impl {
   }
 
  private:
-  Keeper& keeper_of(std::uint64_t session) { return *keepers_[session % keepers_.size()]; }
+  Keeper& keeper_of(std::uint64_t session) { return *keepers_[static_cast<std::size_t>(session % keepers_.size())]; }
 
   void note_link() {
     for (const auto& keeper : keepers_) keeper->note_link();

@@ -17,7 +17,7 @@
 // Which call is allowed in which callback, of the same session or of another of the same group:
 //
 //     call                              in any callback
-//     Session::Status, Name, Options    returns at once
+//     Session::Status, Name             returns at once
 //     Session::Stop, Retry,             return at once; take effect when the callback has returned. After a Stop from
 //       SetCredentials                  within its callback a session makes one call more: the state kStopped
 //     Session::WaitStopped              returns false at once, where waiting would never end
@@ -118,7 +118,8 @@ class VEXA_API Session {
   /// than 0: no limit), and at once on a thread that is to finish the stop itself: one that runs a callback of the
   /// group, and any thread for a group without threads, whose host calls Process instead.
   bool WaitStopped(std::int32_t milliseconds);
-  /// Makes an attempt now. Refused credentials are sent once more.
+  /// Makes an attempt now. Refused credentials are sent once more; without this or another password no session of the
+  /// process sends them again, one that is opened later included.
   void Retry();
   /// For the attempts from now on, also by other sessions of the same camera and user. What runs goes on.
   void SetCredentials(const std::string& userName, const std::string& password);

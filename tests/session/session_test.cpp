@@ -5,10 +5,12 @@
 #include <unistd.h>
 
 #include <arpa/inet.h>
+#include <algorithm>
 #include <atomic>
 #include <stdexcept>
 
 #include "tests/session/session_camera.h"
+#include "tests/support/process_state.h"
 #include "vexa/video_info.h"
 
 namespace vexa {
@@ -16,6 +18,7 @@ namespace {
 
 using camera::CameraOptions;
 using camera::RequestFault;
+using vexa_test::eventually;
 
 TEST_F(SessionWithCamera, GoesLiveWithTheFirstWholePicture) {
   start_camera();
@@ -95,6 +98,78 @@ TEST_F(SessionWithCamera, RefusedCredentialsAreSentOnceByAllSessionsTogether) {
   EXPECT_EQ(camera().journal().snapshot().size(), 1U);
 }
 
+TEST_F(SessionWithCamera, RefusedCredentialsAreNotSentAgainByAGroupThatIsMadeAnew) {
+  start_camera();
+  SessionOptions wrong = options();
+  wrong.connection.password = "wrong once";
+  for (int time = 0; time < 3; ++time) {
+    SessionHost host;
+    SessionGroup group;
+    ASSERT_TRUE(group.Open(wrong, host.callbacks()));
+    ASSERT_TRUE(host.wait_for_state(SessionState::kRefused, SessionCause::kCredentials));
+  }
+  EXPECT_EQ(camera().journal().snapshot().size(), 1U);
+}
+
+// Six sessions, and a camera that would lock the account after five refusals.
+TEST_F(SessionWithCamera, APasswordThatIsChangedAndChangedBackLocksNobodyOut) {
+  start_camera();
+  SessionHost hosts[6];
+  std::vector<std::shared_ptr<Session>> sessions;
+  SessionGroup group;
+  for (SessionHost& host : hosts) sessions.push_back(group.Open(options(), host.callbacks()));
+  for (SessionHost& host : hosts) ASSERT_TRUE(host.wait_for_live());
+  camera().unplug();
+  camera().add_request_fault(RequestFault::wrong_credentials(""));
+  camera().plug();
+  for (SessionHost& host : hosts) {
+    ASSERT_TRUE(host.wait_for([](const auto& states, const auto&) {
+      return states.back().cause == SessionCause::kCredentials && states.back().nextAttempt != 0;
+    }));
+  }
+  camera().clear_request_faults();
+  sessions[0]->Retry();
+  for (SessionHost& host : hosts) {
+    EXPECT_TRUE(
+        host.wait_for([](const auto& states, const auto&) { return states.back().state == SessionState::kLive; }));
+  }
+  const std::vector<camera::Request> requests = camera().journal().snapshot();
+  std::vector<std::string> refused;
+  for (const camera::Request& request : requests) {
+    if (request.status == 401) refused.push_back(request.bytes);
+  }
+  EXPECT_LT(refused.size(), 5U) << testing::PrintToString(refused);
+}
+
+TEST_F(SessionWithCamera, A401BesideRunningVideoLeavesTheVideo) {
+  CameraOptions camera_options;
+  camera_options.profile_path = VEXA_SOURCE_DIR "/models/profiles/LMX-M300.json";
+  const std::string alarms = "/command/alarmdata.cgi";
+  camera_options.request_faults = {RequestFault::cut_after(alarms, 400).nth(1),
+                                   RequestFault::wrong_credentials(alarms).nth(2)};
+  start_camera(camera_options);
+  SessionOptions both = options();
+  both.streams = kVideoStream | kAlarmStream;
+  SessionHost host;
+  SessionHost other;
+  SessionGroup group;
+  const auto session = group.Open(both, host.callbacks());
+  ASSERT_TRUE(host.wait_for_live());
+  ASSERT_TRUE(camera().alarms().happen({camera::AlarmEvent::Kind::kContact, 2, 1}));
+  ASSERT_TRUE(camera().journal().wait_for_count(alarms, 2, SessionHost::kLongest));
+  // Its refusal is known to all who have the same credentials.
+  ASSERT_TRUE(eventually([&] {
+    const auto latest = session->Status();
+    return latest.state == SessionState::kLive && camera().journal().count(alarms) == 2;
+  }));
+  const std::size_t frames = host.frames().size();
+  EXPECT_TRUE(host.wait_for_frames(frames + 10));
+  EXPECT_EQ(session->Status().state, SessionState::kLive);
+  ASSERT_TRUE(group.Open(options(), other.callbacks()));
+  EXPECT_TRUE(other.wait_for_state(SessionState::kRefused, SessionCause::kCredentials));
+  EXPECT_EQ(camera().journal().count(alarms), 2U);
+}
+
 TEST_F(SessionWithCamera, TheRightPasswordMakesRefusedSessionsLive) {
   start_camera();
   SessionOptions wrong = options();
@@ -158,6 +233,56 @@ TEST_F(SessionWithCamera, AnotherCodecAfterAnOutageIsFollowedAndReported) {
   ASSERT_TRUE(host.wait_for_state(SessionState::kLive, SessionCause::kStreamChanged));
   ASSERT_TRUE(
       host.wait_for([](const auto&, const auto& frames) { return frames.back().frameType == VIDEO_FRAME_JPEG; }));
+}
+
+TEST_F(SessionWithCamera, AStreamThatBeginsAnewWithinAConnectionIsReported) {
+  CameraOptions camera_options;
+  camera_options.packet_faults.sequence_restarts = {{.picture = 10, .value = 40000}};
+  start_camera(camera_options);
+  SessionHost host;
+  SessionGroup group;
+  ASSERT_TRUE(group.Open(options(), host.callbacks()));
+  ASSERT_TRUE(host.wait_for_state(SessionState::kLive, SessionCause::kStreamChanged));
+  EXPECT_EQ(host.states().size(), 3U);
+}
+
+TEST_F(SessionWithCamera, ACameraThatAnswersAndSendsNoPictureIsStalledForThat) {
+  CameraOptions camera_options;
+  camera_options.packet_faults.loss = 1;
+  camera_options.packet_faults.first_picture = 10;
+  start_camera(camera_options);
+  SessionHost host;
+  SessionGroup group;
+  ASSERT_TRUE(group.Open(options(), host.callbacks()));
+  ASSERT_TRUE(host.wait_for_state(SessionState::kStalled, SessionCause::kControlOnly));
+  ASSERT_TRUE(host.wait_for_state(SessionState::kWaiting, SessionCause::kControlOnly));
+}
+
+TEST_F(SessionWithCamera, ACameraThatSendsAndAnswersNothingIsStalledForThat) {
+  CameraOptions camera_options;
+  camera_options.packet_faults.loss = 1;
+  camera_options.packet_faults.first_picture = 10;
+  camera_options.request_faults = {RequestFault::no_answer("inq=system").nth(2)};
+  start_camera(camera_options);
+  SessionOptions impatient = options();
+  impatient.connection.timeout = 1000;
+  SessionHost host;
+  SessionGroup group;
+  ASSERT_TRUE(group.Open(impatient, host.callbacks()));
+  ASSERT_TRUE(host.wait_for_state(SessionState::kWaiting, SessionCause::kNoBytes));
+  EXPECT_TRUE(host.wait_for_state(SessionState::kStalled, SessionCause::kNoBytes));
+}
+
+TEST_F(SessionWithCamera, PacketsThatMakeNoPictureAreNamed) {
+  CameraOptions camera_options;
+  camera_options.clip_path = VEXA_CLIPS "/small.h264";
+  camera_options.packet_faults.corrupt_header = 1;
+  camera_options.packet_faults.first_picture = 10;
+  start_camera(camera_options);
+  SessionHost host;
+  SessionGroup group;
+  ASSERT_TRUE(group.Open(options(), host.callbacks()));
+  ASSERT_TRUE(host.wait_for_state(SessionState::kStalled, SessionCause::kNoWholePicture));
 }
 
 TEST_F(SessionWithCamera, AStopFromWithinACallbackReturnsAndOneCallMoreFollows) {
@@ -268,6 +393,18 @@ TEST_F(SessionWithCamera, AttemptsAtOnceAreBounded) {
   EXPECT_EQ(group.Metrics().attempts, 8U);
 }
 
+TEST_F(SessionWithCamera, ManyThreadsNeverRunCallbacksOfOneSessionAtOnce) {
+  start_camera();
+  SessionGroupOptions wide;
+  wide.threads = 3;
+  SessionHost hosts[6];
+  SessionGroup group(wide);
+  for (SessionHost& host : hosts) ASSERT_TRUE(group.Open(options(), host.callbacks()));
+  for (SessionHost& host : hosts) ASSERT_TRUE(host.wait_for_frames(25));
+  for (SessionHost& host : hosts) EXPECT_FALSE(host.overlapped());
+  EXPECT_GE(group.Metrics().threads, 3U);
+}
+
 // An address where connections are made and nothing ever answers.
 class SilentAddress {
  public:
@@ -296,6 +433,48 @@ class SilentAddress {
   int socket_;
   int port_ = 0;
 };
+
+TEST_F(SessionWithCamera, AStopEndsASessionInEveryState) {
+  const struct {
+    const char* what;
+    SessionState state;
+    void (*arrange)(CameraOptions&);
+    void (*spoil)(SessionOptions&);
+  } cases[] = {
+      {"live", SessionState::kLive, [](CameraOptions&) {}, [](SessionOptions&) {}},
+      {"stalled", SessionState::kStalled,
+       [](CameraOptions& camera) {
+         camera.packet_faults.loss = 1;
+         camera.packet_faults.first_picture = 10;
+       },
+       [](SessionOptions& session) { session.giveUpMilliseconds = 600000; }},
+      {"waiting", SessionState::kWaiting,
+       [](CameraOptions& camera) { camera.request_faults = {RequestFault::reset("")}; }, [](SessionOptions&) {}},
+      {"refused", SessionState::kRefused, [](CameraOptions&) {},
+       [](SessionOptions& session) { session.connection.password = "wrong until stopped"; }}};
+  for (const auto& row : cases) {
+    SCOPED_TRACE(row.what);
+    CameraOptions camera_options;
+    row.arrange(camera_options);
+    start_camera(camera_options);
+    SessionOptions spoilt = options();
+    row.spoil(spoilt);
+    SessionHost host;
+    SessionGroup group;
+    const auto session = group.Open(spoilt, host.callbacks());
+    ASSERT_TRUE(host.wait_for([&](const auto& states, const auto&) {
+      return std::any_of(states.begin(), states.end(), [&](const auto& s) { return s.state == row.state; });
+    }));
+    session->Stop();
+    EXPECT_TRUE(session->WaitStopped(30000));
+    EXPECT_EQ(host.states().back().state, SessionState::kStopped);
+    const std::uint64_t last = host.latest_event();
+    session->Retry();
+    session->SetCredentials("operator", "another");
+    EXPECT_TRUE(session->WaitStopped(-1));
+    EXPECT_EQ(session->Status().event, last);
+  }
+}
 
 TEST(SilentCamera, AStopEndsAnAttemptThatWouldLastTenMinutes) {
   const SilentAddress nowhere;
