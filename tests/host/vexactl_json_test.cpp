@@ -30,8 +30,8 @@ class JsonOfCommands : public WithCamera {
     const auto clip = vexa::camera::Clip::load(VEXA_CLIPS "/small.h264");
     for (std::size_t i = 0; i < 2; ++i) {
       const auto bytes = clip->access_units()[i].as_delivered();
-      camera().card().add(
-          {std::make_shared<const std::string>(bytes.begin(), bytes.end()), i == 0, std::chrono::milliseconds(40 * i)});
+      EXPECT_TRUE(camera().card().add({std::make_shared<const std::string>(bytes.begin(), bytes.end()), i == 0,
+                                       std::chrono::milliseconds(40 * i)}));
     }
     camera().card().finish();
     return name;

@@ -10,7 +10,6 @@
 #include <stdexcept>
 
 #include "tests/session/session_camera.h"
-#include "tests/support/process_state.h"
 #include "vexa/video_info.h"
 
 namespace vexa {
@@ -18,7 +17,6 @@ namespace {
 
 using camera::CameraOptions;
 using camera::RequestFault;
-using vexa_test::eventually;
 
 TEST_F(SessionWithCamera, GoesLiveWithTheFirstWholePicture) {
   start_camera();
@@ -139,35 +137,6 @@ TEST_F(SessionWithCamera, APasswordThatIsChangedAndChangedBackLocksNobodyOut) {
     if (request.status == 401) refused.push_back(request.bytes);
   }
   EXPECT_LT(refused.size(), 5U) << testing::PrintToString(refused);
-}
-
-TEST_F(SessionWithCamera, A401BesideRunningVideoLeavesTheVideo) {
-  CameraOptions camera_options;
-  camera_options.profile_path = VEXA_SOURCE_DIR "/models/profiles/LMX-M300.json";
-  const std::string alarms = "/command/alarmdata.cgi";
-  camera_options.request_faults = {RequestFault::cut_after(alarms, 400).nth(1),
-                                   RequestFault::wrong_credentials(alarms).nth(2)};
-  start_camera(camera_options);
-  SessionOptions both = options();
-  both.streams = kVideoStream | kAlarmStream;
-  SessionHost host;
-  SessionHost other;
-  SessionGroup group;
-  const auto session = group.Open(both, host.callbacks());
-  ASSERT_TRUE(host.wait_for_live());
-  ASSERT_TRUE(camera().alarms().happen({camera::AlarmEvent::Kind::kContact, 2, 1}));
-  ASSERT_TRUE(camera().journal().wait_for_count(alarms, 2, SessionHost::kLongest));
-  // Its refusal is known to all who have the same credentials.
-  ASSERT_TRUE(eventually([&] {
-    const auto latest = session->Status();
-    return latest.state == SessionState::kLive && camera().journal().count(alarms) == 2;
-  }));
-  const std::size_t frames = host.frames().size();
-  EXPECT_TRUE(host.wait_for_frames(frames + 10));
-  EXPECT_EQ(session->Status().state, SessionState::kLive);
-  ASSERT_TRUE(group.Open(options(), other.callbacks()));
-  EXPECT_TRUE(other.wait_for_state(SessionState::kRefused, SessionCause::kCredentials));
-  EXPECT_EQ(camera().journal().count(alarms), 2U);
 }
 
 TEST_F(SessionWithCamera, TheRightPasswordMakesRefusedSessionsLive) {
