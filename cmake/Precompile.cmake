@@ -13,11 +13,16 @@ set(vexa_false_alarms)
 if(CMAKE_CXX_COMPILER_ID STREQUAL GNU)
   set(vexa_false_alarms -Wno-array-bounds -Wno-restrict -Wno-stringop-overflow -Wno-stringop-overread)
 endif()
+# The same headers make the same file: the compiler's cache knows by it what was compiled before.
+set(vexa_reproducible)
+if(CMAKE_CXX_COMPILER_ID MATCHES Clang)
+  set(vexa_reproducible "SHELL:-Xclang -fno-pch-timestamp")
+endif()
 
 function(vexa_precompile target)
   if(TARGET ${target})
     target_precompile_headers(${target} PRIVATE ${ARGN} ${vexa_standard_headers})
-    target_compile_options(${target} PRIVATE ${vexa_false_alarms})
+    target_compile_options(${target} PRIVATE ${vexa_false_alarms} ${vexa_reproducible})
   endif()
 endfunction()
 
