@@ -4,6 +4,8 @@
 #include <fmt/format.h>
 
 #include <CLI/CLI.hpp>
+#include <algorithm>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -79,13 +81,36 @@ std::string showable(const std::string& argument) {
   return argument.starts_with('-') ? argument.substr(0, 2) : "";
 }
 
+// A word that stands where a command or an action is expected. What holds more than small letters and hyphens may be
+// part of a password, and stays unsaid.
+std::optional<std::string> plain_word(const std::vector<std::string>& extras) {
+  constexpr std::size_t kLongest = 24;
+  if (extras.empty() || extras.front().size() > kLongest) return std::nullopt;
+  const std::string& word = extras.front();
+  const bool plain = word.find_first_not_of("abcdefghijklmnopqrstuvwxyz-") == std::string::npos && word.front() != '-';
+  return plain ? std::optional(word) : std::nullopt;
+}
+
 Problem not_understood(const std::vector<std::string>& extras, const std::string& help) {
   for (const std::string& extra : extras) {
-    if (!showable(extra).empty()) {
-      return {ExitCode::kUsage, fmt::format("unknown option {}", showable(extra)), help};
-    }
+    if (!showable(extra).empty()) return usage(fmt::format("unknown option {}", showable(extra)), help);
   }
-  return {ExitCode::kUsage, "there are too many arguments", help};
+  const auto word = plain_word(extras);
+  return usage(
+      word ? fmt::format("there are too many arguments, from \"{}\" on", *word) : "there are too many arguments", help);
+}
+
+Problem no_command(const std::vector<std::string>& extras) {
+  constexpr char kHelp[] = "See vexactl --help for the commands.";
+  const auto word = plain_word(extras);
+  return usage(word ? fmt::format("there is no command \"{}\"", *word) : "the command is missing or unknown", kHelp);
+}
+
+Problem no_action(const CLI::App& command, const std::string& help) {
+  const auto word = plain_word(command.remaining());
+  return usage(word ? fmt::format("{} has no action \"{}\"", command.get_name(), *word)
+                    : "the action is missing, or not one of the command's",
+               help);
 }
 
 bool is(const CLI::ParseError& error, CLI::ExitCodes kind) { return error.get_exit_code() == static_cast<int>(kind); }
@@ -96,12 +121,13 @@ std::string text_of(const CLI::ParseError& error) {
   const bool names_options_only = is(error, CLI::ExitCodes::RequiredError) ||
                                   is(error, CLI::ExitCodes::ArgumentMismatch) ||
                                   is(error, CLI::ExitCodes::ExcludesError);
-  if (text == "A subcommand is required") return "the action is missing, or not one of the command's";
   if (names_options_only) return text;
   const std::string_view kConversion = "Could not convert: ";
-  if (!text.starts_with(kConversion)) return "an option's value cannot be used";
-  return fmt::format("the value of {} cannot be used",
-                     text.substr(kConversion.size(), text.find(" = ") - kConversion.size()));
+  const std::string name = text.starts_with(kConversion)
+                               ? text.substr(kConversion.size(), text.find(" = ") - kConversion.size())
+                               : text.substr(0, std::min(text.find(':'), text.size()));
+  const bool named = !name.empty() && name.find_first_of(" =") == std::string::npos;
+  return named ? fmt::format("the value of {} cannot be used", name) : "an option's value cannot be used";
 }
 
 // "ptz CAMERA pan": the command, with its action where one was given.
@@ -119,10 +145,12 @@ ExitCode on_parse_error(const CLI::ParseError& error, const CLI::App& program, T
   }
   const auto chosen = program.get_subcommands();
   if (chosen.empty()) {
-    return terminal.report(
-        {ExitCode::kUsage, "the command is missing or unknown", "See vexactl --help for the commands."});
+    return terminal.report(no_command(program.remaining()));
   }
   const std::string help = fmt::format("See vexactl {} --help.", words_of(chosen.front()));
+  if (std::string_view(error.what()) == "A subcommand is required") {
+    return terminal.report(no_action(*chosen.front(), help));
+  }
   if (is(error, CLI::ExitCodes::ExtrasError)) return terminal.report(not_understood(program.remaining(true), help));
   return terminal.report({ExitCode::kUsage, text_of(error), help});
 }

@@ -40,7 +40,7 @@ std::optional<Problem> AlarmSnapshots::take(const SLibDPinInfo& pin, const std::
   std::string name = moment;
   std::replace(name.begin(), name.end(), ':', '-');  // which some file systems do not take
   const std::string file = fmt::format("{}/{}-{}-{}.jpg", folder_, name, kind_of(pin), pin.number);
-  auto problem = write_whole_file(file, *bytes);
+  auto problem = write_whole_file(FrameFile(file), *bytes);
   if (problem) problem->advice = "Make room in the folder of --snapshot-dir.";
   return problem;
 }

@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "host/console/interrupt.h"
+#include "host/console/terminal.h"
 #include "host/words/utc_time.h"
 
 namespace vexa::host {
@@ -61,6 +62,7 @@ std::optional<Problem> AlarmWatch::show(const std::string& line) {
 std::optional<Problem> AlarmWatch::follow_alarms() {
   PinStates states;
   while (goes_on()) {
+    if (auto problem = check_reader(terminal_)) return problem;
     std::vector<SLibDPinInfo> pins;
     const ELibDReturnCode result = camera_.device().GetCurrentIoStatus(pins);
     if (result == LIBD_NO_FRAME) continue;

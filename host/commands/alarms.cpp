@@ -9,6 +9,7 @@
 
 #include "host/base/printable.h"
 #include "host/camera/model_camera.h"
+#include "host/commands/action_group.h"
 #include "host/commands/alarm_snapshots.h"
 #include "host/commands/alarm_watch.h"
 #include "host/commands/command.h"
@@ -22,12 +23,14 @@ namespace {
 
 using Json = nlohmann::ordered_json;
 
+constexpr char kRow[] = "{:>2}  {:<9}  {:<3}  {}\n";
+
 class IoCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("io", "Show a camera's inputs, outputs and detectors");
     add_model_options(*command, options_, environment);
-    command->footer("The state of an output is not reported; it shows as \"-\", in JSON as null.");
+    command->footer("Cameras do not report the state of an output; in JSON it is null.");
     return command;
   }
 
@@ -38,7 +41,8 @@ class IoCommand final : public Command {
     const ELibDReturnCode result = camera->device().GetIoBoxInfo(info);
     if (result != LIBD_OK) return terminal.report(camera->explain(result));
     if (const auto problem = read_states(*camera, info.pins)) return terminal.report(*problem);
-    return write_result(terminal, options_.camera.json ? json_of(info.pins) : table_of(info.pins));
+    if (options_.camera.json) return write_result(terminal, json_of(info.pins));
+    return write_table(terminal, fmt::format(kRow, "#", "kind", "on", "state"), table_of(info.pins));
   }
 
  private:
@@ -67,15 +71,14 @@ class IoCommand final : public Command {
   }
 
   static std::string state_of(const SLibDPinInfo& pin) {
-    if (pin.type == PIN_TYPE_ALARM_OUTPUT) return "-";
+    if (pin.type == PIN_TYPE_ALARM_OUTPUT) return "not reported";
     return pin.state != 0 ? "active" : "inactive";
   }
 
   static std::string table_of(const std::vector<SLibDPinInfo>& pins) {
     std::string text;
     for (const SLibDPinInfo& pin : pins) {
-      text +=
-          fmt::format("{:>2}  {:<9}  {:<3}  {}\n", pin.number, kind_of(pin), switch_word(pin.enabled), state_of(pin));
+      text += fmt::format(kRow, pin.number, kind_of(pin), switch_word(pin.enabled), state_of(pin));
     }
     return text;
   }
@@ -104,19 +107,36 @@ class OutputCommand final : public Command {
 
   ExitCode run(Terminal& terminal) override {
     const std::optional<bool> on = switch_named(switch_);
-    if (!on) return terminal.report(usage("an output is switched on or off", "See vexactl output --help."));
+    if (!on) {
+      return terminal.report(usage(fmt::format("an output is switched on or off, not \"{}\"", printable(switch_)),
+                                   "See vexactl output --help."));
+    }
     if (number_ < 1) return terminal.report(usage("outputs are counted from 1", "vexactl io shows them."));
     const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
     if (!camera) return terminal.report(camera.error());
+    if (const auto problem = check_output(*camera)) return terminal.report(*problem);
     SLibDPinInfo pin;
     pin.number = number_;
     pin.type = PIN_TYPE_ALARM_OUTPUT;
     pin.state = *on ? 1 : 0;
     const ELibDReturnCode result = camera->device().SetOutput(pin);
-    return result == LIBD_OK ? ExitCode::kOk : terminal.report(camera->explain_change("output", result));
+    if (result != LIBD_OK) return terminal.report(camera->explain_change("output", result));
+    terminal.say(
+        fmt::format("vexactl: output {} of {} is switched {}", number_, to_string(camera->address()), switch_));
+    return ExitCode::kOk;
   }
 
  private:
+  // Cameras accept any number and do nothing with one they do not have. Of a model without a profile none is known.
+  [[nodiscard]] std::optional<Problem> check_output(const ModelCamera& camera) const {
+    const Profile& profile = camera.profile();
+    const int count = profile.ioBox.outputCount;
+    if (profile.name.empty() || number_ <= count) return std::nullopt;
+    if (count == 0) return model_lacks(camera, "alarm outputs");
+    return usage(fmt::format("cameras of model {} have no output {}", printable(profile.model), number_),
+                 count == 1 ? "They have one, 1." : fmt::format("They have outputs 1 to {}.", count));
+  }
+
   ModelOptions options_;
   int number_ = 0;
   std::string switch_;

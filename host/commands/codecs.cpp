@@ -76,7 +76,7 @@ class CodecsCommand final : public Command {
     const ELibDReturnCode result = camera->device().GetFixedCameraInfo(offer);
     if (result != LIBD_OK) return terminal.report(camera->explain(result));
     const Json json = to_json(offer);
-    return write_result(terminal, options_.camera.json ? to_text(json) : offer_table(json));
+    return write_result(terminal, options_.camera.json ? to_text(with_json_names(json)) : offer_table(json));
   }
 
  private:

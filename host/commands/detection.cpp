@@ -24,8 +24,9 @@ constexpr std::array<SettingWord<ELibDTamperLevel>, 3> kTamperLevels{
     {{"low", LIBD_TAMPER_LOW}, {"middle", LIBD_TAMPER_MIDDLE}, {"high", LIBD_TAMPER_HIGH}}};
 constexpr std::array<SettingWord<int>, 3> kObjectSizes{{{"small", 0}, {"middle", 1}, {"large", 2}}};
 
-Problem no_switch(const std::string& what) {
-  return usage(fmt::format("{} is switched on or off", what), fmt::format("See vexactl {} --help.", what));
+Problem no_switch(const std::string& what, const std::string& word) {
+  return usage(fmt::format("{} is switched on or off, not \"{}\"", what, printable(word)),
+               fmt::format("See vexactl {} --help.", what));
 }
 
 template <typename Words>
@@ -40,6 +41,33 @@ Json window_json(const SLibDDetectionWindow& window) {
   Json area = Json::array();
   for (const SLibDCommonPosition& point : window.area) area.push_back(Json::array({point.x, point.y}));
   return {{"enabled", window.enabled == 1}, {"mode", window.mode == 0 ? "detect" : "mask"}, {"area", area}};
+}
+
+std::string window_line(std::size_t number, const Json& window) {
+  const Json& area = window["area"];
+  std::string corners;
+  for (const Json& point : area) corners += fmt::format(" {},{}", point[0].get<int>(), point[1].get<int>());
+  return fmt::format("  window {}  {:<3}  {:<6} {}\n", number, switch_word(window["enabled"].get<bool>()),
+                     window["mode"].get<std::string>(), corners.empty() ? " -" : corners);
+}
+
+// One setting of a camera without windows, null or a list of settings with them.
+std::string detection_text(const Json& shown) {
+  if (shown.empty()) return "the camera has no detection settings\n";
+  if (shown.is_object()) {
+    return fmt::format("size         {}\nsensitivity  {}\n", shown["size"].get<std::string>(),
+                       shown["sensitivity"].get<int>());
+  }
+  std::string text;
+  for (const Json& setting : shown) {
+    text += fmt::format("setting {}: sensitivity {}, objects of {}x{} to {}x{}\n", setting["number"].get<int>(),
+                        setting["sensitivity"].get<int>(), setting["smallest"][0].get<int>(),
+                        setting["smallest"][1].get<int>(), setting["largest"][0].get<int>(),
+                        setting["largest"][1].get<int>());
+    std::size_t number = 0;
+    for (const Json& window : setting["windows"]) text += window_line(++number, window);
+  }
+  return text;
 }
 
 // The detection settings of a camera, and changing those of the current view.
@@ -86,7 +114,7 @@ class DetectionCommand final : public Command {
     Json list = Json::array();
     for (const SLibDDetectionParam& setting : settings) list.push_back(setting_json(camera, setting));
     if (camera.profile().lodDetection) list = list.empty() ? Json(nullptr) : list.front();
-    return write_result(terminal, options_.camera.json ? to_text(list) : list.dump(1, ' ') + "\n");
+    return write_result(terminal, options_.camera.json ? to_text(list) : detection_text(list));
   }
 
   static Json setting_json(const ModelCamera& camera, const SLibDDetectionParam& setting) {
@@ -118,7 +146,8 @@ class DetectionCommand final : public Command {
   ExitCode set(Terminal& terminal, const ModelCamera& camera, const std::vector<SLibDDetectionParam>& settings) const {
     SLibDDetectionParam param = chosen(camera, settings);
     if (size_ && !value_named(kObjectSizes, *size_)) {
-      return terminal.report(usage("unknown size", "Choose small, middle or large."));
+      return terminal.report(
+          usage(fmt::format("unknown size \"{}\"", printable(*size_)), "Choose small, middle or large."));
     }
     change(param);
     const ELibDReturnCode result = camera.device().SetDetectionParam(param);
@@ -175,9 +204,11 @@ class TamperingCommand final : public Command {
 
   ExitCode run(Terminal& terminal) override {
     const std::optional<bool> on = switch_named(switch_);
-    if (!on) return terminal.report(no_switch("tampering"));
+    if (!on) return terminal.report(no_switch("tampering", switch_));
     const auto level = value_named(kTamperLevels, level_);
-    if (!level) return terminal.report(usage("unknown level", "Choose low, middle or high."));
+    if (!level)
+      return terminal.report(
+          usage(fmt::format("unknown level \"{}\"", printable(level_)), "Choose low, middle or high."));
     const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
     if (!camera) return terminal.report(camera.error());
     const ELibDReturnCode result = camera->device().SetTamperingAlarm(*on, *level);
@@ -201,7 +232,7 @@ class AudioDetectionCommand final : public Command {
 
   ExitCode run(Terminal& terminal) override {
     const std::optional<bool> on = switch_named(switch_);
-    if (!on) return terminal.report(no_switch("audio-detection"));
+    if (!on) return terminal.report(no_switch("audio-detection", switch_));
     const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
     if (!camera) return terminal.report(camera.error());
     const ELibDReturnCode result = camera->device().SetAudioDetection(*on);

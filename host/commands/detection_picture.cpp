@@ -28,7 +28,7 @@ std::optional<Problem> draw_detection(const ModelCamera& camera, const SLibDDete
   draw_windows(*picture, setting);
   const auto bytes = encode_picture(*picture, picture_format_of(file).value_or(PictureFormat::kPng));
   if (!bytes) return bytes.error();
-  return write_whole_file(file, *bytes);
+  return write_whole_file(FrameFile(file), *bytes);
 }
 
 }  // namespace vexa::host

@@ -59,7 +59,8 @@ class CardModeAction final : public CameraAction {
   std::optional<Problem> check() override {
     const bool changes = watch_ || before_ || after_;
     if (!switch_.empty() && !switch_named(switch_)) {
-      return usage("recording is switched on or off", "For instance: vexactl edge CAMERA mode on --watch 192.168.0.2.");
+      return usage(fmt::format("recording is switched on or off, not \"{}\"", printable(switch_)),
+                   "For instance: vexactl edge CAMERA mode on --watch 192.168.0.2.");
     }
     if (switch_ != "on" && changes) {
       return usage("--watch, --before and --after belong to mode on",

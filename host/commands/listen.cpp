@@ -10,6 +10,8 @@
 #include <cstdint>
 #include <iterator>
 #include <nlohmann/json.hpp>
+#include <string>
+#include <vector>
 
 #include "host/base/printable.h"
 #include "host/camera/camera_options.h"
@@ -18,6 +20,7 @@
 #include "host/console/progress.h"
 #include "host/console/terminal.h"
 #include "host/recording/sound_file.h"
+#include "vexa/models.h"
 
 namespace vexa::host {
 namespace {
@@ -107,8 +110,10 @@ class ListenCommand final : public Command {
     SLibDAudioInfo sound;
     ELibDReturnCode result = codec_ ? switch_on(camera, *find_sound_codec(*codec_)) : LIBD_OK;
     if (result == LIBD_OK) result = camera.driver->GetAudioInfo(sound);
-    if (result != LIBD_OK) return terminal.report(camera.driver->explain(result));
-    if (sound.bitRate == 0) return terminal.report(no_sound());
+    if (result != LIBD_OK || sound.bitRate == 0) {
+      const Problem problem = result != LIBD_OK ? camera.driver->explain(result) : no_sound();
+      return terminal.report(of_a_silent_model(camera).value_or(problem));
+    }
     const SoundFormat format = sound_format_of(out_);
     if (format == SoundFormat::kWave && sound.codec != kCompanded) return terminal.report(no_wave(sound));
     Interrupt::finish_orderly();
@@ -135,6 +140,19 @@ class ListenCommand final : public Command {
 
   static Problem no_sound() {
     return {ExitCode::kNoVideo, "the camera's sound is off", "Switch it on, for instance with --codec g711_64."};
+  }
+
+  // Where the camera's model has no audio at all, as far as its profile is installed.
+  static std::optional<Problem> of_a_silent_model(OpenCamera& camera) {
+    SLibDSystemInfo system;
+    if (camera.driver->GetCurrentSystemInfo(system) != LIBD_OK) return std::nullopt;
+    const std::vector<std::string> installed = ProfileNames();
+    if (std::find(installed.begin(), installed.end(), system.modelName) == installed.end()) return std::nullopt;
+    Profile profile;
+    ProfileError error;
+    if (!LoadProfile(system.modelName, profile, error) || profile.audio.available != 0) return std::nullopt;
+    return usage(fmt::format("cameras of model {} have no audio", printable(system.modelName)),
+                 fmt::format("vexactl profile show {} lists what the model has.", system.modelName));
   }
 
   static Problem no_wave(const SLibDAudioInfo& sound) {

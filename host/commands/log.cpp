@@ -56,6 +56,7 @@ class LogView {
 
   ExitCode follow() {
     while (!Interrupt::requested()) {
+      if (const auto problem = check_reader(terminal_)) return terminal_.report(*problem);
       const std::size_t before = bytes_;
       const ExitCode code = read_to_end();
       if (code != ExitCode::kOk) return code;

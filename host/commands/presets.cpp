@@ -33,7 +33,8 @@ class OnePresetAction : public CameraAction {
       return terminal.report(
           usage(fmt::format("the camera has no preset {}", number_), fmt::format("It has presets 1 to {}.", count)));
     }
-    return report_change(camera, terminal, fmt::format("preset {}", number_), act(camera.device(), number_ - 1));
+    const ELibDReturnCode result = act(camera.device(), number_ - 1);
+    return result == LIBD_OK ? ExitCode::kOk : terminal.report(explain(camera, result));
   }
 
  protected:
@@ -42,6 +43,11 @@ class OnePresetAction : public CameraAction {
   }
   // `index` is the driver's, counted from 0.
   virtual ELibDReturnCode act(CLibraryDevice& device, int index) = 0;
+  // Why the action failed.
+  [[nodiscard]] virtual Problem explain(const ModelCamera& camera, ELibDReturnCode result) const {
+    return camera.explain_change(preset(), result);
+  }
+  [[nodiscard]] std::string preset() const { return fmt::format("preset {}", number_); }
 
  private:
   int number_ = 0;
@@ -81,6 +87,14 @@ class RecallPresetAction final : public OnePresetAction {
 
  private:
   ELibDReturnCode act(CLibraryDevice& device, int index) override { return device.RecallPreset(index); }
+  [[nodiscard]] Problem explain(const ModelCamera& camera, ELibDReturnCode result) const override {
+    if (result != LIBD_FAILED) return camera.explain_change(preset(), result);
+    Problem problem = camera.explain_change(preset(), result);
+    problem.text = fmt::format("the camera {} does not go to {}", to_string(camera.address()), preset());
+    problem.advice =
+        "A preset that was never stored cannot be recalled: vexactl preset CAMERA list shows those stored.";
+    return problem;
+  }
 };
 
 class ClearPresetAction final : public OnePresetAction {
@@ -117,7 +131,8 @@ class ListPresetsAction final : public CameraAction {
       list.push_back({{"preset", preset.index + 1}, {"name", preset.name}});
       table += fmt::format("{:>3}  {}\n", preset.index + 1, preset.name.empty() ? "-" : printable(preset.name));
     }
-    return write_result(terminal, json() ? to_text(list) : table);
+    if (json()) return write_result(terminal, to_text(list));
+    return write_table(terminal, "  #  name\n", table);
   }
 
  private:

@@ -126,7 +126,8 @@ class ProfileCommand final : public Command {
       return terminal.report({ExitCode::kUsage, "there are no installed profiles",
                               "Give profiles as files, or install the package whole."});
     }
-    return write_result(terminal, json_ ? to_text(json) : table);
+    if (json_) return write_result(terminal, to_text(json));
+    return write_table(terminal, fmt::format("{:<12}{}\n", "profile", "description"), table);
   }
 
   ExitCode show(Terminal& terminal) const {
@@ -134,7 +135,7 @@ class ProfileCommand final : public Command {
     ProfileError error;
     if (!LoadProfile(profile_, profile, error)) return terminal.report(wrong_profile(error));
     const Json json = to_json(profile);
-    if (json_) return write_result(terminal, to_text(json));
+    if (json_) return write_result(terminal, to_text(with_json_names(json)));
     std::string table;
     for (const auto& [key, value] : json.items()) table += fmt::format("{:<15}{}\n", key, text_of(value));
     return write_result(terminal, table);

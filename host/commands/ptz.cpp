@@ -7,6 +7,7 @@
 #include <functional>
 
 #include "host/base/number_text.h"
+#include "host/base/printable.h"
 #include "host/commands/action_group.h"
 #include "host/commands/ptz_watch.h"
 #include "host/console/interrupt.h"
@@ -93,7 +94,8 @@ class TurnAction final : public CameraAction {
 
   std::optional<Problem> check() override {
     if (direction_ != words_.backward && direction_ != words_.forward) {
-      return usage("unknown direction", fmt::format("It is {} or {}.", words_.backward, words_.forward));
+      return usage(fmt::format("unknown direction \"{}\"", printable(direction_)),
+                   fmt::format("It is {} or {}.", words_.backward, words_.forward));
     }
     return move_.check();
   }

@@ -34,8 +34,8 @@ std::string view_line(const PtzView& view, const std::string& moment, WatchForma
   return Json{{"time", moment},
               {"pan", view.pan},
               {"tilt", view.tilt},
-              {"horizontal-angle", view.horizontal_angle},
-              {"vertical-angle", view.vertical_angle},
+              {"horizontalAngle", view.horizontal_angle},
+              {"verticalAngle", view.vertical_angle},
               {"zoom", view.magnification},
               {"moving", view.moving}}
              .dump() +
@@ -73,6 +73,7 @@ class WatchAction final : public CameraAction {
     const auto give_up = Clock::now() + kLongestWaitForPosition;
     for (std::uint64_t lines = 0; count_ == 0 || lines < count_;) {
       if (Interrupt::requested()) return ExitCode::kInterrupted;
+      if (const auto problem = check_reader(terminal)) return terminal.report(*problem);
       if (pictures.poll() == LivePictures::Polled::kSilent) return terminal.report(silent_camera());
       SLibDPTZStatus status;
       const bool told = camera.device().GetCurrentPosition(status) == LIBD_OK;

@@ -31,6 +31,7 @@ struct RecordOptions {
   std::optional<double> seconds;
   std::optional<std::int64_t> frames;
   std::string out;
+  std::optional<std::string> format;
   VideoOptions video;
   bool quiet = false;
 };
@@ -116,12 +117,15 @@ class RecordCommand final : public Command {
                      "file to write: .mkv or .mp4, or the pictures alone: .h264, .m4v, .mjpeg; - is standard output")
         ->required()
         ->type_name("FILE");
+    command->add_option("--format", options_.format, "mkv, mp4, h264, m4v or mjpeg, whatever --out ends in")
+        ->type_name("WORD");
     command->add_option("--seconds", options_.seconds, "end after this many seconds of video")->type_name("N");
     command->add_option("--frames", options_.frames, "end after this many frames")->type_name("N");
     add_video_options(*command, options_.video);
     command->add_flag("--quiet", options_.quiet, "show no progress");
     command->footer(
         "A recording begins with the first key frame and, without --seconds and --frames, ends with Ctrl-C.\n"
+        "Every second of it is written at once: what is killed plays up to its last second.\n"
         "Drops are an estimate: frames expected at the rate that stream or camera state, less those received.");
     return command;
   }
@@ -129,7 +133,7 @@ class RecordCommand final : public Command {
   ExitCode run(Terminal& terminal) override {
     if (const auto problem = check(options_)) return terminal.report(*problem);
     if (options_.quiet) terminal.silence_progress();
-    const RecordingTarget target(options_.out, terminal.results());
+    const RecordingTarget target(options_.out, terminal.results(), options_.format);
     if (const auto problem = target.check()) return terminal.report(*problem);
     options_.camera.transport = transport_of(options_.video);
     Result<OpenCamera> opened = open_camera(options_.camera, terminal);

@@ -30,7 +30,7 @@ class SettingsCommand final : public Command {
     if (!opened) return terminal.report(opened.error());
     const Result<Json> json = read_settings(*opened);
     if (!json) return terminal.report(json.error());
-    return write_result(terminal, options_.camera.json ? to_text(*json) : settings_table(*json));
+    return write_result(terminal, options_.camera.json ? to_text(with_json_names(*json)) : settings_table(*json));
   }
 
  private:
@@ -60,7 +60,7 @@ class SetCommand final : public Command {
     }
     const Result<Json> json = read_settings(*camera);
     if (!json) return terminal.report(json.error());
-    return write_result(terminal, options_.camera.json ? to_text(*json) : settings_table(*json));
+    return write_result(terminal, options_.camera.json ? to_text(with_json_names(*json)) : settings_table(*json));
   }
 
  private:
@@ -81,7 +81,8 @@ class DayNightCommand final : public Command {
     SettingChanges changes;
     if (mode_) changes.day_night = parse_day_night(*mode_);
     if (mode_ && !changes.day_night) {
-      return terminal.report({ExitCode::kUsage, "unknown day/night mode", "Choose auto, day or night."});
+      return terminal.report(
+          usage(fmt::format("unknown day/night mode \"{}\"", printable(*mode_)), "Choose auto, day or night."));
     }
     const Result<ModelCamera> camera = ModelCamera::open(options_, terminal);
     if (!camera) return terminal.report(camera.error());
@@ -99,7 +100,7 @@ class DayNightCommand final : public Command {
                               "vexactl settings shows what the camera has."});
     }
     if (result != LIBD_OK) return terminal.report(camera.explain(result));
-    return write_result(terminal, options_.camera.json ? to_text(Json{{"day-night", *word}}) : *word + "\n");
+    return write_result(terminal, options_.camera.json ? to_text(Json{{"dayNight", *word}}) : *word + "\n");
   }
 
   ModelOptions options_;

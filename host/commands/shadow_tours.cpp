@@ -48,11 +48,11 @@ class ShowShadowsAction final : public CameraAction {
   static Json json_of(const SLibDShadowTourInfo& info) {
     Json tours = Json::array();
     for (const auto& [number, tour] : info.tours) {
-      tours.push_back({{"tour", number}, {"enabled", tour.enabled}, {"recorded-time", tour.recordedTime}});
+      tours.push_back({{"tour", number}, {"enabled", tour.enabled}, {"recordedSeconds", tour.recordedTime}});
     }
     return {{"enabled", info.enabled},
-            {"resume-seconds", info.resumeTime > 0 ? Json(info.resumeTime) : Json(nullptr)},
-            {"longest-recording", info.maxRecordTime},
+            {"resumeSeconds", info.resumeTime > 0 ? Json(info.resumeTime) : Json(nullptr)},
+            {"longestRecordingSeconds", info.maxRecordTime},
             {"tours", tours}};
   }
 };

@@ -23,7 +23,12 @@ class SnapshotCommand final : public Command {
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
     CLI::App* command = program.add_subcommand("snapshot", "Save one picture of live video");
     add_camera_options(*command, camera_, environment);
-    command->add_option("--out", out_, "file to write: .jpg, .jpeg or .png")->required()->type_name("FILE");
+    command->add_option("--out", out_, "file to write: .jpg, .jpeg or .png; - is standard output")
+        ->required()
+        ->type_name("FILE");
+    command->add_option("--format", format_, "jpg or png, whatever --out ends in; jpg for standard output")
+        ->type_name("WORD")
+        ->check(CLI::IsMember({"jpg", "png"}));
     add_video_options(*command, video_);
     command->footer(
         "A .jpg of a JPEG stream is the picture as the camera sent it. Everything else is decoded first, for which\n"
@@ -32,10 +37,10 @@ class SnapshotCommand final : public Command {
   }
 
   ExitCode run(Terminal& terminal) override {
-    const auto format = picture_format_of(out_);
+    const auto format = format_of_picture();
     if (!format) return terminal.report(usage("--out names no picture", "For instance: --out live.jpg, or live.png."));
     if (const auto problem = check_video_options(video_)) return terminal.report(*problem);
-    if (const auto problem = FrameFile(out_).check()) return terminal.report(*problem);
+    if (const auto problem = target(terminal).check()) return terminal.report(*problem);
     camera_.transport = transport_of(video_);
     Result<OpenCamera> opened = open_camera(camera_, terminal);
     if (!opened) return terminal.report(opened.error());
@@ -43,6 +48,18 @@ class SnapshotCommand final : public Command {
   }
 
  private:
+  [[nodiscard]] bool to_standard_output() const { return out_ == "-"; }
+
+  [[nodiscard]] std::optional<PictureFormat> format_of_picture() const {
+    if (out_.empty()) return std::nullopt;
+    if (format_.empty()) return to_standard_output() ? PictureFormat::kJpeg : picture_format_of(out_);
+    return format_ == "png" ? PictureFormat::kPng : PictureFormat::kJpeg;
+  }
+
+  [[nodiscard]] FrameFile target(const Terminal& terminal) const {
+    return to_standard_output() ? FrameFile("standard output", terminal.results()) : FrameFile(out_);
+  }
+
   ExitCode take(OpenCamera& camera, PictureFormat format, Terminal& terminal) {
     terminal.progress("connecting");
     const Result<LiveCamera::Identity> identity = camera.driver->identify(video_.stream);
@@ -54,7 +71,7 @@ class SnapshotCommand final : public Command {
     terminal.progress("waiting for a key picture");
     const Result<FrameBytes> bytes = newest_picture(*camera.driver, format);
     if (!bytes) return terminal.report(bytes.error());
-    if (const auto problem = write_whole_file(out_, *bytes)) return terminal.report(*problem);
+    if (const auto problem = write_whole_file(target(terminal), *bytes)) return terminal.report(*problem);
     return summarise(camera, *identity, bytes->size(), terminal);
   }
 
@@ -72,17 +89,24 @@ class SnapshotCommand final : public Command {
   ExitCode summarise(const OpenCamera& camera, const LiveCamera::Identity& identity, std::size_t size,
                      Terminal& terminal) const {
     const std::string codec = printable(identity.video.codecName);
-    if (!camera_.json) return write_result(terminal, fmt::format("{}: {} bytes, from {} video\n", out_, size, codec));
-    return write_result(terminal, to_text({{"camera", to_string(camera.address)},
-                                           {"modelName", identity.system.modelName},
-                                           {"file", out_},
-                                           {"codec", identity.video.codecName},
-                                           {"bytes", size}}));
+    std::string text = fmt::format("{}: {} bytes, from {} video\n", out_, size, codec);
+    if (camera_.json) {
+      text = to_text({{"camera", to_string(camera.address)},
+                      {"modelName", identity.system.modelName},
+                      {"file", out_},
+                      {"codec", identity.video.codecName},
+                      {"bytes", size}});
+    }
+    if (!to_standard_output()) return write_result(terminal, text);
+    text.pop_back();
+    terminal.say(text);
+    return ExitCode::kOk;
   }
 
   CameraOptions camera_;
   VideoOptions video_;
   std::string out_;
+  std::string format_;
 };
 
 }  // namespace

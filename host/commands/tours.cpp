@@ -55,11 +55,11 @@ class ShowToursAction final : public CameraAction {
       tours.push_back({{"tour", number},
                        {"enabled", tour.enabled},
                        {"presets", tour.sequence},
-                       {"stay-seconds", tour.stayTime},
+                       {"staySeconds", tour.stayTime},
                        {"speed", tour.speed}});
     }
     return {{"enabled", info.enabled},
-            {"resume-seconds", info.resumeTime > 0 ? Json(info.resumeTime) : Json(nullptr)},
+            {"resumeSeconds", info.resumeTime > 0 ? Json(info.resumeTime) : Json(nullptr)},
             {"tours", tours}};
   }
 };

@@ -2,8 +2,11 @@
 #include "host/console/terminal.h"
 
 #include <fmt/format.h>
+#include <poll.h>
 #include <unistd.h>
 
+#include <cerrno>
+#include <string>
 #include <system_error>
 
 #include "host/base/unique_fd.h"
@@ -16,11 +19,25 @@ constexpr std::string_view kEraseLine = "\r\x1b[K";
 // A failure of standard error itself cannot be reported.
 void write_error_text(std::string_view text) { (void)write_all(STDERR_FILENO, text.data(), text.size()); }
 
+Problem unwritable(int error) {
+  return {ExitCode::kCannotWrite,
+          fmt::format("cannot write standard output: {}", std::generic_category().message(error)),
+          "Check where it is redirected to."};
+}
+
 }  // namespace
 
-Terminal::Terminal(UniqueFd results) : results_(std::move(results)), shows_progress_(isatty(STDERR_FILENO) == 1) {}
+Terminal::Terminal(UniqueFd results)
+    : results_(std::move(results)),
+      results_on_terminal_(isatty(results_.get()) == 1),
+      shows_progress_(isatty(STDERR_FILENO) == 1) {}
 
 Terminal::~Terminal() { clear_progress(); }
+
+bool Terminal::reader_gone() const {
+  pollfd reader{results_.get(), 0, 0};
+  return poll(&reader, 1, 0) == 1 && (reader.revents & (POLLERR | POLLHUP)) != 0;
+}
 
 int Terminal::write_result(std::string_view text) { return write_all(results_.get(), text.data(), text.size()); }
 
@@ -61,10 +78,16 @@ void Terminal::erase_progress_locked() {
 ExitCode write_result(Terminal& terminal, std::string_view text) {
   terminal.clear_progress();
   const int error = terminal.write_result(text);
-  if (error == 0) return ExitCode::kOk;
-  return terminal.report({ExitCode::kCannotWrite,
-                          fmt::format("cannot write standard output: {}", std::generic_category().message(error)),
-                          "Check where it is redirected to."});
+  return error == 0 ? ExitCode::kOk : terminal.report(unwritable(error));
+}
+
+ExitCode write_table(Terminal& terminal, std::string_view heading, std::string_view rows) {
+  if (!terminal.results_on_terminal()) return write_result(terminal, rows);
+  return write_result(terminal, std::string(heading) + std::string(rows));
+}
+
+std::optional<Problem> check_reader(const Terminal& terminal) {
+  return terminal.reader_gone() ? std::optional(unwritable(EPIPE)) : std::nullopt;
 }
 
 }  // namespace vexa::host

@@ -4,6 +4,7 @@
 #define HOST_CONSOLE_TERMINAL_H_
 
 #include <mutex>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -23,6 +24,11 @@ class Terminal {
   Terminal& operator=(const Terminal&) = delete;
 
   [[nodiscard]] int results() const { return results_.get(); }
+  // Whether a person reads the results, so that tables have headings.
+  [[nodiscard]] bool results_on_terminal() const { return results_on_terminal_; }
+  // Whether nobody reads the results any more: a pipe's other end is closed. A command that waits asks now and then,
+  // since only a write would find out otherwise.
+  [[nodiscard]] bool reader_gone() const;
   // Returns 0, or the error's number.
   [[nodiscard]] int write_result(std::string_view text);
 
@@ -41,6 +47,7 @@ class Terminal {
   void erase_progress_locked();
 
   UniqueFd results_;
+  bool results_on_terminal_;
   bool shows_progress_;
   std::mutex mutex_;
   std::string progress_;
@@ -48,6 +55,12 @@ class Terminal {
 
 // Writes it to standard output; reports a failure and returns its exit code.
 [[nodiscard]] ExitCode write_result(Terminal& terminal, std::string_view text);
+
+// A table's rows; on a terminal its heading above them. Scripts read rows alone.
+[[nodiscard]] ExitCode write_table(Terminal& terminal, std::string_view heading, std::string_view rows);
+
+// The problem of results that nobody reads any more, as a write would meet it.
+[[nodiscard]] std::optional<Problem> check_reader(const Terminal& terminal);
 
 }  // namespace vexa::host
 

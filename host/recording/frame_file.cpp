@@ -73,8 +73,7 @@ std::optional<Problem> FrameFile::close() {
   return std::nullopt;
 }
 
-std::optional<Problem> write_whole_file(const std::string& path, const std::vector<std::uint8_t>& bytes) {
-  FrameFile file(path);
+std::optional<Problem> write_whole_file(FrameFile&& file, const std::vector<std::uint8_t>& bytes) {
   if (auto problem = file.write(bytes.data(), bytes.size())) return problem;
   return file.close();
 }

@@ -40,8 +40,8 @@ class FrameFile final : public PictureTarget {
   UniqueFd file_;
 };
 
-// A whole file at once; a former one is replaced.
-[[nodiscard]] std::optional<Problem> write_whole_file(const std::string& path, const std::vector<std::uint8_t>& bytes);
+// Writes a whole file at once and closes it; a former one is replaced.
+[[nodiscard]] std::optional<Problem> write_whole_file(FrameFile&& file, const std::vector<std::uint8_t>& bytes);
 
 }  // namespace vexa::host
 

@@ -14,6 +14,7 @@
 #include <algorithm>
 #include <cstring>
 
+#include "host/base/unique_fd.h"
 #include "host/picture/ffmpeg_handles.h"
 
 extern "C" {
@@ -44,6 +45,7 @@ std::optional<Problem> MediaContainer::close() { return std::nullopt; }
 namespace {
 
 constexpr AVRational kMicroseconds{1, 1000000};
+constexpr int kPipeBuffer = 65536;
 
 const char* muxer_name(ContainerFormat format) {
   switch (format) {
@@ -67,7 +69,7 @@ class MediaContainer::Muxer {
   Muxer() = default;
   ~Muxer() {
     if (context_ == nullptr) return;
-    avio_closep(&context_->pb);
+    (void)close_output();
     avformat_free_context(context_);
   }
   Muxer(const Muxer&) = delete;
@@ -87,9 +89,9 @@ class MediaContainer::Muxer {
     stream_->codecpar->height = video->height;
     stream_->time_base = {1, 90000};  // MP4 takes it, Matroska has its own
     take_headers(first);
-    // Named so that no part of the path is taken for a protocol.
-    result = avio_open(&context_->pb, ("file:" + file.path_).c_str(), AVIO_FLAG_WRITE);
-    if (result >= 0) result = avformat_write_header(context_, nullptr);
+    context_->flags |= AVFMT_FLAG_FLUSH_PACKETS;
+    result = open_output(file);
+    if (result >= 0) result = write_header(file.format_);
     if (result < 0) return unwritten(file.path_, result);
     begun_ = true;
     return std::nullopt;
@@ -110,11 +112,51 @@ class MediaContainer::Muxer {
   [[nodiscard]] int finish() {
     if (!std::exchange(begun_, false)) return 0;
     const int ended = av_write_trailer(context_);
-    const int closed = avio_closep(&context_->pb);
-    return std::min(ended, closed);
+    return std::min(ended, close_output());
   }
 
  private:
+  // Named so that no part of the path is taken for a protocol. A pipe is written by our own function: FFmpeg's would
+  // not wait where the pipe has been made non-blocking.
+  [[nodiscard]] int open_output(const MediaContainer& file) {
+    if (file.given_fd_ < 0) return avio_open(&context_->pb, ("file:" + file.path_).c_str(), AVIO_FLAG_WRITE);
+    pipe_ = file.given_fd_;
+    auto* buffer = static_cast<unsigned char*>(av_malloc(kPipeBuffer));
+    if (buffer == nullptr) return AVERROR(ENOMEM);
+    context_->pb = avio_alloc_context(buffer, kPipeBuffer, 1, &pipe_, nullptr, write_pipe, nullptr);
+    if (context_->pb != nullptr) return 0;
+    av_free(buffer);
+    return AVERROR(ENOMEM);
+  }
+
+  static int write_pipe(void* pipe, std::uint8_t* data, int length) {
+    const int error = write_all(*static_cast<const int*>(pipe), data, static_cast<std::size_t>(length));
+    return error == 0 ? length : AVERROR(error);
+  }
+
+  [[nodiscard]] int close_output() {
+    if (pipe_ < 0 || context_->pb == nullptr) return avio_closep(&context_->pb);
+    avio_flush(context_->pb);
+    const int error = context_->pb->error;
+    av_freep(&context_->pb->buffer);
+    avio_context_free(&context_->pb);
+    return error;
+  }
+
+  // A second of video is what a program that is killed may lose.
+  [[nodiscard]] int write_header(ContainerFormat format) {
+    AVDictionary* options = nullptr;
+    if (format == ContainerFormat::kMatroska) {
+      av_dict_set(&options, "cluster_time_limit", "1000", 0);  // milliseconds
+    } else {
+      av_dict_set(&options, "movflags", "empty_moov+default_base_moof", 0);
+      av_dict_set(&options, "frag_duration", "1000000", 0);  // microseconds
+    }
+    const int result = avformat_write_header(context_, &options);
+    av_dict_free(&options);
+    return result;
+  }
+
   // What a container keeps of the first picture, to be read before any picture: H.264's parameter sets, MPEG-4's
   // headers. JPEG has none, and a stream without them is written as it is.
   void take_headers(const RecordedPicture& first) {
@@ -153,9 +195,10 @@ class MediaContainer::Muxer {
   std::optional<std::chrono::microseconds> began_;
   std::int64_t last_ = -1;
   bool begun_ = false;  // the header is written
+  int pipe_ = -1;       // what a pipe's pictures go to
 };
 
-std::optional<Problem> MediaContainer::check() const { return FrameFile(path_).check(); }
+std::optional<Problem> MediaContainer::check() const { return FrameFile(path_, given_fd_).check(); }
 
 std::optional<Problem> MediaContainer::write(const RecordedPicture& picture) {
   if (!muxer_) {
@@ -176,7 +219,11 @@ std::optional<Problem> MediaContainer::close() {
 
 #endif
 
-MediaContainer::MediaContainer(std::string path, ContainerFormat format) : path_(std::move(path)), format_(format) {}
+MediaContainer::MediaContainer(std::string path, ContainerFormat format)
+    : MediaContainer(std::move(path), format, -1) {}
+
+MediaContainer::MediaContainer(std::string name, ContainerFormat format, int open_fd)
+    : path_(std::move(name)), format_(format), given_fd_(open_fd) {}
 
 MediaContainer::~MediaContainer() = default;
 

@@ -18,11 +18,14 @@ enum class ContainerFormat { kMatroska, kMp4 };
 [[nodiscard]] std::optional<ContainerFormat> container_format_of(std::string_view file);
 
 // The file is opened with the first picture, whose codec is that of the video. Times count from that picture, to the
-// millisecond in Matroska and to 1/90000 s in MP4; two pictures never have the same. A file that is not closed may lack
-// its index.
+// millisecond in Matroska and to 1/90000 s in MP4; two pictures never have the same. Every second of video is written
+// whole, so that what a program leaves that is killed plays up to its last second; MP4 is fragmented for that. A file
+// that is not closed lacks its index.
 class MediaContainer final : public PictureTarget {
  public:
   MediaContainer(std::string path, ContainerFormat format);
+  // Writes to a descriptor that is already open, and leaves it open.
+  MediaContainer(std::string name, ContainerFormat format, int open_fd);
   ~MediaContainer() override;
 
   [[nodiscard]] std::optional<Problem> check() const override;
@@ -35,6 +38,7 @@ class MediaContainer final : public PictureTarget {
 
   const std::string path_;
   const ContainerFormat format_;
+  const int given_fd_ = -1;
   std::unique_ptr<Muxer> muxer_;  // null before the first picture
 };
 

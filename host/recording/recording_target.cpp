@@ -1,49 +1,80 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "host/recording/recording_target.h"
 
+#include <fmt/format.h>
+
 #include <algorithm>
 #include <iterator>
+#include <string_view>
 
 #include "host/base/file_extension.h"
+#include "host/base/printable.h"
 #include "host/recording/frame_file.h"
 #include "host/recording/media_container.h"
 
 namespace vexa::host {
 namespace {
 
-struct CodecExtension {
-  const char* extension;
-  Codec codec;
+struct Format {
+  std::string_view word;
+  std::string_view extension;
+  std::optional<Codec> codec;
+  std::optional<ContainerFormat> container;
 };
 
-// The first of a codec is the usual one.
-constexpr CodecExtension kExtensions[] = {{".h264", Codec::kH264},
-                                          {".264", Codec::kH264},
-                                          {".m4v", Codec::kMpeg4},
-                                          {".mjpeg", Codec::kJpeg},
-                                          {".mjpg", Codec::kJpeg}};
+// The first extension of a codec is the usual one.
+constexpr Format kFormats[] = {{"mkv", ".mkv", std::nullopt, ContainerFormat::kMatroska},
+                               {"mp4", ".mp4", std::nullopt, ContainerFormat::kMp4},
+                               {"h264", ".h264", Codec::kH264, std::nullopt},
+                               {"h264", ".264", Codec::kH264, std::nullopt},
+                               {"m4v", ".m4v", Codec::kMpeg4, std::nullopt},
+                               {"mjpeg", ".mjpeg", Codec::kJpeg, std::nullopt},
+                               {"mjpeg", ".mjpg", Codec::kJpeg, std::nullopt}};
+
+constexpr char kWords[] = "mkv, mp4, h264, m4v or mjpeg";
+
+const Format* find_format(const std::string& out, const std::optional<std::string>& word) {
+  const auto* found = std::find_if(std::begin(kFormats), std::end(kFormats), [&](const Format& format) {
+    return word ? format.word == *word : has_extension(out, format.extension);
+  });
+  return found == std::end(kFormats) ? nullptr : found;
+}
 
 }  // namespace
 
-std::optional<Problem> RecordingTarget::check() const { return open()->check(); }
+std::optional<Problem> RecordingTarget::check() const {
+  if (find_format(out_, format_) == nullptr) {
+    if (format_)
+      return usage(fmt::format("unknown format \"{}\"", printable(*format_)), fmt::format("Choose {}.", kWords));
+    if (!is_standard_output()) {
+      return usage(fmt::format("the end of {} names no format of video", printable(out_)),
+                   fmt::format("End --out in .mkv, .mp4, .h264, .m4v or .mjpeg, or give --format {}.", kWords));
+    }
+  }
+  return open()->check();
+}
 
 std::optional<Codec> RecordingTarget::codec() const {
-  for (const CodecExtension& row : kExtensions) {
-    if (has_extension(out_, row.extension)) return row.codec;
-  }
-  return std::nullopt;
+  const Format* format = find_format(out_, format_);
+  return format != nullptr ? format->codec : std::nullopt;
 }
 
 std::unique_ptr<PictureTarget> RecordingTarget::open() const {
-  if (is_standard_output()) return std::make_unique<FrameFile>("standard output", standard_output_);
-  if (const auto format = container_format_of(out_)) return std::make_unique<MediaContainer>(out_, *format);
+  constexpr char kStandardOutput[] = "standard output";
+  const Format* format = find_format(out_, format_);
+  const bool contained = format != nullptr && format->container;
+  if (contained && is_standard_output()) {
+    return std::make_unique<MediaContainer>(kStandardOutput, *format->container, standard_output_);
+  }
+  if (contained) return std::make_unique<MediaContainer>(out_, *format->container);
+  if (is_standard_output()) return std::make_unique<FrameFile>(kStandardOutput, standard_output_);
   return std::make_unique<FrameFile>(out_);
 }
 
 std::string usual_extension(Codec codec) {
-  return std::find_if(std::begin(kExtensions), std::end(kExtensions),
-                      [codec](const CodecExtension& row) { return row.codec == codec; })
-      ->extension;
+  return std::string(std::find_if(std::begin(kFormats), std::end(kFormats), [codec](const Format& row) {
+                       return row.codec == codec;
+                     })->extension);
 }
 
 }  // namespace vexa::host

@@ -6,6 +6,7 @@
 #include <algorithm>
 
 #include "host/base/number_text.h"
+#include "host/base/printable.h"
 
 namespace vexa::host {
 namespace {
@@ -95,11 +96,13 @@ Result<SettingChanges> parse_changes(const std::vector<std::string>& texts) {
   for (const std::string& text : texts) {
     const std::size_t equals = text.find('=');
     if (equals == std::string::npos) {
-      return fail(usage("a setting is not KEY=VALUE", "For instance: codec=H.264 size=1280x720."));
+      return fail(
+          usage(fmt::format("\"{}\" is not KEY=VALUE", printable(text)), "For instance: codec=H.264 size=1280x720."));
     }
     const SettingKey* key = find_key(std::string_view(text).substr(0, equals));
     if (key == nullptr) {
-      return fail(usage("unknown setting", fmt::format("The settings are: {}.", known_keys())));
+      return fail(usage(fmt::format("unknown setting \"{}\"", printable(text.substr(0, equals))),
+                        fmt::format("The settings are: {}.", known_keys())));
     }
     if (std::find(seen.begin(), seen.end(), key->key) != seen.end()) {
       return fail(usage(fmt::format("{} is given twice", key->key), "Give each setting once."));

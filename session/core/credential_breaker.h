@@ -30,6 +30,8 @@ class CredentialBreaker {
   /// What came of a request that was sent after kGo or kTry.
   void accepted();
   void refused(Moment now);
+  /// A connection that used them has ended: they may have changed meanwhile, and one holder finds out.
+  void doubt() { confirmed_ = false; }
   /// A try that ended before the camera had judged the credentials, for instance without an answer.
   void abandoned() { trying_ = false; }
   /// The host wants one more try, now.
@@ -42,7 +44,7 @@ class CredentialBreaker {
  private:
   std::string password_;
   bool known_good_ = false;  ///< accepted since the password was set
-  bool confirmed_ = false;   ///< known good, and not refused since
+  bool confirmed_ = false;   ///< known good, and neither refused nor in doubt since
   bool refused_ = false;
   bool trying_ = false;
   std::size_t refusals_ = 0;  ///< since they were last accepted

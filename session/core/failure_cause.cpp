@@ -19,6 +19,7 @@ constexpr Phrase kPhrases[] = {{"unauthorized", SessionCause::kCredentials},
                                {"service unavailable", SessionCause::kBusy},
                                {"too many", SessionCause::kBusy},
                                {"not found", SessionCause::kNotFound},
+                               {"no such stream", SessionCause::kNotFound},
                                {"gone", SessionCause::kNotFound},
                                {"unsupported", SessionCause::kUnsupported},
                                {"not implemented", SessionCause::kUnsupported},
@@ -43,10 +44,10 @@ bool contains(const std::string& text, const std::string& part) {
 
 SessionCause cause_of(ELibDReturnCode code, const std::string& text) {
   if (code == LIBD_UNAUTHORIZED) return SessionCause::kCredentials;
-  if (code == LIBD_NOT_SUPPORTED) return SessionCause::kUnsupported;
   const auto* found = std::find_if(std::begin(kPhrases), std::end(kPhrases),
                                    [&text](const Phrase& phrase) { return contains(text, phrase.part); });
   if (found != std::end(kPhrases)) return found->cause;
+  if (code == LIBD_NOT_SUPPORTED || code == LIBD_INVALID_ARGUMENT) return SessionCause::kUnsupported;
   // An answer that never begins leaves no text.
   return code == LIBD_TIMEOUT || text.empty() ? SessionCause::kNoAnswer : SessionCause::kFailed;
 }

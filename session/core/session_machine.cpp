@@ -8,6 +8,12 @@
 #include "session/core/why_not_live.h"
 
 namespace vexa {
+namespace {
+
+// Routes may come and go in a flood.
+constexpr Moment kBetweenLinks{1000};
+
+}  // namespace
 
 void SessionMachine::start(Moment now) {
   if (started_) return;
@@ -22,7 +28,7 @@ void SessionMachine::stop(Moment now) {
 }
 
 void SessionMachine::retry(Moment now) {
-  if (!started_ || stopping_ || line_ != Line::kClosed) return;
+  if (!started_ || stopping_ || line_ == Line::kOpening || line_ == Line::kOpen) return;
   back_off_.reset();
   due_ = now;
 }
@@ -98,7 +104,9 @@ void SessionMachine::stream_changed(Moment now) {
 void SessionMachine::link_back(Moment now) {
   const bool waits = status().state == SessionState::kWaiting && !stopping_ && line_ == Line::kClosed;
   const SessionCause cause = status().cause;
-  if (waits && cause != SessionCause::kTurn && cause != SessionCause::kOtherTrial) due_ = now;
+  if (!waits || cause == SessionCause::kTurn || cause == SessionCause::kOtherTrial) return;
+  if (now - link_back_ < kBetweenLinks) return;
+  link_back_ = due_ = now;
 }
 
 void SessionMachine::credentials_changed(Moment now) {

@@ -56,7 +56,7 @@ class SessionMachine {
   /// The stream of a live session has another codec, size or clock than before.
   void stream_changed(Moment now);
   void evidence(const MediaEvidence& latest) { seen_ = latest; }
-  /// Link or route is back: what waits for an answer of the camera tries at once.
+  /// Link or route is back: what waits for an answer of the camera tries at once, yet once a second at most.
   void link_back(Moment now);
   /// Whatever was open is closed.
   void closed(Moment now);
@@ -91,7 +91,8 @@ class SessionMachine {
   bool started_ = false;
   bool stopping_ = false;
   std::uint32_t attempt_ = 0;
-  Moment due_ = kNever;  ///< the next attempt
+  Moment due_ = kNever;      ///< the next attempt
+  Moment link_back_{-1000};  ///< that was followed by an attempt
   Moment opened_{0};
   bool has_picture_ = false;  ///< since it was opened
   Moment last_picture_{0};

@@ -7,12 +7,15 @@
 #include <pty.h>
 #include <spawn.h>
 #include <sys/wait.h>
+#include <termios.h>
 #include <unistd.h>
 
 #include <chrono>
 #include <csignal>
+#include <cstdint>
 #include <cstdio>
 #include <functional>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <thread>
@@ -34,15 +37,19 @@ class ProgramRun {
  public:
   enum class StandardError { kFile, kTerminal };
 
-  // The program's folder is `folder`, and its environment just `environment`.
+  // The program's folder is `folder`, and its environment just `environment`. Its standard output is `standard_output`
+  // where that is a descriptor, which stays the caller's; else a file. Its standard input likewise; else empty.
   ProgramRun(const TemporaryFolder& folder, std::vector<std::string> arguments,
-             std::vector<std::string> environment = {}, StandardError standard_error = StandardError::kFile)
+             std::vector<std::string> environment = {}, StandardError standard_error = StandardError::kFile,
+             int standard_output = -1, int standard_input = -1)
       : out_(folder / ".out"), err_(folder / ".err") {
     posix_spawn_file_actions_t actions;
     posix_spawn_file_actions_init(&actions);
     const int create = O_WRONLY | O_CREAT | O_TRUNC;
     posix_spawn_file_actions_addopen(&actions, STDIN_FILENO, "/dev/null", O_RDONLY, 0);
+    if (standard_input >= 0) posix_spawn_file_actions_adddup2(&actions, standard_input, STDIN_FILENO);
     posix_spawn_file_actions_addopen(&actions, STDOUT_FILENO, out_.c_str(), create, 0600);
+    if (standard_output >= 0) posix_spawn_file_actions_adddup2(&actions, standard_output, STDOUT_FILENO);
     if (standard_error == StandardError::kFile) {
       posix_spawn_file_actions_addopen(&actions, STDERR_FILENO, err_.c_str(), create, 0600);
     } else {
@@ -136,5 +143,51 @@ inline std::vector<std::string> probed(const std::string& entries, const std::st
   if (output != nullptr) pclose(output);
   return lines;
 }
+
+// A program whose standard output is read by `reader` as it comes.
+class ReadRun {
+ public:
+  enum class Reader { kPipe, kTerminal };
+
+  ReadRun(const TemporaryFolder& folder, std::vector<std::string> arguments, std::vector<std::string> environment,
+          Reader reader) {
+    int ends[2] = {-1, -1};
+    if (reader == Reader::kTerminal) {
+      if (openpty(&ends[0], &ends[1], nullptr, nullptr, nullptr) != 0) return;
+      termios settings{};
+      tcgetattr(ends[1], &settings);
+      cfmakeraw(&settings);
+      tcsetattr(ends[1], TCSANOW, &settings);
+      for (const int end : ends) fcntl(end, F_SETFD, FD_CLOEXEC);
+    } else if (pipe2(ends, O_CLOEXEC) != 0) {
+      return;
+    }
+    read_end_ = ends[0];
+    program_ = std::make_unique<ProgramRun>(folder, std::move(arguments), std::move(environment),
+                                            ProgramRun::StandardError::kFile, ends[1]);
+    close(ends[1]);
+  }
+  ~ReadRun() { stop_reading(); }
+  ReadRun(const ReadRun&) = delete;
+  ReadRun& operator=(const ReadRun&) = delete;
+
+  // What comes until the end, or until as many lines are there.
+  std::string read_lines(std::size_t count = SIZE_MAX) const {
+    std::string text;
+    for (char letter = 0; count > 0 && read(read_end_, &letter, 1) == 1;) {
+      text += letter;
+      if (letter == '\n') --count;
+    }
+    return text;
+  }
+  void stop_reading() {
+    if (read_end_ >= 0) close(std::exchange(read_end_, -1));
+  }
+  [[nodiscard]] ProgramRun& program() const { return *program_; }
+
+ private:
+  int read_end_ = -1;
+  std::unique_ptr<ProgramRun> program_;
+};
 
 }  // namespace vexa_test

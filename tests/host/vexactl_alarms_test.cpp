@@ -35,8 +35,8 @@ TEST_F(AlarmsByCommand, IoShowsPinsAndStates) {
   EXPECT_EQ(result.out,
             " 1  input      on   inactive\n"
             " 2  input      on   active\n"
-            " 1  output     on   -\n"
-            " 2  output     on   -\n"
+            " 1  output     on   not reported\n"
+            " 2  output     on   not reported\n"
             " 3  tampering  off  inactive\n"
             " 4  audio      off  inactive\n");
   EXPECT_TRUE(was_asked("AlarmData=off"));
@@ -53,10 +53,34 @@ TEST_F(AlarmsByCommand, IoIsJsonForScripts) {
 
 TEST_F(AlarmsByCommand, OutputIsSwitched) {
   start_model("LMX-M300");
-  EXPECT_EQ(run({"output", place(), "2", "on"}).exit_code, 0);
+  const ProgramResult on = run({"output", place(), "2", "on"});
+  EXPECT_EQ(on.exit_code, 0);
+  EXPECT_EQ(on.err, "vexactl: output 2 of " + place() + " is switched on\n");
   EXPECT_TRUE(was_asked("/command/main.cgi?Trigger=alarmout2on "));
   EXPECT_EQ(run({"output", place(), "2", "off"}).exit_code, 0);
   EXPECT_TRUE(was_asked("/command/main.cgi?Trigger=alarmout2off "));
+}
+
+TEST_F(AlarmsByCommand, AnOutputThatTheModelLacksIsRefused) {
+  start_model("LMX-M300");
+  ProgramResult result = run({"output", place(), "9", "on"});
+  EXPECT_EQ(result.exit_code, 1);
+  EXPECT_EQ(result.err, "vexactl: cameras of model LMX-M300 have no output 9\n  They have outputs 1 to 2.\n");
+  start_model("LMX-C100");
+  result = run({"output", place(), "2", "on"});
+  EXPECT_EQ(result.exit_code, 1);
+  EXPECT_EQ(result.err, "vexactl: cameras of model LMX-C100 have no output 2\n  They have one, 1.\n");
+  EXPECT_FALSE(was_asked("Trigger="));
+}
+
+TEST_F(AlarmsByCommand, ATableOfPinsHasAHeadingOnATerminal) {
+  start_model("LMX-C100");
+  ReadRun io(folder(), vexactl({"io", place()}), kCredentials, ReadRun::Reader::kTerminal);
+  EXPECT_EQ(io.read_lines(),
+            " #  kind       on   state\n"
+            " 1  input      on   inactive\n"
+            " 1  output     on   not reported\n");
+  EXPECT_EQ(io.program().wait().exit_code, 0);
 }
 
 TEST_F(AlarmsByCommand, MistakesAreRefusedBeforeTheCameraIsAsked) {
@@ -109,6 +133,15 @@ TEST_F(AlarmsByCommand, WatchGivesJsonLinesAndMetadata) {
   EXPECT_GE(frames, 3U);
 }
 
+TEST_F(AlarmsByCommand, WatchEndsWhenNobodyReadsItAnyMoreThoughNoAlarmComes) {
+  start_model("LMX-M300");
+  ReadRun watch(folder(), vexactl({"watch", place()}), kCredentials, ReadRun::Reader::kPipe);
+  ASSERT_TRUE(eventually([&] { return was_asked("inq=sensor"); }));
+  watch.stop_reading();
+  EXPECT_EQ(watch.program().wait().exit_code, 5);
+  EXPECT_TRUE(was_asked("AlarmData=off"));
+}
+
 TEST_F(AlarmsByCommand, WatchEndsWithCtrlC) {
   start_model("LMX-M300");
   ProgramRun watch(folder(), vexactl({"watch", place()}), kCredentials);
@@ -126,6 +159,7 @@ TEST_F(AlarmsByCommand, DetectionOfASimpleCameraIsSetAndShown) {
   EXPECT_TRUE(was_asked("/command/lod.cgi?LODMinObjectSize=large&LODSensitivity=77 "));
   const ProgramResult shown = run({"detection", place(), "show", "--json"});
   EXPECT_EQ(nlohmann::json::parse(shown.out), nlohmann::json::parse(R"({"size": "large", "sensitivity": 77})"));
+  EXPECT_EQ(run({"detection", place(), "show"}).out, "size         large\nsensitivity  77\n");
 }
 
 TEST_F(AlarmsByCommand, DetectionByWindowsIsSetAndShown) {
@@ -140,6 +174,9 @@ TEST_F(AlarmsByCommand, DetectionByWindowsIsSetAndShown) {
   EXPECT_EQ(shown[0].at("sensitivity"), 33);
   EXPECT_EQ(shown[0].at("windows")[1],
             nlohmann::json::parse(R"({"enabled": true, "mode": "mask", "area": [[10, 20], [30, 40]]})"));
+  EXPECT_THAT(run({"detection", place(), "show"}).out,
+              testing::AllOf(testing::StartsWith("setting 99: sensitivity 33, objects of "),
+                             testing::HasSubstr("\n  window 2  on   mask    10,20 30,40\n")));
 }
 
 TEST_F(AlarmsByCommand, DetectorsAreSwitched) {

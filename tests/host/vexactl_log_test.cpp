@@ -214,5 +214,13 @@ TEST_F(LogCommand, AFullStandardOutputEndsWithFive) {
   EXPECT_THAT(result.err, HasSubstr("cannot write standard output: No space left on device"));
 }
 
+TEST_F(LogCommand, FollowingEndsWhenNobodyReadsItAnyMoreThoughNothingIsAppended) {
+  append("cgi.log", exchange("/command/main.cgi", "200 OK"));
+  ReadRun log(folder(), vexactl({"log", "cgi.log", "--follow"}), {}, ReadRun::Reader::kPipe);
+  EXPECT_EQ(log.read_lines(1), kHead);
+  log.stop_reading();
+  EXPECT_EQ(log.program().wait().exit_code, 5);
+}
+
 }  // namespace
 }  // namespace vexa_test

@@ -257,14 +257,14 @@ TEST_F(PtzByCommand, ToursWithoutPresetsGetThoseOfTheOneSet) {
   EXPECT_EQ(act("tour", {"set", "2", "4,5"}).exit_code, 0);
   const auto shown = nlohmann::json::parse(act("tour", {"show", "--json"}).out);
   EXPECT_EQ(shown.at("enabled"), false);
-  EXPECT_EQ(shown.at("resume-seconds"), nullptr);
+  EXPECT_EQ(shown.at("resumeSeconds"), nullptr);
   ASSERT_EQ(shown.at("tours").size(), 5U);
   for (const auto& tour : shown.at("tours")) {
     EXPECT_EQ(tour.at("presets"), nlohmann::json({4, 5}));
     EXPECT_EQ(tour.at("enabled"), false);
   }
   EXPECT_EQ(shown.at("tours")[1], nlohmann::json::parse(R"({"tour": 2, "enabled": false, "presets": [4, 5],
-                                                            "stay-seconds": 10, "speed": 24})"));
+                                                            "staySeconds": 10, "speed": 24})"));
 }
 
 TEST_F(PtzByCommand, ShadowToursAreRecordedPreviewedAndPlayed) {
@@ -293,7 +293,7 @@ TEST_F(PtzByCommand, ShadowToursAreShownAndTheirResumingIsSet) {
   const auto shown = nlohmann::json::parse(act("shadow", {"show", "--json"}).out);
   EXPECT_EQ(shown.at("enabled"), false);
   ASSERT_EQ(shown.at("tours").size(), 5U);
-  EXPECT_EQ(shown.at("tours")[4], nlohmann::json::parse(R"({"tour": 5, "enabled": false, "recorded-time": 0})"));
+  EXPECT_EQ(shown.at("tours")[4], nlohmann::json::parse(R"({"tour": 5, "enabled": false, "recordedSeconds": 0})"));
   EXPECT_THAT(act("shadow", {"show"}).out, testing::StartsWith("Shadow tours are off; "));
 }
 
@@ -306,8 +306,8 @@ TEST_F(PtzByCommand, WatchShowsTheCamerasPosition) {
   const auto json = nlohmann::json::parse(act("ptz", {"watch", "--count", "1", "--json"}).out);
   EXPECT_EQ(json.at("pan"), -45.0);
   EXPECT_EQ(json.at("tilt"), 10.0);
-  EXPECT_EQ(json.at("horizontal-angle"), 29.0);
-  EXPECT_EQ(json.at("vertical-angle"), 17.0);
+  EXPECT_EQ(json.at("horizontalAngle"), 29.0);
+  EXPECT_EQ(json.at("verticalAngle"), 17.0);
   EXPECT_EQ(json.at("zoom"), 2.0);
   EXPECT_EQ(json.at("moving"), true);
   EXPECT_EQ(json.at("time").get<std::string>().size(), 24U);
@@ -320,6 +320,40 @@ TEST_F(PtzByCommand, WatchEndsWithCtrlC) {
   watch.signal(SIGINT);
   EXPECT_EQ(watch.wait().exit_code, 130);
   EXPECT_TRUE(camera().journal().wait_for_count("TEARDOWN", 1, std::chrono::seconds(30)));
+}
+
+TEST_F(PtzByCommand, WatchEndsWhenNobodyReadsItAnyMoreThoughNothingMoves) {
+  start_model("LMX-P200", "CamPos: 111E3E006401B58M");
+  ReadRun watch(folder(), vexactl({"ptz", place(), "watch"}), kCredentials, ReadRun::Reader::kPipe);
+  EXPECT_THAT(watch.read_lines(1), testing::HasSubstr("pan  -45.000"));
+  watch.stop_reading();
+  const ProgramResult result = watch.program().wait();
+  EXPECT_EQ(result.exit_code, 5);
+  EXPECT_EQ(result.err, "vexactl: cannot write standard output: Broken pipe\n  Check where it is redirected to.\n");
+}
+
+TEST_F(PtzByCommand, APresetThatWasNeverStoredIsRefusedWithAdviceThatFits) {
+  start_model("LMX-P200");
+  camera().add_request_fault(vexa::camera::RequestFault::status("PresetCall=7", "400 Bad Request"));
+  const ProgramResult result = act("preset", {"recall", "7"});
+  EXPECT_EQ(result.exit_code, 2);
+  EXPECT_EQ(result.err, "vexactl: the camera " + place() +
+                            " does not go to preset 7\n"
+                            "  A preset that was never stored cannot be recalled: vexactl preset CAMERA list shows "
+                            "those stored.\n");
+}
+
+TEST_F(PtzByCommand, ATableHasAHeadingOnATerminalOnly) {
+  start_model("LMX-P200");
+  ASSERT_EQ(act("preset", {"set", "3", "Gate"}).exit_code, 0);
+  EXPECT_EQ(act("preset", {"list"}).out, "  3  Gate\n");
+  ReadRun list(folder(), vexactl({"preset", place(), "list"}), kCredentials, ReadRun::Reader::kTerminal);
+  EXPECT_EQ(list.read_lines(), "  #  name\n  3  Gate\n");
+  EXPECT_EQ(list.program().wait().exit_code, 0);
+}
+
+TEST_F(PtzByCommand, ADirectionThatThereIsNotIsNamed) {
+  EXPECT_EQ(run({"ptz", "cam", "pan", "upp"}).err, "vexactl: unknown direction \"upp\"\n  It is left or right.\n");
 }
 
 }  // namespace

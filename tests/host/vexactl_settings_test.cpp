@@ -63,10 +63,11 @@ TEST_F(SettingsOfACamera, AreJsonForScripts) {
   const ProgramResult result = run({"settings", place(), "--json"});
   EXPECT_EQ(result.exit_code, 0);
   const auto expected = nlohmann::json::parse(R"({
-    "stream": 1, "codec": "MPEG4", "size": "640x480", "frame-rate": 25, "bit-rate": 1024, "quality": null,
-    "video-standard": "pal", "capture-size": "768x576", "max-image-size": "768x576", "solid-ptz": "off",
-    "unicast-port": 50000, "unicast-port-1": 50002, "unicast-port-2": 50004, "rtsp-port": 554, "day-night": "auto", "noise-reduction": null, "wide-dynamic-range": null,
-    "visibility-enhancer": null, "infrared": null, "infrared-strength": null, "video-output": "ip"})");
+    "stream": 1, "codec": "MPEG4", "size": "640x480", "frameRate": 25, "bitRate": 1024, "quality": null,
+    "videoStandard": "pal", "captureSize": "768x576", "maxImageSize": "768x576", "solidPtz": "off",
+    "unicastPort": 50000, "unicastPort1": 50002, "unicastPort2": 50004, "rtspPort": 554, "dayNight": "auto",
+    "noiseReduction": null, "wideDynamicRange": null,
+    "visibilityEnhancer": null, "infrared": null, "infraredStrength": null, "videoOutput": "ip"})");
   EXPECT_EQ(nlohmann::json::parse(result.out, nullptr, false), expected);
 }
 
@@ -250,10 +251,10 @@ TEST_F(SettingsOfACamera, DayNightShowsAndSets) {
   start_model("LMX-H100");
   EXPECT_EQ(run({"daynight", place()}).out, "auto\n");
   EXPECT_EQ(run({"daynight", place(), "night"}).out, "night\n");
-  EXPECT_EQ(run({"daynight", place(), "--json"}).out, "{\n  \"day-night\": \"night\"\n}\n");
+  EXPECT_EQ(run({"daynight", place(), "--json"}).out, "{\n  \"dayNight\": \"night\"\n}\n");
   const ProgramResult wrong = run({"daynight", place(), "dusk"});
   EXPECT_EQ(wrong.exit_code, 1);
-  EXPECT_EQ(wrong.err, "vexactl: unknown day/night mode\n  Choose auto, day or night.\n");
+  EXPECT_EQ(wrong.err, "vexactl: unknown day/night mode \"dusk\"\n  Choose auto, day or night.\n");
 }
 
 TEST_F(SettingsOfACamera, AProfileOnTheCommandLineWins) {

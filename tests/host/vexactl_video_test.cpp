@@ -66,11 +66,19 @@ TEST_F(VideoCommands, RecordKeepsThePicturesOfEveryCodecByEveryTransport) {
   }
 }
 
-TEST_F(VideoCommands, AnyOtherNameTakesAnyCodec) {
+TEST_F(VideoCommands, AnyOtherNameNeedsAFormat) {
   start(kVideoCodecs[1]);
-  const ProgramResult result = run({"record", place(), "--frames", "5", "--out", "video"});
+  EXPECT_EQ(run({"record", place(), "--frames", "5", "--out", "video"}).exit_code, 1);
+  EXPECT_FALSE(std::filesystem::exists(folder() / "video"));
+  const ProgramResult result = run({"record", place(), "--frames", "5", "--out", "video", "--format", "m4v"});
   EXPECT_EQ(result.exit_code, 0) << result.err;
   EXPECT_TRUE(contents_of(folder() / "video") == pictures_of(kVideoCodecs[1], 5));
+}
+
+TEST_F(VideoCommands, AFormatOfAnotherCodecIsRefused) {
+  start(kVideoCodecs[1]);
+  EXPECT_EQ(run({"record", place(), "--out", "live.m4v", "--format", "h264"}).exit_code, 4);
+  EXPECT_FALSE(std::filesystem::exists(folder() / "live.m4v"));
 }
 
 TEST_F(VideoCommands, ANameOfAnotherCodecIsRefused) {
@@ -93,11 +101,31 @@ TEST_F(VideoCommands, ASnapshotOfJpegVideoIsThePictureAsItCame) {
 }
 
 TEST_F(VideoCommands, WhatIsNoPictureFileIsRefused) {
-  for (const char* out : {"live.h264", "live", "", "-"}) {
+  for (const char* out : {"live.h264", "live", ""}) {
     const ProgramResult result = run({"snapshot", "127.0.0.1", "--out", out});
     EXPECT_EQ(result.exit_code, 1);
     EXPECT_EQ(result.err, "vexactl: --out names no picture\n  For instance: --out live.jpg, or live.png.\n") << out;
   }
+}
+
+TEST_F(VideoCommands, ASnapshotGoesToStandardOutputAlone) {
+  start(kVideoCodecs[2]);
+  const ProgramResult result = run({"snapshot", place(), "--transport", "http", "--out", "-"});
+  EXPECT_EQ(result.exit_code, 0) << result.err;
+  const std::string picture = pictures_of(kVideoCodecs[2], 1);
+  EXPECT_TRUE(result.out == picture);
+  EXPECT_EQ(result.err, "-: " + std::to_string(picture.size()) + " bytes, from JPEG video\n");
+}
+
+TEST_F(VideoCommands, SoundOfAModelWithoutAudioIsRefusedWithAdviceThatFits) {
+  CameraOptions options;
+  options.profile_path = VEXA_SOURCE_DIR "/models/profiles/LMX-C100.json";
+  start_camera(options);
+  const ProgramResult result = run({"listen", place(), "--out", "live.wav"});
+  EXPECT_EQ(result.exit_code, 1);
+  EXPECT_EQ(result.err,
+            "vexactl: cameras of model LMX-C100 have no audio\n"
+            "  vexactl profile show LMX-C100 lists what the model has.\n");
 }
 
 TEST_F(VideoCommands, ACameraWithoutVideoGivesNoSnapshot) {
@@ -194,6 +222,33 @@ TEST_F(VideoCommands, RecordFillsContainersWithEveryCodecByEveryTransport) {
       EXPECT_LT(times.back(), 60);
       for (std::size_t i = 1; i < times.size(); ++i) EXPECT_GT(times[i], times[i - 1]) << i;
     }
+  }
+}
+
+TEST_F(VideoCommands, ARecordingThatIsKilledPlaysUpToItsLastSecond) {
+  start(kVideoCodecs[0]);
+  for (const char* file : {"killed.mkv", "killed.mp4"}) {
+    ProgramRun record(folder(), vexactl({"record", place(), "--out", file}), kCredentials);
+    ASSERT_TRUE(eventually([&] { return probed("packet=pts_time", folder() / file).size() >= 50; })) << file;
+    record.signal(SIGKILL);
+    EXPECT_EQ(record.wait().exit_code, 128 + SIGKILL);
+    const Decoded decoded = decode(folder() / file, file[7] == 'm' && file[8] == 'k' ? "matroska" : "mp4");
+    EXPECT_GE(decoded.frames, 50U) << file;
+  }
+}
+
+TEST_F(VideoCommands, AContainerGoesThroughAPipe) {
+  start(kVideoCodecs[0]);
+  for (const char* format : {"mkv", "mp4"}) {
+    ProgramResult result = run({"record", place(), "--frames", "20", "--out", "-", "--format", format});
+    EXPECT_EQ(result.exit_code, 0) << result.err;
+    ReadRun piped(folder(), vexactl({"record", place(), "--frames", "20", "--out", "-", "--format", format}),
+                  kCredentials, ReadRun::Reader::kPipe);
+    folder().make_file("piped", piped.read_lines());
+    EXPECT_EQ(piped.program().wait().exit_code, 0);
+    const Decoded decoded = decode(folder() / "piped", std::string(format) == "mkv" ? "matroska" : "mp4");
+    EXPECT_TRUE(decoded.flawless) << format;
+    EXPECT_EQ(decoded.frames, 20U) << format;
   }
 }
 

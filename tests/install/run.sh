@@ -43,7 +43,7 @@ export PKG_CONFIG_PATH=$libraries/pkgconfig
 # The flags are words to the shell: that is what pkg-config and CMAKE_CXX_FLAGS hold.
 # shellcheck disable=SC2046,SC2086
 "$compiler" $flags -std=c++14 "$here/host/installed_host.cpp" -o "$place/plain_host" \
-  $(pkg-config --cflags --libs vexa-models) -ldl
+  $(pkg-config --cflags --libs vexa-session) -ldl
 LD_LIBRARY_PATH=$libraries "$place/plain_host"
 
 echo "-- a host that keeps the package elsewhere than it was installed"
@@ -68,6 +68,7 @@ system='libstdc\+\+\.so\.6|libm\.so\.6|libgcc_s\.so\.1|libc\.so\.6|libpthread\.s
 check_library "$libraries/libVexaCommon.so.1" libVexaCommon.so.1 "libVexaCommonFilter\.so\.1|$system"
 check_library "$libraries/libVexaCommonFilter.so.1" libVexaCommonFilter.so.1 "$system"
 check_library "$libraries/libVexaModels.so.1" libVexaModels.so.1 "libVexaCommon(Filter)?\.so\.1|$system"
+check_library "$libraries/libVexaSession.so.1" libVexaSession.so.1 "libVexa(Models|Common|CommonFilter)\.so\.1|$system"
 dynamic "$libraries/libVexaCommon.so.1" NEEDED | grep -qx 'libVexaCommonFilter.so.1' ||
   fail "libVexaCommon.so.1 does not name the filter library"
 echo "installed, found, linked and run${flags:+ with $flags}"

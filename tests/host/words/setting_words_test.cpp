@@ -42,9 +42,9 @@ TEST(SettingWords, SayWhatASettingTakes) {
     const char* text;
     const char* refusal;
   } cases[] = {
-      {"codec", "a setting is not KEY=VALUE | For instance: codec=H.264 size=1280x720."},
+      {"codec", "\"codec\" is not KEY=VALUE | For instance: codec=H.264 size=1280x720."},
       {"=1",
-       "unknown setting | The settings are: codec, size, frame-rate, bit-rate, quality, rotation, day-night, "
+       "unknown setting \"\" | The settings are: codec, size, frame-rate, bit-rate, quality, rotation, day-night, "
        "noise-reduction, wide-dynamic-range, visibility-enhancer, infrared, infrared-strength, back-light, exposure."},
       {"codec=h264", "the value of codec cannot be used | It takes JPEG, MPEG4 or H.264."},
       {"codec=", "the value of codec cannot be used | It takes JPEG, MPEG4 or H.264."},

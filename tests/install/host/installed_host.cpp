@@ -8,6 +8,7 @@
 #include <string>
 
 #include "vexa/models.h"
+#include "vexa/session.h"
 #include "vexa/vexa.h"
 
 namespace {
@@ -53,6 +54,23 @@ void check_models() {
   check(device && device->GetFixedCameraInfo(video) == LIBD_OK && !video.codecs.empty(), "a model knows its codecs");
 }
 
+void check_sessions() {
+  vexa::SessionGroupOptions without_threads;
+  without_threads.threads = 0;
+  vexa::SessionGroup group(without_threads);
+  check(group.Descriptor() >= 0, "a group has a descriptor");
+  vexa::SessionOptions options;
+  options.connection.host = "127.0.0.1";
+  options.connection.port = 1;
+  int states = 0;
+  vexa::SessionCallbacks host;
+  host.state = [&states](vexa::Session&, const vexa::SessionStatus&) { ++states; };
+  const auto session = group.Open(options, host);
+  check(session != nullptr, "a session is opened");
+  while (session && states < 2) group.Process(1000);
+  check(session && session->Status().event >= 2, "a session has states");
+}
+
 void check_runtime_by_name() {
   void* const library = dlopen("libVexaCommon.so.1", RTLD_NOW | RTLD_NOLOAD);
   check(library != nullptr, "libVexaCommon.so.1 is the loaded library");
@@ -67,6 +85,7 @@ void check_runtime_by_name() {
 int main() {
   check_driver();
   check_models();
+  check_sessions();
   check_runtime_by_name();
   if (g_failures == 0) std::puts("the installed library works");
   return g_failures == 0 ? 0 : 1;

@@ -82,6 +82,22 @@ TEST(CredentialBreaker, RefusalsOfRequestsThatWereOnTheirWayCountOnce) {
   EXPECT_EQ(breaker.retry_at(), Moment(0) + minutes(1));
 }
 
+TEST(CredentialBreaker, CredentialsOfAnEndedConnectionAreTriedByOneHolder) {
+  CredentialBreaker breaker;
+  breaker.set_password("right");
+  breaker.accepted();
+  EXPECT_EQ(breaker.ask(Moment(0)), Answer::kGo);
+  breaker.doubt();
+  EXPECT_EQ(breaker.ask(Moment(0)), Answer::kTry);
+  EXPECT_EQ(breaker.ask(Moment(0)), Answer::kWait);
+  breaker.refused(Moment(0));
+  EXPECT_EQ(breaker.retry_at(), Moment(minutes(1)));
+  breaker.retry();
+  EXPECT_EQ(breaker.ask(Moment(0)), Answer::kTry);
+  breaker.accepted();
+  EXPECT_EQ(breaker.ask(Moment(0)), Answer::kGo);
+}
+
 // Locks the account for half an hour after five refusals within as long a time.
 class LockingCamera {
  public:

@@ -22,6 +22,8 @@ TEST(FailureCause, GoesByTheCodeAndThePhraseOfTheCamera) {
                {LIBD_STREAM_OPEN_FAILED, "Stream Not Found", SessionCause::kNotFound},
                {LIBD_STREAM_OPEN_FAILED, "Unsupported Media Type", SessionCause::kUnsupported},
                {LIBD_NOT_SUPPORTED, "", SessionCause::kUnsupported},
+               {LIBD_NOT_SUPPORTED, "the camera has no such stream", SessionCause::kNotFound},
+               {LIBD_INVALID_ARGUMENT, "", SessionCause::kUnsupported},
                {LIBD_FAILED, "Connection reset by peer", SessionCause::kClosed},
                {LIBD_FAILED, "Connection refused", SessionCause::kNoAnswer},
                {LIBD_TIMEOUT, "Receive timed out", SessionCause::kNoAnswer},

@@ -206,6 +206,19 @@ TEST_F(Machine, ALinkThatIsBackIsTriedAtOnce) {
   EXPECT_TRUE(machine_.is_due(Moment(10)));
 }
 
+TEST_F(Machine, AFloodOfLinksIsFollowedOnceASecond) {
+  machine_.start(Moment(5000));
+  int attempts = 0;
+  for (Moment now(5000); now < Moment(8000); now += Moment(10)) {
+    machine_.link_back(now);
+    if (!machine_.is_due(now)) continue;
+    ++attempts;
+    machine_.connecting(now);
+    machine_.failed(LIBD_FAILED, "No route to host", 1.0, now);
+  }
+  EXPECT_LE(attempts, 1 + 3 + 2) << "the first, one for each second, and the plan's own";
+}
+
 TEST_F(Machine, ALinkThatIsBackDoesNotTryRefusedCredentials) {
   machine_.start(Moment(0));
   machine_.connecting(Moment(0));

@@ -1,0 +1,53 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "session/job_pool.h"
+
+#include <system_error>
+#include <utility>
+
+namespace vexa {
+
+JobPool::~JobPool() {
+  {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    over_ = true;
+  }
+  news_.notify_all();
+  for (std::thread& thread : threads_) thread.join();
+}
+
+bool JobPool::post(std::function<void()> job) {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  if (idle_ <= jobs_.size() && threads_.size() < most_) {
+    try {
+      threads_.emplace_back([this] { work(); });
+    } catch (const std::system_error&) {
+      if (threads_.empty()) return false;
+    }
+  }
+  jobs_.push_back(std::move(job));
+  news_.notify_one();
+  return true;
+}
+
+std::size_t JobPool::threads() const {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  return threads_.size();
+}
+
+void JobPool::work() {
+  std::unique_lock<std::mutex> lock(mutex_);
+  for (;;) {
+    ++idle_;
+    news_.wait(lock, [this] { return over_ || !jobs_.empty(); });
+    --idle_;
+    if (jobs_.empty()) return;
+    std::function<void()> job = std::move(jobs_.front());
+    jobs_.pop_front();
+    lock.unlock();
+    job();
+    job = nullptr;
+    lock.lock();
+  }
+}
+
+}  // namespace vexa
