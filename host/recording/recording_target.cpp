@@ -2,6 +2,7 @@
 #include "host/recording/recording_target.h"
 
 #include <fmt/format.h>
+#include <sys/stat.h>
 
 #include <algorithm>
 #include <iterator>
@@ -40,13 +41,19 @@ const Format* find_format(const std::string& out, const std::optional<std::strin
   return found == std::end(kFormats) ? nullptr : found;
 }
 
+// A device or a pipe takes pictures under any name; a folder is refused as what cannot be written.
+bool is_no_plain_file(const std::string& path) {
+  struct stat found {};
+  return stat(path.c_str(), &found) == 0 && !S_ISREG(found.st_mode);
+}
+
 }  // namespace
 
 std::optional<Problem> RecordingTarget::check() const {
   if (find_format(out_, format_) == nullptr) {
     if (format_)
       return usage(fmt::format("unknown format \"{}\"", printable(*format_)), fmt::format("Choose {}.", kWords));
-    if (!is_standard_output()) {
+    if (!is_standard_output() && !is_no_plain_file(out_)) {
       return usage(fmt::format("the end of {} names no format of video", printable(out_)),
                    fmt::format("End --out in .mkv, .mp4, .h264, .m4v or .mjpeg, or give --format {}.", kWords));
     }

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // vexactl record, snapshot and listen: every codec, by every transport, into every kind of file.
+#include <cstdio>
 #include <filesystem>
 #include <nlohmann/json.hpp>
 
@@ -225,15 +226,25 @@ TEST_F(VideoCommands, RecordFillsContainersWithEveryCodecByEveryTransport) {
   }
 }
 
+// The pictures of a file that may still be written, whatever their distances.
+std::size_t pictures_in(const std::string& path) {
+  const std::string command = "ffmpeg -v quiet -nostdin -i '" + path + "' -an -fps_mode passthrough -f framemd5 - 2>&1";
+  std::FILE* output = popen(command.c_str(), "r");
+  std::size_t count = 0;
+  char line[512];
+  while (output != nullptr && std::fgets(line, sizeof line, output) != nullptr) count += line[0] == '0' ? 1 : 0;
+  if (output != nullptr) pclose(output);
+  return count;
+}
+
 TEST_F(VideoCommands, ARecordingThatIsKilledPlaysUpToItsLastSecond) {
   start(kVideoCodecs[0]);
   for (const char* file : {"killed.mkv", "killed.mp4"}) {
     ProgramRun record(folder(), vexactl({"record", place(), "--out", file}), kCredentials);
-    ASSERT_TRUE(eventually([&] { return probed("packet=pts_time", folder() / file).size() >= 50; })) << file;
+    ASSERT_TRUE(eventually([&] { return pictures_in(folder() / file) >= 50; })) << file;
     record.signal(SIGKILL);
     EXPECT_EQ(record.wait().exit_code, 128 + SIGKILL);
-    const Decoded decoded = decode(folder() / file, file[7] == 'm' && file[8] == 'k' ? "matroska" : "mp4");
-    EXPECT_GE(decoded.frames, 50U) << file;
+    EXPECT_GE(pictures_in(folder() / file), 50U) << file;
   }
 }
 
@@ -248,7 +259,7 @@ TEST_F(VideoCommands, AContainerGoesThroughAPipe) {
     EXPECT_EQ(piped.program().wait().exit_code, 0);
     const Decoded decoded = decode(folder() / "piped", std::string(format) == "mkv" ? "matroska" : "mp4");
     EXPECT_TRUE(decoded.flawless) << format;
-    EXPECT_EQ(decoded.frames, 20U) << format;
+    EXPECT_EQ(pictures_in(folder() / "piped"), 20U) << format;
   }
 }
 
