@@ -35,6 +35,7 @@ echo "-- a host that finds the package with CMake"
 cmake -S "$here/host" -B "$place/host" -G Ninja "-DCMAKE_PREFIX_PATH=$prefix" "-DCMAKE_CXX_COMPILER=$compiler" \
   "-DCMAKE_CXX_FLAGS=$flags" >"$place/configure.log" 2>&1 || fail "$(cat "$place/configure.log")"
 cmake --build "$place/host" >"$place/build.log" || fail "$(cat "$place/build.log")"
+cd "$place"  # hosts open the driver's log where they run
 "$place/host/installed_host"
 
 echo "-- a host that finds it with pkg-config"
