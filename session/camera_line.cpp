@@ -61,7 +61,7 @@ std::optional<LineFailure> CameraLine::open(const std::string& user, const std::
   SLibDConnectionInfo connection = options_.connection;
   connection.userName = user;
   connection.password = password;
-  if (auto failed = identify(connection, watcher)) return failed;
+  if (auto failed = identify(connection)) return failed;
   for (const StreamStart& row : kStarts) {
     if ((options_.streams & row.stream) == 0) continue;
     if (auto failed = start(row.stream)) {
@@ -72,7 +72,7 @@ std::optional<LineFailure> CameraLine::open(const std::string& user, const std::
   return std::nullopt;
 }
 
-std::optional<LineFailure> CameraLine::identify(const SLibDConnectionInfo& connection, Watcher& watcher) {
+std::optional<LineFailure> CameraLine::identify(const SLibDConnectionInfo& connection) {
   if (device_) {
     introduce(*device_, connection);
   } else {
@@ -86,14 +86,17 @@ std::optional<LineFailure> CameraLine::identify(const SLibDConnectionInfo& conne
   SLibDSystemInfo system;
   const ELibDReturnCode asked = device_->GetCurrentSystemInfo(system);
   if (asked != LIBD_OK) return failure(asked);
-  watcher.credentials_accepted();
-  if (!options_.profile.empty() || system.modelName == model_) return std::nullopt;
-  model_ = system.modelName;
-  if (!is_installed(model_)) return std::nullopt;
+  if (!options_.profile.empty()) return std::nullopt;
+  const std::string model = is_installed(system.modelName) ? system.modelName : "";
+  if (model == model_) return std::nullopt;
   Profile profile;
   ProfileError error;
-  if (!LoadProfile(model_, profile, error)) return LineFailure{LIBD_INVALID_ARGUMENT, error.Message(), true};
-  return make_driver(profile, connection);
+  if (!model.empty() && !LoadProfile(model, profile, error)) {
+    return LineFailure{LIBD_INVALID_ARGUMENT, error.Message(), true};
+  }
+  if (auto failed = make_driver(profile, connection)) return failed;
+  model_ = model;
+  return std::nullopt;
 }
 
 std::optional<LineFailure> CameraLine::make_driver(const Profile& profile, const SLibDConnectionInfo& connection) {

@@ -30,10 +30,9 @@ class CameraLine {
   CameraLine(const CameraLine&) = delete;
   CameraLine& operator=(const CameraLine&) = delete;
 
-  /// What opening reports on its way: whether the camera has taken the credentials, and whether to give up.
+  /// Whether to give up an opening.
   class Watcher {
    public:
-    virtual void credentials_accepted() = 0;
     [[nodiscard]] virtual bool is_cancelled() const = 0;
 
    protected:
@@ -58,7 +57,7 @@ class CameraLine {
   [[nodiscard]] std::string latest_text() const;
 
  private:
-  [[nodiscard]] std::optional<LineFailure> identify(const SLibDConnectionInfo& connection, Watcher& watcher);
+  [[nodiscard]] std::optional<LineFailure> identify(const SLibDConnectionInfo& connection);
   [[nodiscard]] std::optional<LineFailure> make_driver(const Profile& profile, const SLibDConnectionInfo& connection);
   void introduce(CLibraryDevice& device, const SLibDConnectionInfo& connection) const;
   [[nodiscard]] LineFailure failure(ELibDReturnCode code) const { return {code, latest_text(), false}; }
@@ -67,7 +66,7 @@ class CameraLine {
   CancelToken token_;
   std::unique_ptr<CLibraryDevice> device_;
   CVexaCommon* driver_ = nullptr;  ///< the device
-  std::string model_;              ///< that the device is of
+  std::string model_;              ///< whose installed profile the device has; empty: none
 };
 
 }  // namespace vexa

@@ -47,7 +47,8 @@ void CredentialGuard::add_waiter(const std::weak_ptr<CredentialWaiter>& waiter) 
   const std::lock_guard<std::mutex> lock(mutex_);
   waiters_.erase(std::remove_if(waiters_.begin(), waiters_.end(), [](const auto& w) { return w.expired(); }),
                  waiters_.end());
-  waiters_.push_back(waiter);
+  const auto is_same = [&waiter](const auto& w) { return !w.owner_before(waiter) && !waiter.owner_before(w); };
+  if (std::none_of(waiters_.begin(), waiters_.end(), is_same)) waiters_.push_back(waiter);
 }
 
 template <typename Change>
@@ -55,8 +56,8 @@ void CredentialGuard::change(const Change& change) {
   std::vector<std::weak_ptr<CredentialWaiter>> waiters;
   {
     const std::lock_guard<std::mutex> lock(mutex_);
-    change();
     waiters = waiters_;
+    if (!change()) return;
   }
   for (const auto& waiting : waiters) {
     if (const auto waiter = waiting.lock()) waiter->credentials_changed();
@@ -64,29 +65,41 @@ void CredentialGuard::change(const Change& change) {
 }
 
 void CredentialGuard::set_password(const std::string& password) {
-  if (this->password() == password) return;
   change([&] {
+    if (password_ == password) return false;
     password_ = password;
     breaker_.set_password(password);
+    ++generation_;
+    return true;
   });
 }
 
-std::string CredentialGuard::password() const {
+CredentialTicket CredentialGuard::ask(Moment now) {
   const std::lock_guard<std::mutex> lock(mutex_);
-  return password_;
+  CredentialTicket ticket;
+  ticket.password = password_;
+  ticket.generation = generation_;
+  ticket.answer = breaker_.ask(now);
+  // Once the next try is due its moment is past, and whoever makes it reports the end.
+  ticket.is_refused = breaker_.is_refused() && breaker_.retry_at() > now;
+  if (ticket.is_refused) ticket.next = breaker_.retry_at();
+  return ticket;
 }
 
-CredentialBreaker::Answer CredentialGuard::ask(Moment now) {
-  const std::lock_guard<std::mutex> lock(mutex_);
-  return breaker_.ask(now);
+void CredentialGuard::accepted(std::uint64_t generation) {
+  change([&] {
+    if (generation != generation_) return false;
+    breaker_.accepted();
+    return true;
+  });
 }
 
-void CredentialGuard::accepted() {
-  change([this] { breaker_.accepted(); });
-}
-
-void CredentialGuard::refused(Moment now) {
-  change([&] { breaker_.refused(now); });
+void CredentialGuard::refused(std::uint64_t generation, Moment now) {
+  change([&] {
+    if (generation != generation_) return false;
+    breaker_.refused(now);
+    return true;
+  });
 }
 
 void CredentialGuard::doubt() {
@@ -94,17 +107,29 @@ void CredentialGuard::doubt() {
   breaker_.doubt();
 }
 
-void CredentialGuard::abandoned() {
-  change([this] { breaker_.abandoned(); });
+void CredentialGuard::abandoned(std::uint64_t generation) {
+  change([&] {
+    if (generation != generation_) return false;
+    breaker_.abandoned();
+    return true;
+  });
 }
 
 void CredentialGuard::retry() {
-  change([this] { breaker_.retry(); });
+  change([this] {
+    breaker_.retry();
+    return true;
+  });
 }
 
-Moment CredentialGuard::retry_at() const {
+Moment CredentialGuard::next_try(std::uint64_t generation, Moment now) const {
   const std::lock_guard<std::mutex> lock(mutex_);
-  return breaker_.retry_at();
+  return generation == generation_ && breaker_.is_refused() ? breaker_.retry_at() : now;
+}
+
+bool CredentialGuard::is_current(std::uint64_t generation) const {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  return generation == generation_;
 }
 
 bool CredentialGuard::is_refused() const {

@@ -22,6 +22,15 @@ class CredentialWaiter {
   ~CredentialWaiter() = default;
 };
 
+/// What a guard answers who asks it, all of one moment.
+struct CredentialTicket {
+  CredentialBreaker::Answer answer = CredentialBreaker::Answer::kWait;
+  std::string password;
+  std::uint64_t generation = 0;  ///< of the password: what comes of a request is reported with it
+  bool is_refused = false;       ///< the credentials wait for a next try, and nobody makes one now
+  Moment next = kNever;          ///< that next try, later than now; kNever when none is planned
+};
+
 /// A breaker with the password that it judges. Any thread.
 class CredentialGuard {
  public:
@@ -32,14 +41,16 @@ class CredentialGuard {
   void add_waiter(const std::weak_ptr<CredentialWaiter>& waiter);
 
   void set_password(const std::string& password);
-  [[nodiscard]] std::string password() const;
-  [[nodiscard]] CredentialBreaker::Answer ask(Moment now);
-  void accepted();
-  void refused(Moment now);
+  [[nodiscard]] CredentialTicket ask(Moment now);
+  /// What came of a request; nothing changes when its password has been replaced since.
+  void accepted(std::uint64_t generation);
+  void refused(std::uint64_t generation, Moment now);
+  void abandoned(std::uint64_t generation);
   void doubt();
-  void abandoned();
   void retry();
-  [[nodiscard]] Moment retry_at() const;
+  /// When credentials that were refused may be sent again: now, if others are due or they are refused no more.
+  [[nodiscard]] Moment next_try(std::uint64_t generation, Moment now) const;
+  [[nodiscard]] bool is_current(std::uint64_t generation) const;
   [[nodiscard]] bool is_refused() const;
 
  private:
@@ -49,7 +60,14 @@ class CredentialGuard {
   mutable std::mutex mutex_;
   CredentialBreaker breaker_;
   std::string password_;
+  std::uint64_t generation_ = 0;
   std::vector<std::weak_ptr<CredentialWaiter>> waiters_;
+};
+
+/// Credentials that are sent, and who hears what came of it.
+struct CredentialTrial {
+  std::shared_ptr<CredentialGuard> judge;
+  std::uint64_t generation = 0;
 };
 
 }  // namespace vexa

@@ -62,12 +62,17 @@ class Turns {
 /// Outlives the sessions of the group.
 struct GroupParts {
   GroupParts(std::size_t attempts, bool threads, std::function<void(std::uint64_t)> wake_session)
-      : has_threads(threads), turns(attempts, std::move(wake_session)), connectors(attempts), closers(2) {}
+      : has_threads(threads),
+        turns(attempts, std::move(wake_session)),
+        connectors(attempts),
+        sides(attempts),
+        closers(2) {}
 
   const bool has_threads;  ///< that call the host
   GroupCounts counts;
   Turns turns;
   JobPool connectors;
+  JobPool sides;  ///< for jobs beside streams that run
   JobPool closers;
 };
 

@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "session/job_pool.h"
 
-#include <system_error>
+#include <exception>
 #include <utility>
+
+#include "session/blocked_signals.h"
 
 namespace vexa {
 
@@ -17,14 +19,23 @@ JobPool::~JobPool() {
 
 bool JobPool::post(std::function<void()> job) {
   const std::lock_guard<std::mutex> lock(mutex_);
-  if (idle_ <= jobs_.size() && threads_.size() < most_) {
+  try {
+    jobs_.push_back(std::move(job));
+  } catch (const std::exception&) {
+    return false;
+  }
+  if (idle_ < jobs_.size() && threads_.size() < most_) {
+    const BlockedSignals none;
     try {
+      threads_.reserve(threads_.size() + 1);  // a thread that is made has its place
       threads_.emplace_back([this] { work(); });
-    } catch (const std::system_error&) {
-      if (threads_.empty()) return false;
+    } catch (const std::exception&) {
+      if (threads_.empty()) {
+        jobs_.pop_back();
+        return false;
+      }
     }
   }
-  jobs_.push_back(std::move(job));
   news_.notify_one();
   return true;
 }

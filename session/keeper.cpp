@@ -63,12 +63,14 @@ Keeper::~Keeper() {
 
 bool Keeper::is_usable() const { return epoll_ >= 0; }
 
-void Keeper::add(const std::shared_ptr<SessionCore>& session) {
+bool Keeper::add(const std::shared_ptr<SessionCore>& session) {
   {
     const std::lock_guard<std::mutex> lock(mutex_);
+    if (over_) return false;
     sessions_[session->number()] = session;
   }
   wake(session->number());
+  return true;
 }
 
 void Keeper::wake(std::uint64_t number) {
@@ -116,7 +118,7 @@ int Keeper::turn(std::int32_t milliseconds, const std::function<void()>& on_link
       ready = true;
     }
   }
-  int made = serve_woken(monotonic_now());
+  int made = serve_woken();
   if (ready) made += serve_ready();
   made += serve_due(monotonic_now());
   drop_over();
@@ -143,7 +145,7 @@ void Keeper::end() {
   [[maybe_unused]] const ssize_t written = write(event_, &one, sizeof one);
 }
 
-int Keeper::serve_woken(Moment now) {
+int Keeper::serve_woken() {
   std::vector<std::shared_ptr<SessionCore>> sessions;
   {
     const std::lock_guard<std::mutex> lock(mutex_);
@@ -154,7 +156,7 @@ int Keeper::serve_woken(Moment now) {
     woken_.clear();
   }
   int made = 0;
-  for (const auto& session : sessions) made += serve(*session, now);
+  for (const auto& session : sessions) made += serve(*session);
   return made;
 }
 
@@ -164,7 +166,7 @@ int Keeper::serve_due(Moment now) {
   int made = 0;
   for (const auto& [number, session] : kept()) {
     if (session->deadline() <= now) {
-      made += serve(*session, now);
+      made += serve(*session);
     } else {
       next_ = std::min(next_, session->deadline());
     }
@@ -172,9 +174,9 @@ int Keeper::serve_due(Moment now) {
   return made;
 }
 
-int Keeper::serve(SessionCore& session, Moment now) {
+int Keeper::serve(SessionCore& session) {
   handles_.try_emplace(session.number(), session.handle());
-  const int made = session.turn(now);
+  const int made = session.turn(monotonic_now());
   watch(session);
   if (session.is_over()) gone_.push_back(session.number());
   next_ = std::min(next_, session.deadline());
@@ -201,18 +203,19 @@ int Keeper::serve_ready() {
   return made;
 }
 
-// A driver is in the set while its streams run.
+// A driver is in the set while its streams run, for those that do.
 void Keeper::watch(SessionCore& session) {
   CVexaCommon* const driver = session.running();
-  CVexaCommon*& watched = drivers_[session.number()];
-  if (watched == driver) return;
-  if (watched != nullptr) {
-    set_.Remove(*watched);  // it is there still: a session gets another driver when it opens again
-    watched_.erase(watched);
+  const std::uint32_t streams = session.streams();
+  Watched& watched = drivers_[session.number()];
+  if (watched.driver == driver && (driver == nullptr || watched.streams == streams)) return;
+  if (watched.driver != nullptr && watched.driver != driver) {
+    set_.Remove(*watched.driver);  // it is there still: a session gets another driver when it opens again
+    watched_.erase(watched.driver);
+    watched = {};
   }
-  watched = nullptr;
-  if (driver == nullptr || !set_.Add(*driver, session.streams())) return;
-  watched = driver;
+  if (driver == nullptr || !set_.Add(*driver, streams)) return;
+  watched = {driver, streams};
   watched_[driver] = session.number();
 }
 

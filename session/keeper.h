@@ -34,7 +34,8 @@ class Keeper {
   [[nodiscard]] int descriptor() const { return epoll_; }
   [[nodiscard]] static constexpr std::uint32_t descriptors() { return 7; }
 
-  void add(const std::shared_ptr<SessionCore>& session);
+  /// False after end(): nothing more is taken.
+  [[nodiscard]] bool add(const std::shared_ptr<SessionCore>& session);
   /// A session of this keeper or of another: those of others are passed over.
   void wake(std::uint64_t number);
   void stop_all();
@@ -51,12 +52,17 @@ class Keeper {
 
  private:
   using Kept = std::map<std::uint64_t, std::shared_ptr<SessionCore>>;
+  /// A driver in the set, and for which streams.
+  struct Watched {
+    CVexaCommon* driver = nullptr;
+    std::uint32_t streams = 0;
+  };
 
   void arm(Moment deadline);
-  int serve_woken(Moment now);
+  int serve_woken();
   int serve_due(Moment now);
   int serve_ready();
-  int serve(SessionCore& session, Moment now);
+  int serve(SessionCore& session);
   void watch(SessionCore& session);
   void drop_over();
   [[nodiscard]] Kept kept() const;
@@ -75,7 +81,7 @@ class Keeper {
 
   // Of the thread that runs turns.
   std::map<CVexaCommon*, std::uint64_t> watched_;  ///< drivers in the set, and whose they are
-  std::map<std::uint64_t, CVexaCommon*> drivers_;  ///< the same by session
+  std::map<std::uint64_t, Watched> drivers_;       ///< the same by session
   std::vector<std::uint64_t> gone_;                ///< sessions that are over
   std::map<std::uint64_t, std::shared_ptr<Session>> handles_;
   Moment next_ = kNever;   ///< no session has an earlier deadline

@@ -9,6 +9,7 @@
 #include "session/clock.h"
 #include "session/core/failure_cause.h"
 #include "session/keeper.h"
+#include "vexa/failure.h"
 #include "vexa/frame_facts.h"
 #include "vexa/statistics.h"
 #include "vexa/waiting.h"
@@ -43,6 +44,10 @@ bool is_key(std::int32_t type) {
 // The enumeration has ten for each codec.
 std::int32_t codec_of(std::int32_t frame_type) { return frame_type / 10; }
 
+bool may_send(const CredentialTicket& ticket) {
+  return ticket.answer == CredentialBreaker::Answer::kGo || ticket.answer == CredentialBreaker::Answer::kTry;
+}
+
 }  // namespace
 
 // Copies and returns, as the driver asks: it holds its queue meanwhile.
@@ -67,6 +72,7 @@ SessionCore::SessionCore(std::uint64_t number, const SessionOptions& options, co
       name_(name_of(options)),
       parts_(parts),
       wake_(std::move(wake)),
+      has_threads_(parts.has_threads),
       line_(options),
       machine_((options.streams & kVideoStream) != 0, patience_of(options)),
       random_(std::random_device()() + static_cast<unsigned>(number)) {
@@ -82,14 +88,20 @@ void SessionCore::stop() {
   if (over_) return;
   stop_wanted_ = true;
   line_.cancel();
-  wake_(number_);
+  wake();
 }
 
 void SessionCore::retry() {
   if (over_) return;
   guard()->retry();
   retry_wanted_ = true;
-  wake_(number_);
+  wake();
+}
+
+// The last callback sets over_ under the same lock, and the keeper is there until then.
+void SessionCore::wake() {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  if (!over_) wake_(number_);
 }
 
 void SessionCore::set_credentials(const std::string& user, const std::string& password) {
@@ -108,7 +120,7 @@ void SessionCore::set_credentials(const std::string& user, const std::string& pa
 }
 
 bool SessionCore::wait_stopped(std::int32_t milliseconds) {
-  if (over_ || is_keeper_thread() || !parts_.has_threads) return over_;
+  if (over_ || is_keeper_thread() || !has_threads_) return over_;
   std::unique_lock<std::mutex> lock(mutex_);
   const auto is_over = [this] { return over_.load(); };
   if (milliseconds < 0) {
@@ -121,16 +133,14 @@ bool SessionCore::wait_stopped(std::int32_t milliseconds) {
 void SessionCore::note_link() {
   if (over_) return;
   link_back_ = true;
-  wake_(number_);
+  wake();
 }
 
 void SessionCore::credentials_changed() {
   if (over_) return;
   guard_changed_ = true;
-  wake_(number_);
+  wake();
 }
-
-void SessionCore::credentials_accepted() { guard()->accepted(); }
 
 std::shared_ptr<CredentialGuard> SessionCore::guard() const {
   const std::lock_guard<std::mutex> lock(mutex_);
@@ -146,46 +156,47 @@ std::shared_ptr<Session> SessionCore::handle() {
 
 // Jobs
 
-void SessionCore::report(CredentialGuard& judge, const std::optional<LineFailure>& failure) {
+void SessionCore::report(const CredentialTrial& trial, const std::optional<LineFailure>& failure) {
   if (!failure) {
-    judge.accepted();
+    trial.judge->accepted(trial.generation);
   } else if (cause_of(failure->code, failure->text) == SessionCause::kCredentials) {
-    judge.refused(monotonic_now());
+    trial.judge->refused(trial.generation, monotonic_now());
   } else {
-    judge.abandoned();
+    trial.judge->abandoned(trial.generation);
   }
 }
 
-void SessionCore::run_open(const std::shared_ptr<CredentialGuard>& judge, const std::string& user) {
-  Opened opened{line_.open(user, judge->password(), *this)};
-  if (opened.failure) report(*judge, opened.failure);
+// A camera may take the credentials for its settings and refuse them for its streams: all of it counts as one.
+void SessionCore::run_open(const CredentialTrial& trial, const std::string& user, const std::string& password) {
+  Opened opened{line_.open(user, password, *this), trial};
+  report(trial, opened.failure);
   {
     const std::lock_guard<std::mutex> lock(mutex_);
     opened_ = std::move(opened);
   }
   parts_.turns.leave(number_);
-  wake_(number_);
+  wake();
 }
 
-void SessionCore::run_side(std::uint32_t stream, const std::shared_ptr<CredentialGuard>& judge) {
-  Opened opened{line_.start(stream)};
-  report(*judge, opened.failure);
+void SessionCore::run_side(std::uint32_t stream, const CredentialTrial& trial) {
+  Opened opened{line_.start(stream), trial};
+  report(trial, opened.failure);
   {
     const std::lock_guard<std::mutex> lock(mutex_);
     side_ = std::make_pair(stream, std::move(opened));
   }
-  wake_(number_);
+  wake();
 }
 
-void SessionCore::run_probe(const std::shared_ptr<CredentialGuard>& judge) {
+void SessionCore::run_probe(const CredentialTrial& trial) {
   const std::optional<LineFailure> failure = line_.ask();
-  report(*judge, failure);
+  report(trial, failure);
   const bool answered = !failure || is_refusal(cause_of(failure->code, failure->text));
   {
     const std::lock_guard<std::mutex> lock(mutex_);
     probed_ = answered ? monotonic_now() : Moment::min();
   }
-  wake_(number_);
+  wake();
 }
 
 void SessionCore::run_close() {
@@ -194,7 +205,7 @@ void SessionCore::run_close() {
     const std::lock_guard<std::mutex> lock(mutex_);
     closed_ = true;
   }
-  wake_(number_);
+  wake();
 }
 
 // The keeper's turn
@@ -203,11 +214,12 @@ int SessionCore::turn(Moment now) {
   if (over_) return 0;
   obey(now);
   take_results(now);
-  watch_silence(now);
+  const int made = watch_silence(now);
+  now = monotonic_now();
   if (close_due_ && !job_ && !side_job_) begin_close();
   if (!job_ && !close_due_ && (machine_.is_due(now) || waits_for_turn())) begin_attempt(now);
   if (lost_ != 0 && running_ && !close_due_ && !side_job_ && now >= side_due_) begin_side(now);
-  return publish();
+  return made + publish();
 }
 
 // Its turn comes at no time that could be planned: each wake-up may be it.
@@ -217,13 +229,23 @@ bool SessionCore::waits_for_turn() const {
 }
 
 void SessionCore::obey(Moment now) {
-  if (link_back_.exchange(false)) machine_.link_back(now);
+  if (link_back_.exchange(false) && machine_.link_back(now)) end_line();
   if (guard_changed_.exchange(false)) machine_.credentials_changed(now);
   if (retry_wanted_.exchange(false)) machine_.retry(now);
   if (!stop_wanted_ || machine_.is_stopping()) return;
   machine_.stop(now);
   parts_.turns.leave(number_);
-  close_due_ = running_;
+  if (running_) end_line();
+}
+
+// A job beside the streams would keep them from being closed: it ends, or does not begin.
+void SessionCore::end_line() {
+  close_due_ = true;
+  if (!side_job_) return;
+  line_.cancel();
+  if (side_begun_->exchange(true)) return;
+  side_job_ = false;
+  trial_.judge->abandoned(trial_.generation);
 }
 
 void SessionCore::take_results(Moment now) {
@@ -245,6 +267,7 @@ void SessionCore::take_results(Moment now) {
       side_due_ = now + side_back_off_.next(chance());
     } else {
       lost_ &= ~side->first;
+      side_since_ = now;
       side_due_ = lost_ == 0 ? kNever : now;
     }
   }
@@ -269,8 +292,10 @@ void SessionCore::after_open(const Opened& opened, Moment now) {
     asked_ = false;
     lost_ = 0;
     side_due_ = kNever;
+    side_since_ = now;
+    was_broken_ = is_broken();
     machine_.opened(now);
-    close_due_ = machine_.is_stopping();
+    if (machine_.is_stopping()) end_line();
     return;
   }
   const LineFailure& failure = *opened.failure;
@@ -282,7 +307,10 @@ void SessionCore::after_open(const Opened& opened, Moment now) {
     machine_.failed(failure.code, failure.text, chance(), now);
     return;
   }
-  machine_.refused_credentials(failure.code, failure.text, guard()->retry_at(), now);
+  // Others that the host has set meanwhile are tried at once.
+  const bool is_current = opened.trial.judge == guard();
+  const Moment next = is_current ? opened.trial.judge->next_try(opened.trial.generation, now) : now;
+  machine_.refused_credentials(failure.code, failure.text, next, now);
 }
 
 void SessionCore::begin_attempt(Moment now) {
@@ -297,55 +325,67 @@ void SessionCore::begin_attempt(Moment now) {
     judge = guard_;
     user = user_;
   }
-  const CredentialBreaker::Answer answer = judge->ask(now);
-  if (answer == CredentialBreaker::Answer::kWait || answer == CredentialBreaker::Answer::kRefused) {
+  const CredentialTicket ticket = judge->ask(now);
+  if (!may_send(ticket)) {
     parts_.turns.leave(number_);
-    const bool refused = judge->is_refused();
-    machine_.hold(refused ? SessionCause::kCredentials : SessionCause::kOtherTrial,
-                  refused ? judge->retry_at() : kNever, now);
+    machine_.hold(ticket.is_refused ? SessionCause::kCredentials : SessionCause::kOtherTrial, ticket.next, now);
     return;
   }
   ++parts_.counts.attempts;
   machine_.connecting(now);
   job_ = true;
+  trial_ = {judge, ticket.generation};
   auto self = shared_from_this();
-  if (parts_.connectors.post([self, judge, user] { self->run_open(judge, user); })) return;
+  const auto open = [self, trial = trial_, user, password = ticket.password] { self->run_open(trial, user, password); };
+  if (parts_.connectors.post(open)) return;
   job_ = false;
-  judge->abandoned();
+  judge->abandoned(ticket.generation);
   parts_.turns.leave(number_);
   machine_.failed(LIBD_FAILED, "no thread could be made", chance(), now);
 }
 
 void SessionCore::begin_close() {
   close_due_ = false;
-  if (!stop_wanted_) guard()->doubt();
+  if (!stop_wanted_) trial_.judge->doubt();
   job_ = true;
   running_ = false;
   auto self = shared_from_this();
   if (!parts_.closers.post([self] { self->run_close(); })) run_close();
 }
 
+// The driver sends the credentials that it was opened with: what has been replaced since is not sent again.
 void SessionCore::begin_side(Moment now) {
-  const std::shared_ptr<CredentialGuard> judge = guard();
   const std::uint32_t stream = lost_ & (~lost_ + 1);  // the lowest
   auto self = shared_from_this();
   side_due_ = now + BackOff::kLastLimit;
-  const CredentialBreaker::Answer answer = judge->ask(now);
-  if (answer == CredentialBreaker::Answer::kWait || answer == CredentialBreaker::Answer::kRefused) return;
-  side_job_ = parts_.connectors.post([self, stream, judge] { self->run_side(stream, judge); });
-  if (!side_job_) judge->abandoned();
+  if (!trial_.judge->is_current(trial_.generation)) return;
+  const CredentialTicket ticket = trial_.judge->ask(now);
+  if (!may_send(ticket)) return;
+  const CredentialTrial trial{trial_.judge, ticket.generation};
+  side_job_ = post_side([self, stream, trial] { self->run_side(stream, trial); });
+  if (!side_job_) trial.judge->abandoned(trial.generation);
+}
+
+// Whichever of its thread and the keeper marks it first decides whether the job is done.
+bool SessionCore::post_side(const std::function<void()>& job) {
+  side_begun_ = std::make_shared<std::atomic<bool>>(false);
+  return parts_.sides.post([begun = side_begun_, job] {
+    if (!begun->exchange(true)) job();
+  });
 }
 
 // Whether the camera answers while it sends nothing; once a silence. It may have been set up anew meanwhile, so that of
 // its sessions one finds out whether it still takes the credentials.
 void SessionCore::begin_probe(Moment now) {
   asked_ = true;
-  const std::shared_ptr<CredentialGuard> judge = guard();
-  judge->doubt();
-  if (judge->ask(now) != CredentialBreaker::Answer::kTry) return;
+  if (!trial_.judge->is_current(trial_.generation)) return;
+  trial_.judge->doubt();
+  const CredentialTicket ticket = trial_.judge->ask(now);
+  if (ticket.answer != CredentialBreaker::Answer::kTry) return;
   auto self = shared_from_this();
-  side_job_ = parts_.connectors.post([self, judge] { self->run_probe(judge); });
-  if (!side_job_) judge->abandoned();
+  const CredentialTrial trial{trial_.judge, ticket.generation};
+  side_job_ = post_side([self, trial] { self->run_probe(trial); });
+  if (!side_job_) trial.judge->abandoned(trial.generation);
 }
 
 void SessionCore::read_evidence(Moment now) {
@@ -356,15 +396,36 @@ void SessionCore::read_evidence(Moment now) {
   evidence_.video = now - std::chrono::duration_cast<Moment>(since);
 }
 
-void SessionCore::watch_silence(Moment now) {
-  if (running_ && now >= machine_.deadline()) judge_silence(now);
+// The keeper may be late, for callbacks of this host: what has come meanwhile is taken first.
+int SessionCore::watch_silence(Moment now) {
+  if (!running_ || close_due_ || now < machine_.deadline()) return 0;
+  const std::uint64_t before = pictures_;
+  const int made = take_video();
+  now = monotonic_now();
+  if (pictures_ == before && !close_due_ && now >= machine_.deadline()) judge_silence(now);
+  return made;
+}
+
+// The stream's thread meets the end of its connection, of which polls report silence alone.
+bool SessionCore::is_broken() const {
+  const FailureReport latest = LastFailure(*line_.driver());
+  return latest.operation == "StreamingThread" && latest.code == LIBD_FAILED && !latest.cancelled;
+}
+
+bool SessionCore::lose_if_broken(Moment now) {
+  const bool broken = is_broken();
+  was_broken_ = was_broken_ && broken;
+  if (!broken || was_broken_) return false;
+  lose(kVideoStream, LIBD_FAILED, now);
+  return true;
 }
 
 void SessionCore::judge_silence(Moment now) {
+  if (lose_if_broken(now)) return;
   read_evidence(now);
   machine_.evidence(evidence_);
   if (machine_.is_hopeless(chance(), now)) {
-    close_due_ = true;
+    end_line();
   } else if (machine_.status().cause == SessionCause::kNoBytes && !asked_ && !side_job_) {
     begin_probe(now);
   }
@@ -380,13 +441,19 @@ Moment SessionCore::deadline() const {
 int SessionCore::publish() {
   int made = 0;
   while (auto event = machine_.events().take()) {
-    parts_.counts.events_missed += event->missed;
+    const bool last = event->state == SessionState::kStopped;
+    const bool shown = last || !stop_wanted_;
+    parts_.counts.events_missed += event->missed + (shown ? 0 : 1);
+    if (shown) {
+      event->missed += std::exchange(unshown_, 0);
+    } else {
+      unshown_ += event->missed + 1;
+    }
     {
       const std::lock_guard<std::mutex> lock(mutex_);
       status_ = *event;
     }
-    const bool last = event->state == SessionState::kStopped;
-    if (callbacks_.state && (last || !stop_wanted_)) made += call([&] { callbacks_.state(*handle(), *event); });
+    if (callbacks_.state && shown) made += call([&] { callbacks_.state(*handle(), *event); });
     if (!last) continue;
     {
       const std::lock_guard<std::mutex> lock(mutex_);
@@ -400,29 +467,34 @@ int SessionCore::publish() {
 // What the camera sends
 
 int SessionCore::take(std::uint32_t streams, Moment now) {
-  if (!running_) return 0;
+  if (!running_ || close_due_) return turn(now);
   int made = 0;
-  if ((streams & kVideoStream) != 0) made += take_video(now);
+  if ((streams & kVideoStream) != 0) made += take_video();
   if ((streams & ~lost_ & kAlarmStream) != 0) made += take_alarms(now);
   if ((streams & ~lost_ & kMetadataStream) != 0) made += take_metadata(now);
   if ((streams & ~lost_ & kAudioStream) != 0) made += take_audio(now);
   return made + turn(monotonic_now());
 }
 
-int SessionCore::take_video(Moment now) {
+int SessionCore::take_video() {
   int made = 0;
   for (int taken = 0; taken < kMostPictures && !stop_wanted_; ++taken) {
     Sink sink(picture_);
     SLibDVideoFrameInfo frame;
     frame.sink = &sink;
     FrameFacts facts;
+    picture_.clear();
     const ELibDReturnCode result = GetCurrentVideoFrame(*line_.driver(), frame, facts);
+    if (result == LIBD_NO_FRAME) break;
+    const Moment now = monotonic_now();  // callbacks may have taken long
     // Silence is the machine's to judge.
-    if (result == LIBD_NO_FRAME || result == LIBD_TIMEOUT) break;
+    if (result == LIBD_TIMEOUT && !lose_if_broken(now)) break;
     if (result != LIBD_OK) {
       lose(kVideoStream, result, now);
       break;
     }
+    if (picture_.empty()) continue;  // one that was damaged
+    ++pictures_;
     made += show(frame, facts.discontinuity, now);
   }
   return made;
@@ -496,15 +568,17 @@ int SessionCore::take_audio(Moment now) {
 
 // Video that runs goes on without the other streams, which are started again by themselves.
 void SessionCore::lose(std::uint32_t stream, ELibDReturnCode code, Moment now) {
+  if (close_due_) return;
   const bool video = (options_.streams & kVideoStream) != 0;
   if (stream != kVideoStream && video) {
+    side_back_off_.prove(side_since_, now);
     if (side_due_ == kNever) side_due_ = now + side_back_off_.next(chance());
     lost_ |= stream;
     return;
   }
   const std::string text = line_.latest_text();
   machine_.failed(code, text, chance(), now);
-  close_due_ = true;
+  end_line();
 }
 
 template <typename Call>

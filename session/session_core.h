@@ -52,25 +52,29 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   int take(std::uint32_t streams, Moment now);
   [[nodiscard]] Moment deadline() const;
   /// The driver whose streams are to be waited for; null while none run.
-  [[nodiscard]] CVexaCommon* running() const { return running_ ? line_.driver() : nullptr; }
-  [[nodiscard]] std::uint32_t streams() const { return options_.streams; }
+  [[nodiscard]] CVexaCommon* running() const { return running_ && !close_due_ ? line_.driver() : nullptr; }
+  /// Those of them that run: what is lost would be ready again and again.
+  [[nodiscard]] std::uint32_t streams() const { return options_.streams & ~lost_; }
   /// What the host knows the session by.
   [[nodiscard]] std::shared_ptr<Session> handle();
 
  private:
   struct Opened {
     std::optional<LineFailure> failure;
+    CredentialTrial trial;
   };
   struct Sink;
 
   [[nodiscard]] std::shared_ptr<CredentialGuard> guard() const;
 
   // Jobs.
-  static void report(CredentialGuard& judge, const std::optional<LineFailure>& failure);
-  void run_open(const std::shared_ptr<CredentialGuard>& judge, const std::string& user);
-  void run_side(std::uint32_t stream, const std::shared_ptr<CredentialGuard>& judge);
-  void run_probe(const std::shared_ptr<CredentialGuard>& judge);
+  static void report(const CredentialTrial& trial, const std::optional<LineFailure>& failure);
+  void run_open(const CredentialTrial& trial, const std::string& user, const std::string& password);
+  void run_side(std::uint32_t stream, const CredentialTrial& trial);
+  void run_probe(const CredentialTrial& trial);
   void run_close();
+  /// Wakes the keeper, which outlives the session's end and not the session.
+  void wake();
 
   // Steps of a turn.
   void obey(Moment now);
@@ -78,15 +82,19 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   void after_open(const Opened& opened, Moment now);
   void begin_attempt(Moment now);
   [[nodiscard]] bool waits_for_turn() const;
+  void end_line();
   void begin_close();
+  [[nodiscard]] bool post_side(const std::function<void()>& job);
   void begin_side(Moment now);
   void begin_probe(Moment now);
   void read_evidence(Moment now);
-  void watch_silence(Moment now);
+  int watch_silence(Moment now);
   void judge_silence(Moment now);
+  [[nodiscard]] bool is_broken() const;
+  [[nodiscard]] bool lose_if_broken(Moment now);
   int publish();
 
-  int take_video(Moment now);
+  int take_video();
   int take_alarms(Moment now);
   int take_metadata(Moment now);
   int take_audio(Moment now);
@@ -99,7 +107,6 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
 
   // CredentialWaiter and CameraLine::Watcher.
   void credentials_changed() override;
-  void credentials_accepted() override;
   [[nodiscard]] bool is_cancelled() const override { return stop_wanted_; }
 
   const std::uint64_t number_;
@@ -108,6 +115,7 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   const std::string name_;
   GroupParts& parts_;
   const Wake wake_;
+  const bool has_threads_;
 
   // Of any thread.
   std::atomic<bool> stop_wanted_{false};
@@ -134,15 +142,21 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   std::minstd_rand random_;
   bool job_ = false;       ///< one that opens or closes is under way
   bool side_job_ = false;  ///< one that starts a stream or asks for an answer, beside those that run
-  bool running_ = false;   ///< streams are open
+  std::shared_ptr<std::atomic<bool>> side_begun_;  ///< set by who comes first: its thread, or the keeper to drop it
+  CredentialTrial trial_;                          ///< credentials of what is open or being opened
+  bool running_ = false;                           ///< streams are open
   bool close_due_ = false;
   bool first_ = true;  ///< the next picture is the first of its connection
   std::int32_t codec_ = -1;
   std::uint32_t lost_ = 0;  ///< StreamBits that run no more, while video does
   BackOff side_back_off_;
+  Moment side_since_{0};  ///< none was lost or started again since
   Moment side_due_ = kNever;
   MediaEvidence evidence_;
-  bool asked_ = false;  ///< for an answer, since the latest picture
+  bool asked_ = false;          ///< for an answer, since the latest picture
+  bool was_broken_ = false;     ///< the driver's latest failure is one of a connection before
+  std::uint64_t pictures_ = 0;  ///< taken
+  std::uint64_t unshown_ = 0;   ///< events that the host did not get since it asked for the end
   std::vector<unsigned char> picture_;
   std::vector<unsigned char> sound_;
 };

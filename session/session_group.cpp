@@ -1,12 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <algorithm>
 #include <atomic>
+#include <exception>
 #include <memory>
 #include <new>
-#include <system_error>
 #include <thread>
 #include <vector>
 
+#include "session/blocked_signals.h"
 #include "session/keeper.h"
 #include "vexa/session.h"
 
@@ -22,26 +23,38 @@ class SessionGroup::Impl {
     for (int i = 0; i < keepers; ++i) keepers_.push_back(std::make_unique<Keeper>(parts_));
     usable_ = std::all_of(keepers_.begin(), keepers_.end(), [](const auto& keeper) { return keeper->is_usable(); });
     if (!usable_ || !parts_.has_threads) return;
+    const BlockedSignals none;
     try {
+      threads_.reserve(keepers_.size());  // a thread that is made has its place
       for (const auto& keeper : keepers_) {
         threads_.emplace_back([this, &keeper] { keeper->run([this] { note_link(); }); });
       }
-    } catch (const std::system_error&) {
+    } catch (const std::exception&) {
       usable_ = false;
     }
   }
+  Impl(const Impl&) = delete;
+  Impl& operator=(const Impl&) = delete;
+  ~Impl() = default;
 
-  ~Impl() {
-    for (const auto& keeper : keepers_) {
-      keeper->stop_all();
-      keeper->end();
+  /// Null when memory is short.
+  static std::unique_ptr<Impl> make(const SessionGroupOptions& options) {
+    try {
+      return std::make_unique<Impl>(options);
+    } catch (const std::exception&) {
+      return nullptr;
     }
+  }
+
+  /// Stops all sessions and waits for them. Their last callbacks may still call this group.
+  void finish() {
+    // Nothing more is opened once the end has begun, so that it comes.
+    for (const auto& keeper : keepers_) keeper->end();
+    for (const auto& keeper : keepers_) keeper->stop_all();
     for (std::thread& thread : threads_) thread.join();
     // Without threads this one finishes what there is.
     while (usable_ && !parts_.has_threads && keepers_.front()->size() > 0) process(-1);
   }
-  Impl(const Impl&) = delete;
-  Impl& operator=(const Impl&) = delete;
 
   std::shared_ptr<Session> open(const SessionOptions& options, const SessionCallbacks& callbacks) {
     if (!usable_) return nullptr;
@@ -50,8 +63,7 @@ class SessionGroup::Impl {
     const auto core = SessionCore::make(number, options, callbacks, parts_,
                                         [&keeper](std::uint64_t session) { keeper.wake(session); });
     std::shared_ptr<Session> session = core->handle();
-    keeper.add(core);
-    return session;
+    return keeper.add(core) ? session : nullptr;
   }
 
   [[nodiscard]] int descriptor() const { return usable_ && !parts_.has_threads ? keepers_.front()->descriptor() : -1; }
@@ -65,8 +77,8 @@ class SessionGroup::Impl {
     const GroupCounts& counts = parts_.counts;
     SessionMetrics metrics;
     for (const auto& keeper : keepers_) metrics.sessions += static_cast<std::uint32_t>(keeper->size());
-    metrics.threads =
-        static_cast<std::uint32_t>(threads_.size() + parts_.connectors.threads() + parts_.closers.threads());
+    metrics.threads = static_cast<std::uint32_t>(threads_.size() + parts_.connectors.threads() +
+                                                 parts_.sides.threads() + parts_.closers.threads());
     metrics.descriptors = static_cast<std::uint32_t>(keepers_.size()) * Keeper::descriptors();
     metrics.wakeUps = counts.wake_ups;
     metrics.longestCallback = counts.longest_callback;
@@ -92,15 +104,17 @@ class SessionGroup::Impl {
   std::atomic<std::uint64_t> latest_{0};
 };
 
-SessionGroup::SessionGroup(const SessionGroupOptions& options) : impl_(new (std::nothrow) Impl(options)) {}
+SessionGroup::SessionGroup(const SessionGroupOptions& options) : impl_(Impl::make(options)) {}
 
-SessionGroup::~SessionGroup() = default;
+SessionGroup::~SessionGroup() {
+  if (impl_) impl_->finish();
+}
 
 std::shared_ptr<Session> SessionGroup::Open(const SessionOptions& options, const SessionCallbacks& callbacks) {
   if (!impl_) return nullptr;
   try {
     return impl_->open(options, callbacks);
-  } catch (const std::bad_alloc&) {
+  } catch (const std::exception&) {
     return nullptr;
   }
 }

@@ -3,7 +3,11 @@
 #include <fmt/format.h>
 
 #include <CLI/CLI.hpp>
+#include <algorithm>
+#include <cerrno>
+#include <iterator>
 #include <nlohmann/json.hpp>
+#include <system_error>
 
 #include "host/base/printable.h"
 #include "host/commands/action_group.h"
@@ -77,6 +81,17 @@ class SetPresetAction final : public OnePresetAction {
   std::string name_;
 };
 
+// Whether a failure is the camera's answer: neither an interrupt nor an error of the connection.
+bool was_answered(CLibraryDevice& device) {
+  if (was_interrupted(device)) return false;
+  std::string text;
+  device.GetLatestErrorText(text);
+  constexpr int kErrors[] = {ECONNREFUSED, ECONNRESET, EPIPE, EHOSTUNREACH, ENETUNREACH, ETIMEDOUT};
+  return std::none_of(std::begin(kErrors), std::end(kErrors), [&text](int error) {
+    return text.find(std::generic_category().message(error)) != std::string::npos;
+  });
+}
+
 class RecallPresetAction final : public OnePresetAction {
  public:
   CLI::App* declare(CLI::App& group) override {
@@ -88,7 +103,7 @@ class RecallPresetAction final : public OnePresetAction {
  private:
   ELibDReturnCode act(CLibraryDevice& device, int index) override { return device.RecallPreset(index); }
   [[nodiscard]] Problem explain(const ModelCamera& camera, ELibDReturnCode result) const override {
-    if (result != LIBD_FAILED) return camera.explain_change(preset(), result);
+    if (result != LIBD_FAILED || !was_answered(camera.device())) return camera.explain_change(preset(), result);
     Problem problem = camera.explain_change(preset(), result);
     problem.text = fmt::format("the camera {} does not go to {}", to_string(camera.address()), preset());
     problem.advice =

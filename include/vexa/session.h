@@ -30,6 +30,14 @@
 // takes long delays the other cameras of its thread. One that throws has ended: the exception goes no further and is
 // counted (SessionMetrics::exceptions).
 //
+// Credentials are known by the camera's address, its port and the user name, for the whole process: of two sessions
+// with different passwords for the same, the latest password is that of both. What runs keeps its credentials, and its
+// keep-alives send them on; connections made anew, and streams beside video, do not send what was replaced or refused.
+//
+// Alarms, metadata and audio are polled on the thread that calls the host: a camera that sends the beginning of a part
+// and not the rest delays the other cameras of that thread, up to its time-out. Hosts with such cameras give a group
+// more threads.
+//
 // Sessions do not survive fork: the child has neither their threads nor their connections, and may only end or exec.
 #pragma once
 
@@ -121,7 +129,8 @@ class VEXA_API Session {
   /// Makes an attempt now. Refused credentials are sent once more; without this or another password no session of the
   /// process sends them again, one that is opened later included.
   void Retry();
-  /// For the attempts from now on, also by other sessions of the same camera and user. What runs goes on.
+  /// For the attempts from now on, also by other sessions of the same camera and user. What runs goes on; a stream
+  /// beside its video that is lost meanwhile is started again with the next connection.
   void SetCredentials(const std::string& userName, const std::string& password);
   /// As in the options, or the camera's address.
   const std::string& Name() const;
@@ -164,7 +173,7 @@ class VEXA_API SessionGroup {
   SessionGroup& operator=(const SessionGroup&) = delete;
 
   /// Begins a session; its first attempt is made at once. Null when the group could not be made for want of memory,
-  /// threads or descriptors. Any thread.
+  /// threads or descriptors, and in a callback while the group is being destroyed. Any thread.
   std::shared_ptr<Session> Open(const SessionOptions& options, const SessionCallbacks& callbacks);
 
   /// Of a group without threads: readable while there is something to do for Process. -1 for a group with threads.

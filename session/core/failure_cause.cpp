@@ -14,7 +14,7 @@ struct Phrase {
 
 // The phrases of HTTP's and RTSP's status codes, and the system's texts. The first that is found counts.
 constexpr Phrase kPhrases[] = {{"unauthorized", SessionCause::kCredentials},
-                               {"forbidden", SessionCause::kCredentials},
+                               {"forbidden", SessionCause::kUnsupported},
                                {"not enough bandwidth", SessionCause::kBusy},
                                {"service unavailable", SessionCause::kBusy},
                                {"too many", SessionCause::kBusy},

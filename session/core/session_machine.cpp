@@ -35,6 +35,7 @@ void SessionMachine::retry(Moment now) {
 
 void SessionMachine::connecting(Moment now) {
   line_ = Line::kOpening;
+  link_news_ = false;
   due_ = kNever;
   ++attempt_;
   enter(SessionState::kConnecting, reason_, now);
@@ -61,6 +62,7 @@ void SessionMachine::opened(Moment now) {
 }
 
 bool SessionMachine::leave_line(Moment now) {
+  if (line_ == Line::kOpen && !wants_video_) back_off_.prove(live_since_, now);
   line_ = line_ == Line::kOpen ? Line::kClosing : Line::kClosed;
   if (stopping_ && line_ == Line::kClosed) closed(now);
   return stopping_;
@@ -74,8 +76,13 @@ void SessionMachine::refused(SessionCause cause, ELibDReturnCode code, const std
                              Moment now) {
   if (leave_line(now)) return;
   reason_ = cause;
-  due_ = now + back_off_.next(chance);
+  plan(chance, now);
   enter_failed(is_refusal(reason_) ? SessionState::kRefused : SessionState::kWaiting, reason_, code, text, now);
+}
+
+void SessionMachine::plan(double chance, Moment now) {
+  due_ = now + back_off_.next(chance);
+  if (std::exchange(link_news_, false) && !is_refusal(reason_)) due_ = now + BackOff::kLeast;
 }
 
 void SessionMachine::refused_credentials(ELibDReturnCode code, const std::string& text, Moment until, Moment now) {
@@ -88,6 +95,7 @@ void SessionMachine::refused_credentials(ELibDReturnCode code, const std::string
 void SessionMachine::picture(Moment now) {
   if (line_ != Line::kOpen) return;
   has_picture_ = true;
+  link_news_ = false;
   last_picture_ = now;
   if (status().state != SessionState::kLive) {
     attempt_ = 0;
@@ -101,12 +109,23 @@ void SessionMachine::stream_changed(Moment now) {
   if (status().state == SessionState::kLive) enter(SessionState::kLive, SessionCause::kStreamChanged, now);
 }
 
-void SessionMachine::link_back(Moment now) {
-  const bool waits = status().state == SessionState::kWaiting && !stopping_ && line_ == Line::kClosed;
+bool SessionMachine::link_back(Moment now) {
+  const SessionState state = status().state;
   const SessionCause cause = status().cause;
-  if (!waits || cause == SessionCause::kTurn || cause == SessionCause::kOtherTrial) return;
-  if (now - link_back_ < kBetweenLinks) return;
-  link_back_ = due_ = now;
+  if (stopping_) return false;
+  if (state == SessionState::kConnecting) link_news_ = true;
+  const bool stalled = state == SessionState::kStalled && line_ == Line::kOpen;
+  const bool waits =
+      state == SessionState::kWaiting && cause != SessionCause::kTurn && cause != SessionCause::kOtherTrial;
+  if (!stalled && !waits) return false;
+  const Moment at = std::max(now, link_back_ + kBetweenLinks);
+  if (waits && at >= due_) return false;
+  due_ = link_back_ = at;
+  if (!stalled) return false;
+  reason_ = cause;
+  line_ = Line::kClosing;
+  enter_failed(SessionState::kWaiting, reason_, LIBD_TIMEOUT, "", now);
+  return true;
 }
 
 void SessionMachine::credentials_changed(Moment now) {
@@ -126,7 +145,7 @@ bool SessionMachine::is_hopeless(double chance, Moment now) {
   if (silence >= (has_picture_ ? patience_.give_up : patience_.first_picture)) {
     reason_ = cause_of_silence(now);
     line_ = Line::kClosing;
-    due_ = now + back_off_.next(chance);
+    plan(chance, now);
     enter_failed(SessionState::kWaiting, reason_, LIBD_TIMEOUT, "", now);
     return true;
   }
@@ -162,9 +181,11 @@ void SessionMachine::enter_failed(SessionState state, SessionCause cause, ELibDR
   status.code = code;
   status.text = text;
   status.attempt = attempt_;
-  status.since = now.count();
   status.nextAttempt = due_ == kNever ? 0 : due_.count();
+  // A stall is reported as long as the silence is.
+  status.since = (state == SessionState::kStalled ? last_sign() : now).count();
   status.why = why_not_live(status, now);
+  status.since = now.count();
   events_.put(std::move(status));
 }
 

@@ -56,8 +56,10 @@ class SessionMachine {
   /// The stream of a live session has another codec, size or clock than before.
   void stream_changed(Moment now);
   void evidence(const MediaEvidence& latest) { seen_ = latest; }
-  /// Link or route is back: what waits for an answer of the camera tries at once, yet once a second at most.
-  void link_back(Moment now);
+  /// Link or route is back: what waits for an answer of the camera tries at once, yet once a second at most; an attempt
+  /// that is under way is followed by the next at once. True when what is open has stalled and is to be closed: then
+  /// closed() follows.
+  [[nodiscard]] bool link_back(Moment now);
   /// Whatever was open is closed.
   void closed(Moment now);
   /// Time has passed. True when what is open is to be closed, since its pictures do not come: then closed() follows.
@@ -81,6 +83,8 @@ class SessionMachine {
   void enter(SessionState state, SessionCause cause, Moment now);
   void enter_failed(SessionState state, SessionCause cause, ELibDReturnCode code, const std::string& text, Moment now);
   [[nodiscard]] SessionCause cause_of_silence(Moment now) const;
+  /// What has failed is to be tried again: after a wait, or at once when a link was back meanwhile.
+  void plan(double chance, Moment now);
   [[nodiscard]] Moment last_sign() const { return has_picture_ ? last_picture_ : opened_; }
 
   const bool wants_video_;
@@ -92,7 +96,8 @@ class SessionMachine {
   bool stopping_ = false;
   std::uint32_t attempt_ = 0;
   Moment due_ = kNever;      ///< the next attempt
-  Moment link_back_{-1000};  ///< that was followed by an attempt
+  Moment link_back_{-1000};  ///< when the latest attempt for a link was due
+  bool link_news_ = false;   ///< a link was back during the attempt that is under way
   Moment opened_{0};
   bool has_picture_ = false;  ///< since it was opened
   Moment last_picture_{0};

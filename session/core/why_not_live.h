@@ -9,8 +9,8 @@
 
 namespace vexa {
 
-/// For instance "No answer from the camera (Connection refused): attempt 3 failed, the next is in 4 s." A live session
-/// has "Live.". The text of the camera is cut to one line of 200 characters.
+/// For instance "No answer from the camera (Connection refused); the next attempt is in 4 s." A live session has
+/// "Live."; a stalled one was silent from `since` on. The text of the camera is cut to one line of 200 characters.
 std::string why_not_live(const SessionStatus& status, Moment now);
 
 }  // namespace vexa

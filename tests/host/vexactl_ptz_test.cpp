@@ -332,6 +332,15 @@ TEST_F(PtzByCommand, WatchEndsWhenNobodyReadsItAnyMoreThoughNothingMoves) {
   EXPECT_EQ(result.err, "vexactl: cannot write standard output: Broken pipe\n  Check where it is redirected to.\n");
 }
 
+TEST_F(PtzByCommand, APresetIsNotCalledUnstoredWhenTheConnectionHasFailed) {
+  start_model("LMX-P200");
+  camera().add_request_fault(vexa::camera::RequestFault::reset("PresetCall=7"));
+  const ProgramResult result = act("preset", {"recall", "7"});
+  EXPECT_EQ(result.exit_code, 2);
+  EXPECT_THAT(result.err, testing::HasSubstr("reset"));
+  EXPECT_THAT(result.err, testing::Not(testing::HasSubstr("never stored")));
+}
+
 TEST_F(PtzByCommand, APresetThatWasNeverStoredIsRefusedWithAdviceThatFits) {
   start_model("LMX-P200");
   camera().add_request_fault(vexa::camera::RequestFault::status("PresetCall=7", "400 Bad Request"));

@@ -7,6 +7,7 @@
 #include <arpa/inet.h>
 #include <algorithm>
 #include <atomic>
+#include <csignal>
 #include <stdexcept>
 
 #include "tests/session/session_camera.h"
@@ -166,6 +167,46 @@ TEST_F(SessionWithCamera, ARetryOfTheHostsSendsRefusedCredentialsOnceMore) {
   EXPECT_TRUE(host.wait_for_live());
 }
 
+// It takes the credentials for its settings, and refuses them for its streams.
+TEST_F(SessionWithCamera, CredentialsThatOnlyStreamsRefuseStopWithTheFirstRefusal) {
+  start_camera();
+  camera().add_request_fault(RequestFault::status("DESCRIBE", "401 Unauthorized"));
+  SessionHost host;
+  SessionGroup group;
+  ASSERT_TRUE(group.Open(options(), host.callbacks()));
+  ASSERT_TRUE(host.wait_for_state(SessionState::kRefused, SessionCause::kCredentials));
+  EXPECT_EQ(host.states().back().nextAttempt, 0);
+}
+
+// The camera holds back its refusal of the former password until the right one has been set.
+TEST_F(SessionWithCamera, APasswordThatIsSetDuringAnAttemptIsTriedAfterIt) {
+  start_camera();
+  camera().add_request_fault(RequestFault::slow("inq=system", std::chrono::milliseconds(300)));
+  SessionOptions wrong = options();
+  wrong.connection.password = "wrong";
+  SessionHost host;
+  host.on_state = [](Session& session, const SessionStatus& status) {
+    if (status.state == SessionState::kConnecting) session.SetCredentials("operator", "tr0ub4dor");
+  };
+  SessionGroup group;
+  ASSERT_TRUE(group.Open(wrong, host.callbacks()));
+  EXPECT_TRUE(host.wait_for_live());
+}
+
+TEST_F(SessionWithCamera, AnotherUserThatIsSetDuringAnAttemptIsTriedAfterIt) {
+  start_camera();
+  camera().add_request_fault(RequestFault::slow("inq=system", std::chrono::milliseconds(300)));
+  SessionOptions wrong = options();
+  wrong.connection.userName = "nobody";
+  SessionHost host;
+  host.on_state = [](Session& session, const SessionStatus& status) {
+    if (status.state == SessionState::kConnecting) session.SetCredentials("operator", "tr0ub4dor");
+  };
+  SessionGroup group;
+  ASSERT_TRUE(group.Open(wrong, host.callbacks()));
+  EXPECT_TRUE(host.wait_for_live());
+}
+
 TEST_F(SessionWithCamera, WhatTheCameraRefusesIsNamed) {
   const struct {
     const char* status;
@@ -181,7 +222,10 @@ TEST_F(SessionWithCamera, WhatTheCameraRefusesIsNamed) {
     SessionGroup group;
     ASSERT_TRUE(group.Open(options(), host.callbacks()));
     ASSERT_TRUE(host.wait_for_state(SessionState::kRefused, row.cause));
-    EXPECT_NE(host.states().back().nextAttempt, 0);
+    const auto states = host.states();
+    const auto refused =
+        std::find_if(states.begin(), states.end(), [](const auto& s) { return s.state == SessionState::kRefused; });
+    EXPECT_NE(refused->nextAttempt, 0);
   }
 }
 
@@ -272,6 +316,69 @@ TEST_F(SessionWithCamera, AStopFromWithinACallbackReturnsAndOneCallMoreFollows) 
   EXPECT_EQ(at_stop, 1U);
   EXPECT_EQ(host.frames().size(), 1U);
   EXPECT_TRUE(camera().journal().wait_for_count("TEARDOWN", 1, std::chrono::seconds(30)));
+}
+
+// Live again with another codec: the stop in the first of the two events withholds the second.
+TEST_F(SessionWithCamera, EventsThatAStopHasWithheldAreCountedByTheLastOne) {
+  CameraOptions camera_options;
+  camera_options.profile_path = VEXA_SOURCE_DIR "/models/profiles/LMX-C100.json";
+  start_camera(camera_options);
+  SessionHost host;
+  host.on_state = [](Session& session, const SessionStatus& status) {
+    if (status.state == SessionState::kLive && status.cause != SessionCause::kAsked) session.Stop();
+  };
+  SessionGroup group;
+  const auto session = group.Open(options(), host.callbacks());
+  ASSERT_TRUE(host.wait_for_live());
+  camera().unplug();
+  ASSERT_TRUE(
+      host.wait_for([](const auto& states, const auto&) { return states.back().state == SessionState::kWaiting; }));
+  camera().settings().set("camera", "ImageCodec1", "jpeg");
+  camera().plug();
+  session->Retry();
+  ASSERT_TRUE(session->WaitStopped(30000));
+  const auto states = host.states();
+  ASSERT_EQ(states.back().state, SessionState::kStopped);
+  EXPECT_EQ(states.back().missed, 1U);
+  EXPECT_EQ(states.back().event, states[states.size() - 2].event + 2);
+}
+
+TEST(SessionsWithoutACamera, ACallbackCannotOpenASessionWhileItsGroupIsBeingDestroyed) {
+  SessionOptions nowhere;
+  nowhere.connection.host = vexa_test::own_loopback(1);
+  nowhere.connection.port = 9;
+  for (const int threads : {1, 2, 0}) {
+    SessionHost host;
+    SessionHost late;
+    std::atomic<int> refused{0};
+    SessionGroupOptions group_options;
+    group_options.threads = threads;
+    auto* const group = new SessionGroup(group_options);
+    host.on_state = [&](Session&, const SessionStatus& status) {
+      if (status.state == SessionState::kStopped && !group->Open(nowhere, late.callbacks())) ++refused;
+    };
+    ASSERT_TRUE(group->Open(nowhere, host.callbacks()));
+    delete group;
+    EXPECT_EQ(refused, 1) << threads;
+    EXPECT_TRUE(late.states().empty());
+  }
+}
+
+TEST(SessionsWithoutACamera, ThreadsOfTheLibraryTakeNoSignals) {
+  SessionOptions nowhere;
+  nowhere.connection.host = vexa_test::own_loopback(1);
+  nowhere.connection.port = 9;
+  SessionHost host;
+  std::atomic<int> blocked{-1};
+  host.on_state = [&blocked](Session&, const SessionStatus&) {
+    sigset_t mask;
+    pthread_sigmask(SIG_SETMASK, nullptr, &mask);
+    blocked = sigismember(&mask, SIGTERM) + sigismember(&mask, SIGCHLD);
+  };
+  SessionGroup group;
+  ASSERT_TRUE(group.Open(nowhere, host.callbacks()));
+  ASSERT_TRUE(host.wait_for([](const auto& states, const auto&) { return states.size() >= 2; }));
+  EXPECT_EQ(blocked, 2);
 }
 
 TEST_F(SessionWithCamera, EveryCallIsAllowedInACallbackAndReturnsAtOnce) {

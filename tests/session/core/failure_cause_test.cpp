@@ -16,7 +16,7 @@ TEST(FailureCause, GoesByTheCodeAndThePhraseOfTheCamera) {
     SessionCause cause;
   } cases[] = {{LIBD_UNAUTHORIZED, "", SessionCause::kCredentials},
                {LIBD_STREAM_OPEN_FAILED, "Unauthorized", SessionCause::kCredentials},
-               {LIBD_FAILED, "403 FORBIDDEN", SessionCause::kCredentials},
+               {LIBD_FAILED, "403 FORBIDDEN", SessionCause::kUnsupported},
                {LIBD_STREAM_OPEN_FAILED, "Not Enough Bandwidth", SessionCause::kBusy},
                {LIBD_FAILED, "Service Unavailable", SessionCause::kBusy},
                {LIBD_STREAM_OPEN_FAILED, "Stream Not Found", SessionCause::kNotFound},

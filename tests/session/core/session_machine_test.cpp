@@ -202,20 +202,92 @@ TEST_F(Machine, ALinkThatIsBackIsTriedAtOnce) {
   machine_.connecting(Moment(0));
   machine_.failed(LIBD_FAILED, "No route to host", 1.0, Moment(0));
   EXPECT_FALSE(machine_.is_due(Moment(10)));
-  machine_.link_back(Moment(10));
+  EXPECT_FALSE(machine_.link_back(Moment(10)));
   EXPECT_TRUE(machine_.is_due(Moment(10)));
+}
+
+TEST_F(Machine, ALinkThatIsBackSoonAfterAnotherIsTriedASecondAfterThatOne) {
+  SessionMachine machine(true, kPatience);
+  machine.start(Moment(0));
+  Moment now(0);
+  for (int i = 0; i < 4; ++i) {  // so that the plan is long
+    machine.connecting(now);
+    machine.failed(LIBD_FAILED, "No route to host", 1.0, now);
+    now = machine.deadline();
+  }
+  now -= Moment(7000);
+  EXPECT_FALSE(machine.link_back(now));
+  machine.connecting(now);
+  machine.failed(LIBD_FAILED, "No route to host", 1.0, now);
+  EXPECT_FALSE(machine.link_back(now + Moment(400)));
+  EXPECT_EQ(machine.deadline(), now + Moment(1000));
+}
+
+TEST_F(Machine, ALinkThatIsBackDuringAnAttemptIsTriedRightAfterIt) {
+  machine_.start(Moment(0));
+  machine_.connecting(Moment(0));
+  EXPECT_FALSE(machine_.link_back(Moment(10)));
+  machine_.failed(LIBD_TIMEOUT, "", 1.0, Moment(5000));
+  EXPECT_EQ(machine_.deadline(), Moment(5100));
+  machine_.connecting(Moment(5100));
+  machine_.failed(LIBD_TIMEOUT, "", 1.0, Moment(5200));
+  EXPECT_EQ(machine_.deadline(), Moment(5200 + 2000)) << "once";
+}
+
+TEST_F(Machine, ALinkThatIsBackWhileClosingIsTriedWhenClosed) {
+  go_live(Moment(0));
+  machine_.failed(LIBD_FAILED, "Connection reset by peer", 1.0, Moment(2000));
+  EXPECT_FALSE(machine_.link_back(Moment(2010)));
+  EXPECT_FALSE(machine_.is_due(Moment(2020)));
+  machine_.closed(Moment(2030));
+  EXPECT_TRUE(machine_.is_due(Moment(2030)));
+}
+
+TEST_F(Machine, ALinkThatIsBackEndsAStallAndLeavesALiveSessionAlone) {
+  go_live(Moment(0));
+  EXPECT_FALSE(machine_.link_back(Moment(100)));
+  expect(State::kLive, Cause::kAsked);
+  EXPECT_FALSE(machine_.is_hopeless(0, Moment(5000)));
+  EXPECT_TRUE(machine_.link_back(Moment(5500)));
+  expect(State::kWaiting, Cause::kNoBytes);
+  EXPECT_FALSE(machine_.is_due(Moment(5500))) << "what is open is closed first";
+  machine_.closed(Moment(5600));
+  EXPECT_TRUE(machine_.is_due(Moment(5600)));
+}
+
+TEST_F(Machine, AStallIsReportedAsLongAsTheSilence) {
+  go_live(Moment(1000));
+  EXPECT_FALSE(machine_.is_hopeless(0, Moment(6000)));
+  EXPECT_EQ(machine_.status().why, "The camera has stopped sending, for 5 s.");
+  EXPECT_EQ(machine_.status().since, 6000);
+}
+
+TEST_F(Machine, WithoutVideoTenSecondsOfConnectionBeginTheWaitsAnew) {
+  SessionMachine alarms(false, kPatience);
+  alarms.start(Moment(0));
+  Moment now(0);
+  for (const int wait : {1000, 2000, 4000}) {
+    alarms.connecting(now);
+    alarms.opened(now);
+    EXPECT_EQ(wait_after_failure(alarms, now + Moment(9999)), Moment(wait));
+    now = alarms.deadline();
+  }
+  alarms.connecting(now);
+  alarms.opened(now);
+  EXPECT_EQ(wait_after_failure(alarms, now + Moment(10000)), Moment(1000));
 }
 
 TEST_F(Machine, AFloodOfLinksIsFollowedOnceASecond) {
   machine_.start(Moment(5000));
   int attempts = 0;
   for (Moment now(5000); now < Moment(8000); now += Moment(10)) {
-    machine_.link_back(now);
+    EXPECT_FALSE(machine_.link_back(now));
     if (!machine_.is_due(now)) continue;
     ++attempts;
     machine_.connecting(now);
     machine_.failed(LIBD_FAILED, "No route to host", 1.0, now);
   }
+  EXPECT_GE(attempts, 3);
   EXPECT_LE(attempts, 1 + 3 + 2) << "the first, one for each second, and the plan's own";
 }
 
@@ -223,7 +295,7 @@ TEST_F(Machine, ALinkThatIsBackDoesNotTryRefusedCredentials) {
   machine_.start(Moment(0));
   machine_.connecting(Moment(0));
   machine_.refused_credentials(LIBD_UNAUTHORIZED, "", Moment(60000), Moment(0));
-  machine_.link_back(Moment(10));
+  EXPECT_FALSE(machine_.link_back(Moment(10)));
   EXPECT_FALSE(machine_.is_due(Moment(59999)));
 }
 
@@ -287,7 +359,7 @@ TEST_F(Machine, NothingComesAfterStopped) {
   machine_.stop(Moment(0));
   const std::uint64_t last = machine_.status().event;
   machine_.retry(Moment(1));
-  machine_.link_back(Moment(1));
+  EXPECT_FALSE(machine_.link_back(Moment(1)));
   machine_.picture(Moment(1));
   machine_.stream_changed(Moment(1));
   machine_.stop(Moment(1));
