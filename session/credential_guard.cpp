@@ -45,22 +45,31 @@ std::shared_ptr<CredentialGuard> CredentialGuard::of(const SLibDConnectionInfo& 
 
 void CredentialGuard::add_waiter(const std::weak_ptr<CredentialWaiter>& waiter) {
   const std::lock_guard<std::mutex> lock(mutex_);
-  waiters_.erase(std::remove_if(waiters_.begin(), waiters_.end(), [](const auto& w) { return w.expired(); }),
-                 waiters_.end());
   const auto is_same = [&waiter](const auto& w) { return !w.owner_before(waiter) && !waiter.owner_before(w); };
-  if (std::none_of(waiters_.begin(), waiters_.end(), is_same)) waiters_.push_back(waiter);
+  if (std::any_of(waiters_.begin(), waiters_.end(), is_same)) return;
+  // The others keep their places, for a change that is calling them.
+  const auto gone = std::find_if(waiters_.begin(), waiters_.end(), [](const auto& w) { return w.expired(); });
+  if (gone != waiters_.end()) {
+    *gone = waiter;
+  } else {
+    waiters_.push_back(waiter);
+  }
 }
 
 template <typename Change>
 void CredentialGuard::change(const Change& change) {
-  std::vector<std::weak_ptr<CredentialWaiter>> waiters;
   {
     const std::lock_guard<std::mutex> lock(mutex_);
-    waiters = waiters_;
     if (!change()) return;
   }
-  for (const auto& waiting : waiters) {
-    if (const auto waiter = waiting.lock()) waiter->credentials_changed();
+  for (std::size_t i = 0;; ++i) {
+    std::shared_ptr<CredentialWaiter> waiter;
+    {
+      const std::lock_guard<std::mutex> lock(mutex_);
+      if (i >= waiters_.size()) return;
+      waiter = waiters_[i].lock();
+    }
+    if (waiter) waiter->credentials_changed();
   }
 }
 

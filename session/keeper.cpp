@@ -8,7 +8,7 @@
 
 #include <algorithm>
 #include <array>
-#include <cerrno>
+#include <exception>
 #include <utility>
 
 #include "session/clock.h"
@@ -76,7 +76,12 @@ bool Keeper::add(const std::shared_ptr<SessionCore>& session) {
 void Keeper::wake(std::uint64_t number) {
   {
     const std::lock_guard<std::mutex> lock(mutex_);
-    if (sessions_.count(number) == 0 || !woken_.insert(number).second) return;
+    if (sessions_.count(number) == 0) return;
+    try {
+      if (!woken_.insert(number).second) return;
+    } catch (const std::exception&) {
+      wake_failed_ = true;
+    }
   }
   const std::uint64_t one = 1;
   [[maybe_unused]] const ssize_t written = write(event_, &one, sizeof one);
@@ -118,12 +123,37 @@ int Keeper::turn(std::int32_t milliseconds, const std::function<void()>& on_link
       ready = true;
     }
   }
-  int made = serve_woken();
-  if (ready) made += serve_ready();
-  made += serve_due(monotonic_now());
-  drop_over();
+  const int made = serve_all(ready);
   arm(next_);
   return made;
+}
+
+int Keeper::serve_all(bool ready) {
+  int made = 0;
+  try {
+    made += serve_woken();
+    if (ready) made += serve_ready();
+    made += serve_due(monotonic_now());
+    drop_over();
+  } catch (const std::exception&) {
+    rest();
+  }
+  return made;
+}
+
+// Memory is short: all sessions have their turn in a moment, when there may be more.
+void Keeper::rest() {
+  constexpr Moment kRest{100};
+  all_due_ = true;
+  next_ = monotonic_now() + kRest;
+  listen(false);
+}
+
+void Keeper::listen(bool on) {
+  epoll_event event{};
+  event.events = on ? static_cast<std::uint32_t>(EPOLLIN) : 0U;
+  event.data.fd = set_.Descriptor();
+  epoll_ctl(epoll_, EPOLL_CTL_MOD, event.data.fd, &event);
 }
 
 void Keeper::run(const std::function<void()>& on_link) {
@@ -154,6 +184,10 @@ int Keeper::serve_woken() {
       if (found != sessions_.end()) sessions.push_back(found->second);
     }
     woken_.clear();
+    if (std::exchange(wake_failed_, false)) {
+      all_due_ = true;
+      next_ = Moment(0);
+    }
   }
   int made = 0;
   for (const auto& session : sessions) made += serve(*session);
@@ -162,10 +196,13 @@ int Keeper::serve_woken() {
 
 int Keeper::serve_due(Moment now) {
   if (now < next_) return 0;
+  const Kept sessions = kept();
   next_ = kNever;
+  const bool all = std::exchange(all_due_, false);
+  if (all) listen(true);
   int made = 0;
-  for (const auto& [number, session] : kept()) {
-    if (session->deadline() <= now) {
+  for (const auto& [number, session] : sessions) {
+    if (all || session->deadline() <= now) {
       made += serve(*session);
     } else {
       next_ = std::min(next_, session->deadline());
@@ -185,7 +222,9 @@ int Keeper::serve(SessionCore& session) {
 
 int Keeper::serve_ready() {
   int made = 0;
-  if (set_.Wait(ready_, 0) <= 0) return 0;
+  const int count = set_.Wait(ready_, 0);
+  if (count < 0) rest();
+  if (count <= 0) return 0;
   for (const ReadyDriver& driver : ready_) {
     const auto whose = watched_.find(driver.driver);
     std::shared_ptr<SessionCore> session;

@@ -59,6 +59,9 @@ class Keeper {
   };
 
   void arm(Moment deadline);
+  int serve_all(bool ready);
+  void rest();
+  void listen(bool on);
   int serve_woken();
   int serve_due(Moment now);
   int serve_ready();
@@ -78,6 +81,7 @@ class Keeper {
   Kept sessions_;
   std::set<std::uint64_t> woken_;
   bool over_ = false;
+  bool wake_failed_ = false;  ///< some number is missing in woken_
 
   // Of the thread that runs turns.
   std::map<CVexaCommon*, std::uint64_t> watched_;  ///< drivers in the set, and whose they are
@@ -86,6 +90,7 @@ class Keeper {
   std::map<std::uint64_t, std::shared_ptr<Session>> handles_;
   Moment next_ = kNever;   ///< no session has an earlier deadline
   Moment armed_ = kNever;  ///< what the timer is set to
+  bool all_due_ = false;   ///< memory was short, so that any session may have been passed over
   std::vector<ReadyDriver> ready_;
 };
 

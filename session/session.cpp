@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "vexa/session.h"
 
+#include <exception>
 #include <utility>
 
 #include "session/session_core.h"
@@ -20,7 +21,11 @@ bool Session::WaitStopped(std::int32_t milliseconds) { return core_->wait_stoppe
 void Session::Retry() { core_->retry(); }
 
 void Session::SetCredentials(const std::string& userName, const std::string& password) {
-  core_->set_credentials(userName, password);
+  try {
+    core_->set_credentials(userName, password);
+  } catch (const std::exception&) {
+    // Memory is short: the former ones stay.
+  }
 }
 
 const std::string& Session::Name() const { return core_->name(); }

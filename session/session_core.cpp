@@ -3,13 +3,13 @@
 
 #include <algorithm>
 #include <chrono>
+#include <exception>
 #include <iterator>
 #include <utility>
 
 #include "session/clock.h"
 #include "session/core/failure_cause.h"
 #include "session/keeper.h"
-#include "vexa/failure.h"
 #include "vexa/frame_facts.h"
 #include "vexa/statistics.h"
 #include "vexa/waiting.h"
@@ -43,6 +43,26 @@ bool is_key(std::int32_t type) {
 
 // The enumeration has ten for each codec.
 std::int32_t codec_of(std::int32_t frame_type) { return frame_type / 10; }
+
+// Whether the call has done it, which it has not when memory is short.
+template <typename Call>
+bool within_memory(const Call& call) {
+  try {
+    return call();
+  } catch (const std::exception&) {
+    return false;
+  }
+}
+
+// An operation on the line; it has failed when memory is short.
+template <typename Call>
+std::optional<LineFailure> attempt(const Call& call) {
+  try {
+    return call();
+  } catch (const std::exception&) {
+    return LineFailure{LIBD_FAILED, "out of memory", false};
+  }
+}
 
 bool may_send(const CredentialTicket& ticket) {
   return ticket.answer == CredentialBreaker::Answer::kGo || ticket.answer == CredentialBreaker::Answer::kTry;
@@ -168,7 +188,7 @@ void SessionCore::report(const CredentialTrial& trial, const std::optional<LineF
 
 // A camera may take the credentials for its settings and refuse them for its streams: all of it counts as one.
 void SessionCore::run_open(const CredentialTrial& trial, const std::string& user, const std::string& password) {
-  Opened opened{line_.open(user, password, *this), trial};
+  Opened opened{attempt([&] { return line_.open(user, password, *this); }), trial};
   report(trial, opened.failure);
   {
     const std::lock_guard<std::mutex> lock(mutex_);
@@ -179,7 +199,7 @@ void SessionCore::run_open(const CredentialTrial& trial, const std::string& user
 }
 
 void SessionCore::run_side(std::uint32_t stream, const CredentialTrial& trial) {
-  Opened opened{line_.start(stream), trial};
+  Opened opened{attempt([&] { return line_.start(stream); }), trial};
   report(trial, opened.failure);
   {
     const std::lock_guard<std::mutex> lock(mutex_);
@@ -189,7 +209,7 @@ void SessionCore::run_side(std::uint32_t stream, const CredentialTrial& trial) {
 }
 
 void SessionCore::run_probe(const CredentialTrial& trial) {
-  const std::optional<LineFailure> failure = line_.ask();
+  const std::optional<LineFailure> failure = attempt([&] { return line_.ask(); });
   report(trial, failure);
   const bool answered = !failure || is_refusal(cause_of(failure->code, failure->text));
   {
@@ -293,7 +313,6 @@ void SessionCore::after_open(const Opened& opened, Moment now) {
     lost_ = 0;
     side_due_ = kNever;
     side_since_ = now;
-    was_broken_ = is_broken();
     machine_.opened(now);
     if (machine_.is_stopping()) end_line();
     return;
@@ -336,8 +355,11 @@ void SessionCore::begin_attempt(Moment now) {
   job_ = true;
   trial_ = {judge, ticket.generation};
   auto self = shared_from_this();
-  const auto open = [self, trial = trial_, user, password = ticket.password] { self->run_open(trial, user, password); };
-  if (parts_.connectors.post(open)) return;
+  const bool posted = within_memory([&] {
+    return parts_.connectors.post(
+        [self, trial = trial_, user, password = ticket.password] { self->run_open(trial, user, password); });
+  });
+  if (posted) return;
   job_ = false;
   judge->abandoned(ticket.generation);
   parts_.turns.leave(number_);
@@ -350,7 +372,7 @@ void SessionCore::begin_close() {
   job_ = true;
   running_ = false;
   auto self = shared_from_this();
-  if (!parts_.closers.post([self] { self->run_close(); })) run_close();
+  if (!within_memory([&] { return parts_.closers.post([self] { self->run_close(); }); })) run_close();
 }
 
 // The driver sends the credentials that it was opened with: what has been replaced since is not sent again.
@@ -362,7 +384,7 @@ void SessionCore::begin_side(Moment now) {
   const CredentialTicket ticket = trial_.judge->ask(now);
   if (!may_send(ticket)) return;
   const CredentialTrial trial{trial_.judge, ticket.generation};
-  side_job_ = post_side([self, stream, trial] { self->run_side(stream, trial); });
+  side_job_ = within_memory([&] { return post_side([self, stream, trial] { self->run_side(stream, trial); }); });
   if (!side_job_) trial.judge->abandoned(trial.generation);
 }
 
@@ -384,7 +406,7 @@ void SessionCore::begin_probe(Moment now) {
   if (ticket.answer != CredentialBreaker::Answer::kTry) return;
   auto self = shared_from_this();
   const CredentialTrial trial{trial_.judge, ticket.generation};
-  side_job_ = post_side([self, trial] { self->run_probe(trial); });
+  side_job_ = within_memory([&] { return post_side([self, trial] { self->run_probe(trial); }); });
   if (!side_job_) trial.judge->abandoned(trial.generation);
 }
 
@@ -406,22 +428,7 @@ int SessionCore::watch_silence(Moment now) {
   return made;
 }
 
-// The stream's thread meets the end of its connection, of which polls report silence alone.
-bool SessionCore::is_broken() const {
-  const FailureReport latest = LastFailure(*line_.driver());
-  return latest.operation == "StreamingThread" && latest.code == LIBD_FAILED && !latest.cancelled;
-}
-
-bool SessionCore::lose_if_broken(Moment now) {
-  const bool broken = is_broken();
-  was_broken_ = was_broken_ && broken;
-  if (!broken || was_broken_) return false;
-  lose(kVideoStream, LIBD_FAILED, now);
-  return true;
-}
-
 void SessionCore::judge_silence(Moment now) {
-  if (lose_if_broken(now)) return;
   read_evidence(now);
   machine_.evidence(evidence_);
   if (machine_.is_hopeless(chance(), now)) {
@@ -451,7 +458,11 @@ int SessionCore::publish() {
     }
     {
       const std::lock_guard<std::mutex> lock(mutex_);
-      status_ = *event;
+      if (!within_memory([&] { return status_ = *event, true; })) {
+        event->text.clear();
+        event->why.clear();
+        status_ = *event;
+      }
     }
     if (callbacks_.state && shown) made += call([&] { callbacks_.state(*handle(), *event); });
     if (!last) continue;
@@ -485,10 +496,9 @@ int SessionCore::take_video() {
     FrameFacts facts;
     picture_.clear();
     const ELibDReturnCode result = GetCurrentVideoFrame(*line_.driver(), frame, facts);
-    if (result == LIBD_NO_FRAME) break;
-    const Moment now = monotonic_now();  // callbacks may have taken long
     // Silence is the machine's to judge.
-    if (result == LIBD_TIMEOUT && !lose_if_broken(now)) break;
+    if (result == LIBD_NO_FRAME || result == LIBD_TIMEOUT) break;
+    const Moment now = monotonic_now();  // callbacks may have taken long
     if (result != LIBD_OK) {
       lose(kVideoStream, result, now);
       break;

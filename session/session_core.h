@@ -90,8 +90,6 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   void read_evidence(Moment now);
   int watch_silence(Moment now);
   void judge_silence(Moment now);
-  [[nodiscard]] bool is_broken() const;
-  [[nodiscard]] bool lose_if_broken(Moment now);
   int publish();
 
   int take_video();
@@ -154,7 +152,6 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   Moment side_due_ = kNever;
   MediaEvidence evidence_;
   bool asked_ = false;          ///< for an answer, since the latest picture
-  bool was_broken_ = false;     ///< the driver's latest failure is one of a connection before
   std::uint64_t pictures_ = 0;  ///< taken
   std::uint64_t unshown_ = 0;   ///< events that the host did not get since it asked for the end
   std::vector<unsigned char> picture_;

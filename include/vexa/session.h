@@ -130,7 +130,8 @@ class VEXA_API Session {
   /// process sends them again, one that is opened later included.
   void Retry();
   /// For the attempts from now on, also by other sessions of the same camera and user. What runs goes on; a stream
-  /// beside its video that is lost meanwhile is started again with the next connection.
+  /// beside its video that is lost meanwhile is started again with the next connection. When memory is short the former
+  /// ones stay.
   void SetCredentials(const std::string& userName, const std::string& password);
   /// As in the options, or the camera's address.
   const std::string& Name() const;

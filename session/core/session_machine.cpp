@@ -2,6 +2,7 @@
 #include "session/core/session_machine.h"
 
 #include <algorithm>
+#include <exception>
 #include <utility>
 
 #include "session/core/failure_cause.h"
@@ -179,12 +180,16 @@ void SessionMachine::enter_failed(SessionState state, SessionCause cause, ELibDR
   status.state = state;
   status.cause = cause;
   status.code = code;
-  status.text = text;
   status.attempt = attempt_;
   status.nextAttempt = due_ == kNever ? 0 : due_.count();
   // A stall is reported as long as the silence is.
   status.since = (state == SessionState::kStalled ? last_sign() : now).count();
-  status.why = why_not_live(status, now);
+  try {
+    status.text = text;
+    status.why = why_not_live(status, now);
+  } catch (const std::exception&) {
+    // Memory is short: the state counts, not its words.
+  }
   status.since = now.count();
   events_.put(std::move(status));
 }

@@ -152,6 +152,13 @@ class SessionWithCamera : public testing::Test {
     options.giveUpMilliseconds = 2000;
     return options;
   }
+  /// For tests that no stall may disturb on a loaded machine.
+  [[nodiscard]] SessionOptions patient_options() const {
+    SessionOptions patient = options();
+    patient.stallMilliseconds = 30000;
+    patient.giveUpMilliseconds = 60000;
+    return patient;
+  }
 
  private:
   std::unique_ptr<camera::VirtualCamera> camera_;

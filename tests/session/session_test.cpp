@@ -23,7 +23,7 @@ TEST_F(SessionWithCamera, GoesLiveWithTheFirstWholePicture) {
   start_camera();
   SessionHost host;
   SessionGroup group;
-  const auto session = group.Open(options(), host.callbacks());
+  const auto session = group.Open(patient_options(), host.callbacks());
   ASSERT_TRUE(session);
   ASSERT_TRUE(host.wait_for_frames(25));
   const auto states = host.states();
@@ -254,7 +254,7 @@ TEST_F(SessionWithCamera, AStreamThatBeginsAnewWithinAConnectionIsReported) {
   start_camera(camera_options);
   SessionHost host;
   SessionGroup group;
-  ASSERT_TRUE(group.Open(options(), host.callbacks()));
+  ASSERT_TRUE(group.Open(patient_options(), host.callbacks()));
   ASSERT_TRUE(host.wait_for_state(SessionState::kLive, SessionCause::kStreamChanged));
   EXPECT_EQ(host.states().size(), 3U);
 }
@@ -387,7 +387,7 @@ TEST_F(SessionWithCamera, EveryCallIsAllowedInACallbackAndReturnsAtOnce) {
   SessionHost other;
   std::atomic<int> wrong{0};
   std::atomic<bool> done{false};
-  const SessionOptions more = options();
+  const SessionOptions more = patient_options();
   SessionGroup group;
   host.on_frame = [&](Session& session, const SessionFrame&) {
     if (done.exchange(true)) return;
@@ -400,7 +400,7 @@ TEST_F(SessionWithCamera, EveryCallIsAllowedInACallbackAndReturnsAtOnce) {
     if (group.Process(-1) != 0) ++wrong;
     if (!group.Open(more, other.callbacks())) ++wrong;
   };
-  const auto session = group.Open(options(), host.callbacks());
+  const auto session = group.Open(patient_options(), host.callbacks());
   EXPECT_TRUE(other.wait_for_live());
   EXPECT_TRUE(host.wait_for_frames(5));
   EXPECT_EQ(wrong, 0);
@@ -414,7 +414,7 @@ TEST_F(SessionWithCamera, AnExceptionOfACallbackEndsThereAndIsCounted) {
     if (thrown++ < 2) throw std::runtime_error("the host's own");
   };
   SessionGroup group;
-  const auto session = group.Open(options(), host.callbacks());
+  const auto session = group.Open(patient_options(), host.callbacks());
   ASSERT_TRUE(host.wait_for_frames(5));
   EXPECT_EQ(group.Metrics().exceptions, 2U);
   EXPECT_EQ(session->Status().state, SessionState::kLive);
