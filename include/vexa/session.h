@@ -32,7 +32,7 @@
 //
 // Credentials are known by the camera's address, its port and the user name, for the whole process: of two sessions
 // with different passwords for the same, the latest password is that of both. What runs keeps its credentials, and its
-// keep-alives send them on; connections made anew, and streams beside video, do not send what was replaced or refused.
+// keep-alives send them on; connections made anew do not send what was replaced or refused.
 //
 // Alarms, metadata and audio are polled on the thread that calls the host: a camera that sends the beginning of a part
 // and not the rest delays the other cameras of that thread, up to its time-out. Hosts with such cameras give a group
