@@ -4,7 +4,6 @@
 #include <utility>
 #include <vector>
 
-#include "host/base/file_extension.h"
 #include "host/picture/picture_decoder.h"
 #include "host/recording/frame_file.h"
 
@@ -23,12 +22,6 @@ extern "C" {
 #endif
 
 namespace vexa::host {
-
-std::optional<ContainerFormat> container_format_of(std::string_view file) {
-  if (has_extension(file, ".mkv")) return ContainerFormat::kMatroska;
-  if (has_extension(file, ".mp4")) return ContainerFormat::kMp4;
-  return std::nullopt;
-}
 
 #ifndef VEXA_WITH_FFMPEG
 

@@ -14,9 +14,6 @@ namespace vexa::host {
 
 enum class ContainerFormat { kMatroska, kMp4 };
 
-// By the end of a file's name: ".mkv" or ".mp4", in capitals too.
-[[nodiscard]] std::optional<ContainerFormat> container_format_of(std::string_view file);
-
 // The file is opened with the first picture, whose codec is that of the video. Times count from that picture, to the
 // millisecond in Matroska and to 1/90000 s in MP4; two pictures never have the same. Every second of video is written
 // whole, so that what a program leaves that is killed plays up to its last second; MP4 is fragmented for that. A file

@@ -66,16 +66,16 @@ std::optional<Codec> RecordingTarget::codec() const {
   return format != nullptr ? format->codec : std::nullopt;
 }
 
-std::unique_ptr<PictureTarget> RecordingTarget::open() const {
-  constexpr char kStandardOutput[] = "standard output";
+std::optional<ContainerFormat> RecordingTarget::container() const {
   const Format* format = find_format(out_, format_);
-  const bool contained = format != nullptr && format->container;
-  if (contained && is_standard_output()) {
-    return std::make_unique<MediaContainer>(kStandardOutput, *format->container, standard_output_);
-  }
-  if (contained) return std::make_unique<MediaContainer>(out_, *format->container);
-  if (is_standard_output()) return std::make_unique<FrameFile>(kStandardOutput, standard_output_);
-  return std::make_unique<FrameFile>(out_);
+  return format != nullptr ? format->container : std::nullopt;
+}
+
+std::unique_ptr<PictureTarget> RecordingTarget::open() const {
+  const std::string name = is_standard_output() ? "standard output" : out_;
+  const int open_fd = is_standard_output() ? standard_output_ : -1;
+  if (const auto format = container()) return std::make_unique<MediaContainer>(name, *format, open_fd);
+  return std::make_unique<FrameFile>(name, open_fd);
 }
 
 std::string usual_extension(Codec codec) {

@@ -7,6 +7,7 @@
 #include <optional>
 #include <string>
 
+#include "host/recording/media_container.h"
 #include "host/recording/picture_target.h"
 
 namespace vexa::host {
@@ -25,6 +26,8 @@ class RecordingTarget {
   [[nodiscard]] std::optional<Problem> check() const;
   // The codec that the format implies; nullopt when any can go there.
   [[nodiscard]] std::optional<Codec> codec() const;
+  // The container that the format is, if it is one; names end in ".mkv" or ".mp4" in capitals too.
+  [[nodiscard]] std::optional<ContainerFormat> container() const;
   // Of a target that has been checked.
   [[nodiscard]] std::unique_ptr<PictureTarget> open() const;
 

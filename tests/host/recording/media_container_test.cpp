@@ -8,6 +8,7 @@
 #include <fstream>
 #include <vector>
 
+#include "host/recording/recording_target.h"
 #include "tests/support/temporary_folder.h"
 #include "virtual_camera/codec/image_clip.h"
 
@@ -16,12 +17,6 @@ namespace {
 
 using std::chrono::microseconds;
 using vexa_test::TemporaryFolder;
-
-TEST(MediaContainer, FormatGoesByTheEndOfTheName) {
-  EXPECT_EQ(container_format_of("a.mkv"), ContainerFormat::kMatroska);
-  EXPECT_EQ(container_format_of("a.MP4"), ContainerFormat::kMp4);
-  for (const char* other : {"a.h264", "mkv", ".mkv", "-", ""}) EXPECT_EQ(container_format_of(other), std::nullopt);
-}
 
 #ifdef VEXA_WITH_FFMPEG
 
@@ -99,7 +94,7 @@ TEST_P(MediaContainerOf, HoldsEveryPictureWithItsTime) {
   }
   for (const char* name : {"a.mkv", "a.mp4"}) {
     const std::string path = folder_ / name;
-    write(path, *container_format_of(name), times);
+    write(path, *RecordingTarget(name, -1).container(), times);
     EXPECT_EQ(times_in(path), wanted) << name;
     const auto decoded = decoded_pictures("-i " + path);
     EXPECT_EQ(decoded.size(), kPictures) << name;
@@ -111,7 +106,7 @@ TEST_P(MediaContainerOf, HoldsEveryPictureWithItsTime) {
 TEST_P(MediaContainerOf, StatesTheSizeAndKeepsTheHeadersOfTheFirstPicture) {
   for (const char* name : {"a.mkv", "a.mp4"}) {
     const std::string path = folder_ / name;
-    write(path, *container_format_of(name), {microseconds(0), microseconds(40000)});
+    write(path, *RecordingTarget(name, -1).container(), {microseconds(0), microseconds(40000)});
     EXPECT_EQ(lines_of("ffprobe -v warning -show_entries stream=width,height -of csv=p=0 " + path),
               std::vector<std::string>{"320,240"});
     // A player reads them without a picture: before the first, and after a jump to any other.
