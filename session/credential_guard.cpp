@@ -95,20 +95,21 @@ CredentialTicket CredentialGuard::ask(Moment now) {
   return ticket;
 }
 
-void CredentialGuard::accepted(std::uint64_t generation) {
+template <typename Verdict>
+void CredentialGuard::judge(std::uint64_t generation, const Verdict& verdict) {
   change([&] {
     if (generation != generation_) return false;
-    breaker_.accepted();
+    verdict();
     return true;
   });
 }
 
+void CredentialGuard::accepted(std::uint64_t generation) {
+  judge(generation, [this] { breaker_.accepted(); });
+}
+
 void CredentialGuard::refused(std::uint64_t generation, Moment now) {
-  change([&] {
-    if (generation != generation_) return false;
-    breaker_.refused(now);
-    return true;
-  });
+  judge(generation, [&] { breaker_.refused(now); });
 }
 
 void CredentialGuard::doubt() {
@@ -117,11 +118,7 @@ void CredentialGuard::doubt() {
 }
 
 void CredentialGuard::abandoned(std::uint64_t generation) {
-  change([&] {
-    if (generation != generation_) return false;
-    breaker_.abandoned();
-    return true;
-  });
+  judge(generation, [this] { breaker_.abandoned(); });
 }
 
 void CredentialGuard::retry() {

@@ -56,6 +56,9 @@ class CredentialGuard {
  private:
   template <typename Change>
   void change(const Change& change);
+  /// Takes what came of a request of this generation.
+  template <typename Verdict>
+  void judge(std::uint64_t generation, const Verdict& verdict);
 
   mutable std::mutex mutex_;
   CredentialBreaker breaker_;

@@ -214,10 +214,14 @@ int Keeper::serve_due(Moment now) {
 int Keeper::serve(SessionCore& session) {
   handles_.try_emplace(session.number(), session.handle());
   const int made = session.turn(monotonic_now());
+  plan(session);
+  return made;
+}
+
+void Keeper::plan(SessionCore& session) {
   watch(session);
   if (session.is_over()) gone_.push_back(session.number());
   next_ = std::min(next_, session.deadline());
-  return made;
 }
 
 int Keeper::serve_ready() {
@@ -235,9 +239,7 @@ int Keeper::serve_ready() {
     }
     if (!session || session->running() != driver.driver) continue;
     made += session->take(driver.streams, monotonic_now());
-    watch(*session);
-    if (session->is_over()) gone_.push_back(session->number());
-    next_ = std::min(next_, session->deadline());
+    plan(*session);
   }
   return made;
 }

@@ -66,6 +66,8 @@ class Keeper {
   int serve_due(Moment now);
   int serve_ready();
   int serve(SessionCore& session);
+  /// What a session that has had its turn waits for.
+  void plan(SessionCore& session);
   void watch(SessionCore& session);
   void drop_over();
   [[nodiscard]] Kept kept() const;

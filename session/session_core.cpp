@@ -375,6 +375,18 @@ void SessionCore::begin_close() {
   if (!within_memory([&] { return parts_.closers.post([self] { self->run_close(); }); })) run_close();
 }
 
+// Whichever of its thread and the keeper marks it first decides whether the job is done.
+template <typename Job>
+void SessionCore::begin_side_job(const CredentialTrial& trial, const Job& job) {
+  side_job_ = within_memory([&] {
+    side_begun_ = std::make_shared<std::atomic<bool>>(false);
+    return parts_.sides.post([begun = side_begun_, job] {
+      if (!begun->exchange(true)) job();
+    });
+  });
+  if (!side_job_) trial.judge->abandoned(trial.generation);
+}
+
 // The driver sends the credentials that it was opened with: what has been replaced since is not sent again.
 void SessionCore::begin_side(Moment now) {
   const std::uint32_t stream = lost_ & (~lost_ + 1);  // the lowest
@@ -384,16 +396,7 @@ void SessionCore::begin_side(Moment now) {
   const CredentialTicket ticket = trial_.judge->ask(now);
   if (!may_send(ticket)) return;
   const CredentialTrial trial{trial_.judge, ticket.generation};
-  side_job_ = within_memory([&] { return post_side([self, stream, trial] { self->run_side(stream, trial); }); });
-  if (!side_job_) trial.judge->abandoned(trial.generation);
-}
-
-// Whichever of its thread and the keeper marks it first decides whether the job is done.
-bool SessionCore::post_side(const std::function<void()>& job) {
-  side_begun_ = std::make_shared<std::atomic<bool>>(false);
-  return parts_.sides.post([begun = side_begun_, job] {
-    if (!begun->exchange(true)) job();
-  });
+  begin_side_job(trial, [self, stream, trial] { self->run_side(stream, trial); });
 }
 
 // Whether the camera answers while it sends nothing; once a silence. It may have been set up anew meanwhile, so that of
@@ -406,8 +409,7 @@ void SessionCore::begin_probe(Moment now) {
   if (ticket.answer != CredentialBreaker::Answer::kTry) return;
   auto self = shared_from_this();
   const CredentialTrial trial{trial_.judge, ticket.generation};
-  side_job_ = within_memory([&] { return post_side([self, trial] { self->run_probe(trial); }); });
-  if (!side_job_) trial.judge->abandoned(trial.generation);
+  begin_side_job(trial, [self, trial] { self->run_probe(trial); });
 }
 
 void SessionCore::read_evidence(Moment now) {

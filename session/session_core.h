@@ -84,7 +84,8 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   [[nodiscard]] bool waits_for_turn() const;
   void end_line();
   void begin_close();
-  [[nodiscard]] bool post_side(const std::function<void()>& job);
+  template <typename Job>
+  void begin_side_job(const CredentialTrial& trial, const Job& job);
   void begin_side(Moment now);
   void begin_probe(Moment now);
   void read_evidence(Moment now);

@@ -178,33 +178,35 @@ TEST_F(SessionWithCamera, CredentialsThatOnlyStreamsRefuseStopWithTheFirstRefusa
   EXPECT_EQ(host.states().back().nextAttempt, 0);
 }
 
-// The camera holds back its refusal of the former password until the right one has been set.
-TEST_F(SessionWithCamera, APasswordThatIsSetDuringAnAttemptIsTriedAfterIt) {
-  start_camera();
-  camera().add_request_fault(RequestFault::slow("inq=system", std::chrono::milliseconds(300)));
+// The camera holds back its refusal of the former credentials until the right ones have been set.
+class SessionWithASlowRefusal : public SessionWithCamera {
+ protected:
+  void SetUp() override {
+    start_camera();
+    camera().add_request_fault(RequestFault::slow("inq=system", std::chrono::milliseconds(300)));
+  }
+
+  static void expect_live_after_other_credentials(const SessionOptions& wrong) {
+    SessionHost host;
+    host.on_state = [](Session& session, const SessionStatus& status) {
+      if (status.state == SessionState::kConnecting) session.SetCredentials("operator", "tr0ub4dor");
+    };
+    SessionGroup group;
+    ASSERT_TRUE(group.Open(wrong, host.callbacks()));
+    EXPECT_TRUE(host.wait_for_live());
+  }
+};
+
+TEST_F(SessionWithASlowRefusal, APasswordThatIsSetDuringAnAttemptIsTriedAfterIt) {
   SessionOptions wrong = options();
   wrong.connection.password = "wrong";
-  SessionHost host;
-  host.on_state = [](Session& session, const SessionStatus& status) {
-    if (status.state == SessionState::kConnecting) session.SetCredentials("operator", "tr0ub4dor");
-  };
-  SessionGroup group;
-  ASSERT_TRUE(group.Open(wrong, host.callbacks()));
-  EXPECT_TRUE(host.wait_for_live());
+  expect_live_after_other_credentials(wrong);
 }
 
-TEST_F(SessionWithCamera, AnotherUserThatIsSetDuringAnAttemptIsTriedAfterIt) {
-  start_camera();
-  camera().add_request_fault(RequestFault::slow("inq=system", std::chrono::milliseconds(300)));
+TEST_F(SessionWithASlowRefusal, AnotherUserThatIsSetDuringAnAttemptIsTriedAfterIt) {
   SessionOptions wrong = options();
   wrong.connection.userName = "nobody";
-  SessionHost host;
-  host.on_state = [](Session& session, const SessionStatus& status) {
-    if (status.state == SessionState::kConnecting) session.SetCredentials("operator", "tr0ub4dor");
-  };
-  SessionGroup group;
-  ASSERT_TRUE(group.Open(wrong, host.callbacks()));
-  EXPECT_TRUE(host.wait_for_live());
+  expect_live_after_other_credentials(wrong);
 }
 
 TEST_F(SessionWithCamera, WhatTheCameraRefusesIsNamed) {
