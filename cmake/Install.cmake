@@ -2,7 +2,6 @@
 # What a host developer gets: headers, the libraries, a CMake package, pkg-config files, the licence and the documents.
 include(CMakePackageConfigHelpers)
 
-set_target_properties(VexaCommon VexaCommonFilter PROPERTIES INSTALL_RPATH "$ORIGIN")
 install(TARGETS VexaCommon VexaCommonFilter EXPORT VexaCommonTargets
   LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
 install(DIRECTORY ${PROJECT_SOURCE_DIR}/include/vexa DESTINATION ${CMAKE_INSTALL_INCLUDEDIR} FILES_MATCHING PATTERN "*.h")
