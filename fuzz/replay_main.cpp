@@ -16,6 +16,10 @@
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size);
 
+// libFuzzer's, for the mutators of targets, which are not called here.
+extern "C" std::size_t LLVMFuzzerMutate(std::uint8_t* data, std::size_t size, std::size_t most);
+extern "C" std::size_t LLVMFuzzerMutate(std::uint8_t*, std::size_t size, std::size_t) { return size; }
+
 namespace {
 
 // Cutting a file at every length costs the square of its size; longer files are cut at this many lengths.
