@@ -17,6 +17,8 @@ TEST(FailureCause, GoesByTheCodeAndThePhraseOfTheCamera) {
   } cases[] = {{LIBD_UNAUTHORIZED, "", SessionCause::kCredentials},
                {LIBD_STREAM_OPEN_FAILED, "Unauthorized", SessionCause::kCredentials},
                {LIBD_FAILED, "403 FORBIDDEN", SessionCause::kUnsupported},
+               {LIBD_FAILED, "401 UNAUTHORIZED", SessionCause::kCredentials},
+               {LIBD_FAILED, "AUTHORIZED", SessionCause::kFailed},
                {LIBD_STREAM_OPEN_FAILED, "Not Enough Bandwidth", SessionCause::kBusy},
                {LIBD_FAILED, "Service Unavailable", SessionCause::kBusy},
                {LIBD_STREAM_OPEN_FAILED, "Stream Not Found", SessionCause::kNotFound},
@@ -53,6 +55,9 @@ TEST(WhyNotLive, NamesCauseReasonAndWhatComesNext) {
   status.nextAttempt = 13001;
   EXPECT_EQ(why_not_live(status, Moment(10000)),
             "No answer from the camera (Connection refused); the next attempt is in 4 s.");
+  status.nextAttempt = 13000;
+  EXPECT_EQ(why_not_live(status, Moment(10000)),
+            "No answer from the camera (Connection refused); the next attempt is in 3 s.");
   status.state = SessionState::kRefused;
   status.cause = SessionCause::kCredentials;
   status.text = "Unauthorized\r\nX: y";

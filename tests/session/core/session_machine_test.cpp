@@ -345,6 +345,42 @@ TEST_F(Machine, CredentialsThatChangeAreLookedAtAgain) {
   EXPECT_FALSE(machine_.is_due(Moment(1000000)));
 }
 
+TEST_F(Machine, CredentialsThatChangeShortenNoOtherWait) {
+  machine_.start(Moment(0));
+  machine_.connecting(Moment(0));
+  machine_.failed(LIBD_FAILED, "Connection refused", 1.0, Moment(0));
+  machine_.credentials_changed(Moment(10));
+  EXPECT_FALSE(machine_.is_due(Moment(10)));
+  EXPECT_TRUE(machine_.is_due(Moment(1000)));
+}
+
+TEST_F(Machine, ARetryDuringAnAttemptLeavesTheWaitsAsTheyWere) {
+  machine_.start(Moment(0));
+  machine_.connecting(Moment(0));
+  machine_.failed(LIBD_FAILED, "", 1.0, Moment(0));
+  machine_.connecting(Moment(1000));
+  machine_.retry(Moment(1100));
+  machine_.failed(LIBD_FAILED, "", 1.0, Moment(1200));
+  EXPECT_EQ(machine_.status().nextAttempt, 3200);
+}
+
+TEST_F(Machine, AStallIsOneEventHoweverOftenItIsLookedAt) {
+  go_live(Moment(0));
+  EXPECT_FALSE(machine_.is_hopeless(0, kPatience.stall));
+  const std::uint64_t stalled = machine_.status().event;
+  EXPECT_FALSE(machine_.is_hopeless(0, kPatience.stall + Moment(1)));
+  EXPECT_EQ(machine_.status().event, stalled);
+}
+
+TEST_F(Machine, AFailureWhileStoppingWaitsForTheClose) {
+  go_live(Moment(0));
+  machine_.stop(Moment(5));
+  machine_.failed(LIBD_FAILED, "", 0, Moment(10));
+  EXPECT_FALSE(machine_.is_over());
+  machine_.closed(Moment(20));
+  EXPECT_TRUE(machine_.is_over());
+}
+
 TEST_F(Machine, AnAttemptThatFailsWhileStoppingStops) {
   machine_.start(Moment(0));
   machine_.connecting(Moment(0));
