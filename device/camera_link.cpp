@@ -26,7 +26,7 @@ RaisedTimeout::~RaisedTimeout() {
   timeout_ = restored_;
 }
 
-SLibDConnectionInfo Connection::copy() {
+PrivateConnection Connection::copy() {
   const Guard guard(lock_);
   return info_;
 }

@@ -40,7 +40,7 @@ class Connection {
   Connection(SLibDConnectionInfo& info, int& saved_timeout, CSimpleLock& lock)
       : lock_(lock), info_(info), saved_timeout_(saved_timeout) {}
 
-  SLibDConnectionInfo copy();
+  PrivateConnection copy();
   int timeout();
   /// Writes "HOST:PORT", cut where it does not fit.
   void write_name(std::span<char> room);

@@ -5,6 +5,7 @@
 
 #include "device/driver_state.h"
 #include "runtime/base/sync.h"
+#include "runtime/base/wipe.h"
 
 ELibDReturnCode CVexaCommon::GetCurrentConnectionInfo(SLibDConnectionInfo& info) {
   vexa::Operation operation(*m_State, __func__);
@@ -17,9 +18,10 @@ ELibDReturnCode CVexaCommon::GetCurrentConnectionInfo(SLibDConnectionInfo& info)
 ELibDReturnCode CVexaCommon::SetCurrentConnectionInfo(SLibDConnectionInfo& info) {
   vexa::Operation operation(*m_State, __func__);
   return m_State->errors.run([&]() -> vexa::Outcome {
-    SLibDConnectionInfo stored = info;
+    vexa::PrivateConnection stored = info;
     const vexa::Guard guard(m_ConnectionLock);
     m_SavedTimeout = stored.timeout;
+    vexa::wipe(m_ConnectionInfo.password);
     m_ConnectionInfo = std::move(stored);
     // A log that cannot be opened is no failure.
     // Kept: the log is opened on every call, also while logging is off; hosts look for its file.

@@ -6,6 +6,7 @@
 #include "device/driver_state.h"
 #include "runtime/base/result.h"
 #include "runtime/base/text.h"
+#include "runtime/base/wipe.h"
 #include "vexa/trace.h"
 
 namespace vexa {
@@ -19,7 +20,9 @@ void RequestEcho::write(const std::string& line, const char* credentials) {
   if (receiver == nullptr) {
     std::puts(line.c_str());
   } else {
-    (*receiver)(masked(line, credentials).c_str());
+    std::string shown = masked(line, credentials);
+    const WipedAtEnd wiped(shown);  // what was masked may stand after its end
+    (*receiver)(shown.c_str());
   }
 }
 

@@ -39,7 +39,7 @@ Failure DriverState::count_rtsp(std::uint64_t requests, const Failure& failure) 
 // Kept: the media socket stays open when the open fails after it; its caller sees by it how far the open came.
 Result<int> DriverState::open_rtp_over_udp(const std::string& url, int port) {
   errors.clear();
-  const SLibDConnectionInfo info = connection.copy();
+  const PrivateConnection info = connection.copy();
   const WaitLimit waits = limit(info.timeout);
   RtspSession session = this->session();
   auto server = session.begin(info.host, port, waits);
@@ -66,7 +66,7 @@ Result<int> DriverState::open_rtp_over_udp(const std::string& url, int port) {
 
 Result<int> DriverState::open_rtp_over_tcp(const std::string& url, int port) {
   errors.clear();
-  const SLibDConnectionInfo info = connection.copy();
+  const PrivateConnection info = connection.copy();
   const WaitLimit waits = limit(info.timeout);
   RtspSession session = this->session();
   auto server = session.begin(info.host, port, waits);

@@ -4,6 +4,7 @@
 
 #include "device/driver_state.h"
 #include "runtime/base/result.h"
+#include "runtime/base/wipe.h"
 #include "vexa/runtime.h"
 
 namespace {
@@ -44,6 +45,10 @@ CVexaCommon::~CVexaCommon() {
   m_State->release_stream_buffer();
   m_State->clear_frame_queue();  // a model class may have queued frames without a stream
   CloseHandle(m_StopVideoEvent);
+  // Safe: credentials do not stay in memory that is given back.
+  const vexa::Guard guard(m_ConnectionLock);
+  vexa::wipe(m_ConnectionInfo.password);
+  vexa::wipe(m_BasicCredentials, sizeof m_BasicCredentials);
 }
 
 // Running out of memory is not recorded here: it would replace the text that was asked for.

@@ -5,8 +5,8 @@
 
 #include <vector>
 
-#include "runtime/base/base64.h"
 #include "runtime/base/text.h"
+#include "runtime/base/wipe.h"
 #include "transport/failure.h"
 #include "transport/http_receive.h"
 #include "transport/tcp_connect.h"
@@ -26,7 +26,8 @@ constexpr int kStatusUnauthorized = 401;
 // Safe: a camera that sends the credentials back in its reason phrase does not put them into the log.
 std::string loggable(const std::string& reason, const SLibDConnectionInfo& info) {
   if (info.password.empty()) return reason;
-  const std::string as_sent = base64_encode(joined_credentials(info.userName, info.password));
+  std::string as_sent = basic_credentials(info.userName, info.password);
+  const WipedAtEnd wiped(as_sent);
   return masked(masked(reason, as_sent), info.password);
 }
 
@@ -50,8 +51,10 @@ Result<Socket> connect_http(const HttpPeer& peer) {
 
 Result<> send_request(int socket, const HttpPeer& peer, const std::string& path) {
   const SLibDConnectionInfo& info = peer.connection;
-  const std::string credentials = base64_encode(joined_credentials(info.userName, info.password));
-  const Formatted request = http_get_request({info.host, info.port, path, credentials});
+  std::string credentials = basic_credentials(info.userName, info.password);
+  const WipedAtEnd wiped_credentials(credentials);
+  Formatted request = http_get_request({info.host, info.port, path, credentials});
+  const WipedAtEnd wiped_request(request.text);
   if (request.cut) return kUrlTooLong;
   if (peer.log.is_on()) peer.log.write("To", path.c_str());
   if (!send_once(socket, request.text.data(), request.text.size())) return system_failure();

@@ -5,6 +5,7 @@
 #include <string>
 
 #include "runtime/base/result.h"
+#include "transport/private_connection.h"
 #include "transport/socket.h"
 #include "transport/wait_budget.h"
 #include "vexa/system_info.h"
@@ -24,7 +25,7 @@ class ExchangeLog {
 
 /// The camera, the user and the time-out of an exchange; a copy, so that no setting changes in the middle of it.
 struct HttpPeer {
-  SLibDConnectionInfo connection;
+  PrivateConnection connection;
   ExchangeLog& log;
   Cancels cancels = {};
 };

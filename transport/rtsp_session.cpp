@@ -8,8 +8,8 @@
 #include <cstring>
 #include <utility>
 
-#include "runtime/base/base64.h"
 #include "runtime/base/deadline.h"
+#include "runtime/base/wipe.h"
 #include "transport/failure.h"
 #include "transport/tcp_connect.h"
 #include "transport/wire/http_answer.h"
@@ -151,7 +151,12 @@ Result<int> bind_media_socket(int socket) {
 
 // Kept: the trace shows each request whole, credentials included; support reads it from the host's console.
 bool RtspSession::send(int socket, const std::string& request) {
-  trace_.write("send <" + request + ">", fields_.credentials);
+  constexpr std::string_view kBegin = "send <";
+  std::string line;
+  const WipedAtEnd wiped(line);
+  line.reserve(kBegin.size() + request.size() + 1);  // so that it is not copied as it grows
+  line.append(kBegin).append(request).append(">");
+  trace_.write(line, fields_.credentials);
   return send_once(socket, request.data(), request.size());
 }
 
@@ -171,7 +176,8 @@ Result<int> RtspSession::open(const RtspServer& server, const Opening& opening) 
   if (const auto connected = connect_rtsp(server, {info.timeout, opening.cancels}); !connected)
     return connected.failure();
   socket_ = server.socket.get();
-  const std::string encoded = base64_encode(joined_credentials(info.userName, info.password));
+  std::string encoded = basic_credentials(info.userName, info.password);
+  const WipedAtEnd wiped(encoded);
   std::memcpy(fields_.credentials, encoded.c_str(), encoded.size() + 1);
   const RtspHead describe{opening.url, ++fields_.cseq, fields_.credentials};
   const auto description = exchange(rtsp_describe(describe), opening);
@@ -185,7 +191,8 @@ Result<int> RtspSession::open(const RtspServer& server, const Opening& opening) 
   return session;
 }
 
-Result<std::string> RtspSession::exchange(const Formatted& request, const Opening& opening) {
+Result<std::string> RtspSession::exchange(Formatted request, const Opening& opening) {
+  const WipedAtEnd wiped(request.text);
   if (request.cut) return kUrlTooLong;
   ++requests_;
   if (!send(socket_, request.text)) return system_failure();
@@ -216,7 +223,8 @@ Result<int> RtspSession::set_up(const Opening& opening) {
 
 AwaitedAnswer RtspSession::send_keep_alive(int socket) {
   const RtspHead head{fields_.url, ++fields_.cseq, fields_.credentials};
-  const Formatted request = rtsp_get_parameter(head, fields_.session);
+  Formatted request = rtsp_get_parameter(head, fields_.session);
+  const WipedAtEnd wiped(request.text);
   const bool sent = send(socket, request.text);
   trace_.write(sent ? "successfully sending getparameter" : "error sending getparameter", fields_.credentials);
   return {Clock::now() + kKeepAliveAnswerTimeout, false, request.cut};
@@ -245,7 +253,8 @@ Result<> RtspSession::wait_for_keep_alive(int socket, AwaitedAnswer& awaited, Ca
 
 Result<> RtspSession::tear_down(int socket, WaitLimit limit) {
   const RtspHead head{fields_.url, ++fields_.cseq, fields_.credentials};
-  const Formatted request = rtsp_teardown(head, fields_.session);
+  Formatted request = rtsp_teardown(head, fields_.session);
+  const WipedAtEnd wiped(request.text);
   // Kept: a text that is too long is sent cut, for the camera to refuse. The answer is read whatever came before, and
   // the last failure is the one that is reported.
   Result<> result;

@@ -113,7 +113,7 @@ class RtspSession {
 
  private:
   bool send(int socket, const std::string& request);
-  Result<std::string> exchange(const Formatted& request, const Opening& opening);
+  Result<std::string> exchange(Formatted request, const Opening& opening);
   Result<> take_clocks(const std::string& description, const Opening& opening) const;
   Result<int> set_up(const Opening& opening);
 

@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "transport/wire/http_request.h"
 
+#include "runtime/base/base64.h"
+#include "runtime/base/wipe.h"
+
 namespace vexa {
 namespace {
 
@@ -25,6 +28,12 @@ std::string encoded_where(std::string_view text, Predicate must_be) {
 
 std::string joined_credentials(const std::string& user, const std::string& password) {
   return format_within(kCredentialsRoom, "%s:%s", user.c_str(), password.c_str()).text;
+}
+
+std::string basic_credentials(const std::string& user, const std::string& password) {
+  std::string joined = joined_credentials(user, password);
+  const WipedAtEnd wiped(joined);
+  return base64_encode(joined);
 }
 
 Formatted http_get_request(const HttpTarget& target) {

@@ -15,6 +15,9 @@ inline constexpr std::size_t kRequestRoom = 1024;
 /// User and password joined for Basic authorisation (RFC 7617) before their encoding: cut at 255 characters.
 std::string joined_credentials(const std::string& user, const std::string& password);
 
+/// The same as requests carry them, in Base64. Secret, as what they are made of: its owner wipes it.
+std::string basic_credentials(const std::string& user, const std::string& password);
+
 /// What one request names.
 struct HttpTarget {
   const std::string& host;  ///< the camera's, also when a proxy carries the request
