@@ -46,11 +46,18 @@ RaisedTimeout Connection::raised(int milliseconds) {
   return {info_.timeout, saved_timeout_, lock_, milliseconds};
 }
 
+void CgiLog::write(const char* direction, const char* message) {
+  const bool request = *direction == 'T';
+  if (request) Operation::announce(recorder_);
+  recorder_.note(request ? "http >" : "http <", message);
+  if (enabled_) enter(direction, message);
+}
+
 // A line begins with its line break, so that the file ends without one.
 //
 // An exchange does not fail for its log: what the camera was asked is done all the same. A line that memory is too
 // short for is missing.
-void CgiLog::write(const char* direction, const char* message) {
+void CgiLog::enter(const char* direction, const char* message) {
   (void)within_memory([&] {
     std::string line = CRealTime::GetTheCurrentTime().Format("\r\n%D-%O-%Y\t%H:%M:%S.%03L\t", false);
     line.append("CGI\t").append(direction).append("\t").append(message);
@@ -63,6 +70,7 @@ HttpPeer CameraLink::peer() { return {connection_.copy(), log_, Operation::cance
 Result<Socket> CameraLink::open(const std::string& path) {
   errors_.clear();
   auto socket = open_http(peer(), path);
+  if (!socket) log_.note_failure(socket.failure());
   exchanges_.http(1, socket ? nullptr : &socket.failure());
   return socket;
 }
@@ -87,7 +95,11 @@ ELibDReturnCode CameraLink::inquire(const std::string& name, std::string& answer
     if (size == inquiry_sizes_.end()) return LIBD_FAILED;
     auto received = vexa::inquire(peer(), name, size->second);
     exchanges_.http(1, received ? nullptr : &received.failure());
-    if (!received) return received.failure();
+    if (!received) {
+      log_.note_failure(received.failure());
+      return received.failure();
+    }
+    log_.note_body(*received);
     answer = std::move(*received);
     return LIBD_OK;
   });

@@ -9,6 +9,7 @@
 
 #include "device/error_record.h"
 #include "device/exchange_ledger.h"
+#include "device/flight_recorder.h"
 #include "runtime/base/sync.h"
 #include "transport/http_exchange.h"
 #include "vexa/file_logger.h"
@@ -53,18 +54,25 @@ class Connection {
   int& saved_timeout_ VEXA_GUARDED_BY(lock_);
 };
 
-/// Writes the CGI log while it is switched on. Owned by DriverState; any thread. Never fails: a line that cannot be
-/// written is lost.
+/// Writes the CGI log while it is switched on, and gives the same and more to the flight recorder. Owned by
+/// DriverState; any thread. Never fails: a line that cannot be written is lost.
 class CgiLog final : public ExchangeLog {
  public:
-  CgiLog(CFileLogger& file, const std::atomic<bool>& enabled) : file_(file), enabled_(enabled) {}
+  CgiLog(CFileLogger& file, const std::atomic<bool>& enabled, FlightRecorder& recorder)
+      : file_(file), enabled_(enabled), recorder_(recorder) {}
 
-  bool is_on() const override { return enabled_; }
+  bool is_on() const override { return enabled_ || recorder_.is_on(); }
   void write(const char* direction, const char* message) override;
+  /// A line of the log, whether or not it is switched on.
+  void enter(const char* direction, const char* message);
+  /// What the recorder alone keeps: an answer's body, and why there is none.
+  void note_body(const std::string& body) { recorder_.note("http <", body); }
+  void note_failure(const Failure& failure) { recorder_.note("http !", failure.text); }
 
  private:
   CFileLogger& file_;
   const std::atomic<bool>& enabled_;
+  FlightRecorder& recorder_;
 };
 
 /// Sends requests and inquiries, and records why one failed. Owned by DriverState; any thread. A request blocks for the

@@ -47,5 +47,5 @@ ELibDReturnCode CVexaCommon::SetCGILogLevel(bool on) {
 
 void CVexaCommon::Log(const char* direction, const char* message) {
   if (direction == nullptr || message == nullptr) return;
-  m_State->log.write(direction, message);
+  m_State->log.enter(direction, message);
 }

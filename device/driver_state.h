@@ -16,6 +16,7 @@
 #include "device/cgi/input_part.h"
 #include "device/error_record.h"
 #include "device/exchange_ledger.h"
+#include "device/flight_recorder.h"
 #include "device/operation.h"
 #include "device/polled_stream.h"
 #include "device/queue_counts.h"
@@ -55,9 +56,10 @@ struct DriverState {
 
   CVexaCommon& driver;
   Cancellation cancellation;
-  RequestEcho echo;
   ErrorRecord errors;
   Connection connection;
+  FlightRecorder recorder;
+  RequestEcho echo;
   CgiLog log;
   ExchangeLedger exchanges;
   CameraLink camera;

@@ -2,8 +2,11 @@
 #include "device/operation.h"
 
 #include <cstdio>
+#include <cstring>
+#include <utility>
 
 #include "device/driver_state.h"
+#include "vexa/failure.h"
 
 namespace vexa {
 namespace {
@@ -28,6 +31,11 @@ Operation::~Operation() {
   char camera[kCameraNameRoom];
   state_.connection.write_name(camera);
   state_.errors.enter({code_, cancelled_, name_, camera, text_});
+  // Reads of a stream fail again and again while it is silent; StreamWatch notes the change.
+  if (!state_.recorder.is_on() || std::strcmp(name_, kStreamingThread) == 0) return;
+  char event[kTextRoom];
+  std::snprintf(event, sizeof event, "%s: %s%s %s", name_, CodeName(code_), cancelled_ ? " (cancelled)" : "", text_);
+  state_.recorder.note("call", event);
 }
 
 Operation* Operation::of(const ErrorRecord& errors) {
@@ -35,6 +43,16 @@ Operation* Operation::of(const ErrorRecord& errors) {
     if (&each->state_.errors == &errors) return each->root_ != nullptr ? each->root_ : each;
   }
   return nullptr;
+}
+
+void Operation::announce(FlightRecorder& recorder) {
+  if (!recorder.is_on()) return;
+  for (Operation* each = latest; each != nullptr; each = each->before_) {
+    if (&each->state_.recorder != &recorder) continue;
+    Operation& call = each->root_ != nullptr ? *each->root_ : *each;
+    if (!std::exchange(call.announced_, true)) recorder.note("call", call.name_);
+    return;
+  }
 }
 
 Cancels Operation::cancels_of(const ErrorRecord& errors) {

@@ -10,7 +10,11 @@
 namespace vexa {
 
 class ErrorRecord;
+class FlightRecorder;
 struct DriverState;
+
+/// The name of the operations of the thread that reads a stream.
+inline constexpr const char* kStreamingThread = "StreamingThread";
 
 /// Made at the beginning of a member that may fail or wait, by the thread that calls it: knows what ends its waits, and
 /// at its end enters its failure, if there was one, in the driver's record. A member that another one calls belongs to
@@ -27,6 +31,9 @@ class Operation {
   static Operation* of(const ErrorRecord& errors);
   /// What ends the calling thread's waits for this driver; nothing outside an operation.
   static Cancels cancels_of(const ErrorRecord& errors);
+
+  /// Before a request: the recorder is given the name of the calling thread's operation, once.
+  static void announce(FlightRecorder& recorder);
 
   /// Notes a failure; the last one stands. An empty text leaves the one before.
   void note(ELibDReturnCode code, const char* text = "");
@@ -45,6 +52,7 @@ class Operation {
   Operation* const root_;    // this one, or the outermost on the same driver
   const unsigned cancels_before_;
   std::optional<CallEnds> ends_;
+  bool announced_ = false;
   bool failed_ = false;
   bool cancelled_ = false;
   ELibDReturnCode code_ = LIBD_OK;

@@ -24,6 +24,13 @@ void RequestEcho::write(const std::string& line, const char* credentials) {
     const WipedAtEnd wiped(shown);  // what was masked may stand after its end
     (*receiver)(shown.c_str());
   }
+  if (!recorder_.is_on()) return;
+  Operation::announce(recorder_);
+  recorder_.note("rtsp >", masked(line, credentials));
+}
+
+void RequestEcho::answered(const std::string& answer, const char* credentials) {
+  if (recorder_.is_on()) recorder_.note("rtsp <", masked(answer, credentials));
 }
 
 void RequestEcho::use(std::shared_ptr<const Receiver> receiver) {

@@ -6,6 +6,7 @@
 #include <utility>
 
 #include "device/driver_state.h"
+#include "device/stream_watch.h"
 #include "media/assembly/codec.h"
 #include "media/frame_chronicle.h"
 #include "runtime/base/text.h"
@@ -13,6 +14,7 @@
 #include "runtime/pages.h"
 #include "transport/failure.h"
 #include "transport/wire/http_request.h"
+#include "vexa/failure.h"
 #include "vexa/runtime.h"
 
 namespace {
@@ -49,7 +51,12 @@ ELibDReturnCode DriverState::start_video(const SLibDEdgeStorageStreamingInfo* re
   ELibDReturnCode started = LIBD_FAILED;
   const bool fitted =
       within_memory([&] { started = recording == nullptr ? start_live() : start_playback(*recording); });
-  return fitted ? started : abandon_start(ENOMEM);
+  if (!fitted) started = abandon_start(ENOMEM);
+  if (recorder.is_on()) {
+    const char* what = recording == nullptr ? "live video" : "a recording";
+    recorder.note("video", format_within(kPathRoom, "start of %s: %s", what, CodeName(started)).text);
+  }
+  return started;
 }
 
 ELibDReturnCode DriverState::start_live() {
@@ -214,8 +221,9 @@ unsigned int CVexaCommon::StreamingThread(void* driver) {
   if (self == nullptr || self->m_State->stop_is_requested()) return 0;
   vexa::DriverState& state = *self->m_State;
   bool wait_key = false;
+  vexa::StreamWatch watch(state);
   do {
-    const vexa::Operation reading(state, __func__);
+    const vexa::Operation reading(state, vexa::kStreamingThread);
     VideoFrameInfo frame;
     ELibDReturnCode result = LIBD_TIMEOUT;
     const bool fitted = vexa::within_memory([&] {
@@ -224,6 +232,7 @@ unsigned int CVexaCommon::StreamingThread(void* driver) {
     });
     if (!fitted) state.ledger.settle_lost_packet();
     ProcessCurrentFrameData(self, frame, wait_key, fitted ? result : LIBD_TIMEOUT);
+    watch.look(fitted ? result : LIBD_TIMEOUT);
     // After a picture from RTP the next read waits for a datagram and for the stop event in one: a wait of its own
     // would cost a wake-up a picture, which is most of what a slow stream costs.
     if (!fitted || result != LIBD_OK || !state.plays_rtp()) {
@@ -253,6 +262,7 @@ ELibDReturnCode CVexaCommon::StopVideoStreaming() {
     m_State->set_stream_socket(-1);
   }
   m_State->clear_frame_queue();
+  m_State->recorder.note("video", "stopped");
   const vexa::Guard guard(m_VideoStateLock);
   m_StopVideoRequested = false;
   return LIBD_OK;

@@ -160,6 +160,16 @@ bool RtspSession::send(int socket, const std::string& request) {
   return send_once(socket, request.data(), request.size());
 }
 
+Result<std::string> RtspSession::receive(int socket, WaitLimit limit) {
+  auto answer = receive_accepted(socket, limit);
+  if (answer) {
+    trace_.answered(*answer, fields_.credentials);
+  } else {
+    trace_.unanswered(answer.failure());
+  }
+  return answer;
+}
+
 Result<RtspServer> RtspSession::begin(const std::string& host, int port, WaitLimit limit) {
   fields_.cseq = 0;
   const ResolvedHost resolved = resolve_host(host, port, limit.cancels);
@@ -196,7 +206,7 @@ Result<std::string> RtspSession::exchange(Formatted request, const Opening& open
   if (request.cut) return kUrlTooLong;
   ++requests_;
   if (!send(socket_, request.text)) return system_failure();
-  return receive_accepted(socket_, {opening.connection.timeout, opening.cancels});
+  return receive(socket_, {opening.connection.timeout, opening.cancels});
 }
 
 Result<> RtspSession::take_clocks(const std::string& description, const Opening& opening) const {
@@ -260,7 +270,7 @@ Result<> RtspSession::tear_down(int socket, WaitLimit limit) {
   Result<> result;
   if (request.cut) result = kUrlTooLong;
   if (!send(socket, request.text)) result = system_failure();
-  const auto answer = receive_accepted(socket, limit);
+  const auto answer = receive(socket, limit);
   if (!answer) return answer.failure();
   return result;
 }

@@ -58,11 +58,16 @@ struct AwaitedAnswer {
   bool request_cut = false;  ///< the request did not fit and was sent cut
 };
 
-/// Takes what a session traces: each request, and how the keep-alives went. Used by the thread that owns the session.
+/// Takes what a session traces: each request, how the keep-alives went, and the answers. Used by the thread that owns
+/// the session.
 class RequestTrace {
  public:
   /// `line` has no line break at its end; a request has those of the protocol. It may hold `credentials`.
   virtual void write(const std::string& line, const char* credentials) = 0;
+  /// An answer that was taken; it may hold `credentials`.
+  virtual void answered(const std::string& answer, const char* credentials) = 0;
+  /// None came, or it was a refusal.
+  virtual void unanswered(const Failure& failure) = 0;
 
  protected:
   ~RequestTrace() = default;
@@ -113,6 +118,7 @@ class RtspSession {
 
  private:
   bool send(int socket, const std::string& request);
+  Result<std::string> receive(int socket, WaitLimit limit);
   Result<std::string> exchange(Formatted request, const Opening& opening);
   Result<> take_clocks(const std::string& description, const Opening& opening) const;
   Result<int> set_up(const Opening& opening);

@@ -49,14 +49,7 @@ class Published {
     return record;
   }
 
-  /// How often it was published, modulo 2^31.
-  std::uint32_t version() const { return version_.load(std::memory_order_acquire) / 2; }
-
- private:
-  static constexpr std::size_t kWords = sizeof(Record) / sizeof(Word);
-  static constexpr unsigned kEagerTries = 16;
-  static constexpr std::chrono::microseconds kPause{50};
-
+  /// One try, for a reader that must not wait; false when a write goes on.
   bool try_read(Record& record) const {
     const std::uint32_t before = version_.load(std::memory_order_acquire);
     if (before % 2 != 0) return false;
@@ -67,6 +60,14 @@ class Published {
     }
     return version_.load(std::memory_order_relaxed) == before;
   }
+
+  /// How often it was published, modulo 2^31.
+  std::uint32_t version() const { return version_.load(std::memory_order_acquire) / 2; }
+
+ private:
+  static constexpr std::size_t kWords = sizeof(Record) / sizeof(Word);
+  static constexpr unsigned kEagerTries = 16;
+  static constexpr std::chrono::microseconds kPause{50};
 
   std::atomic<std::uint32_t> version_{0};
   std::atomic<Word> words_[kWords]{};
