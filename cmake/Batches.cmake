@@ -1,7 +1,7 @@
 # SPDX-License-Identifier: Apache-2.0
-# vexa_batch(TARGET): compiles several files of a target in one go, which makes whole builds several times faster. Files
-# that keep the same name to themselves never share a batch: scripts/batch_sources. An edit may bring such a name in;
-# configuring again puts the files into other batches.
+# vexa_batch(TARGET): compiles several files of a target in one go, which makes whole builds several times faster:
+# scripts/batch_sources writes what includes them. Files with definitions of their own, or made while configuring, stay by
+# themselves. An edit may bring a name into a file that its batch has to part or rename; configuring again does so.
 set(VEXA_BATCHES OFF CACHE STRING "Compile several files of a target in one go (needs python3): OFF, ON, or TESTS alone")
 if(VEXA_BATCHES)
   find_package(Python3 REQUIRED COMPONENTS Interpreter)
@@ -12,24 +12,23 @@ function(vexa_batch target)
     return()
   endif()
   get_target_property(sources ${target} SOURCES)
-  list(FILTER sources INCLUDE REGEX "\\.cpp$")
   set(files)
   foreach(source ${sources})
+    get_source_file_property(definitions ${source} COMPILE_DEFINITIONS)
     get_filename_component(source ${source} ABSOLUTE)
-    list(APPEND files ${source})
-  endforeach()
-  execute_process(
-    COMMAND ${Python3_EXECUTABLE} ${PROJECT_SOURCE_DIR}/scripts/batch_sources ${PROJECT_SOURCE_DIR} ${files}
-    OUTPUT_VARIABLE batches OUTPUT_STRIP_TRAILING_WHITESPACE COMMAND_ERROR_IS_FATAL ANY)
-  string(REPLACE "\n" ";" batches "${batches}")
-  set(number 0)
-  foreach(batch ${batches})
-    math(EXPR number "${number} + 1")
-    string(REPLACE "|" ";" batch "${batch}")
-    list(LENGTH batch count)
-    if(count GREATER 1)
-      set_source_files_properties(${batch} PROPERTIES UNITY_GROUP ${target}_${number})
+    if(source MATCHES "\\.cpp$" AND NOT definitions AND NOT source MATCHES "^${PROJECT_BINARY_DIR}/")
+      list(APPEND files ${source})
     endif()
   endforeach()
-  set_target_properties(${target} PROPERTIES UNITY_BUILD ON UNITY_BUILD_MODE GROUP)
+  execute_process(
+    COMMAND ${Python3_EXECUTABLE} ${PROJECT_SOURCE_DIR}/scripts/batch_sources ${PROJECT_SOURCE_DIR}
+      ${CMAKE_CURRENT_BINARY_DIR}/batches/${target} ${files}
+    OUTPUT_VARIABLE batches OUTPUT_STRIP_TRAILING_WHITESPACE COMMAND_ERROR_IS_FATAL ANY)
+  string(REPLACE "\n" ";" batches "${batches}")
+  foreach(batch ${batches})
+    string(REPLACE "|" ";" files "${batch}")
+    list(POP_FRONT files file)
+    set_source_files_properties(${files} PROPERTIES HEADER_FILE_ONLY ON)
+    target_sources(${target} PRIVATE ${file})
+  endforeach()
 endfunction()

@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "virtual_camera/codec/clip.h"
 
-#include <algorithm>
+#include <cstring>
 #include <fstream>
 #include <iterator>
+#include <sstream>
+#include <utility>
 
 namespace vexa::camera {
 namespace {
@@ -18,8 +20,11 @@ struct FoundUnit {
 
 // Offset of the next 00 00 01 at or after `from`; the size when there is none.
 std::size_t next_code(Bytes bytes, std::size_t from) {
-  for (std::size_t i = from; i + 2 < bytes.size(); ++i) {
-    if (bytes[i] == 0 && bytes[i + 1] == 0 && bytes[i + 2] == 1) return i;
+  for (std::size_t i = from + 2; i < bytes.size(); ++i) {
+    const void* one = std::memchr(bytes.data() + i, 1, bytes.size() - i);
+    if (one == nullptr) break;
+    i = static_cast<std::size_t>(static_cast<const std::uint8_t*>(one) - bytes.data());
+    if (bytes[i - 1] == 0 && bytes[i - 2] == 0) return i - 2;
   }
   return bytes.size();
 }
@@ -117,10 +122,10 @@ std::vector<std::string> Clip::delivered() const {
 
 std::optional<Clip> Clip::load(const std::string& path) {
   std::ifstream file(path, std::ios::binary);
-  const std::vector<char> text{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
-  std::vector<std::uint8_t> bytes(text.size());
-  std::transform(text.begin(), text.end(), bytes.begin(), [](char c) { return static_cast<std::uint8_t>(c); });
-  Clip clip = from_annex_b(bytes);
+  std::ostringstream contents;
+  contents << file.rdbuf();
+  const std::string bytes = std::move(contents).str();
+  Clip clip = from_annex_b({reinterpret_cast<const std::uint8_t*>(bytes.data()), bytes.size()});
   if (clip.access_units_.empty()) return std::nullopt;
   return clip;
 }
