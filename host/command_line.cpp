@@ -22,6 +22,8 @@ constexpr char kFooter[] = R"(
 Start here:
   vexactl info 192.168.0.100 --credentials camera.cred
   vexactl record 192.168.0.100 --credentials camera.cred --seconds 10 --out live.mkv
+  vexactl record --cameras cameras.json --forever --segment 600 --out {camera}.mp4
+  vexactl stats --cameras cameras.json --watch
   vexactl snapshot 192.168.0.100 --credentials camera.cred --out live.jpg
   vexactl settings 192.168.0.100 --credentials camera.cred
   vexactl set 192.168.0.100 codec=H.264 size=1280x720 --credentials camera.cred
@@ -41,6 +43,7 @@ Exit codes:
     3  the camera refuses user name and password
     4  the camera sends no picture, or has stopped sending
     5  a result cannot be written
+    6  with --strict: pictures of a recording were lost
   130  interrupted by Ctrl-C or a signal; what was recorded until then is kept)";
 
 struct KnownCommand {
@@ -52,6 +55,7 @@ std::vector<std::unique_ptr<Command>> all_commands() {
   std::vector<std::unique_ptr<Command>> commands;
   commands.push_back(make_info_command());
   commands.push_back(make_record_command());
+  commands.push_back(make_stats_command());
   commands.push_back(make_snapshot_command());
   commands.push_back(make_listen_command());
   commands.push_back(make_settings_command());

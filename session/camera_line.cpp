@@ -36,6 +36,10 @@ bool is_installed(const std::string& model) {
   return std::find(names.begin(), names.end(), model) != names.end();
 }
 
+// As SLibDAudioFrameInfo::codecType.
+constexpr std::int32_t kG711 = 10;
+constexpr std::int32_t kG726 = 20;
+
 struct StreamStart {
   std::uint32_t stream;
   ELibDReturnCode (CLibraryDevice::*start)();
@@ -100,12 +104,15 @@ std::optional<LineFailure> CameraLine::identify(const SLibDConnectionInfo& conne
 }
 
 std::optional<LineFailure> CameraLine::make_driver(const Profile& profile, const SLibDConnectionInfo& connection) {
-  std::unique_ptr<CLibraryDevice> device = MakeDevice(profile);
+  std::unique_ptr<CLibraryDevice> device = MakeDevice(profile);  // and the former one, which goes with no lock held
   auto* driver = dynamic_cast<CVexaCommon*>(device.get());
   if (driver == nullptr || !SetTrace(*driver, [](const char*) {})) return LineFailure{LIBD_FAILED, "out of memory"};
   SetCancelToken(*driver, token_);
+  // Detectors of simple cameras report as one item, all others window by window.
+  device->SetVMDtype(profile.lodDetection ? LIBD_VMD_VMF : LIBD_VMD_WINDOW);
   introduce(*device, connection);
-  device_ = std::move(device);
+  const std::lock_guard<std::mutex> lock(mutex_);
+  device_.swap(device);
   driver_ = driver;
   return std::nullopt;
 }
@@ -124,6 +131,13 @@ std::optional<LineFailure> CameraLine::start(std::uint32_t stream) {
     const ELibDReturnCode selected = SelectStream(*driver_, options_.stream);
     if (selected == LIBD_NOT_SUPPORTED) return LineFailure{selected, "the camera has no such stream"};
     if (selected != LIBD_OK) return failure(selected);
+  }
+  if (stream == kAudioStream) {
+    // The driver itself knows a codec only that it has set.
+    SLibDAudioInfo sound;
+    const ELibDReturnCode asked = device_->GetAudioInfo(sound);
+    if (asked != LIBD_OK) return failure(asked);
+    sound_codec_ = sound.codec == "G711" ? kG711 : (sound.codec == "G726" ? kG726 : -1);
   }
   const auto* row = std::find_if(std::begin(kStarts), std::end(kStarts),
                                  [stream](const StreamStart& s) { return s.stream == stream; });
@@ -148,5 +162,12 @@ void CameraLine::close() {
 }
 
 std::string CameraLine::latest_text() const { return driver_ == nullptr ? "" : LastFailure(*driver_).text; }
+
+bool CameraLine::statistics(StreamStatistics& statistics) const {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  if (driver_ == nullptr) return false;
+  GetStreamStatistics(*driver_, statistics);
+  return true;
+}
 
 }  // namespace vexa

@@ -5,12 +5,14 @@
 #include <atomic>
 #include <cstdint>
 #include <memory>
+#include <mutex>
 #include <optional>
 #include <string>
 
 #include "vexa/cancel.h"
 #include "vexa/models.h"
 #include "vexa/session.h"
+#include "vexa/statistics.h"
 #include "vexa/vexa_common.h"
 
 namespace vexa {
@@ -55,6 +57,10 @@ class CameraLine {
   /// Null before the first open().
   [[nodiscard]] CVexaCommon* driver() const { return driver_; }
   [[nodiscard]] std::string latest_text() const;
+  /// As SLibDAudioFrameInfo::codecType, of the sound that was started.
+  [[nodiscard]] std::int32_t sound_codec() const { return sound_codec_; }
+  /// Any thread. False before the first open().
+  [[nodiscard]] bool statistics(StreamStatistics& statistics) const;
 
  private:
   [[nodiscard]] std::optional<LineFailure> identify(const SLibDConnectionInfo& connection);
@@ -64,9 +70,11 @@ class CameraLine {
 
   const SessionOptions options_;
   CancelToken token_;
+  mutable std::mutex mutex_;  ///< held to replace the device, and to use it on a thread of no job
   std::unique_ptr<CLibraryDevice> device_;
   CVexaCommon* driver_ = nullptr;  ///< the device
-  std::string model_;              ///< whose installed profile the device has; empty: none
+  std::int32_t sound_codec_ = -1;
+  std::string model_;  ///< whose installed profile the device has; empty: none
 };
 
 }  // namespace vexa

@@ -22,6 +22,7 @@ struct GroupCounts {
   std::atomic<std::uint64_t> most_at_once{0};
   std::atomic<std::uint64_t> events_missed{0};
   std::atomic<std::uint64_t> exceptions{0};
+  std::atomic<std::uint64_t> most_turns_waited{0};
 };
 
 /// Raises a total that is a highest value.
@@ -39,7 +40,10 @@ class Turns {
 
   [[nodiscard]] bool enter(std::uint64_t session, GroupCounts& counts) {
     const std::lock_guard<std::mutex> lock(mutex_);
-    if (!admission_.enter(session)) return false;
+    if (!admission_.enter(session)) {
+      raise_to(counts.most_turns_waited, admission_.waiting());
+      return false;
+    }
     raise_to(counts.most_at_once, admission_.inside());
     return true;
   }

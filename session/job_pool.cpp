@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "session/job_pool.h"
 
+#include <algorithm>
 #include <exception>
 #include <utility>
 
@@ -24,6 +25,7 @@ bool JobPool::post(std::function<void()> job) {
   } catch (const std::exception&) {
     return false;
   }
+  most_queued_ = std::max(most_queued_, jobs_.size());
   if (idle_ < jobs_.size() && threads_.size() < most_) {
     const BlockedSignals none;
     try {
@@ -43,6 +45,11 @@ bool JobPool::post(std::function<void()> job) {
 std::size_t JobPool::threads() const {
   const std::lock_guard<std::mutex> lock(mutex_);
   return threads_.size();
+}
+
+std::size_t JobPool::most_queued() const {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  return most_queued_;
 }
 
 void JobPool::work() {

@@ -24,6 +24,8 @@ class JobPool {
   /// Any thread. False when the job could not be taken: no thread runs, and none can be made.
   [[nodiscard]] bool post(std::function<void()> job);
   [[nodiscard]] std::size_t threads() const;
+  /// Jobs that were queued at the same time, the most in its life.
+  [[nodiscard]] std::size_t most_queued() const;
 
  private:
   void work();
@@ -34,6 +36,7 @@ class JobPool {
   std::deque<std::function<void()>> jobs_;
   std::vector<std::thread> threads_;
   std::size_t idle_ = 0;
+  std::size_t most_queued_ = 0;
   bool over_ = false;
 };
 

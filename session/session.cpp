@@ -28,6 +28,8 @@ void Session::SetCredentials(const std::string& userName, const std::string& pas
   }
 }
 
+bool Session::Statistics(StreamStatistics& statistics) const { return core_->statistics(statistics); }
+
 const std::string& Session::Name() const { return core_->name(); }
 
 }  // namespace vexa

@@ -575,7 +575,7 @@ int SessionCore::take_audio(Moment now) {
   evidence_.other = now;
   if (!callbacks_.audio || stop_wanted_ || frame.length <= 0) return 0;
   return call(
-      [&] { callbacks_.audio(*handle(), sound_.data(), static_cast<std::size_t>(frame.length), frame.codecType); });
+      [&] { callbacks_.audio(*handle(), sound_.data(), static_cast<std::size_t>(frame.length), line_.sound_codec()); });
 }
 
 // Video that runs goes on without the other streams, which are started again by themselves.

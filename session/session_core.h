@@ -39,6 +39,7 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   [[nodiscard]] std::uint64_t number() const { return number_; }
   [[nodiscard]] const std::string& name() const { return name_; }
   [[nodiscard]] SessionStatus status() const;
+  [[nodiscard]] bool statistics(StreamStatistics& statistics) const { return line_.statistics(statistics); }
   void stop();
   void retry();
   void set_credentials(const std::string& user, const std::string& password);

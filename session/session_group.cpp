@@ -86,6 +86,9 @@ class SessionGroup::Impl {
     metrics.mostAttemptsAtOnce = counts.most_at_once;
     metrics.eventsMissed = counts.events_missed;
     metrics.exceptions = counts.exceptions;
+    metrics.mostTurnsWaited = counts.most_turns_waited;
+    metrics.mostJobsQueued =
+        std::max({parts_.connectors.most_queued(), parts_.sides.most_queued(), parts_.closers.most_queued()});
     return metrics;
   }
 

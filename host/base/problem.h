@@ -16,6 +16,7 @@ enum class ExitCode : int {
   kUnauthorized = 3,  // the camera refuses user name and password
   kNoVideo = 4,       // the camera sends no picture, or has stopped sending
   kCannotWrite = 5,   // a result cannot be written
+  kIncomplete = 6,    // --strict: pictures of a recording were lost
   kInterrupted = 130  // ended by Ctrl-C or a signal; what was recorded until then is kept
 };
 

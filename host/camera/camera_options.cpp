@@ -5,7 +5,10 @@
 
 #include <CLI/CLI.hpp>
 #include <memory>
+#include <set>
+#include <utility>
 
+#include "host/access/camera_file.h"
 #include "host/cgi_log/cgi_log.h"
 
 namespace vexa::host {
@@ -14,13 +17,48 @@ namespace {
 constexpr int kLongestTimeout = 600000;
 constexpr int kMostStreams = 16;
 
-}  // namespace
+constexpr char kCameraHelp[] = "the camera: HOST or HOST:PORT (HTTP port, else 80), or its name with --cameras";
 
-void add_camera_options(CLI::App& command, CameraOptions& options, const char* const* environment) {
+Result<ChosenCamera> at_address(const std::string& text, const CameraOptions& options) {
+  const Result<CameraAddress> address = parse_camera_address(text);
+  if (!address) return fail(address.error());
+  const Result<Credentials> credentials = load_credentials(options.credentials);
+  if (!credentials) return fail(credentials.error());
+  return ChosenCamera{to_string(*address), *address, *credentials};
+}
+
+Result<ChosenCamera> of_file(const CameraFile& file, const FileCamera& camera, const CameraOptions& options) {
+  const Result<Credentials> credentials = file.credentials_of(camera, options.credentials, options.environment);
+  if (!credentials) return fail(credentials.error());
+  return ChosenCamera{camera.name, camera.address, *credentials, camera.profile};
+}
+
+// All cameras of the file, or the one of that name.
+Result<std::vector<FileCamera>> named_in(const CameraFile& file, const std::vector<std::string>& names) {
+  if (names.empty()) return file.cameras();
+  std::vector<FileCamera> named;
+  for (const std::string& name : names) {
+    Result<FileCamera> camera = file.find(name);
+    if (!camera) return fail(camera.error());
+    named.push_back(*std::move(camera));
+  }
+  return named;
+}
+
+std::optional<Problem> check_once_each(const std::vector<ChosenCamera>& cameras) {
+  std::set<std::string> names;
+  for (const ChosenCamera& camera : cameras) {
+    if (!names.insert(camera.name).second) return usage("a camera is named twice", "Name each camera once.");
+  }
+  return std::nullopt;
+}
+
+void add_access_options(CLI::App& command, CameraOptions& options, const char* const* environment) {
+  options.environment = environment;
   read_environment(options.credentials, environment);
-  command.add_option("camera,--camera", options.address, "the camera: HOST or HOST:PORT (HTTP port, else 80)")
-      ->required()
-      ->type_name("");
+  command
+      .add_option("--cameras", options.cameras_file, "file of cameras, each with a name that stands for its address")
+      ->type_name("FILE");
   auto* user = command.add_option("--user", options.credentials.user, "user name")->type_name("NAME");
   auto* password =
       command.add_option("--password-file", options.credentials.password_file, "file whose first line is the password")
@@ -38,6 +76,20 @@ void add_camera_options(CLI::App& command, CameraOptions& options, const char* c
       .add_option("--cgi-log", options.cgi_log,
                   "append each request to the camera and its answer's status to this file")
       ->type_name("FILE");
+}
+
+}  // namespace
+
+void add_camera_options(CLI::App& command, CameraOptions& options, const char* const* environment) {
+  command.add_option("camera,--camera", options.address, kCameraHelp)->required()->type_name("");
+  add_access_options(command, options, environment);
+}
+
+void add_options_of_cameras(CLI::App& command, CameraOptions& options, std::vector<std::string>& cameras,
+                            const char* const* environment) {
+  command.add_option("camera,--camera", cameras, std::string(kCameraHelp) + "; without one, all of its file")
+      ->type_name("");
+  add_access_options(command, options, environment);
 }
 
 void add_stream_option(CLI::App& command, int& stream) {
@@ -58,22 +110,52 @@ std::optional<Problem> check_stream(int stream) {
   return usage(fmt::format("--stream is not a number from 1 to {}", kMostStreams), "1 is the camera's first stream.");
 }
 
-Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal) {
+std::optional<Problem> check_camera_options(const CameraOptions& options) {
   if (options.timeout_ms < 1 || options.timeout_ms > kLongestTimeout) {
-    return fail(usage(fmt::format("--timeout is not a number from 1 to {}", kLongestTimeout),
-                      "It is in milliseconds; 5000 when not given."));
+    return usage(fmt::format("--timeout is not a number from 1 to {}", kLongestTimeout),
+                 "It is in milliseconds; 5000 when not given.");
   }
-  const Result<CameraAddress> address = parse_camera_address(options.address);
-  if (!address) return fail(address.error());
-  const Result<Credentials> credentials = load_credentials(options.credentials);
-  if (!credentials) return fail(credentials.error());
-  CameraConnection connection{*address, *credentials, options.timeout_ms, options.transport, options.cgi_log};
+  return std::nullopt;
+}
+
+Result<std::vector<ChosenCamera>> choose_cameras(const CameraOptions& options, const std::vector<std::string>& names) {
+  std::vector<ChosenCamera> chosen;
+  const auto add = [&](Result<ChosenCamera> camera) -> std::optional<Problem> {
+    if (!camera) return camera.error();
+    chosen.push_back(*std::move(camera));
+    return std::nullopt;
+  };
+  if (options.cameras_file) {
+    const Result<CameraFile> file = CameraFile::read(*options.cameras_file);
+    if (!file) return fail(file.error());
+    const Result<std::vector<FileCamera>> named = named_in(*file, names);
+    if (!named) return fail(named.error());
+    for (const FileCamera& camera : *named) {
+      if (auto problem = add(of_file(*file, camera, options))) return fail(*std::move(problem));
+    }
+  } else {
+    if (names.empty()) return fail(usage("--camera is required", "Name one, or a file of them with --cameras."));
+    for (const std::string& name : names) {
+      if (auto problem = add(at_address(name, options))) return fail(*std::move(problem));
+    }
+  }
+  if (auto problem = check_once_each(chosen)) return fail(*std::move(problem));
+  return chosen;
+}
+
+Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal) {
+  if (auto problem = check_camera_options(options)) return fail(*std::move(problem));
+  const Result<std::vector<ChosenCamera>> chosen = choose_cameras(options, {options.address});
+  if (!chosen) return fail(chosen.error());
+  const ChosenCamera& camera = chosen->front();
+  CameraConnection connection{camera.address, camera.credentials, options.timeout_ms, options.transport,
+                              options.cgi_log};
   if (const auto problem = check_name(connection.address)) return fail(*problem);
   if (connection.cgi_log) {
     if (const auto problem = check_cgi_log_target(*connection.cgi_log)) return fail(*problem);
   }
   if (options.trace) connection.trace = shown_trace(terminal, Redactor(connection.credentials));
-  return OpenCamera{connection.address, std::make_unique<LiveCamera>(connection)};
+  return OpenCamera{connection.address, camera.profile, std::make_unique<LiveCamera>(connection)};
 }
 
 }  // namespace vexa::host

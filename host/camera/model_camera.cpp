@@ -35,23 +35,24 @@ Result<ModelCamera> ModelCamera::open(const ModelOptions& options, Terminal& ter
   SLibDSystemInfo system;
   const ELibDReturnCode result = asked->driver->GetCurrentSystemInfo(system);
   if (result != LIBD_OK) return fail(asked->driver->explain(result));
+  const std::optional<std::string> profile = options.profile ? options.profile : asked->profile;
   ModelCamera camera(std::move(*asked), options.stream);
-  if (auto problem = camera.find_profile(options, system.modelName)) return fail(*std::move(problem));
+  if (auto problem = camera.find_profile(profile, system.modelName)) return fail(*std::move(problem));
   camera.device_ = MakeDevice(camera.profile_);
   if (!camera.device_) return fail(usage("there is not enough memory for a driver", "Free some."));
   introduce(*camera.device_, camera.connection_);
   return camera;
 }
 
-std::optional<Problem> ModelCamera::find_profile(const ModelOptions& options, const std::string& model) {
+std::optional<Problem> ModelCamera::find_profile(const std::optional<std::string>& profile, const std::string& model) {
   const auto names = ProfileNames();
   const bool installed = std::find(names.begin(), names.end(), model) != names.end();
-  if (!options.profile && !installed) {
+  if (!profile && !installed) {
     profile_ = without_profile(model);
     return std::nullopt;
   }
   ProfileError error;
-  if (!LoadProfile(options.profile.value_or(model), profile_, error)) return wrong_profile(error);
+  if (!LoadProfile(profile.value_or(model), profile_, error)) return wrong_profile(error);
   return std::nullopt;
 }
 

@@ -57,7 +57,8 @@ class ModelCamera {
   ModelCamera(OpenCamera asked, int stream)
       : live_(std::move(asked.driver)), connection_(live_->connection()), stream_(stream) {}
 
-  [[nodiscard]] std::optional<Problem> find_profile(const ModelOptions& options, const std::string& model);
+  [[nodiscard]] std::optional<Problem> find_profile(const std::optional<std::string>& profile,
+                                                    const std::string& model);
 
   std::unique_ptr<LiveCamera> live_;
   CameraConnection connection_;

@@ -5,6 +5,7 @@
 #include <thread>
 #include <vector>
 
+#include "host/camera/one_session.h"
 #include "host/console/interrupt.h"
 #include "host/console/terminal.h"
 #include "host/words/utc_time.h"
@@ -95,6 +96,36 @@ std::optional<Problem> AlarmWatch::take_snapshot(const SLibDPinInfo& pin, const 
   if (!problem || problem->code == ExitCode::kCannotWrite) return problem;
   terminal_.say("vexactl: no picture of this alarm: " + problem->text);
   return std::nullopt;
+}
+
+ExitCode watch_by_session(const SessionOptions& session, Terminal& terminal, const AlarmWatchOptions& options) {
+  PinStates states;
+  std::uint64_t shown = 0;
+  std::optional<Problem> problem;
+  const auto is_done = [&] { return problem || (options.lines != 0 && shown >= options.lines); };
+  const auto show = [&](const std::string& line) {
+    if (is_done()) return;
+    ++shown;
+    if (terminal.write_result(line) != 0) {
+      problem = Problem{ExitCode::kCannotWrite, "an alarm cannot be written", "Is standard output still open?"};
+    }
+  };
+  SessionWork work;
+  work.callbacks.alarms = [&](Session&, const std::vector<SLibDPinInfo>& pins) {
+    const std::string moment = utc_text(std::chrono::system_clock::now());
+    for (const SLibDPinInfo& pin : states.changed(pins)) show(alarm_line(pin, moment, options.format));
+  };
+  work.callbacks.metadata = [&](Session&, const SLibDRawMDFrameInfo& frame) {
+    show(metadata_line(frame, utc_text(std::chrono::system_clock::now()), options.format));
+  };
+  work.is_done = [&] {
+    if (!problem) problem = check_reader(terminal);
+    return is_done();
+  };
+  const std::optional<Problem> ended = work_by_session(session, work, terminal);
+  if (ended && ended->code == ExitCode::kInterrupted) return ended->code;
+  if (ended) return terminal.report(*ended);
+  return problem ? terminal.report(*problem) : ExitCode::kOk;
 }
 
 }  // namespace vexa::host

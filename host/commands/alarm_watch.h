@@ -13,6 +13,7 @@
 #include "host/commands/alarm_snapshots.h"
 #include "host/console/terminal.h"
 #include "host/words/alarm_words.h"
+#include "vexa/session.h"
 
 namespace vexa::host {
 
@@ -54,6 +55,10 @@ class AlarmWatch {
   std::uint64_t shown_ = 0;
   std::optional<Problem> failure_;
 };
+
+// The same by a session, through outages and without pictures.
+[[nodiscard]] ExitCode watch_by_session(const SessionOptions& session, Terminal& terminal,
+                                        const AlarmWatchOptions& options);
 
 // Detectors of simple cameras report as one item, all others window by window.
 void follow_detection(const ModelCamera& camera);

@@ -9,6 +9,7 @@
 
 #include "host/base/printable.h"
 #include "host/camera/model_camera.h"
+#include "host/camera/one_session.h"
 #include "host/commands/action_group.h"
 #include "host/commands/alarm_snapshots.h"
 #include "host/commands/alarm_watch.h"
@@ -152,11 +153,13 @@ class WatchCommand final : public Command {
     command
         ->add_option("--snapshot-dir", snapshot_folder_, "write a picture of each alarm that begins into this folder")
         ->type_name("DIR");
+    command->add_flag("--forever", forever_, "go on through outages, and wait for a camera that is not there");
     command->footer("Each line gives the time, the pin, its kind and its new state; with --json it is a JSON object.");
     return command;
   }
 
   ExitCode run(Terminal& terminal) override {
+    if (forever_) return run_forever(terminal);
     if (snapshot_folder_) {
       if (const auto problem = check_snapshot_folder(*snapshot_folder_)) return terminal.report(*problem);
     }
@@ -172,12 +175,24 @@ class WatchCommand final : public Command {
   }
 
  private:
+  ExitCode run_forever(Terminal& terminal) {
+    if (snapshot_folder_) {
+      return terminal.report(usage("--forever takes no pictures of alarms", "Leave out --snapshot-dir."));
+    }
+    if (const auto problem = check_stream(options_.stream)) return terminal.report(*problem);
+    const std::uint32_t streams = kAlarmStream | (metadata_ ? kMetadataStream : 0);
+    const Result<SessionOptions> session = session_of(options_.camera, options_.profile, options_.stream, streams);
+    if (!session) return terminal.report(session.error());
+    return watch_by_session(*session, terminal, watch_options());
+  }
+
   [[nodiscard]] AlarmWatchOptions watch_options() const {
     return {options_.camera.json ? WatchFormat::kJson : WatchFormat::kText, metadata_, count_};
   }
 
   ModelOptions options_;
   bool metadata_ = false;
+  bool forever_ = false;
   std::optional<std::string> snapshot_folder_;
   std::uint64_t count_ = 0;  // 0: no such end
 };

@@ -31,6 +31,7 @@ class Command {
 
 std::unique_ptr<Command> make_info_command();
 std::unique_ptr<Command> make_record_command();
+std::unique_ptr<Command> make_stats_command();
 std::unique_ptr<Command> make_snapshot_command();
 std::unique_ptr<Command> make_listen_command();
 std::unique_ptr<Command> make_log_command();

@@ -15,6 +15,7 @@
 
 #include "host/base/printable.h"
 #include "host/camera/camera_options.h"
+#include "host/camera/one_session.h"
 #include "host/commands/command.h"
 #include "host/console/interrupt.h"
 #include "host/console/progress.h"
@@ -29,6 +30,7 @@ using Clock = std::chrono::steady_clock;
 
 constexpr double kLongestListening = 366.0 * 24 * 3600;
 constexpr char kCompanded[] = "G711";
+constexpr std::int32_t kG711 = 10;  // as SLibDAudioFrameInfo::codecType
 
 struct SoundCodec {
   const char* word;
@@ -83,6 +85,7 @@ class ListenCommand final : public Command {
     command->add_option("--codec", codec_, "switch the camera's sound on in this: g711_64, g726_40, _32, _24 or _16")
         ->type_name("WORD");
     command->add_option("--seconds", seconds_, "end after this many seconds of sound")->type_name("N");
+    command->add_flag("--forever", forever_, "go on through outages, and wait for a camera that is not there");
     command->footer("Without --seconds it ends with Ctrl-C.");
     return command;
   }
@@ -97,9 +100,13 @@ class ListenCommand final : public Command {
     }
     FrameFile file = to_standard_output() ? FrameFile("standard output", terminal.results()) : FrameFile(out_);
     if (const auto problem = file.check()) return terminal.report(*problem);
+    if (forever_ && !codec_) return listen_by_session(file, terminal);
     Result<OpenCamera> opened = open_camera(camera_, terminal);
     if (!opened) return terminal.report(opened.error());
-    return listen(*opened, file, terminal);
+    if (!forever_) return listen(*opened, file, terminal);
+    const ELibDReturnCode result = switch_on(*opened, *find_sound_codec(*codec_));
+    if (result != LIBD_OK) return terminal.report(of_a_silent_model(*opened).value_or(opened->driver->explain(result)));
+    return listen_by_session(file, terminal);
   }
 
  private:
@@ -123,12 +130,63 @@ class ListenCommand final : public Command {
     Listening received = receive(camera, target, SoundLimit(seconds_, sound.bitRate), terminal);
     camera.driver->StopAudioStreaming();
     if (const auto at_close = target.close(); at_close && !received.problem) received.problem = at_close;
-    const ExitCode written = summarise(camera, sound, target.bytes(), terminal);
+    const ExitCode written = summarise(to_string(camera.address), sound, target.bytes(), terminal);
     if (received.problem) return terminal.report(*received.problem);
     if (received.code == ExitCode::kInterrupted) {
       terminal.say("vexactl: interrupted; what was recorded is complete up to here");
     }
     return received.code == ExitCode::kOk ? written : received.code;
+  }
+
+  // Through outages. A camera that changes its codec meanwhile ends it: one file holds one kind of sound.
+  ExitCode listen_by_session(FrameFile& file, Terminal& terminal) {
+    const Result<SessionOptions> session = session_of(camera_, std::nullopt, 1, kAudioStream);
+    if (!session) return terminal.report(session.error());
+    SoundFile target(file, sound_format_of(out_));
+    const SoundCodec* sound = codec_ ? find_sound_codec(*codec_) : nullptr;
+    std::int32_t codec = 0;
+    std::optional<Problem> problem;
+    std::optional<SoundLimit> limit;
+    if (sound != nullptr) limit.emplace(seconds_, sound->bit_rate);
+    SessionWork work;
+    work.callbacks.audio = [&](Session&, const unsigned char* data, std::size_t length, std::int32_t type) {
+      if (problem || (limit && limit->reached(target.bytes()))) return;
+      if (codec == 0) {
+        codec = type;
+        problem = check_kind(type);
+        if (!limit) limit.emplace(seconds_, kSoundCodecs[0].bit_rate);
+      } else if (codec != type) {
+        problem = Problem{ExitCode::kNoVideo, "the camera has changed the codec of its sound", "Begin another file."};
+      }
+      if (!problem) problem = target.write(data, limit->share(length, target.bytes()));
+    };
+    work.is_done = [&] { return problem || (limit && limit->reached(target.bytes())); };
+    const std::optional<Problem> ended = work_by_session(*session, work, terminal);
+    if (const auto at_close = target.close(); at_close && !problem) problem = at_close;
+    const SLibDAudioInfo info = info_of(codec, sound);
+    const ExitCode written =
+        target.bytes() > 0 ? summarise(session->name, info, target.bytes(), terminal) : ExitCode::kOk;
+    if (problem) return terminal.report(*problem);
+    if (!ended) return written;
+    if (ended->code != ExitCode::kInterrupted) return terminal.report(*ended);
+    terminal.say("vexactl: interrupted; what was recorded is complete up to here");
+    return ended->code;
+  }
+
+  // Of a camera's sound whose rate nobody has set here: G.711 has one alone.
+  [[nodiscard]] std::optional<Problem> check_kind(std::int32_t type) const {
+    if (type == kG711) return std::nullopt;
+    if (sound_format_of(out_) == SoundFormat::kWave) return no_wave(info_of(type, nullptr));
+    if (codec_ || !seconds_) return std::nullopt;
+    return usage("the seconds of this sound cannot be counted", "Give --codec too, or leave out --seconds.");
+  }
+
+  static SLibDAudioInfo info_of(std::int32_t type, const SoundCodec* sound) {
+    SLibDAudioInfo info;
+    info.codec = type == kG711 ? kCompanded : "G726";
+    info.bitRate = sound != nullptr ? sound->bit_rate : (type == kG711 ? kSoundCodecs[0].bit_rate : 0);
+    info.bitRateLabel = info.bitRate == 0 ? "an unknown rate" : fmt::format("{} Kbps", info.bitRate / 1000);
+    return info;
   }
 
   static ELibDReturnCode switch_on(OpenCamera& camera, const SoundCodec& codec) {
@@ -198,12 +256,12 @@ class ListenCommand final : public Command {
     return {ExitCode::kNoVideo, fmt::format("the sound has broken off: {}", reason.text), reason.advice};
   }
 
-  ExitCode summarise(const OpenCamera& camera, const SLibDAudioInfo& sound, std::uint64_t bytes, Terminal& terminal) {
-    const double seconds = static_cast<double>(bytes) * 8 / sound.bitRate;
+  ExitCode summarise(const std::string& camera, const SLibDAudioInfo& sound, std::uint64_t bytes, Terminal& terminal) {
+    const double seconds = sound.bitRate > 0 ? static_cast<double>(bytes) * 8 / sound.bitRate : 0;
     std::string text = fmt::format("{}: {:.2f} s of {} at {}, {} bytes\n", out_, seconds, printable(sound.codec),
                                    printable(sound.bitRateLabel), bytes);
     if (camera_.json) {
-      text = to_text({{"camera", to_string(camera.address)},
+      text = to_text({{"camera", camera},
                       {"file", out_},
                       {"codec", sound.codec},
                       {"bitsPerSecond", sound.bitRate},
@@ -220,6 +278,7 @@ class ListenCommand final : public Command {
   std::optional<std::string> codec_;
   std::optional<double> seconds_;
   std::string out_;
+  bool forever_ = false;
 };
 
 }  // namespace

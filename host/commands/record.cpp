@@ -6,16 +6,20 @@
 #include <algorithm>
 #include <chrono>
 #include <nlohmann/json.hpp>
+#include <vector>
 
 #include "host/base/printable.h"
 #include "host/camera/camera_options.h"
 #include "host/camera/video_options.h"
 #include "host/commands/command.h"
+#include "host/commands/session_recording.h"
 #include "host/console/interrupt.h"
 #include "host/console/progress.h"
 #include "host/console/terminal.h"
+#include "host/recording/lost_pictures.h"
 #include "host/recording/recorder.h"
 #include "host/recording/recording_target.h"
+#include "vexa/statistics.h"
 
 namespace vexa::host {
 namespace {
@@ -28,11 +32,15 @@ constexpr std::chrono::milliseconds kShortestSilence{2000};
 
 struct RecordOptions {
   CameraOptions camera;
+  std::vector<std::string> cameras;
   std::optional<double> seconds;
   std::optional<std::int64_t> frames;
   std::string out;
   std::optional<std::string> format;
+  std::optional<double> segment;
   VideoOptions video;
+  bool forever = false;
+  bool strict = false;
   bool quiet = false;
 };
 
@@ -44,6 +52,7 @@ struct Recording {
   std::string codec;
   RecordingEnd end;
   RecordingMeter meter;
+  LostPictures lost;
   Clock::time_point ended;
 
   [[nodiscard]] double seconds() const { return meter.elapsed(ended).count(); }
@@ -104,28 +113,38 @@ Json to_json(const Recording& recording) {
   json["statedFramesPerSecond"] = meter.stated_rate() > 0 ? Json(meter.stated_rate()) : Json(nullptr);
   json["expectedFrames"] = or_null(meter.expected_frames(recording.ended));
   json["missingFramesEstimate"] = or_null(meter.missing_frames(recording.ended));
+  json["lost"] = json_of(recording.lost);
   return json;
 }
 
 class RecordCommand final : public Command {
  public:
   CLI::App* declare(CLI::App& program, const char* const* environment) override {
-    CLI::App* command = program.add_subcommand("record", "Record live video into a file");
-    add_camera_options(*command, options_.camera, environment);
+    CLI::App* command = program.add_subcommand("record", "Record live video into files");
+    add_options_of_cameras(*command, options_.camera, options_.cameras, environment);
     command
         ->add_option("--out", options_.out,
-                     "file to write: .mkv or .mp4, or the pictures alone: .h264, .m4v, .mjpeg; - is standard output")
+                     "file to write: .mkv or .mp4, or the pictures alone: .h264, .m4v, .mjpeg; - is standard output;\n"
+                     "{camera} stands for the camera's name")
         ->required()
         ->type_name("FILE");
     command->add_option("--format", options_.format, "mkv, mp4, h264, m4v or mjpeg, whatever --out ends in")
         ->type_name("WORD");
     command->add_option("--seconds", options_.seconds, "end after this many seconds of video")->type_name("N");
     command->add_option("--frames", options_.frames, "end after this many frames")->type_name("N");
+    command->add_flag("--forever", options_.forever, "go on through outages, and wait for a camera that is not there");
+    command
+        ->add_option("--segment", options_.segment,
+                     "a file of its own for every so many seconds, with the time in its name; each begins with a key\n"
+                     "picture")
+        ->type_name("SECONDS");
+    command->add_flag("--strict", options_.strict, "end with exit code 6 when pictures were lost");
     add_video_options(*command, options_.video);
     command->add_flag("--quiet", options_.quiet, "show no progress");
     command->footer(
         "A recording begins with the first key frame and, without --seconds and --frames, ends with Ctrl-C.\n"
         "Every second of it is written at once: what is killed plays up to its last second.\n"
+        "With --forever, --segment or several cameras it lives through outages, and reports them on standard error.\n"
         "Drops are an estimate: frames expected at the rate that stream or camera state, less those received.");
     return command;
   }
@@ -133,9 +152,11 @@ class RecordCommand final : public Command {
   ExitCode run(Terminal& terminal) override {
     if (const auto problem = check(options_)) return terminal.report(*problem);
     if (options_.quiet) terminal.silence_progress();
-    const RecordingTarget target(options_.out, terminal.results(), options_.format);
-    if (const auto problem = target.check()) return terminal.report(*problem);
     options_.camera.transport = transport_of(options_.video);
+    if (options_.forever || options_.segment || options_.cameras.size() != 1) return record_many(terminal);
+    const RecordingTarget target(out_of_one(), terminal.results(), options_.format);
+    if (const auto problem = target.check()) return terminal.report(*problem);
+    options_.camera.address = options_.cameras.front();
     Result<OpenCamera> opened = open_camera(options_.camera, terminal);
     if (!opened) return terminal.report(opened.error());
     return record(*opened, target, terminal);
@@ -147,6 +168,31 @@ class RecordCommand final : public Command {
     return std::max(kShortestSilence, std::chrono::milliseconds(options_.camera.timeout_ms));
   }
   [[nodiscard]] bool to_standard_output() const { return options_.out == "-"; }
+
+  // As for many, so that a script need not count its cameras.
+  [[nodiscard]] std::string out_of_one() const { return with_camera_name(options_.out, options_.cameras.front()); }
+
+  ExitCode record_many(Terminal& terminal) {
+    if (const auto problem = check_camera_options(options_.camera)) return terminal.report(*problem);
+    Result<std::vector<ChosenCamera>> chosen = choose_cameras(options_.camera, options_.cameras);
+    if (!chosen) return terminal.report(chosen.error());
+    CameraRecording::Limits limits;
+    limits.seconds = options_.seconds;
+    if (options_.frames) limits.frames = static_cast<std::uint64_t>(*options_.frames);
+    limits.forever = options_.forever;
+    const SessionRecordingOptions recording{options_.camera, *std::move(chosen), options_.video.stream,
+                                            options_.out,    options_.format,    options_.segment,
+                                            limits,          options_.strict};
+    if (const auto problem = check(recording, terminal)) return terminal.report(*problem);
+    return record_by_sessions(recording, terminal);
+  }
+
+  static LostPictures counted(OpenCamera& camera, std::uint64_t pictures_of_the_recording = 0) {
+    StreamStatistics statistics;
+    GetStreamStatistics(*camera.driver, statistics);
+    statistics.framesBegun -= std::min(statistics.framesBegun, pictures_of_the_recording);
+    return LostPictures(statistics);
+  }
 
   ExitCode record(OpenCamera& camera, const RecordingTarget& target, Terminal& terminal) {
     terminal.progress("connecting");
@@ -163,17 +209,25 @@ class RecordCommand final : public Command {
                        .frames = options_.frames,
                        .camera_rate = static_cast<double>(identity->video.frameRate),
                        .silence = silence()});
-    const RecordingEnd end = recorder.run(progress_on(terminal));
+    std::optional<LostPictures> before;
+    const RecordingEnd end = recorder.run([&, progress = progress_on(terminal)](const RecordingMeter& meter, auto now) {
+      if (!before && meter.frames() > 0) before = counted(camera, 1);
+      progress(meter, now);
+    });
+    const LostPictures lost = before ? counted(camera).since(*before) : LostPictures();
     const Clock::time_point ended = Clock::now();
     terminal.progress("closing the session");
     camera.driver->StopVideoStreaming();
     std::optional<Problem> problem = recorder.problem();
     if (const auto at_close = file->close(); at_close && !problem) problem = at_close;
     const ExitCode written = summarise({to_string(camera.address), identity->system.modelName, file->path(),
-                                        identity->video.codecName, end, recorder.meter(), ended},
+                                        identity->video.codecName, end, recorder.meter(), lost, ended},
                                        terminal);
     if (problem) return terminal.report(*problem);
+    if (lost.any()) terminal.say("vexactl: " + lost.text());
     const ExitCode code = judge(end, terminal);
+    if (code == ExitCode::kOk && written == ExitCode::kOk && options_.strict && lost.any())
+      return ExitCode::kIncomplete;
     return code == ExitCode::kOk ? written : code;
   }
 

@@ -8,6 +8,7 @@
 #include "host/base/printable.h"
 #include "host/camera/camera_options.h"
 #include "host/camera/live_pictures.h"
+#include "host/camera/one_session.h"
 #include "host/camera/video_options.h"
 #include "host/commands/command.h"
 #include "host/console/terminal.h"
@@ -29,6 +30,7 @@ class SnapshotCommand final : public Command {
     command->add_option("--format", format_, "jpg or png, whatever --out ends in; jpg for standard output")
         ->type_name("WORD")
         ->check(CLI::IsMember({"jpg", "png"}));
+    command->add_flag("--forever", forever_, "wait for a camera that is not there, however long");
     add_video_options(*command, video_);
     command->footer(
         "A .jpg of a JPEG stream is the picture as the camera sent it. Everything else is decoded first, for which\n"
@@ -42,6 +44,7 @@ class SnapshotCommand final : public Command {
     if (const auto problem = check_video_options(video_)) return terminal.report(*problem);
     if (const auto problem = target(terminal).check()) return terminal.report(*problem);
     camera_.transport = transport_of(video_);
+    if (forever_) return take_by_session(*format, terminal);
     Result<OpenCamera> opened = open_camera(camera_, terminal);
     if (!opened) return terminal.report(opened.error());
     return take(*opened, *format, terminal);
@@ -72,29 +75,52 @@ class SnapshotCommand final : public Command {
     const Result<FrameBytes> bytes = newest_picture(*camera.driver, format);
     if (!bytes) return terminal.report(bytes.error());
     if (const auto problem = write_whole_file(target(terminal), *bytes)) return terminal.report(*problem);
-    return summarise(camera, *identity, bytes->size(), terminal);
+    return summarise(to_string(camera.address), identity->system.modelName, codec, bytes->size(), terminal);
   }
 
   // As the bytes of a file.
   static Result<FrameBytes> newest_picture(LiveCamera& camera, PictureFormat format) {
     LivePictures pictures(camera);
     if (auto problem = await_key_frame(camera, pictures)) return fail(*std::move(problem));
-    const PictureGroup group = pictures.newest();
+    return as_file(pictures.newest(), format);
+  }
+
+  static Result<FrameBytes> as_file(const PictureGroup& group, PictureFormat format) {
     if (format == PictureFormat::kJpeg) return jpeg_of(group.codec, group.frames);
     const Result<Picture> decoded = decode_picture(group.codec, group.frames);
     if (!decoded) return fail(decoded.error());
     return encode_picture(*decoded, format);
   }
 
-  ExitCode summarise(const OpenCamera& camera, const LiveCamera::Identity& identity, std::size_t size,
+  // The first key picture that comes.
+  ExitCode take_by_session(PictureFormat format, Terminal& terminal) {
+    const Result<SessionOptions> session = session_of(camera_, std::nullopt, video_.stream, kVideoStream);
+    if (!session) return terminal.report(session.error());
+    PictureGroup group;
+    SessionWork work;
+    work.callbacks.frame = [&group](Session&, const SessionFrame& frame) {
+      const std::optional<Codec> codec = codec_of_frame(frame.frameType);
+      if (!group.frames.empty() || !frame.isKey || !codec) return;
+      group = {*codec, {FrameBytes(frame.data, frame.data + frame.length)}};
+    };
+    work.is_done = [&group] { return !group.frames.empty(); };
+    const std::optional<Problem> ended = work_by_session(*session, work, terminal);
+    if (ended && ended->code == ExitCode::kInterrupted) return ended->code;
+    if (ended) return terminal.report(*ended);
+    const Result<FrameBytes> bytes = as_file(group, format);
+    if (!bytes) return terminal.report(bytes.error());
+    if (const auto problem = write_whole_file(target(terminal), *bytes)) return terminal.report(*problem);
+    return summarise(session->name, "", name_of(group.codec), bytes->size(), terminal);
+  }
+
+  ExitCode summarise(const std::string& camera, const std::string& model, const std::string& codec, std::size_t size,
                      Terminal& terminal) const {
-    const std::string codec = printable(identity.video.codecName);
-    std::string text = fmt::format("{}: {} bytes, from {} video\n", out_, size, codec);
+    std::string text = fmt::format("{}: {} bytes, from {} video\n", out_, size, printable(codec));
     if (camera_.json) {
-      text = to_text({{"camera", to_string(camera.address)},
-                      {"modelName", identity.system.modelName},
+      text = to_text({{"camera", camera},
+                      {"modelName", model.empty() ? nlohmann::ordered_json(nullptr) : nlohmann::ordered_json(model)},
                       {"file", out_},
-                      {"codec", identity.video.codecName},
+                      {"codec", codec},
                       {"bytes", size}});
     }
     if (!to_standard_output()) return write_result(terminal, text);
@@ -107,6 +133,7 @@ class SnapshotCommand final : public Command {
   VideoOptions video_;
   std::string out_;
   std::string format_;
+  bool forever_ = false;
 };
 
 }  // namespace

@@ -17,7 +17,8 @@
 // Which call is allowed in which callback, of the same session or of another of the same group:
 //
 //     call                              in any callback
-//     Session::Status, Name             returns at once
+//     Session::Status, Name,            returns at once
+//       Statistics
 //     Session::Stop, Retry,             return at once; take effect when the callback has returned. After a Stop from
 //       SetCredentials                  within its callback a session makes one call more: the state kStopped
 //     Session::WaitStopped              returns false at once, where waiting would never end
@@ -52,6 +53,7 @@
 #include "vexa/io_info.h"
 #include "vexa/return_codes.h"
 #include "vexa/session_status.h"
+#include "vexa/statistics.h"
 #include "vexa/system_info.h"
 #include "vexa/waiting.h"
 
@@ -133,6 +135,10 @@ class VEXA_API Session {
   /// beside its video that is lost meanwhile is started again with the next connection. When memory is short the former
   /// ones stay.
   void SetCredentials(const std::string& userName, const std::string& password);
+  /// What became of each packet and frame, as GetStreamStatistics has it of a driver. The totals go on through outages;
+  /// they begin anew with a camera that has become one of another model. `statistics.size` is to be set as its
+  /// constructor does. False, with `statistics` as it was, before the first attempt has made a driver.
+  bool Statistics(StreamStatistics& statistics) const;
   /// As in the options, or the camera's address.
   const std::string& Name() const;
 
@@ -152,8 +158,10 @@ struct SessionMetrics {
   std::uint64_t longestCallback = 0;  ///< microseconds
   std::uint64_t attempts = 0;         ///< to connect
   std::uint64_t mostAttemptsAtOnce = 0;
-  std::uint64_t eventsMissed = 0;  ///< states that a later one replaced before the host was called
-  std::uint64_t exceptions = 0;    ///< that left a host's callback
+  std::uint64_t eventsMissed = 0;     ///< states that a later one replaced before the host was called
+  std::uint64_t exceptions = 0;       ///< that left a host's callback
+  std::uint64_t mostTurnsWaited = 0;  ///< sessions that waited at the same time for others to have connected
+  std::uint64_t mostJobsQueued = 0;   ///< openings and closings that were queued at the same time
 };
 
 /// How a group works.

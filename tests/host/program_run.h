@@ -56,6 +56,8 @@ class ProgramRun {
       posix_spawn_file_actions_adddup2(&actions, open_terminal(), STDERR_FILENO);
     }
     posix_spawn_file_actions_addchdir_np(&actions, folder.path().c_str());
+    // A camera of this process that is pulled out must not live on in the program's copies of its sockets.
+    posix_spawn_file_actions_addclosefrom_np(&actions, STDERR_FILENO + 1);
     spawn(actions, pointers_to(arguments), pointers_to(environment));
     posix_spawn_file_actions_destroy(&actions);
   }

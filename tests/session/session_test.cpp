@@ -66,6 +66,29 @@ TEST_F(SessionWithCamera, IsLiveAgainWhenTheCameraIsPulledOutAndPutBack) {
   EXPECT_FALSE(host.overlapped());
 }
 
+TEST_F(SessionWithCamera, StatisticsGoOnThroughAnOutage) {
+  start_camera();
+  SessionHost host;
+  SessionGroup group;
+  const auto session = group.Open(options(), host.callbacks());
+  ASSERT_TRUE(host.wait_for_frames(5));
+  StreamStatistics before;
+  ASSERT_TRUE(session->Statistics(before));
+  EXPECT_GE(before.framesHandedOut, 5U);
+  camera().unplug();
+  ASSERT_TRUE(
+      host.wait_for([](const auto& states, const auto&) { return states.back().state == SessionState::kWaiting; }));
+  const std::size_t frames = host.frames().size();
+  camera().plug();
+  session->Retry();
+  ASSERT_TRUE(host.wait_for_frames(frames + 2));
+  StreamStatistics after;
+  ASSERT_TRUE(session->Statistics(after));
+  EXPECT_GE(after.framesHandedOut, frames + 2);
+  EXPECT_EQ(after.since, before.since);
+  EXPECT_EQ(group.Metrics().mostTurnsWaited, 0U);
+}
+
 TEST_F(SessionWithCamera, TheStateAskedForIsTheLastEvent) {
   start_camera();
   SessionHost host;
