@@ -74,7 +74,11 @@ class TreeBuilder {
     if (value > static_cast<number_unsigned_t>(std::numeric_limits<std::int64_t>::max())) return refuse("too large");
     return number_integer(static_cast<std::int64_t>(value));
   }
-  bool number_float(number_float_t, const string_t&) { return put(node_of(Node::Kind::kFraction)); }
+  bool number_float(number_float_t, const string_t& text) {
+    Node node = node_of(Node::Kind::kFraction);
+    node.text = text;
+    return put(std::move(node));
+  }
   bool string(string_t& value) {
     Node node = node_of(Node::Kind::kString);
     node.text = value;

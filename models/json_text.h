@@ -20,7 +20,7 @@ struct Node {
   int line = 0;  ///< counted from 1; of a member its key's, else where the value ends (a list or object: begins)
   bool flag = false;
   std::int64_t number = 0;
-  std::string text = {};
+  std::string text = {};         ///< of a string; of a fraction, as it is written
   std::vector<Node> items = {};  ///< of an array
   std::vector<Member> members;   ///< of an object, each key once
 

@@ -7,6 +7,8 @@
 #include <asio/ip/address_v4.hpp>
 #include <cstdint>
 #include <limits>
+#include <map>
+#include <utility>
 
 #include "virtual_camera/codec/rtp_packetiser.h"
 #include "virtual_camera/server/event_loop.h"
@@ -20,17 +22,33 @@ std::string address_after(const std::string& address, std::size_t steps) {
   return asio::ip::address_v4(start.to_uint() + static_cast<std::uint32_t>(steps)).to_string();
 }
 
-CameraHost::CameraHost(const CameraOptions& options, std::size_t cameras, std::size_t threads) {
-  const std::size_t loops = std::clamp<std::size_t>(threads, 1, std::max<std::size_t>(cameras, 1));
-  for (std::size_t i = 0; i < loops; ++i) loops_.push_back(std::make_shared<EventLoop>());
-  CameraOptions shared = options;
-  if (!shared.clip && !shared.clip_path.empty()) {
-    shared.clip = PacketisedClip::load(shared.clip_path, shared.max_payload, shared.user_data);
-  }
+namespace {
+
+std::vector<CameraOptions> consecutive(const CameraOptions& first, std::size_t cameras) {
+  std::vector<CameraOptions> all(cameras, first);
   for (std::size_t i = 0; i < cameras; ++i) {
-    CameraOptions own = shared;
-    own.address = address_after(options.address, i);
-    own.seed = options.seed + i;
+    all[i].address = address_after(first.address, i);
+    all[i].seed = first.seed + i;
+  }
+  return all;
+}
+
+}  // namespace
+
+CameraHost::CameraHost(const CameraOptions& options, std::size_t cameras, std::size_t threads)
+    : CameraHost(consecutive(options, cameras), threads) {}
+
+CameraHost::CameraHost(std::vector<CameraOptions> cameras, std::size_t threads) {
+  const std::size_t loops = std::clamp<std::size_t>(threads, 1, std::max<std::size_t>(cameras.size(), 1));
+  for (std::size_t i = 0; i < loops; ++i) loops_.push_back(std::make_shared<EventLoop>());
+  std::map<std::string, std::shared_ptr<const PacketisedClip>> clips;
+  for (std::size_t i = 0; i < cameras.size(); ++i) {
+    CameraOptions& own = cameras[i];
+    if (!own.clip && !own.clip_path.empty()) {
+      std::shared_ptr<const PacketisedClip>& clip = clips[own.clip_path];
+      if (!clip) clip = PacketisedClip::load(own.clip_path, own.max_payload, own.user_data);
+      own.clip = clip;
+    }
     SettingsStore& settings =
         cameras_.emplace_back(std::make_unique<VirtualCamera>(own, loops_[i % loops]))->settings();
     settings.set("system", "Serial", fmt::format("{}", 100001 + i));

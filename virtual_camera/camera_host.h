@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Many cameras in one process, at consecutive addresses.
+// Many cameras in one process.
 #ifndef VIRTUAL_CAMERA_CAMERA_HOST_H_
 #define VIRTUAL_CAMERA_CAMERA_HOST_H_
 
@@ -20,6 +20,8 @@ namespace vexa::camera {
 class CameraHost {
  public:
   CameraHost(const CameraOptions& options, std::size_t cameras, std::size_t threads = 1);
+  // Cameras that each have options of their own, address and seed included.
+  explicit CameraHost(std::vector<CameraOptions> cameras, std::size_t threads = 1);
   ~CameraHost();
   CameraHost(const CameraHost&) = delete;
   CameraHost& operator=(const CameraHost&) = delete;

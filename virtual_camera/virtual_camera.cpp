@@ -69,7 +69,25 @@ SentLog& VirtualCamera::sent() { return core_->state()->sent; }
 
 const PacketisedClip* VirtualCamera::clip() const { return core_->state()->options.clip.get(); }
 
-void VirtualCamera::add_request_fault(RequestFault fault) { core_->state()->request_faults.add(std::move(fault)); }
+std::string_view VirtualCamera::control(std::string_view path, std::string_view query) {
+  return loop_->run([&] { return core_->control().obey(path, query); });
+}
+
+bool VirtualCamera::plugged() const {
+  return loop_->run([this] { return core_->plugged(); });
+}
+
+std::size_t VirtualCamera::viewers() const {
+  return loop_->run([this] { return core_->state()->viewers(); });
+}
+
+PacketFaults VirtualCamera::packet_faults() const { return core_->state()->packet_faults.get(); }
+
+std::size_t VirtualCamera::request_faults() const { return core_->state()->request_faults.size(); }
+
+void VirtualCamera::add_request_fault(RequestFault fault) {
+  (void)core_->state()->request_faults.add(std::move(fault));
+}
 
 void VirtualCamera::clear_request_faults() { core_->state()->request_faults.clear(); }
 

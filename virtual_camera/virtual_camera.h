@@ -10,6 +10,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <string_view>
 
 #include "virtual_camera/card/card.h"
 #include "virtual_camera/model/settings_store.h"
@@ -61,6 +62,13 @@ class VirtualCamera {
   [[nodiscard]] Journal& journal();
   [[nodiscard]] SentLog& sent();
   [[nodiscard]] const PacketisedClip* clip() const;  // the clip streamed; valid after start(), null when none
+
+  // What a path of the control port makes happen, such as "/lens/cover"; the status of the answer (204, 400, 404).
+  [[nodiscard]] std::string_view control(std::string_view path, std::string_view query = {});
+  [[nodiscard]] bool plugged() const;
+  [[nodiscard]] std::size_t viewers() const;  // open RTSP sessions, and picture streams over HTTP
+  [[nodiscard]] PacketFaults packet_faults() const;
+  [[nodiscard]] std::size_t request_faults() const;  // how many are set
 
   void add_request_fault(RequestFault fault);
   void clear_request_faults();

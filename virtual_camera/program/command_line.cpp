@@ -27,6 +27,20 @@ void add_place(CLI::App& app, ProgramOptions& options) {
   app.add_option("--count", options.count, "cameras, at consecutive addresses")
       ->check(CLI::Range(1, 1000))
       ->capture_default_str();
+  CLI::Option* fleet =
+      app.add_option(
+             "--fleet", options.fleet,
+             "cameras with names of their own: as this file states, or so many of the installed profiles in turn")
+          ->type_name("FILE|N")
+          ->excludes("--count");
+  app.add_option("--cameras-file", options.cameras_file,
+                 "write the file of cameras that vexactl takes, and files of credentials beside it")
+      ->type_name("FILE")
+      ->needs(fleet);
+  app.add_option("--max-viewers", camera.max_viewers,
+                 "RTSP sessions and picture streams over HTTP that a camera serves at once; more are refused")
+      ->check(CLI::Range(1, 256))
+      ->capture_default_str();
   app.add_option("--threads", options.threads, "threads that serve them")
       ->check(CLI::Range(1, 64))
       ->capture_default_str();
@@ -38,8 +52,9 @@ void add_place(CLI::App& app, ProgramOptions& options) {
            camera.control = true;
            camera.control_port = port;
          },
-         "port on 127.0.0.1 that makes things happen around the camera: GET /contact/1/close, /lens/cover, /noise/on, "
-         "/motion/1/50, /walk, /network/unplug, /network/plug")
+         "port on 127.0.0.1 that makes things happen around the camera, or in the whole fleet; / lists what: /walk, "
+         "/lens/cover, /reboot, /network/unplug, /faults/packets?loss=0.01 ...; with --fleet after /camera/NAME, and a "
+         "page for browsers")
       ->option_text("PORT");
   app.add_option_function<std::uint64_t>(
          "--card", [&camera](std::uint64_t megabytes) { camera.card_bytes = megabytes << 20U; },
@@ -65,8 +80,8 @@ void add_credentials(CLI::App& app, CameraOptions& camera) {
 
 void add_stream(CLI::App& app, CameraOptions& camera) {
   app.add_option("--profile", camera.profile_path,
-                 "profile of the camera model; without --clip it streams as its settings define")
-      ->check(CLI::ExistingFile);
+                 "profile of the camera model, a file or an installed one's name; without --clip it streams as its "
+                 "settings define");
   camera.pictures_made = PicturesMade::kOfTheScene;
   app.add_flag_callback(
       "--drawn", [&camera] { camera.pictures_made = PicturesMade::kDrawn; },

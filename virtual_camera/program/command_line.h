@@ -16,6 +16,8 @@ struct ProgramOptions {
   CameraOptions camera;
   std::size_t count = 1;
   std::size_t threads = 1;
+  std::string fleet;         // a file or a number of cameras; empty: `count` cameras without names
+  std::string cameras_file;  // written for vexactl
   std::string journal_path;
   double duration = 0;  // seconds; 0: until a signal
 };

@@ -1,11 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "virtual_camera/program/fault_arguments.h"
 
+#include <fmt/format.h>
+
 #include <chrono>
 #include <cstdint>
 #include <optional>
 #include <string_view>
 
+#include "virtual_camera/values/fault_words.h"
 #include "virtual_camera/values/number_text.h"
 
 namespace vexa::camera {
@@ -41,29 +44,8 @@ Restart restart_of(std::string_view text) {
   return restart;
 }
 
-// Moves the "#N" after a match into the fault's occurrence.
-RequestFault counted(RequestFault fault) {
-  const std::size_t mark = fault.match.rfind('#');
-  if (mark == std::string::npos) return fault;
-  fault.occurrence = number_of<std::uint32_t>(std::string_view(fault.match).substr(mark + 1));
-  fault.match.resize(mark);
-  return fault;
-}
-
-// "\r", "\n" and "\\" as one writes them in a shell.
-std::string unescaped(std::string_view text) {
-  std::string bytes;
-  for (std::size_t i = 0; i < text.size(); ++i) {
-    const bool escape = text[i] == '\\' && i + 1 < text.size();
-    if (!escape) {
-      bytes += text[i];
-      continue;
-    }
-    const char letter = text[++i];
-    bytes += letter == 'r' ? '\r' : letter == 'n' ? '\n' : letter;
-  }
-  return bytes;
-}
+// The fault's word of an option's name.
+std::string word_of(std::string_view option) { return std::string(option.substr(2)); }
 
 }  // namespace
 
@@ -106,22 +88,24 @@ void FaultArguments::add_packet_faults(CLI::App& app, PacketFaults& faults) {
 }
 
 void FaultArguments::add_request_faults(CLI::App& app) {
-  const auto plain = [&app](const char* name, std::vector<std::string>& matches, const char* help) {
+  const auto plain = [this, &app](const char* name, const char* help) {
+    std::vector<std::string>& matches = plain_.emplace_back(word_of(name), std::vector<std::string>()).second;
     app.add_option(name, matches, help)->type_name("MATCH")->allow_extra_args(false)->group(kRequestGroup);
   };
-  const auto valued = [&app](const char* name, Pairs& pairs, const char* help) {
+  const auto valued = [this, &app](const char* name, const char* help) {
+    Pairs& pairs = valued_.emplace_back(word_of(name), Pairs()).second;
     app.add_option(name, pairs, help)->type_name("")->allow_extra_args(false)->group(kRequestGroup);
   };
-  plain("--no-answer", no_answer_, "never answer");
-  plain("--reset", reset_, "reset the connection");
-  plain("--wrong-credentials", wrong_credentials_, "refuse the credentials");
-  valued("--slow-answer", slow_, "MATCH MS: answer after this time");
-  valued("--byte-at-a-time", byte_at_a_time_, "MATCH MS: this time between single bytes");
-  valued("--cut-answer", cut_, "MATCH BYTES: close after this many bytes");
-  valued("--stall-answer", stall_, "MATCH BYTES: fall silent after this many bytes");
-  valued("--status", status_, "MATCH STATUS: answer this, such as \"503 Service Unavailable\"");
-  valued("--raw-answer", raw_, "MATCH TEXT: answer this text (\\r and \\n are known)");
-  valued("--reboot", reboot_, "MATCH MS: vanish without an answer, come back after this time");
+  plain("--no-answer", "never answer");
+  plain("--reset", "reset the connection");
+  plain("--wrong-credentials", "refuse the credentials");
+  valued("--slow-answer", "MATCH MS: answer after this time");
+  valued("--byte-at-a-time", "MATCH MS: this time between single bytes");
+  valued("--cut-answer", "MATCH BYTES: close after this many bytes");
+  valued("--stall-answer", "MATCH BYTES: fall silent after this many bytes");
+  valued("--status", "MATCH STATUS: answer this, such as \"503 Service Unavailable\"");
+  valued("--raw-answer", "MATCH TEXT: answer this text (\\r and \\n are known)");
+  valued("--reboot", "MATCH MS: vanish without an answer, come back after this time");
 }
 
 void FaultArguments::add_stream_faults(CLI::App& app) {
@@ -167,17 +151,18 @@ void FaultArguments::apply(CameraOptions& options) const {
   for (const std::string& text : timestamp_restarts_) {
     options.packet_faults.timestamp_restarts.push_back(restart_of<TimestampRestart>(text));
   }
-  const auto add = [&options](RequestFault fault) { options.request_faults.push_back(counted(std::move(fault))); };
-  for (const std::string& match : no_answer_) add(RequestFault::no_answer(match));
-  for (const std::string& match : reset_) add(RequestFault::reset(match));
-  for (const std::string& match : wrong_credentials_) add(RequestFault::wrong_credentials(match));
-  for (const auto& [match, ms] : slow_) add(RequestFault::slow(match, milliseconds_of(ms)));
-  for (const auto& [match, ms] : byte_at_a_time_) add(RequestFault::byte_at_a_time(match, milliseconds_of(ms)));
-  for (const auto& [match, bytes] : cut_) add(RequestFault::cut_after(match, number_of<std::uint32_t>(bytes)));
-  for (const auto& [match, bytes] : stall_) add(RequestFault::stall_after(match, number_of<std::uint32_t>(bytes)));
-  for (const auto& [match, status] : status_) add(RequestFault::status(match, status));
-  for (const auto& [match, text] : raw_) add(RequestFault::raw(match, unescaped(text)));
-  for (const auto& [match, ms] : reboot_) add(RequestFault::reboot(match, milliseconds_of(ms)));
+  const auto add = [&options](const std::string& word, std::string_view match, std::string_view value) {
+    std::optional<RequestFault> fault = request_fault(word, match, value);
+    if (!fault)
+      throw CLI::ValidationError("--" + word, fmt::format("cannot be used as it stands: {} {}", match, value));
+    options.request_faults.push_back(std::move(*fault));
+  };
+  for (const auto& [word, matches] : plain_) {
+    for (const std::string& match : matches) add(word, match, {});
+  }
+  for (const auto& [word, pairs] : valued_) {
+    for (const auto& [match, value] : pairs) add(word, match, value);
+  }
 }
 
 }  // namespace vexa::camera

@@ -4,6 +4,7 @@
 #define VIRTUAL_CAMERA_PROGRAM_FAULT_ARGUMENTS_H_
 
 #include <CLI/CLI.hpp>
+#include <list>
 #include <string>
 #include <utility>
 #include <vector>
@@ -28,8 +29,9 @@ class FaultArguments {
   void apply_stream_faults(CameraOptions& options) const;
 
   std::vector<std::string> sequence_restarts_, timestamp_restarts_;
-  std::vector<std::string> no_answer_, reset_, wrong_credentials_;
-  Pairs slow_, byte_at_a_time_, cut_, stall_, status_, raw_, reboot_;
+  // By the fault's word, in the order in which requests meet them; CLI11 keeps their addresses.
+  std::list<std::pair<std::string, std::vector<std::string>>> plain_;
+  std::list<std::pair<std::string, Pairs>> valued_;
   std::vector<std::string> no_part_length_;
   Pairs part_length_, before_picture_, cut_picture_, close_stream_, silence_, pause_, other_clip_;
 };

@@ -8,10 +8,17 @@
 #include <cstdio>
 #include <exception>
 #include <optional>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <variant>
+#include <vector>
 
 #include "virtual_camera/camera_host.h"
+#include "virtual_camera/fleet/fleet.h"
 #include "virtual_camera/program/command_line.h"
 #include "virtual_camera/program/journal_file.h"
+#include "virtual_camera/values/number_text.h"
 
 namespace vexa::camera {
 namespace {
@@ -48,25 +55,67 @@ void print_ready(CameraHost& host) {
   (void)std::fflush(stdout);
 }
 
+void print_fleet(Fleet& fleet) {
+  for (std::size_t i = 0; i < fleet.size(); ++i) {
+    const VirtualCamera& camera = fleet.camera(i);
+    fmt::print("{0} http://{1}:{2} rtsp://{1}:{3}/media/video1\n", fleet.entry(i).name, camera.address(),
+               camera.http_port(), camera.rtsp_port());
+  }
+  if (fleet.control_port() != 0) fmt::print("control http://127.0.0.1:{}/\n", fleet.control_port());
+  (void)std::fflush(stdout);
+}
+
+FleetResult read_fleet(const ProgramOptions& options) {
+  CameraOptions common = options.camera;
+  common.control = false;  // the port is the whole fleet's
+  const auto cameras = whole_number<std::size_t>(options.fleet);
+  if (!cameras) return load_fleet(options.fleet, common);
+  if (*cameras < 1 || *cameras > kMostCameras) return fmt::format("a fleet has 1 to {} cameras", kMostCameras);
+  return make_fleet(*cameras, common);
+}
+
+int fail(std::string_view text) {
+  fmt::print(stderr, "vexa-camera: {}\n", text);
+  return kFailed;
+}
+
+// The journal of the cameras of a host or a fleet, where one is asked for.
+template <typename Cameras>
+void keep_journal(Cameras& cameras, JournalFile& journal) {
+  for (std::size_t i = 0; i < cameras.size(); ++i) {
+    VirtualCamera& camera = cameras.camera(i);
+    camera.journal().observe([&](const Request& request) { journal.add(camera.address(), request); });
+  }
+}
+
+int run_fleet(const ProgramOptions& options, std::optional<JournalFile>& journal) {
+  FleetResult read = read_fleet(options);
+  if (const auto* error = std::get_if<std::string>(&read)) return fail(*error);
+  Ending ending;
+  Fleet fleet(std::get<std::vector<FleetCamera>>(std::move(read)), options.threads);
+  if (journal) keep_journal(fleet, *journal);
+  const bool control = options.camera.control;
+  if (!fleet.start(control ? std::optional(options.camera.control_port) : std::nullopt)) return fail(fleet.error());
+  if (!options.cameras_file.empty()) {
+    const std::string failure = fleet.write_cameras_file(options.cameras_file);
+    if (!failure.empty()) return fail(failure);
+  }
+  print_fleet(fleet);
+  ending.wait(options.duration);
+  return 0;
+}
+
 int run(const ProgramOptions& options) {
   std::optional<JournalFile> journal;
   if (!options.journal_path.empty()) {
     journal.emplace(options.journal_path);
-    if (!journal->good()) {
-      fmt::print(stderr, "vexa-camera: cannot write {}\n", options.journal_path);
-      return kFailed;
-    }
+    if (!journal->good()) return fail(fmt::format("cannot write {}", options.journal_path));
   }
+  if (!options.fleet.empty()) return run_fleet(options, journal);
   Ending ending;
   CameraHost host(options.camera, options.count, options.threads);
-  for (std::size_t i = 0; journal && i < host.size(); ++i) {
-    VirtualCamera& camera = host.camera(i);
-    camera.journal().observe([&](const Request& request) { journal->add(camera.address(), request); });
-  }
-  if (!host.start()) {
-    fmt::print(stderr, "vexa-camera: {}\n", host.error());
-    return kFailed;
-  }
+  if (journal) keep_journal(host, *journal);
+  if (!host.start()) return fail(host.error());
   print_ready(host);
   ending.wait(options.duration);
   return 0;

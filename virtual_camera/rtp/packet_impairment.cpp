@@ -8,6 +8,11 @@ namespace vexa::camera {
 PacketImpairment::PacketImpairment(PacketFaults faults, std::uint64_t seed)
     : faults_(std::move(faults)), random_(seed) {}
 
+void PacketImpairment::change(PacketFaults faults) {
+  faults_ = std::move(faults);
+  burst_left_ = 0;
+}
+
 // Written out, because the standard distributions may draw differently from one word size to another.
 bool PacketImpairment::hit(double probability) {
   if (probability <= 0) return false;

@@ -24,6 +24,9 @@ class PacketImpairment {
 
   PacketImpairment(PacketFaults faults, std::uint64_t seed);
 
+  // Faults of the packets that come from now on; those held back or delayed stay so.
+  void change(PacketFaults faults);
+
   // Takes the next packet of the stream and appends whatever leaves now, in order; lost packets too, marked so.
   void offer(Outgoing packet, Time now, std::vector<Outgoing>& leaving);
   // Appends the delayed packets whose time has come.
@@ -46,7 +49,7 @@ class PacketImpairment {
   void duplicate(const Outgoing& packet, std::vector<Outgoing>& leaving);
   void count_down(std::size_t held_before, std::vector<Outgoing>& leaving);
 
-  const PacketFaults faults_;
+  PacketFaults faults_;
   std::mt19937_64 random_;
   std::size_t burst_left_ = 0;
   std::vector<Held> held_;

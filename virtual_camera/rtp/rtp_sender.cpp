@@ -38,6 +38,10 @@ void RtpSender::play(Play play) {
   wait_for_next();
 }
 
+void RtpSender::change_faults(PacketFaults faults) {
+  if (impairment_) impairment_->change(std::move(faults));
+}
+
 void RtpSender::stop() {
   stopped_ = true;
   timer_.cancel();

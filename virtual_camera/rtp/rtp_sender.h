@@ -44,6 +44,8 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
   [[nodiscard]] bool may_play() const { return !stream_ && !stopped_; }
   // Starts with the first picture. Has no effect unless may_play().
   void play(Play play);
+  // Faults of the packets to come, where a stream plays. Restarts of numbers stay those it began with.
+  void change_faults(PacketFaults faults);
   void stop();
 
  private:

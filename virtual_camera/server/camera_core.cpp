@@ -67,7 +67,9 @@ CameraCore::CameraCore(std::shared_ptr<CameraState> state)
     : state_(std::move(state)),
       http_(listener_of<HttpConnection>(state_)),
       rtsp_(listener_of<RtspConnection>(state_)),
-      control_(std::make_shared<AlarmControl>(state_)),
+      control_(std::make_shared<CameraControl>(state_)),
+      control_port_(std::make_shared<ControlPort>(
+          state_->context, [control = control_](const RequestHead& request) { return control->answer(request); })),
       recorder_(std::make_shared<CardRecorder>(state_)),
       back_(state_->context) {}
 
@@ -105,7 +107,7 @@ std::string CameraCore::start() {
   if (failure.empty()) failure = open_ports();
   if (!failure.empty()) return failure;
   if (state_->options.control) {
-    if (const asio::error_code error = control_->open(state_->options.control_port)) {
+    if (const asio::error_code error = control_port_->open(state_->options.control_port)) {
       vanish();
       return bind_failure("127.0.0.1", state_->options.control_port, error);
     }
@@ -167,7 +169,8 @@ void CameraCore::stop() {
   recorder_->stop();
   back_.cancel();
   state_->alarms.listen(nullptr);
-  control_->close();
+  control_port_->close();
+  control_->stop();
   vanish();
 }
 

@@ -10,9 +10,10 @@
 #include <memory>
 #include <string>
 
-#include "virtual_camera/server/alarm_control.h"
+#include "virtual_camera/server/camera_control.h"
 #include "virtual_camera/server/camera_state.h"
 #include "virtual_camera/server/card_recorder.h"
+#include "virtual_camera/server/control_port.h"
 #include "virtual_camera/server/listener.h"
 
 namespace vexa::camera {
@@ -33,7 +34,9 @@ class CameraCore : public std::enable_shared_from_this<CameraCore> {
   [[nodiscard]] const std::shared_ptr<CameraState>& state() const { return state_; }
   [[nodiscard]] std::uint16_t http_port() const { return http_->port(); }
   [[nodiscard]] std::uint16_t rtsp_port() const { return rtsp_->port(); }
-  [[nodiscard]] std::uint16_t control_port() const { return control_->port(); }
+  [[nodiscard]] std::uint16_t control_port() const { return control_port_->port(); }
+  [[nodiscard]] CameraControl& control() { return *control_; }
+  [[nodiscard]] bool plugged() const { return plugged_; }
 
  private:
   class AlarmParts;
@@ -50,7 +53,8 @@ class CameraCore : public std::enable_shared_from_this<CameraCore> {
   std::shared_ptr<CameraState> state_;
   std::shared_ptr<Listener> http_;
   std::shared_ptr<Listener> rtsp_;
-  std::shared_ptr<AlarmControl> control_;
+  std::shared_ptr<CameraControl> control_;
+  std::shared_ptr<ControlPort> control_port_;
   std::shared_ptr<CardRecorder> recorder_;
   asio::steady_timer back_;
   bool running_ = false;

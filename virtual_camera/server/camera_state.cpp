@@ -59,4 +59,9 @@ CameraState::CameraState(CameraOptions camera_options, asio::io_context& loop_co
 
 CameraState::~CameraState() = default;
 
+std::size_t CameraState::viewers() {
+  std::erase_if(picture_streams, [](const std::weak_ptr<HttpBody>& stream) { return stream.expired(); });
+  return sessions.size() + picture_streams.size();
+}
+
 }  // namespace vexa::camera

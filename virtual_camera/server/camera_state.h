@@ -4,6 +4,7 @@
 #define VIRTUAL_CAMERA_SERVER_CAMERA_STATE_H_
 
 #include <chrono>
+#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <map>
@@ -32,6 +33,7 @@ class io_context;
 namespace vexa::camera {
 
 class Connection;
+class HttpBody;
 class RtspSession;
 
 // What connections and the control port may ask of the camera. All are empty while it is stopped.
@@ -48,6 +50,9 @@ struct CameraState {
   ~CameraState();
   CameraState(const CameraState&) = delete;
   CameraState& operator=(const CameraState&) = delete;
+
+  // Hosts that watch: RTSP sessions, and picture streams over HTTP.
+  [[nodiscard]] std::size_t viewers();
 
   CameraOptions options;      // unchanged once the camera runs
   std::string profile_error;  // why the options' profile could not be loaded; empty: it was, or there is none
@@ -70,6 +75,7 @@ struct CameraState {
 
   std::vector<std::weak_ptr<Connection>> connections;
   std::map<std::uint32_t, std::shared_ptr<RtspSession>> sessions;
+  std::vector<std::weak_ptr<HttpBody>> picture_streams;
   std::uint32_t next_session;
   std::uint64_t plays = 0;  // streams begun
   CameraRequests requests;

@@ -20,6 +20,8 @@ namespace {
 using State = std::shared_ptr<CameraState>;
 using Body = std::shared_ptr<HttpBody>;
 
+constexpr std::string_view kImages = "/image";
+
 std::shared_ptr<AlarmFeed> open_feed(const RequestHead& head, const State& state, AlarmFeed::Changes changes,
                                      std::function<std::string()> present) {
   const std::chrono::duration<double> interval = feed_interval(head.query);
@@ -41,9 +43,12 @@ Body open_sound(const RequestHead&, const State& state) { return open_sound_stre
 
 // "/imageN"; null for a path whose end is no number.
 Body open_images(const RequestHead& head, const State& state) {
-  const std::string_view digits = std::string_view(head.path).substr(std::string_view("/image").size());
+  const std::string_view digits = std::string_view(head.path).substr(kImages.size());
   const std::optional<int> number = whole_number(digits);
-  return number && digits.front() != '-' ? open_image_stream(state, *number) : nullptr;
+  if (!number || digits.front() == '-') return nullptr;
+  Body stream = open_image_stream(state, *number);
+  if (stream) state->picture_streams.push_back(stream);
+  return stream;
 }
 
 enum class Match { kPath, kStem };
@@ -53,7 +58,7 @@ constexpr struct {
   Match match;
   std::string_view path;
   Body (*open)(const RequestHead& head, const State& state);
-} kStreams[] = {{Match::kStem, "/image", open_images},
+} kStreams[] = {{Match::kStem, kImages, open_images},
                 {Match::kPath, "/audio", open_sound},
                 {Match::kPath, "/command/alarmdata.cgi", open_alarms},
                 {Match::kPath, "/mddata.cgi", open_metadata}};
@@ -77,6 +82,8 @@ Answer HttpConnection::answer(const std::string& request) {
   if (!credentials_match(head->field("Authorization"), options.user, options.password)) {
     return http_answer("401 Unauthorized", "");
   }
+  const bool full = state().viewers() >= options.max_viewers;
+  if (full && head->path.starts_with(kImages)) return http_answer("503 Service Unavailable", "");
   body_ = open_body(*head, shared_state());
   return body_ ? Answer{200, body_->head()} : obey_command(*head, state());
 }

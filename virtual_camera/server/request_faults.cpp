@@ -6,9 +6,17 @@
 
 namespace vexa::camera {
 
-void RequestFaultList::add(RequestFault fault) {
+bool RequestFaultList::add(RequestFault fault) {
+  constexpr std::size_t kMostRules = 1000;
   const std::lock_guard<std::mutex> lock(mutex_);
+  if (rules_.size() >= kMostRules) return false;
   rules_.push_back({std::move(fault), 0});
+  return true;
+}
+
+std::size_t RequestFaultList::size() const {
+  const std::lock_guard<std::mutex> lock(mutex_);
+  return rules_.size();
 }
 
 void RequestFaultList::clear() {

@@ -4,6 +4,7 @@
 #define VIRTUAL_CAMERA_SERVER_REQUEST_FAULTS_H_
 
 #include <chrono>
+#include <cstddef>
 #include <cstdint>
 #include <mutex>
 #include <optional>
@@ -18,8 +19,10 @@ namespace vexa::camera {
 // Owned by the camera's state; thread-safe. Each rule counts its own matches; the first rule in force wins.
 class RequestFaultList {
  public:
-  void add(RequestFault fault);
+  // False when it holds as many rules as it can.
+  bool add(RequestFault fault);
   void clear();
+  [[nodiscard]] std::size_t size() const;
   [[nodiscard]] std::optional<RequestFault> take(std::string_view request);
 
  private:
@@ -27,7 +30,7 @@ class RequestFaultList {
     RequestFault fault;
     std::uint32_t matches = 0;
   };
-  std::mutex mutex_;
+  mutable std::mutex mutex_;
   std::vector<Rule> rules_;
 };
 

@@ -17,7 +17,6 @@
 namespace vexa::camera {
 namespace {
 
-constexpr std::size_t kMaxSessions = 256;
 constexpr std::string_view kMethods = "Public: OPTIONS, DESCRIBE, SETUP, PLAY, GET_PARAMETER, TEARDOWN\r\n";
 // Status line and fields of DESCRIBE's answer, with the longest CSeq and Content-Length.
 constexpr std::size_t kDescribeHead = 120;
@@ -131,7 +130,7 @@ Answer RtspConnection::setup(const RequestHead& request, std::uint32_t sequence)
   if (!found) return status_only("404 Not Found", sequence);
   const AskedTransport asked = asked_transport(request.field("Transport"));
   if (asked.kind == AskedTransport::Kind::kNone) return status_only("461 Unsupported Transport", sequence);
-  if (state().sessions.size() >= kMaxSessions) return status_only("453 Not Enough Bandwidth", sequence);
+  if (state().viewers() >= state().options.max_viewers) return status_only("453 Not Enough Bandwidth", sequence);
   MediaTransport media = asked.kind == AskedTransport::Kind::kUdp ? open_udp(asked) : open_interleaved(asked);
   if (!media.port) return status_only("500 Internal Server Error", sequence);
   const auto session = std::make_shared<RtspSession>(shared_state(), state().next_session++, video_number(request.path),

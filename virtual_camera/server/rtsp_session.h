@@ -31,6 +31,7 @@ class RtspSession : public std::enable_shared_from_this<RtspSession> {
   void load(std::unique_ptr<PictureSource> source) { source_ = std::move(source); }
   // Starts with the first picture, unless it plays already or the video stream has no picture as it is set.
   void play();
+  void change_faults(PacketFaults faults) { sender_->change_faults(std::move(faults)); }
   // A request named the session: its time starts over.
   void touch();
   // Stops sending for good. The session leaves the camera's table, if it is still there.

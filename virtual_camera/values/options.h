@@ -100,6 +100,7 @@ struct CameraOptions {
 
   std::string range_clock;  // for instance "20240131T235959.250Z": adds the range line to the session description
   std::uint32_t first_session = 12345678;    // numbers of later sessions count up from it
+  std::size_t max_viewers = 256;             // RTSP sessions and picture streams over HTTP at once; more are refused
   std::chrono::seconds session_timeout{60};  // as advertised
   SessionExpiry session_expiry = SessionExpiry::kNever;
   std::chrono::milliseconds request_time_limit{10000};  // for a request begun; then the connection is closed

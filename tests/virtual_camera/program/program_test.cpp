@@ -195,6 +195,10 @@ TEST(CommandLine, HelpEndsWellAndMistakesEndWithTwo) {
                                                {"--speed", "0"},
                                                {"--clip", "/nowhere/clip"},
                                                {"--password-file", "/nowhere/file"},
+                                               {"--fleet", "2", "--count", "2"},
+                                               {"--cameras-file", "cameras.json"},
+                                               {"--max-viewers", "0"},
+                                               {"--cut-answer", "PLAY", "-1"},
                                                {"--slow-answer", "PLAY"},
                                                {"--slow-answer", "PLAY", "soon"},
                                                {"--no-answer", "PLAY#x"},
@@ -295,6 +299,37 @@ TEST(Program, AWrongProfileEndsWithOneAndNamesFileLineAndKey) {
                   STDERR_FILENO);
   EXPECT_EQ(program.line(), "vexa-camera: " + wrong + ":3: description: must be a text");
   EXPECT_EQ(program.end_by(0), 1);
+}
+
+TEST(Program, AFleetNamesItsCamerasAndItsControlPortAndWritesTheFileOfCameras) {
+  const vexa_test::TemporaryFolder folder;
+  const std::string profile = std::string(VEXA_SOURCE_DIR) + "/models/profiles/VX-2000.json";
+  Program program({"--fleet", "2", "--profile", profile, "--drawn", "--address", own_loopback(1), "--http-port", "0",
+                   "--rtsp-port", "0", "--control-port", "0", "--cameras-file", folder / "cameras.json"});
+  EXPECT_EQ(program.line().substr(0, 18 + own_loopback(1).size()), "vx-2000-1 http://" + own_loopback(1) + ":");
+  EXPECT_EQ(program.line().substr(0, 17), "vx-2000-2 http://");
+  EXPECT_EQ(program.line().substr(0, 25), "control http://127.0.0.1:");
+  EXPECT_NE(vexa_test::contents_of(folder / "cameras.json").find("\"name\": \"vx-2000-2\""), std::string::npos);
+  EXPECT_EQ(program.end_by(SIGTERM), 0);
+}
+
+TEST(Program, AFleetOfTheInstalledProfilesTakesOneAfterTheOther) {
+  Program program({"--fleet", "3", "--drawn", "--address", own_loopback(1), "--http-port", "0", "--rtsp-port", "0"});
+  EXPECT_EQ(program.line().substr(0, 11), "lmx-a100-1 ");
+  EXPECT_EQ(program.line().substr(0, 11), "lmx-c100-2 ");
+  EXPECT_EQ(program.line().substr(0, 11), "lmx-h100-3 ");
+  EXPECT_EQ(program.end_by(SIGTERM), 0);
+}
+
+TEST(Program, AFleetThatCannotStartEndsWithOneAndSaysWhy) {
+  const vexa_test::TemporaryFolder folder;
+  const std::string wrong = folder.make_file("fleet.json", "{\"cameras\": [\n{\"colour\": 1}]}");
+  Program of_a_file({"--fleet", wrong}, STDERR_FILENO);
+  EXPECT_EQ(of_a_file.line(), "vexa-camera: " + wrong + ":2: colour: is no key of a camera");
+  EXPECT_EQ(of_a_file.end_by(0), 1);
+  Program of_a_number({"--fleet", "1001"}, STDERR_FILENO);
+  EXPECT_EQ(of_a_number.line(), "vexa-camera: a fleet has 1 to 1000 cameras");
+  EXPECT_EQ(of_a_number.end_by(0), 1);
 }
 
 }  // namespace
