@@ -33,7 +33,7 @@ Operation::~Operation() {
   state_.errors.enter({code_, cancelled_, name_, camera, text_});
   // Reads of a stream fail again and again while it is silent; StreamWatch notes the change.
   if (!state_.recorder.is_on() || std::strcmp(name_, kStreamingThread) == 0) return;
-  char event[kTextRoom];
+  char event[kTextRoom + 128];  // with the names of the operation and of the code
   std::snprintf(event, sizeof event, "%s: %s%s %s", name_, CodeName(code_), cancelled_ ? " (cancelled)" : "", text_);
   state_.recorder.note("call", event);
 }

@@ -180,7 +180,7 @@ class WatchCommand final : public Command {
       return terminal.report(usage("--forever takes no pictures of alarms", "Leave out --snapshot-dir."));
     }
     if (const auto problem = check_stream(options_.stream)) return terminal.report(*problem);
-    const std::uint32_t streams = kAlarmStream | (metadata_ ? kMetadataStream : 0);
+    const std::uint32_t streams = kAlarmStream | (metadata_ ? std::uint32_t{kMetadataStream} : 0);
     const Result<SessionOptions> session = session_of(options_.camera, options_.profile, options_.stream, streams);
     if (!session) return terminal.report(session.error());
     return watch_by_session(*session, terminal, watch_options());
