@@ -124,7 +124,7 @@ std::string without_secrets(std::string_view text, const SLibDConnectionInfo& in
 void FlightRing::add(std::string_view text) {
   Line line{};
   line.length = std::min(text.size(), kLineRoom);
-  std::memcpy(line.text, text.data(), line.length);
+  std::memcpy(line.text, text.data(), static_cast<std::size_t>(line.length));
   const std::uint32_t end = end_.load(std::memory_order_relaxed);
   lines_[end % kLines].publish(line);
   end_.store(end + 1 == 2 * kLines ? kLines : end + 1, std::memory_order_release);

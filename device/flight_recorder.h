@@ -34,7 +34,7 @@ class FlightRing {
     const std::uint32_t begin = end < kLines ? 0 : end - kLines;
     for (std::uint32_t i = begin; i != end; ++i) {
       Line line;
-      if (lines_[i % kLines].try_read(line)) use(std::string_view(line.text, line.length));
+      if (lines_[i % kLines].try_read(line)) use(std::string_view(line.text, static_cast<std::size_t>(line.length)));
     }
   }
 
