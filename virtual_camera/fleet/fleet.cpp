@@ -7,9 +7,9 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <cstring>
 #include <map>
 #include <nlohmann/json.hpp>
+#include <system_error>
 #include <utility>
 
 #include "virtual_camera/fleet/control_page.h"
@@ -33,6 +33,7 @@ constexpr std::string_view kList =
 
 std::vector<CameraOptions> options_of(const std::vector<FleetCamera>& cameras) {
   std::vector<CameraOptions> options;
+  options.reserve(cameras.size());
   for (const FleetCamera& camera : cameras) options.push_back(camera.options);
   return options;
 }
@@ -42,7 +43,7 @@ std::string write_file(const std::string& path, std::string_view text) {
   constexpr mode_t kOwnerAlone = 0600;
   // Not through a file that others may already read.
   if (::unlink(path.c_str()) != 0 && errno != ENOENT)
-    return fmt::format("cannot write {}: {}", path, std::strerror(errno));
+    return fmt::format("cannot write {}: {}", path, std::generic_category().message(errno));
   const int file = ::open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, kOwnerAlone);
   bool whole = file >= 0;
   while (whole && !text.empty()) {
@@ -52,7 +53,7 @@ std::string write_file(const std::string& path, std::string_view text) {
   }
   const int error = errno;
   if (file >= 0) ::close(file);
-  return whole ? "" : fmt::format("cannot write {}: {}", path, std::strerror(error));
+  return whole ? "" : fmt::format("cannot write {}: {}", path, std::generic_category().message(error));
 }
 
 std::string_view file_name(std::string_view path) { return path.substr(path.rfind('/') + 1); }
