@@ -100,7 +100,8 @@ void OperationClock::look() const {
   const char* const operation = operation_;
   if (operation == nullptr) return;
   const auto now = std::chrono::steady_clock::now().time_since_epoch();
-  if (now - since_.load() > kLongest) Findings::stop_at(std::string(operation) + " does not return");
+  if (now - std::chrono::steady_clock::duration(since_) > kLongest)
+    Findings::stop_at(std::string(operation) + " does not return");
 }
 
 ChaosDriver::ChaosDriver(ChaosCameras& cameras, std::size_t camera, bool rtp) : cameras_(cameras), rtp_(rtp) {

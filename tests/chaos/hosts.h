@@ -5,6 +5,7 @@
 
 #include <atomic>
 #include <chrono>
+#include <cstdint>
 #include <functional>
 #include <memory>
 #include <random>
@@ -29,7 +30,7 @@ class Findings {
 class OperationClock {
  public:
   void begin(const char* operation) {
-    since_ = std::chrono::steady_clock::now().time_since_epoch();
+    since_ = std::chrono::steady_clock::now().time_since_epoch().count();
     operation_ = operation;
   }
   void end() { operation_ = nullptr; }
@@ -38,7 +39,7 @@ class OperationClock {
 
  private:
   std::atomic<const char*> operation_{nullptr};
-  std::atomic<std::chrono::steady_clock::duration> since_{};
+  std::atomic<std::int64_t> since_{0};  // as the steady clock counts: an atomic duration takes a lock on 32 bits
 };
 
 /// A driver of one of the cameras. Operations but for the destruction may come from any thread.
