@@ -118,9 +118,14 @@ bool Fleet::start(std::optional<std::uint16_t> control_port) {
 }
 
 void Fleet::stop() {
-  if (control_loop_) control_loop_->run([this] { control_->close(); });
+  if (control_loop_) {
+    // Its timer must go before the loop does.
+    control_loop_->run([this] {
+      control_->close();
+      control_.reset();
+    });
+  }
   control_loop_.reset();  // no answer is under way from here on
-  control_.reset();
   host_.stop();
 }
 
