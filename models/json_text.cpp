@@ -3,44 +3,17 @@
 
 #include <algorithm>
 #include <cstddef>
-#include <iterator>
 #include <limits>
 #include <nlohmann/json.hpp>
 #include <optional>
 #include <utility>
 
+#include "models/counted_text.h"
+
 namespace vexa::models {
 namespace {
 
 constexpr std::size_t kDeepest = 16;
-
-// Lets the parser read characters and counts the lines up to the last one.
-class CountedText {
- public:
-  using iterator_category = std::input_iterator_tag;
-  using value_type = char;
-  using difference_type = std::ptrdiff_t;
-  using pointer = const char*;
-  using reference = const char&;
-
-  CountedText(const char* at, int* line) : at_(at), line_(line) {}
-
-  reference operator*() const { return *at_; }
-  // A line ends when what follows its end is read, not when its end is.
-  CountedText& operator++() {
-    if (ended_line_) ++*line_;
-    ended_line_ = *at_ == '\n';
-    ++at_;
-    return *this;
-  }
-  bool operator==(const CountedText& other) const { return at_ == other.at_; }
-  bool operator!=(const CountedText& other) const { return at_ != other.at_; }
-
- private:
-  const char* at_;
-  int* line_;
-  bool ended_line_ = false;
-};
 
 Node node_of(Node::Kind kind) {
   Node node;

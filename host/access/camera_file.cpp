@@ -9,12 +9,12 @@
 #include <array>
 #include <cerrno>
 #include <cstddef>
-#include <iterator>
 #include <nlohmann/json.hpp>
 #include <set>
 
 #include "host/base/printable.h"
 #include "host/base/unique_fd.h"
+#include "models/counted_text.h"
 
 namespace vexa::host {
 namespace {
@@ -33,37 +33,13 @@ Result<std::string> read_text(const std::string& path) {
   std::string text;
   std::array<char, 16384> piece{};
   for (;;) {
-    const ssize_t count = ::read(file.get(), piece.data(), piece.size());
-    if (count < 0 && errno == EINTR) continue;
+    const ssize_t count = read_some(file.get(), piece.data(), piece.size());
     if (count < 0) return fail(unreadable(path, errno));
     if (count == 0) return text;
     text.append(piece.data(), static_cast<std::size_t>(count));
     if (text.size() > kLargestFile) return fail(unreadable(path, EFBIG));
   }
 }
-
-// Letters of a text, with the line that the parser has come to.
-class LineCounter {
- public:
-  using iterator_category = std::input_iterator_tag;
-  using value_type = char;
-  using difference_type = std::ptrdiff_t;
-  using pointer = const char*;
-  using reference = const char&;
-
-  LineCounter(const char* at, int* line) : at_(at), line_(line) {}
-  reference operator*() const { return *at_; }
-  LineCounter& operator++() {
-    if (*at_++ == '\n') ++*line_;
-    return *this;
-  }
-  bool operator==(const LineCounter& other) const { return at_ == other.at_; }
-  bool operator!=(const LineCounter& other) const { return at_ != other.at_; }
-
- private:
-  const char* at_;
-  int* line_;
-};
 
 bool is_name(const std::string& text) {
   return !text.empty() && text.size() <= kLongestName && printable(text) == text && text.front() != '-';
@@ -222,10 +198,7 @@ class Reader final : public nlohmann::json_sax<Json> {
 
 Result<std::string> value_of(const std::string& variable, const char* const* environment) {
   for (; *environment != nullptr; ++environment) {
-    const std::string_view entry = *environment;
-    if (entry.size() > variable.size() && entry.starts_with(variable) && entry[variable.size()] == '=') {
-      return std::string(entry.substr(variable.size() + 1));
-    }
+    if (auto value = variable_value(*environment, variable)) return *std::move(value);
   }
   return fail(usage(fmt::format("the environment has no variable {}", printable(variable)), "Set it and export it."));
 }
@@ -241,8 +214,8 @@ Result<CameraFile> CameraFile::read(const std::string& path) {
 Result<CameraFile> CameraFile::parse(std::string_view text, const std::string& path) {
   int line = 1;
   Reader reader(path, line);
-  const LineCounter begin(text.data(), &line);
-  const LineCounter end(text.data() + text.size(), &line);
+  const models::CountedText begin(text.data(), &line);
+  const models::CountedText end(text.data() + text.size(), &line);
   const bool whole = Json::sax_parse(begin, end, &reader);
   if (reader.problem()) return fail(*std::move(reader.problem()));
   if (!whole || reader.cameras().empty()) return fail(reader.at(line, "the file lists no \"cameras\"", kAdvice));

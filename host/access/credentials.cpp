@@ -25,8 +25,7 @@ Result<std::string> read_first_line(const std::string& path) {
   std::string text;
   std::array<char, 512> piece{};
   while (text.size() <= kLargestFile && text.find('\n') == std::string::npos) {
-    const ssize_t count = read(file.get(), piece.data(), piece.size());
-    if (count < 0 && errno == EINTR) continue;
+    const ssize_t count = read_some(file.get(), piece.data(), piece.size());
     if (count < 0) return fail(unreadable(path, errno));
     if (count == 0) break;
     text.append(piece.data(), static_cast<std::size_t>(count));
@@ -70,19 +69,20 @@ std::optional<Problem> check(const Credentials& credentials) {
   return std::nullopt;
 }
 
-std::optional<std::string> value_of(std::string_view variable, std::string_view name) {
+}  // namespace
+
+std::optional<std::string> variable_value(std::string_view variable, std::string_view name) {
   if (variable.size() <= name.size() || !variable.starts_with(name) || variable[name.size()] != '=') {
     return std::nullopt;
   }
   return std::string(variable.substr(name.size() + 1));
 }
 
-}  // namespace
-
 void read_environment(CredentialSources& sources, const char* const* environment) {
   for (; *environment != nullptr; ++environment) {
-    if (auto user = value_of(*environment, kUserVariable)) sources.environment_user = std::move(user);
-    if (auto password = value_of(*environment, kPasswordVariable)) sources.environment_password = std::move(password);
+    if (auto user = variable_value(*environment, kUserVariable)) sources.environment_user = std::move(user);
+    if (auto password = variable_value(*environment, kPasswordVariable))
+      sources.environment_password = std::move(password);
   }
 }
 

@@ -6,6 +6,7 @@
 
 #include <optional>
 #include <string>
+#include <string_view>
 
 #include "host/base/problem.h"
 
@@ -26,6 +27,9 @@ struct CredentialSources {
   std::optional<std::string> environment_user = {};
   std::optional<std::string> environment_password = {};
 };
+
+// The value in "NAME=value" where that is the variable's name.
+[[nodiscard]] std::optional<std::string> variable_value(std::string_view variable, std::string_view name);
 
 // Fills the two environment sources from a process environment ("NAME=value" texts, null at the end).
 void read_environment(CredentialSources& sources, const char* const* environment);

@@ -17,6 +17,14 @@ void wait_for_room(int fd) {
 
 }  // namespace
 
+ssize_t read_some(int fd, void* room, std::size_t size) {
+  ssize_t count = 0;
+  do {
+    count = read(fd, room, size);
+  } while (count < 0 && errno == EINTR);
+  return count;
+}
+
 int write_all(int fd, const void* data, std::size_t length) {
   const auto* bytes = static_cast<const unsigned char*>(data);
   while (length > 0) {

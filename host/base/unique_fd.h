@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A descriptor that closes itself, and writing all of something to one.
+// A descriptor that closes itself; reading from one and writing all of something to one, across signals.
 #ifndef HOST_BASE_UNIQUE_FD_H_
 #define HOST_BASE_UNIQUE_FD_H_
 
@@ -33,6 +33,9 @@ class UniqueFd {
  private:
   int fd_ = -1;
 };
+
+// As read(2), begun again after a signal: how many bytes came, 0 at the end, -1 with errno.
+[[nodiscard]] ssize_t read_some(int fd, void* room, std::size_t size);
 
 // Writes every byte, across partial writes and signals. Returns 0, or the error's number.
 [[nodiscard]] int write_all(int fd, const void* data, std::size_t length);

@@ -23,13 +23,10 @@ bool FollowedFile::is_regular() const {
 }
 
 Result<std::size_t> FollowedFile::read(std::span<char> room) {
-  for (;;) {
-    const ssize_t count = ::read(file_.get(), room.data(), room.size());
-    if (count < 0 && errno == EINTR) continue;
-    if (count < 0) return fail(unreadable(path_, errno));
-    place_ += static_cast<off_t>(count);
-    return static_cast<std::size_t>(count);
-  }
+  const ssize_t count = read_some(file_.get(), room.data(), room.size());
+  if (count < 0) return fail(unreadable(path_, errno));
+  place_ += static_cast<off_t>(count);
+  return static_cast<std::size_t>(count);
 }
 
 bool FollowedFile::begin_successor() {
