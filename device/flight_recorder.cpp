@@ -16,7 +16,6 @@
 #include "device/camera_link.h"
 #include "device/driver_state.h"
 #include "device/error_record.h"
-#include "runtime/base/base64.h"
 #include "runtime/base/moment.h"
 #include "runtime/base/result.h"
 #include "runtime/base/text.h"
@@ -113,9 +112,7 @@ void append_printable(std::string& line, std::string_view text) {
 }
 
 std::string without_secrets(std::string_view text, const SLibDConnectionInfo& info) {
-  if (info.password.empty()) return std::string(text);
-  std::string out = masked(std::string(text), base64_encode(joined_credentials(info.userName, info.password)));
-  out = masked(std::move(out), info.password);
+  std::string out = without_credentials(std::string(text), info.userName, info.password);
   return masked(std::move(out), percent_encoded(info.password, ""));
 }
 

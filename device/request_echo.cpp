@@ -17,16 +17,14 @@ void RequestEcho::write(const std::string& line, const char* credentials) {
     const Guard guard(lock_);
     receiver = receiver_;
   }
-  if (receiver == nullptr) {
-    std::puts(line.c_str());
-  } else {
-    std::string shown = masked(line, credentials);
-    const WipedAtEnd wiped(shown);  // what was masked may stand after its end
-    (*receiver)(shown.c_str());
-  }
+  if (receiver == nullptr) std::puts(line.c_str());
+  if (receiver == nullptr && !recorder_.is_on()) return;
+  std::string shown = masked(line, credentials);
+  const WipedAtEnd wiped(shown);  // what was masked may stand after its end
+  if (receiver != nullptr) (*receiver)(shown.c_str());
   if (!recorder_.is_on()) return;
   Operation::announce(recorder_);
-  recorder_.note("rtsp >", masked(line, credentials));
+  recorder_.note("rtsp >", shown);
 }
 
 void RequestEcho::answered(const std::string& answer, const char* credentials) {

@@ -23,14 +23,6 @@ constexpr int kStatusOk = 200;
 constexpr int kStatusNoContent = 204;
 constexpr int kStatusUnauthorized = 401;
 
-// Safe: a camera that sends the credentials back in its reason phrase does not put them into the log.
-std::string loggable(const std::string& reason, const SLibDConnectionInfo& info) {
-  if (info.password.empty()) return reason;
-  std::string as_sent = basic_credentials(info.userName, info.password);
-  const WipedAtEnd wiped(as_sent);
-  return masked(masked(reason, as_sent), info.password);
-}
-
 WaitLimit limit_of(const HttpPeer& peer) { return {peer.connection.timeout, peer.cancels}; }
 
 Result<Socket> connect_http(const HttpPeer& peer) {
@@ -69,7 +61,9 @@ Result<> read_status(int socket, const HttpPeer& peer) {
   const auto line = parse_status_line({header, static_cast<std::size_t>(*length)}, "HTTP/");
   if (!line) return kStatusNotFound;
   if (peer.log.is_on()) {
-    const std::string reason = loggable(line->reason, peer.connection);
+    // Safe: a camera that sends the credentials back in its reason phrase does not put them into the log.
+    const SLibDConnectionInfo& info = peer.connection;
+    const std::string reason = without_credentials(line->reason, info.userName, info.password);
     peer.log.write("From", format_within(kHeaderRoom, "%d %s", line->status, reason.c_str()).text.c_str());
   }
   if (line->status == kStatusOk || line->status == kStatusNoContent) return {};

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "transport/wire/http_request.h"
 
+#include <utility>
+
 #include "runtime/base/base64.h"
 #include "runtime/base/wipe.h"
 
@@ -34,6 +36,13 @@ std::string basic_credentials(const std::string& user, const std::string& passwo
   std::string joined = joined_credentials(user, password);
   const WipedAtEnd wiped(joined);
   return base64_encode(joined);
+}
+
+std::string without_credentials(std::string text, const std::string& user, const std::string& password) {
+  if (password.empty()) return text;
+  std::string as_sent = basic_credentials(user, password);
+  const WipedAtEnd wiped(as_sent);
+  return masked(masked(std::move(text), as_sent), password);
 }
 
 Formatted http_get_request(const HttpTarget& target) {

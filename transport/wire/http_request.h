@@ -18,6 +18,9 @@ std::string joined_credentials(const std::string& user, const std::string& passw
 /// The same as requests carry them, in Base64. Secret, as what they are made of: its owner wipes it.
 std::string basic_credentials(const std::string& user, const std::string& password);
 
+/// The text without the password, plain or as requests carry it.
+std::string without_credentials(std::string text, const std::string& user, const std::string& password);
+
 /// What one request names.
 struct HttpTarget {
   const std::string& host;  ///< the camera's, also when a proxy carries the request
