@@ -19,11 +19,9 @@ std::optional<Problem> work_by_session(const SessionOptions& session, const Sess
   SessionNews news(terminal);
   SessionCallbacks callbacks = work.callbacks;
   callbacks.state = [&](Session& own, const SessionStatus& status) { news.show(own.Name(), status); };
-  SessionGroupOptions without_threads;
-  without_threads.threads = 0;
-  SessionGroup group(without_threads);
+  SessionGroup group(without_threads());
   const std::shared_ptr<Session> opened = group.Open(session, callbacks);
-  if (!opened) return Problem{ExitCode::kUsage, "there is not enough memory for a session", "Free some."};
+  if (!opened) return no_session();
   while (!work.is_done()) {
     if (Interrupt::requested()) return Problem{ExitCode::kInterrupted, "interrupted", ""};
     if (auto problem = hopeless(opened->Name(), opened->Status())) return problem;

@@ -29,4 +29,12 @@ SessionOptions session_options(const ChosenCamera& camera, const CameraOptions& 
   return session;
 }
 
+SessionGroupOptions without_threads() {
+  SessionGroupOptions options;
+  options.threads = 0;
+  return options;
+}
+
+Problem no_session() { return {ExitCode::kUsage, "there is not enough memory for a session", "Free some."}; }
+
 }  // namespace vexa::host

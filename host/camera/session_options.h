@@ -10,6 +10,11 @@ namespace vexa::host {
 
 [[nodiscard]] SessionOptions session_options(const ChosenCamera& camera, const CameraOptions& options, int stream);
 
+// Of a group that does all its work where the host calls Process().
+[[nodiscard]] SessionGroupOptions without_threads();
+// When a group opens no session.
+[[nodiscard]] Problem no_session();
+
 }  // namespace vexa::host
 
 #endif  // HOST_CAMERA_SESSION_OPTIONS_H_

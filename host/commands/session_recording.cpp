@@ -198,15 +198,13 @@ ExitCode record_by_sessions(const SessionRecordingOptions& options, Terminal& te
   std::deque<CameraAtWork> cameras;
   SessionNews news(terminal);
   // Without threads of its own, so that all of it happens here; destroyed first, as it calls the others.
-  SessionGroupOptions without_threads;
-  without_threads.threads = 0;
-  SessionGroup group(without_threads);
+  SessionGroup group(without_threads());
   for (const ChosenCamera& camera : options.cameras) {
     SessionOptions session = session_options(camera, options.camera, options.stream);
     session.cgiLog = with_camera_name(session.cgiLog, camera.name);
     CameraAtWork& work = cameras.emplace_back(camera, options, terminal.results());
     if (!work.begin(group, session, [&news](const CameraRecording& own) { news.show(own.name(), own.status()); })) {
-      return terminal.report({ExitCode::kUsage, "there is not enough memory for a session", "Free some."});
+      return terminal.report(no_session());
     }
   }
   Progress progress(terminal);

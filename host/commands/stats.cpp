@@ -44,8 +44,7 @@ struct WatchedCamera {
     session->Statistics(now);
   }
   [[nodiscard]] double a_second(std::uint64_t StreamStatistics::*total) const {
-    const std::uint64_t rise = now.*total >= before.*total ? now.*total - before.*total : now.*total;
-    return seconds > 0 ? static_cast<double>(rise) / seconds : 0;
+    return seconds > 0 ? static_cast<double>(rise(before.*total, now.*total)) / seconds : 0;
   }
   // In this state, in seconds.
   [[nodiscard]] double since() const {
@@ -119,16 +118,12 @@ class StatsCommand final : public Command {
  private:
   ExitCode follow(const std::vector<ChosenCamera>& chosen, Terminal& terminal) {
     Interrupt::finish_orderly();
-    SessionGroupOptions without_threads;
-    without_threads.threads = 0;
-    SessionGroup group(without_threads);
+    SessionGroup group(without_threads());
     std::deque<WatchedCamera> cameras;
     for (const ChosenCamera& camera : chosen) {
       WatchedCamera& watched = cameras.emplace_back(WatchedCamera{camera.name});
       watched.session = group.Open(session_options(camera, camera_, video_.stream), {});
-      if (!watched.session) {
-        return terminal.report({ExitCode::kUsage, "there is not enough memory for a session", "Free some."});
-      }
+      if (!watched.session) return terminal.report(no_session());
     }
     const std::uint64_t tables = count_ > 0 ? count_ : (watch_ ? UINT64_MAX : 1);
     auto latest = Clock::now();

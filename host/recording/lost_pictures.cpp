@@ -6,13 +6,6 @@
 #include <nlohmann/json.hpp>
 
 namespace vexa::host {
-namespace {
-
-// A part of what rises only; nothing where the driver has begun anew.
-std::uint64_t rise(std::uint64_t from, std::uint64_t to) { return to >= from ? to - from : to; }
-
-}  // namespace
-
 const std::array<LostPictures::Reason, 7>& LostPictures::reasons() {
   static constexpr std::array<Reason, 7> kReasons = {
       {{"incomplete", "some packets of which never came", &StreamStatistics::framesDroppedIncomplete},

@@ -13,6 +13,9 @@
 
 namespace vexa::host {
 
+// What a total that only rises has gained; all of it where the driver has begun anew.
+[[nodiscard]] constexpr std::uint64_t rise(std::uint64_t from, std::uint64_t to) { return to >= from ? to - from : to; }
+
 // Totals of a stretch of a stream. Of a picture none of whose packets has come the driver knows nothing but that
 // packets are missing.
 class LostPictures {
