@@ -1,14 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 // A long-lived HTTP video stream: parts of a multipart answer with a JPEG picture each, or an elementary stream of
 // H.264 or MPEG-4. The first byte of the input chooses the codec; each record comes at a time of its own.
-#include <sys/socket.h>
-#include <unistd.h>
-
 #include <iterator>
 #include <vector>
 
 #include "fuzz/no_waiting.h"
 #include "fuzz/records.h"
+#include "fuzz/stream_pair.h"
 #include "runtime/base/sync.h"
 #include "tests/support/test_driver.h"
 
@@ -33,21 +31,21 @@ void read_all(vexa_test::TestDriver& driver) {
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   if (size == 0) return 0;
   vexa_fuzz::Records records({data + 1, size - 1});
-  int ends[2];
-  if (socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0, ends) != 0) return 0;
+  vexa_fuzz::StreamPair ends;
+  if (!ends.valid()) return 0;
   vexa_test::TestDriver driver;
   driver.use("127.0.0.1", 80, 20);
   {
     const vexa::Guard guard(driver.m_ConnectionLock);
     driver.m_CameraInfo.codecName = kCodecs[data[0] % std::size(kCodecs)];
   }
-  driver.state().set_stream_socket(ends[0]);
+  driver.state().set_stream_socket(ends.of_driver());
   driver.state().reset_stream_buffer();
   while (const auto record = records.next()) {
-    send(ends[1], record->data(), record->size(), MSG_NOSIGNAL | MSG_DONTWAIT);
+    ends.send(*record);
     read_all(driver);
   }
-  close(ends[1]);
+  ends.end();
   read_all(driver);
   driver.state().release_stream_buffer();
   driver.state().close_media();

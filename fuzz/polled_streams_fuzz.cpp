@@ -1,12 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // The streams that a host polls: alarms, motion metadata and sound. The first byte of the input chooses one; each
 // record comes at a time of its own.
-#include <sys/socket.h>
-#include <unistd.h>
-
 #include <vector>
 
 #include "fuzz/in_process_camera.h"
+#include "fuzz/stream_pair.h"
 #include "runtime/base/sync.h"
 #include "tests/support/test_driver.h"
 
@@ -39,8 +37,8 @@ void poll_sound(vexa_test::TestDriver& driver) {
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   if (size == 0) return 0;
   vexa_fuzz::Records records({data + 1, size - 1});
-  int ends[2];
-  if (socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0, ends) != 0) return 0;
+  vexa_fuzz::StreamPair ends;
+  if (!ends.valid()) return 0;
   vexa_test::TestDriver driver;
   driver.use("127.0.0.1", 80, 20);
   const int stream = data[0] % 3;
@@ -48,15 +46,15 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   driver.m_FixedIoBoxInfo.audioDetection = (data[0] & 4) != 0;
   driver.m_UseMotionDetection = (data[0] & 8) != 0;
   int& socket = stream == 0 ? driver.m_IoStreamSocket : stream == 1 ? driver.m_MdStreamSocket : driver.m_AudioSocket;
-  socket = ends[0];
+  socket = ends.of_driver();
   while (const auto record = records.next()) {
     if (record->empty()) continue;
-    send(ends[1], record->data(), record->size(), MSG_NOSIGNAL | MSG_DONTWAIT);
+    ends.send(*record);
     if (stream == 0) poll_alarms(driver);
     if (stream == 1) poll_metadata(driver);
     if (stream == 2) poll_sound(driver);
   }
-  close(ends[1]);
+  ends.end();
   driver.StopIoStreaming();
   driver.StopModRawData();
   driver.StopAudioStreaming();

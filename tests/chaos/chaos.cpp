@@ -5,14 +5,13 @@
 //   chaos [--seed N] [--operations N | --seconds N]      40 operations of each thread by default
 #include <chrono>
 #include <cstdio>
-#include <cstdlib>
-#include <cstring>
 #include <deque>
 #include <random>
 #include <string>
 #include <thread>
 
 #include "tests/chaos/hosts.h"
+#include "tests/support/number_options.h"
 #include "tests/support/process_state.h"
 
 namespace {
@@ -29,20 +28,6 @@ struct Arguments {
   long operations = 40;
   long seconds = 0;  // 0: as many operations as there are
 };
-
-bool read(Arguments& arguments, int count, char** texts) {
-  for (int i = 1; i < count; i += 2) {
-    long* value = nullptr;
-    if (std::strcmp(texts[i], "--seed") == 0) value = &arguments.seed;
-    if (std::strcmp(texts[i], "--operations") == 0) value = &arguments.operations;
-    if (std::strcmp(texts[i], "--seconds") == 0) value = &arguments.seconds;
-    if (value == nullptr || i + 1 == count) return false;
-    char* end = nullptr;
-    *value = std::strtol(texts[i + 1], &end, 10);
-    if (*end != '\0' || *value < 1) return false;
-  }
-  return true;
-}
 
 /// All of a run's hosts, each in a thread of its own, and the cameras' changes in this one.
 std::uint64_t run(const Arguments& arguments, ChaosCameras& cameras) {
@@ -79,7 +64,9 @@ std::uint64_t run(const Arguments& arguments, ChaosCameras& cameras) {
 
 int main(int count, char** texts) {
   Arguments arguments;
-  if (!read(arguments, count, texts)) {
+  if (!vexa_test::read_numbers(
+          count, texts,
+          {{"--seed", &arguments.seed}, {"--operations", &arguments.operations}, {"--seconds", &arguments.seconds}})) {
     std::fprintf(stderr, "usage: %s [--seed N] [--operations N | --seconds N]\n", texts[0]);
     return 2;
   }

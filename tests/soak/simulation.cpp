@@ -4,13 +4,12 @@
 //   soak-simulation [--hours N] [--sessions N] [--seed N]      72 hours of 300 sessions by default
 #include <cstdint>
 #include <cstdio>
-#include <cstdlib>
-#include <cstring>
 #include <deque>
 #include <random>
 
 #include "runtime/base/calendar.h"
 #include "tests/soak/simulated_session.h"
+#include "tests/support/number_options.h"
 
 namespace {
 
@@ -21,20 +20,6 @@ struct Arguments {
   long sessions = 300;
   long seed = 1;
 };
-
-bool read(Arguments& arguments, int count, char** texts) {
-  for (int i = 1; i < count; i += 2) {
-    long* value = nullptr;
-    if (std::strcmp(texts[i], "--hours") == 0) value = &arguments.hours;
-    if (std::strcmp(texts[i], "--sessions") == 0) value = &arguments.sessions;
-    if (std::strcmp(texts[i], "--seed") == 0) value = &arguments.seed;
-    if (value == nullptr || i + 1 == count) return false;
-    char* end = nullptr;
-    *value = std::strtol(texts[i + 1], &end, 10);
-    if (*end != '\0' || *value < 1) return false;
-  }
-  return true;
-}
 
 /// The wall clock of a host: it is set now and then, in both directions. Where time_t has 32 bits it wraps in 2038.
 class WallClock {
@@ -134,7 +119,9 @@ int run(const Arguments& arguments) {
 
 int main(int count, char** texts) {
   Arguments arguments;
-  if (!read(arguments, count, texts)) {
+  if (!vexa_test::read_numbers(
+          count, texts,
+          {{"--hours", &arguments.hours}, {"--sessions", &arguments.sessions}, {"--seed", &arguments.seed}})) {
     std::fprintf(stderr, "usage: %s [--hours N] [--sessions N] [--seed N]\n", texts[0]);
     return 2;
   }
