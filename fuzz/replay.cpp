@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// NAME_fuzz --replay FOLDER reads every file of the target's corpus, and every file cut short at every length. Each input
-// lies right before a page that may not be touched, so that reading one byte too far ends the program.
+// NAME_fuzz --replay FOLDER reads every file of the target's corpus, and every file cut short at every length. Each
+// input lies right before a page that may not be touched, so that reading one byte too far ends the program.
 #include <sys/mman.h>
 #include <unistd.h>
 
