@@ -3,8 +3,6 @@
 
 #include <sys/socket.h>
 
-#include <vector>
-
 #include "runtime/base/text.h"
 #include "runtime/base/wipe.h"
 #include "transport/failure.h"
@@ -85,13 +83,14 @@ Result<Socket> open_http(const HttpPeer& peer, const std::string& path) {
 }
 
 Result<std::string> inquire(const HttpPeer& peer, const std::string& name, int most) {
-  std::vector<char> bytes(static_cast<std::size_t>(most) + 1);
+  std::string answer(static_cast<std::size_t>(most), '\0');
   auto socket = open_http(peer, format_within(kRequestRoom, "/command/inquiry.cgi?inq=%s", name.c_str()).text);
   if (!socket) return socket.failure();
-  const auto received = receive_all(socket->get(), {bytes.data(), static_cast<std::size_t>(most)}, limit_of(peer));
+  const auto received = receive_all(socket->get(), answer, limit_of(peer));
   shutdown_and_close(socket->release());
   if (!received) return received.failure();
-  return std::string(bytes.data());
+  answer.resize(before_nul(answer).size());
+  return answer;
 }
 
 }  // namespace vexa

@@ -1,11 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
-// Loops that only receive: the least that a reader can do. One wakes for every datagram, one naps and drains.
+// Loops that only receive: the least that a reader can do. One wakes for every datagram; two nap and drain, with
+// recvmmsg and with recv.
 #include <arpa/inet.h>
 #include <netinet/in.h>
 #include <poll.h>
 #include <sys/socket.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <chrono>
 #include <optional>
 #include <string>
@@ -91,7 +93,20 @@ void receive_waking(int media, std::uint64_t pictures, PictureCounter& counter) 
   }
 }
 
-void receive_napping(int media, std::uint64_t pictures, PictureCounter& counter) {
+/// Takes what waits at the socket, then naps, until all pictures have come or none does for some time.
+template <typename Drain>
+void receive_napping(int media, std::uint64_t pictures, PictureCounter& counter, Drain drain) {
+  auto last = std::chrono::steady_clock::now();
+  if (!is_there(media)) return;
+  while (counter.ended < pictures) {
+    if (drain() > 0) last = std::chrono::steady_clock::now();
+    if (std::chrono::steady_clock::now() - last > std::chrono::milliseconds(kSilence)) return;
+    std::this_thread::sleep_for(kNap);
+  }
+}
+
+/// Many datagrams a system call.
+void receive_by_recvmmsg(int media, std::uint64_t pictures, PictureCounter& counter) {
   constexpr std::size_t kRoom = 2048;
   std::vector<unsigned char> buffer(kMost * kRoom);
   mmsghdr messages[kMost] = {};
@@ -101,19 +116,39 @@ void receive_napping(int media, std::uint64_t pictures, PictureCounter& counter)
     messages[i].msg_hdr.msg_iov = &pieces[i];
     messages[i].msg_hdr.msg_iovlen = 1;
   }
-  auto last = std::chrono::steady_clock::now();
-  if (!is_there(media)) return;
-  while (counter.ended < pictures) {
-    int count = 0;
-    do {
+  receive_napping(media, pictures, counter, [&] {
+    int taken = 0;
+    for (int count = kMost; count == static_cast<int>(kMost);) {
       count = recvmmsg(media, messages, kMost, MSG_DONTWAIT, nullptr);
       for (int i = 0; i < count; ++i)
         counter.take(buffer.data() + static_cast<std::size_t>(i) * kRoom, messages[i].msg_len);
-      if (count > 0) last = std::chrono::steady_clock::now();
-    } while (count == static_cast<int>(kMost));
-    if (std::chrono::steady_clock::now() - last > std::chrono::milliseconds(kSilence)) return;
-    std::this_thread::sleep_for(kNap);
+      taken += std::max(count, 0);
+    }
+    return taken;
+  });
+}
+
+/// One datagram a system call.
+void receive_by_recv(int media, std::uint64_t pictures, PictureCounter& counter) {
+  std::vector<unsigned char> buffer(65536);
+  receive_napping(media, pictures, counter, [&] {
+    int taken = 0;
+    for (ssize_t length = 0; (length = recv(media, buffer.data(), buffer.size(), MSG_DONTWAIT)) > 0; ++taken)
+      counter.take(buffer.data(), static_cast<std::size_t>(length));
+    return taken;
+  });
+}
+
+auto receiver_of(BareLoop loop) {
+  switch (loop) {
+    case BareLoop::kWaking:
+      return receive_waking;
+    case BareLoop::kNapping:
+      return receive_by_recvmmsg;
+    case BareLoop::kDraining:
+      return receive_by_recv;
   }
+  return receive_waking;
 }
 
 class BarePeer : public Peer {
@@ -133,8 +168,7 @@ class BarePeer : public Peer {
     std::vector<PictureCounter> counters(options_.streams);
     std::vector<std::thread> threads;
     for (std::size_t i = 0; i < options_.streams; ++i) {
-      threads.emplace_back(loop_ == BareLoop::kWaking ? receive_waking : receive_napping, sessions_[i].media,
-                           options_.pictures(), std::ref(counters[i]));
+      threads.emplace_back(receiver_of(loop_), sessions_[i].media, options_.pictures(), std::ref(counters[i]));
     }
     for (std::thread& thread : threads) thread.join();
     Received received;

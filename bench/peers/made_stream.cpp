@@ -109,7 +109,9 @@ MadeStream::MadeStream(const Options& options) {
   }
 }
 
-const Picture& MadeStream::picture(std::uint64_t number) const { return pictures_[number % kGroup]; }
+const Picture& MadeStream::picture(std::uint64_t number) const {
+  return pictures_[static_cast<std::size_t>(number % kGroup)];
+}
 
 std::string MadeStream::description() const {
   const std::string type = std::to_string(payload_type_);

@@ -104,6 +104,7 @@ std::unique_ptr<Peer> make_peer(const Options& options) {
   if (options.peer == "driver") return make_driver_peer(options);
   if (options.peer == "waking") return make_bare_peer(options, BareLoop::kWaking);
   if (options.peer == "napping") return make_bare_peer(options, BareLoop::kNapping);
+  if (options.peer == "draining") return make_bare_peer(options, BareLoop::kDraining);
   if (options.peer == "libavformat") return make_libavformat_peer(options);
   return nullptr;
 }

@@ -13,7 +13,7 @@ inline constexpr int kRtspPort = 554;
 inline constexpr int kHttpPort = 8080;
 
 struct Options {
-  std::string peer = "driver";  ///< driver, waking, napping, libavformat
+  std::string peer = "driver";  ///< driver, waking, napping, draining, libavformat
   std::string codec = "h264";   ///< h264, mpeg4, jpeg
   double megabits = 8;          ///< of one stream, a second
   double frames_per_second = 25;

@@ -33,7 +33,7 @@ class Peer {
 };
 
 std::unique_ptr<Peer> make_driver_peer(const Options& options);
-enum class BareLoop { kWaking, kNapping };
+enum class BareLoop { kWaking, kNapping, kDraining };
 std::unique_ptr<Peer> make_bare_peer(const Options& options, BareLoop loop);
 /// Null where the program was built without libavformat.
 std::unique_ptr<Peer> make_libavformat_peer(const Options& options);

@@ -11,8 +11,10 @@ constexpr int kOff = -1;
 constexpr int kHappened = -2;
 
 thread_local int allocations_left = kOff;
+thread_local int allocations_made = 0;
 
 void* allocate(std::size_t size) noexcept {
+  ++allocations_made;
   if (allocations_left == 0) {
     allocations_left = kHappened;
     return nullptr;
@@ -48,6 +50,10 @@ namespace vexa_test {
 AllocationFailure::AllocationFailure(int nth) { allocations_left = nth; }
 
 AllocationFailure::~AllocationFailure() { allocations_left = kOff; }
+
+AllocationCount::AllocationCount() : before_(allocations_made) {}
+
+int AllocationCount::so_far() const { return allocations_made - before_; }
 
 bool AllocationFailure::happened() const { return allocations_left == kHappened; }
 

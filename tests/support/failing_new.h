@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Lets allocations fail. A test program that uses it has its operator new replaced.
+// Lets allocations fail, and counts them. A test program that uses it has its operator new replaced.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -21,6 +21,16 @@ class AllocationFailure {
 
   /// Whether the failure has come.
   bool happened() const;
+};
+
+/// Counts the calling thread's allocations from its making on.
+class AllocationCount {
+ public:
+  AllocationCount();
+  int so_far() const;
+
+ private:
+  const int before_;
 };
 
 /// One attempt of fails_at_every_allocation.
