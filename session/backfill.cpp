@@ -83,6 +83,7 @@ class Backfill::Impl final : private CameraLine::Watcher {
     std::optional<Gap> opened;
     {
       const std::lock_guard<std::mutex> lock(mutex_);
+      if (over_) return;
       live_ = status.state == SessionState::kLive;
       // A session that is stopped is not an outage.
       const bool is_outage = !live_ && status.state != SessionState::kStopped;
