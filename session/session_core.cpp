@@ -507,17 +507,17 @@ int SessionCore::take_video() {
     }
     if (picture_.empty()) continue;  // one that was damaged
     ++pictures_;
-    made += show(frame, facts.discontinuity, now);
+    made += show(frame, facts, now);
   }
   return made;
 }
 
-int SessionCore::show(const SLibDVideoFrameInfo& frame, std::uint32_t discontinuity, Moment now) {
+int SessionCore::show(const SLibDVideoFrameInfo& frame, const FrameFacts& facts, Moment now) {
   machine_.picture(now);
   asked_ = false;
   int made = publish();
   const std::int32_t codec = codec_of(frame.frameType);
-  if ((codec_ >= 0 && codec_ != codec) || (discontinuity & kStreamChanges) != 0) {
+  if ((codec_ >= 0 && codec_ != codec) || (facts.discontinuity & kStreamChanges) != 0) {
     machine_.stream_changed(now);
     made += publish();
   }
@@ -531,6 +531,7 @@ int SessionCore::show(const SLibDVideoFrameInfo& frame, std::uint32_t discontinu
   shown.arrival = now.count();
   shown.isFirst = std::exchange(first_, false);
   shown.isKey = is_key(frame.frameType);
+  if ((facts.valid & FRAME_FACTS_SENDER_TIME) != 0) shown.cameraTime = facts.senderTime / 1000;
   if (callbacks_.frame && !stop_wanted_) made += call([&] { callbacks_.frame(*handle(), shown); });
   return made;
 }

@@ -17,6 +17,7 @@
 #include "session/core/session_machine.h"
 #include "session/credential_guard.h"
 #include "session/group_parts.h"
+#include "vexa/frame_facts.h"
 #include "vexa/session.h"
 
 namespace vexa {
@@ -99,7 +100,7 @@ class SessionCore final : public std::enable_shared_from_this<SessionCore>,
   int take_metadata(Moment now);
   int take_audio(Moment now);
   void lose(std::uint32_t stream, ELibDReturnCode code, Moment now);
-  int show(const SLibDVideoFrameInfo& frame, std::uint32_t discontinuity, Moment now);
+  int show(const SLibDVideoFrameInfo& frame, const FrameFacts& facts, Moment now);
 
   template <typename Call>
   int call(const Call& host);

@@ -38,6 +38,10 @@ void VirtualCamera::plug() {
   loop_->run([this] { core_->set_network(true); });
 }
 
+void VirtualCamera::set_clock(std::chrono::system_clock::time_point time) {
+  loop_->run([this, time] { core_->state()->set_clock(time); });
+}
+
 const std::string& VirtualCamera::address() const { return core_->state()->options.address; }
 
 std::uint16_t VirtualCamera::http_port() const { return core_->http_port(); }

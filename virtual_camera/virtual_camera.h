@@ -46,6 +46,10 @@ class VirtualCamera {
   void unplug();
   void plug();
 
+  // Sets its clock, as a power failure does that leaves it in 1970: for the card's recordings and the sender reports of
+  // streams that begin afterwards.
+  void set_clock(std::chrono::system_clock::time_point time);
+
   [[nodiscard]] const std::string& error() const { return error_; }
   [[nodiscard]] const std::string& address() const;
   [[nodiscard]] std::uint16_t http_port() const;  // valid after start()

@@ -41,6 +41,7 @@ struct RecordOptions {
   VideoOptions video;
   bool forever = false;
   bool strict = false;
+  bool backfill = false;
   bool quiet = false;
 };
 
@@ -138,13 +139,18 @@ class RecordCommand final : public Command {
                      "a file of its own for every so many seconds, with the time in its name; each begins with a key\n"
                      "picture")
         ->type_name("SECONDS");
+    command->add_flag("--backfill", options_.backfill,
+                      "fetch what the camera's card recorded during outages, into a file for each beside --out, named\n"
+                      "-gap with its time; what is not fetched yet is in a .journal and fetched by the next recording");
     command->add_flag("--strict", options_.strict, "end with exit code 6 when pictures were lost");
     add_video_options(*command, options_.video);
     command->add_flag("--quiet", options_.quiet, "show no progress");
     command->footer(
         "A recording begins with the first key frame and, without --seconds and --frames, ends with Ctrl-C.\n"
         "Every second of it is written at once: what is killed plays up to its last second.\n"
-        "With --forever, --segment or several cameras it lives through outages, and reports them on standard error.\n"
+        "With --forever, --segment, --backfill or several cameras it lives through outages, and reports them on "
+        "standard error.\n"
+        "With --backfill a recording ends when the outages before its end have been fetched, too.\n"
         "Drops are an estimate: frames expected at the rate that stream or camera state, less those received.");
     return command;
   }
@@ -153,7 +159,8 @@ class RecordCommand final : public Command {
     if (const auto problem = check(options_)) return terminal.report(*problem);
     if (options_.quiet) terminal.silence_progress();
     options_.camera.transport = transport_of(options_.video);
-    if (options_.forever || options_.segment || options_.cameras.size() != 1) return record_many(terminal);
+    if (options_.forever || options_.segment || options_.backfill || options_.cameras.size() != 1)
+      return record_many(terminal);
     const RecordingTarget target(out_of_one(), terminal.results(), options_.format);
     if (const auto problem = target.check()) return terminal.report(*problem);
     options_.camera.address = options_.cameras.front();
@@ -182,7 +189,7 @@ class RecordCommand final : public Command {
     limits.forever = options_.forever;
     const SessionRecordingOptions recording{options_.camera, *std::move(chosen), options_.video.stream,
                                             options_.out,    options_.format,    options_.segment,
-                                            limits,          options_.strict};
+                                            limits,          options_.strict,    options_.backfill};
     if (const auto problem = check(recording, terminal)) return terminal.report(*problem);
     return record_by_sessions(recording, terminal);
   }

@@ -16,6 +16,7 @@
 #include "host/cgi_log/cgi_log.h"
 #include "host/console/interrupt.h"
 #include "host/console/progress.h"
+#include "host/recording/gap_recording.h"
 #include "host/recording/recording_target.h"
 #include "host/words/stored_recordings.h"
 
@@ -28,11 +29,54 @@ using Clock = CameraRecording::Clock;
 constexpr std::string_view kCameraPlace = "{camera}";
 constexpr int kTurn = 100;  // milliseconds between two looks at limits and Ctrl-C
 
+RecordingFiles::Open opener(const SessionRecordingOptions& options, int standard_output) {
+  return [standard_output, format = options.format](const std::string& path) {
+    return RecordingTarget(path, standard_output, format).open();
+  };
+}
+
+double seconds_of(const Gap& gap) { return static_cast<double>(gap.end - gap.begin) / 1e6; }
+
+std::string gap_line(const std::string& camera, const Gap& gap) {
+  std::string line = fmt::format("{}: outage of {:.1f} s on its card: {}, {} frames", camera, seconds_of(gap),
+                                 word_of(gap.state), gap.pictures);
+  if (!gap.text.empty()) line += ", " + printable(gap.text);
+  return line;
+}
+
+Json json_of(const Gap& gap) {
+  Json missing = Json::array();
+  for (const GapStretch& stretch : gap.missing) {
+    missing.push_back({{"firstMicroseconds", stretch.begin}, {"lastMicroseconds", stretch.end}});
+  }
+  return {{"state", word_of(gap.state)}, {"firstMicroseconds", gap.begin}, {"lastMicroseconds", gap.end},
+          {"frames", gap.pictures},      {"missing", std::move(missing)},  {"text", gap.text}};
+}
+
 // One camera's part of the command.
 class CameraAtWork {
  public:
   CameraAtWork(const ChosenCamera& camera, const SessionRecordingOptions& options, int standard_output)
       : recording_(camera.name, files_of(camera, options, standard_output), options.limits) {}
+
+  // A journal's file, beside the recording's own.
+  void make_good_outages(const std::string& out, const RecordingFiles::Open& open, const SessionOptions& session) {
+    gaps_ = std::make_unique<GapRecording>(out, open);
+    BackfillOptions options;
+    options.journal = name_of_gaps(out) + ".journal";
+    backfill_ = std::make_unique<Backfill>(session, options, gaps_->callbacks());
+  }
+  [[nodiscard]] const GapRecording* gaps() const { return gaps_.get(); }
+  // One line for each gap that has ended meanwhile.
+  void report_gaps(Terminal& terminal) {
+    if (!gaps_) return;
+    for (const Gap& gap : gaps_->take_ended()) terminal.say(gap_line(recording_.name(), gap));
+  }
+  // When the group has been destroyed.
+  void end_backfill() {
+    backfill_.reset();
+    if (gaps_) gaps_->close();
+  }
 
   [[nodiscard]] bool begin(SessionGroup& group, const SessionOptions& session,
                            const std::function<void(const CameraRecording&)>& news) {
@@ -44,7 +88,7 @@ class CameraAtWork {
     callbacks.frame = [this](Session& own, const SessionFrame& frame) {
       recording_.take_picture(frame, counted(own), Clock::now());
     };
-    session_ = group.Open(session, callbacks);
+    session_ = group.Open(session, backfill_ ? backfill_->Watch(callbacks) : callbacks);
     return session_ != nullptr;
   }
 
@@ -53,6 +97,7 @@ class CameraAtWork {
     if (recording_.is_over()) return true;
     recording_.look(Clock::now());
     if (!interrupted && !recording_.wanted_end()) return false;
+    if (!interrupted && recording_.how() == RecordingEnd::kComplete && is_fetching()) return false;
     recording_.end(RecordingEnd::kInterrupted, counted(*session_), Clock::now());
     session_->Stop();
     return true;
@@ -61,14 +106,17 @@ class CameraAtWork {
   [[nodiscard]] const CameraRecording& recording() const { return recording_; }
 
  private:
+  // While the camera is there.
+  [[nodiscard]] bool is_fetching() const {
+    if (!backfill_ || !recording_.is_live()) return false;
+    const std::vector<Gap> gaps = backfill_->Gaps();
+    return std::any_of(gaps.begin(), gaps.end(), [](const Gap& gap) { return gap.state == GapState::kDue; });
+  }
   static RecordingFiles files_of(const ChosenCamera& camera, const SessionRecordingOptions& options,
                                  int standard_output) {
     std::optional<std::chrono::microseconds> segment;
     if (options.segment) segment = std::chrono::microseconds(std::llround(*options.segment * 1e6));
-    const auto open = [standard_output, format = options.format](const std::string& path) {
-      return RecordingTarget(path, standard_output, format).open();
-    };
-    return RecordingFiles(with_camera_name(options.out, camera.name), segment, open);
+    return RecordingFiles(with_camera_name(options.out, camera.name), segment, opener(options, standard_output));
   }
   static StreamStatistics counted(const Session& session) {
     StreamStatistics statistics;
@@ -77,6 +125,8 @@ class CameraAtWork {
   }
 
   CameraRecording recording_;
+  std::unique_ptr<GapRecording> gaps_;
+  std::unique_ptr<Backfill> backfill_;  // calls the gaps' recording
   std::shared_ptr<Session> session_;
 };
 
@@ -136,6 +186,9 @@ ExitCode summarise(const std::deque<CameraAtWork>& cameras, const SessionRecordi
   for (const CameraAtWork& camera : cameras) {
     text += line_of(camera.recording());
     list.push_back(json_of(camera.recording()));
+    if (camera.gaps() == nullptr) continue;
+    Json& gaps = list.back()["gaps"] = Json::array();
+    for (const Gap& gap : camera.gaps()->ended()) gaps.push_back(json_of(gap));
   }
   if (options.camera.json) text = to_text(list);
   if (options.out != "-") return write_result(terminal, text);
@@ -151,9 +204,12 @@ ExitCode judge(const std::deque<CameraAtWork>& cameras, bool strict, Terminal& t
   for (const CameraAtWork& camera : cameras) {
     const CameraRecording& recording = camera.recording();
     whole = whole && !recording.lost().any() && recording.outages() == 0;
-    if (!recording.problem()) continue;
-    const ExitCode reported = terminal.report(*recording.problem());
-    if (code == ExitCode::kOk) code = reported;
+    const auto of_gaps = camera.gaps() != nullptr ? camera.gaps()->problem() : std::nullopt;
+    for (const std::optional<Problem>& problem : {recording.problem(), of_gaps}) {
+      if (!problem) continue;
+      const ExitCode reported = terminal.report(*problem);
+      if (code == ExitCode::kOk) code = reported;
+    }
   }
   return code == ExitCode::kOk && strict && !whole ? ExitCode::kIncomplete : code;
 }
@@ -182,6 +238,9 @@ std::optional<Problem> check(const SessionRecordingOptions& options, const Termi
   if (options.cameras.size() > 1 && options.out.find(kCameraPlace) == std::string::npos) {
     return usage("--out names one file for several cameras", "For instance: --out {camera}.mp4.");
   }
+  if (options.out == "-" && options.backfill) {
+    return usage("--backfill writes files of its own, beside --out", "Give --out a file's name.");
+  }
   std::set<std::string> names;
   for (const ChosenCamera& camera : options.cameras) {
     const std::string out = with_camera_name(options.out, camera.name);
@@ -198,12 +257,15 @@ ExitCode record_by_sessions(const SessionRecordingOptions& options, Terminal& te
   std::deque<CameraAtWork> cameras;
   SessionNews news(terminal);
   // Without threads of its own, so that all of it happens here; destroyed first, as it calls the others.
-  SessionGroup group(without_threads());
+  std::optional<SessionGroup> group(std::in_place, without_threads());
   for (const ChosenCamera& camera : options.cameras) {
     SessionOptions session = session_options(camera, options.camera, options.stream);
     session.cgiLog = with_camera_name(session.cgiLog, camera.name);
     CameraAtWork& work = cameras.emplace_back(camera, options, terminal.results());
-    if (!work.begin(group, session, [&news](const CameraRecording& own) { news.show(own.name(), own.status()); })) {
+    if (options.backfill) {
+      work.make_good_outages(with_camera_name(options.out, camera.name), opener(options, terminal.results()), session);
+    }
+    if (!work.begin(*group, session, [&news](const CameraRecording& own) { news.show(own.name(), own.status()); })) {
       return terminal.report(no_session());
     }
   }
@@ -213,10 +275,16 @@ ExitCode record_by_sessions(const SessionRecordingOptions& options, Terminal& te
     const auto over =
         std::count_if(cameras.begin(), cameras.end(), [&](CameraAtWork& c) { return c.look(interrupted); });
     if (static_cast<std::size_t>(over) == cameras.size()) break;
-    group.Process(kTurn);
+    group->Process(kTurn);
+    for (CameraAtWork& camera : cameras) camera.report_gaps(terminal);
     progress.show([&] { return progress_line(cameras, Clock::now()); });
   }
   terminal.progress("closing the sessions");
+  group.reset();
+  for (CameraAtWork& camera : cameras) {
+    camera.end_backfill();
+    camera.report_gaps(terminal);
+  }
   const ExitCode written = summarise(cameras, options, terminal);
   const ExitCode code = judge(cameras, options.strict, terminal);
   if (Interrupt::requested()) {

@@ -22,6 +22,7 @@ struct SessionRecordingOptions {
   std::optional<double> segment;  // seconds
   CameraRecording::Limits limits;
   bool strict = false;
+  bool backfill = false;  // what the cameras' cards recorded during outages, too
 };
 
 // The text with the name, fit for a file's, in each place of "{camera}".

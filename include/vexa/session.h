@@ -98,6 +98,8 @@ struct SessionFrame {
   std::int64_t arrival = 0;  ///< milliseconds on CLOCK_MONOTONIC, when the session took it
   bool isFirst = false;      ///< of a connection: pictures may be missing before it
   bool isKey = false;        ///< can be decoded without those before
+  /// When it was taken, by the camera's clock: microseconds since 1970, from its sender reports. 0: not known.
+  std::int64_t cameraTime = 0;
 };
 
 /// What a host is called with. Each may be left empty; what it would have been called with is taken and forgotten.

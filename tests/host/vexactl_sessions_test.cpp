@@ -4,6 +4,7 @@
 #include <nlohmann/json.hpp>
 
 #include "tests/host/camera_fixture.h"
+#include "tests/host/json_schema.h"
 
 namespace vexa_test {
 namespace {
@@ -86,6 +87,7 @@ TEST_F(CamerasOfAFile, MistakesAreRefusedBeforeACameraIsAsked) {
       {{"record", "a", "b", "--out", "live.h264"}, "vexactl: --out names one file for several cameras\n"},
       {{"record", "a", "b", "--out", "-"}, "vexactl: standard output takes one recording of one camera\n"},
       {{"record", "a", "--out", "-", "--segment", "5"}, "vexactl: standard output takes one recording of one camera\n"},
+      {{"record", "a", "--out", "-", "--backfill"}, "vexactl: --backfill writes files of its own, beside --out\n"},
       {{"record", "a", "--out", "a.h264", "--segment", "0"},
        "vexactl: --segment is not a number of seconds from 1 on\n"},
       {{"record", "a", "--out", "a.xyz", "--forever"}, "vexactl: the end of a.xyz names no format of video\n"},
@@ -139,6 +141,51 @@ TEST_F(CamerasOfAFile, ARecordingLivesThroughAnOutage) {
   EXPECT_GE(json[0]["outages"], 1);
   EXPECT_GT(json[0]["outageSeconds"], 0);
   EXPECT_THAT(result.err, testing::HasSubstr(place() + ": Live.\n"));
+  expect_no_password(result);
+}
+
+TEST_F(CamerasOfAFile, WhatTheCardRecordedDuringAnOutageIsFetchedIntoAFileOfItsOwn) {
+  CameraOptions with_card;
+  with_card.card_bytes = 64U << 20U;
+  with_card.sender_reports.every = 1;
+  start_camera(with_card);
+  camera().settings().set("edgestorage", "Edgestorage", "on");
+  camera().settings().set("edgestorage", "EsRec1", "image1,off");
+  camera().settings().set("edgestorage", "EsAlmRec1Time", "0,0");
+  camera().settings().set("edgestorage", "EsAlmRec1WatchAddress", "10.0.0.1");
+  ProgramRun program(folder(),
+                     vexactl({"record", place(), "--timeout", "500", "--forever", "--backfill", "--frames", "60",
+                              "--out", "live.h264", "--json"}),
+                     kCredentials);
+  ASSERT_TRUE(eventually([this] { return size_of("live.h264") > 0; }));
+  camera().unplug();
+  ASSERT_TRUE(eventually([this] {
+    const auto recordings = camera().card().recordings();
+    const bool recorded = !recordings->empty() && recordings->front().pictures.size() > 10;
+    return recorded && file(".err").find("attempt") != std::string::npos;
+  }));
+  camera().plug();
+  const ProgramResult result = program.wait();
+  EXPECT_EQ(result.exit_code, 0) << result.err;
+  const auto json = nlohmann::json::parse(result.out, nullptr, false);
+  ASSERT_EQ(json.size(), 1U) << result.out;
+  EXPECT_EQ(json[0]["frames"], 60);
+  EXPECT_EQ(JsonSchema().violation(result.out, "recordMany"), "");
+  int frames = 0;
+  for (const auto& gap : json[0]["gaps"]) frames += gap["frames"].get<int>();
+  EXPECT_GT(frames, 0) << result.out;
+  EXPECT_THAT(result.err, testing::HasSubstr(" on its card: "));
+  // What the camera recorded, without a break.
+  std::string held;
+  const auto recordings = camera().card().recordings();
+  for (const auto& picture : recordings->front().pictures) held += *picture.bytes;
+  const std::vector<std::string> names = files_like("live-gap-");
+  EXPECT_FALSE(names.empty());
+  for (const std::string& name : names) {
+    EXPECT_FALSE(file(name).empty()) << name;
+    EXPECT_NE(held.find(file(name)), std::string::npos) << name;
+  }
+  EXPECT_TRUE(std::filesystem::exists(folder() / "live-gap.h264.journal"));
   expect_no_password(result);
 }
 

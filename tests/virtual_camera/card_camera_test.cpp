@@ -97,6 +97,20 @@ TEST_F(CardCamera, DoesNotRecordWhileStorageIsOff) {
   EXPECT_TRUE(camera_.card().recordings()->empty());
 }
 
+TEST_F(CardCamera, ItsRecordingsHaveTheTimeThatItsClockShows) {
+  get(kStorageOn);
+  EXPECT_EQ(control("/clock/5"), "HTTP/1.0 204 No Content\r\n\r\n");
+  for (const char* path : {"/clock/", "/clock/-1", "/clock/4102444801", "/clock/5s"}) {
+    EXPECT_EQ(control(path).substr(0, 12), "HTTP/1.0 404") << path;
+  }
+  camera_.unplug();
+  ASSERT_TRUE(vexa_test::eventually([this] { return pictures_stored() > 0; }));
+  const auto start = camera_.card().recordings()->front().head.start;
+  EXPECT_GE(start, std::chrono::seconds(5));
+  EXPECT_LT(start, std::chrono::hours(1));
+  camera_.plug();
+}
+
 TEST_F(CardCamera, RecordsOnForTheTimeSetAfterItsNetworkIsBack) {
   get("/command/edgestorage.cgi?Edgestorage=on&EsRec1=image1,off&EsAlmRec1Time=0,600&EsAlmRec1WatchAddress=a");
   camera_.unplug();

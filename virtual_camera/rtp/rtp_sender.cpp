@@ -34,7 +34,7 @@ void RtpSender::play(Play play) {
   stream_.emplace(std::move(play.source), *options_, play.faults, RtpStream::Identity{session_, play.seed});
   impairment_.emplace(std::move(play.faults), play.seed);
   started_ = Clock::now() + play.pause;
-  reports_.emplace(options_->sender_reports, std::chrono::system_clock::now().time_since_epoch() + play.pause);
+  reports_.emplace(options_->sender_reports, play.now.time_since_epoch() + play.pause);
   wait_for_next();
 }
 

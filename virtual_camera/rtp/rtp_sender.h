@@ -33,7 +33,8 @@ class RtpSender : public std::enable_shared_from_this<RtpSender> {
     std::function<std::string()> user_data;  // of a picture that leaves now; not empty
     PacketFaults faults;
     std::uint64_t seed = 1;
-    std::chrono::milliseconds pause{0};  // before the first picture
+    std::chrono::milliseconds pause{0};                                            // before the first picture
+    std::chrono::system_clock::time_point now = std::chrono::system_clock::now();  // by the camera's clock
   };
 
   // The port is open. The context outlives the sender.

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "virtual_camera/server/camera_control.h"
 
+#include <cstdint>
 #include <utility>
 #include <vector>
 
@@ -26,6 +27,7 @@ constexpr std::string_view kList =
     "/walk, /walk/SECONDS                        an intruder walks through the picture\n"
     "/network/unplug, /network/plug              the network cable\n"
     "/reboot, /reboot/SECONDS                    the camera reboots, and is back after 5 seconds or so many\n"
+    "/clock/SECONDS                              the camera's clock shows this time, in seconds since 1970 UTC\n"
     "/faults/packets?loss=0.01&reorder=0.1       these faults of RTP packets and no others, from now on\n"
     "/faults/request/slow-answer?match=PLAY&value=500\n"
     "                                            a fault of requests that contain \"PLAY\" (PLAY%232: of the second)\n"
@@ -79,6 +81,16 @@ std::optional<std::chrono::seconds> seconds_of(std::string_view path, std::strin
   const std::optional<int> seconds = whole_number(steps[1]);
   if (!seconds || *seconds < 1 || *seconds > kLongest) return std::nullopt;
   return std::chrono::seconds(*seconds);
+}
+
+// "/clock/SECONDS", as far as the texts of a card's recordings can express it.
+std::optional<std::chrono::system_clock::time_point> time_of(std::string_view path) {
+  constexpr std::int64_t kLatest = 4102444800;  // the year 2100
+  constexpr std::string_view kClock = "/clock/";
+  if (!path.starts_with(kClock)) return std::nullopt;
+  const std::optional<std::int64_t> seconds = whole_number<std::int64_t>(path.substr(kClock.size()));
+  if (!seconds || *seconds < 0 || *seconds > kLatest) return std::nullopt;
+  return std::chrono::system_clock::time_point(std::chrono::seconds(*seconds));
 }
 
 }  // namespace
@@ -136,6 +148,10 @@ std::string_view CameraControl::obey(std::string_view path, std::string_view que
   if (const auto time = control_walk(path)) {
     const std::chrono::duration<double, std::milli> at_pace = *time / state_->options.speed;
     watch_->walk(std::chrono::duration_cast<std::chrono::milliseconds>(at_pace));
+    return kDone;
+  }
+  if (const auto time = time_of(path)) {
+    state_->set_clock(*time);
     return kDone;
   }
   if (path == "/faults/clear") {

@@ -64,4 +64,12 @@ std::size_t CameraState::viewers() {
   return sessions.size() + picture_streams.size();
 }
 
+std::chrono::system_clock::time_point CameraState::wall_clock() const {
+  return std::chrono::system_clock::now() + clock_ahead;
+}
+
+void CameraState::set_clock(std::chrono::system_clock::time_point time) {
+  clock_ahead = time - std::chrono::system_clock::now();
+}
+
 }  // namespace vexa::camera

@@ -54,6 +54,12 @@ struct CameraState {
   // Hosts that watch: RTSP sessions, and picture streams over HTTP.
   [[nodiscard]] std::size_t viewers();
 
+  // The time that the camera's clock shows.
+  [[nodiscard]] std::chrono::system_clock::time_point wall_clock() const;
+
+  // For recordings and streams that begin afterwards.
+  void set_clock(std::chrono::system_clock::time_point time);
+
   CameraOptions options;      // unchanged once the camera runs
   std::string profile_error;  // why the options' profile could not be loaded; empty: it was, or there is none
   asio::io_context& context;
@@ -72,6 +78,8 @@ struct CameraState {
   SentLog sent;
   RequestFaultList request_faults;
   PacketFaultBox packet_faults;
+
+  std::chrono::system_clock::duration clock_ahead{0};  // of this machine's clock
 
   std::vector<std::weak_ptr<Connection>> connections;
   std::map<std::uint32_t, std::shared_ptr<RtspSession>> sessions;

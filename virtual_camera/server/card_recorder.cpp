@@ -25,16 +25,16 @@ std::chrono::steady_clock::duration paced(Duration time, double speed) {
       std::chrono::duration<double>(std::chrono::duration<double>(time) / speed));
 }
 
-RecordingHead head_of(const SettingsStore& settings, int image, const SourceFormat& format) {
+RecordingHead head_of(const CameraState& state, int image, const SourceFormat& format) {
   RecordingHead head;
   head.codec = format.codec;
   head.frame_rate = static_cast<int>(std::lround(format.frames_per_second));
-  if (const auto stream = stream_settings(settings, image)) {
+  if (const auto stream = stream_settings(state.settings, image)) {
     head.size = std::to_string(stream->width) + "," + std::to_string(stream->height);
     head.bit_rate = stream->bit_rate;
     head.quality = stream->quality;
   }
-  head.start = in_tenths_of_milliseconds(std::chrono::system_clock::now().time_since_epoch());
+  head.start = in_tenths_of_milliseconds(state.wall_clock().time_since_epoch());
   return head;
 }
 
@@ -87,7 +87,7 @@ void CardRecorder::stop() {
 void CardRecorder::begin(int image) {
   std::optional<StreamPlan> plan = state_->sources.plan(image);
   if (!plan || !plan->source) return;
-  if (state_->card.begin(head_of(state_->settings, image, plan->source->format())).empty()) return;
+  if (state_->card.begin(head_of(*state_, image, plan->source->format())).empty()) return;
   source_ = std::move(plan->source);
   ++made_;
   began_ = std::chrono::steady_clock::now();

@@ -38,6 +38,7 @@ void RtspSession::play() {
   play.faults = state_->packet_faults.get();
   play.seed = state_->options.seed + kSeedStep * state_->plays++;
   play.pause = pause_;
+  play.now = state_->wall_clock();
   sender_->play(std::move(play));
 }
 
