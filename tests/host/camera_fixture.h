@@ -6,8 +6,10 @@
 #include <gtest/gtest.h>
 
 #include <cstdint>
+#include <filesystem>
 #include <memory>
 #include <string>
+#include <system_error>
 #include <utility>
 #include <vector>
 
@@ -53,6 +55,13 @@ class WithCamera : public testing::Test {
 
   ProgramResult run(std::vector<std::string> arguments, std::vector<std::string> environment = kCredentials) {
     return ProgramRun(folder_, vexactl(std::move(arguments)), std::move(environment)).wait();
+  }
+
+  // Whether a program has written something to this file: what it opens, it may have yet to fill.
+  [[nodiscard]] bool has_bytes(const std::string& name) const {
+    std::error_code error;
+    const std::uintmax_t size = std::filesystem::file_size(folder_ / name, error);
+    return !error && size > 0;
   }
 
   // The first `count` pictures of a stream, as the driver delivers them.

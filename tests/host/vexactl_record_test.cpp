@@ -103,7 +103,7 @@ TEST_F(RecordCommand, CtrlCEndsARecordingCleanly) {
     SCOPED_TRACE(signal);
     start_camera();
     ProgramRun program(folder(), vexactl({"record", place(), "--out", "live.h264", "--json"}), kCredentials);
-    ASSERT_TRUE(eventually([this] { return std::filesystem::exists(folder() / "live.h264"); }));
+    ASSERT_TRUE(eventually([this] { return has_bytes("live.h264"); }));
     program.signal(signal);
     const ProgramResult result = program.wait();
     EXPECT_EQ(result.exit_code, 130);
@@ -111,7 +111,7 @@ TEST_F(RecordCommand, CtrlCEndsARecordingCleanly) {
     const auto json = nlohmann::json::parse(result.out, nullptr, false);
     EXPECT_EQ(json["end"], "interrupted");
     EXPECT_TRUE(contents_of(folder() / "live.h264") == pictures(json["frames"]));
-    EXPECT_EQ(camera().journal().count("TEARDOWN"), 1u);
+    EXPECT_TRUE(camera().journal().wait_for_count("TEARDOWN", 1, std::chrono::seconds(30)));
     std::filesystem::remove(folder() / "live.h264");
   }
 }
@@ -132,7 +132,7 @@ TEST_F(RecordCommand, ASecondCtrlCDoesNotWaitForTheCamera) {
   start_camera();
   camera().add_request_fault(RequestFault::no_answer("TEARDOWN"));
   ProgramRun program(folder(), vexactl({"record", place(), "--out", "live.h264"}), kCredentials);
-  ASSERT_TRUE(eventually([this] { return std::filesystem::exists(folder() / "live.h264"); }));
+  ASSERT_TRUE(eventually([this] { return has_bytes("live.h264"); }));
   program.signal(SIGINT);
   ASSERT_TRUE(camera().journal().wait_for_count("TEARDOWN", 1, std::chrono::seconds(30)));
   program.signal(SIGINT);
@@ -272,7 +272,7 @@ TEST_F(RecordCommand, CountsPicturesThatALossHasCost) {
   const auto json = nlohmann::json::parse(result.out, nullptr, false);
   // Picture 10 is lost, and all up to the next key picture, 25, with it.
   EXPECT_GE(json["missingFramesEstimate"], 14);
-  EXPECT_LE(json["missingFramesEstimate"], 16);
+  EXPECT_EQ(json["missingFramesEstimate"], json["expectedFrames"].get<int>() - 40);
 }
 
 }  // namespace
