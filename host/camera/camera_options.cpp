@@ -58,7 +58,7 @@ std::optional<Problem> check_stream(int stream) {
   return usage(fmt::format("--stream is not a number from 1 to {}", kMostStreams), "1 is the camera's first stream.");
 }
 
-Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal) {
+Result<CameraConnection> connection_of(const CameraOptions& options, Terminal& terminal) {
   if (options.timeout_ms < 1 || options.timeout_ms > kLongestTimeout) {
     return fail(usage(fmt::format("--timeout is not a number from 1 to {}", kLongestTimeout),
                       "It is in milliseconds; 5000 when not given."));
@@ -68,12 +68,18 @@ Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal)
   const Result<Credentials> credentials = load_credentials(options.credentials);
   if (!credentials) return fail(credentials.error());
   CameraConnection connection{*address, *credentials, options.timeout_ms, options.transport, options.cgi_log};
-  if (const auto problem = check_name(connection.address)) return fail(*problem);
   if (connection.cgi_log) {
     if (const auto problem = check_cgi_log_target(*connection.cgi_log)) return fail(*problem);
   }
   if (options.trace) connection.trace = shown_trace(terminal, Redactor(connection.credentials));
-  return OpenCamera{connection.address, std::make_unique<LiveCamera>(connection)};
+  return connection;
+}
+
+Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal) {
+  const Result<CameraConnection> connection = connection_of(options, terminal);
+  if (!connection) return fail(connection.error());
+  if (const auto problem = check_name(connection->address)) return fail(*problem);
+  return OpenCamera{connection->address, std::make_unique<LiveCamera>(*connection)};
 }
 
 }  // namespace vexa::host

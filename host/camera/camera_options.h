@@ -44,6 +44,9 @@ struct ModelOptions {
 // The same, with those that name the camera's profile and video stream.
 void add_model_options(CLI::App& command, ModelOptions& options, const char* const* environment);
 
+// The connection that the options state, their mistakes found. Asks no name server, and no camera.
+[[nodiscard]] Result<CameraConnection> connection_of(const CameraOptions& options, Terminal& terminal);
+
 // A driver that knows its camera; no camera has been contacted yet.
 struct OpenCamera {
   CameraAddress address;
