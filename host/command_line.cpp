@@ -21,6 +21,7 @@ constexpr char kDescription[] = "vexactl: drives a network camera from the comma
 constexpr char kFooter[] = R"(
 Start here:
   vexactl info 192.168.0.100 --credentials camera.cred
+  vexactl doctor 192.168.0.100 --credentials camera.cred
   vexactl record 192.168.0.100 --credentials camera.cred --seconds 10 --out live.mkv
   vexactl record --cameras cameras.json --forever --segment 600 --out {camera}.mp4
   vexactl stats --cameras cameras.json --watch
@@ -64,6 +65,8 @@ std::vector<std::unique_ptr<Command>> all_commands() {
   commands.push_back(make_exposure_command());
   commands.push_back(make_daynight_command());
   commands.push_back(make_profile_command());
+  commands.push_back(make_doctor_command());
+  commands.push_back(make_serve_command());
   commands.push_back(make_ptz_command());
   commands.push_back(make_preset_command());
   commands.push_back(make_tour_command());

@@ -24,8 +24,10 @@ using Json = nlohmann::json;
 constexpr std::size_t kLargestFile = std::size_t{4} << 20U;
 constexpr std::size_t kLongestName = 64;
 constexpr std::size_t kLongestShown = 32;
+constexpr int kMostStreams = 16;
 constexpr char kAdvice[] = R"(A file of cameras is {"cameras": [{"name": "gate", "address": "192.168.0.100"}]}.)";
-constexpr char kKeys[] = "Its keys are name, address, profile, credentials, userVariable and passwordVariable.";
+constexpr char kKeys[] =
+    "Its keys are name, address, profile, tileStream, credentials, userVariable and passwordVariable.";
 
 Result<std::string> read_text(const std::string& path) {
   const UniqueFd file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
@@ -95,7 +97,8 @@ class Reader final : public nlohmann::json_sax<Json> {
       return refuse_key("does not belong into this file",
                         "Name a file as credentials, or variables of the environment.");
     }
-    return slot(name) != nullptr || name == "address" ? true : refuse_key("is not a key of a camera", kKeys);
+    const bool known = slot(name) != nullptr || name == "tileStream" || name == "address";
+    return known || refuse_key("is not a key of a camera", kKeys);
   }
   bool string(std::string& text) override {
     if (place_ != Place::kCamera) return refuse_value();
@@ -113,7 +116,14 @@ class Reader final : public nlohmann::json_sax<Json> {
     *into = into == &camera_.credentials_file && text.front() != '/' ? folder_ + text : text;
     return true;
   }
-  bool number_unsigned(std::uint64_t /*number*/) override { return refuse_value(); }
+  bool number_unsigned(std::uint64_t number) override {
+    if (place_ != Place::kCamera || key_ != "tileStream") return refuse_value();
+    if (number < 1 || number > kMostStreams) {
+      return refuse_key(fmt::format("is not a number from 1 to {}", kMostStreams), "1 is the camera's first stream.");
+    }
+    camera_.tile_stream = static_cast<int>(number);
+    return true;
+  }
   bool number_integer(std::int64_t /*number*/) override { return refuse_value(); }
   bool number_float(double /*number*/, const std::string& /*text*/) override { return refuse_value(); }
   bool boolean(bool /*value*/) override { return refuse_value(); }
@@ -144,7 +154,9 @@ class Reader final : public nlohmann::json_sax<Json> {
   bool refuse_value() {
     if (key_.empty()) return stop(at(line_, "a value stands where it does not belong", kAdvice));
     if (place_ == Place::kCameras) return stop(at(line_, "what \"cameras\" lists is not a camera in braces", kAdvice));
-    const char* const kind = key_ == "cameras" ? "is not a list" : "is not a text";
+    const char* const kind = key_ == "tileStream" ? "is not a whole number"
+                             : key_ == "cameras"  ? "is not a list"
+                                                  : "is not a text";
     return refuse_key(kind, kAdvice);
   }
   bool take_address(const std::string& text) {

@@ -20,6 +20,7 @@ struct FileCamera {
   std::string name;                                   // "name", unique in the file, up to 64 printable characters
   CameraAddress address;                              // "address", HOST or HOST:PORT
   std::optional<std::string> profile = {};            // "profile", a name or a file; else that of the reported model
+  std::optional<int> tile_stream = {};                // "tileStream", 1 to 16: of JPEG, which the page's tiles show
   std::optional<std::string> credentials_file = {};   // "credentials", from the folder of the file of cameras
   std::optional<std::string> user_variable = {};      // "userVariable"; with it "passwordVariable"
   std::optional<std::string> password_variable = {};  // "passwordVariable"

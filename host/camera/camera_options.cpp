@@ -30,7 +30,7 @@ Result<ChosenCamera> at_address(const std::string& text, const CameraOptions& op
 Result<ChosenCamera> of_file(const CameraFile& file, const FileCamera& camera, const CameraOptions& options) {
   const Result<Credentials> credentials = file.credentials_of(camera, options.credentials, options.environment);
   if (!credentials) return fail(credentials.error());
-  return ChosenCamera{camera.name, camera.address, *credentials, camera.profile};
+  return ChosenCamera{camera.name, camera.address, *credentials, camera.profile, camera.tile_stream};
 }
 
 // All cameras of the file, or the one of that name.
@@ -143,19 +143,30 @@ Result<std::vector<ChosenCamera>> choose_cameras(const CameraOptions& options, c
   return chosen;
 }
 
-Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal) {
+Result<ChosenCamera> choose_camera(const CameraOptions& options) {
   if (auto problem = check_camera_options(options)) return fail(*std::move(problem));
-  const Result<std::vector<ChosenCamera>> chosen = choose_cameras(options, {options.address});
+  Result<std::vector<ChosenCamera>> chosen = choose_cameras(options, {options.address});
   if (!chosen) return fail(chosen.error());
-  const ChosenCamera& camera = chosen->front();
+  return std::move(chosen->front());
+}
+
+Result<CameraConnection> connection_to(const ChosenCamera& camera, const CameraOptions& options, Terminal& terminal) {
   CameraConnection connection{camera.address, camera.credentials, options.timeout_ms, options.transport,
                               options.cgi_log};
-  if (const auto problem = check_name(connection.address)) return fail(*problem);
   if (connection.cgi_log) {
     if (const auto problem = check_cgi_log_target(*connection.cgi_log)) return fail(*problem);
   }
   if (options.trace) connection.trace = shown_trace(terminal, Redactor(connection.credentials));
-  return OpenCamera{connection.address, camera.profile, std::make_unique<LiveCamera>(connection)};
+  return connection;
+}
+
+Result<OpenCamera> open_camera(const CameraOptions& options, Terminal& terminal) {
+  const Result<ChosenCamera> camera = choose_camera(options);
+  if (!camera) return fail(camera.error());
+  if (const auto problem = check_name(camera->address)) return fail(*problem);
+  const Result<CameraConnection> connection = connection_to(*camera, options, terminal);
+  if (!connection) return fail(connection.error());
+  return OpenCamera{connection->address, camera->profile, std::make_unique<LiveCamera>(*connection)};
 }
 
 }  // namespace vexa::host

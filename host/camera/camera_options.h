@@ -56,14 +56,20 @@ struct ChosenCamera {
   CameraAddress address;
   Credentials credentials;
   std::optional<std::string> profile = {};  // of the file
+  std::optional<int> tile_stream = {};      // of the file
 };
 
 // Those named, once each; all of the file where none is named.
 [[nodiscard]] Result<std::vector<ChosenCamera>> choose_cameras(const CameraOptions& options,
                                                                const std::vector<std::string>& names);
+// The one that the options name, their mistakes found. Asks no name server, and no camera.
+[[nodiscard]] Result<ChosenCamera> choose_camera(const CameraOptions& options);
 
 // A mistake in the options other than the camera's own.
 [[nodiscard]] std::optional<Problem> check_camera_options(const CameraOptions& options);
+
+[[nodiscard]] Result<CameraConnection> connection_to(const ChosenCamera& camera, const CameraOptions& options,
+                                                     Terminal& terminal);
 
 // A driver that knows its camera; no camera has been contacted yet.
 struct OpenCamera {

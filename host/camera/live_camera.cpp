@@ -101,6 +101,13 @@ Result<LiveCamera::Identity> LiveCamera::identify(int stream) {
   return identity;
 }
 
+Result<std::size_t> LiveCamera::inquire(const std::string& section) {
+  std::string answer;
+  const ELibDReturnCode result = SendInqCommand(section, answer);
+  if (result != LIBD_OK) return fail(explain(result));
+  return answer.size();
+}
+
 Result<CardMode> LiveCamera::card_mode() {
   std::string answer;
   const ELibDReturnCode result = SendInqCommand("edgestorage", answer);

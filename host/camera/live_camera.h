@@ -69,6 +69,9 @@ class LiveCamera final : public CVexaCommon {
   // Reads the camera's identity and the stream's settings, and selects the stream and its codec.
   [[nodiscard]] Result<Identity> identify(int stream);
 
+  // Inquires a section; the bytes of its answer.
+  [[nodiscard]] Result<std::size_t> inquire(const std::string& section);
+
   // Asks the camera: the driver's own record holds only a mode that this driver has set.
   [[nodiscard]] Result<CardMode> card_mode();
 

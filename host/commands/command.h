@@ -41,6 +41,8 @@ std::unique_ptr<Command> make_daynight_command();
 std::unique_ptr<Command> make_codecs_command();
 std::unique_ptr<Command> make_exposure_command();
 std::unique_ptr<Command> make_profile_command();
+std::unique_ptr<Command> make_doctor_command();
+std::unique_ptr<Command> make_serve_command();
 std::unique_ptr<Command> make_io_command();
 std::unique_ptr<Command> make_output_command();
 std::unique_ptr<Command> make_watch_command();

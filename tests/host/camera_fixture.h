@@ -29,10 +29,15 @@ inline const std::vector<std::string> kCredentials = {"VEXACTL_USER=operator", "
 class WithCamera : public testing::Test {
  protected:
   void start_camera(vexa::camera::CameraOptions options = {}) {
+    if (options.clip_path.empty()) options.clip_path = VEXA_CLIPS "/small.h264";
+    start_as_set(std::move(options));
+  }
+
+  // A camera that streams what its settings state, where it has a profile and no clip.
+  void start_as_set(vexa::camera::CameraOptions options) {
     options.address = own_loopback(1);
     options.user = kUser;
     options.password = kPassword;
-    if (options.clip_path.empty()) options.clip_path = VEXA_CLIPS "/small.h264";
     camera_ = std::make_unique<vexa::camera::VirtualCamera>(options);
     ASSERT_TRUE(camera_->start()) << camera_->error();
     place_ = options.address + ":" + std::to_string(camera_->http_port());

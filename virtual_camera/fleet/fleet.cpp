@@ -56,6 +56,17 @@ std::string write_file(const std::string& path, std::string_view text) {
   return whole ? "" : fmt::format("cannot write {}: {}", path, std::generic_category().message(error));
 }
 
+// The first stream that is set to JPEG, which pages show without decoding; nullopt where a clip decides, or none is.
+std::optional<int> jpeg_stream(const FleetCamera& camera, const SettingsStore& settings) {
+  constexpr int kMostStreams = 4;
+  if (!camera.options.profile || camera.options.clip || !camera.options.clip_path.empty()) return std::nullopt;
+  for (int number = 1; number <= kMostStreams; ++number) {
+    const auto stream = stream_settings(settings, number);
+    if (stream && stream->codec == Codec::kJpeg) return number;
+  }
+  return std::nullopt;
+}
+
 std::string_view file_name(std::string_view path) { return path.substr(path.rfind('/') + 1); }
 
 Json described(const FleetCamera& entry, VirtualCamera& camera) {
@@ -139,6 +150,7 @@ std::string Fleet::write_cameras_file(const std::string& path) {
     Json entry = {{"name", camera.name},
                   {"address", fmt::format("{}:{}", host_.camera(i).address(), host_.camera(i).http_port())}};
     if (!camera.profile.empty()) entry["profile"] = camera.profile;
+    if (const auto stream = jpeg_stream(camera, host_.camera(i).settings())) entry["tileStream"] = *stream;
     const auto user = std::pair(camera.options.user, camera.options.password);
     if (!user.first.empty() || !user.second.empty()) {
       std::string& file = credentials[user];

@@ -15,7 +15,7 @@ using vexa_test::TemporaryFolder;
 
 constexpr char kTwo[] = R"({"cameras": [
   {"name": "gate", "address": "192.168.0.100"},
-  {"name": "yard 2", "address": "yard:8080", "profile": "LMX-P200",
+  {"name": "yard 2", "address": "yard:8080", "profile": "LMX-P200", "tileStream": 3,
    "userVariable": "YARD_USER", "passwordVariable": "YARD_PASSWORD"}
 ]})";
 
@@ -38,12 +38,14 @@ TEST(CameraFile, HasItsCamerasInOrder) {
   EXPECT_EQ(gate.name, "gate");
   EXPECT_EQ(to_string(gate.address), "192.168.0.100:80");
   EXPECT_EQ(gate.profile, std::nullopt);
+  EXPECT_EQ(gate.tile_stream, std::nullopt);
   EXPECT_EQ(gate.line, 2);
   const FileCamera& yard = file->cameras()[1];
   EXPECT_EQ(yard.name, "yard 2");
   EXPECT_EQ(to_string(yard.address), "yard:8080");
   EXPECT_EQ(yard.profile, "LMX-P200");
   EXPECT_EQ(yard.user_variable, "YARD_USER");
+  EXPECT_EQ(yard.tile_stream, 3);
   EXPECT_EQ(yard.line, 3);
 }
 
@@ -66,6 +68,11 @@ TEST(CameraFile, IsRefusedWithLineAndKey) {
  "name": "")"),
             "cameras.json, line 3: \"name\" is not a name");
   const std::pair<const char*, const char*> kCases[] = {
+      {R"("name": "a", "address": "b", "tileStream": 0)", "\"tileStream\" is not a number from 1 to 16"},
+      {R"("name": "a", "address": "b", "tileStream": 17)", "\"tileStream\" is not a number from 1 to 16"},
+      {R"("name": "a", "address": "b", "tileStream": -1)", "\"tileStream\" is not a whole number"},
+      {R"("name": "a", "address": "b", "tileStream": 1.5)", "\"tileStream\" is not a whole number"},
+      {R"("name": "a", "address": "b", "tileStream": "1")", "\"tileStream\" is not a whole number"},
       {R"("name": "a\u001b", "address": "a")", "\"name\" is not a name"},
       {R"("name": "-a", "address": "a")", "\"name\" is not a name"},
       {R"("name": 5, "address": "a")", "\"name\" is not a text"},

@@ -200,6 +200,16 @@ TEST_F(FleetAtWork, AFileOfCamerasThatCannotBeWrittenIsReported) {
             "cannot write /nowhere/cameras.json.1.cred: No such file or directory");
 }
 
+TEST(FleetStart, TheFileOfCamerasNamesTheStreamThatIsJpeg) {
+  CameraOptions common = test_options();
+  common.profile_path = std::string(VEXA_SOURCE_DIR) + "/models/profiles/VX-2000.json";
+  Fleet fleet(std::get<std::vector<FleetCamera>>(make_fleet(1, common)));
+  ASSERT_TRUE(fleet.start()) << fleet.error();
+  const vexa_test::TemporaryFolder folder;
+  ASSERT_EQ(fleet.write_cameras_file(folder / "cameras.json"), "");
+  EXPECT_EQ(json::parse(vexa_test::contents_of(folder / "cameras.json"))["cameras"][0]["tileStream"], 2);
+}
+
 TEST(FleetStart, TwoCamerasOfOneAddressAndPortStartNone) {
   CameraOptions common = test_options();
   const std::string twice = R"({"address": ")" + own_loopback(2) + R"(", "httpPort": 34567})";

@@ -321,7 +321,7 @@ TEST(Program, AFleetOfTheInstalledProfilesTakesOneAfterTheOther) {
   EXPECT_EQ(program.end_by(SIGTERM), 0);
 }
 
-TEST(Program, AFleetThatCannotStartEndsWithOneAndSaysWhy) {
+TEST(Program, AFleetThatCannotStartEndsWithOneAndReportsWhy) {
   const vexa_test::TemporaryFolder folder;
   const std::string wrong = folder.make_file("fleet.json", "{\"cameras\": [\n{\"colour\": 1}]}");
   Program of_a_file({"--fleet", wrong}, STDERR_FILENO);
