@@ -44,7 +44,7 @@ std::string gap_line(const std::string& camera, const Gap& gap) {
   return line;
 }
 
-Json json_of(const Gap& gap) {
+Json row_of(const Gap& gap) {
   Json missing = Json::array();
   for (const GapStretch& stretch : gap.missing) {
     missing.push_back({{"firstMicroseconds", stretch.begin}, {"lastMicroseconds", stretch.end}});
@@ -159,7 +159,7 @@ std::string line_of(const CameraRecording& recording) {
   return line + "\n";
 }
 
-Json json_of(const CameraRecording& recording) {
+Json row_of(const CameraRecording& recording) {
   const RecordingMeter& meter = recording.meter();
   const auto& stream = meter.stream();
   return {{"camera", recording.name()},
@@ -185,10 +185,10 @@ ExitCode summarise(const std::deque<CameraAtWork>& cameras, const SessionRecordi
   Json list = Json::array();
   for (const CameraAtWork& camera : cameras) {
     text += line_of(camera.recording());
-    list.push_back(json_of(camera.recording()));
+    list.push_back(row_of(camera.recording()));
     if (camera.gaps() == nullptr) continue;
     Json& gaps = list.back()["gaps"] = Json::array();
-    for (const Gap& gap : camera.gaps()->ended()) gaps.push_back(json_of(gap));
+    for (const Gap& gap : camera.gaps()->ended()) gaps.push_back(row_of(gap));
   }
   if (options.camera.json) text = to_text(list);
   if (options.out != "-") return write_result(terminal, text);

@@ -18,10 +18,10 @@ namespace vexa::host {
 
 struct ServerOptions {
   std::string address = "127.0.0.1";
-  std::uint16_t port = 0;          // 0: any free one
-  std::vector<std::string> names;  // that a Host field may state besides this machine's own
-  std::string token;
-  std::string version;
+  std::uint16_t port = 0;               // 0: any free one
+  std::vector<std::string> names = {};  // that a Host field may state besides this machine's own
+  std::string token = {};
+  std::string version = {};
   std::size_t most_connections = 256;  // more are closed at once
   std::size_t most_viewers = 64;       // pages and streams; more get 503
   // Called when the first viewer of a camera's H.264 has come, and when the last has gone. On the thread of run().
