@@ -12,7 +12,7 @@ target_link_libraries(vexa_objects PRIVATE vexa_warnings PUBLIC VexaCommonFilter
 
 vexa_batch(vexa_objects)
 vexa_check_locks(vexa_objects)
-vexa_measure(vexa_objects)
+vexa_instrument(vexa_objects)
 
 add_library(vexa_testable STATIC EXCLUDE_FROM_ALL $<TARGET_OBJECTS:vexa_objects>)
 target_include_directories(vexa_testable PUBLIC ${PROJECT_SOURCE_DIR}/include ${PROJECT_SOURCE_DIR})

@@ -14,6 +14,7 @@
 #include <csignal>
 #include <cstdint>
 #include <cstdio>
+#include <cstdlib>
 #include <functional>
 #include <memory>
 #include <string>
@@ -58,6 +59,10 @@ class ProgramRun {
     posix_spawn_file_actions_addchdir_np(&actions, folder.path().c_str());
     // A camera of this process that is pulled out must not live on in the program's copies of its sockets.
     posix_spawn_file_actions_addclosefrom_np(&actions, STDERR_FILENO + 1);
+    // Where a build that counts what runs writes its counts; by itself it would choose the program's folder.
+    if (const char* const counts = std::getenv("LLVM_PROFILE_FILE"); counts != nullptr) {
+      environment.push_back(std::string("LLVM_PROFILE_FILE=") + counts);
+    }
     spawn(actions, pointers_to(arguments), pointers_to(environment));
     posix_spawn_file_actions_destroy(&actions);
   }

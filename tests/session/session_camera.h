@@ -46,6 +46,13 @@ class SessionHost {
     host.alarms = [this](Session&, const std::vector<SLibDPinInfo>& pins) {
       keep([&] { pins_.insert(pins_.end(), pins.begin(), pins.end()); });
     };
+    host.metadata = [this](Session&, const SLibDRawMDFrameInfo&) { keep([this] { ++side_.metadata; }); };
+    host.audio = [this](Session&, const unsigned char*, std::size_t length, std::int32_t codec) {
+      keep([&] {
+        side_.sound_bytes += length;
+        side_.sound_codec = codec;
+      });
+    };
     return host;
   }
 
@@ -68,6 +75,19 @@ class SessionHost {
     return wait_for([&](const auto& states, const auto&) {
       return !states.empty() && states.back().event > later_than && states.back().state == SessionState::kLive;
     });
+  }
+  /// What has come of sound and metadata.
+  struct Side {
+    std::size_t sound_bytes = 0;
+    std::int32_t sound_codec = -1;
+    std::size_t metadata = 0;
+  };
+  bool wait_for_side(const std::function<bool(const Side&)>& condition) {
+    return wait_for([&](const auto&, const auto&) { return condition(side_); });
+  }
+  Side side() {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    return side_;
   }
   bool wait_for_frames(std::size_t count) {
     return wait_for([&](const auto&, const auto& frames) { return frames.size() >= count; });
@@ -123,6 +143,7 @@ class SessionHost {
   std::vector<SessionStatus> states_;
   std::vector<SessionFrame> frames_;
   std::vector<SLibDPinInfo> pins_;
+  Side side_;
   int inside_ = 0;
   bool overlapped_ = false;
 };

@@ -84,5 +84,22 @@ TEST(WhyNotLive, ACamerasTextStaysOnOneLine) {
   EXPECT_LT(why.size(), 280U);
 }
 
+TEST(WhyNotLive, DeletesAreReplacedAsOtherControlsAre) {
+  SessionStatus status;
+  status.state = SessionState::kRefused;
+  status.cause = SessionCause::kProfile;
+  status.text = "no\x7fname";
+  EXPECT_EQ(why_not_live(status, Moment(0)), "The camera's profile cannot be used (no?name).");
+}
+
+TEST(WhyNotLive, ANumberThatIsNoStateOrCauseIsNoTrouble) {
+  SessionStatus status;
+  status.state = SessionState::kWaiting;
+  status.cause = static_cast<SessionCause>(1000);
+  EXPECT_EQ(why_not_live(status, Moment(0)), "The cause is not known.");
+  status.state = static_cast<SessionState>(1000);
+  EXPECT_EQ(why_not_live(status, Moment(0)), "");
+}
+
 }  // namespace
 }  // namespace vexa

@@ -404,5 +404,71 @@ TEST_F(Machine, NothingComesAfterStopped) {
   EXPECT_EQ(machine_.status().event, last);
 }
 
+TEST_F(Machine, IsStartedOnce) {
+  machine_.start(Moment(1000));
+  machine_.start(Moment(5000));
+  EXPECT_TRUE(machine_.is_due(Moment(1000)));
+}
+
+TEST_F(Machine, ARetryAfterAStopChangesNothing) {
+  go_live(Moment(0));
+  machine_.failed(LIBD_TIMEOUT, "", 1, Moment(100));
+  machine_.stop(Moment(200));
+  machine_.retry(Moment(300));
+  machine_.closed(Moment(400));
+  EXPECT_FALSE(machine_.is_due(Moment(400)));
+  EXPECT_EQ(machine_.deadline(), kNever);
+}
+
+TEST_F(Machine, AWaitThatIsPutOffIsAnEvent) {
+  machine_.start(Moment(0));
+  machine_.hold(Cause::kTurn, Moment(100), Moment(0));
+  const std::uint64_t event = machine_.status().event;
+  machine_.hold(Cause::kTurn, Moment(200), Moment(0));
+  EXPECT_EQ(machine_.status().event, event + 1);
+  EXPECT_EQ(machine_.status().nextAttempt, 200);
+}
+
+TEST_F(Machine, ALinkThatIsBackDuringAnAttemptDoesNotHurryARefusedOne) {
+  machine_.start(Moment(0));
+  machine_.connecting(Moment(0));
+  EXPECT_FALSE(machine_.link_back(Moment(10)));
+  machine_.refused(Cause::kUnsupported, LIBD_NOT_SUPPORTED, "", 1, Moment(20));
+  expect(State::kRefused, Cause::kUnsupported);
+  EXPECT_EQ(machine_.deadline(), Moment(20) + BackOff().next(1));
+}
+
+TEST_F(Machine, CredentialsThatAreRefusedWhileStoppingStop) {
+  machine_.start(Moment(0));
+  machine_.connecting(Moment(0));
+  machine_.stop(Moment(10));
+  machine_.refused_credentials(LIBD_FAILED, "Unauthorized", kNever, Moment(20));
+  expect(State::kStopped, Cause::kAsked);
+}
+
+TEST_F(Machine, ALinkThatIsBackGivesNoTurn) {
+  machine_.start(Moment(0));
+  for (const Cause cause : {Cause::kTurn, Cause::kOtherTrial}) {
+    machine_.hold(cause, Moment(90000), Moment(0));
+    EXPECT_FALSE(machine_.link_back(Moment(2000)));
+    EXPECT_EQ(machine_.deadline(), Moment(90000));
+  }
+}
+
+TEST_F(Machine, IsNotHopelessOnceItIsToStop) {
+  go_live(Moment(0));
+  machine_.stop(Moment(10));
+  EXPECT_FALSE(machine_.is_hopeless(1, Moment(1000000)));
+  EXPECT_EQ(machine_.deadline(), kNever);
+}
+
+TEST_F(Machine, WithoutVideoAnOpenConnectionHasNoDeadline) {
+  SessionMachine alarms(false, kPatience);
+  alarms.start(Moment(0));
+  alarms.connecting(Moment(0));
+  alarms.opened(Moment(5));
+  EXPECT_EQ(alarms.deadline(), kNever);
+}
+
 }  // namespace
 }  // namespace vexa

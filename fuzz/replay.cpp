@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Replays the corpus of one fuzz target: every file, and every file cut short at every length. Each input lies right
-// before a page that may not be touched, so that reading one byte too far ends the program.
+// NAME_fuzz --replay FOLDER reads every file of the target's corpus, and every file cut short at every length. Each
+// input lies right before a page that may not be touched, so that reading one byte too far ends the program.
 #include <sys/mman.h>
 #include <unistd.h>
 
@@ -8,17 +8,15 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <system_error>
 #include <vector>
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size);
-
-// libFuzzer's, for the mutators of targets, which are not called here.
-extern "C" std::size_t LLVMFuzzerMutate(std::uint8_t* data, std::size_t size, std::size_t most);
-extern "C" std::size_t LLVMFuzzerMutate(std::uint8_t*, std::size_t size, std::size_t) { return size; }
 
 namespace {
 
@@ -71,16 +69,11 @@ bool replay(const std::filesystem::path& path, std::size_t& inputs) {
   return true;
 }
 
-}  // namespace
-
-int main(int count, char** arguments) {
-  if (count != 2 || !std::filesystem::is_directory(arguments[1])) {
-    std::fprintf(stderr, "usage: %s CORPUS-DIRECTORY\n", arguments[0]);
-    return 2;
-  }
+int replay_all(const char* folder) {
+  std::error_code failure;
   std::size_t files = 0;
   std::size_t inputs = 0;
-  for (const std::filesystem::directory_entry& entry : std::filesystem::directory_iterator(arguments[1])) {
+  for (const auto& entry : std::filesystem::directory_iterator(folder, failure)) {
     if (!replay(entry.path(), inputs)) {
       std::fprintf(stderr, "%s cannot be replayed\n", entry.path().c_str());
       return 1;
@@ -89,4 +82,13 @@ int main(int count, char** arguments) {
   }
   std::printf("%zu files, %zu inputs\n", files, inputs);
   return files == 0 ? 1 : 0;
+}
+
+}  // namespace
+
+// libFuzzer's call before it reads its options.
+extern "C" int LLVMFuzzerInitialize(int* count, char*** arguments);
+extern "C" int LLVMFuzzerInitialize(int* count, char*** arguments) {
+  if (*count == 3 && std::strcmp((*arguments)[1], "--replay") == 0) std::exit(replay_all((*arguments)[2]));
+  return 0;
 }
