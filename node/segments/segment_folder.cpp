@@ -1,14 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "node/segments/segment_folder.h"
 
-#include <dirent.h>
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
-#include <memory>
+#include <filesystem>
 #include <system_error>
 #include <utility>
 
@@ -61,15 +60,16 @@ Problem SegmentFolder::problem(const std::string& name, int error) const {
 }
 
 Result<std::vector<ListedSegment>> SegmentFolder::list() const {
-  const std::unique_ptr<DIR, int (*)(DIR*)> folder(opendir(path_.c_str()), closedir);
-  if (!folder) return host::fail(disk_problem(path_, errno));
+  std::error_code error;
   std::vector<ListedSegment> segments;
-  while (const dirent* entry = readdir(folder.get())) {
-    const auto name = segment_of(entry->d_name);
+  for (std::filesystem::directory_iterator entry(path_, error), end; !error && entry != end; entry.increment(error)) {
+    const std::string text = entry->path().filename();
+    const auto name = segment_of(text);
     struct stat status {};
-    if (!name || fstatat(folder_.get(), entry->d_name, &status, AT_SYMLINK_NOFOLLOW) != 0) continue;
+    if (!name || fstatat(folder_.get(), text.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) continue;
     if (S_ISREG(status.st_mode)) segments.push_back({*name, static_cast<std::uint64_t>(status.st_size)});
   }
+  if (error) return host::fail(disk_problem(path_, error.value()));
   std::sort(segments.begin(), segments.end(), [](const ListedSegment& a, const ListedSegment& b) {
     return std::pair(a.name.start, a.name.counter) < std::pair(b.name.start, b.name.counter);
   });
