@@ -42,6 +42,10 @@ void VirtualCamera::set_clock(std::chrono::system_clock::time_point time) {
   loop_->run([this, time] { core_->state()->set_clock(time); });
 }
 
+bool VirtualCamera::locked() const {
+  return loop_->run([this] { return core_->state()->logins.is_locked(core_->state()->wall_clock()); });
+}
+
 const std::string& VirtualCamera::address() const { return core_->state()->options.address; }
 
 std::uint16_t VirtualCamera::http_port() const { return core_->http_port(); }

@@ -70,6 +70,7 @@ class VirtualCamera {
   // What a path of the control port makes happen, such as "/lens/cover"; the status of the answer (204, 400, 404).
   [[nodiscard]] std::string_view control(std::string_view path, std::string_view query = {});
   [[nodiscard]] bool plugged() const;
+  [[nodiscard]] bool locked() const;          // after too many refused logins
   [[nodiscard]] std::size_t viewers() const;  // open RTSP sessions, and picture streams over HTTP
   [[nodiscard]] PacketFaults packet_faults() const;
   [[nodiscard]] std::size_t request_faults() const;  // how many are set

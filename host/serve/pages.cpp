@@ -104,8 +104,6 @@ class Player {
     video.src = this.url;
     video.onerror = () => this.#fail(video.error?.message || 'the browser cannot decode it');
     this.#source.addEventListener('sourceopen', () => {
-      if (this.#ended) return;
-      this.#source.duration = Infinity;
       this.#next();
     }, {once: true});
   }
@@ -151,6 +149,7 @@ class Player {
 
   #open(type) {
     if (this.#buffer) return this.#buffer.changeType(type);
+    this.#source.duration = Infinity;
     this.#buffer = this.#source.addSourceBuffer(type);
     this.#buffer.addEventListener('updateend', () => { this.#follow(); this.#next(); });
     this.#buffer.addEventListener('error', () => this.#fail('the browser cannot read the stream'));

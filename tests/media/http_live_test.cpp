@@ -197,6 +197,8 @@ class BrokenHttpLive : public HttpLive, public testing::WithParamInterface<Broke
 TEST_P(BrokenHttpLive, IsSilentTimesOutAndComesBackWithARestart) {
   const BrokenStream& broken = GetParam();
   strike(broken.action, 3, broken.text, broken.bytes);
+  // A length that the stream comes to fill is over before a slow host asks.
+  strike(Action::kSilence, 20, "");
   run(broken.way, 1000);
   for (int round = 0; round < 2; ++round) {
     ASSERT_EQ(driver_.StartVideoStreaming(), LIBD_OK);

@@ -163,6 +163,33 @@ TEST_F(SessionWithCamera, APasswordThatIsChangedAndChangedBackLocksNobodyOut) {
   EXPECT_LT(refused.size(), 5U) << testing::PrintToString(refused);
 }
 
+// A wrong password by mistake, in six sessions, and the right one again.
+TEST_F(SessionWithCamera, ACameraThatLocksAfterFiveRefusalsIsNeverLocked) {
+  CameraOptions locking;
+  locking.lock_after = 5;
+  start_camera(locking);
+  SessionHost hosts[6];
+  std::vector<std::shared_ptr<Session>> sessions;
+  SessionGroup group;
+  for (SessionHost& host : hosts) sessions.push_back(group.Open(options(), host.callbacks()));
+  for (SessionHost& host : hosts) ASSERT_TRUE(host.wait_for_live());
+  for (const auto& session : sessions) session->SetCredentials("operator", "a mistake");
+  camera().unplug();
+  camera().plug();
+  for (SessionHost& host : hosts) {
+    ASSERT_TRUE(host.wait_for([](const auto& states, const auto&) {
+      return states.back().cause == SessionCause::kCredentials && states.back().state == SessionState::kRefused;
+    }));
+  }
+  EXPECT_FALSE(camera().locked());
+  for (const auto& session : sessions) session->SetCredentials("operator", "tr0ub4dor");
+  for (SessionHost& host : hosts) {
+    EXPECT_TRUE(
+        host.wait_for([](const auto& states, const auto&) { return states.back().state == SessionState::kLive; }));
+  }
+  EXPECT_FALSE(camera().locked());
+}
+
 TEST_F(SessionWithCamera, TheRightPasswordMakesRefusedSessionsLive) {
   start_camera();
   SessionOptions wrong = options();

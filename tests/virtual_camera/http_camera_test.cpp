@@ -50,6 +50,26 @@ TEST_F(HttpCamera, WrongCredentialsAreRefusedAndChangeNothing) {
   EXPECT_EQ(camera_.settings().get("camera", "DayNight"), "off");
 }
 
+TEST(LockingCamera, IsOpenAgainWhenItsClockHasGoneOnByThirtyMinutes) {
+  CameraOptions options = test_options();
+  options.lock_after = 3;
+  VirtualCamera camera(options);
+  ASSERT_TRUE(camera.start()) << camera.error();
+  const auto ask = [&](const std::string& request) {
+    Client client(camera.address(), camera.http_port());
+    client.send(request);
+    return client.read_to_end().substr(0, 12);
+  };
+  const std::string right = http_get("/command/inquiry.cgi?inq=system");
+  camera.set_clock(std::chrono::system_clock::time_point(std::chrono::hours(24)));
+  for (int i = 0; i < 3; ++i) EXPECT_EQ(ask("GET /command/inquiry.cgi?inq=system HTTP/1.0\r\n\r\n"), "HTTP/1.0 401");
+  EXPECT_TRUE(camera.locked());
+  EXPECT_EQ(ask(right), "HTTP/1.0 401");
+  camera.set_clock(std::chrono::system_clock::time_point(std::chrono::hours(25)));
+  EXPECT_FALSE(camera.locked());
+  EXPECT_EQ(ask(right), "HTTP/1.0 200");
+}
+
 TEST_F(HttpCamera, TheJournalHoldsEveryRequestByteForByte) {
   const std::string good = http_get("/command/inquiry.cgi?inq=system");
   const std::string bad = "nonsense\r\n\r\n";

@@ -121,6 +121,8 @@ void add_stream(CLI::App& app, CameraOptions& camera) {
          },
          "announce this time-out, and end sessions that stay silent longer [60, never ended]")
       ->type_name("SECONDS");
+  app.add_option("--lock-after", camera.lock_after,
+                 "lock the camera for 30 minutes after so many requests with wrong credentials in a row");
   app.add_option("--seed", camera.seed, "of every random fault")->capture_default_str();
 }
 

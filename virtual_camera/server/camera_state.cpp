@@ -7,6 +7,7 @@
 #include "virtual_camera/model/camera_profile.h"
 #include "virtual_camera/model/setting_rules.h"
 #include "virtual_camera/server/http_commands.h"
+#include "virtual_camera/wire/message.h"
 
 namespace vexa::camera {
 namespace {
@@ -49,6 +50,7 @@ CameraState::CameraState(CameraOptions camera_options, asio::io_context& loop_co
       pose(pose_of(ptz.get(), settings)),
       scene(settings, alarms, stage, pose, ptz.get()),
       sources(options, settings, scene),
+      logins(options.lock_after),
       journal(options.journal_limit),
       sent(options.sent_log_limit),
       packet_faults(options.packet_faults),
@@ -62,6 +64,10 @@ CameraState::~CameraState() = default;
 std::size_t CameraState::viewers() {
   std::erase_if(picture_streams, [](const std::weak_ptr<HttpBody>& stream) { return stream.expired(); });
   return sessions.size() + picture_streams.size();
+}
+
+bool CameraState::lets_in(std::string_view authorization) {
+  return logins.lets_in(credentials_match(authorization, options.user, options.password), wall_clock());
 }
 
 std::chrono::system_clock::time_point CameraState::wall_clock() const {

@@ -10,9 +10,11 @@
 #include <map>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "virtual_camera/card/card.h"
+#include "virtual_camera/model/login_guard.h"
 #include "virtual_camera/model/settings_store.h"
 #include "virtual_camera/ptz/camera_pose.h"
 #include "virtual_camera/ptz/ptz_head.h"
@@ -54,6 +56,9 @@ struct CameraState {
   // Hosts that watch: RTSP sessions, and picture streams over HTTP.
   [[nodiscard]] std::size_t viewers();
 
+  // Whether a request with this "Authorization" is let in; each that is asked about counts.
+  [[nodiscard]] bool lets_in(std::string_view authorization);
+
   // The time that the camera's clock shows.
   [[nodiscard]] std::chrono::system_clock::time_point wall_clock() const;
 
@@ -74,6 +79,7 @@ struct CameraState {
   LiveScene scene;
   StreamSources sources;
 
+  LoginGuard logins;
   Journal journal;
   SentLog sent;
   RequestFaultList request_faults;

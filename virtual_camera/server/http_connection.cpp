@@ -78,11 +78,8 @@ std::size_t HttpConnection::request_size(std::string_view received) const { retu
 Answer HttpConnection::answer(const std::string& request) {
   const std::optional<RequestHead> head = parse_head(request);
   if (!head) return http_answer("400 Bad Request", "");
-  const CameraOptions& options = state().options;
-  if (!credentials_match(head->field("Authorization"), options.user, options.password)) {
-    return http_answer("401 Unauthorized", "");
-  }
-  const bool full = state().viewers() >= options.max_viewers;
+  if (!state().lets_in(head->field("Authorization"))) return http_answer("401 Unauthorized", "");
+  const bool full = state().viewers() >= state().options.max_viewers;
   if (full && head->path.starts_with(kImages)) return http_answer("503 Service Unavailable", "");
   body_ = open_body(*head, shared_state());
   return body_ ? Answer{200, body_->head()} : obey_command(*head, state());

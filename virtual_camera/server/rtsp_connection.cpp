@@ -49,9 +49,9 @@ Answer RtspConnection::answer(const std::string& request) {
   if (!head || !head->version.starts_with("RTSP/")) return status_only("400 Bad Request", std::nullopt);
   const std::optional<std::uint32_t> sequence = sequence_of(*head);
   if (!sequence) return status_only("400 Bad Request", std::nullopt);
-  const CameraOptions& options = state().options;
-  const bool let_in = credentials_match(head->field("Authorization"), options.user, options.password);
-  if (needs_credentials(head->method) && !let_in) return status_only("401 Unauthorized", sequence);
+  if (needs_credentials(head->method) && !state().lets_in(head->field("Authorization"))) {
+    return status_only("401 Unauthorized", sequence);
+  }
   return dispatch(*head, *sequence);
 }
 

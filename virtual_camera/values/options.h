@@ -41,6 +41,9 @@ struct CameraOptions {
   std::string user = "admin";     // user and password both empty: everyone is let in
   std::string password = "admin";
 
+  // So many requests with wrong credentials in a row lock the camera for 30 minutes of its own clock; 0: none do.
+  unsigned lock_after = 0;
+
   // The camera model: a profile file, or one already loaded, which wins. It decides which settings the camera has and
   // takes, and what it streams where no clip is given. With neither, the camera takes every setting.
   std::string profile_path;

@@ -167,9 +167,27 @@ TEST(CommandLine, EveryFaultOfAnHttpStreamHasAnOption) {
 }
 
 TEST(CommandLine, StreamOptionsReachTheCamera) {
-  const CommandLine line = parse({"--once", "--pictures", "7", "--fps", "30", "--speed", "4", "--max-payload", "900",
-                                  "--start-sequence", "65535", "--start-timestamp", "4294967295", "--session-timeout",
-                                  "5", "--range-clock", "20240131T235959.250Z", "--count", "3"});
+  const CommandLine line = parse({"--once",
+                                  "--pictures",
+                                  "7",
+                                  "--fps",
+                                  "30",
+                                  "--speed",
+                                  "4",
+                                  "--max-payload",
+                                  "900",
+                                  "--start-sequence",
+                                  "65535",
+                                  "--start-timestamp",
+                                  "4294967295",
+                                  "--session-timeout",
+                                  "5",
+                                  "--range-clock",
+                                  "20240131T235959.250Z",
+                                  "--lock-after",
+                                  "5",
+                                  "--count",
+                                  "3"});
   ASSERT_FALSE(line.exit_code);
   const CameraOptions& camera = line.options.camera;
   EXPECT_FALSE(camera.loop);
@@ -182,6 +200,7 @@ TEST(CommandLine, StreamOptionsReachTheCamera) {
   EXPECT_EQ(camera.session_timeout.count(), 5);
   EXPECT_EQ(camera.session_expiry, SessionExpiry::kWhenSilent);
   EXPECT_EQ(camera.range_clock, "20240131T235959.250Z");
+  EXPECT_EQ(camera.lock_after, 5U);
   EXPECT_EQ(line.options.count, 3U);
 }
 
