@@ -6,9 +6,9 @@
 #include <CLI/CLI.hpp>
 #include <algorithm>
 #include <cerrno>
-#include <cstring>
 #include <iterator>
 #include <nlohmann/json.hpp>
+#include <system_error>
 
 #include "host/access/redactor.h"
 #include "host/base/printable.h"
@@ -43,7 +43,8 @@ std::optional<Problem> write_new_file(const std::string& path, const std::string
   int error = file.valid() ? write_all(file.get(), text.data(), text.size()) : errno;
   if (error == 0 && !file.reset()) error = errno;
   if (error == 0) return std::nullopt;
-  return Problem{ExitCode::kCannotWrite, fmt::format("cannot write {}: {}", path, std::strerror(error)),
+  return Problem{ExitCode::kCannotWrite,
+                 fmt::format("cannot write {}: {}", path, std::generic_category().message(error)),
                  "Name a file that is not there yet, in a folder that can be written."};
 }
 

@@ -18,6 +18,7 @@
 #include <memory>
 #include <optional>
 #include <string_view>
+#include <system_error>
 
 #include "host/base/number_text.h"
 #include "host/base/unique_fd.h"
@@ -149,7 +150,7 @@ int status_of(std::string_view head, std::string_view protocol) {
   return number_text(head.substr(space + 1, 3), 100, 999).value_or(0);
 }
 
-std::string error_text(int error) { return std::strerror(error); }
+std::string error_text(int error) { return std::generic_category().message(error); }
 
 Check named(std::string name) {
   Check check;

@@ -151,7 +151,7 @@ std::optional<PictureSize> size_of(std::string_view sps) {
   std::uint64_t height = rows * 16 * (2 - frames_only);
   if (in.bit() != 0) {
     const std::uint64_t unit_x = chroma == 1 || chroma == 2 ? 2 : 1;
-    const std::uint64_t unit_y = (chroma == 1 ? 2 : 1) * (2 - frames_only);
+    const std::uint64_t unit_y = std::uint64_t{chroma == 1 ? 2U : 1U} * (2 - frames_only);
     const std::uint64_t sides = std::uint64_t{in.ue()} + in.ue();
     const std::uint64_t ends = std::uint64_t{in.ue()} + in.ue();
     width = width > sides * unit_x ? width - sides * unit_x : 0;
