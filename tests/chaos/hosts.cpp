@@ -222,7 +222,8 @@ void ChaosHost::use_session() {
       return;
     case 4:
       clock_.begin("Session::Status");
-      if (!sessions_.empty() && sessions_[which]->Status().why.empty() && sessions_[which]->Status().event != 0) {
+      if (sessions_.empty()) return;
+      if (const vexa::SessionStatus status = sessions_[which]->Status(); status.why.empty() && status.event != 0) {
         Findings::stop_at("a session has no words for its state");
       }
       return;
