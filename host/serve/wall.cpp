@@ -8,6 +8,8 @@
 #include <nlohmann/json.hpp>
 #include <utility>
 
+#include "host/words/session_words.h"
+
 namespace vexa::host {
 namespace {
 
@@ -21,7 +23,7 @@ std::string text_of(const Json& json) { return json.dump(-1, ' ', false, Json::e
 Json described(const WallCamera& camera, std::int64_t now) {
   const auto age = camera.age(now);
   return {{"name", camera.name()},
-          {"state", name_of(camera.state())},
+          {"state", word_of(camera.state())},
           {"why", camera.why()},
           {"ageMilliseconds", age ? Json(*age) : Json(nullptr)},
           {"stale", camera.stale(now)},
@@ -78,26 +80,6 @@ class MetricsText {
 bool is_stale(std::int64_t age, std::int64_t interval) {
   constexpr std::int64_t kLeast = 2000;
   return age > std::max(kLeast, 2 * interval);
-}
-
-const char* name_of(SessionState state) {
-  switch (state) {
-    case SessionState::kIdle:
-      return "idle";
-    case SessionState::kConnecting:
-      return "connecting";
-    case SessionState::kLive:
-      return "live";
-    case SessionState::kStalled:
-      return "stalled";
-    case SessionState::kWaiting:
-      return "waiting";
-    case SessionState::kRefused:
-      return "refused";
-    case SessionState::kStopped:
-      break;
-  }
-  return "stopped";
 }
 
 void WallCamera::take_status(const SessionStatus& status) {

@@ -22,9 +22,6 @@ using Jpeg = SharedBytes;
 // Whether a picture is too old to be shown as live: older than two intervals between pictures, and than 2 s.
 [[nodiscard]] bool is_stale(std::int64_t age, std::int64_t interval);
 
-// "live", "connecting" ...
-[[nodiscard]] const char* name_of(SessionState state);
-
 // One camera. Times are milliseconds of CLOCK_MONOTONIC. On the thread of the event loop.
 class WallCamera {
  public:
