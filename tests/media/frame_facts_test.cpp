@@ -41,7 +41,7 @@ class FactsOfALiveStream : public testing::Test {
   }
   /// Takes frames until one's facts are `wanted`; false after ten seconds.
   bool take_until(const std::function<bool(const FrameFacts&)>& wanted) {
-    const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(10);
+    const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(60);
     while (std::chrono::steady_clock::now() < end) {
       SLibDVideoFrameInfo frame;
       if (vexa::GetCurrentVideoFrame(driver_, frame, facts_) != LIBD_OK) {
