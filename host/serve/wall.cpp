@@ -160,18 +160,17 @@ std::string Wall::metrics(MetricsFormat format, const ServeCounts& counts, std::
        [](const WallCamera& camera) { return camera.interruptions(); });
   each("vexa_camera_last_picture_timestamp_seconds", "gauge", "When the latest picture came; 0 before the first.",
        [](const WallCamera& camera) { return static_cast<double>(camera.last_picture_time()) / 1000; });
-  text.family("vexa_serve_viewers", "gauge", "Pages and streams that are watched now.");
-  text.sample(static_cast<double>(counts.viewers));
-  text.family("vexa_serve_connections", "counter", "Connections taken.");
-  text.sample(static_cast<double>(counts.connections));
-  text.family("vexa_serve_refused_requests", "counter", "Requests that were not let in.");
-  text.sample(static_cast<double>(counts.refused));
-  text.family("vexa_serve_pictures_sent", "counter", "Pictures sent to viewers.");
-  text.sample(static_cast<double>(counts.pictures_sent));
-  text.family("vexa_serve_video_fragments_sent", "counter", "Pictures of H.264 sent to viewers.");
-  text.sample(static_cast<double>(counts.fragments_sent));
-  text.family("vexa_serve_video_fragments_missed", "counter", "Pictures of H.264 that slow viewers missed.");
-  text.sample(static_cast<double>(counts.fragments_missed));
+  const auto one = [&](std::string_view name, std::string_view type, std::string_view help, auto value) {
+    text.family(name, type, help);
+    text.sample(static_cast<double>(value));
+  };
+  one("vexa_serve_viewers", "gauge", "Pages and streams that are watched now.", counts.viewers);
+  one("vexa_serve_connections", "counter", "Connections taken.", counts.connections);
+  one("vexa_serve_refused_requests", "counter", "Requests that were not let in.", counts.refused);
+  one("vexa_serve_pictures_sent", "counter", "Pictures sent to viewers.", counts.pictures_sent);
+  one("vexa_serve_video_fragments_sent", "counter", "Pictures of H.264 sent to viewers.", counts.fragments_sent);
+  one("vexa_serve_video_fragments_missed", "counter", "Pictures of H.264 that slow viewers missed.",
+      counts.fragments_missed);
   return text.take();
 }
 

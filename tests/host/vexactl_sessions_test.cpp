@@ -5,6 +5,7 @@
 
 #include "tests/host/camera_fixture.h"
 #include "tests/host/json_schema.h"
+#include "tests/support/recording_camera.h"
 
 namespace vexa_test {
 namespace {
@@ -145,14 +146,8 @@ TEST_F(CamerasOfAFile, ARecordingLivesThroughAnOutage) {
 }
 
 TEST_F(CamerasOfAFile, WhatTheCardRecordedDuringAnOutageIsFetchedIntoAFileOfItsOwn) {
-  CameraOptions with_card;
-  with_card.card_bytes = 64U << 20U;
-  with_card.sender_reports.every = 1;
-  start_camera(with_card);
-  camera().settings().set("edgestorage", "Edgestorage", "on");
-  camera().settings().set("edgestorage", "EsRec1", "image1,off");
-  camera().settings().set("edgestorage", "EsAlmRec1Time", "0,0");
-  camera().settings().set("edgestorage", "EsAlmRec1WatchAddress", "10.0.0.1");
+  start_camera(with_card());
+  record_while_away(camera().settings());
   ProgramRun program(folder(),
                      vexactl({"record", place(), "--timeout", "500", "--forever", "--backfill", "--frames", "60",
                               "--out", "live.h264", "--json"}),

@@ -9,6 +9,7 @@
 #include "session/gap_file.h"
 #include "tests/session/session_camera.h"
 #include "tests/support/process_state.h"
+#include "tests/support/recording_camera.h"
 #include "tests/support/temporary_folder.h"
 #include "virtual_camera/codec/rtp_packetiser.h"
 
@@ -100,12 +101,10 @@ class BackfillHost {
 class BackfillOfACamera : public SessionWithCamera {
  protected:
   void SetUp() override {
-    camera::CameraOptions with_card;
-    with_card.card_bytes = 64U << 20U;
-    with_card.sender_reports.every = 1;
-    with_card.playback_scales = {1, 8};
-    start_camera(with_card);
-    idle_ = nobody_.Open(options(), {});
+    camera::CameraOptions options = vexa_test::with_card();
+    options.playback_scales = {1, 8};
+    start_camera(options);
+    idle_ = nobody_.Open(this->options(), {});
     begin(quick());
   }
   [[nodiscard]] BackfillOptions quick() const {
@@ -156,6 +155,15 @@ class BackfillOfACamera : public SessionWithCamera {
   void back(std::int64_t milliseconds, std::int64_t camera_time) {
     state(SessionState::kLive);
     picture(milliseconds, camera_time);
+  }
+
+  /// An outage whose pictures the camera does not give, with a reason.
+  void expect_refusal() {
+    outage(2000);
+    const auto gap = fetched_.wait_for_end(1);
+    ASSERT_TRUE(gap);
+    EXPECT_EQ(gap->state, GapState::kRefused);
+    EXPECT_NE(gap->text, "");
   }
 
   /// A recording on the card: a picture every 100 ms from `first` on, a key picture each second. Microseconds by the
@@ -368,21 +376,13 @@ TEST_F(BackfillOfACamera, ARecordingThatGoesOnIsWaitedForAndOneThatIsGoneIsOverw
 
 TEST_F(BackfillOfACamera, ACameraThatListsNoRecordingsRefuses) {
   camera().add_request_fault(RequestFault::status("/command/search", "404 Not Found"));
-  outage(2000);
-  const auto gap = fetched_.wait_for_end(1);
-  ASSERT_TRUE(gap);
-  EXPECT_EQ(gap->state, GapState::kRefused);
-  EXPECT_NE(gap->text, "");
+  expect_refusal();
 }
 
 TEST_F(BackfillOfACamera, ACameraThatPlaysNoRecordingsRefuses) {
   plant(kStart, 60);
   camera().add_request_fault(RequestFault::status("DESCRIBE", "501 Not Implemented"));
-  outage(2000);
-  const auto gap = fetched_.wait_for_end(1);
-  ASSERT_TRUE(gap);
-  EXPECT_EQ(gap->state, GapState::kRefused);
-  EXPECT_NE(gap->text, "");
+  expect_refusal();
 }
 
 TEST_F(BackfillOfACamera, BytesASecondAreBounded) {
@@ -414,14 +414,8 @@ TEST_F(BackfillOfACamera, WithoutAJournalGapsAreFetchedAllTheSame) {
 
 /// With a session, and what the camera itself records while it is away.
 TEST_F(SessionWithCamera, WhatItsCardRecordedDuringAnOutageIsFetched) {
-  camera::CameraOptions with_card;
-  with_card.card_bytes = 64U << 20U;
-  with_card.sender_reports.every = 1;
-  start_camera(with_card);
-  camera().settings().set("edgestorage", "Edgestorage", "on");
-  camera().settings().set("edgestorage", "EsRec1", "image1,off");
-  camera().settings().set("edgestorage", "EsAlmRec1Time", "0,0");
-  camera().settings().set("edgestorage", "EsAlmRec1WatchAddress", "10.0.0.1");
+  start_camera(vexa_test::with_card());
+  vexa_test::record_while_away(camera().settings());
   BackfillHost fetched;
   Backfill backfill(options(), {}, fetched.callbacks());
   SessionHost host;
